@@ -1,0 +1,25 @@
+# Options for everything built here. Nothing of this reaches those who link an installed library.
+find_package(Threads REQUIRED)
+
+add_library(tessel_compile_options INTERFACE)
+target_compile_options(tessel_compile_options INTERFACE
+  -Wall -Wextra -Wpedantic -Wshadow -Wundef -Werror
+  $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor -Woverloaded-virtual>
+  -fno-omit-frame-pointer -fno-optimize-sibling-calls -fno-strict-aliasing
+  "-ffile-prefix-map=${PROJECT_SOURCE_DIR}/=")
+target_compile_definitions(tessel_compile_options INTERFACE _FILE_OFFSET_BITS=64 _TIME_BITS=64)
+if(CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
+  # x87 constants and long double in C++ headers are fine; clang is stricter about what it calls an extension.
+  target_compile_options(tessel_compile_options INTERFACE -Wno-gnu-zero-variadic-macro-arguments)
+endif()
+
+if(TESSEL_SANITIZE)
+  target_compile_options(tessel_compile_options INTERFACE -fsanitize=${TESSEL_SANITIZE} -fno-sanitize-recover=all)
+  target_link_options(tessel_compile_options INTERFACE -fsanitize=${TESSEL_SANITIZE})
+endif()
+
+find_program(TESSEL_CCACHE ccache)
+if(TESSEL_CCACHE)
+  set(CMAKE_C_COMPILER_LAUNCHER ${TESSEL_CCACHE})
+  set(CMAKE_CXX_COMPILER_LAUNCHER ${TESSEL_CCACHE})
+endif()
