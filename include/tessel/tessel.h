@@ -4,6 +4,7 @@
 
 #include <tessel/base/Export.h>
 #include <tessel/base/MgErr.h>
+#include <tessel/base/NumericTypes.h>
 #include <tessel/base/StringTypes.h>
 #include <tessel/base/Types.h>
 
