@@ -7,5 +7,18 @@
 #include <tessel/base/NumericTypes.h>
 #include <tessel/base/StringTypes.h>
 #include <tessel/base/Types.h>
+#include <tessel/strings/BSTR.h>
+#include <tessel/strings/CPStrList.h>
+#include <tessel/strings/StringCLStr.h>
+#include <tessel/strings/StringCPStr.h>
+#include <tessel/strings/StringCStr.h>
+#include <tessel/strings/StringFmtPrint.h>
+#include <tessel/strings/StringFmtScan.h>
+#include <tessel/strings/StringLStr.h>
+#include <tessel/strings/StringLStrArray.h>
+#include <tessel/strings/StringPStr.h>
+#include <tessel/strings/StringUtils.h>
+#include <tessel/strings/ovhandle.h>
+#include <tessel/strings/ovstring.h>
 
 #endif
