@@ -7,6 +7,11 @@
 #include <tessel/base/NumericTypes.h>
 #include <tessel/base/StringTypes.h>
 #include <tessel/base/Types.h>
+#include <tessel/files/FileManager.h>
+#include <tessel/files/shortcut.h>
+#include <tessel/resources/RFReadWrite.h>
+#include <tessel/resources/ResourceManager.h>
+#include <tessel/resources/ovresfile.h>
 #include <tessel/strings/BSTR.h>
 #include <tessel/strings/CPStrList.h>
 #include <tessel/strings/StringCLStr.h>
