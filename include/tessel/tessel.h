@@ -5,8 +5,15 @@
 #include <tessel/base/Export.h>
 #include <tessel/base/MgErr.h>
 #include <tessel/base/NumericTypes.h>
+#include <tessel/base/OVExcept.h>
 #include <tessel/base/StringTypes.h>
 #include <tessel/base/Types.h>
+#include <tessel/diagnostics/AllocTracker.h>
+#include <tessel/diagnostics/DebugOutput.h>
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/diagnostics/DumpLeakInfo.h>
+#include <tessel/diagnostics/FileLoc.h>
+#include <tessel/diagnostics/StackChain.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/files/shortcut.h>
 #include <tessel/resources/RFReadWrite.h>

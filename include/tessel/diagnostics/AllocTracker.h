@@ -1,0 +1,117 @@
+/* Allocation trackers: registers of living objects with the call stacks that made them, and the reports on those that
+   should be gone.
+
+   The trackers of the library are on unless the environment says OV_ALLOC_TRACKER=off. A tracker never affects what it
+   tracks: when it runs out of memory it goes quiet. All operations may be called from any thread. */
+#ifndef TESSEL_DIAGNOSTICS_ALLOCTRACKER_H
+#define TESSEL_DIAGNOSTICS_ALLOCTRACKER_H
+
+#include <tessel/base/Types.h>
+
+#ifdef __cplusplus
+namespace tessel {
+class AllocTracker;
+}
+typedef tessel::AllocTracker* AllocTrackerPtr;
+#else
+typedef struct tessel_AllocTracker* AllocTrackerPtr;
+#endif
+
+TESSEL_BEGIN_C
+
+/* A new tracker that leaves the 3, or the given number of, innermost calls out of every call stack. The caller owns it.
+   Null when memory runs out. */
+TESSEL_API AllocTrackerPtr CreateAllocTracker(void);
+TESSEL_API AllocTrackerPtr CreateAllocTrackerSpecifySkip(int32 skip);
+
+/* Ends a tracker; its records are gone without a report. Null is ignored. */
+TESSEL_API void DestroyAllocTracker(AllocTrackerPtr tracker);
+
+TESSEL_END_C
+
+#ifdef __cplusplus
+
+namespace tessel {
+
+/// Where and how a report of records is written.
+class TESSEL_API AllocDumper {
+public:
+    /// What the tracked objects are called in the report.
+    virtual const char* ObjBeingTrackedName() = 0;
+    /// Whether the call stacks are written.
+    virtual bool GetShowStackNames() = 0;
+    /// Writes text, printf style; at most 2,047 bytes a call.
+    virtual void FormatToOutput(const char* format, ...) __attribute__((format(printf, 2, 3))) = 0;
+    /// Writes what an object of that size holds. The object may be gone or damaged.
+    virtual void DumpItemContents(const void* address, uint32 size) = 0;
+    virtual ~AllocDumper() = default;
+};
+
+/// Writes to level-0 reports. Without a name, and without the contents of the objects.
+class TESSEL_API DefaultDumper : public AllocDumper {
+public:
+    const char* ObjBeingTrackedName() override;
+    bool GetShowStackNames() override;
+    void FormatToOutput(const char* format, ...) override __attribute__((format(printf, 2, 3)));
+    void DumpItemContents(const void* address, uint32 size) override;
+};
+
+/// A register of living objects.
+class TESSEL_API MGGenericRegistry {
+public:
+    virtual ~MGGenericRegistry() = default;
+    virtual void Mark() = 0;
+    virtual void Register(const void* object) = 0;
+    virtual void Unregister(const void* object) = 0;
+    virtual int32 Count() = 0;
+};
+
+class TESSEL_API AllocTracker : public MGGenericRegistry {
+public:
+    AllocTracker() noexcept = default;
+    ~AllocTracker() override;
+    AllocTracker(const AllocTracker&) = delete;
+    AllocTracker& operator=(const AllocTracker&) = delete;
+
+    /// The same as MarkAllReported.
+    void Mark() override;
+    /// Records an object of size 0, made in this header.
+    void Register(const void* object) override;
+    /// The same as RemoveRecord.
+    void Unregister(const void* object) override;
+    /// The same as CountLive.
+    int32 Count() override;
+
+    /// Starts the tracker, which does nothing before. `skip` innermost calls are left out of every call stack: with 0 a
+    /// stack begins in the function that calls AddRecord.
+    virtual void SetSkip(int32 skip);
+    /// Forgets everything. The tracker does nothing afterwards. No other thread may be using it.
+    virtual void Shutdown();
+
+    /// Records an object and the call stack that made it. The file name is kept by address. An address that is recorded
+    /// already is reported, and the earlier record stays.
+    virtual void AddRecord(const void* address, uint32 size, const char* file, int32 line);
+    /// Forgets an object. Nothing happens when it is not recorded.
+    virtual void RemoveRecord(const void* address);
+
+    virtual int32 CountLive();
+    /// Of those living, the ones that MarkAllReported has not seen.
+    virtual int32 CountUnreported();
+
+    /// Writes all unreported records, in the order of their addresses. Null: a DefaultDumper.
+    virtual void DumpAll(AllocDumper* dumper);
+    /// Writes one record if it exists and is unreported. Null: a DefaultDumper.
+    virtual void DumpOne(const void* address, AllocDumper* dumper);
+    virtual bool IsTracked(const void* address);
+    /// Leaves every record made until now out of later counts of unreported records, and out of dumps.
+    virtual void MarkAllReported();
+
+private:
+    class Implementation;
+    Implementation* implementation_ = nullptr;
+};
+
+}  // namespace tessel
+
+#endif
+#endif

@@ -1,0 +1,51 @@
+/* Leak reports: what is still living in a tracker, written to a text file and summed up in a report. */
+#ifndef TESSEL_DIAGNOSTICS_DUMPLEAKINFO_H
+#define TESSEL_DIAGNOSTICS_DUMPLEAKINFO_H
+
+#include <tessel/diagnostics/AllocTracker.h>
+
+TESSEL_BEGIN_C
+
+/* Reports the unreported records of a tracker (null: does nothing). When there are more than expected, each is written
+   to the named file in the system's temporary folder, and a level-3 report tells how many more; else a level-0 report
+   tells the total. Any thread. */
+TESSEL_API void DumpLeakInfo(AllocTrackerPtr tracker, int32 expected, CStr name, CStr fileName);
+
+TESSEL_END_C
+
+#ifdef __cplusplus
+#    include <cstdarg>
+
+namespace tessel {
+
+/// Writes a leak report. The texts are kept by address.
+class TESSEL_API LeakDumper : public AllocDumper {
+public:
+    LeakDumper(int32 expected, const char* name, const char* fileName);
+    ~LeakDumper() override;
+    LeakDumper(const LeakDumper&) = delete;
+    LeakDumper& operator=(const LeakDumper&) = delete;
+
+    const char* ObjBeingTrackedName() override;
+    bool GetShowStackNames() override;
+    /// Writes to the open file, else to a level-0 report.
+    void FormatToOutput(const char* format, ...) override __attribute__((format(printf, 2, 3)));
+    /// At most 254 bytes, each that cannot be printed as ".". An object that cannot be read gives nothing.
+    void DumpItemContents(const void* address, uint32 size) override;
+
+    /// The report described at DumpLeakInfo.
+    void DumpLeaks(AllocTracker& tracker);
+
+private:
+    void DumpToFile(AllocTracker& tracker, int32 count);
+
+    const char* name_;
+    const char* fileName_;
+    int32 expected_;
+    void* file_;  // the open output file, or null
+};
+
+}  // namespace tessel
+
+#endif
+#endif
