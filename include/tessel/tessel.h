@@ -16,6 +16,12 @@
 #include <tessel/diagnostics/StackChain.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/files/shortcut.h>
+#include <tessel/memory/CookieManager.h>
+#include <tessel/memory/HObjList.h>
+#include <tessel/memory/MemoryManager.h>
+#include <tessel/memory/MemoryUtil.h>
+#include <tessel/memory/ScopedAllocationTracking.h>
+#include <tessel/memory/TrackedMallocFree.h>
 #include <tessel/resources/RFReadWrite.h>
 #include <tessel/resources/ResourceManager.h>
 #include <tessel/resources/ovresfile.h>
@@ -32,5 +38,19 @@
 #include <tessel/strings/StringUtils.h>
 #include <tessel/strings/ovhandle.h>
 #include <tessel/strings/ovstring.h>
+#include <tessel/sync/PlatformEvent.h>
+#include <tessel/sync/PlatformEventTimer.h>
+#include <tessel/sync/PlatformMutex.h>
+#include <tessel/sync/ThAtomic.h>
+#include <tessel/sync/ThEvent.h>
+#include <tessel/sync/ThLocalStorage.h>
+#include <tessel/sync/ThMutex.h>
+#include <tessel/sync/ThSleep.h>
+#include <tessel/system/CPUInformation.h>
+#include <tessel/system/OpSystemInfo.h>
+#include <tessel/system/PlatformInformation.h>
+#include <tessel/time/BMTime.h>
+#include <tessel/time/HRTime.h>
+#include <tessel/time/Millisecs.h>
 
 #endif

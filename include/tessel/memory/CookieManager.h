@@ -1,0 +1,143 @@
+/* Cookie jars: tables that give out 32-bit refnums (cookies) for small records of a fixed size.
+
+   A cookie is a generation (bits 31-20, 1 to 4095) above a slot index (bits 19-0), so that a cookie whose record is
+   gone is refused even when its slot is used again. 0 is never a cookie. A record never moves while its cookie lives. A
+   jar holds up to 1,048,576 cookies and gives memory back only when it is disposed of.
+
+   The flat functions work on a jar handle; tessel::BaseCookieJar holds one; tessel::CookieJar<T> keeps pointers.
+   Any thread; lookups take no lock. */
+#ifndef TESSEL_MEMORY_COOKIEMANAGER_H
+#define TESSEL_MEMORY_COOKIEMANAGER_H
+
+#include <tessel/base/MgErr.h>
+#include <tessel/base/Types.h>
+
+typedef uint32 MagicCookie;
+typedef UHandle MagicCookieJar;
+
+TESSEL_BEGIN_C
+
+/* A jar for one pointer (or any record of sizeof(void*) bytes) per cookie, or null when there is no memory. */
+TESSEL_API MagicCookieJar MCNewJar(void);
+
+/* A jar for `infoSize` bytes per cookie, or null. The bytes start at an address aligned for a pointer. */
+TESSEL_API MagicCookieJar MCNewBigJar(uint32 infoSize);
+
+/* Disposes of the jar and its records, with a report of its size. Nothing for null. Always kNoErr. */
+TESSEL_API MgErr MCDisposeJar(MagicCookieJar jar);
+
+/* *count = cookies alive. kArgErr when either argument is null. */
+TESSEL_API MgErr MCJarSize(MagicCookieJar jar, int32* count);
+
+/* A new cookie for a copy of the record at `info`; 0 for a null jar, no memory or a full jar. */
+TESSEL_API MagicCookie MCNewCookie(MagicCookieJar jar, const void* info);
+
+/* Ends the cookie; its record is copied to infoOut unless that is null. kArgErr when it is no cookie of the jar.
+   Like MCSetCookieInfo, MCGetCookieList and MCGetCookieForInfo: the jar must not be null. */
+TESSEL_API MgErr MCDisposeCookie(MagicCookieJar jar, MagicCookie cookie, void* infoOut);
+
+/* Replaces the record. kArgErr when it is no cookie of the jar. */
+TESSEL_API MgErr MCSetCookieInfo(MagicCookieJar jar, MagicCookie cookie, const void* info);
+
+/* Copies the record out. kArgErr for a null jar or what is no cookie; infoOut is then untouched, except that a pointer
+   whose cookie ended during the call reads as null. */
+TESSEL_API MgErr MCGetCookieInfo(MagicCookieJar jar, MagicCookie cookie, void* infoOut);
+
+/* *info = the record in place, good while the cookie lives; null and kArgErr on failure. */
+TESSEL_API MgErr MCGetCookieInfoPtr(MagicCookieJar jar, MagicCookie cookie, void** info);
+
+/* Fills *list, a handle of uint32 (made when null): [0] the count, then the live cookies by slot index. */
+TESSEL_API MgErr MCGetCookieList(MagicCookieJar jar, UHandle* list);
+
+/* False for a null jar. */
+TESSEL_API bool MCIsACookie(MagicCookieJar jar, MagicCookie cookie);
+
+/* The first live cookie, by slot index, whose record has the bytes of `info`; 0 when there is none. */
+TESSEL_API MagicCookie MCGetCookieForInfo(MagicCookieJar jar, const void* info);
+
+TESSEL_END_C
+
+#ifdef __cplusplus
+#    include <tessel/memory/TrackedMallocFree.h>
+
+namespace tessel {
+
+/* A list of cookies. Owns its handle. */
+class TESSEL_API CookieList : public TrackedObject {
+public:
+    CookieList() = default;
+    ~CookieList();
+    CookieList(const CookieList&) = delete;
+    CookieList& operator=(const CookieList&) = delete;
+
+    int32 GetCount() const { return fCount; }
+    /* 0 when i is out of range. */
+    MagicCookie GetCookie(int32 i) const;
+    /* kArgErr when i is out of range. */
+    MgErr SetCookie(int32 i, MagicCookie cookie);
+    /* New cookies are 0. kArgErr for a negative count; out of memory empties the list or leaves it empty. */
+    MgErr SetCount(int32 count);
+
+private:
+    int32 fCount = 0;
+    UHandle fCookies = nullptr;
+};
+
+/* A jar as an object. Its methods are the flat functions above, called with its jar. Infos are `infoSize` bytes.
+   With a rights mode other than 0 each cookie carries a count, 1 when made, and ends when the count is released to 0.
+   The destructor does not dispose of the jar: Uninit does. */
+class TESSEL_API BaseCookieJar : public TrackedObject {
+public:
+    BaseCookieJar() = default;
+    virtual ~BaseCookieJar() = default;
+    BaseCookieJar(const BaseCookieJar&) = delete;
+    BaseCookieJar& operator=(const BaseCookieJar&) = delete;
+
+    /* kMemFullErr when the jar cannot be made. */
+    MgErr Init(uint32 infoSize, int32 rightsMode);
+    MgErr Uninit();
+
+    MagicCookie NewCookie(const void* info);
+    MgErr DisposeCookie(const MagicCookie& cookie, void* infoOut);
+    MgErr SetCookieInfo(const MagicCookie& cookie, const void* info);
+    MgErr GetCookieInfo(const MagicCookie& cookie, void* infoOut);
+    bool IsACookie(const MagicCookie& cookie);
+    MgErr GetCookieList(CookieList* list);
+    MagicCookie GetCookieForInfo(const void* info);
+
+    /* Raises the count and copies the record out: 1. A cookie that has ended, or a jar without rights: 0, and the first
+       pointer-wide word of infoOut is 0. */
+    int32 AcquireCookieRights(const MagicCookie& cookie, void* infoOut);
+    /* Lowers the count and returns what it was: 1 when the cookie has ended now. 0: nothing to release. */
+    int32 ReleaseCookieRights(const MagicCookie& cookie);
+
+    bool IsAValidJar() const { return fJar != nullptr; }
+    MgErr GetNumCookies(int32* count);
+
+private:
+    MagicCookieJar fJar = nullptr;
+};
+
+/* A jar of pointers: T is a pointer type. */
+template <class T>
+class CookieJar : public BaseCookieJar {
+    static_assert(sizeof(T) == sizeof(void*), "a CookieJar keeps pointers; use BaseCookieJar for other records");
+
+public:
+    MgErr Init(int32 rightsMode = 0) { return BaseCookieJar::Init(sizeof(T), rightsMode); }
+    MagicCookie NewCookie(T info) { return BaseCookieJar::NewCookie(&info); }
+    MgErr DisposeCookie(const MagicCookie& cookie, T* infoOut = nullptr) {
+        return BaseCookieJar::DisposeCookie(cookie, infoOut);
+    }
+    MgErr SetCookieInfo(const MagicCookie& cookie, T info) { return BaseCookieJar::SetCookieInfo(cookie, &info); }
+    MgErr GetCookieInfo(const MagicCookie& cookie, T* infoOut) { return BaseCookieJar::GetCookieInfo(cookie, infoOut); }
+    MagicCookie GetCookieForInfo(T info) { return BaseCookieJar::GetCookieForInfo(&info); }
+    int32 AcquireCookieRights(const MagicCookie& cookie, T* infoOut) {
+        return BaseCookieJar::AcquireCookieRights(cookie, infoOut);
+    }
+};
+
+}  // namespace tessel
+#endif
+
+#endif

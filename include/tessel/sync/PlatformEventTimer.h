@@ -1,0 +1,35 @@
+/* Latency statistics in high-resolution time (time/HRTime.h). Callers serialise. */
+#ifndef TESSEL_SYNC_PLATFORMEVENTTIMER_H
+#define TESSEL_SYNC_PLATFORMEVENTTIMER_H
+
+#include <tessel/base/Types.h>
+#include <tessel/time/HRTime.h>
+
+#ifdef __cplusplus
+
+namespace tessel {
+
+class TESSEL_API PlatformEventTimer {
+public:
+    PlatformEventTimer() = default;
+
+    /* From here on the time counts. */
+    void Start();
+    /* Adds the time since Start to the statistics, unless the clock went backwards. */
+    void RecordLatency();
+    /* Each output may be null. `third` is always 0. */
+    void GetLatencyStats(uint32* count, _HRTime* total, _HRTime* third, _HRTime* minimum, _HRTime* maximum) const;
+
+private:
+    _HRTime fStart = {0, 0};
+    _HRTime fTotal = {0, 0};
+    _HRTime fThird = {0, 0};
+    _HRTime fMaximum = {0, 0};
+    _HRTime fMinimum = {0, 0};
+    uint32 fCount = 0;
+};
+
+}  // namespace tessel
+
+#endif
+#endif

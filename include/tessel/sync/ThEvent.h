@@ -1,0 +1,70 @@
+/* Events: one thread signals, one that waits goes on.
+
+     state          signal                    reset        wait
+     signaled       stays so                  not          not signaled, and goes on
+     not, nobody    signaled                  stays so     waits
+     not, waiters   one of them goes on       stays so     waits
+
+   A null event is what each operation says; one whose verifier is wrong is a fatal report and then as null. Any thread.
+   Destroy an event only when no thread is inside a call on it. */
+#ifndef TESSEL_SYNC_THEVENT_H
+#define TESSEL_SYNC_THEVENT_H
+
+#include <tessel/base/MgErr.h>
+#include <tessel/base/Types.h>
+
+#ifdef __cplusplus
+namespace tessel {
+class PlatformEvent;
+}
+typedef tessel::PlatformEvent* PlatformEventPtr;
+#else
+typedef struct tessel_PlatformEvent* PlatformEventPtr;
+#endif
+
+typedef void (*ThEventSignalProc)(void);
+
+typedef struct THEVENTREC {
+    uint32 verifier; /* kThEventVerifier */
+    PlatformEventPtr platformEvent;
+    ThEventSignalProc customSignal; /* called at the start of every ThEventSignal, or null */
+} THEVENTREC;
+typedef THEVENTREC* ThEvent;
+
+#define kThEventVerifier ((uint32)0x746E7645) /* the bytes "Evnt" */
+
+TESSEL_BEGIN_C
+
+/* A new event in *event, owned by the caller; null there and kMemFullErr when it cannot be made. `ignored` is not used.
+   WithCustomSignal: `customSignal` (or null) is called at the start of every signal, on the signaling thread. */
+TESSEL_API MgErr ThEventCreate(ThEvent* event, uint32 ignored, bool signaled);
+TESSEL_API MgErr ThEventCreateWithCustomSignal(ThEvent* event, uint32 ignored, bool signaled,
+                                               ThEventSignalProc customSignal);
+
+/* An error report for null or a failing platform. */
+TESSEL_API void ThEventDestroy(ThEvent event);
+
+/* 1 when a thread was waiting, else 0. Several signals before a wait count as one. Null: 0. */
+TESSEL_API int32 ThEventSignal(ThEvent event);
+
+/* 1 when the event was signaled, else 0. Null: 0. */
+TESSEL_API int32 ThEventReset(ThEvent event);
+
+/* Waits until signaled: kNoErr, or kTimeOutErr after so many milliseconds; negative waits for ever. Null: kArgErr. */
+TESSEL_API MgErr ThEventWaitWithTimeout(ThEvent event, int32 milliseconds);
+TESSEL_API MgErr ThEventWait(ThEvent event);
+
+/* Waits for one of two events (the second may be null, or the first again) or, with pumpMessages, for a message to the
+   host. 1 only when the first event was signaled; 0 for the second, a message or a time-out. Null first event: 1. */
+TESSEL_API int32 ThEventMsgWaitMultiple(ThEvent event, ThEvent second, int32 milliseconds, bool pumpMessages);
+
+/* Tells those who wait with pumpMessages that a message has arrived. */
+TESSEL_API void ThEventMessageArrived(void);
+
+/* Calls pump(argument) once. For a null event its result; else kMemFullErr: waiting while pumping is not available. */
+typedef MgErr (*ThEventPumpProc)(void* argument);
+TESSEL_API MgErr ThEventWaitAndPump(ThEvent event, ThEventPumpProc pump, int32 milliseconds, void* argument);
+
+TESSEL_END_C
+
+#endif
