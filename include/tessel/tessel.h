@@ -22,6 +22,14 @@
 #include <tessel/memory/MemoryUtil.h>
 #include <tessel/memory/ScopedAllocationTracking.h>
 #include <tessel/memory/TrackedMallocFree.h>
+#include <tessel/numerics/ComplexMath.h>
+#include <tessel/numerics/FloatingPointConstants.h>
+#include <tessel/numerics/FloatingPointRegisters.h>
+#include <tessel/numerics/IntegerMath.h>
+#include <tessel/numerics/NumericSupport.h>
+#include <tessel/numerics/PackedDecimal.h>
+#include <tessel/numerics/RealMath.h>
+#include <tessel/numerics/RoundingUtil.h>
 #include <tessel/paths/PathAbbreviation.h>
 #include <tessel/paths/PathCachedItem.h>
 #include <tessel/paths/PathManager.h>
@@ -37,6 +45,7 @@
 #include <tessel/streams/OutputBuf.h>
 #include <tessel/strings/BSTR.h>
 #include <tessel/strings/CPStrList.h>
+#include <tessel/strings/NumericText.h>
 #include <tessel/strings/StringCLStr.h>
 #include <tessel/strings/StringCPStr.h>
 #include <tessel/strings/StringCStr.h>

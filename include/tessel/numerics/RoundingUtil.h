@@ -1,0 +1,36 @@
+/* Rounding, and conversions between doubles and integers. Nothing here fails, whatever the argument: what lies outside
+   the result's range saturates. Any thread. */
+#ifndef TESSEL_NUMERICS_ROUNDINGUTIL_H
+#define TESSEL_NUMERICS_ROUNDINGUTIL_H
+
+#include <tessel/base/NumericTypes.h>
+
+TESSEL_BEGIN_C
+
+/* x rounded to a multiple of `increment`, halves away from zero: RndToInc(8, 5) is 10, RndToInc(-5, 10) is -10. A
+   result that does not fit wraps around. increment must not be 0. */
+TESSEL_API int32 RndToInc(int32 x, int32 increment);
+
+/* The nearest integer, halves to the even neighbour. A value outside the range gives the nearer limit, a NaN the
+   maximum. */
+TESSEL_API int32 RndToNearest(double x);
+TESSEL_API int64 RndToNearestI64(double x);
+TESSEL_API uint32 RndToNearestU32(double x);
+TESSEL_API uint64 RndToNearestU64(double x);
+
+/* The nearest double, halves to even. */
+TESSEL_API double UInt64ToFloat64(uint64 value);
+
+/* The same rule as RndToNearest, for every width: nearest, halves to even, saturating, a NaN gives the maximum. */
+TESSEL_API int8 Float64ToInt8(double x);
+TESSEL_API int16 Float64ToInt16(double x);
+TESSEL_API int32 Float64ToInt32(double x);
+TESSEL_API int64 Float64ToInt64(double x);
+TESSEL_API uint8 Float64ToUInt8(double x);
+TESSEL_API uint16 Float64ToUInt16(double x);
+TESSEL_API uint32 Float64ToUInt32(double x);
+TESSEL_API uint64 Float64ToUInt64(double x);
+
+TESSEL_END_C
+
+#endif
