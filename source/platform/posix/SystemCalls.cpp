@@ -1,0 +1,76 @@
+#include "platform/posix/SystemCalls.h"
+
+#include <errno.h>
+#include <stdio.h>
+#include <sys/mman.h>
+#include <sys/random.h>
+#include <sys/syscall.h>
+#include <sys/xattr.h>
+#include <unistd.h>
+
+namespace tessel::platform {
+
+namespace {
+
+/* The C library's own declare variable arguments. */
+int Open(const char* name, int flags, mode_t mode) {
+    return ::open(name, flags, mode);
+}
+int Lock(int file, int command, struct flock* range) {
+    return ::fcntl(file, command, range);
+}
+
+/* The C library has no futex. On 32-bit hosts the call with 64-bit times is another one. */
+long Futex(std::uint32_t* word, int operation, std::uint32_t value, const struct timespec* timeout) {
+#if defined(SYS_futex_time64)
+    return ::syscall(SYS_futex_time64, word, operation, value, timeout, nullptr, 0);
+#else
+    return ::syscall(SYS_futex, word, operation, value, timeout, nullptr, 0);
+#endif
+}
+
+/* Reports through its result, unlike all others. */
+int ClockNanosleep(clockid_t clock, int flags, const struct timespec* time, struct timespec* remaining) {
+    int error = ::clock_nanosleep(clock, flags, time, remaining);
+    if (error == 0) return 0;
+    errno = error;
+    return -1;
+}
+
+}  // namespace
+
+constinit SystemCalls systemCalls = {
+    .open = Open,
+    .close = ::close,
+    .read = ::read,
+    .write = ::write,
+    .lseek = ::lseek,
+    .ftruncate = ::ftruncate,
+    .fsync = ::fsync,
+    .lock = Lock,
+    .mmap = ::mmap,
+    .munmap = ::munmap,
+    .statx = ::statx,
+    .futimens = ::futimens,
+    .fsetxattr = ::fsetxattr,
+    .getxattr = ::getxattr,
+    .fgetxattr = ::fgetxattr,
+    .renameat2 = ::renameat2,
+    .link = ::link,
+    .unlink = ::unlink,
+    .rmdir = ::rmdir,
+    .mkdir = ::mkdir,
+    .chmod = ::chmod,
+    .fchmod = ::fchmod,
+    .chdir = ::chdir,
+    .statfs = ::statfs,
+    .copy_file_range = ::copy_file_range,
+    .pipe2 = ::pipe2,
+    .clock_gettime = ::clock_gettime,
+    .clock_nanosleep = ClockNanosleep,
+    .futex = Futex,
+    .process_vm_readv = ::process_vm_readv,
+    .getrandom = ::getrandom,
+};
+
+}  // namespace tessel::platform

@@ -1,0 +1,65 @@
+/* Every call that this backend makes of the kernel, by name, in one table that tests replace parts of: a short write,
+   an interruption, a full disk, a clock moved by hand. */
+#ifndef TESSEL_PLATFORM_POSIX_SYSTEMCALLS_H
+#define TESSEL_PLATFORM_POSIX_SYSTEMCALLS_H
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/statfs.h>
+#include <sys/types.h>
+#include <sys/uio.h>
+#include <time.h>
+
+#include <cstddef>
+#include <cstdint>
+
+namespace tessel::platform {
+
+/* X(result, name, parameters): all return -1 (mmap: MAP_FAILED) and set errno on failure. */
+#define TESSEL_SYSTEM_CALLS(X)                                                                                     \
+    X(int, open, (const char* name, int flags, mode_t mode))                                                       \
+    X(int, close, (int file))                                                                                      \
+    X(ssize_t, read, (int file, void* buffer, std::size_t count))                                                  \
+    X(ssize_t, write, (int file, const void* data, std::size_t count))                                             \
+    X(off_t, lseek, (int file, off_t offset, int from))                                                            \
+    X(int, ftruncate, (int file, off_t size))                                                                      \
+    X(int, fsync, (int file))                                                                                      \
+    X(int, lock, (int file, int command, struct flock* range))                                                     \
+    X(void*, mmap, (void* address, std::size_t size, int protection, int flags, int file, off_t offset))           \
+    X(int, munmap, (void* address, std::size_t size))                                                              \
+    X(int, statx, (int folder, const char* name, int flags, unsigned mask, struct statx* result))                  \
+    X(int, futimens, (int file, const struct timespec* times))                                                     \
+    X(int, fsetxattr, (int file, const char* name, const void* value, std::size_t size, int flags))                \
+    X(ssize_t, getxattr, (const char* path, const char* name, void* value, std::size_t size))                      \
+    X(ssize_t, fgetxattr, (int file, const char* name, void* value, std::size_t size))                             \
+    X(int, renameat2, (int fromFolder, const char* from, int toFolder, const char* to, unsigned flags))            \
+    X(int, link, (const char* from, const char* to))                                                               \
+    X(int, unlink, (const char* name))                                                                             \
+    X(int, rmdir, (const char* name))                                                                              \
+    X(int, mkdir, (const char* name, mode_t mode))                                                                 \
+    X(int, chmod, (const char* name, mode_t mode))                                                                 \
+    X(int, fchmod, (int file, mode_t mode))                                                                        \
+    X(int, chdir, (const char* name))                                                                              \
+    X(int, statfs, (const char* name, struct statfs* result))                                                      \
+    X(ssize_t, copy_file_range,                                                                                    \
+      (int from, off64_t* fromOffset, int to, off64_t* toOffset, std::size_t count, unsigned flags))               \
+    X(int, pipe2, (int* files, int flags))                                                                         \
+    X(int, clock_gettime, (clockid_t clock, struct timespec * time))                                               \
+    X(int, clock_nanosleep, (clockid_t clock, int flags, const struct timespec* time, struct timespec* remaining)) \
+    X(long, futex, (std::uint32_t * word, int operation, std::uint32_t value, const struct timespec* timeout))     \
+    X(ssize_t, process_vm_readv,                                                                                   \
+      (pid_t process, const struct iovec* local, unsigned long locals, const struct iovec* remote,                 \
+       unsigned long remotes, unsigned long flags))                                                                \
+    X(ssize_t, getrandom, (void* buffer, std::size_t count, unsigned flags))
+
+struct SystemCalls {
+#define TESSEL_SYSTEM_CALL_MEMBER(result, name, parameters) result(*name) parameters;
+    TESSEL_SYSTEM_CALLS(TESSEL_SYSTEM_CALL_MEMBER)
+#undef TESSEL_SYSTEM_CALL_MEMBER
+};
+
+extern SystemCalls systemCalls;
+
+}  // namespace tessel::platform
+
+#endif
