@@ -1,0 +1,330 @@
+#include "platform/DriveTable.h"
+
+#include <dirent.h>
+#include <locale.h>
+#include <unistd.h>
+#include <wctype.h>
+
+#include <algorithm>
+#include <atomic>
+#include <cstdlib>
+#include <memory>
+
+#include "platform/CodePage.h"
+#include "platform/Mutex.h"
+#include "platform/posix/NativeNames.h"
+#include "platform/posix/SystemCalls.h"
+#include "platform/posix/Utf8.h"
+
+namespace tessel::platform {
+
+// ---- the table ------------------------------------------------------------------------------------------------------
+
+namespace {
+
+/* Folders are absolute and without a separator at the end, so "/" is the empty text; `present` tells the two apart. */
+struct Table {
+    bool present[26] = {};
+    std::string folder[26];
+    std::string network;
+    std::unique_ptr<Table> older; /* readers may still hold it */
+};
+
+std::atomic<Table*> activeTable{nullptr};
+Mutex tableMutex; /* guards the making of a table */
+
+/* Owns the newest table, and through it the older ones. */
+std::unique_ptr<Table>& OwnedTable() {
+    static std::unique_ptr<Table>* const owned = new std::unique_ptr<Table>; /* outlives every thread */
+    return *owned;
+}
+
+std::string WithoutEndSeparators(std::string_view folder) {
+    while (!folder.empty() && folder.back() == '/') folder.remove_suffix(1);
+    return std::string(folder);
+}
+
+int DriveIndex(char letter) {
+    if (letter >= 'a' && letter <= 'z') letter = static_cast<char>(letter - 'a' + 'A');
+    return letter >= 'A' && letter <= 'Z' ? letter - 'A' : -1;
+}
+
+/* One entry of TESSEL_DRIVES; what does not read `X=/folder` is left out. */
+void AddDrive(Table& table, std::string_view entry) {
+    if (entry.size() < 3 || entry[1] != '=' || entry[2] != '/') return;
+    int index = DriveIndex(entry[0]);
+    if (index < 0) return;
+    table.present[index] = true;
+    table.folder[index] = WithoutEndSeparators(entry.substr(2));
+}
+
+std::unique_ptr<Table> MakeTable() {
+    auto table = std::make_unique<Table>();
+    const char* setting = std::getenv("TESSEL_DRIVES");
+    std::string_view drives = setting && *setting ? setting : "C=/";
+    while (!drives.empty()) {
+        std::size_t end = std::min(drives.find(';'), drives.size());
+        AddDrive(*table, drives.substr(0, end));
+        drives.remove_prefix(std::min(end + 1, drives.size()));
+    }
+    const char* network = std::getenv("TESSEL_UNC");
+    if (network && *network == '/') table->network = WithoutEndSeparators(network);
+    return table;
+}
+
+void PublishTable() {
+    std::unique_ptr<Table>& owned = OwnedTable();
+    std::unique_ptr<Table> table = MakeTable();
+    table->older = std::move(owned);
+    owned = std::move(table);
+    activeTable.store(owned.get(), std::memory_order_release);
+}
+
+const Table& Drives() {
+    const Table* table = activeTable.load(std::memory_order_acquire);
+    if (table) return *table;
+    MutexHolder holder(tableMutex);
+    if (!activeTable.load(std::memory_order_relaxed)) PublishTable();
+    return *activeTable.load(std::memory_order_relaxed);
+}
+
+bool IsAtOrUnder(std::string_view native, std::string_view folder) {
+    if (native.substr(0, folder.size()) != folder) return false;
+    return native.size() == folder.size() || native[folder.size()] == '/';
+}
+
+/* The drive that lies nearest above a native name, or -1. */
+int NearestDrive(const Table& table, std::string_view native) {
+    int nearest = -1;
+    for (int i = 0; i < 26; ++i) {
+        if (!table.present[i] || !IsAtOrUnder(native, table.folder[i])) continue;
+        if (nearest < 0 || table.folder[i].size() > table.folder[nearest].size()) nearest = i;
+    }
+    return nearest;
+}
+
+std::string NativeCurrentFolder() {
+    std::unique_ptr<char, decltype(&std::free)> folder(::getcwd(nullptr, 0), std::free);
+    return folder ? folder.get() : "/";
+}
+
+}  // namespace
+
+void ReloadDrives() {
+    MutexHolder holder(tableMutex);
+    PublishTable();
+}
+
+// ---- names to the host's --------------------------------------------------------------------------------------------
+
+namespace {
+
+/* The name in UTF-8 with `/` between its parts and none at its end. */
+bool Normalize(std::string_view name, std::string& text) {
+    if (ActiveCodePage().utf8) {
+        text.assign(name);
+    } else if (!ToUtf8(name, text)) {
+        return FailWith(kErrorInvalidName);
+    }
+    if (text.empty() || text.find('\0') != std::string::npos) return FailWith(kErrorInvalidName);
+    std::replace(text.begin(), text.end(), '\\', '/');
+    while (text.size() > 1 && text.back() == '/') text.pop_back();
+    return true;
+}
+
+bool NetworkName(const Table& table, std::string_view text, std::string& native) {
+    if (table.network.empty() || text.size() < 3 || text[2] == '/') return FailWith(kErrorNetworkPathNotFound);
+    native = table.network;
+    native += text.substr(1);
+    return true;
+}
+
+/* `rest` is what stands behind the drive: absolute on it, or relative to the current folder if that lies there. */
+bool DriveName(const Table& table, int index, std::string_view rest, std::string& native) {
+    if (index < 0 || !table.present[index]) return FailWith(kErrorPathNotFound);
+    native = table.folder[index];
+    if (rest.empty() || rest[0] != '/') {
+        std::string current = NativeCurrentFolder();
+        if (IsAtOrUnder(current, native)) native = current == "/" ? "" : current;
+        if (!rest.empty()) native += '/';
+    }
+    if (rest != "/") native += rest;
+    if (native.empty()) native = "/";
+    return true;
+}
+
+}  // namespace
+
+bool NameToNativeText(std::string_view name, std::string& native) {
+    std::string text;
+    if (!Normalize(name, text)) return false;
+    const Table& table = Drives();
+    if (text.size() > 1 && text[0] == '/' && text[1] == '/') return NetworkName(table, text, native);
+    if (text.size() > 1 && text[1] == ':') {
+        return DriveName(table, DriveIndex(text[0]), std::string_view(text).substr(2), native);
+    }
+    if (text[0] == '/') return DriveName(table, NearestDrive(table, NativeCurrentFolder()), text, native);
+    native = std::move(text);
+    return true;
+}
+
+bool NameToNative(std::string_view name, std::string& native) {
+    if (!NameToNativeText(name, native)) return false;
+    MatchOnDisk(native);
+    return true;
+}
+
+// ---- matching on the disk -------------------------------------------------------------------------------------------
+
+std::string NativeParent(std::string_view native) {
+    std::size_t separator = native.rfind('/');
+    if (separator == std::string_view::npos) return ".";
+    return separator == 0 ? "/" : std::string(native.substr(0, separator));
+}
+
+std::string_view NativeLast(std::string_view native) {
+    return native.substr(native.rfind('/') + 1);
+}
+
+namespace {
+
+/* Upper case as every language maps it. The C library's own tables, whatever locale the process has. */
+char32_t UpperOf(char32_t character) {
+    if (character < 0x80) return character >= 'a' && character <= 'z' ? character - 32 : character;
+    static const locale_t locale = newlocale(LC_CTYPE_MASK, "C.UTF-8", nullptr);
+    return locale ? static_cast<char32_t>(towupper_l(character, locale)) : character;
+}
+
+/* One character of UTF-8, or one byte that is none, marked so that it equals only itself. */
+char32_t TakeUpper(std::string_view& text) {
+    char32_t character = 0;
+    std::size_t length = DecodeUtf8(text.data(), text.data() + text.size(), character);
+    if (length == 0) character = 0x80000000u | static_cast<unsigned char>(text[0]);
+    text.remove_prefix(length ? length : 1);
+    return length ? UpperOf(character) : character;
+}
+
+bool Exists(const std::string& native) {
+    struct statx status;
+    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0;
+}
+
+bool IsFolder(const std::string& native) {
+    struct statx status;
+    return systemCalls.statx(AT_FDCWD, native.c_str(), 0, STATX_TYPE, &status) == 0 && S_ISDIR(status.stx_mode);
+}
+
+/* The entry of `folder` that is `name` in another case. The first in byte order where there are several, so that the
+   answer does not hang on the order of the listing. */
+bool FindInFolder(const std::string& folder, std::string_view name, std::string& found) {
+    std::unique_ptr<DIR, int (*)(DIR*)> listing(opendir(folder.c_str()), closedir);
+    if (!listing) return false;
+    found.clear();
+    while (const dirent* entry = readdir(listing.get())) {
+        if (EqualNames(name, entry->d_name) && (found.empty() || found > entry->d_name)) found = entry->d_name;
+    }
+    return !found.empty();
+}
+
+}  // namespace
+
+bool EqualNames(std::string_view a, std::string_view b) noexcept {
+    while (!a.empty() && !b.empty()) {
+        if (TakeUpper(a) != TakeUpper(b)) return false;
+    }
+    return a.empty() && b.empty();
+}
+
+Match MatchOnDisk(std::string& native) {
+    if (Exists(native)) return Match::kAll;
+    std::string parent = NativeParent(native);
+    std::string last(NativeLast(native));
+    if (last.empty() || parent == native) return Match::kParentMissing;
+    bool parentThere = MatchOnDisk(parent) == Match::kAll;
+    std::string found;
+    bool there = parentThere && FindInFolder(parent, last, found);
+    bool hasFolder = native.find('/') != std::string::npos;
+    native = !hasFolder ? "" : parent == "/" ? parent : parent + "/";
+    native += there ? found : last;
+    if (there) return Match::kAll;
+    return parentThere && IsFolder(parent) ? Match::kLastMissing : Match::kParentMissing;
+}
+
+// ---- names from the host's ------------------------------------------------------------------------------------------
+
+std::string NameFromDisk(std::string_view diskName) {
+    std::string plain(diskName);
+    std::replace(plain.begin(), plain.end(), '\\', '?');
+    if (ActiveCodePage().utf8) return plain;
+    std::string name;
+    FromUtf8(plain, name);
+    return name;
+}
+
+bool NativeToName(std::string_view native, std::string& name) {
+    if (native.empty() || native[0] != '/') return FailWith(kErrorInvalidName);
+    std::string plain = WithoutEndSeparators(native);
+    const Table& table = Drives();
+    int drive = NearestDrive(table, plain);
+    const std::string& network = table.network;
+    bool onNetwork = !network.empty() && plain.size() > network.size() && IsAtOrUnder(plain, network) &&
+                     (drive < 0 || network.size() >= table.folder[drive].size());
+    if (!onNetwork && drive < 0) return FailWith(kErrorPathNotFound);
+
+    std::string rest = NameFromDisk(plain.substr(onNetwork ? network.size() : table.folder[drive].size()));
+    /* What NameFromDisk leaves of `/` are the separators; no trail byte of a code page is one. */
+    std::replace(rest.begin(), rest.end(), '/', '\\');
+    if (onNetwork) {
+        name = "\\" + rest;
+    } else {
+        name = {static_cast<char>('A' + drive), ':'};
+        name += rest.empty() ? "\\" : rest;
+    }
+    return true;
+}
+
+// ---- drives ---------------------------------------------------------------------------------------------------------
+
+namespace {
+
+/* File systems by the number that the kernel knows them by (statfs). */
+DriveKind KindOfFileSystem(long type) {
+    switch (static_cast<std::uint32_t>(type)) {
+        case 0x6969u:     /* NFS */
+        case 0x517Bu:     /* SMB */
+        case 0xFE534D42u: /* SMB2 */
+        case 0xFF534D42u: /* CIFS */
+        case 0x01021997u: /* 9P */
+        case 0x00C36400u: /* Ceph */
+        case 0x5346414Fu: /* AFS */
+            return DriveKind::kNetwork;
+        case 0x9660u:     /* ISO 9660 */
+        case 0x15013346u: /* UDF */
+            return DriveKind::kCompactDisc;
+        case 0x01021994u: /* tmpfs */
+        case 0x858458F6u: /* ramfs */
+            return DriveKind::kMemory;
+        case 0x4D44u:     /* FAT */
+        case 0x2011BAB0u: /* exFAT */
+            return DriveKind::kRemovable;
+        default:
+            return DriveKind::kFixed;
+    }
+}
+
+}  // namespace
+
+std::vector<Drive> DrivesPresent() {
+    std::vector<Drive> drives;
+    const Table& table = Drives();
+    for (int i = 0; i < 26; ++i) {
+        if (!table.present[i]) continue;
+        struct statfs status;
+        const char* folder = table.folder[i].empty() ? "/" : table.folder[i].c_str();
+        if (systemCalls.statfs(folder, &status) != 0) continue;
+        drives.push_back({static_cast<char>('A' + i), KindOfFileSystem(static_cast<long>(status.f_type))});
+    }
+    return drives;
+}
+
+}  // namespace tessel::platform

@@ -1,0 +1,357 @@
+#include "platform/File.h"
+
+#include <errno.h>
+#include <sys/mman.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <limits>
+#include <string>
+
+#include "platform/posix/Errors.h"
+#include "platform/posix/FileHandles.h"
+#include "platform/posix/NativeNames.h"
+#include "platform/posix/SystemCalls.h"
+
+namespace tessel::platform {
+
+// ---- what others are denied -----------------------------------------------------------------------------------------
+
+namespace {
+
+/* Every open file holds locks on some of four bytes, which lie far beyond any data and are never written. The locks
+   belong to the open file description: they are seen between processes and between two opens of one process, and go
+   when the file is closed. All holders lock for reading, so that any number of them can hold the same mark. The order
+   of the marks makes the usual sets contiguous. */
+constexpr std::int64_t kMarksAt = std::int64_t{1} << 62;
+constexpr unsigned kHasWrite = 1, kHasRead = 2, kDenyWrite = 4, kDenyRead = 8;
+constexpr int kMarkCount = 4;
+
+unsigned MarksOf(std::uint32_t access, std::uint32_t deny) {
+    unsigned marks = 0;
+    if (access & kWrite) marks |= kHasWrite;
+    if (access & kRead) marks |= kHasRead;
+    if (deny & kWrite) marks |= kDenyWrite;
+    if (deny & kRead) marks |= kDenyRead;
+    return marks;
+}
+
+/* The marks of others that stand against ours: what we have against what they deny, and the other way. */
+unsigned AdverseMarks(unsigned marks) {
+    return (marks & 3u) << 2 | marks >> 2;
+}
+
+int LockBytes(int descriptor, int command, short type, std::int64_t start, std::int64_t count, struct flock& range) {
+    range = {};
+    range.l_type = type;
+    range.l_whence = SEEK_SET;
+    range.l_start = static_cast<off_t>(start);
+    range.l_len = static_cast<off_t>(count);
+    int result;
+    do {
+        result = systemCalls.lock(descriptor, command, &range);
+    } while (result != 0 && errno == EINTR);
+    return result;
+}
+
+enum class Marking { kDone, kRefused, kNoLocks };
+
+/* Calls act(first mark, count) for each run of contiguous marks, until one of them is not kDone. */
+template <typename Action>
+Marking ForEachRun(unsigned marks, Action act) {
+    for (int first = 0; first < kMarkCount; ++first) {
+        if (!(marks >> first & 1)) continue;
+        int count = 1;
+        while (marks >> (first + count) & 1) ++count;
+        Marking result = act(first, count);
+        if (result != Marking::kDone) return result;
+        first += count;
+    }
+    return Marking::kDone;
+}
+
+/* A descriptor without read access (the file may be written but not read) can only lock for writing, which refuses more
+   than it must: never too little. */
+Marking SetMarks(int descriptor, unsigned marks, bool readable) {
+    return ForEachRun(marks, [&](int first, int count) {
+        struct flock range;
+        short type = readable ? F_RDLCK : F_WRLCK;
+        if (LockBytes(descriptor, F_OFD_SETLK, type, kMarksAt + first, count, range) == 0) return Marking::kDone;
+        return errno == EAGAIN || errno == EACCES ? Marking::kRefused : Marking::kNoLocks;
+    });
+}
+
+Marking TestMarks(int descriptor, unsigned marks) {
+    return ForEachRun(marks, [&](int first, int count) {
+        struct flock range;
+        if (LockBytes(descriptor, F_OFD_GETLK, F_WRLCK, kMarksAt + first, count, range) != 0) return Marking::kNoLocks;
+        return range.l_type == F_UNLCK ? Marking::kDone : Marking::kRefused;
+    });
+}
+
+/* Marks first and tests then: of two openers at the same moment at least one sees the other's marks. A file system that
+   has no locks denies nothing. */
+bool ShareAllows(int descriptor, std::uint32_t access, std::uint32_t deny, bool readable) {
+    unsigned marks = MarksOf(access, deny);
+    Marking result = SetMarks(descriptor, marks, readable);
+    /* Mostly nobody else has the file open, and one look at all the marks tells. */
+    if (result == Marking::kDone) result = TestMarks(descriptor, (1u << kMarkCount) - 1);
+    if (result == Marking::kRefused) result = TestMarks(descriptor, AdverseMarks(marks));
+    return result != Marking::kRefused;
+}
+
+// ---- opening --------------------------------------------------------------------------------------------------------
+
+int OpenRetrying(const char* native, int flags) {
+    int descriptor;
+    do {
+        descriptor = systemCalls.open(native, flags | O_CLOEXEC | O_NOCTTY, 0666);
+    } while (descriptor < 0 && errno == EINTR);
+    return descriptor;
+}
+
+/* Marks are set by reading, so files are opened for reading too wherever they may be read. */
+int OpenDescriptor(const char* native, std::uint32_t access, int flags, bool& readable) {
+    readable = true;
+    if (access == kRead) return OpenRetrying(native, O_RDONLY | flags);
+    int descriptor = OpenRetrying(native, O_RDWR | flags);
+    if (descriptor >= 0 || errno != EACCES || access != kWrite) return descriptor;
+    readable = false;
+    return OpenRetrying(native, O_WRONLY | flags);
+}
+
+bool IsFolder(int descriptor) {
+    struct statx status;
+    return systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_TYPE, &status) == 0 && S_ISDIR(status.stx_mode);
+}
+
+bool Truncate(int descriptor, std::int64_t size) {
+    int result;
+    do {
+        result = systemCalls.ftruncate(descriptor, static_cast<off_t>(size));
+    } while (result != 0 && errno == EINTR);
+    return result == 0;
+}
+
+/* What has to hold of a descriptor before it is handed out. */
+bool Admit(int descriptor, std::uint32_t access, std::uint32_t deny, bool readable, bool empty) {
+    if (access == kRead && IsFolder(descriptor)) return FailWith(kErrorAccessDenied);
+    if (!ShareAllows(descriptor, access, deny, readable)) return FailWith(kErrorSharingViolation);
+    if (empty && !Truncate(descriptor, 0) && errno != EINVAL) return FailErrno(); /* EINVAL: a device, a pipe */
+    return true;
+}
+
+}  // namespace
+
+FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, Disposition disposition) {
+    bool creates = disposition == Disposition::kCreateNew || disposition == Disposition::kCreateAlways;
+    bool empties = disposition == Disposition::kTruncateExisting || disposition == Disposition::kCreateAlways;
+    bool valid = name && access != 0 && (access | deny) <= (kRead | kWrite);
+    if (!valid || (disposition == Disposition::kTruncateExisting && !(access & kWrite))) {
+        FailWith(kErrorInvalidParameter);
+        return kNoFile;
+    }
+    int flags = creates ? O_CREAT : 0;
+    if (disposition == Disposition::kCreateNew) flags |= O_EXCL;
+
+    int descriptor = -1;
+    bool readable = true;
+    auto open = [&](const std::string& native) {
+        descriptor = OpenDescriptor(native.c_str(), access, flags, readable);
+        return descriptor >= 0;
+    };
+    if (creates) {
+        std::string native;
+        if (!NameToNativeText(name, native)) return kNoFile;
+        Match match = MatchOnDisk(native);
+        if (match == Match::kParentMissing) FailWith(kErrorPathNotFound);
+        if (match == Match::kParentMissing) return kNoFile;
+        if (!open(native)) FailWith(errno == EEXIST ? kErrorFileExists : ErrorOfErrno(errno));
+    } else if (!OnExistingItem(name, open)) {
+        return kNoFile;
+    }
+    if (descriptor < 0) return kNoFile;
+    if (Admit(descriptor, access, deny, readable, empties)) return HandleOf(descriptor, access);
+    systemCalls.close(descriptor);
+    return kNoFile;
+}
+
+bool FileClose(FileHandle file) {
+    /* After EINTR the descriptor is gone all the same; a second close could hit another thread's file. */
+    return systemCalls.close(DescriptorOf(file)) == 0 || errno == EINTR || FailErrno();
+}
+
+// ---- moving bytes ---------------------------------------------------------------------------------------------------
+
+bool FileRead(FileHandle file, void* buffer, std::size_t count, std::size_t& actual) {
+    actual = 0;
+    if (!HasAccess(file, kRead)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
+    while (actual < count) {
+        ssize_t moved = systemCalls.read(DescriptorOf(file), static_cast<char*>(buffer) + actual, count - actual);
+        if (moved == 0) break;
+        if (moved > 0) {
+            actual += static_cast<std::size_t>(moved);
+        } else if (errno != EINTR) {
+            return FailErrno();
+        }
+    }
+    return true;
+}
+
+bool FileWrite(FileHandle file, const void* data, std::size_t count, std::size_t& actual) {
+    actual = 0;
+    if (!HasAccess(file, kWrite)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
+    while (actual < count) {
+        const char* from = static_cast<const char*>(data) + actual;
+        ssize_t moved = systemCalls.write(DescriptorOf(file), from, count - actual);
+        if (moved > 0) {
+            actual += static_cast<std::size_t>(moved);
+        } else if (moved == 0 || errno != EINTR) {
+            return moved == 0 ? FailWith(kErrorDiskFull) : FailErrno();
+        }
+    }
+    return true;
+}
+
+bool FileSeek(FileHandle file, std::int64_t offset, SeekFrom from) {
+    int whence = from == SeekFrom::kStart ? SEEK_SET : from == SeekFrom::kCurrent ? SEEK_CUR : SEEK_END;
+    if (systemCalls.lseek(DescriptorOf(file), static_cast<off_t>(offset), whence) >= 0) return true;
+    return errno == EINVAL && offset < 0 ? FailWith(kErrorNegativeSeek) : FailErrno();
+}
+
+bool FileTell(FileHandle file, std::int64_t& position) {
+    off_t at = systemCalls.lseek(DescriptorOf(file), 0, SEEK_CUR);
+    if (at < 0) return FailErrno();
+    position = at;
+    return true;
+}
+
+bool FileSize(FileHandle file, std::int64_t& size) {
+    struct statx status;
+    if (systemCalls.statx(DescriptorOf(file), "", AT_EMPTY_PATH, STATX_SIZE, &status) != 0) return FailErrno();
+    size = static_cast<std::int64_t>(status.stx_size);
+    return true;
+}
+
+bool FileSetSize(FileHandle file, std::int64_t size) {
+    if (!HasAccess(file, kWrite)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
+    return Truncate(DescriptorOf(file), size) || FailErrno();
+}
+
+bool FileFlush(FileHandle file) {
+    int result;
+    do {
+        result = systemCalls.fsync(DescriptorOf(file));
+    } while (result != 0 && errno == EINTR);
+    return result == 0 || errno == EINVAL || errno == EROFS || FailErrno(); /* both: there is no device to wait for */
+}
+
+// ---- mapping --------------------------------------------------------------------------------------------------------
+
+bool FileMap(FileHandle file, const void*& data, std::size_t& size) {
+    data = nullptr;
+    size = 0;
+    if (!HasAccess(file, kRead)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
+    std::int64_t bytes = 0;
+    if (!FileSize(file, bytes)) return false;
+    if (bytes == 0) return FailWith(kErrorFileInvalid);
+    if (static_cast<std::uint64_t>(bytes) > std::numeric_limits<std::size_t>::max()) {
+        return FailWith(kErrorNotEnoughMemory);
+    }
+    std::size_t count = static_cast<std::size_t>(bytes);
+    void* view = systemCalls.mmap(nullptr, count, PROT_READ, MAP_SHARED, DescriptorOf(file), 0);
+    if (view == MAP_FAILED) return FailErrno();
+    data = view;
+    size = count;
+    return true;
+}
+
+bool FileUnmap(const void* data, std::size_t size) {
+    return systemCalls.munmap(const_cast<void*>(data), size) == 0 || FailErrno();
+}
+
+// ---- range locks ----------------------------------------------------------------------------------------------------
+
+namespace {
+
+bool ValidRange(std::int64_t offset, std::int64_t count) {
+    return offset >= 0 && count >= 0 && offset <= kMarksAt - count;
+}
+
+/* True when another handle holds a part of the range. */
+bool HeldByOther(int descriptor, std::int64_t offset, std::int64_t count) {
+    struct flock range;
+    return LockBytes(descriptor, F_OFD_GETLK, F_WRLCK, offset, count, range) == 0 && range.l_type != F_UNLCK;
+}
+
+/* The host locks exclusively only what may be written. A handle that only reads takes a shared lock instead and then
+   looks whether anybody else has one: mark, then test, as for the share modes. */
+bool LockForReader(int descriptor, std::int64_t offset, std::int64_t count) {
+    if (HeldByOther(descriptor, offset, count)) return FailWith(kErrorLockViolation);
+    struct flock range;
+    if (LockBytes(descriptor, F_OFD_SETLK, F_RDLCK, offset, count, range) != 0) return FailErrno();
+    if (!HeldByOther(descriptor, offset, count)) return true;
+    LockBytes(descriptor, F_OFD_SETLK, F_UNLCK, offset, count, range);
+    return FailWith(kErrorLockViolation);
+}
+
+}  // namespace
+
+bool FileLock(FileHandle file, std::int64_t offset, std::int64_t count) {
+    if (!ValidRange(offset, count)) return FailWith(kErrorInvalidParameter);
+    if (count == 0) return true;
+    int descriptor = DescriptorOf(file);
+    if (!HasAccess(file, kWrite)) return LockForReader(descriptor, offset, count);
+    struct flock range;
+    return LockBytes(descriptor, F_OFD_SETLK, F_WRLCK, offset, count, range) == 0 || FailErrno();
+}
+
+bool FileUnlock(FileHandle file, std::int64_t offset, std::int64_t count) {
+    if (!ValidRange(offset, count)) return FailWith(kErrorInvalidParameter);
+    if (count == 0) return true;
+    /* A handle does not see its own locks. A second one on the same file does. */
+    char self[40];
+    std::snprintf(self, sizeof self, "/proc/self/fd/%d", DescriptorOf(file));
+    int other = OpenRetrying(self, O_RDONLY);
+    bool locked = other < 0 || HeldByOther(other, offset, count);
+    if (other >= 0) systemCalls.close(other);
+    if (!locked) return FailWith(kErrorNotLocked);
+    struct flock range;
+    return LockBytes(DescriptorOf(file), F_OFD_SETLK, F_UNLCK, offset, count, range) == 0 || FailErrno();
+}
+
+// ---- information ----------------------------------------------------------------------------------------------------
+
+namespace {
+
+timespec HostTime(std::int64_t fileTime) {
+    timespec time{};
+    time.tv_nsec = UTIME_OMIT;
+    if (fileTime == 0) return time;
+    std::int64_t since1970 = fileTime - kFileTimeOf1970;
+    std::int64_t part = (since1970 % kFileTimesPerSecond + kFileTimesPerSecond) % kFileTimesPerSecond;
+    time.tv_sec = static_cast<time_t>((since1970 - part) / kFileTimesPerSecond);
+    time.tv_nsec = static_cast<long>(part * 100);
+    return time;
+}
+
+void ToBytes(std::int64_t fileTime, unsigned char (&bytes)[8]) {
+    for (int i = 0; i < 8; ++i) bytes[i] = static_cast<unsigned char>(static_cast<std::uint64_t>(fileTime) >> (8 * i));
+}
+
+}  // namespace
+
+bool FileSetTimes(FileHandle file, std::int64_t created, std::int64_t accessed, std::int64_t modified) {
+    if (!HasAccess(file, kWrite)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
+    int descriptor = DescriptorOf(file);
+    if (created != 0) {
+        unsigned char bytes[8];
+        ToBytes(created, bytes);
+        systemCalls.fsetxattr(descriptor, kCreatedAttribute, bytes, sizeof bytes, 0); /* kept where it can be */
+    }
+    timespec times[2] = {HostTime(accessed), HostTime(modified)};
+    return systemCalls.futimens(descriptor, times) == 0 || FailErrno();
+}
+
+}  // namespace tessel::platform

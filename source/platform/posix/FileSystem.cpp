@@ -1,0 +1,378 @@
+#include "platform/FileSystem.h"
+
+#include <dirent.h>
+#include <errno.h>
+#include <linux/fs.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <memory>
+
+#include "platform/posix/FileHandles.h"
+#include "platform/posix/NativeNames.h"
+#include "platform/posix/SystemCalls.h"
+
+namespace tessel::platform {
+
+// ---- looking --------------------------------------------------------------------------------------------------------
+
+void FillInfo(const struct statx& status, ItemInfo& info) {
+    info = {};
+    info.folder = S_ISDIR(status.stx_mode);
+    info.mode = status.stx_mode & 0777u;
+    info.readOnly = (info.mode & 0222u) == 0;
+    info.size = info.folder ? 0 : static_cast<std::int64_t>(status.stx_size);
+    info.accessed = FileTimeOf(status.stx_atime.tv_sec, status.stx_atime.tv_nsec);
+    info.modified = FileTimeOf(status.stx_mtime.tv_sec, status.stx_mtime.tv_nsec);
+    if (status.stx_mask & STATX_BTIME) {
+        info.created = FileTimeOf(status.stx_btime.tv_sec, status.stx_btime.tv_nsec);
+    }
+}
+
+namespace {
+
+/* A link that leads nowhere is described itself, so that it can be seen and deleted. */
+bool GetStatus(const std::string& native, unsigned mask, struct statx& status) {
+    if (systemCalls.statx(AT_FDCWD, native.c_str(), 0, mask, &status) == 0) return true;
+    return errno == ENOENT && systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, mask, &status) == 0;
+}
+
+void TakeCreated(const unsigned char (&bytes)[8], ssize_t count, ItemInfo& info) {
+    if (count != sizeof bytes) return;
+    std::uint64_t time = 0;
+    for (int i = 7; i >= 0; --i) time = time << 8 | bytes[i];
+    info.created = static_cast<std::int64_t>(time);
+}
+
+}  // namespace
+
+bool ItemGetInfo(const char* name, ItemInfo& info) {
+    return OnExistingItem(name, [&](const std::string& native) {
+        struct statx status;
+        if (!GetStatus(native, kInfoMask, status)) return false;
+        FillInfo(status, info);
+        info.hidden = native != "." && native != ".." && NativeLast(native).substr(0, 1) == ".";
+        unsigned char bytes[8];
+        TakeCreated(bytes, systemCalls.getxattr(native.c_str(), kCreatedAttribute, bytes, sizeof bytes), info);
+        return true;
+    });
+}
+
+bool FileGetInfo(FileHandle file, ItemInfo& info) {
+    int descriptor = DescriptorOf(file);
+    struct statx status;
+    if (systemCalls.statx(descriptor, "", AT_EMPTY_PATH, kInfoMask, &status) != 0) return FailErrno();
+    FillInfo(status, info);
+    unsigned char bytes[8];
+    TakeCreated(bytes, systemCalls.fgetxattr(descriptor, kCreatedAttribute, bytes, sizeof bytes), info);
+    return true;
+}
+
+ItemKind ItemExists(const char* name) {
+    ItemKind kind = ItemKind::kNone;
+    OnExistingItem(name, [&](const std::string& native) {
+        struct statx status;
+        if (!GetStatus(native, STATX_TYPE, status)) return false;
+        kind = S_ISDIR(status.stx_mode) ? ItemKind::kFolder : ItemKind::kFile;
+        return true;
+    });
+    return kind;
+}
+
+namespace {
+
+bool FindNative(const char* name, std::string& native) {
+    if (!NameToNativeText(name, native)) return false;
+    Match match = MatchOnDisk(native);
+    if (match == Match::kAll) return true;
+    return FailWith(match == Match::kLastMissing ? kErrorFileNotFound : kErrorPathNotFound);
+}
+
+}  // namespace
+
+bool ItemRealName(const char* name, std::string& real) {
+    std::string native, path;
+    if (!FindNative(name, native)) return false;
+    bool drive = native[0] == '/' && NativeToName(native, path) && path.size() == 3; /* `T:` and the separator */
+    real = drive ? "" : NameFromDisk(NativeLast(native));
+    return true;
+}
+
+bool ItemRealPath(const char* name, std::string& real) {
+    std::string native;
+    if (!FindNative(name, native)) return false;
+    if (native[0] != '/') {
+        std::string current;
+        if (!CurrentFolder(current) || !NameToNativeText(current, current)) return false;
+        native.insert(0, current == "/" ? current : current + "/");
+    }
+    return NativeToName(native, real);
+}
+
+// ---- folders --------------------------------------------------------------------------------------------------------
+
+namespace {
+
+bool EntryIsFolder(DIR* listing, const dirent& entry) {
+    if (entry.d_type != DT_UNKNOWN && entry.d_type != DT_LNK) return entry.d_type == DT_DIR;
+    struct statx status;
+    return systemCalls.statx(dirfd(listing), entry.d_name, 0, STATX_TYPE, &status) == 0 && S_ISDIR(status.stx_mode);
+}
+
+template <typename Visitor>
+bool VisitFolder(const char* name, Visitor visit) {
+    return OnExistingItem(name, [&](const std::string& native) {
+        std::unique_ptr<DIR, int (*)(DIR*)> listing(opendir(native.c_str()), closedir);
+        if (!listing) return false;
+        errno = 0;
+        while (const dirent* entry = readdir(listing.get())) {
+            if (std::strcmp(entry->d_name, ".") != 0 && std::strcmp(entry->d_name, "..") != 0) {
+                visit(listing.get(), *entry);
+            }
+            errno = 0;
+        }
+        return errno == 0;
+    });
+}
+
+}  // namespace
+
+bool FolderList(const char* name, std::vector<FolderEntry>& entries) {
+    entries.clear();
+    return VisitFolder(name, [&](DIR* listing, const dirent& entry) {
+        entries.push_back({NameFromDisk(entry.d_name), EntryIsFolder(listing, entry)});
+    });
+}
+
+bool FolderCount(const char* name, std::int64_t& count) {
+    count = 0;
+    return VisitFolder(name, [&](DIR*, const dirent&) { ++count; });
+}
+
+bool FolderCreate(const char* name) {
+    std::string native;
+    if (!NameToNativeText(name, native)) return false;
+    Match match = MatchOnDisk(native);
+    if (match == Match::kAll) return FailWith(kErrorAlreadyExists);
+    if (match == Match::kParentMissing) return FailWith(kErrorPathNotFound);
+    return systemCalls.mkdir(native.c_str(), 0777) == 0 || FailErrno();
+}
+
+namespace {
+
+bool IsLink(const std::string& native) {
+    struct statx status;
+    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0 &&
+           S_ISLNK(status.stx_mode);
+}
+
+bool IsFolderItself(const std::string& native) {
+    struct statx status;
+    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0 &&
+           S_ISDIR(status.stx_mode);
+}
+
+}  // namespace
+
+bool FolderRemove(const char* name) {
+    return OnExistingItem(name, [](const std::string& native) {
+        if (systemCalls.rmdir(native.c_str()) == 0) return true;
+        if (errno != ENOTDIR) return false;
+        /* A link to a folder goes like a folder; what it leads to stays. */
+        struct statx status;
+        bool link = IsLink(native) && GetStatus(native, STATX_TYPE, status) && S_ISDIR(status.stx_mode);
+        if (link) return systemCalls.unlink(native.c_str()) == 0;
+        errno = ENOTDIR;
+        return false;
+    });
+}
+
+bool FileDelete(const char* name) {
+    return OnExistingItem(name, [](const std::string& native) { return systemCalls.unlink(native.c_str()) == 0; });
+}
+
+// ---- moving and copying ---------------------------------------------------------------------------------------------
+
+namespace {
+
+/* For file systems that cannot rename without replacing. A file is linked under its new name first, which fails when
+   that is taken; for a folder, which cannot be linked, there is a moment between the look and the renaming. */
+bool RenameWithoutReplacing(const std::string& from, const std::string& to) {
+    if (systemCalls.renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), RENAME_NOREPLACE) == 0) return true;
+    if (errno != EINVAL && errno != ENOSYS) return false;
+    if (systemCalls.link(from.c_str(), to.c_str()) == 0) return systemCalls.unlink(from.c_str()) == 0;
+    if (errno == EEXIST || errno == EXDEV) return false;
+    struct statx status;
+    if (systemCalls.statx(AT_FDCWD, to.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0) {
+        errno = EEXIST;
+        return false;
+    }
+    return systemCalls.renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), 0) == 0;
+}
+
+bool SameItem(const std::string& a, const std::string& b) {
+    struct statx first, second;
+    constexpr unsigned mask = STATX_INO;
+    if (systemCalls.statx(AT_FDCWD, a.c_str(), AT_SYMLINK_NOFOLLOW, mask, &first) != 0) return false;
+    if (systemCalls.statx(AT_FDCWD, b.c_str(), AT_SYMLINK_NOFOLLOW, mask, &second) != 0) return false;
+    return first.stx_ino == second.stx_ino && first.stx_dev_major == second.stx_dev_major &&
+           first.stx_dev_minor == second.stx_dev_minor;
+}
+
+bool MoveAcross(const std::string& native, const char* from, const char* to) {
+    if (IsFolderItself(native)) return FailWith(kErrorNotSameDevice);
+    return FileCopy(from, to) && FileDelete(from);
+}
+
+}  // namespace
+
+bool ItemRename(const char* from, const char* to) {
+    std::string source, target, respelled;
+    if (!FindNative(from, source) || !NameToNativeText(to, target)) return false;
+    respelled = target;
+    Match match = MatchOnDisk(respelled);
+    if (match == Match::kParentMissing) return FailWith(kErrorPathNotFound);
+    bool otherSpelling = match == Match::kAll && respelled == source;
+    if (match == Match::kAll && !otherSpelling) return FailWith(kErrorAlreadyExists);
+    /* The parent as on the disk, the last part as the caller wants it. */
+    std::string wanted = NativeParent(respelled);
+    if (respelled.find('/') == std::string::npos) wanted.clear();
+    if (!wanted.empty() && wanted != "/") wanted += '/';
+    wanted += NativeLast(target);
+    if (wanted == source || RenameWithoutReplacing(source, wanted)) return true;
+    if (errno == EXDEV) return MoveAcross(source, from, to);
+    /* A file system that ignores case itself takes the new spelling for a name that is taken. */
+    bool itself = errno == EEXIST && otherSpelling && SameItem(source, wanted);
+    if (itself && systemCalls.renameat2(AT_FDCWD, source.c_str(), AT_FDCWD, wanted.c_str(), 0) == 0) return true;
+    return FailErrno();
+}
+
+namespace {
+
+/* One file handle for a scope. */
+class OpenedFile {
+public:
+    OpenedFile(const char* name, std::uint32_t access, std::uint32_t deny, Disposition disposition)
+        : handle_(FileOpen(name, access, deny, disposition)) {}
+    ~OpenedFile() { Close(); }
+    OpenedFile(const OpenedFile&) = delete;
+    OpenedFile& operator=(const OpenedFile&) = delete;
+
+    FileHandle Get() const { return handle_; }
+    bool Close() {
+        FileHandle closing = handle_;
+        handle_ = kNoFile;
+        return closing == kNoFile || FileClose(closing);
+    }
+
+private:
+    FileHandle handle_;
+};
+
+bool CopyThroughBuffer(FileHandle from, FileHandle to) {
+    constexpr std::size_t kBufferSize = 128 * 1024;
+    std::unique_ptr<char[]> buffer(new char[kBufferSize]);
+    std::size_t count = 0, written = 0;
+    do {
+        if (!FileRead(from, buffer.get(), kBufferSize, count) || !FileWrite(to, buffer.get(), count, written))
+            return false;
+    } while (count == kBufferSize);
+    return true;
+}
+
+/* Lets the kernel copy as long as it gets on; the rest, or what it cannot copy at all, goes through a buffer. */
+bool CopyBytes(FileHandle from, FileHandle to) {
+    constexpr std::size_t kAtOnce = std::size_t{1} << 30;
+    ssize_t moved;
+    do {
+        moved = systemCalls.copy_file_range(DescriptorOf(from), nullptr, DescriptorOf(to), nullptr, kAtOnce, 0);
+    } while (moved > 0 || (moved < 0 && errno == EINTR));
+    if (moved < 0 && (errno == ENOSPC || errno == EDQUOT || errno == EIO)) return FailErrno();
+    return CopyThroughBuffer(from, to);
+}
+
+bool CopyInto(FileHandle source, FileHandle target) {
+    ItemInfo info;
+    if (!CopyBytes(source, target) || !FileGetInfo(source, info)) return false;
+    if (!FileSetTimes(target, 0, 0, info.modified)) return false;
+    return systemCalls.fchmod(DescriptorOf(target), info.mode) == 0 || FailErrno();
+}
+
+}  // namespace
+
+bool FileCopy(const char* from, const char* to) {
+    OpenedFile source(from, kRead, 0, Disposition::kOpenExisting);
+    if (source.Get() == kNoFile) return false;
+    OpenedFile target(to, kWrite, kRead | kWrite, Disposition::kCreateNew);
+    if (target.Get() == kNoFile) return false;
+    bool copied = CopyInto(source.Get(), target.Get());
+    if (target.Close() && copied) return true;
+    ErrorNumber reason = LastError();
+    FileDelete(to);
+    return FailWith(reason);
+}
+
+// ---- permissions ----------------------------------------------------------------------------------------------------
+
+bool ItemSetMode(const char* name, std::uint32_t mode) {
+    return OnExistingItem(name, [mode](const std::string& native) {
+        return systemCalls.chmod(native.c_str(), static_cast<mode_t>(mode & 0777u)) == 0;
+    });
+}
+
+bool ItemSetReadOnly(const char* name, bool readOnly) {
+    ItemInfo info;
+    if (!ItemGetInfo(name, info)) return false;
+    if (info.readOnly == readOnly) return true;
+    /* Writing comes back to those who may read, as far as new files would get it. */
+    std::uint32_t writers = (info.mode & 0444u) >> 1 & ~PermissionMask();
+    return ItemSetMode(name, readOnly ? info.mode & ~0222u : info.mode | writers | 0200u);
+}
+
+std::uint32_t PermissionMask() {
+    std::unique_ptr<FILE, int (*)(FILE*)> status(std::fopen("/proc/self/status", "re"), std::fclose);
+    char line[256];
+    unsigned mask = 0;
+    while (status && std::fgets(line, sizeof line, status.get())) {
+        if (std::sscanf(line, "Umask: %o", &mask) == 1) return mask;
+    }
+    /* Without /proc it can only be read by setting it. */
+    mask = ::umask(0);
+    ::umask(static_cast<mode_t>(mask));
+    return mask;
+}
+
+// ---- places ---------------------------------------------------------------------------------------------------------
+
+bool CurrentFolder(std::string& name) {
+    std::unique_ptr<char, decltype(&std::free)> folder(::getcwd(nullptr, 0), std::free);
+    return folder ? NativeToName(folder.get(), name) : FailErrno();
+}
+
+bool SetCurrentFolder(const char* name) {
+    return OnExistingItem(name, [](const std::string& native) { return systemCalls.chdir(native.c_str()) == 0; });
+}
+
+bool TemporaryFolder(std::string& name) {
+    const char* folder = std::getenv("TMPDIR");
+    if (!NativeToName(folder && *folder == '/' ? folder : "/tmp", name)) return false;
+    if (name.size() > 3) name += '\\'; /* all but a drive, which has it */
+    return true;
+}
+
+bool VolumeGetSpace(const char* name, VolumeSpace& space) {
+    return OnExistingItem(name, [&](const std::string& native) {
+        struct statfs status;
+        if (systemCalls.statfs(native.c_str(), &status) != 0) return false;
+        std::uint64_t unit = static_cast<std::uint64_t>(status.f_frsize ? status.f_frsize : status.f_bsize);
+        space.totalBytes = unit * status.f_blocks;
+        space.freeBytes = unit * status.f_bavail;
+        space.sectorBytes = static_cast<std::uint32_t>(unit);
+        return true;
+    });
+}
+
+}  // namespace tessel::platform

@@ -1,0 +1,49 @@
+/* From the library's names to the host's, for the files of this backend that call the kernel by name. */
+#ifndef TESSEL_PLATFORM_POSIX_NATIVENAMES_H
+#define TESSEL_PLATFORM_POSIX_NATIVENAMES_H
+
+#include <errno.h>
+
+#include <string>
+#include <string_view>
+
+#include "platform/DriveTable.h"
+#include "platform/posix/Errors.h"
+
+namespace tessel::platform {
+
+enum class Match { kAll, kLastMissing, kParentMissing };
+
+/* Respells the parts of `native` that exist on the disk in another case only. */
+Match MatchOnDisk(std::string& native);
+
+/* Equal but for case, of two names in UTF-8. */
+bool EqualNames(std::string_view a, std::string_view b) noexcept;
+
+/* A name on the disk as the library sees it: in the code page, with `?` for what a name cannot hold. */
+std::string NameFromDisk(std::string_view diskName);
+
+/* Splits off the last component. "/" for the parent of a top one, "." for that of a relative one. */
+std::string NativeParent(std::string_view native);
+std::string_view NativeLast(std::string_view native);
+
+/* Runs operation(native) on an item that must exist: exactly as spelled first, and if there is none, as found on the
+   disk. The operation returns false and sets errno; so a name that fits costs no look at the disk. */
+template <typename Operation>
+bool OnExistingItem(std::string_view name, Operation operation) {
+    std::string native;
+    if (!NameToNativeText(name, native)) return false;
+    if (operation(native)) return true;
+    if (errno != ENOENT && errno != ENOTDIR) return FailErrno();
+    int error = errno;
+    std::string asGiven = native;
+    Match match = MatchOnDisk(native);
+    if (match == Match::kParentMissing) return FailWith(kErrorPathNotFound);
+    if (match == Match::kLastMissing) return FailWith(kErrorFileNotFound);
+    if (native == asGiven) return FailWith(ErrorOfErrno(error));
+    return operation(native) || FailErrno();
+}
+
+}  // namespace tessel::platform
+
+#endif
