@@ -21,7 +21,7 @@ namespace tessel::platform {
 
 class Event {
 public:
-    explicit Event(bool signaled = false) noexcept : word_(signaled ? kSignaled : 0) {}
+    explicit constexpr Event(bool signaled = false) noexcept : word_(signaled ? kSignaled : 0) {}
     Event(const Event&) = delete;
     Event& operator=(const Event&) = delete;
 
@@ -55,8 +55,13 @@ private:
 
     bool Take() noexcept;
     bool Spin() noexcept;
+    bool SleepFor(std::int32_t milliseconds) noexcept;
     void Wake(std::uint32_t before) noexcept;
     void PassOn(std::uint32_t now) noexcept;
+    void AddWatch(Watch& watch) noexcept;
+    void RemoveWatch(Watch& watch) noexcept;
+    void WakeWatches() noexcept;
+    static int TakeFirst(Event* const* events, std::size_t count) noexcept;
 
     std::atomic<std::uint32_t> word_;
     std::atomic<std::uint16_t> awake_{0}; /* threads in Wait that do not sleep */
