@@ -1,0 +1,124 @@
+#include "platform/Module.h"
+
+#include <cxxabi.h>
+#include <dlfcn.h>
+#include <link.h>
+#include <unistd.h>
+
+#include <cstdlib>
+#include <memory>
+
+#include "platform/posix/NativeNames.h"
+
+namespace tessel::platform {
+
+namespace {
+
+/* The host's full name of the executable; empty when it does not tell. */
+std::string ExecutableFile() {
+    std::string name(256, 0);
+    for (;;) {
+        ssize_t length = ::readlink("/proc/self/exe", name.data(), name.size());
+        if (length < 0) return {};
+        if (static_cast<std::size_t>(length) < name.size()) {
+            name.resize(static_cast<std::size_t>(length));
+            return name;
+        }
+        name.resize(name.size() * 2);
+    }
+}
+
+/* Where the first segment lies: the bias alone is 0 for an executable that is not relocated. */
+ModuleHandle BaseOf(const dl_phdr_info& info) {
+    for (int i = 0; i < info.dlpi_phnum; ++i) {
+        const auto& segment = info.dlpi_phdr[i];
+        if (segment.p_type == PT_LOAD) return static_cast<ModuleHandle>(info.dlpi_addr + (segment.p_vaddr & ~0xFFFul));
+    }
+    return static_cast<ModuleHandle>(info.dlpi_addr);
+}
+
+/* Calls visit(base, host name) for each module, the executable first, until it returns false. */
+template <typename Visitor>
+void ForEachModule(Visitor visit) {
+    dl_iterate_phdr(
+        [](dl_phdr_info* info, std::size_t, void* context) {
+            /* The executable's own name is empty here. */
+            return (*static_cast<Visitor*>(context))(BaseOf(*info), info->dlpi_name ? info->dlpi_name : "") ? 0 : 1;
+        },
+        &visit);
+}
+
+std::string FileOf(const char* moduleName) {
+    return *moduleName ? moduleName : ExecutableFile();
+}
+
+std::string FullFile(const std::string& file) {
+    std::unique_ptr<char, decltype(&std::free)> full(::realpath(file.c_str(), nullptr), std::free);
+    return full ? full.get() : file;
+}
+
+std::string Demangled(const char* symbol) {
+    int status = 0;
+    std::unique_ptr<char, decltype(&std::free)> text(abi::__cxa_demangle(symbol, nullptr, nullptr, &status), std::free);
+    return status == 0 && text ? text.get() : symbol;
+}
+
+}  // namespace
+
+ModuleHandle OwnModule() noexcept {
+    Dl_info info{};
+    if (dladdr(reinterpret_cast<const void*>(&OwnModule), &info) == 0) return kExecutable;
+    return reinterpret_cast<ModuleHandle>(info.dli_fbase);
+}
+
+bool ModuleFileName(ModuleHandle module, std::string& name) {
+    std::string file = module == kExecutable ? ExecutableFile() : "";
+    if (module != kExecutable) {
+        ForEachModule([&](ModuleHandle base, const char* moduleName) {
+            if (base == module) file = FullFile(FileOf(moduleName));
+            return base != module;
+        });
+    }
+    return file.empty() ? FailWith(kErrorModuleNotFound) : NativeToName(file, name);
+}
+
+std::vector<ModuleEntry> ModuleList(std::size_t most) {
+    std::vector<ModuleEntry> modules;
+    ForEachModule([&](ModuleHandle base, const char* moduleName) {
+        if (modules.size() < most) modules.push_back({NameFromDisk(NativeLast(FileOf(moduleName))), base});
+        return modules.size() < most;
+    });
+    return modules;
+}
+
+bool DescribeAddress(const void* address, AddressEntry& entry) {
+    Dl_info info{};
+    entry = {};
+    if (dladdr(address, &info) == 0) return FailWith(kErrorModuleNotFound);
+    entry.module = NameFromDisk(NativeLast(info.dli_fname ? info.dli_fname : ""));
+    const void* start = info.dli_saddr ? info.dli_saddr : info.dli_fbase;
+    entry.offset = static_cast<std::size_t>(static_cast<const char*>(address) - static_cast<const char*>(start));
+    if (info.dli_sname) entry.symbol = Demangled(info.dli_sname);
+    return true;
+}
+
+LibraryHandle LibraryLoad(const char* name) {
+    std::string file = name;
+    bool plain = file.find_first_of("\\/:") == std::string::npos;
+    if (!plain && !NameToNative(name, file)) return nullptr;
+    void* library = dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL);
+    if (!library) FailWith(kErrorModuleNotFound);
+    return library;
+}
+
+void* LibrarySymbol(LibraryHandle library, const char* symbol) noexcept {
+    void* address = library ? dlsym(library, symbol) : nullptr;
+    if (!address) FailWith(kErrorProcedureNotFound);
+    return address;
+}
+
+bool LibraryUnload(LibraryHandle library) noexcept {
+    return (library && dlclose(library) == 0) || FailWith(kErrorInvalidHandle);
+}
+
+}  // namespace tessel::platform
