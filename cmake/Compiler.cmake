@@ -2,11 +2,13 @@
 find_package(Threads REQUIRED)
 
 add_library(tessel_compile_options INTERFACE)
+# Reports name source files relative to the repository, also where the compiler is given them relative to the build.
+file(RELATIVE_PATH TESSEL_SOURCE_FROM_BUILD ${PROJECT_BINARY_DIR} ${PROJECT_SOURCE_DIR})
 target_compile_options(tessel_compile_options INTERFACE
   -Wall -Wextra -Wpedantic -Wshadow -Wundef -Werror
   $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor -Woverloaded-virtual>
   -fno-omit-frame-pointer -fno-optimize-sibling-calls -fno-strict-aliasing
-  "-ffile-prefix-map=${PROJECT_SOURCE_DIR}/=")
+  "-ffile-prefix-map=${PROJECT_SOURCE_DIR}/=" "-ffile-prefix-map=${TESSEL_SOURCE_FROM_BUILD}=")
 target_compile_definitions(tessel_compile_options INTERFACE _FILE_OFFSET_BITS=64 _TIME_BITS=64)
 if(CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
   # x87 constants and long double in C++ headers are fine; clang is stricter about what it calls an extension.
