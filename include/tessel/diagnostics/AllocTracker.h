@@ -19,8 +19,8 @@ typedef struct tessel_AllocTracker* AllocTrackerPtr;
 
 TESSEL_BEGIN_C
 
-/* A new tracker that leaves the 3, or the given number of, innermost calls out of every call stack. The caller owns it.
-   Null when memory runs out. */
+/* A new tracker that leaves the 3, or the given number of, innermost calls out of every call stack (the tracker's own
+   are three). The caller owns it. Null when memory runs out. When tracking is off the tracker does nothing. */
 TESSEL_API AllocTrackerPtr CreateAllocTracker(void);
 TESSEL_API AllocTrackerPtr CreateAllocTrackerSpecifySkip(int32 skip);
 
@@ -30,6 +30,7 @@ TESSEL_API void DestroyAllocTracker(AllocTrackerPtr tracker);
 TESSEL_END_C
 
 #ifdef __cplusplus
+#    include <new>
 
 namespace tessel {
 
@@ -66,12 +67,17 @@ public:
     virtual int32 Count() = 0;
 };
 
+/// Threads meet only when their objects do: each operation takes a lock for a few instructions, and none while a report
+/// is written. What a dumper makes while it writes is not tracked.
 class TESSEL_API AllocTracker : public MGGenericRegistry {
 public:
     AllocTracker() noexcept = default;
     ~AllocTracker() override;
     AllocTracker(const AllocTracker&) = delete;
     AllocTracker& operator=(const AllocTracker&) = delete;
+    static void* operator new(size_t size, const std::nothrow_t&) noexcept;
+    static void operator delete(void* memory) noexcept;
+    static void operator delete(void* memory, const std::nothrow_t&) noexcept;
 
     /// The same as MarkAllReported.
     void Mark() override;
@@ -82,14 +88,15 @@ public:
     /// The same as CountLive.
     int32 Count() override;
 
-    /// Starts the tracker, which does nothing before. `skip` innermost calls are left out of every call stack: with 0 a
-    /// stack begins in the function that calls AddRecord.
+    /// Starts the tracker, which does nothing before. `skip` innermost calls are left out of every call stack; the
+    /// tracker's own are three, so that with 3 or less a stack begins in the function that calls AddRecord. Once it is
+    /// started, sets the count for the stacks to come.
     virtual void SetSkip(int32 skip);
     /// Forgets everything. The tracker does nothing afterwards. No other thread may be using it.
     virtual void Shutdown();
 
-    /// Records an object and the call stack that made it. The file name is kept by address. An address that is recorded
-    /// already is reported, and the earlier record stays.
+    /// Records an object (null: does nothing) and the call stack that made it. The file name should be a constant. An
+    /// address that is recorded already is reported, and the earlier record stays.
     virtual void AddRecord(const void* address, uint32 size, const char* file, int32 line);
     /// Forgets an object. Nothing happens when it is not recorded.
     virtual void RemoveRecord(const void* address);
@@ -106,9 +113,20 @@ public:
     /// Leaves every record made until now out of later counts of unreported records, and out of dumps.
     virtual void MarkAllReported();
 
+    /// Records and bytes, ever and now.
+    struct Totals {
+        uint64 made;
+        uint64 bytesMade;
+        uint64 live;
+        uint64 bytesLive;
+    };
+    Totals GetTotals();
+
 private:
     class Implementation;
     Implementation* implementation_ = nullptr;
+
+    friend AllocTrackerPtr(::CreateAllocTrackerSpecifySkip)(int32 skip);
 };
 
 }  // namespace tessel

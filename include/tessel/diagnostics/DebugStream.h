@@ -165,22 +165,19 @@ private:
 };
 
 /// A number already formatted: at most 31 bytes of text, held here.
-class TESSEL_API DbgFmtNum : public DbgFmtToDebugStream {
+class TESSEL_API DbgFmtNum final : public DbgFmtToDebugStream {
 public:
     explicit DbgFmtNum(CStr text) noexcept;
-    void ToDebugStream(DebugStream& stream) const final;
+    void ToDebugStream(DebugStream& stream) const override;
 
-protected:
-    DbgFmtNum() : text_{} {}
-    ~DbgFmtNum() = default;
-
+private:
     char text_[32];
 };
 
 /// A value in a format of the caller's, which must hold exactly one conversion, one that suits the type; else
 /// "__DbgFmtType: Bad Format__" is written. At most 31 bytes.
 template <class T>
-class DbgFmtType final : public DbgFmtNum {
+class DbgFmtType final : public DbgFmtToDebugStream {
     static_assert(std::is_scalar_v<T>, "a printf conversion takes a number or a pointer");
 
 public:
@@ -190,6 +187,10 @@ public:
         else
             std::snprintf(text_, sizeof text_, "%s", "__DbgFmtType: Bad Format__");
     }
+    void ToDebugStream(DebugStream& stream) const override { stream.Append(text_); }
+
+private:
+    char text_[32] = {};
 };
 
 /// A report that is processed at the end of the statement that makes it.
@@ -216,10 +217,7 @@ private:
 }  // namespace tessel
 
 /// Makes a report: TESSEL_REPORT(level, siteCode) << ...; the site code is a constant of this place alone.
-#    define TESSEL_REPORT(level, siteCode)                    \
-        ::tessel::DebugReport {                               \
-            __FILE__, __LINE__, __func__, (level), (siteCode) \
-        }
+#    define TESSEL_REPORT(level, siteCode) ::tessel::DebugReport(__FILE__, __LINE__, __func__, (level), (siteCode))
 
 #endif
 #endif

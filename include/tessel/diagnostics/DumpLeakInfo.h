@@ -14,7 +14,6 @@ TESSEL_API void DumpLeakInfo(AllocTrackerPtr tracker, int32 expected, CStr name,
 TESSEL_END_C
 
 #ifdef __cplusplus
-#    include <cstdarg>
 
 namespace tessel {
 
@@ -30,19 +29,23 @@ public:
     bool GetShowStackNames() override;
     /// Writes to the open file, else to a level-0 report.
     void FormatToOutput(const char* format, ...) override __attribute__((format(printf, 2, 3)));
-    /// At most 254 bytes, each that cannot be printed as ".". An object that cannot be read gives nothing.
+    /// At most 254 bytes, each that cannot be printed as ".". Of an object that cannot be read, none.
     void DumpItemContents(const void* address, uint32 size) override;
 
     /// The report described at DumpLeakInfo.
     void DumpLeaks(AllocTracker& tracker);
 
 private:
-    void DumpToFile(AllocTracker& tracker, int32 count);
+    void WriteToFile(const char* text);
+    void FlushFile();
+    void CloseFile();
 
     const char* name_;
     const char* fileName_;
     int32 expected_;
-    void* file_;  // the open output file, or null
+    intptr_t file_ = 0;  // the open output file; 0: none
+    size_t buffered_ = 0;
+    char buffer_[8192];
 };
 
 }  // namespace tessel

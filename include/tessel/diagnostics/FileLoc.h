@@ -29,8 +29,12 @@ public:
     FileLoc* Clone() const override;
     const char* PathText() const override;
 
+    /// Appends ".txt". Raises OVExcept 7 when the text is longer than 511 bytes.
+    void AddTxt();
+
 private:
-    char text_[516];
+    static constexpr size_t kMostText = 516;
+    char text_[kMostText + 1];
 };
 
 /// A location, owned by the caller. ".txt" is appended when asked for. Raises OVExcept: 1 for a null name, 7 when the

@@ -1,0 +1,82 @@
+// The living objects of an allocation tracker: a hash table in shards by address, each with a lock of its own, so that
+// threads meet only when their objects do. Sorted when dumped.
+#ifndef TESSEL_SOURCE_DIAGNOSTICS_ALLOCRECORDS_H
+#define TESSEL_SOURCE_DIAGNOSTICS_ALLOCRECORDS_H
+
+#include <tessel/base/Types.h>
+
+#include <atomic>
+
+#include "diagnostics/CallSites.h"
+#include "diagnostics/TrackerHeap.h"
+
+namespace tessel {
+
+struct AllocRecord {
+    uintptr_t address;     // 0: no record
+    const CallSite* site;  // where it was made, the stack of its creation included
+    uint64 number;         // the how-manieth object of its tracker it is
+    uint32 size;
+    uint32 reported;
+};
+
+// Held for a few instructions; a shard that grows is the exception.
+class SpinLock {
+public:
+    void Lock() {
+        if (held_.exchange(true, std::memory_order_acquire)) LockSlowly();
+    }
+    void Unlock() { held_.store(false, std::memory_order_release); }
+
+private:
+    void LockSlowly();
+    std::atomic<bool> held_{false};
+};
+
+class AllocRecords {
+public:
+    explicit AllocRecords(TrackerHeap& heap) : heap_(heap) {}
+
+    enum class Insertion { kDone, kDuplicate, kFailed };
+    // Of a duplicate the earlier record is copied into `record`; with kFailed it is not kept. `failure` may be set in
+    // any case.
+    Insertion Insert(AllocRecord& record, TrackerFailure& failure);
+    bool Remove(uintptr_t address);
+    bool Find(uintptr_t address, AllocRecord& record);
+
+    struct Counts {
+        uint64 made;  // ever, the dead included
+        uint64 bytesMade;
+        uint64 bytes;
+        uint32 live;
+        uint32 unreported;
+    };
+    Counts Count();  // of the shards one after the other
+    void MarkAllReported();
+    void Clear();
+
+    // Copies unreported records, at most `capacity`; returns how many.
+    size_t CopyUnreported(AllocRecord* records, size_t capacity);
+
+private:
+    static constexpr int kShardBits = 6;
+
+    struct alignas(64) Shard {
+        SpinLock lock;    // guards the rest
+        uint32 mask = 0;  // slots - 1
+        AllocRecord* slots = nullptr;
+        Counts counts{};
+    };
+    struct Place;
+
+    static AllocRecord* Look(const Shard& shard, Place place);
+    bool Grow(Shard& shard, TrackerFailure& failure);
+    Shard& ShardOf(Place place);
+
+    TrackerHeap& heap_;
+    Shard shards_[1 << kShardBits];
+};
+
+}  // namespace tessel
+
+#endif

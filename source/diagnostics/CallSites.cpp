@@ -1,0 +1,270 @@
+#include "diagnostics/CallSites.h"
+
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <utility>
+
+#include "platform/Thread.h"
+
+namespace tessel {
+namespace {
+
+constexpr uint32 kFirstSlots = 64;
+constexpr size_t kChunkSize = 16 * 1024;
+constexpr int32 kMostSkipRemembered = 8;
+constexpr int32 kMostFrames = CallStack::kCapacity + kMostSkipRemembered;
+constexpr int kWalksRemembered = 16;
+constexpr int kNumberRanges = 8;
+constexpr uint32 kMostNumbersAtOnce = 64;
+
+std::atomic<uint64> theNextSerial{1};
+
+// A walk as it was done last: the frames, innermost first, and what came of it.
+struct RememberedWalk {
+    uint64 serial;
+    const char* file;
+    int32 line;
+    int32 depth;
+    const StackFrame* first;
+    const CallSite* site;
+    StackFrame frames[kMostFrames];
+};
+
+struct NumberRange {
+    uint64 serial;
+    uint64 next;
+    uint64 end;
+    uint32 size;
+};
+
+// What a thread remembers. All its own, so that no lock is needed.
+struct ThreadMemory {
+    const CallSites* reporting;
+    NumberRange numbers[kNumberRanges];
+    RememberedWalk walks[kWalksRemembered];
+};
+
+[[gnu::tls_model("initial-exec")]] thread_local ThreadMemory* theMemory = nullptr;
+[[gnu::tls_model("initial-exec")]] thread_local bool theThreadEnds = false;
+
+struct ThreadMemoryOwner {
+    ~ThreadMemoryOwner() {
+        theThreadEnds = true;
+        std::free(std::exchange(theMemory, nullptr));
+    }
+    bool alive = true;
+};
+thread_local ThreadMemoryOwner theOwner;
+
+__attribute__((noinline)) ThreadMemory* MakeThreadMemory() {
+    if (theThreadEnds || !theOwner.alive) return nullptr;
+    return theMemory = static_cast<ThreadMemory*>(std::calloc(1, sizeof(ThreadMemory)));
+}
+
+// Null while the thread ends, and when there is no memory.
+ThreadMemory* MemoryOfThread() {
+    return theMemory ? theMemory : MakeThreadMemory();
+}
+
+RememberedWalk& WalkFrom(ThreadMemory& memory, const StackFrame* frame, uint64 serial) {
+    const auto hash = (reinterpret_cast<uintptr_t>(frame) >> 4) + serial * 5;
+    return memory.walks[(hash ^ (hash >> 4)) % kWalksRemembered];
+}
+
+// The frames lie in the stack of this thread above the innermost one, so that they can be read whatever became of them.
+__attribute__((no_sanitize("address"), no_sanitize("thread"))) bool IsSameWalk(const RememberedWalk& walk) {
+    const StackFrame* frame = walk.first;
+    uintptr_t difference = 0;
+    for (int32 i = 0; i < walk.depth; ++i) {
+        const StackFrame& remembered = walk.frames[i];
+        difference |= reinterpret_cast<uintptr_t>(frame->caller) ^ reinterpret_cast<uintptr_t>(remembered.caller);
+        difference |=
+            reinterpret_cast<uintptr_t>(frame->returnAddress) ^ reinterpret_cast<uintptr_t>(remembered.returnAddress);
+        frame = remembered.caller;
+    }
+    return difference == 0;
+}
+
+// Copies the frames from `frame` outwards, at most `most`; returns how many there are. The first is there in any case:
+// it is that of a function that is running.
+__attribute__((no_sanitize("address"), no_sanitize("thread"))) int32 CopyFrames(const StackFrame* frame,
+                                                                                StackFrame* frames, int32 most) {
+    const platform::StackBounds bounds = platform::CurrentStackBounds();
+    auto at = reinterpret_cast<uintptr_t>(frame);
+    if (at < bounds.low) most = 1;
+    int32 depth = 0;
+    do {
+        frames[depth] = *reinterpret_cast<const StackFrame*>(at);
+        const uintptr_t below = at;
+        at = reinterpret_cast<uintptr_t>(frames[depth].caller);
+        if (!IsCallerOf(below, at, bounds.high)) return depth + 1;
+    } while (++depth < most);
+    return depth;
+}
+
+}  // namespace
+
+struct CallSites::Key {
+    Key(const char* file_, int32 line_, const StackFrame* frames, int32 count_)
+        : file(file_), line(line_), count(count_) {
+        hash = (reinterpret_cast<uintptr_t>(file) ^ (uint64(static_cast<uint32>(line)) << 32)) * 0x9E3779B97F4A7C15u;
+        for (int32 i = 0; i < count; ++i) {
+            addresses[i] = frames[i].returnAddress;
+            hash = (hash ^ (hash >> 29) ^ reinterpret_cast<uintptr_t>(addresses[i])) * 0xBF58476D1CE4E5B9u;
+        }
+    }
+    bool Is(const CallSite& site) const {
+        return site.hash == hash && site.fileKey == file && site.line == line && site.count == count &&
+               std::memcmp(site.addresses, addresses, static_cast<size_t>(count) * sizeof addresses[0]) == 0;
+    }
+
+    const char* file;
+    int32 line;
+    int32 count;
+    uint64 hash;
+    const void* addresses[CallStack::kCapacity];
+};
+
+CallSites::CallSites(TrackerHeap& heap, int32 skip) : heap_(heap), serial_(theNextSerial.fetch_add(1)), skip_(skip) {
+}
+
+void CallSites::SetSkip(int32 skip) {
+    skip_ = skip;
+}
+
+const CallSite* CallSites::SiteOf(const char* file, int32 line, const StackFrame* frame, TrackerFailure& failure) {
+    ThreadMemory* const memory = MemoryOfThread();
+    if (!memory) return Walk(file, line, frame, failure);
+    RememberedWalk& walk = WalkFrom(*memory, frame, serial_);
+    if (walk.first == frame && walk.serial == serial_ && walk.file == file && walk.line == line && IsSameWalk(walk))
+        return walk.site;
+    return Walk(file, line, frame, failure);
+}
+
+const CallSite* CallSites::Walk(const char* file, int32 line, const StackFrame* frame, TrackerFailure& failure) {
+    StackFrame frames[kMostFrames];
+    const int32 skip = skip_.load(std::memory_order_relaxed);
+    int32 depth, first;
+    if (skip <= kMostSkipRemembered) {
+        depth = CopyFrames(frame, frames, CallStack::kCapacity + skip);
+        first = std::min(skip, depth);
+    } else {
+        const void* addresses[CallStack::kCapacity];
+        depth = WalkCallStack(addresses, CallStack::kCapacity, frame, frame->returnAddress, skip);
+        for (int32 i = 0; i < depth; ++i) frames[i] = {nullptr, addresses[i]};
+        first = 0;
+    }
+    const Key key(file, line, frames + first, depth - first);
+    const CallSite* site = Find(key);
+    if (!site) site = Add(key, failure);
+    ThreadMemory* const memory = theMemory;
+    if (!site || !memory || skip > kMostSkipRemembered) return site;
+    RememberedWalk& walk = WalkFrom(*memory, frame, serial_);
+    walk = {serial_, file, line, depth, frame, site, {}};
+    std::copy_n(frames, depth, walk.frames);
+    return site;
+}
+
+const CallSite* CallSites::Find(const Key& key) const {
+    const Table* const table = table_.load(std::memory_order_acquire);
+    if (!table) return nullptr;
+    for (auto slot = static_cast<uint32>(key.hash >> 32);; ++slot) {
+        const CallSite* const site = table->slots[slot & table->mask].load(std::memory_order_acquire);
+        if (!site || key.Is(*site)) return site;
+    }
+}
+
+const CallSite* CallSites::Add(const Key& key, TrackerFailure& failure) {
+    platform::MutexHolder hold(mutex_);
+    if (const CallSite* site = Find(key)) return site;
+    if (!MakeRoom(failure)) return nullptr;
+    const size_t stackSize = static_cast<size_t>(key.count) * sizeof key.addresses[0];
+    auto* const site = static_cast<CallSite*>(AllocateSmall(offsetof(CallSite, addresses) + stackSize, failure));
+    const char* const file = CopyText(key.file, failure);
+    if (!site || !file) return nullptr;
+    site->hash = key.hash;
+    site->fileKey = key.file;
+    site->file = file;
+    site->line = key.line;
+    site->count = key.count;
+    std::memcpy(site->addresses, key.addresses, stackSize);
+
+    Table& table = *table_.load(std::memory_order_relaxed);
+    auto slot = static_cast<uint32>(key.hash >> 32);
+    while (table.slots[slot & table.mask].load(std::memory_order_relaxed)) ++slot;
+    table.slots[slot & table.mask].store(site, std::memory_order_release);
+    ++count_;
+    return site;
+}
+
+// Keeps half of the slots free. Readers may still be in the table that is replaced, so it stays until the end; together
+// those before are no larger than the current one.
+bool CallSites::MakeRoom(TrackerFailure& failure) {
+    const Table* const old = table_.load(std::memory_order_relaxed);
+    const uint32 oldSlots = old ? old->mask + 1 : 0;
+    if (old && 2 * (count_ + 1) <= oldSlots) return true;
+    const uint32 slots = old ? 2 * oldSlots : kFirstSlots;
+    auto* const table = static_cast<Table*>(heap_.Allocate(sizeof(Table) + slots * sizeof old->slots[0], failure));
+    if (!table) return false;
+    table->mask = slots - 1;
+    for (uint32 i = 0; i < oldSlots; ++i) {
+        const CallSite* const site = old->slots[i].load(std::memory_order_relaxed);
+        if (!site) continue;
+        auto slot = static_cast<uint32>(site->hash >> 32);
+        while (table->slots[slot & table->mask].load(std::memory_order_relaxed)) ++slot;
+        table->slots[slot & table->mask].store(site, std::memory_order_relaxed);
+    }
+    table_.store(table, std::memory_order_release);
+    return true;
+}
+
+void* CallSites::AllocateSmall(size_t size, TrackerFailure& failure) {
+    size = (size + alignof(CallSite) - 1) / alignof(CallSite) * alignof(CallSite);
+    if (size > smallLeft_) {
+        const size_t chunk = std::max(kChunkSize, size);
+        auto* const fresh = static_cast<char*>(heap_.Allocate(chunk, failure));
+        if (!fresh) return nullptr;
+        small_ = fresh;
+        smallLeft_ = chunk;
+    }
+    void* const result = small_;
+    small_ += size;
+    smallLeft_ -= size;
+    return result;
+}
+
+// The name may belong to a library that is gone when the report is written.
+const char* CallSites::CopyText(const char* text, TrackerFailure& failure) {
+    if (!text) return "";
+    const size_t size = std::strlen(text) + 1;
+    void* const copy = AllocateSmall(size, failure);
+    return copy ? static_cast<const char*>(std::memcpy(copy, text, size)) : nullptr;
+}
+
+uint64 CallSites::NextNumber() {
+    ThreadMemory* const memory = MemoryOfThread();
+    if (!memory) return numbers_.fetch_add(1, std::memory_order_relaxed);
+    NumberRange& range = memory->numbers[serial_ % kNumberRanges];
+    if (range.serial != serial_) range = {serial_, 0, 0, 1};
+    if (range.next == range.end) {
+        range.next = numbers_.fetch_add(range.size, std::memory_order_relaxed);
+        range.end = range.next + range.size;
+        range.size = std::min(2 * range.size, kMostNumbersAtOnce);
+    }
+    return range.next++;
+}
+
+CallSites::Reporting::Reporting(const CallSites& sites) : outer_(theMemory ? theMemory->reporting : nullptr) {
+    if (ThreadMemory* memory = MemoryOfThread()) memory->reporting = &sites;
+}
+
+CallSites::Reporting::~Reporting() {
+    if (theMemory) theMemory->reporting = outer_;
+}
+
+bool CallSites::IsReporting() const {
+    return theMemory && theMemory->reporting == this;
+}
+
+}  // namespace tessel

@@ -1,0 +1,148 @@
+#include <tessel/diagnostics/DebugOutput.h>
+
+#include <atomic>
+#include <cstdio>
+
+#include <tessel/diagnostics/DebugStream.h>
+
+#include "diagnostics/NumberText.h"
+#include "platform/Debugger.h"
+#include "platform/MemoryRead.h"
+#include "platform/Process.h"
+
+namespace tessel {
+namespace {
+
+constexpr int kMostNestedReports = 8;  // a handler whose own work is reported, and so on
+constexpr int kBytesPerLine = 16;
+
+std::atomic<DebugOutputHandler> theHandler{nullptr};
+std::atomic<int32> theEventCounts[kNumDebugLevels];
+volatile int32 theStopHereResult = 0;
+[[gnu::tls_model("initial-exec")]] thread_local int theNestedReports = 0;
+
+struct NestedReport {
+    NestedReport() { ++theNestedReports; }
+    ~NestedReport() { --theNestedReports; }
+};
+
+bool IsLevel(int32 level) {
+    return level >= 0 && level < kNumDebugLevels;
+}
+CStr OrEmpty(CStr text) {
+    return text ? text : "";
+}
+
+void DefaultHandler(CStr file, int32 line, int32 level, uint32 siteCode, CStr text) {
+    DebugOutputIncrementEventCount(level);
+    if (level == kDebugError || level == kDebugFatal) {
+        char message[1024];
+        std::snprintf(message, sizeof message, "ERR %lx: %s(%d): %s", static_cast<unsigned long>(siteCode), file, line,
+                      text);
+        DebugOutputCoreBreak(message);
+    }
+    if (level == kDebugFatal) DebugOutputCoreDie();
+}
+
+// Reads the bytes of a line; those that cannot be read are left out of `readable`.
+void ReadLine(const uint8* from, uint8 (&bytes)[kBytesPerLine], bool (&readable)[kBytesPerLine]) {
+    if (platform::ReadMemory(from, bytes, kBytesPerLine) == kBytesPerLine) {
+        for (bool& each : readable) each = true;
+        return;
+    }
+    for (int i = 0; i < kBytesPerLine; ++i) readable[i] = platform::ReadMemory(from + i, bytes + i, 1) == 1;
+}
+
+void DumpLine(const uint8* from) {
+    uint8 bytes[kBytesPerLine];
+    bool readable[kBytesPerLine];
+    ReadLine(from, bytes, readable);
+
+    char address[kAddressDigits + 1];
+    char* const addressEnd = address + kAddressDigits;
+    *addressEnd = 0;
+    char hex[3 * kBytesPerLine + 1];
+    char text[kBytesPerLine + 1];
+    for (int i = 0; i < kBytesPerLine; ++i) {
+        char* const digits = hex + 3 * i;
+        digits[0] = readable[i] ? kUpperHexDigits[bytes[i] >> 4] : '?';
+        digits[1] = readable[i] ? kUpperHexDigits[bytes[i] & 15] : '?';
+        digits[2] = ' ';
+        text[i] = readable[i] && bytes[i] >= 32 && bytes[i] <= 126 ? static_cast<char>(bytes[i]) : '.';
+    }
+    hex[3 * kBytesPerLine] = text[kBytesPerLine] = 0;
+    TESSEL_REPORT(kDebugTrace, 0x6E1F03B2u)
+        << HexBackwards(addressEnd, reinterpret_cast<uintptr_t>(from), 8, kUpperHexDigits) << "  " << hex << "  "
+        << text;
+}
+
+}  // namespace
+}  // namespace tessel
+
+using namespace tessel;
+
+DebugOutputHandler DebugOutputSetHandler(DebugOutputHandler handler) {
+    theHandler.store(handler);
+    return handler;
+}
+
+DebugOutputHandler DebugOutputGetHandler(void) {
+    return theHandler.load();
+}
+
+// A handler that reports, which calls the handler again, would never end: what is nested too deep is dropped.
+void DebugOutputCallHandler(CStr file, int32 line, CStr identifier, int32 level, uint32 siteCode, CStr text) {
+    if (theNestedReports == kMostNestedReports) return;
+    NestedReport nested;
+    if (DebugOutputHandler handler = theHandler.load(std::memory_order_acquire))
+        handler(OrEmpty(file), line, OrEmpty(identifier), level, siteCode, OrEmpty(text));
+    else
+        DefaultHandler(OrEmpty(file), line, level, siteCode, OrEmpty(text));
+}
+
+int32 DebugOutputGetNumEvents(int32 level) {
+    return IsLevel(level) ? theEventCounts[level].load() : 0;
+}
+
+void DebugOutputResetNumEvents(void) {
+    for (auto& count : theEventCounts) count.store(0);
+}
+
+void DebugOutputIncrementEventCount(int32 level) {
+    if (IsLevel(level)) theEventCounts[level].fetch_add(1, std::memory_order_relaxed);
+}
+
+void DebugOutputCoreBreak(CStr text) {
+    if (text) platform::DebuggerOutput(text);
+    if (platform::DebuggerAttached()) platform::DebuggerBreak();
+}
+
+void DebugOutputCoreDie(void) {
+    platform::ProcessExit(1);
+}
+
+int32 StopHere(CStr text) {
+    DebugOutputCoreBreak(text);
+    TESSEL_REPORT(kDebugInfo, 0x2C77A9D4u) << "StopHere: " << text;
+    return theStopHereResult;
+}
+
+void DumpSomeMemory(const void* memory, int32 length) {
+    const auto* from = static_cast<const uint8*>(memory);
+    for (int32 done = 0; done < length; done += kBytesPerLine) {
+        DumpLine(from + done);
+        if (length - done <= kBytesPerLine) break;
+    }
+}
+
+bool VerifySingleFormatSpecifier(CStr format) {
+    int count = 0;
+    for (CStr c = format; c && *c; ++c) {
+        if (*c != '%') continue;
+        if (c[1] == '%')
+            ++c;
+        else
+            ++count;
+    }
+    return count == 1;
+}

@@ -1,0 +1,116 @@
+#include <tessel/diagnostics/DumpLeakInfo.h>
+
+#include <cstdarg>
+#include <cstdio>
+#include <cstring>
+#include <memory>
+
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/diagnostics/FileLoc.h>
+
+#include "diagnostics/Guarded.h"
+#include "platform/File.h"
+#include "platform/MemoryRead.h"
+
+namespace tessel {
+namespace {
+
+constexpr size_t kMostContents = 254;
+
+bool IsPrintable(char byte) {
+    return byte >= ' ' && byte <= '~';
+}
+
+// Null when there is no such location.
+std::unique_ptr<FileLoc> LocationOf(const char* fileName) {
+    return GuardedOr(std::unique_ptr<FileLoc>(),
+                     [&] { return std::unique_ptr<FileLoc>(CreateFileLoc(FileLoc::kTempFolder, fileName, false)); });
+}
+
+platform::FileHandle OpenForWriting(const char* name) {
+    return GuardedOr(platform::kNoFile, [&] {
+        return platform::FileOpen(name, platform::kWrite, platform::kWrite, platform::Disposition::kCreateAlways);
+    });
+}
+
+}  // namespace
+
+LeakDumper::LeakDumper(int32 expected, const char* name, const char* fileName)
+    : name_(name ? name : ""), fileName_(fileName), expected_(expected) {
+}
+
+LeakDumper::~LeakDumper() {
+    CloseFile();
+}
+
+const char* LeakDumper::ObjBeingTrackedName() {
+    return name_;
+}
+bool LeakDumper::GetShowStackNames() {
+    return true;
+}
+
+void LeakDumper::FormatToOutput(const char* format, ...) {
+    char text[2048];
+    va_list arguments;
+    va_start(arguments, format);
+    std::vsnprintf(text, sizeof text, format, arguments);
+    va_end(arguments);
+    if (file_ != platform::kNoFile)
+        WriteToFile(text);
+    else
+        TESSEL_REPORT(kDebugInfo, 0x34C1F6A8u) << text;
+}
+
+void LeakDumper::DumpItemContents(const void* address, uint32 size) {
+    char contents[kMostContents + 1];
+    const size_t count = platform::ReadMemory(address, contents, size < kMostContents ? size : kMostContents);
+    for (size_t i = 0; i < count; ++i)
+        if (!IsPrintable(contents[i])) contents[i] = '.';
+    contents[count] = 0;
+    FormatToOutput("Memory Contents: %s\n", contents);
+}
+
+void LeakDumper::DumpLeaks(AllocTracker& tracker) {
+    const int32 count = tracker.CountUnreported();
+    if (count <= expected_) {
+        TESSEL_REPORT(kDebugInfo, 0x60B8D2F1u) << "Total " << name_ << " = " << count << ".\n";
+        return;
+    }
+    if (const auto location = LocationOf(fileName_)) {
+        TESSEL_REPORT(kDebugInfo, 0x1D9A7C03u)
+            << location->PathText() << "(1) : " << count << ' ' << name_ << " (" << expected_ << " expected)";
+        file_ = OpenForWriting(location->PathText());
+        if (file_ != platform::kNoFile) tracker.DumpAll(this);
+        CloseFile();
+    }
+    TESSEL_REPORT(kDebugError, 0x48E5B09Cu)
+        << "We got " << count - expected_ << " more " << name_ << " than we see from a basic launch and quit.\n";
+}
+
+// Texts are small and many, so they are gathered.
+void LeakDumper::WriteToFile(const char* text) {
+    const size_t length = std::strlen(text);
+    if (length > sizeof buffer_ - buffered_) FlushFile();
+    std::memcpy(buffer_ + buffered_, text, length);
+    buffered_ += length;
+}
+
+void LeakDumper::FlushFile() {
+    size_t written;
+    platform::FileWrite(file_, buffer_, buffered_, written);  // nothing more can be done about a failure here
+    buffered_ = 0;
+}
+
+void LeakDumper::CloseFile() {
+    if (file_ == platform::kNoFile) return;
+    FlushFile();
+    platform::FileClose(file_);
+    file_ = platform::kNoFile;
+}
+
+}  // namespace tessel
+
+void DumpLeakInfo(AllocTrackerPtr tracker, int32 expected, CStr name, CStr fileName) {
+    if (tracker) tessel::LeakDumper(expected, name, fileName).DumpLeaks(*tracker);
+}

@@ -1,0 +1,126 @@
+#include <gtest/gtest.h>
+#include <tessel/diagnostics/DebugStream.h>
+
+#include <cstring>
+#include <limits>
+#include <memory>
+#include <vector>
+
+#include "diagnostics/Service.h"
+#include "support/ReportRecorder.h"
+
+namespace tessel {
+namespace {
+
+using test::ReportRecorder;
+
+template <class... Values>
+std::string Reported(const Values&... values) {
+    ReportRecorder recorder;
+    { (DebugReport("f", 1, "i", kDebugInfo, 1) << ... << values); }
+    return recorder.Texts().at(0);
+}
+
+int Function(int value) {
+    return value;
+}
+
+TEST(DebugStream, ReportCarriesItsPlace) {
+    ReportRecorder recorder;
+    TESSEL_REPORT(kDebugError, 0xCAFE0001u) << "boom " << 1;
+    const int line = __LINE__ - 1;
+    const test::Report report = recorder.Reports().at(0);
+    EXPECT_EQ(kDebugError, report.level);
+    EXPECT_EQ(0xCAFE0001u, report.siteCode);
+    EXPECT_EQ("boom 1", report.text);
+    EXPECT_EQ("tests/diagnostics/DebugStreamTest.cpp", report.file);
+    EXPECT_EQ(line, report.line);
+    EXPECT_EQ("TestBody", report.identifier);
+}
+
+TEST(DebugStream, NumbersAreWrittenInFull) {
+    EXPECT_EQ("-32768 32767 65535 255",
+              Reported(int16(-32768), ' ', int16(32767), ' ', uint16(65535), ' ', uint8(255)));
+    EXPECT_EQ("-2147483648 4294967295 0", Reported(int32(-2147483647 - 1), ' ', uint32(0xFFFFFFFFu), ' ', 0));
+    EXPECT_EQ("-9223372036854775808 18446744073709551615",
+              Reported(std::numeric_limits<int64>::min(), ' ', std::numeric_limits<uint64>::max()));
+    EXPECT_EQ("0.500000 -1.666667 inf", Reported(0.5f, ' ', -5.0 / 3, ' ', std::numeric_limits<double>::infinity()));
+    EXPECT_EQ("(1.000000, -2.500000)(0.250000, 3.000000)", Reported(cmplx64{1, -2.5f}, cmplx128{0.25, 3}));
+    EXPECT_EQ(255u, Reported(-1.7e308).size()) << "309 digits before the point are cut";
+}
+
+TEST(DebugStream, TextsAreWrittenAndNullIsNothing) {
+    alignas(LStr) uint8 storage[LStrSize(3) + 8] = {};
+    auto* text = reinterpret_cast<LStr*>(storage);
+    text->count = 3;
+    std::memcpy(storage + offsetof(LStr, bytes), "abc", 3);
+    LStrHandle handle = &text;
+    LStrPtr emptyMaster = nullptr;
+    LStrHandle emptyHandle = &emptyMaster;
+    EXPECT_EQ("abcabcabc", Reported(text, handle, static_cast<const LStrHandle*>(&handle)));
+    EXPECT_EQ("<>", Reported('<', static_cast<LStrPtr>(nullptr), LStrHandle(nullptr), emptyHandle,
+                             static_cast<const LStrHandle*>(nullptr), static_cast<CStr>(nullptr), '>'));
+    EXPECT_EQ("view", Reported(std::string_view("viewed", 4)));
+}
+
+TEST(DebugStream, FormattingHelpers) {
+    const uint8 pascal[] = {2, 'h', 'i', 'x'};
+    EXPECT_EQ("hi|c", Reported(DbgFmtPStr(pascal), '|', DbgFmtCStr("c"), DbgFmtCStr(nullptr), DbgFmtPStr(nullptr)));
+    EXPECT_EQ("0x0000002a 0xffffffff 0x0badcafe",
+              Reported(DbgFmtPtr(42), ' ', DbgFmtPtr(-1), ' ', DbgFmtHex(0x0BADCAFEu)));
+    EXPECT_EQ("TEX ", Reported(DbgFmtQuadChar(TESSEL_FOURCC('T', 'E', 'X', 1))));
+    EXPECT_EQ(" \x80~ ", Reported(DbgFmtQuadChar(TESSEL_FOURCC(127, 0x80, '~', 31))));
+    EXPECT_EQ("0xab12", Reported(DbgFmtSysThreadID(0xAB12)));
+    EXPECT_EQ("00042", Reported(DbgFmtType<int>(42, "%05d")));
+    EXPECT_EQ("50%", Reported(DbgFmtType<int>(50, "%d%%")));
+    EXPECT_EQ("__DbgFmtType: Bad Format__", Reported(DbgFmtType<int>(1, "%d%d")));
+    EXPECT_EQ(std::string(31, '7'), Reported(DbgFmtNum(std::string(40, '7').c_str())));
+    // An address has the width of a pointer and no prefix.
+    char expected[32];
+    std::snprintf(expected, sizeof expected, "%0*llX", int(2 * sizeof(void*)),
+                  static_cast<unsigned long long>(reinterpret_cast<uintptr_t>(&Function)));
+    EXPECT_EQ(expected, Reported(&Function));
+}
+
+TEST(DebugStream, KeepsTheFirst255Bytes) {
+    DebugStream stream("f", 1, "i", kDebugInfo);
+    for (int i = 0; i < 3; ++i) stream.Append(std::string(100, static_cast<char>('a' + i)).c_str());
+    stream.Append('x');
+    EXPECT_EQ(std::string(100, 'a') + std::string(100, 'b') + std::string(55, 'c'), stream.Text());
+}
+
+class DebugStreamPool : public testing::Test {
+protected:
+    void SetUp() override { DebugStreamStart(); }
+    void TearDown() override { DebugStreamStop(); }
+
+    // Makes so many streams at once, and gives all of them back.
+    static void MakeStreams(int count) {
+        std::vector<std::unique_ptr<DebugStream>> streams;
+        for (int i = 0; i < count; ++i) {
+            streams.push_back(std::make_unique<DebugStream>("f", 1, "i", kDebugInfo));
+            streams.back()->Append(std::to_string(i).c_str());
+        }
+        for (int i = 0; i < count; ++i) EXPECT_EQ(std::to_string(i), streams[static_cast<size_t>(i)]->Text());
+    }
+};
+
+TEST_F(DebugStreamPool, TheSeventeenthStreamAtOnceHasABufferOfItsOwn) {
+    MakeStreams(16);
+    MakeStreams(16);
+    EXPECT_EQ(0, DebugStreamFailedCheckouts());
+    MakeStreams(17);
+    EXPECT_EQ(1, DebugStreamFailedCheckouts());
+
+    ReportRecorder recorder;
+    DebugStreamStop();
+    EXPECT_EQ(std::vector<std::string>{"DebugStream_Service: 1 failed checkouts forced a private buffer."},
+              recorder.Texts(kDebugWarning));
+    MakeStreams(20);
+    EXPECT_EQ(1, DebugStreamFailedCheckouts()) << "without the pool nothing is counted";
+    DebugStreamStart();
+    EXPECT_EQ(0, DebugStreamFailedCheckouts());
+}
+
+}  // namespace
+}  // namespace tessel
