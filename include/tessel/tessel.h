@@ -35,6 +35,7 @@
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
 #include <tessel/paths/PathTextFormat.h>
+#include <tessel/registry/WinRegistry.h>
 #include <tessel/resources/RFReadWrite.h>
 #include <tessel/resources/ResourceManager.h>
 #include <tessel/resources/ovresfile.h>
@@ -68,8 +69,15 @@
 #include <tessel/system/CPUInformation.h>
 #include <tessel/system/OpSystemInfo.h>
 #include <tessel/system/PlatformInformation.h>
+#include <tessel/threads/ThThread.h>
 #include <tessel/time/BMTime.h>
 #include <tessel/time/HRTime.h>
 #include <tessel/time/Millisecs.h>
+#include <tessel/utilities/OVGuid.h>
+#include <tessel/utilities/RandomGen.h>
+#include <tessel/utilities/SortSearch.h>
+#include <tessel/utilities/UserCommandLine.h>
+#include <tessel/utilities/VersionUtil.h>
+#include <tessel/utilities/pheventlog.h>
 
 #endif
