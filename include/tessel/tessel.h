@@ -3,6 +3,9 @@
 #define TESSEL_TESSEL_H
 
 #include <tessel/base/Export.h>
+#include <tessel/base/MGAppInterface.h>
+#include <tessel/base/MGModule.h>
+#include <tessel/base/MGPlacementNew.h>
 #include <tessel/base/MgErr.h>
 #include <tessel/base/NumericTypes.h>
 #include <tessel/base/OVExcept.h>

@@ -1,0 +1,44 @@
+#include <tessel/base/MGAppInterface.h>
+
+#include <atomic>
+
+using tessel::MGAppInterface;
+
+namespace {
+
+std::atomic<MGAppInterface*> theApp{nullptr};
+
+// Asks the object, or for null the installed one.
+template <class Result>
+Result Ask(MGAppInterface* app, Result (MGAppInterface::*query)()) {
+    if (!app) app = theApp;
+    return app ? (app->*query)() : Result{0};
+}
+
+}  // namespace
+
+void MGAppInterfaceSet(MGAppInterfacePtr app) {
+    theApp = app;
+}
+MGAppInterfacePtr MGApp(void) {
+    return theApp;
+}
+
+uint32 MGGetAppAPIVersion(MGAppInterfacePtr app) {
+    return Ask(app, &MGAppInterface::AppAPIVersion);
+}
+uint32 MGGetAppEditorVersion(MGAppInterfacePtr app) {
+    return Ask(app, &MGAppInterface::AppEditorVersion);
+}
+int32 MGGetIsTopLevel(MGAppInterfacePtr app) {
+    return Ask(app, &MGAppInterface::IsTopLevel);
+}
+int32 MGGetIsBoundApp(MGAppInterfacePtr app) {
+    return Ask(app, &MGAppInterface::IsBoundApp);
+}
+int32 MGGetIsRunTime(MGAppInterfacePtr app) {
+    return Ask(app, &MGAppInterface::IsRunTime);
+}
+int32 MGGetIsFullFeatureRunTime(MGAppInterfacePtr app) {
+    return Ask(app, &MGAppInterface::IsFullFeatureRunTime);
+}

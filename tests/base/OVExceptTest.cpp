@@ -1,0 +1,96 @@
+#include <gtest/gtest.h>
+#include <tessel/base/OVExcept.h>
+
+#include <new>
+#include <stdexcept>
+#include <string>
+#include <typeinfo>
+
+#include "diagnostics/Guarded.h"
+#include "support/ReportRecorder.h"
+
+namespace tessel {
+namespace {
+
+TEST(OVExcept, SaysWhatWhereAndWhy) {
+    const OVExcept e(7, "no such thing", "dir/file.cpp", 42);
+    EXPECT_EQ(7, e.Code());
+    EXPECT_EQ(42, e.Line());
+    EXPECT_STREQ("OVExcept. Err=7, File=dir/file.cpp, Line=42, Detail='no such thing'", e.what());
+
+    const OVExcept nothing(-1, nullptr, nullptr, 0);
+    EXPECT_STREQ("OVExcept. Err=-1, File=, Line=0, Detail=''", nothing.what());
+}
+
+TEST(OVExcept, LongTextsAreCut) {
+    const std::string detail(127, 'd');
+    const std::string tail = "0123456789012345678901234567.cpp";  // 32 characters
+    const OVExcept e(1, (detail + "xx").c_str(), ("/very/long/" + tail).c_str(), 1);
+    EXPECT_EQ(detail, e.Detail());
+    EXPECT_EQ(tail.substr(1), e.File());
+    EXPECT_EQ("OVExcept. Err=1, File=" + tail.substr(1) + ", Line=1, Detail='" + detail + "'", e.what());
+}
+
+// Not inlined, so that each call has a frame.
+__attribute__((noinline)) int ThrowAt(int depth) {
+    if (depth > 0) return ThrowAt(depth - 1) + 1;
+    TESSEL_THROW(kArgErr, "deep");
+}
+
+TEST(OVExcept, CarriesTheCallStackThatMadeIt) {
+    try {
+        ThrowAt(5);
+        FAIL();
+    } catch (const OVExcept& e) {
+        const auto begin = reinterpret_cast<uintptr_t>(&ThrowAt);
+        ASSERT_GE(e.Stack().count, 7);
+        for (int32 i = 1; i < 6; ++i) {  // the throw itself may stand apart, among the cold code
+            const auto address = reinterpret_cast<uintptr_t>(e.Stack().addresses[i]);
+            EXPECT_TRUE(address > begin && address < begin + 4096) << i;
+        }
+        // All but the innermost call return to the same place.
+        EXPECT_EQ(e.Stack().addresses[1], e.Stack().addresses[5]);
+        EXPECT_NE(e.Stack().addresses[5], e.Stack().addresses[6]);
+    }
+}
+
+template <class Thrower>
+OVExcept Caught(Thrower thrower) {
+    try {
+        thrower();
+    } catch (...) {
+        return GetExceptionInCatch_FileAndLine("here.cpp", 12);
+    }
+    throw std::logic_error("nothing was thrown");
+}
+
+TEST(GetExceptionInCatch, TurnsEveryKindIntoOne) {
+    EXPECT_STREQ("OVExcept. Err=2, File=here.cpp, Line=12, Detail='converted from std::bad_alloc'",
+                 Caught([] { throw std::bad_alloc(); }).what());
+    EXPECT_STREQ("OVExcept. Err=42, File=here.cpp, Line=12, Detail='converted from std::bad_cast'",
+                 Caught([] { throw std::bad_cast(); }).what());
+    EXPECT_STREQ("OVExcept. Err=42, File=here.cpp, Line=12, Detail='converted from std::exception'",
+                 Caught([] { throw std::length_error("long"); }).what());
+    EXPECT_STREQ("OVExcept. Err=9, File=there.cpp, Line=3, Detail='full'",
+                 Caught([] { throw OVExcept(9, "full", "there.cpp", 3); }).what());
+}
+
+TEST(GetExceptionInCatch, AnythingElseIsReportedAndThrownOn) {
+    test::ReportRecorder recorder;
+    EXPECT_THROW(Caught([] { throw 5; }), int);
+    EXPECT_EQ(std::vector<std::string>{"GetExceptionInCatch() called from inside catch(...) -- here.cpp Line 12"},
+              recorder.Texts(kDebugError));
+}
+
+TEST(Guarded, GivesTheCodeOfWhatWasThrown) {
+    EXPECT_EQ(5, Guarded([] { return 5; }));
+    EXPECT_EQ(9, Guarded([]() -> MgErr { throw OVExcept(9, "", "", 0); }));
+    EXPECT_EQ(kMemFullErr, Guarded([]() -> MgErr { throw std::bad_array_new_length(); }));
+    EXPECT_EQ(kGenericErr, Guarded([]() -> MgErr { throw std::runtime_error(""); }));
+    EXPECT_EQ(kGenericErr, Guarded([]() -> MgErr { throw 1; }));
+    EXPECT_EQ(3.5, GuardedOr(3.5, []() -> double { throw 1; }));
+    EXPECT_EQ(4.5, GuardedOr(3.5, [] { return 4.5; }));
+}
+
+}  // namespace
+}  // namespace tessel
