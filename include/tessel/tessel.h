@@ -19,6 +19,9 @@
 #include <tessel/diagnostics/StackChain.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/files/shortcut.h>
+#include <tessel/frame/CoreServices.h>
+#include <tessel/frame/ServiceRegistry.h>
+#include <tessel/frame/TesselInit.h>
 #include <tessel/memory/CookieManager.h>
 #include <tessel/memory/HObjList.h>
 #include <tessel/memory/MemoryManager.h>
