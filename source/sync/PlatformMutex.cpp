@@ -1,0 +1,43 @@
+#include <tessel/sync/PlatformMutex.h>
+
+#include "platform/Mutex.h"
+#include "sync/PlainAllocation.h"
+
+namespace tessel {
+namespace {
+
+class HostMutex final : public PlatformMutex, public PlainAllocation {
+public:
+    int32 Lock() override {
+        mutex_.Lock();
+        return 0;
+    }
+    int32 Unlock() override {
+        mutex_.Unlock();
+        return 0;
+    }
+    MgErr Init() override { return kNoErr; }
+    MgErr Uninit() override { return kNoErr; }
+
+private:
+    platform::Mutex mutex_;
+};
+
+}  // namespace
+
+PlatformMutex::~PlatformMutex() = default;
+
+PlatformMutex* CreatePlatformMutex() {
+    PlatformMutex* mutex = new (std::nothrow) HostMutex;
+    if (mutex) mutex->Init();
+    return mutex;
+}
+
+MgErr DestroyPlatformMutex(PlatformMutex* mutex) {
+    if (!mutex) return kNoErr;
+    MgErr err = mutex->Uninit();
+    delete mutex;
+    return err;
+}
+
+}  // namespace tessel

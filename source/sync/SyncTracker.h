@@ -1,0 +1,39 @@
+// The trackers of events and mutexes: one each, from the start of its service to its stop.
+#ifndef TESSEL_SOURCE_SYNC_SYNCTRACKER_H
+#define TESSEL_SOURCE_SYNC_SYNCTRACKER_H
+
+#include <tessel/diagnostics/AllocTracker.h>
+#include <tessel/diagnostics/DumpLeakInfo.h>
+
+#include <atomic>
+
+#include <tessel/base/MgErr.h>
+
+namespace tessel {
+
+class SyncTracker {
+public:
+    // A tracker that cannot be made tracks nothing.
+    void Start() { tracker_.store(CreateAllocTracker(), std::memory_order_release); }
+
+    void Stop(int32 expected, CStr name, CStr fileName) {
+        AllocTracker* tracker = tracker_.exchange(nullptr, std::memory_order_acq_rel);
+        DumpLeakInfo(tracker, expected, name, fileName);
+        DestroyAllocTracker(tracker);
+    }
+    // Not inline: one of the three calls that the tracker leaves out of its call stacks.
+    __attribute__((noinline)) void Add(const void* object, uint32 size, const char* file, int32 line) {
+        if (AllocTracker* tracker = tracker_.load(std::memory_order_acquire))
+            tracker->AddRecord(object, size, file, line);
+    }
+    void Remove(const void* object) {
+        if (AllocTracker* tracker = tracker_.load(std::memory_order_acquire)) tracker->RemoveRecord(object);
+    }
+
+private:
+    std::atomic<AllocTracker*> tracker_{nullptr};
+};
+
+}  // namespace tessel
+
+#endif
