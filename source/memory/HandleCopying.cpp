@@ -1,0 +1,146 @@
+// Copying and appending, and the other operations that are made of the basic ones.
+#include <cstring>
+#include <utility>
+
+#include <tessel/diagnostics/DebugStream.h>
+
+#include "memory/Handles.h"
+
+using namespace tessel;
+
+namespace {
+
+// Enlarges a handle by `size` bytes; *end = where they begin.
+MgErr Append(UHandle h, uint32 size, uint32* end) {
+    *end = IsGoodHandle(h, kChangeProves) ? DSGetHandleSize(h) : 0;
+    if (size > UINT32_MAX - *end) return ReportMemoryError(kMemFullErr, "DSSetHandleSize");
+    return DSSetHandleSize(h, *end + size);
+}
+
+void Copy(const void* from, UHandle to, uint32 at, uint32 size) {
+    if (size != 0) std::memmove(*to + at, from, size);
+}
+
+}  // namespace
+
+MgErr DSCopyHandle(UHandle* destination, UHandle source) {
+    if (!destination) return kArgErr;
+    if (!source) return DSDisposeHandleAndNull(destination);
+    if (source == *destination) {
+        TESSEL_REPORT(kDebugWarning, 0x40B1A5E7u) << "Should call DSHandToHand. This is a no-op";
+        return kNoErr;
+    }
+    if (!IsGoodHandle(source, kChangeProves)) return kHandleErr;
+    uint32 size = DSGetHandleSize(source);
+    MgErr err = DSSetHandleSizeOrNewHandle(destination, size);
+    if (err == kNoErr) Copy(*source, *destination, 0, size);
+    return err;
+}
+
+MgErr DSHandToHand(UHandle* h) {
+    if (!h) return kArgErr;
+    if (!IsGoodHandle(*h, kChangeProves)) return kHandleErr;
+    uint32 size = DSGetHandleSize(*h);
+    UHandle copy = DSNewHandle(size);
+    if (!copy) return kMemFullErr;
+    Copy(**h, copy, 0, size);
+    *h = copy;
+    return kNoErr;
+}
+
+MgErr DSPtrToHand(const void* p, UHandle* h, uint32 size) {
+    if (!h) return kArgErr;
+    *h = DSNewHandle(size);
+    if (!*h) return kMemFullErr;
+    Copy(p, *h, 0, size);
+    return kNoErr;
+}
+
+MgErr DSPtrToXHand(const void* p, UHandle h, uint32 size) {
+    MgErr err = DSSetHandleSize(h, size);
+    if (err == kNoErr) Copy(p, h, 0, size);
+    return err;
+}
+
+MgErr DSSetHandleFromPtr(UHandle* h, const void* p, uint32 size) {
+    MgErr err = DSSetHandleSizeOrNewHandle(h, size);
+    if (err == kNoErr) Copy(p, *h, 0, size);
+    return err;
+}
+
+MgErr DSSetHandleFromPtrNULLMeansEmpty(UHandle* h, const void* p, uint32 size) {
+    return size == 0 ? DSDisposeHandleAndNull(h) : DSSetHandleFromPtr(h, p, size);
+}
+
+MgErr DSPtrAndHand(const void* p, UHandle h, uint32 size) {
+    uint32 end;
+    MgErr err = Append(h, size, &end);
+    if (err == kNoErr) Copy(p, h, end, size);
+    return err;
+}
+
+MgErr DSHandAndHand(UHandle source, UHandle destination) {
+    if (!IsGoodHandle(source, kChangeProves)) return kHandleErr;
+    uint32 end, size = DSGetHandleSize(source);
+    MgErr err = Append(destination, size, &end);
+    if (err == kNoErr) Copy(*source, destination, end, size);
+    return err;
+}
+
+MgErr DSSwapHandles(UHandle a, UHandle b) {
+    if (!IsGoodHandle(a, kChangeProves) || !IsGoodHandle(b, kChangeProves)) {
+        TESSEL_REPORT(kDebugFatal, 0x64D2907Fu);
+        return kHandleErr;
+    }
+    if (a == b) TESSEL_REPORT(kDebugFatal, 0x0E8C53B6u);
+    uintptr_t first = SlotContent(a), second = SlotContent(b);
+    SetSlotContent(a, second);
+    SetSlotContent(b, first);
+    return kNoErr;
+}
+
+UHandle DSRecoverHandle(const void* data) {
+    bool damaged = data && ChecksGuards(GuardKind::kHandle) && !CheckGuards(data, GuardKind::kHandle);
+    UHandle h = data && !damaged ? masterPointers.Find(data) : nullptr;
+    if (damaged)
+        TESSEL_REPORT(kDebugFatal, 0x3AE06C94u);
+    else if (!h)
+        TESSEL_REPORT(kDebugFatal, 0x57F4B12Du) << "Pointer passed to BRecoverHandle not linked to master pointer!";
+    return h;
+}
+
+// ---- lock and purge states: there are none, only the handle is checked ----------------------------------------------
+
+namespace {
+
+MgErr CheckFor(UHandle h, const char* operation) {
+    return ReportMemoryError(IsGoodHandle(h, kChangeProves) ? kNoErr : kHandleErr, operation);
+}
+
+}  // namespace
+
+MgErr AZHLock(UHandle h) {
+    return CheckFor(h, "AZHLock");
+}
+
+// Reports under the name of its twin.
+MgErr AZHUnlock(UHandle h) {
+    return CheckFor(h, "AZHLock");
+}
+
+void AZHPurge(UHandle h) {
+    CheckFor(h, "AZHPurge");
+}
+
+void AZHNoPurge(UHandle h) {
+    CheckFor(h, "AZHNoPurge");
+}
+
+int32 AZHGetState(UHandle h) {
+    IsGoodHandle(h, kChangeProves);
+    return 0;
+}
+
+void AZHSetState(UHandle h, int32) {
+    CheckFor(h, "AZHSetState");
+}

@@ -1,0 +1,36 @@
+// Handles as the other files of the memory manager use them.
+#ifndef TESSEL_SOURCE_MEMORY_HANDLES_H
+#define TESSEL_SOURCE_MEMORY_HANDLES_H
+
+#include <tessel/memory/MemoryManager.h>
+
+#include "memory/GuardBytes.h"
+#include "memory/MasterPointers.h"
+#include "memory/MemorySettings.h"
+
+namespace tessel {
+
+// The level of handle checking from which an operation proves that a handle is one.
+enum CheckFrom : int32 { kAlwaysProve = 0, kChangeProves = 1, kQueryProves = 2 };
+
+inline bool IsLiveHandle(UHandle h, CheckFrom from) {
+    if (memorySettings.checking.load(std::memory_order_relaxed) >= from ? !masterPointers.Contains(h) : !h)
+        return false;
+    return IsLiveContent(SlotContent(h));
+}
+
+// Live, and its guard bytes, when they are checked, intact.
+inline bool IsGoodHandle(UHandle h, CheckFrom from) {
+    return __builtin_expect(IsLiveHandle(h, from), true) &&
+           (__builtin_expect(!ChecksGuards(GuardKind::kHandle), true) || CheckGuards(*h, GuardKind::kHandle));
+}
+
+// Returns the error after reporting "Memory error 3 in DSDisposeHandle"; 0 is not reported.
+MgErr ReportMemoryError(MgErr err, const char* operation);
+
+// Frees a live handle, damaged or not, without asking or telling anybody.
+void FreeHandle(UHandle h);
+
+}  // namespace tessel
+
+#endif

@@ -1,0 +1,198 @@
+#include "memory/Heap.h"
+
+#include <cstring>
+
+#include <tessel/diagnostics/DebugStream.h>
+
+#include "platform/Mutex.h"
+#include "platform/Process.h"
+
+namespace tessel::heap {
+namespace {
+
+constexpr size_t kAlignment = 16;  // as malloc's
+
+// In front of every plain block.
+struct alignas(kAlignment) Link {
+    Link* next;
+    Link* previous;
+};
+
+struct alignas(64) Shard {
+    platform::Mutex mutex;  // guards the rest, and the links of the blocks in it
+    Link blocks{&blocks, &blocks};
+    uint64 bytes = 0;
+};
+
+constexpr size_t kShards = 64;
+constinit Shard shards[kShards];
+
+std::atomic<HandleBlocks> handleBlocks{nullptr};
+
+Shard& ShardOf(const Link* link) {
+    uint32 hash = static_cast<uint32>(reinterpret_cast<uintptr_t>(link) >> 4) * 0x9E3779B1u;
+    return shards[hash / (UINT32_MAX / kShards + 1)];
+}
+
+size_t SizeOf(Link* link) {
+    return platform::AllocatedSize(link) - sizeof(Link);
+}
+
+bool StraightThrough() {
+    static const bool straight = [] {
+        const char* value = platform::EnvironmentGet("OV_USE_MALLOC");
+        return value && std::strcmp(value, "1") == 0;
+    }();
+    return straight;
+}
+
+void Enter(Link* link) {
+    Shard& shard = ShardOf(link);
+    platform::MutexHolder hold(shard.mutex);
+    link->next = shard.blocks.next;
+    link->previous = &shard.blocks;
+    link->next->previous = link;
+    shard.blocks.next = link;
+    shard.bytes += SizeOf(link);
+}
+
+// Whether an address can be a link of the shard: what overwrote a block is hardly ever one.
+bool IsPlausible(const Shard& shard, const Link* link) {
+    if (link == &shard.blocks) return true;
+    return link && reinterpret_cast<uintptr_t>(link) % kAlignment == 0 && &ShardOf(link) == &shard;
+}
+
+bool IsSound(const Shard& shard, const Link* link) {
+    return IsPlausible(shard, link->next) && IsPlausible(shard, link->previous) && link->next->previous == link &&
+           link->previous->next == link;
+}
+
+// False, and nothing is done, when the links are damaged.
+bool Remove(Link* link) {
+    Shard& shard = ShardOf(link);
+    platform::MutexHolder hold(shard.mutex);
+    if (!IsSound(shard, link)) return false;
+    link->next->previous = link->previous;
+    link->previous->next = link->next;
+    shard.bytes -= SizeOf(link);
+    return true;
+}
+
+void ReportDamage(Error error, const void*) {
+    if (error == Error::kDamagedBlock) TESSEL_REPORT(kDebugError, 0x2B94D6E8u) << "The heap is corrupt";
+}
+
+std::atomic<ErrorCallback> errorCallback{ReportDamage};
+
+// The first block whose links are damaged, or null. Each block is looked at before its link is followed.
+const Link* WalkShard(Shard& shard, void* context, Visitor visitor, bool& goOn) {
+    platform::MutexHolder hold(shard.mutex);
+    for (Link* link = shard.blocks.next; goOn && link != &shard.blocks; link = link->next) {
+        if (!IsSound(shard, link)) return link;
+        goOn = visitor(context, link + 1, SizeOf(link));
+    }
+    return nullptr;
+}
+
+}  // namespace
+
+std::atomic<AllocationFilter> allocationFilter{nullptr};
+
+void SetAllocationFilter(AllocationFilter filter) {
+    allocationFilter.store(filter, std::memory_order_relaxed);
+}
+
+ErrorCallback SetErrorCallback(ErrorCallback callback) {
+    return errorCallback.exchange(callback);
+}
+
+void CallErrorCallback(Error error, const void* block) {
+    if (ErrorCallback callback = errorCallback.load()) callback(error, block);
+}
+
+void* OutOfMemory() {
+    CallErrorCallback(Error::kOutOfMemory, nullptr);
+    return nullptr;
+}
+
+void* Allocate(size_t size) {
+    if (size > SIZE_MAX - sizeof(Link) || !MayAllocate(size)) return OutOfMemory();
+    if (StraightThrough()) return std::malloc(size);
+    Link* link = static_cast<Link*>(std::malloc(size + sizeof(Link)));
+    if (!link) return OutOfMemory();
+    Enter(link);
+    return link + 1;
+}
+
+void Free(void* block) {
+    if (StraightThrough()) return std::free(block);
+    if (!block) return;
+    Link* link = static_cast<Link*>(block) - 1;
+    if (Remove(link))
+        std::free(link);
+    else
+        CallErrorCallback(Error::kDamagedBlock, block);
+}
+
+void* Resize(void* block, size_t size) {
+    if (size > SIZE_MAX - sizeof(Link) || !MayAllocate(size)) return OutOfMemory();
+    if (StraightThrough()) return std::realloc(block, size);
+    Link* link = static_cast<Link*>(block) - 1;
+    if (!Remove(link)) {
+        CallErrorCallback(Error::kDamagedBlock, block);
+        return nullptr;
+    }
+    Link* resized = static_cast<Link*>(std::realloc(link, size + sizeof(Link)));
+    Enter(resized ? resized : link);
+    return resized ? resized + 1 : OutOfMemory();
+}
+
+void SetHandleBlocks(HandleBlocks blocks) {
+    handleBlocks.store(blocks);
+}
+
+namespace {
+
+// The damaged block is only told where the lists show it.
+bool WalkAll(void* context, Visitor visitor, const void*& damaged) {
+    bool goOn = true;
+    for (size_t i = 0; goOn && i < kShards; ++i)
+        if (const Link* link = WalkShard(shards[i], context, visitor, goOn)) {
+            damaged = link + 1;
+            return false;
+        }
+    HandleBlocks blocks = handleBlocks.load();
+    if (!goOn || !blocks) return goOn;
+    GateClosed closed;
+    return blocks(context, visitor);
+}
+
+}  // namespace
+
+bool Walk(void* context, Visitor visitor) {
+    const void* damaged = nullptr;
+    return WalkAll(context, visitor, damaged);
+}
+
+bool Check() {
+    const void* damaged = nullptr;
+    bool sound = WalkAll(
+        nullptr, [](void*, const void*, size_t) { return true; }, damaged);
+    if (!sound) CallErrorCallback(Error::kDamagedBlock, damaged);
+    return sound;
+}
+
+uint64 TotalAllocated() {
+    uint64 total = static_cast<uint64>(ThreadMemory::Totals().bytes);
+    for (Shard& shard : shards) {
+        platform::MutexHolder hold(shard.mutex);
+        total += shard.bytes;
+    }
+    return total;
+}
+
+void ReturnFreeMemory() {
+    platform::ReturnFreeMemory();
+}
+
+}  // namespace tessel::heap

@@ -1,0 +1,212 @@
+#include "memory/MasterPointers.h"
+
+#include <cstdlib>
+#include <utility>
+
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/memory/MemoryManager.h>
+
+#include "memory/HandleBlock.h"
+#include "memory/Heap.h"
+
+namespace tessel {
+
+MasterPointers masterPointers;
+
+// ---- the set --------------------------------------------------------------------------------------------------------
+
+MasterPointerSet::Table* MasterPointerSet::NewTable(uint32 bits, Table* older) {
+    constexpr uint32 kHashBits = 32;
+    size_t entries = size_t{1} << bits;
+    auto* table = static_cast<Table*>(std::calloc(1, offsetof(Table, entries) + entries * sizeof(Table::entries[0])));
+    if (!table) return nullptr;
+    table->older = older;
+    table->mask = static_cast<uint32>(entries - 1);
+    table->shift = kHashBits - bits;
+    return table;
+}
+
+void MasterPointerSet::Insert(Table& table, uintptr_t block) {
+    uintptr_t last = block + sizeof(MasterPointerBlock) - 1;
+    for (uintptr_t stretch = block >> kStretchBits; stretch <= last >> kStretchBits; ++stretch) {
+        uint32 i = table.Start(stretch << kStretchBits);
+        while (table.entries[i & table.mask].load(std::memory_order_relaxed) != 0) ++i;
+        table.entries[i & table.mask].store(block, std::memory_order_release);
+    }
+}
+
+bool MasterPointerSet::Grow() {
+    constexpr uint32 kFirstBits = 6;
+    Table* old = table_.load(std::memory_order_relaxed);
+    Table* table = NewTable(old ? 32 - old->shift + 1 : kFirstBits, old);
+    if (!table) return false;
+    for (uint32 i = 0; old && i <= old->mask; ++i) {
+        uintptr_t block = old->entries[i].load(std::memory_order_relaxed);
+        // Once for each block: at the first of its stretches.
+        if (block != 0 && !IsIn(*table, block)) Insert(*table, block);
+    }
+    table_.store(table, std::memory_order_release);
+    return true;
+}
+
+bool MasterPointerSet::IsIn(const Table& table, uintptr_t block) {
+    for (uint32 i = table.Start(block);; ++i) {
+        uintptr_t entry = table.entries[i & table.mask].load(std::memory_order_relaxed);
+        if (entry == 0 || entry == block) return entry == block;
+    }
+}
+
+bool MasterPointerSet::Add(const MasterPointerBlock* block) {
+    const Table* table = table_.load(std::memory_order_relaxed);
+    if ((!table || (used_ + kMostStretches) * 4 > table->mask) && !Grow()) return false;
+    Insert(*table_.load(std::memory_order_relaxed), reinterpret_cast<uintptr_t>(block));
+    used_ += kMostStretches;
+    return true;
+}
+
+void MasterPointerSet::Clear() {
+    Table* table = table_.exchange(nullptr, std::memory_order_acq_rel);
+    while (table) std::free(std::exchange(table, table->older));
+    used_ = 0;
+}
+
+// ---- blocks ---------------------------------------------------------------------------------------------------------
+
+MgErr MasterPointers::Start() {
+    for (int i = 0; i < kFirstBlocks; ++i)
+        if (!AddBlock()) {
+            Stop();
+            return kMemFullErr;
+        }
+    return kNoErr;
+}
+
+void MasterPointers::Stop() {
+    ThreadMemory::ForgetSlots();
+    set_.Clear();
+    while (blocks_) DisposePtrBlock(std::exchange(blocks_, blocks_->next));
+    freeHead_ = nullptr;
+    freeCount_ = blockCount_ = 0;
+}
+
+// Threads all slots of a new block onto the chain.
+bool MasterPointers::AddBlock() {
+    auto* block = static_cast<MasterPointerBlock*>(static_cast<void*>(NewPtrBlock(sizeof(MasterPointerBlock))));
+    if (!block) return false;
+    if (!set_.Add(block)) {
+        DisposePtrBlock(block);
+        return false;
+    }
+    for (uint32 i = 0; i < kSlotsPerBlock; ++i) {
+        UHandle next = i + 1 < kSlotsPerBlock ? &block->slots[i + 1] : freeHead_;
+        SetSlotContent(&block->slots[i], reinterpret_cast<uintptr_t>(next) | 1);
+    }
+    freeHead_ = &block->slots[0];
+    freeCount_ += kSlotsPerBlock;
+    block->next = blocks_;
+    blocks_ = block;
+    ++blockCount_;
+    return true;
+}
+
+// ---- taking and returning slots -------------------------------------------------------------------------------------
+
+// Cuts a chain for a thread off the shared one.
+bool MasterPointers::Refill(SlotChain& chain) {
+    ThMutexHolder hold(mutex);
+    if (!freeHead_ && !AddBlock()) return false;
+    chain.head = chain.tail = freeHead_;
+    for (chain.count = 1; chain.count < kChainSlots; ++chain.count) {
+        UHandle next = reinterpret_cast<UHandle>(SlotContent(chain.tail) & ~uintptr_t{1});
+        if (!next) break;
+        chain.tail = next;
+    }
+    freeHead_ = reinterpret_cast<UHandle>(SlotContent(chain.tail) & ~uintptr_t{1});
+    freeCount_ -= static_cast<int32>(chain.count);
+    SetSlotContent(chain.tail, 1);
+    return true;
+}
+
+UHandle MasterPointers::TakeShared(ThreadMemory* mine) {
+    SlotChain single;
+    SlotChain& chain = mine ? mine->slots : single;
+    if (mine && mine->reserve.head)
+        chain = std::exchange(mine->reserve, SlotChain());
+    else if (!Refill(chain)) {
+        CallSetMemFullProc(sizeof(MasterPointerBlock));
+        return nullptr;
+    }
+    UHandle slot = Pop(chain);
+    if (!mine) Return(single);
+    return slot;
+}
+
+void MasterPointers::PutShared(ThreadMemory* mine, UHandle slot) {
+    SlotChain single;
+    if (mine) {
+        Return(mine->reserve);
+        mine->reserve = std::exchange(mine->slots, SlotChain());
+    }
+    Push(mine ? mine->slots : single, slot);
+    if (!mine) Return(single);
+}
+
+void MasterPointers::Return(SlotChain& chain) {
+    if (!chain.head) return;
+    ThMutexHolder hold(mutex);
+    SetSlotContent(chain.tail, reinterpret_cast<uintptr_t>(freeHead_) | 1);
+    freeHead_ = chain.head;
+    freeCount_ += static_cast<int32>(chain.count);
+    chain = SlotChain();
+}
+
+// ---- looking at all -------------------------------------------------------------------------------------------------
+
+UHandle MasterPointers::Find(const void* data) const {
+    UHandle found = nullptr;
+    ForEachLive([&](UHandle slot) {
+        if (SlotContent(slot) != reinterpret_cast<uintptr_t>(data)) return true;
+        found = slot;
+        return false;
+    });
+    return found;
+}
+
+// No link is followed that does not lead to a slot.
+bool MasterPointers::IsChain(UHandle head, uint32 count) const {
+    for (; count > 0; --count) {
+        if (!Contains(head)) return false;
+        head = reinterpret_cast<UHandle>(SlotContent(head) & ~uintptr_t{1});
+    }
+    return head == nullptr;
+}
+
+bool MasterPointers::CheckChains(ThreadMemory* mine) const {
+    bool countIsBad, chainIsBad;
+    {
+        ThMutexHolder hold(mutex);
+        countIsBad = freeCount_ < 0;
+        chainIsBad = !countIsBad && !IsChain(freeHead_, static_cast<uint32>(freeCount_));
+    }
+    if (mine)
+        chainIsBad |=
+            !IsChain(mine->slots.head, mine->slots.count) || !IsChain(mine->reserve.head, mine->reserve.count);
+    if (countIsBad) TESSEL_REPORT(kDebugFatal, 0x6C0D37A5u) << "bad freemaster count";
+    if (chainIsBad) TESSEL_REPORT(kDebugFatal, 0x11F2E8B4u) << "freemaster chain isn't NULL terminated!";
+    return !countIsBad && !chainIsBad;
+}
+
+MgErr MasterPointers::CheckBlocks() const {
+    int32 difference;
+    {
+        ThMutexHolder hold(mutex);
+        int32 count = 0;
+        for (MasterPointerBlock* block = blocks_; block && count <= blockCount_; block = block->next) ++count;
+        difference = count - blockCount_;
+    }
+    if (difference > 0) TESSEL_REPORT(kDebugFatal, 0x59E3C1D0u) << "MemCheck error, m.p. block chain error 1";
+    if (difference < 0) TESSEL_REPORT(kDebugFatal, 0x0A7B64F9u) << "MemCheck error, m.p. block chain error 2";
+    return difference == 0 ? kNoErr : kCorruptErr;
+}
+
+}  // namespace tessel

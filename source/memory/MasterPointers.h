@@ -1,0 +1,164 @@
+// Master pointers: the slots that handles point to.
+//
+// Slots live in blocks of 10,000 that stay until the memory manager stops. A slot in use holds the address of the
+// handle's data, bit 0 clear; a free one holds the next free one with bit 0 set.
+#ifndef TESSEL_SOURCE_MEMORY_MASTERPOINTERS_H
+#define TESSEL_SOURCE_MEMORY_MASTERPOINTERS_H
+
+#include <atomic>
+
+#include <tessel/base/MgErr.h>
+#include <tessel/base/Types.h>
+#include <tessel/sync/ThMutex.h>
+
+#include "memory/ThreadMemory.h"
+
+namespace tessel {
+
+constexpr uint32 kSlotsPerBlock = 10000;
+
+struct MasterPointerBlock {
+    MasterPointerBlock* next;  // newest first
+    UPtr slots[kSlotsPerBlock];
+};
+
+inline uintptr_t SlotContent(UHandle slot) {
+    return reinterpret_cast<uintptr_t>(__atomic_load_n(slot, __ATOMIC_ACQUIRE));
+}
+inline void SetSlotContent(UHandle slot, uintptr_t content) {
+    __atomic_store_n(slot, reinterpret_cast<UPtr>(content), __ATOMIC_RELEASE);
+}
+inline bool IsLiveContent(uintptr_t content) {
+    return content != 0 && (content & 1) == 0;
+}
+
+// The addresses of all blocks, to tell a handle from any other address. A hash table of the stretches of memory that
+// the blocks cover. Lookups take no lock and write nothing: entries are only added, a table that is full is replaced by
+// a larger one, and the old one stays until Clear.
+class MasterPointerSet {
+public:
+    bool Contains(const void* address) const {
+        const Table* table = table_.load(std::memory_order_acquire);
+        if (__builtin_expect(table == nullptr, false)) return false;
+        uintptr_t at = reinterpret_cast<uintptr_t>(address);
+        for (uint32 i = table->Start(at);; ++i) {
+            uintptr_t block = table->entries[i & table->mask].load(std::memory_order_acquire);
+            if (block == 0) return false;
+            uintptr_t offset = at - block - offsetof(MasterPointerBlock, slots);
+            if (offset < sizeof(MasterPointerBlock::slots)) return offset % sizeof(UPtr) == 0;
+        }
+    }
+    // Callers serialise. False when there is no memory.
+    bool Add(const MasterPointerBlock* block);
+    void Clear();
+
+private:
+    static constexpr uint32 kStretchBits = sizeof(void*) == 8 ? 16 : 15;  // a block covers at most 3 stretches
+    static constexpr uint32 kMostStretches = 3;
+
+    struct Table {
+        Table* older;
+        uint32 mask;
+        uint32 shift;
+        std::atomic<uintptr_t> entries[1];  // mask + 1 of them, at most a quarter in use
+
+        uint32 Start(uintptr_t address) const {
+            return (static_cast<uint32>(address >> kStretchBits) * 0x9E3779B1u) >> shift;
+        }
+    };
+    static Table* NewTable(uint32 bits, Table* older);
+    static void Insert(Table& table, uintptr_t block);
+    static bool IsIn(const Table& table, uintptr_t block);
+    bool Grow();
+
+    std::atomic<Table*> table_{nullptr};
+    uint32 used_ = 0;
+};
+
+class MasterPointers {
+public:
+    MgErr Start();  // adds the first five blocks
+    void Stop();    // frees all blocks; no handle may be live
+
+    // The mutex guards the shared chain, its count, the list of blocks and their count. Nothing is called inside it
+    // that takes another lock of the memory manager, but for the heap's.
+    ThMutex mutex = nullptr;
+
+    // A slot for a new handle, or null. It holds 0.
+    UHandle Take(ThreadMemory* mine) {
+        if (__builtin_expect(mine != nullptr && mine->slots.head != nullptr, true)) return Pop(mine->slots);
+        return TakeShared(mine);
+    }
+    // Frees a slot: the next that this thread takes.
+    void Put(ThreadMemory* mine, UHandle slot) {
+        if (__builtin_expect(mine == nullptr || mine->slots.count == kChainSlots, false)) return PutShared(mine, slot);
+        Push(mine->slots, slot);
+    }
+    // Gives back all slots of a chain.
+    void Return(SlotChain& chain);
+
+    bool Contains(UHandle slot) const { return set_.Contains(slot); }
+
+    // The live slot that holds exactly this, or null.
+    UHandle Find(const void* data) const;
+
+    // Visits every live slot until the visitor returns false, which it then returns.
+    template <class Visitor>
+    bool ForEachLive(Visitor&& visitor) const {
+        ThMutexHolder hold(mutex);
+        for (MasterPointerBlock* block = blocks_; block; block = block->next)
+            for (UPtr& slot : block->slots)
+                if (IsLiveContent(SlotContent(&slot)) && !visitor(&slot)) return false;
+        return true;
+    }
+
+    // The same without the mutex, for a visitor that frees what it sees. No other thread may be using handles.
+    template <class Visitor>
+    void ForEachLeft(Visitor&& visitor) const {
+        for (MasterPointerBlock* block = blocks_; block; block = block->next)
+            for (UPtr& slot : block->slots)
+                if (IsLiveContent(SlotContent(&slot))) visitor(&slot);
+    }
+
+    // Follows the shared chain and the calling thread's, and reports what is wrong with them. True: nothing.
+    bool CheckChains(ThreadMemory* mine) const;
+
+    // Counts the blocks along the list and reports a difference. kCorruptErr.
+    MgErr CheckBlocks() const;
+
+private:
+    friend struct MasterPointersTest;
+    static constexpr uint32 kChainSlots = 32;
+    static constexpr int kFirstBlocks = 5;
+
+    static UHandle Pop(SlotChain& chain) {
+        UHandle slot = chain.head;
+        chain.head = reinterpret_cast<UHandle>(SlotContent(slot) & ~uintptr_t{1});
+        --chain.count;
+        SetSlotContent(slot, 0);
+        return slot;
+    }
+    static void Push(SlotChain& chain, UHandle slot) {
+        if (!chain.head) chain.tail = slot;
+        SetSlotContent(slot, reinterpret_cast<uintptr_t>(chain.head) | 1);
+        chain.head = slot;
+        ++chain.count;
+    }
+    UHandle TakeShared(ThreadMemory* mine);
+    void PutShared(ThreadMemory* mine, UHandle slot);
+    bool Refill(SlotChain& chain);
+    bool AddBlock();
+    bool IsChain(UHandle head, uint32 count) const;
+
+    UHandle freeHead_ = nullptr;
+    int32 freeCount_ = 0;
+    MasterPointerBlock* blocks_ = nullptr;
+    int32 blockCount_ = 0;
+    MasterPointerSet set_;
+};
+
+extern MasterPointers masterPointers;
+
+}  // namespace tessel
+
+#endif

@@ -1,0 +1,87 @@
+// Start and stop of the memory manager.
+#include <atomic>
+
+#include <tessel/diagnostics/DebugStream.h>
+
+#include "memory/HandleBlock.h"
+#include "memory/Handles.h"
+#include "memory/Heap.h"
+#include "memory/Service.h"
+#include "memory/Trackers.h"
+
+namespace tessel {
+namespace {
+
+std::atomic<bool> initialized{false};
+heap::ErrorCallback previousCallback = nullptr;
+
+// Lack of memory is told to the memory-full procedure instead.
+void PassOnHeapError(heap::Error error, const void* block) {
+    if (error != heap::Error::kOutOfMemory && previousCallback) previousCallback(error, block);
+}
+
+// Names the blocks of all handles to a walk over the heap. What the header says must fit into the block.
+bool NameHandleBlocks(void* context, heap::Visitor visitor) {
+    return masterPointers.ForEachLive([&](UHandle h) {
+        void* block = BlockOf(*h);
+        uint32 bytes = BlockSize(SizeOfData(*h), AlignmentOf(*h));
+        return bytes != 0 && bytes <= platform::AllocatedSize(block) && visitor(context, block, bytes);
+    });
+}
+
+// Reports and frees every handle that is left.
+void RecoverHandles() {
+    uint32 count = 0;
+    uint64 bytes = 0;
+    masterPointers.ForEachLeft([&](UHandle h) {
+        uint32 size = SizeOfData(*h);
+        TESSEL_REPORT(kDebugInfo, 0x66B5D82Cu) << "handle " << DbgFmtPtr(h) << ", size " << size << " still allocated.";
+        UntrackHandle(h);
+        FreeHandle(h);
+        ++count;
+        bytes += size;
+    });
+    masterPointers.Stop();
+    TESSEL_REPORT(kDebugInfo, 0x0D94A7F3u) << "Recovered " << count << " Handles for " << bytes << " bytes.";
+}
+
+}  // namespace
+
+MgErr MemoryManagerStart() {
+    NeedMemorySettings();
+    PrepareHandleGate();
+    previousCallback = heap::SetErrorCallback(PassOnHeapError);
+    SetMemoryDebugger(false);
+    MgErr err = masterPointers.Start();
+    if (err == kNoErr) err = ThMutexCreate(&masterPointers.mutex, "MemoryManager");
+    if (err != kNoErr) {
+        masterPointers.Stop();
+        heap::SetErrorCallback(previousCallback);
+        return err;
+    }
+    heap::SetHandleBlocks(NameHandleBlocks);
+    initialized.store(true);
+    StartTrackers();
+    StartScopedTracker();
+    return kNoErr;
+}
+
+MgErr MemoryManagerStop() {
+    initialized.store(false);
+    StopScopedTracker();
+    WriteLeakReports();
+    heap::SetHandleBlocks(nullptr);
+    RecoverHandles();
+    ThMutexDestroy(masterPointers.mutex);
+    masterPointers.mutex = nullptr;
+    StopTrackers();
+    SetMemFullProc(nullptr);
+    heap::SetErrorCallback(previousCallback);
+    return kNoErr;
+}
+
+}  // namespace tessel
+
+bool GetMemoryManagerInitialized(void) {
+    return tessel::initialized.load();
+}

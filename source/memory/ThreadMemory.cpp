@@ -1,0 +1,128 @@
+#include "memory/ThreadMemory.h"
+
+#include <cstdlib>
+#include <new>
+
+#include "memory/MasterPointers.h"
+#include "platform/Mutex.h"
+#include "platform/Thread.h"
+#include "platform/ThreadFence.h"
+
+namespace tessel {
+namespace {
+
+// Guards the list of threads, and is held while the gate is closed. The heap's locks may be taken inside.
+platform::Mutex threadsMutex;
+ThreadMemory* threads = nullptr;
+
+thread_local bool isEnding = false;
+
+void Accumulate(MemoryTotals& totals, const MemoryCounters& counters) {
+    totals.handles += counters.handles.Get();
+    totals.pointers += counters.pointers.Get();
+    totals.resizes += counters.resizes.Get();
+    totals.moves += counters.moves.Get();
+    totals.bytes += counters.bytes.Get();
+}
+
+}  // namespace
+
+MemoryCounters ThreadMemory::shared;
+thread_local constinit ThreadMemory* ThreadMemory::current __attribute__((tls_model("initial-exec"))) = nullptr;
+
+struct ThreadMemory::AtThreadExit {
+    ~AtThreadExit() {
+        isEnding = true;
+        ThreadMemory* mine = current;
+        current = nullptr;
+        if (mine) Retire(mine);
+    }
+    void Arm() {}
+};
+
+ThreadMemory* ThreadMemory::Adopt() {
+    if (isEnding) return nullptr;
+    void* memory = std::aligned_alloc(alignof(ThreadMemory), sizeof(ThreadMemory));
+    if (!memory) return nullptr;
+    static thread_local AtThreadExit atExit;
+    atExit.Arm();
+    ThreadMemory* mine = new (memory) ThreadMemory;
+    platform::MutexHolder hold(threadsMutex);
+    mine->next_ = threads;
+    threads = mine;
+    return current = mine;
+}
+
+void ThreadMemory::Retire(ThreadMemory* mine) {
+    masterPointers.Return(mine->slots);
+    masterPointers.Return(mine->reserve);
+    {
+        platform::MutexHolder hold(threadsMutex);
+        MemoryTotals own;
+        Accumulate(own, mine->counters);
+        shared.handles.AddShared(own.handles);
+        shared.pointers.AddShared(own.pointers);
+        shared.resizes.AddShared(own.resizes);
+        shared.moves.AddShared(own.moves);
+        shared.bytes.AddShared(own.bytes);
+        ThreadMemory** link = &threads;
+        while (*link != mine) link = &(*link)->next_;
+        *link = mine->next_;
+    }
+    mine->~ThreadMemory();
+    std::free(mine);
+}
+
+MemoryTotals ThreadMemory::Totals() {
+    MemoryTotals totals;
+    platform::MutexHolder hold(threadsMutex);
+    Accumulate(totals, shared);
+    for (ThreadMemory* thread = threads; thread; thread = thread->next_) Accumulate(totals, thread->counters);
+    return totals;
+}
+
+void ThreadMemory::ForgetSlots() {
+    platform::MutexHolder hold(threadsMutex);
+    for (ThreadMemory* thread = threads; thread; thread = thread->next_) thread->slots = thread->reserve = SlotChain();
+}
+
+// ---- the gate -------------------------------------------------------------------------------------------------------
+
+std::atomic<bool> HandleGate::closed{false};
+std::atomic<bool> HandleGate::light{false};
+
+void PrepareHandleGate() {
+    HandleGate::light.store(platform::FenceEveryThreadAvailable(), std::memory_order_relaxed);
+}
+
+void HandleGate::WaitUntilOpen() {
+    do {
+        mine_->inside_.store(0, std::memory_order_release);
+        threadsMutex.Lock();  // held by whoever closed the gate
+        threadsMutex.Unlock();
+        mine_->inside_.exchange(1, std::memory_order_seq_cst);
+    } while (closed.load(std::memory_order_seq_cst));
+}
+
+void HandleGate::LockShared() {
+    threadsMutex.Lock();
+}
+
+void HandleGate::UnlockShared() {
+    threadsMutex.Unlock();
+}
+
+GateClosed::GateClosed() {
+    threadsMutex.Lock();
+    HandleGate::closed.store(true, std::memory_order_seq_cst);
+    if (HandleGate::light.load(std::memory_order_relaxed)) platform::FenceEveryThread();
+    for (ThreadMemory* thread = threads; thread; thread = thread->next_)
+        while (thread->inside_.load(std::memory_order_seq_cst) != 0) platform::YieldThread();
+}
+
+GateClosed::~GateClosed() {
+    HandleGate::closed.store(false, std::memory_order_seq_cst);
+    threadsMutex.Unlock();
+}
+
+}  // namespace tessel

@@ -1,0 +1,80 @@
+#include <tessel/memory/TrackedMallocFree.h>
+
+#include <atomic>
+
+#include <tessel/diagnostics/DumpLeakInfo.h>
+
+#include "memory/HandleBlock.h"
+#include "memory/MemorySettings.h"
+#include "memory/Service.h"
+
+namespace tessel {
+namespace {
+
+constexpr int32 kStackSkip = 4;     // Record, TrackedMalloc, TrackedNew, operator new
+constexpr int32 kRecordLine = 140;  // the line that reports name for every tracked block
+constexpr char kLeakFile[] = "ovnewdelleaks.txt";
+
+std::atomic<AllocTracker*> tracker{nullptr};
+
+__attribute__((noinline)) void Record(const void* address, size_t size) {
+    if (AllocTracker* own = tracker.load(std::memory_order_acquire))
+        own->AddRecord(address, size <= UINT32_MAX ? static_cast<uint32>(size) : UINT32_MAX, __FILE__, kRecordLine);
+}
+
+class BadAllocation final : public std::bad_alloc {
+public:
+    const char* what() const noexcept override { return "bad allocation"; }
+};
+
+}  // namespace
+
+MgErr TrackedMallocFreeStart() {
+    tracker.store(CreateAllocTrackerSpecifySkip(kStackSkip));
+    return kNoErr;
+}
+
+MgErr TrackedMallocFreeStop() {
+    AllocTracker* own = tracker.exchange(nullptr);
+    DumpLeakInfo(own, 0, "new/delete leaks", kLeakFile);
+    DestroyAllocTracker(own);
+    return kNoErr;
+}
+
+void* TrackedNew(size_t size) {
+    void* address = TrackedMalloc(size != 0 ? size : 1);
+    if (!address) throw BadAllocation();
+    return address;
+}
+
+void* TrackedNewNoThrow(size_t size) noexcept {
+    return TrackedMalloc(size != 0 ? size : 1);
+}
+
+}  // namespace tessel
+
+using namespace tessel;
+
+void* TrackedMalloc(size_t size) {
+    NeedMemorySettings();
+    void* address = NewGuardedBlock(size, GuardKind::kNewDelete);
+    if (address) Record(address, size);
+    return address;
+}
+
+void TrackedFree(void* address) {
+    if (!address) return;
+    if (ChecksGuards(GuardKind::kNewDelete)) CheckGuards(address, GuardKind::kNewDelete);
+    if (AllocTracker* own = tracker.load(std::memory_order_acquire)) own->RemoveRecord(address);
+    DisposeGuardedBlock(address, GuardKind::kNewDelete);
+}
+
+void TrackedMallocDumpTracker(void) {
+    constexpr int32 kExpected = 330;
+    if (AllocTracker* own = tracker.load(std::memory_order_acquire))
+        DumpLeakInfo(own, kExpected, "new/delete leaks -- 330 is arbitrary to avoid known reported leaks.", kLeakFile);
+}
+
+void TrackedMallocResetTracker(void) {
+    if (AllocTracker* own = tracker.load(std::memory_order_acquire)) own->MarkAllReported();
+}

@@ -1,0 +1,82 @@
+#include "memory/Trackers.h"
+
+#include <atomic>
+
+#include "diagnostics/NumberText.h"
+#include "memory/HandleBlock.h"
+#include "memory/MasterPointers.h"
+#include "memory/MemorySettings.h"
+
+namespace tessel {
+namespace {
+
+constexpr int32 kExpected = 0;
+constexpr char kHandleLeaks[] = "Handle Leaks";
+constexpr char kHandleLeakFile[] = "ovHandleLeaks.txt";
+constexpr char kPointerLeaks[] = "Pointer Leaks";
+constexpr char kPointerLeakFile[] = "ovPointerLeaks.txt";
+
+std::atomic<AllocTracker*> handleTracker{nullptr};
+std::atomic<AllocTracker*> pointerTracker{nullptr};
+
+AllocTracker* Get(const std::atomic<AllocTracker*>& tracker) {
+    return tracker.load(std::memory_order_acquire);
+}
+
+}  // namespace
+
+void StartTrackers() {
+    handleTracker.store(CreateAllocTracker());
+    pointerTracker.store(CreateAllocTracker());
+    SetDetour(kHandlesTracked, Get(handleTracker) != nullptr);
+}
+
+void WriteLeakReports() {
+    if (AllocTracker* tracker = Get(handleTracker))
+        HandleLeakDumper(kExpected, kHandleLeaks, kHandleLeakFile).DumpLeaks(*tracker);
+    if (AllocTracker* tracker = Get(pointerTracker)) DumpLeakInfo(tracker, kExpected, kPointerLeaks, kPointerLeakFile);
+}
+
+void StopTrackers() {
+    SetDetour(kHandlesTracked, false);
+    DestroyAllocTracker(handleTracker.exchange(nullptr));
+    DestroyAllocTracker(pointerTracker.exchange(nullptr));
+}
+
+// Not inline, as TrackPointer: one of the three calls that a tracker leaves out of its call stacks.
+__attribute__((noinline)) void TrackHandle(UHandle h, uint32 size) {
+    if (AllocTracker* tracker = Get(handleTracker)) tracker->AddRecord(h, size, __FILE__, __LINE__);
+}
+
+__attribute__((noinline)) void TrackPointer(const void* p, uint32 size) {
+    if (AllocTracker* tracker = Get(pointerTracker)) tracker->AddRecord(p, size, __FILE__, __LINE__);
+}
+
+void UntrackHandle(UHandle h) {
+    if (AllocTracker* tracker = Get(handleTracker)) tracker->RemoveRecord(h);
+}
+
+void UntrackPointer(const void* p) {
+    if (AllocTracker* tracker = Get(pointerTracker)) tracker->RemoveRecord(p);
+}
+
+// The size recorded is that at creation; the handle knows its own.
+void HandleLeakDumper::DumpItemContents(const void* handle, uint32) {
+    UHandle h = static_cast<UHandle>(const_cast<void*>(handle));
+    if (!masterPointers.Contains(h) || !IsLiveContent(SlotContent(h))) return;
+    FormatToOutput("Master Pointer: 0x%s\n", AddressText(*h).Text());
+    LeakDumper::DumpItemContents(*h, SizeOfData(*h));
+}
+
+}  // namespace tessel
+
+using namespace tessel;
+
+void MemDumpTracker(void) {
+    WriteLeakReports();
+}
+
+void MemResetTracker(void) {
+    if (AllocTracker* tracker = Get(handleTracker)) tracker->MarkAllReported();
+    if (AllocTracker* tracker = Get(pointerTracker)) tracker->MarkAllReported();
+}
