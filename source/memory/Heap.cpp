@@ -14,13 +14,13 @@ constexpr size_t kAlignment = 16;  // as malloc's
 
 // In front of every plain block.
 struct alignas(kAlignment) Link {
-    Link* next;
-    Link* previous;
+    Link* next;      // null at the last
+    Link* previous;  // null at the first
 };
 
 struct alignas(64) Shard {
     platform::Mutex mutex;  // guards the rest, and the links of the blocks in it
-    Link blocks{&blocks, &blocks};
+    Link* first = nullptr;
     uint64 bytes = 0;
 };
 
@@ -49,22 +49,24 @@ bool StraightThrough() {
 void Enter(Link* link) {
     Shard& shard = ShardOf(link);
     platform::MutexHolder hold(shard.mutex);
-    link->next = shard.blocks.next;
-    link->previous = &shard.blocks;
-    link->next->previous = link;
-    shard.blocks.next = link;
+    link->next = shard.first;
+    link->previous = nullptr;
+    if (shard.first) shard.first->previous = link;
+    shard.first = link;
     shard.bytes += SizeOf(link);
 }
 
 // Whether an address can be a link of the shard: what overwrote a block is hardly ever one.
 bool IsPlausible(const Shard& shard, const Link* link) {
-    if (link == &shard.blocks) return true;
-    return link && reinterpret_cast<uintptr_t>(link) % kAlignment == 0 && &ShardOf(link) == &shard;
+    return reinterpret_cast<uintptr_t>(link) % kAlignment == 0 && &ShardOf(link) == &shard;
 }
 
 bool IsSound(const Shard& shard, const Link* link) {
-    return IsPlausible(shard, link->next) && IsPlausible(shard, link->previous) && link->next->previous == link &&
-           link->previous->next == link;
+    const Link* next = link->next;
+    const Link* previous = link->previous;
+    bool nextIs = !next || (IsPlausible(shard, next) && next->previous == link);
+    bool previousIs = previous ? IsPlausible(shard, previous) && previous->next == link : shard.first == link;
+    return nextIs && previousIs;
 }
 
 // False, and nothing is done, when the links are damaged.
@@ -72,8 +74,8 @@ bool Remove(Link* link) {
     Shard& shard = ShardOf(link);
     platform::MutexHolder hold(shard.mutex);
     if (!IsSound(shard, link)) return false;
-    link->next->previous = link->previous;
-    link->previous->next = link->next;
+    if (link->next) link->next->previous = link->previous;
+    (link->previous ? link->previous->next : shard.first) = link->next;
     shard.bytes -= SizeOf(link);
     return true;
 }
@@ -87,7 +89,7 @@ std::atomic<ErrorCallback> errorCallback{ReportDamage};
 // The first block whose links are damaged, or null. Each block is looked at before its link is followed.
 const Link* WalkShard(Shard& shard, void* context, Visitor visitor, bool& goOn) {
     platform::MutexHolder hold(shard.mutex);
-    for (Link* link = shard.blocks.next; goOn && link != &shard.blocks; link = link->next) {
+    for (Link* link = shard.first; goOn && link; link = link->next) {
         if (!IsSound(shard, link)) return link;
         goOn = visitor(context, link + 1, SizeOf(link));
     }

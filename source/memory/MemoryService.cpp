@@ -1,6 +1,7 @@
 // Start and stop of the memory manager.
 #include <atomic>
 
+#include <tessel/base/MGPlacementNew.h>
 #include <tessel/diagnostics/DebugStream.h>
 
 #include "memory/HandleBlock.h"
@@ -67,6 +68,7 @@ MgErr MemoryManagerStart() {
 }
 
 MgErr MemoryManagerStop() {
+    MGPlacementNewRunCleanup();
     initialized.store(false);
     StopScopedTracker();
     WriteLeakReports();

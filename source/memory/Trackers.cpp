@@ -2,6 +2,7 @@
 
 #include <atomic>
 
+#include "diagnostics/AllocTracking.h"
 #include "diagnostics/NumberText.h"
 #include "memory/HandleBlock.h"
 #include "memory/MasterPointers.h"
@@ -28,7 +29,7 @@ AllocTracker* Get(const std::atomic<AllocTracker*>& tracker) {
 void StartTrackers() {
     handleTracker.store(CreateAllocTracker());
     pointerTracker.store(CreateAllocTracker());
-    SetDetour(kHandlesTracked, Get(handleTracker) != nullptr);
+    SetDetour(kHandlesTracked, IsAllocTrackingOn());
 }
 
 void WriteLeakReports() {

@@ -29,6 +29,10 @@ long Futex(std::uint32_t* word, int operation, std::uint32_t value, const struct
 #endif
 }
 
+int Membarrier(int command, unsigned flags) {
+    return static_cast<int>(::syscall(SYS_membarrier, command, flags, 0));
+}
+
 /* Reports through its result, unlike all others. */
 int ClockNanosleep(clockid_t clock, int flags, const struct timespec* time, struct timespec* remaining) {
     int error = ::clock_nanosleep(clock, flags, time, remaining);
@@ -71,6 +75,7 @@ constinit SystemCalls systemCalls = {
     .futex = Futex,
     .process_vm_readv = ::process_vm_readv,
     .getrandom = ::getrandom,
+    .membarrier = Membarrier,
 };
 
 }  // namespace tessel::platform

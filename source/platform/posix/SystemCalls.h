@@ -50,7 +50,8 @@ namespace tessel::platform {
     X(ssize_t, process_vm_readv,                                                                                   \
       (pid_t process, const struct iovec* local, unsigned long locals, const struct iovec* remote,                 \
        unsigned long remotes, unsigned long flags))                                                                \
-    X(ssize_t, getrandom, (void* buffer, std::size_t count, unsigned flags))
+    X(ssize_t, getrandom, (void* buffer, std::size_t count, unsigned flags))                                       \
+    X(int, membarrier, (int command, unsigned flags))
 
 struct SystemCalls {
 #define TESSEL_SYSTEM_CALL_MEMBER(result, name, parameters) result(*name) parameters;
