@@ -63,11 +63,15 @@ void SleepMilliseconds(std::uint32_t milliseconds) noexcept {
         sched_yield();
         return;
     }
-    timespec left{};
-    left.tv_sec = static_cast<time_t>(milliseconds / 1000);
-    left.tv_nsec = static_cast<long>(milliseconds % 1000) * 1'000'000;
-    /* Interrupted, it goes on with what is left. */
-    while (systemCalls.clock_nanosleep(CLOCK_MONOTONIC, 0, &left, &left) != 0 && errno == EINTR) {
+    timespec until = Read(CLOCK_MONOTONIC);
+    until.tv_sec += static_cast<time_t>(milliseconds / 1000);
+    until.tv_nsec += static_cast<long>(milliseconds % 1000) * 1'000'000;
+    if (until.tv_nsec >= static_cast<long>(kNanosecondsPerSecond)) {
+        until.tv_nsec -= static_cast<long>(kNanosecondsPerSecond);
+        ++until.tv_sec;
+    }
+    /* To a moment rather than for a time: so interruptions, however many, do not make it longer. */
+    while (systemCalls.clock_nanosleep(CLOCK_MONOTONIC, TIMER_ABSTIME, &until, nullptr) != 0 && errno == EINTR) {
     }
 }
 

@@ -119,7 +119,7 @@ void ReloadDrives() {
 
 namespace {
 
-/* The name in UTF-8 with `/` between its parts and none at its end. */
+/* The name in UTF-8 with `/` between its parts. */
 bool Normalize(std::string_view name, std::string& text) {
     if (ActiveCodePage().utf8) {
         text.assign(name);
@@ -128,7 +128,6 @@ bool Normalize(std::string_view name, std::string& text) {
     }
     if (text.empty() || text.find('\0') != std::string::npos) return FailWith(kErrorInvalidName);
     std::replace(text.begin(), text.end(), '\\', '/');
-    while (text.size() > 1 && text.back() == '/') text.pop_back();
     return true;
 }
 
@@ -148,16 +147,12 @@ bool DriveName(const Table& table, int index, std::string_view rest, std::string
         if (IsAtOrUnder(current, native)) native = current == "/" ? "" : current;
         if (!rest.empty()) native += '/';
     }
-    if (rest != "/") native += rest;
-    if (native.empty()) native = "/";
+    native += rest;
     return true;
 }
 
-}  // namespace
-
-bool NameToNativeText(std::string_view name, std::string& native) {
-    std::string text;
-    if (!Normalize(name, text)) return false;
+/* The host's name as the text says, maybe with separators at its end. */
+bool Translate(std::string&& text, std::string& native) {
     const Table& table = Drives();
     if (text.size() > 1 && text[0] == '/' && text[1] == '/') return NetworkName(table, text, native);
     if (text.size() > 1 && text[1] == ':') {
@@ -165,6 +160,16 @@ bool NameToNativeText(std::string_view name, std::string& native) {
     }
     if (text[0] == '/') return DriveName(table, NearestDrive(table, NativeCurrentFolder()), text, native);
     native = std::move(text);
+    return true;
+}
+
+}  // namespace
+
+bool NameToNativeText(std::string_view name, std::string& native) {
+    std::string text;
+    if (!Normalize(name, text) || !Translate(std::move(text), native)) return false;
+    while (native.size() > 1 && native.back() == '/') native.pop_back();
+    if (native.empty()) native = "/";
     return true;
 }
 
@@ -214,13 +219,17 @@ bool IsFolder(const std::string& native) {
     return systemCalls.statx(AT_FDCWD, native.c_str(), 0, STATX_TYPE, &status) == 0 && S_ISDIR(status.stx_mode);
 }
 
-/* The entry of `folder` that is `name` in another case. The first in byte order where there are several, so that the
-   answer does not hang on the order of the listing. */
+/* The entry of `folder` that is `name`, exactly or in another case. The first in byte order where several are, so that
+   the answer does not hang on the order of the listing. */
 bool FindInFolder(const std::string& folder, std::string_view name, std::string& found) {
     std::unique_ptr<DIR, int (*)(DIR*)> listing(opendir(folder.c_str()), closedir);
     if (!listing) return false;
     found.clear();
     while (const dirent* entry = readdir(listing.get())) {
+        if (name == entry->d_name) {
+            found = name;
+            return true;
+        }
         if (EqualNames(name, entry->d_name) && (found.empty() || found > entry->d_name)) found = entry->d_name;
     }
     return !found.empty();

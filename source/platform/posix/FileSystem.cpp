@@ -295,10 +295,12 @@ bool CopyBytes(FileHandle from, FileHandle to) {
 }
 
 bool CopyInto(FileHandle source, FileHandle target) {
-    ItemInfo info;
-    if (!CopyBytes(source, target) || !FileGetInfo(source, info)) return false;
-    if (!FileSetTimes(target, 0, 0, info.modified)) return false;
-    return systemCalls.fchmod(DescriptorOf(target), info.mode) == 0 || FailErrno();
+    if (!CopyBytes(source, target)) return false;
+    struct statx status;
+    if (systemCalls.statx(DescriptorOf(source), "", AT_EMPTY_PATH, kInfoMask, &status) != 0) return FailErrno();
+    timespec times[2] = {{0, UTIME_OMIT}, {static_cast<time_t>(status.stx_mtime.tv_sec), status.stx_mtime.tv_nsec}};
+    if (systemCalls.futimens(DescriptorOf(target), times) != 0) return FailErrno();
+    return systemCalls.fchmod(DescriptorOf(target), status.stx_mode & 0777u) == 0 || FailErrno();
 }
 
 }  // namespace

@@ -64,7 +64,8 @@ std::size_t ReadThroughPipe(const char* from, char* to, std::size_t count) {
         std::size_t toBound = kPage - reinterpret_cast<std::uintptr_t>(from + done) % kPage;
         ssize_t put = systemCalls.write(ends[1], from + done, std::min(toBound, count - done));
         if (put < 0 && errno == EINTR) continue;
-        ssize_t got = put > 0 ? systemCalls.read(ends[0], to + done, static_cast<std::size_t>(put)) : -1;
+        if (put <= 0) break;
+        ssize_t got = systemCalls.read(ends[0], to + done, static_cast<std::size_t>(put));
         if (got != put) break;
         done += static_cast<std::size_t>(got);
     }
