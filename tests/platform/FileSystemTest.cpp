@@ -1,0 +1,283 @@
+#include "platform/FileSystem.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdlib>
+#include <filesystem>
+
+#include "platform/CodePage.h"
+#include "platform/DriveTable.h"
+#include "platform/LastError.h"
+#include "support/FailingPlatform.h"
+#include "support/ScratchDrive.h"
+
+namespace tessel::platform {
+namespace {
+
+using test::FailingPlatform;
+using test::ScratchDrive;
+namespace fs = std::filesystem;
+
+TEST(DriveTable, TextsOfNames) {
+    ScratchDrive drive;
+    setenv("TESSEL_DRIVES", "C=/;t=/mnt/x/;bad;Q=relative;Z=/mnt", 1);
+    setenv("TESSEL_UNC", "/net", 1);
+    ReloadDrives();
+    struct Row {
+        const char* name;
+        const char* native;
+        ErrorNumber error;
+    };
+    const Row rows[] = {
+        {"C:\\", "/", 0},
+        {"C:\\dir\\file.txt", "/dir/file.txt", 0},
+        {"c:/dir/", "/dir", 0},
+        {"T:\\", "/mnt/x", 0},
+        {"T:\\a\\b", "/mnt/x/a/b", 0},
+        {"T:a", "/mnt/x/a", 0}, /* the current folder lies elsewhere */
+        {"\\\\server\\share\\a", "/net/server/share/a", 0},
+        {"dir\\a", "dir/a", 0},
+        {"Q:\\a", nullptr, kErrorPathNotFound},
+        {"", nullptr, kErrorInvalidName},
+        {"\\\\", nullptr, kErrorNetworkPathNotFound},
+    };
+    for (const Row& row : rows) {
+        SCOPED_TRACE(row.name);
+        std::string native;
+        SetLastError(0);
+        EXPECT_EQ(row.native != nullptr, NameToNativeText(row.name, native));
+        EXPECT_EQ(row.error, LastError());
+        EXPECT_EQ(row.native ? row.native : "", native);
+    }
+    const std::pair<const char*, const char*> back[] = {
+        {"/mnt/x/a/b", "T:\\a\\b"}, {"/mnt/x", "T:\\"},
+        {"/mnt/xy", "Z:\\xy"},      {"/net/server/share", "\\\\server\\share"},
+        {"/net", "C:\\net"},        {"/", "C:\\"},
+        {"/a\\b/", "C:\\a?b"}};
+    for (const auto& [native, name] : back) {
+        std::string result;
+        EXPECT_TRUE(NativeToName(native, result));
+        EXPECT_EQ(name, result);
+    }
+    unsetenv("TESSEL_UNC");
+    setenv("TESSEL_DRIVES", "T=/mnt/x", 1);
+    ReloadDrives();
+    std::string text;
+    EXPECT_FALSE(NameToNativeText("\\\\server\\share", text));
+    EXPECT_EQ(kErrorNetworkPathNotFound, LastError());
+    EXPECT_FALSE(NativeToName("/home", text));
+    EXPECT_EQ(kErrorPathNotFound, LastError());
+    EXPECT_FALSE(NativeToName("home", text));
+}
+
+TEST(DriveTable, NamesMatchWithoutRegardToCase) {
+    ScratchDrive drive;
+    fs::create_directories(drive.Native("Größe/Sub"));
+    drive.Put("Größe/Sub/File.TXT", "");
+    drive.Put("Größe/Sub/both", "");
+    drive.Put("Größe/Sub/BOTH", "");
+    const std::pair<const char*, const char*> rows[] = {{"GRÖSSE/sub/FILE.txt", "GRÖSSE/sub/FILE.txt"},
+                                                        {"gRÖßE/sUB/fILE.txt", "Größe/Sub/File.TXT"},
+                                                        {"größe/SUB/both", "Größe/Sub/both"},
+                                                        {"größe/SUB/Both", "Größe/Sub/BOTH"},
+                                                        {"größe/none/File.TXT", "Größe/none/File.TXT"}};
+    for (const auto& [name, expected] : rows) {
+        std::string native;
+        EXPECT_TRUE(NameToNative(drive.Name(name), native));
+        EXPECT_EQ(drive.Native(expected), native);
+    }
+    std::string real;
+    EXPECT_TRUE(ItemRealName(drive.Name("größe").c_str(), real));
+    EXPECT_EQ("Größe", real);
+    EXPECT_TRUE(ItemRealName("T:\\", real));
+    EXPECT_EQ("", real);
+    EXPECT_TRUE(ItemRealPath(drive.Name("größe/sub/file.txt").c_str(), real));
+    EXPECT_EQ("T:\\Größe\\Sub\\File.TXT", real);
+    EXPECT_FALSE(ItemRealPath(drive.Name("größe/none").c_str(), real));
+    EXPECT_EQ(kErrorFileNotFound, LastError());
+}
+
+TEST(DriveTable, NamesAreInTheCodePage) {
+    ScratchDrive drive;
+    drive.Put("ソ.txt", "x"); /* in the double-byte page its second byte is a backslash */
+    ASSERT_TRUE(SetCodePage(932));
+    EXPECT_EQ(ItemKind::kFile, ItemExists("T:\\\x83\x5C.txt"));
+    std::vector<FolderEntry> entries;
+    EXPECT_TRUE(FolderList("T:\\", entries));
+    ASSERT_EQ(1u, entries.size());
+    EXPECT_EQ("\x83\x5C.txt", entries[0].name);
+    std::string real;
+    EXPECT_TRUE(ItemRealName("T:\\\x83\x5C.TXT", real));
+    EXPECT_EQ("\x83\x5C.txt", real);
+    SetCodePage(kCodePageUtf8);
+}
+
+TEST(DriveTable, DrivesPresent) {
+    ScratchDrive drive;
+    setenv("TESSEL_DRIVES", ("C=/;X=/nowhere/at/all;T=" + drive.Native()).c_str(), 1);
+    ReloadDrives();
+    std::string letters;
+    for (const Drive& present : DrivesPresent()) letters += present.letter;
+    EXPECT_EQ("CT", letters);
+}
+
+TEST(FileSystem, InfoTellsKindModeAndSize) {
+    ScratchDrive drive;
+    drive.Put(".hidden", "12345");
+    fs::create_directory(drive.Native("folder"));
+    chmod(drive.Native(".hidden").c_str(), 0444);
+    ItemInfo info;
+    ASSERT_TRUE(ItemGetInfo(drive.Name(".HIDDEN").c_str(), info));
+    EXPECT_TRUE(!info.folder && info.readOnly && info.hidden);
+    EXPECT_EQ(5, info.size);
+    EXPECT_EQ(0444u, info.mode);
+    ASSERT_TRUE(ItemGetInfo(drive.Name("folder").c_str(), info));
+    EXPECT_TRUE(info.folder && !info.readOnly && !info.hidden);
+
+    EXPECT_TRUE(ItemSetReadOnly(drive.Name(".hidden").c_str(), false));
+    ASSERT_TRUE(ItemGetInfo(drive.Name(".hidden").c_str(), info));
+    EXPECT_EQ(0444u | (0222u & ~PermissionMask()), info.mode);
+    EXPECT_TRUE(ItemSetMode(drive.Name(".hidden").c_str(), 0640));
+    ASSERT_TRUE(ItemGetInfo(drive.Name(".hidden").c_str(), info));
+    EXPECT_EQ(0640u, info.mode);
+
+    EXPECT_FALSE(ItemGetInfo(drive.Name("none").c_str(), info));
+    EXPECT_EQ(kErrorFileNotFound, LastError());
+    EXPECT_FALSE(ItemGetInfo(drive.Name("none/a").c_str(), info));
+    EXPECT_EQ(kErrorPathNotFound, LastError());
+    EXPECT_FALSE(ItemGetInfo(drive.Name(".hidden/a").c_str(), info));
+    EXPECT_EQ(kErrorPathNotFound, LastError());
+}
+
+TEST(FileSystem, PermissionMaskIsTheProcesss) {
+    mode_t before = umask(027);
+    EXPECT_EQ(027u, PermissionMask());
+    EXPECT_EQ(027u, umask(before));
+}
+
+TEST(FileSystem, FoldersAreMadeListedAndRemoved) {
+    ScratchDrive drive;
+    EXPECT_FALSE(FolderCreate(drive.Name("a/b").c_str()));
+    EXPECT_EQ(kErrorPathNotFound, LastError());
+    EXPECT_TRUE(FolderCreate(drive.Name("a").c_str()));
+    EXPECT_FALSE(FolderCreate(drive.Name("A").c_str()));
+    EXPECT_EQ(kErrorAlreadyExists, LastError());
+    drive.Put("a/file", "x");
+    EXPECT_TRUE(FolderCreate(drive.Name("a/b").c_str()));
+    std::vector<FolderEntry> entries;
+    EXPECT_TRUE(FolderList(drive.Name("a").c_str(), entries));
+    EXPECT_THAT(entries,
+                ::testing::UnorderedElementsAre(::testing::FieldsAre("file", false), ::testing::FieldsAre("b", true)));
+    std::int64_t count = 0;
+    EXPECT_TRUE(FolderCount(drive.Name("a").c_str(), count));
+    EXPECT_EQ(2, count);
+    EXPECT_FALSE(FolderList(drive.Name("a/file").c_str(), entries));
+    EXPECT_EQ(kErrorNotAFolder, LastError());
+    EXPECT_FALSE(FolderRemove(drive.Name("a").c_str()));
+    EXPECT_EQ(kErrorFolderNotEmpty, LastError());
+    EXPECT_FALSE(FolderRemove(drive.Name("a/file").c_str()));
+    EXPECT_EQ(kErrorNotAFolder, LastError());
+    EXPECT_FALSE(FileDelete(drive.Name("a/b").c_str()));
+    EXPECT_EQ(kErrorAccessDenied, LastError());
+    fs::create_directory_symlink(drive.Native("a/b"), drive.Native("link"));
+    EXPECT_TRUE(FolderRemove(drive.Name("LINK").c_str()));
+    EXPECT_TRUE(FolderRemove(drive.Name("a/b").c_str()));
+    EXPECT_TRUE(FileDelete(drive.Name("a/FILE").c_str()));
+    EXPECT_TRUE(FolderRemove(drive.Name("a").c_str()));
+    EXPECT_TRUE(fs::is_empty(drive.Native()));
+}
+
+TEST(FileSystem, RenamingNeverReplaces) {
+    ScratchDrive drive;
+    for (bool plainRename : {false, true}) { /* true: a file system that cannot rename without replacing */
+        drive.Put("a", "from");
+        drive.Put("b", "to");
+        FailingPlatform failing("renameat2", 1, EINVAL, plainRename ? 1 : 0);
+        EXPECT_FALSE(ItemRename(drive.Name("a").c_str(), drive.Name("B").c_str()));
+        EXPECT_EQ(kErrorAlreadyExists, LastError());
+        EXPECT_EQ("to", drive.Get("b"));
+        EXPECT_TRUE(FileDelete(drive.Name("b").c_str()));
+        EXPECT_TRUE(ItemRename(drive.Name("A").c_str(), drive.Name("b").c_str()));
+        EXPECT_EQ("from", drive.Get("b"));
+        EXPECT_EQ(ItemKind::kNone, ItemExists(drive.Name("a").c_str()));
+    }
+    EXPECT_TRUE(ItemRename(drive.Name("b").c_str(), drive.Name("B").c_str()));
+    EXPECT_TRUE(fs::exists(drive.Native("B")));
+    EXPECT_FALSE(fs::exists(drive.Native("b")));
+    EXPECT_FALSE(ItemRename(drive.Name("none").c_str(), drive.Name("c").c_str()));
+    EXPECT_EQ(kErrorFileNotFound, LastError());
+    EXPECT_FALSE(ItemRename(drive.Name("B").c_str(), drive.Name("none/c").c_str()));
+    EXPECT_EQ(kErrorPathNotFound, LastError());
+}
+
+TEST(FileSystem, MovingToAnotherFileSystemCopiesFilesOnly) {
+    ScratchDrive drive;
+    drive.Put("a", "content");
+    chmod(drive.Native("a").c_str(), 0640);
+    fs::create_directory(drive.Native("folder"));
+    FailingPlatform failing("renameat2", 1, EXDEV, 2);
+    EXPECT_TRUE(ItemRename(drive.Name("a").c_str(), drive.Name("b").c_str()));
+    EXPECT_EQ("content", drive.Get("b"));
+    EXPECT_EQ(0640u, static_cast<unsigned>(fs::status(drive.Native("b")).permissions()));
+    EXPECT_FALSE(fs::exists(drive.Native("a")));
+    EXPECT_FALSE(ItemRename(drive.Name("folder").c_str(), drive.Name("other").c_str()));
+    EXPECT_EQ(kErrorNotSameDevice, LastError());
+}
+
+TEST(FileSystem, CopiesAreWholeOrNotThere) {
+    ScratchDrive drive;
+    std::string content(300'001, 'x');
+    drive.Put("a", content);
+    for (int error : {0, ENOSYS}) { /* ENOSYS: a kernel that does not copy */
+        FailingPlatform failing("copy_file_range", 1, error, error ? 1 : 0);
+        EXPECT_TRUE(FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()));
+        EXPECT_EQ(content, drive.Get("b"));
+        EXPECT_EQ(fs::last_write_time(drive.Native("a")), fs::last_write_time(drive.Native("b")));
+        EXPECT_FALSE(FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()));
+        EXPECT_EQ(kErrorFileExists, LastError());
+        fs::remove(drive.Native("b"));
+    }
+    for (const char* call : {"copy_file_range", "fchmod", "close"}) {
+        FailingPlatform failing(call, 1, ENOSPC);
+        EXPECT_FALSE(FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()));
+        EXPECT_EQ(kErrorDiskFull, LastError());
+        EXPECT_FALSE(fs::exists(drive.Native("b"))) << call;
+    }
+}
+
+TEST(FileSystem, CurrentAndTemporaryFolders) {
+    ScratchDrive drive;
+    fs::path before = fs::current_path();
+    fs::create_directory(drive.Native("Sub"));
+    drive.Put("Sub/a", "");
+    EXPECT_TRUE(SetCurrentFolder(drive.Name("sub").c_str()));
+    std::string name;
+    EXPECT_TRUE(CurrentFolder(name));
+    EXPECT_EQ("T:\\Sub", name);
+    EXPECT_EQ(ItemKind::kFile, ItemExists("A"));
+    EXPECT_EQ(ItemKind::kFile, ItemExists("T:a"));
+    EXPECT_EQ(ItemKind::kFolder, ItemExists("\\SUB"));
+    EXPECT_TRUE(ItemRealPath("A", name));
+    EXPECT_EQ("T:\\Sub\\a", name);
+    fs::current_path(before);
+
+    const char* saved = std::getenv("TMPDIR");
+    std::string savedText = saved ? saved : "";
+    setenv("TMPDIR", drive.Native("Sub").c_str(), 1);
+    EXPECT_TRUE(TemporaryFolder(name));
+    EXPECT_EQ("T:\\Sub\\", name);
+    saved ? setenv("TMPDIR", savedText.c_str(), 1) : unsetenv("TMPDIR");
+
+    VolumeSpace space;
+    ASSERT_TRUE(VolumeGetSpace("T:\\", space));
+    fs::space_info expected = fs::space(drive.Native());
+    EXPECT_EQ(expected.capacity, space.totalBytes);
+    EXPECT_EQ(0u, space.totalBytes % space.sectorBytes);
+}
+
+}  // namespace
+}  // namespace tessel::platform
