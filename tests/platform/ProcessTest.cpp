@@ -23,9 +23,6 @@
 #include "platform/posix/Errors.h"
 #include "support/FailingPlatform.h"
 
-    return 42;
-}
-
 namespace tessel::platform {
 namespace {
 

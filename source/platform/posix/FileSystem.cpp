@@ -298,7 +298,10 @@ bool CopyInto(FileHandle source, FileHandle target) {
     if (!CopyBytes(source, target)) return false;
     struct statx status;
     if (systemCalls.statx(DescriptorOf(source), "", AT_EMPTY_PATH, kInfoMask, &status) != 0) return FailErrno();
-    timespec times[2] = {{0, UTIME_OMIT}, {static_cast<time_t>(status.stx_mtime.tv_sec), status.stx_mtime.tv_nsec}};
+    timespec times[2]{};
+    times[0].tv_nsec = UTIME_OMIT;
+    times[1].tv_sec = static_cast<time_t>(status.stx_mtime.tv_sec);
+    times[1].tv_nsec = static_cast<long>(status.stx_mtime.tv_nsec);
     if (systemCalls.futimens(DescriptorOf(target), times) != 0) return FailErrno();
     return systemCalls.fchmod(DescriptorOf(target), status.stx_mode & 0777u) == 0 || FailErrno();
 }
