@@ -1,0 +1,453 @@
+#include <tessel/memory/CookieManager.h>
+
+#include <algorithm>
+#include <atomic>
+#include <cstring>
+#include <new>
+
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/memory/MemoryManager.h>
+#include <tessel/memory/MemoryUtil.h>
+#include <tessel/sync/ThAtomic.h>
+#include <tessel/sync/ThMutex.h>
+#include <tessel/time/Millisecs.h>
+
+#include "memory/PouchTree.h"
+
+namespace tessel {
+namespace {
+
+constexpr uint32 kWord = sizeof(void*);  // an info of this size is read and written at once
+constexpr uint32 kGenerations = 0xFFF;   // 1 to 4095
+constexpr MagicCookie kLeastCookie = 1u << PouchTree::kIndexBits;
+
+// The data of a jar's handle.
+struct JarRecord {
+    ThMutex mutex;  // guards the rest, and the making and freeing of entries
+    uint32 serial;  // generation of the next cookie
+    PouchTree* tree;
+    uint32 infoSize;
+    uint32 entrySize;
+    uint32 freeHead;  // index of the first free entry
+    int32 liveCount;
+    int32 rightsMode;
+    int32 highWater;  // the largest live count
+};
+static_assert(sizeof(void*) != 4 || sizeof(JarRecord) == 36);
+
+std::atomic<uint32> disposedTotal{0};  // bytes of all jars disposed of
+
+JarRecord& Record(MagicCookieJar jar) {
+    return *reinterpret_cast<JarRecord*>(*jar);
+}
+
+uint32 GenerationOf(MagicCookie cookie) {
+    return cookie >> PouchTree::kIndexBits;
+}
+uint32 IndexOf(MagicCookie cookie) {
+    return cookie % PouchTree::kIndices;
+}
+MagicCookie CookieOf(uint32 generation, uint32 index) {
+    return generation << PouchTree::kIndexBits | index;
+}
+
+// Generation 0 is a free entry's: no cookie has it.
+bool IsValid(const CookieEntry* entry, MagicCookie cookie) {
+    return entry->Generation() == GenerationOf(cookie) && cookie >= kLeastCookie && entry->Link() < 0;
+}
+
+// The entry of a valid cookie, or null.
+CookieEntry* Find(const JarRecord& record, MagicCookie cookie) {
+    CookieEntry* entry = record.tree->Find(IndexOf(cookie));
+    return entry && IsValid(entry, cookie) ? entry : nullptr;
+}
+
+void*& WordOf(void* info) {
+    return *static_cast<void**>(info);
+}
+void* LoadWord(CookieEntry* entry) {
+    return __atomic_load_n(&WordOf(entry->Info()), __ATOMIC_ACQUIRE);
+}
+
+// A null info stores zeros.
+void StoreInfo(const JarRecord& record, CookieEntry* entry, const void* info) {
+    if (record.infoSize == kWord) {
+        void* word = nullptr;
+        if (info) std::memcpy(&word, info, kWord);
+        __atomic_store_n(&WordOf(entry->Info()), word, __ATOMIC_RELEASE);
+    } else if (info) {
+        std::memcpy(entry->Info(), info, record.infoSize);
+    } else {
+        std::memset(entry->Info(), 0, record.infoSize);
+    }
+}
+
+// Under the mutex, or of a word.
+void LoadInfo(const JarRecord& record, CookieEntry* entry, void* infoOut) {
+    if (record.infoSize == kWord) {
+        void* word = LoadWord(entry);
+        std::memcpy(infoOut, &word, kWord);
+    } else {
+        std::memcpy(infoOut, entry->Info(), record.infoSize);
+    }
+}
+
+// ---- making and ending cookies, under the mutex
+// -------------------------------------------------------------------------
+
+uint32 NextGeneration(JarRecord& record) {
+    uint32 generation = record.serial++;
+    if ((record.serial & kGenerations) == 0) record.serial = 1;
+    return generation;
+}
+
+MagicCookie MakeCookie(JarRecord& record, const void* info) {
+    uint32 index = record.freeHead;
+    CookieEntry* entry = index < PouchTree::kIndices ? record.tree->FindOrMake(index) : nullptr;
+    if (!entry) return 0;
+    record.freeHead = static_cast<uint32>(entry->Link());
+    int32 live = record.liveCount + 1;
+    __atomic_store_n(&record.liveCount, live, __ATOMIC_RELAXED);
+    record.highWater = std::max(record.highWater, live);
+    // The generation last: from then on the cookie is valid to those who look without the mutex.
+    uint32 generation = NextGeneration(record);
+    StoreInfo(record, entry, info);
+    entry->SetRights(record.rightsMode ? 1 : 0);
+    entry->SetLink(CookieEntry::kInUse);
+    entry->SetGeneration(generation);
+    return CookieOf(generation, index);
+}
+
+// The generation first: nobody may take what follows for the cookie's.
+void EndCookie(JarRecord& record, CookieEntry* entry, uint32 index) {
+    entry->SetGeneration(0);
+    entry->SetLink(static_cast<int32>(record.freeHead));
+    record.freeHead = index;
+    __atomic_store_n(&record.liveCount, record.liveCount - 1, __ATOMIC_RELAXED);
+    StoreInfo(record, entry, nullptr);
+    entry->SetRights(0);
+}
+
+// ---- making and ending jars
+// -------------------------------------------------------------------------------------------
+
+// False leaves a half-made jar.
+bool FillJar(MagicCookieJar jar, uint32 infoSize, int32 rightsMode) {
+    if (ThMutexCreate(&Record(jar).mutex, "JarRights") != kNoErr) return false;
+    PouchTree* tree = new (std::nothrow) PouchTree(infoSize);
+    JarRecord& record = Record(jar);
+    record.tree = tree;
+    if (!tree) return false;
+    record.serial = MilliSecs() & kGenerations;
+    if (record.serial == 0) record.serial = 1;
+    record.rightsMode = rightsMode;
+    record.infoSize = infoSize;
+    record.entrySize = tree->EntrySize();
+    return true;
+}
+
+MagicCookieJar NewJar(uint32 infoSize, int32 rightsMode) {
+    constexpr uint32 kMostInfo = 0x01000000;  // so that the size of a pouch stays far below 2^32
+    MagicCookieJar jar = infoSize <= kMostInfo ? DSNewHClr(sizeof(JarRecord)) : nullptr;
+    if (!jar || FillJar(jar, infoSize, rightsMode)) return jar;
+    MCDisposeJar(jar);
+    return nullptr;
+}
+
+void ReportDisposal(MagicCookieJar jar) {
+    const JarRecord& record = Record(jar);
+    if (record.liveCount != 0)
+        TESSEL_REPORT(kDebugInfo, 0x22C7F5A9u) << "Disposing jar with " << record.liveCount << " cookies remaining";
+    PouchTree::Size tree = record.tree ? record.tree->Measure() : PouchTree::Size{0, 0, 0};
+    uint32 size = static_cast<uint32>(sizeof(JarRecord)) + tree.bytes;
+    uint32 total = disposedTotal.fetch_add(size, std::memory_order_relaxed) + size;
+    TESSEL_REPORT(kDebugInfo, 0x6D04B1E8u)
+        << "MCDisposeJar(" << DbgFmtPtr(jar) << "): highWater=" << static_cast<uint32>(record.highWater)
+        << "; nTreeNodes=" << tree.arrays << "; nPouches=" << tree.pouches << "; size=" << size << "; total=" << total;
+}
+
+// ---- rights
+// -----------------------------------------------------------------------------------------------------------
+
+// Changes a positive rights count by `change`, and returns what it was; 0 when it is not positive.
+int32 ChangeRights(CookieEntry* entry, int32 change) {
+    for (;;) {
+        int32 rights = entry->Rights();
+        if (rights <= 0) return 0;
+        if (ThSwapIfSame(&entry->rights, rights + change, rights)) return rights;
+    }
+}
+
+// Lowers the count of whatever cookie the entry now has, which ends with it.
+int32 ReleaseEntry(JarRecord& record, CookieEntry* entry, uint32 index) {
+    int32 before = ChangeRights(entry, -1);
+    if (before == 1) {
+        ThMutexHolder hold(record.mutex);
+        if (entry->Link() < 0 && entry->Rights() == 0) EndCookie(record, entry, index);
+    }
+    return before;
+}
+
+void CopyInfoOut(JarRecord& record, CookieEntry* entry, void* infoOut) {
+    if (!infoOut) return;
+    ThMutexHolder hold(record.infoSize == kWord ? nullptr : record.mutex);
+    LoadInfo(record, entry, infoOut);
+}
+
+bool AcquireRights(JarRecord& record, MagicCookie cookie, void* infoOut) {
+    CookieEntry* entry = record.rightsMode ? Find(record, cookie) : nullptr;
+    if (!entry || ChangeRights(entry, 1) == 0) return false;
+    if (!IsValid(entry, cookie)) {  // it ended meanwhile: the count raised is another cookie's
+        ReleaseEntry(record, entry, IndexOf(cookie));
+        return false;
+    }
+    CopyInfoOut(record, entry, infoOut);
+    return true;
+}
+
+}  // namespace
+}  // namespace tessel
+
+using namespace tessel;
+
+MagicCookieJar MCNewJar(void) {
+    return NewJar(kWord, 0);
+}
+
+MagicCookieJar MCNewBigJar(uint32 infoSize) {
+    return NewJar(infoSize, 0);
+}
+
+MgErr MCDisposeJar(MagicCookieJar jar) {
+    if (!jar) return kNoErr;
+    ReportDisposal(jar);
+    ThMutexDestroy(Record(jar).mutex);
+    delete Record(jar).tree;
+    DSDisposeHandle(jar);
+    return kNoErr;
+}
+
+MgErr MCJarSize(MagicCookieJar jar, int32* count) {
+    if (!jar || !count) return kArgErr;
+    *count = __atomic_load_n(&Record(jar).liveCount, __ATOMIC_RELAXED);
+    return kNoErr;
+}
+
+MagicCookie MCNewCookie(MagicCookieJar jar, const void* info) {
+    if (!jar) return 0;
+    JarRecord& record = Record(jar);
+    ThMutexHolder hold(record.mutex);
+    return MakeCookie(record, info);
+}
+
+MgErr MCDisposeCookie(MagicCookieJar jar, MagicCookie cookie, void* infoOut) {
+    JarRecord& record = Record(jar);
+    ThMutexHolder hold(record.mutex);
+    CookieEntry* entry = Find(record, cookie);
+    if (!entry) return kArgErr;
+    if (infoOut) LoadInfo(record, entry, infoOut);
+    EndCookie(record, entry, IndexOf(cookie));
+    return kNoErr;
+}
+
+MgErr MCSetCookieInfo(MagicCookieJar jar, MagicCookie cookie, const void* info) {
+    JarRecord& record = Record(jar);
+    ThMutexHolder hold(record.mutex);
+    CookieEntry* entry = Find(record, cookie);
+    if (!entry) return kArgErr;
+    StoreInfo(record, entry, info);
+    return kNoErr;
+}
+
+MgErr MCGetCookieInfo(MagicCookieJar jar, MagicCookie cookie, void* infoOut) {
+    if (!jar || !infoOut) return kArgErr;
+    JarRecord& record = Record(jar);
+    CookieEntry* entry = Find(record, cookie);
+    if (!entry) return kArgErr;
+    if (record.infoSize != kWord) {
+        ThMutexHolder hold(record.mutex);
+        if (!IsValid(entry, cookie)) return kArgErr;
+        LoadInfo(record, entry, infoOut);
+        return kNoErr;
+    }
+    void* word = LoadWord(entry);
+    bool valid = IsValid(entry, cookie);  // still, so the word was the cookie's
+    if (!valid) word = nullptr;
+    std::memcpy(infoOut, &word, kWord);
+    return valid ? kNoErr : kArgErr;
+}
+
+MgErr MCGetCookieInfoPtr(MagicCookieJar jar, MagicCookie cookie, void** info) {
+    if (!info) return kArgErr;
+    CookieEntry* entry = jar ? Find(Record(jar), cookie) : nullptr;
+    *info = entry ? entry->Info() : nullptr;
+    return entry ? kNoErr : kArgErr;
+}
+
+namespace {
+
+// Under the mutex. The number collected goes to *collected.
+MgErr CollectCookies(const JarRecord& record, UHandle* list, uint32* collected) {
+    uint32 live = static_cast<uint32>(record.liveCount);
+    MgErr err = DSSetHandleSizeOrNewHandle(list, static_cast<uint32>(sizeof(uint32)) * (live + 1));
+    if (err != kNoErr) return err;
+    uint32* words = reinterpret_cast<uint32*>(**list);
+    uint32 count = 0;
+    if (live != 0)
+        record.tree->ForEachInUse([&](CookieEntry* entry, uint32 index) {
+            words[++count] = CookieOf(entry->Generation(), index);
+            return count < live;
+        });
+    *collected = words[0] = count;
+    return kNoErr;
+}
+
+}  // namespace
+
+MgErr MCGetCookieList(MagicCookieJar jar, UHandle* list) {
+    if (!list) return kArgErr;
+    JarRecord& record = Record(jar);
+    uint32 live, collected = 0;
+    {
+        ThMutexHolder hold(record.mutex);
+        live = static_cast<uint32>(record.liveCount);
+        MgErr err = CollectCookies(record, list, &collected);
+        if (err != kNoErr) return err;
+    }
+    if (collected != live)
+        TESSEL_REPORT(kDebugError, 0x51EB0F47u) << "PouchTree::CollectMagicCookies: cookie count discrepancy";
+    return kNoErr;
+}
+
+bool MCIsACookie(MagicCookieJar jar, MagicCookie cookie) {
+    if (!jar || cookie == 0) return false;
+    JarRecord& record = Record(jar);
+    ThMutexHolder hold(record.mutex);
+    return Find(record, cookie) != nullptr;
+}
+
+namespace {
+
+bool HasInfo(const JarRecord& record, MagicCookie cookie, const void* info) {
+    CookieEntry* entry = Find(record, cookie);
+    if (!entry) return false;
+    if (record.infoSize == kWord) {
+        void* word = LoadWord(entry);
+        return BlockCmp(&word, info, kWord) == 0;
+    }
+    ThMutexHolder hold(record.mutex);
+    return BlockCmp(entry->Info(), info, record.infoSize) == 0;
+}
+
+}  // namespace
+
+MagicCookie MCGetCookieForInfo(MagicCookieJar jar, const void* info) {
+    UHandle list = nullptr;
+    if (MCGetCookieList(jar, &list) != kNoErr) return 0;
+    const uint32* words = reinterpret_cast<const uint32*>(*list);
+    const uint32* end = words + 1 + words[0];
+    const uint32* found = std::find_if(words + 1, end, [&](MagicCookie c) { return HasInfo(Record(jar), c, info); });
+    MagicCookie cookie = found != end ? *found : 0;
+    DSDisposeHandle(list);
+    return cookie;
+}
+
+// ---- the classes
+// ------------------------------------------------------------------------------------------------------
+
+namespace tessel {
+
+CookieList::~CookieList() {
+    DSDisposeHandle(fCookies);
+}
+
+MagicCookie CookieList::GetCookie(int32 i) const {
+    return fCookies && i >= 0 && i < fCount ? reinterpret_cast<MagicCookie*>(*fCookies)[i] : 0;
+}
+
+MgErr CookieList::SetCookie(int32 i, MagicCookie cookie) {
+    if (!fCookies || i < 0 || i >= fCount) return kArgErr;
+    reinterpret_cast<MagicCookie*>(*fCookies)[i] = cookie;
+    return kNoErr;
+}
+
+MgErr CookieList::SetCount(int32 count) {
+    if (count < 0) return kArgErr;
+    int32 known = fCount;
+    fCount = 0;
+    if (count == 0) return DSDisposeHandleAndNull(&fCookies);
+    if (count > INT32_MAX / static_cast<int32>(sizeof(MagicCookie))) return kMemFullErr;
+    MgErr err = DSSetHandleSizeOrNewHandle(&fCookies, static_cast<uint32>(count) * sizeof(MagicCookie));
+    if (err != kNoErr) return err;
+    if (count > known)
+        ClearMem(reinterpret_cast<MagicCookie*>(*fCookies) + known,
+                 static_cast<size_t>(count - known) * sizeof(MagicCookie));
+    fCount = count;
+    return kNoErr;
+}
+
+MgErr BaseCookieJar::Init(uint32 infoSize, int32 rightsMode) {
+    fJar = NewJar(infoSize, rightsMode);
+    return fJar ? kNoErr : kMemFullErr;
+}
+
+MgErr BaseCookieJar::Uninit() {
+    MgErr err = MCDisposeJar(fJar);
+    fJar = nullptr;
+    return err;
+}
+
+MagicCookie BaseCookieJar::NewCookie(const void* info) {
+    return MCNewCookie(fJar, info);
+}
+
+MgErr BaseCookieJar::DisposeCookie(const MagicCookie& cookie, void* infoOut) {
+    return fJar ? MCDisposeCookie(fJar, cookie, infoOut) : kArgErr;
+}
+
+MgErr BaseCookieJar::SetCookieInfo(const MagicCookie& cookie, const void* info) {
+    return fJar ? MCSetCookieInfo(fJar, cookie, info) : kArgErr;
+}
+
+MgErr BaseCookieJar::GetCookieInfo(const MagicCookie& cookie, void* infoOut) {
+    return MCGetCookieInfo(fJar, cookie, infoOut);
+}
+
+bool BaseCookieJar::IsACookie(const MagicCookie& cookie) {
+    return MCIsACookie(fJar, cookie);
+}
+
+MgErr BaseCookieJar::GetCookieList(CookieList* list) {
+    if (!list) return kArgErr;
+    UHandle cookies = nullptr;
+    MgErr err = fJar ? MCGetCookieList(fJar, &cookies) : kNoErr;
+    int32 count = cookies && err == kNoErr ? *reinterpret_cast<const int32*>(*cookies) : 0;
+    MgErr listErr = list->SetCount(count);
+    for (int32 i = 0; i < list->GetCount(); ++i)
+        list->SetCookie(i, reinterpret_cast<const MagicCookie*>(*cookies)[i + 1]);
+    DSDisposeHandle(cookies);
+    return err != kNoErr ? err : listErr;
+}
+
+MagicCookie BaseCookieJar::GetCookieForInfo(const void* info) {
+    return fJar ? MCGetCookieForInfo(fJar, info) : 0;
+}
+
+int32 BaseCookieJar::AcquireCookieRights(const MagicCookie& cookie, void* infoOut) {
+    if (fJar && AcquireRights(Record(fJar), cookie, infoOut)) return 1;
+    if (infoOut) std::memset(infoOut, 0, fJar ? std::min(Record(fJar).infoSize, kWord) : kWord);
+    return 0;
+}
+
+int32 BaseCookieJar::ReleaseCookieRights(const MagicCookie& cookie) {
+    if (!fJar || !Record(fJar).rightsMode) return 0;
+    JarRecord& record = Record(fJar);
+    CookieEntry* entry = Find(record, cookie);
+    return entry ? ReleaseEntry(record, entry, IndexOf(cookie)) : 0;
+}
+
+MgErr BaseCookieJar::GetNumCookies(int32* count) {
+    return MCJarSize(fJar, count);
+}
+
+}  // namespace tessel

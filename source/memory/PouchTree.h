@@ -1,0 +1,110 @@
+// The entries of a cookie jar, by slot index.
+//
+//   level        0 (root)       1              2            3 (pouch)
+//   index bits   19-16          15-11          10-6         5-0
+//   a slot is    a level 1      a level 2      a pouch      an entry
+//
+// Arrays and pouches are pointer blocks, made when first needed and kept until the jar goes: an entry never moves, and
+// finding one takes no lock.
+#ifndef TESSEL_SOURCE_MEMORY_POUCHTREE_H
+#define TESSEL_SOURCE_MEMORY_POUCHTREE_H
+
+#include <tessel/memory/TrackedMallocFree.h>
+
+#include <tessel/base/Types.h>
+
+namespace tessel {
+
+// One cookie. The info follows. The three words are read without a lock: through the functions below.
+struct alignas(void*) CookieEntry {
+    uint32 generation;  // 0 while free
+    int32 link;         // kInUse, else the index of the next free entry
+    int32 rights;       // used in jars with rights
+
+    static constexpr int32 kInUse = -1;
+
+    uint8* Info() { return reinterpret_cast<uint8*>(this + 1); }
+    uint32 Generation() const { return __atomic_load_n(&generation, __ATOMIC_ACQUIRE); }
+    int32 Link() const { return __atomic_load_n(&link, __ATOMIC_ACQUIRE); }
+    int32 Rights() const { return __atomic_load_n(&rights, __ATOMIC_ACQUIRE); }
+    void SetGeneration(uint32 value) { __atomic_store_n(&generation, value, __ATOMIC_RELEASE); }
+    void SetLink(int32 value) { __atomic_store_n(&link, value, __ATOMIC_RELEASE); }
+    void SetRights(int32 value) { __atomic_store_n(&rights, value, __ATOMIC_RELEASE); }
+};
+
+class PouchTree : public TrackedObject {
+public:
+    static constexpr uint32 kIndexBits = 20;
+    static constexpr uint32 kIndices = 1u << kIndexBits;
+
+    explicit PouchTree(uint32 infoSize)
+        : entrySize_((static_cast<uint32>(sizeof(CookieEntry)) + infoSize + (alignof(CookieEntry) - 1)) &
+                     ~static_cast<uint32>(alignof(CookieEntry) - 1)) {}
+    ~PouchTree();
+
+    uint32 EntrySize() const { return entrySize_; }
+
+    // The entry of an index below kIndices; null while its pouch has not been made.
+    CookieEntry* Find(uint32 index) const {
+        void* node = index < kSlots[3] ? __atomic_load_n(&firstPouch_, __ATOMIC_ACQUIRE) : FindPouch(index);
+        return node ? EntryIn(node, index % kSlots[3]) : nullptr;
+    }
+    // Makes what is missing; null when there is no memory. Callers serialise.
+    CookieEntry* FindOrMake(uint32 index);
+
+    // Visits the entries in use by index until the visitor returns false. Callers serialise.
+    template <class Visitor>
+    void ForEachInUse(Visitor&& visitor) const {
+        auto entries = [&](void* node, int level, uint32 base) {
+            for (uint32 i = 0; level == 3 && i < kSlots[3]; ++i) {
+                CookieEntry* entry = EntryIn(node, i);
+                if (entry->Link() < 0 && !visitor(entry, base + i)) return false;
+            }
+            return true;
+        };
+        VisitNodes(root_, 0, 0, entries);
+    }
+
+    struct Size {
+        uint32 arrays, pouches;
+        uint32 bytes;  // of both
+    };
+    Size Measure() const;
+
+private:
+    static constexpr uint32 kBits[4] = {4, 5, 5, 6};
+    static constexpr uint32 kSlots[4] = {1u << kBits[0], 1u << kBits[1], 1u << kBits[2], 1u << kBits[3]};
+    static constexpr uint32 kShifts[4] = {kBits[1] + kBits[2] + kBits[3], kBits[2] + kBits[3], kBits[3], 0};
+    static_assert(kBits[0] + kBits[1] + kBits[2] + kBits[3] == kIndexBits);
+
+    static void* Slot(void* array, uint32 i) {
+        return __atomic_load_n(static_cast<void**>(array) + i, __ATOMIC_ACQUIRE);
+    }
+    CookieEntry* EntryIn(void* pouch, uint32 i) const {
+        return reinterpret_cast<CookieEntry*>(static_cast<uint8*>(pouch) + size_t{entrySize_} * i);
+    }
+    void* FindPouch(uint32 index) const {
+        void* node = __atomic_load_n(&root_, __ATOMIC_ACQUIRE);
+        for (int level = 0; node && level < 3; ++level) node = Slot(node, (index >> kShifts[level]) % kSlots[level]);
+        return node;
+    }
+    void* MakePouch(uint32 base) const;
+
+    // Visits the arrays and pouches below (and with) a node depth first, each after what hangs on it, by index:
+    // visitor(node, level, index of its first entry). Ends when that returns false.
+    template <class Visitor>
+    static bool VisitNodes(void* node, int level, uint32 base, Visitor& visitor) {
+        if (!node) return true;
+        for (uint32 i = 0; level < 3 && i < kSlots[level]; ++i)
+            if (!VisitNodes(Slot(node, i), level + 1, base + (i << kShifts[level]), visitor)) return false;
+        return visitor(node, level, base);
+    }
+
+    uint32 entrySize_;
+    void* root_ = nullptr;
+    void* firstPouch_ = nullptr;  // that of indices 0 to 63
+};
+
+}  // namespace tessel
+
+#endif
