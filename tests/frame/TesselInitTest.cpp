@@ -1,0 +1,152 @@
+#include <gtest/gtest.h>
+#include <stdlib.h>
+#include <tessel/frame/TesselInit.h>
+#include <tessel/memory/MemoryManager.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <fstream>
+#include <map>
+#include <sstream>
+
+#include "frame/CoreServices.h"
+#include "support/ReportRecorder.h"
+#include "support/StartedLibrary.h"
+
+namespace tessel {
+namespace {
+
+using test::ReportRecorder;
+using Texts = std::vector<std::string>;
+
+std::string ReadFile(const std::filesystem::path& path) {
+    std::ostringstream text;
+    text << std::ifstream(path).rdbuf();
+    return text.str();
+}
+
+// Leak reports go into a folder of their own.
+class TesselInitTest : public testing::Test {
+protected:
+    void SetUp() override {
+        folder = std::filesystem::temp_directory_path() / ("tessel_init_" + std::to_string(getpid()));
+        std::filesystem::create_directory(folder);
+        setenv("TMPDIR", folder.c_str(), 1);
+    }
+    void TearDown() override {
+        unsetenv("TMPDIR");
+        std::filesystem::remove_all(folder);
+    }
+    bool HasLeakFile(const char* name) const { return std::filesystem::exists(folder / name); }
+
+    std::filesystem::path folder;
+    ReportRecorder recorder;
+};
+
+TEST_F(TesselInitTest, StartsAndStopsCleanlyAgainAndAgain) {
+    for (int round = 0; round < 3; ++round) {
+        recorder.Clear();
+        {
+            test::StartedLibrary library;
+            EXPECT_EQ(kGenericErr, InitTesselBase());
+            EXPECT_EQ(kNoErr, InitTesselAppSupport());
+            UHandle handle = DSNewHandle(64);
+            ASSERT_NE(nullptr, handle);
+            EXPECT_EQ(kNoErr, DSDisposeHandle(handle));
+        }
+        EXPECT_EQ(Texts{}, recorder.Texts(kDebugWarning));
+        EXPECT_EQ(Texts{}, recorder.Texts(kDebugError));
+        EXPECT_EQ(Texts{}, recorder.Texts(kDebugFatal));
+        EXPECT_TRUE(recorder.Has(kDebugInfo, "Total Handle Leaks = 0.\n"));
+        EXPECT_TRUE(recorder.Has(kDebugInfo, "Total Pointer Leaks = 0.\n"));
+        EXPECT_TRUE(recorder.Has(kDebugInfo, "Total new/delete leaks = 0.\n"));
+    }
+    EXPECT_TRUE(std::filesystem::is_empty(folder));
+}
+
+TEST_F(TesselInitTest, OutOfTurnNothingHappens) {
+    EXPECT_EQ(kNoErr, UninitTesselAppSupport());
+    EXPECT_EQ(kNoErr, UninitTesselBase());
+    EXPECT_EQ(0u, recorder.Count());
+}
+
+TEST_F(TesselInitTest, AHandleLeftBehindIsReported) {
+    {
+        test::StartedLibrary library;
+        UHandle handle = DSNewHandle(300);
+        ASSERT_NE(nullptr, handle);
+        std::fill(*handle, *handle + 300, uint8('x'));
+        (*handle)[3] = 1;
+    }
+    EXPECT_TRUE(recorder.Has(kDebugError, "We got 1 more Handle Leaks than we see from a basic launch and quit.\n"));
+    const Texts infos = recorder.Texts(kDebugInfo);
+    const bool pointed = std::any_of(infos.begin(), infos.end(), [](const std::string& text) {
+        return text.ends_with("\\ovHandleLeaks.txt(1) : 1 Handle Leaks (0 expected)") && text.starts_with("C:\\");
+    });
+    EXPECT_TRUE(pointed);
+    const std::string report = ReadFile(folder / "ovHandleLeaks.txt");
+    EXPECT_NE(std::string::npos, report.find("** List of currently allocated Handle Leaks          **\n")) << report;
+    EXPECT_NE(std::string::npos, report.find("Master Pointer: 0x"));
+    EXPECT_NE(std::string::npos, report.find("Memory Contents: xxx." + std::string(250, 'x') + '\n'));
+    EXPECT_NE(std::string::npos, report.find(" - frame_tests "));
+    EXPECT_NE(std::string::npos, report.find("\nNumber of unfreed items: 1\n\n1 Handle Leaks\n"));
+    EXPECT_FALSE(HasLeakFile("ovPointerLeaks.txt"));
+}
+
+// The names and what each names as its dependencies, in the order it adds them.
+TEST(CoreServices, NamesAndDependencies) {
+    struct Names : IServiceDependencyList {
+        void AddDependency(IServiceObject* service) override { text += std::string(" ") + service->GetName(); }
+        std::string text;
+    };
+    const std::pair<IServiceObject* (*)(), const char*> expected[] = {
+        {DebugStreamService, "DebugStream_Service:"},
+        {FloatingPointConstantsService, "FloatingPointConstants:"},
+        {ThEventService, "ThEvent:"},
+        {ThMutexService, "ThMutex: ThEvent"},
+        {ProtectedAtomicOperationsService, "ProtectedAtomicOperations: ThMutex"},
+        {MemoryManagerService, "MemoryManager: ThMutex ProtectedAtomicOperations"},
+        {TrackedMallocFreeService, "TrackedMallocFree: MemoryManager"},
+        {PathManagerService, "PathManager: TrackedMallocFree MemoryManager"},
+        {FileManagerService, "FileManager: PathManager MemoryManager"},
+        {ResourceManagerService, "ResourceManager: MemoryManager PathManager FileManager"},
+        {ConfigCoreTypesService, "ConfigCoreTypes: PathManager ConfigManager"},
+        {ConfigManagerService, "ConfigManager: ThMutex PathManager FileManager MemoryManager"},
+        {ThThreadService, "ThThread: ThMutex ThEvent ConfigManager ConfigCoreTypes"},
+        {HardWaitBehaviorService, "HardWaitBehavior: ConfigManager ConfigCoreTypes"},
+        {OccurrenceManagerService, "OccurrenceManager: HardWaitBehavior ThMutex ThThread"},
+    };
+    for (const auto& [accessor, text] : expected) {
+        Names names;
+        accessor()->GetDependencies(names);
+        EXPECT_EQ(text, accessor()->GetName() + std::string(":") + names.text);
+        EXPECT_EQ(accessor(), accessor());
+    }
+}
+
+// A host's service that records what runs at its own start.
+TEST(CoreServices, AHostsRegistryMayDependOnThem) {
+    struct Host final : RefcountedServiceObject_T<Host> {
+        const char* GetName() override { return "Host"; }
+        void GetDependencies(IServiceDependencyList& list) override { list.AddDependency(MemoryManagerService()); }
+        MgErr DoInit() override {
+            handle = DSNewHandle(8);
+            return handle ? kNoErr : kMemFullErr;
+        }
+        MgErr DoUninit() override { return DSDisposeHandle(handle); }
+        UHandle handle = nullptr;
+    };
+    ReportRecorder recorder;
+    IServiceObject* const services[] = {Host::Object(), nullptr};
+    IServiceRegistry* const registry = CreateServiceRegistry(services);
+    {
+        test::StartedLibrary library;
+        EXPECT_EQ(kNoErr, registry->InitServices());
+        EXPECT_EQ(kNoErr, registry->UninitServices());
+    }
+    registry->Release();
+    EXPECT_EQ(0u, recorder.CountAt(kDebugError) + recorder.CountAt(kDebugFatal));
+}
+
+}  // namespace
+}  // namespace tessel
