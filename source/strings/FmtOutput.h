@@ -1,0 +1,95 @@
+/* Where formatted text goes: at most so many bytes at an address, or nowhere, only counted. */
+#ifndef TESSEL_STRINGS_FMTOUTPUT_H
+#define TESSEL_STRINGS_FMTOUTPUT_H
+
+#include <tessel/base/Types.h>
+
+#include <algorithm>
+#include <cstring>
+
+namespace tessel {
+
+/* Copies and fills of a few bytes without a call, which would cost more than the work. */
+inline void CopyFew(char* dst, const char* src, size_t n) {
+    if (n > 16) {
+        std::memcpy(dst, src, n);
+    } else if (n >= 8) {
+        uint64 first;
+        uint64 last;
+        std::memcpy(&first, src, 8);
+        std::memcpy(&last, src + n - 8, 8);
+        std::memcpy(dst, &first, 8);
+        std::memcpy(dst + n - 8, &last, 8);
+    } else if (n >= 4) {
+        uint32 first;
+        uint32 last;
+        std::memcpy(&first, src, 4);
+        std::memcpy(&last, src + n - 4, 4);
+        std::memcpy(dst, &first, 4);
+        std::memcpy(dst + n - 4, &last, 4);
+    } else if (n != 0) {
+        dst[0] = src[0];
+        if (n > 1) std::memcpy(dst + n - 2, src + n - 2, 2);
+    }
+}
+
+inline void FillFew(char* dst, char byte, size_t n) {
+    if (n > 16) {
+        std::memset(dst, byte, n);
+        return;
+    }
+    const uint64 word = static_cast<uint8>(byte) * uint64{0x0101010101010101};
+    if (n >= 8) {
+        std::memcpy(dst, &word, 8);
+        std::memcpy(dst + n - 8, &word, 8);
+    } else if (n >= 4) {
+        std::memcpy(dst, &word, 4);
+        std::memcpy(dst + n - 4, &word, 4);
+    } else if (n != 0) {
+        dst[0] = byte;
+        if (n > 1) std::memcpy(dst + n - 2, &word, 2);
+    }
+}
+
+class FmtOutput {
+public:
+    /* A null dst counts. What goes beyond `limit` bytes is dropped. */
+    FmtOutput(char* dst, size_t limit) : dst_(dst), limit_(limit) {}
+
+    size_t Used() const { return used_; }
+    bool HasRoom() const { return used_ < limit_; }
+    void Restart() { used_ = 0; }
+
+    void Put(char byte) {
+        if (!HasRoom()) return;
+        if (dst_) dst_[used_] = byte;
+        ++used_;
+    }
+    void Put(const void* bytes, size_t n) {
+        n = std::min(n, limit_ - used_);
+        if (dst_) CopyFew(dst_ + used_, static_cast<const char*>(bytes), n);
+        used_ += n;
+    }
+    void Fill(char byte, size_t n) {
+        n = std::min(n, limit_ - used_);
+        if (dst_) FillFew(dst_ + used_, byte, n);
+        used_ += n;
+    }
+
+    /* The address of n bytes to be written by the caller, or null (then Put them). */
+    char* Take(size_t n) {
+        if (!dst_ || n > limit_ - used_) return nullptr;
+        char* place = dst_ + used_;
+        used_ += n;
+        return place;
+    }
+
+private:
+    char* dst_;
+    size_t used_ = 0;
+    size_t limit_;
+};
+
+}  // namespace tessel
+
+#endif

@@ -1,0 +1,132 @@
+#include "strings/FmtRenderer.h"
+
+#include <tessel/numerics/NumericSupport.h>
+#include <tessel/strings/NumericText.h>
+#include <tessel/strings/StringCStr.h>
+#include <tessel/strings/StringFmtPrint.h>
+
+#include <cmath>
+
+#include "numerics/Extended.h"
+
+namespace tessel {
+namespace {
+
+constexpr int32 kAddressDigits = 8;
+
+LStrView TextOf(FmtItem item, const void* argument) {
+    switch (item) {
+        case FmtItem::kPString: {
+            const auto* text = static_cast<ConstPStr>(argument);
+            return text ? LStrView(text + 1, text[0]) : LStrView(nullptr, 0);
+        }
+        case FmtItem::kLString:
+            return LStrView(static_cast<const LStr*>(argument));
+        case FmtItem::kLHandle:
+            return LStrView(static_cast<LStrHandle>(const_cast<void*>(argument)));
+        default: {
+            const auto* range = static_cast<const FmtBytes*>(argument);
+            return range ? LStrView(range->bytes, range->length) : LStrView(nullptr, 0);
+        }
+    }
+}
+
+}  // namespace
+
+void FmtRenderer::RenderOther(FmtItem item, const FmtSpec& spec, FmtValue value) {
+    const auto word = static_cast<int32>(value.integer);
+    switch (item) {
+        case FmtItem::kCharacter:
+            return RenderCharacter(spec, word);
+        case FmtItem::kNamedPoint:
+            output_.Put("hv", 2);
+            [[fallthrough]];
+        case FmtItem::kPoint:
+            return RenderPoint(static_cast<uint32>(word));
+        case FmtItem::kNamedRectangle:
+            output_.Put("tlbr", 4);
+            [[fallthrough]];
+        case FmtItem::kRectangle:
+            return RenderRectangle(static_cast<const int16*>(value.pointer));
+        default:
+            return IsNumber(item) ? RenderNumber(item, spec, value) : RenderText(spec, TextOf(item, value.pointer));
+    }
+}
+
+// ---- numbers ----
+
+void FmtRenderer::RenderNumber(FmtItem item, const FmtSpec& spec, FmtValue value) {
+    FmtSpec shape = spec;
+    if (item == FmtItem::kAddress) {
+        output_.Put("0x", 2);
+        shape.left = false;
+        shape.pad = '0';
+        shape.width = kAddressDigits;
+    }
+    RenderInteger(item, shape, value.integer);
+}
+
+/* Everything but signed decimal: the bit pattern. */
+void FmtRenderer::RenderInteger(FmtItem item, const FmtSpec& spec, int64 value) {
+    const bool wide = spec.size == FmtSize::kInt64 && item != FmtItem::kAddress;
+    uint64 bits = wide ? static_cast<uint64>(value) : static_cast<uint32>(value);
+    if (item == FmtItem::kUnsigned) return RenderDecimal(spec, bits, false);
+
+    const int shift = item == FmtItem::kBinary ? 1 : item == FmtItem::kOctal ? 3 : 4;
+    char digits[64];
+    char* end = digits + sizeof digits;
+    char* p = end;
+    do {
+        *--p = HexChar(static_cast<int32>(bits & ((1u << shift) - 1)));
+        bits >>= shift;
+    } while (bits != 0);
+    PutNumber(spec, p, static_cast<size_t>(end - p));
+}
+
+void FmtRenderer::PutNumber(const FmtSpec& spec, const char* text, size_t length) {
+    const size_t pad = Padding(spec, length);
+    if (pad != 0 && !spec.left && spec.pad == '0' && text[0] == '-') {
+        output_.Put('-');
+        output_.Fill('0', pad);
+        output_.Put(text + 1, length - 1);
+    } else {
+        PutPadded(spec, text, length);
+    }
+}
+
+// ---- characters, texts, points and rectangles ----
+
+void FmtRenderer::RenderCharacter(const FmtSpec& spec, int32 value) {
+    if (spec.width == 2 || spec.width == 4) {
+        RenderText(spec, LStrView(&value, spec.width));
+    } else {
+        output_.Put(static_cast<char>(value));
+    }
+}
+
+void FmtRenderer::RenderText(const FmtSpec& spec, LStrView text) {
+    const size_t length = spec.precision < 0 ? text.length : std::min(text.length, static_cast<size_t>(spec.precision));
+    PutPadded(spec, reinterpret_cast<const char*>(text.bytes), length);
+}
+
+void FmtRenderer::RenderPoint(uint32 point) {
+    output_.Put('(');
+    PutShort(static_cast<int16>(point >> 16));
+    output_.Put(',');
+    PutShort(static_cast<int16>(point & 0xFFFF));
+    output_.Put(')');
+}
+
+void FmtRenderer::RenderRectangle(const int16* rectangle) {
+    output_.Put('(');
+    for (int i = 0; i < 4; ++i) {
+        if (i > 0) {
+            output_.Put(',');
+            output_.Put(' ');
+        }
+        PutShort(rectangle[i]);
+    }
+    output_.Put(')');
+}
+
+}  // namespace tessel

@@ -1,0 +1,97 @@
+/* Renders the items of a formatting call. */
+#ifndef TESSEL_STRINGS_FMTRENDERER_H
+#define TESSEL_STRINGS_FMTRENDERER_H
+
+#include <tessel/base/StringTypes.h>
+
+#include "strings/DecimalDigits.h"
+#include "strings/FmtItem.h"
+#include "strings/FmtOutput.h"
+#include "strings/LStrView.h"
+
+namespace tessel {
+
+class FmtRenderer {
+public:
+    explicit FmtRenderer(FmtOutput& output) : output_(output) {}
+
+    void SetDecimalPoint(uint8 decimalPoint) { decimalPoint_ = decimalPoint; }
+
+    void Render(FmtItem item, const FmtSpec& spec, FmtValue value) {
+        if (item == FmtItem::kSigned && spec.type == kFmtNoType) {
+            RenderSigned(spec, value.integer);
+        } else if (item == FmtItem::kCString) {
+            RenderCString(spec, static_cast<CStr>(value.pointer));
+        } else {
+            RenderOther(item, spec, value);
+        }
+    }
+
+private:
+    void RenderSigned(const FmtSpec& spec, int64 value) { RenderDecimal(spec, Magnitude(value), value < 0); }
+
+    void RenderDecimal(const FmtSpec& spec, uint64 magnitude, bool negative) {
+        const size_t length = CountDecimalDigits(magnitude) + negative;
+        const size_t pad = Padding(spec, length);
+        const bool signFirst = pad != 0 && negative && spec.pad == '0' && !spec.left;
+        if (signFirst) output_.Put('-');
+        if (pad != 0 && !spec.left) output_.Fill(spec.pad, pad);
+        PutDecimal(magnitude, negative && !signFirst);
+        if (pad != 0 && spec.left) output_.Fill(' ', pad);
+    }
+
+    void RenderCString(const FmtSpec& spec, CStr text) {
+        size_t length = 0;
+        if (text && spec.precision < 0) {
+            length = std::strlen(text);
+        } else if (text) {
+            const void* end = std::memchr(text, 0, static_cast<size_t>(spec.precision));
+            length = end ? static_cast<size_t>(static_cast<CStr>(end) - text) : static_cast<size_t>(spec.precision);
+        }
+        PutPadded(spec, text, length);
+    }
+
+    void PutPadded(const FmtSpec& spec, const char* text, size_t length) {
+        const size_t pad = Padding(spec, length);
+        if (pad != 0 && !spec.left) output_.Fill(spec.pad, pad);
+        output_.Put(text, length);
+        if (pad != 0 && spec.left) output_.Fill(' ', pad);
+    }
+
+    void PutDecimal(uint64 magnitude, bool negative) {
+        const size_t length = CountDecimalDigits(magnitude) + negative;
+        char digits[kMaxDecimalDigits + 1];
+        char* place = output_.Take(length);
+        char* text = place ? place : digits;
+        if (negative) *text = '-';
+        WriteDecimalDigits(text + length, magnitude);
+        if (!place) output_.Put(digits, length);
+    }
+
+    static size_t Padding(const FmtSpec& spec, size_t length) {
+        const auto width = static_cast<size_t>(spec.width);
+        return width > length ? width - length : 0;
+    }
+
+    static uint64 Magnitude(int64 value) {
+        return value < 0 ? uint64{0} - static_cast<uint64>(value) : static_cast<uint64>(value);
+    }
+
+    void RenderOther(FmtItem item, const FmtSpec& spec, FmtValue value);
+    void RenderNumber(FmtItem item, const FmtSpec& spec, FmtValue value);
+    void RenderInteger(FmtItem item, const FmtSpec& spec, int64 value);
+    void RenderTyped(FmtItem item, const FmtSpec& spec, const void* value, int16 type);
+    void RenderCharacter(const FmtSpec& spec, int32 value);
+    void RenderText(const FmtSpec& spec, LStrView text);
+    void RenderPoint(uint32 point);
+    void RenderRectangle(const int16* rectangle);
+    void PutNumber(const FmtSpec& spec, const char* text, size_t length);
+    void PutShort(int16 value) { PutDecimal(Magnitude(value), value < 0); }
+
+    FmtOutput& output_;
+    uint8 decimalPoint_ = '.';
+};
+
+}  // namespace tessel
+
+#endif

@@ -1,0 +1,263 @@
+#include <tessel/strings/StringFmtPrint.h>
+
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/strings/StringCStr.h>
+#include <tessel/strings/StringFmtScan.h>
+
+#include <bit>
+
+#include "platform/CodePage.h"
+#include "strings/FmtOutput.h"
+#include "strings/FmtRenderer.h"
+#include "strings/HandleOps.h"
+
+using namespace tessel;
+
+namespace {
+
+constexpr int32 kNoLimit = -1;
+constexpr int32 kMaxPStr = 255;
+constexpr char kCarriageReturn = 13;
+constexpr uint8 kLineFeed = 10;
+
+/* Whether one of the eight bytes is "%" or a backslash: the lowest bit set stands in the first of them. */
+uint64 SpecialBytes(uint64 word) {
+    constexpr uint64 kOnes = 0x0101010101010101u;
+    constexpr uint64 kHighs = 0x8080808080808080u;
+    const uint64 percent = word ^ (kOnes * '%');
+    const uint64 backslash = word ^ (kOnes * '\\');
+    return (((percent - kOnes) & ~percent) | ((backslash - kOnes) & ~backslash)) & kHighs;
+}
+
+bool IsSpecial(char c) {
+    return c == '%' || c == '\\';
+}
+
+/* The first "%" or backslash, or end. */
+const char* FindSpecial(const char* p, const char* end) {
+    for (; static_cast<size_t>(end - p) >= sizeof(uint64); p += sizeof(uint64)) {
+        uint64 word;
+        std::memcpy(&word, p, sizeof word);
+        if (const uint64 special = SpecialBytes(word)) return p + std::countr_zero(special) / 8;
+    }
+    while (p < end && !IsSpecial(*p)) ++p;
+    return p;
+}
+
+/* The same in a page whose characters may hold such bytes. */
+const char* FindSpecialByCharacters(const char* p, const char* end) {
+    while (p < end && !IsSpecial(*p)) p += platform::CharLength(p, end);
+    return p;
+}
+
+/* One formatting call. */
+class Formatter {
+public:
+    Formatter(FmtOutput output, const char* format, size_t length, va_list args)
+        : output_(output), arguments_(args), start_(format), end_(format + length) {
+        const platform::CodePageTables& page = platform::ActiveCodePage();
+        byCharacters_ = page.multiByte && !page.utf8;
+    }
+
+    /* The bytes that were, or would be, written. */
+    size_t Run() {
+        const bool completed = Pass();
+        if (completed && mode_ == Mode::kPositional) {
+            if (!arguments_.Fetch()) return 0;
+            recording_ = false;
+            output_.Restart();
+            Pass();
+        }
+        return output_.Used();
+    }
+
+private:
+    enum class Mode : uint8 { kUndecided, kOrdinary, kPositional };
+
+    bool Pass();
+    void Escape();
+    bool Specifier();
+    bool ChooseMode(const FmtSpec& spec);
+    bool Convert(FmtSpec& spec);
+    bool Unknown();
+
+    FmtOutput output_;
+    FmtRenderer renderer_{output_};
+    FmtArguments arguments_;
+    const char* start_;
+    const char* end_;
+    const char* cursor_ = nullptr;
+    uint8 decimalPoint_ = 0;
+    bool byCharacters_;
+    bool recording_ = false; /* the first pass over a format with positional parameters */
+    Mode mode_ = Mode::kUndecided;
+};
+
+/* Goes over the format once. While recording, the text between the specifiers is written and then overwritten. */
+bool Formatter::Pass() {
+    cursor_ = start_;
+    decimalPoint_ = StrGetDecimalPoint();
+    while (cursor_ < end_ && (output_.HasRoom() || recording_)) {
+        const char* special = byCharacters_ ? FindSpecialByCharacters(cursor_, end_) : FindSpecial(cursor_, end_);
+        output_.Put(cursor_, static_cast<size_t>(special - cursor_));
+        cursor_ = special;
+        if (cursor_ == end_ || !(output_.HasRoom() || recording_)) break;
+        if (*cursor_ == '\\') {
+            Escape();
+        } else if (!Specifier()) {
+            return false;
+        }
+    }
+    return true;
+}
+
+void Formatter::Escape() {
+    const char* next = cursor_ + 1;
+    if (byCharacters_ && next < end_ && platform::CharLength(next, end_) > 1) {
+        cursor_ = next; /* an escaped character of several bytes is itself, whole */
+        return;
+    }
+    const uint8 byte = ScanForBackslash(&cursor_, end_);
+    if (byte == kLineFeed) output_.Put(kCarriageReturn);
+    output_.Put(static_cast<char>(byte));
+}
+
+bool Formatter::Specifier() {
+    ++cursor_;
+    if (cursor_ == end_ || *cursor_ == '%') {
+        output_.Put('%');
+        if (cursor_ < end_) ++cursor_;
+        return true;
+    }
+    if (IsPunct(*cursor_) && ScanForFormatDecPoint(&cursor_, end_, &decimalPoint_)) return true;
+
+    FmtSpec spec;
+    FmtSpecReader reader(cursor_, end_);
+    if (!reader.Read(spec)) return Unknown();
+    cursor_ = reader.Cursor();
+    return ChooseMode(spec) && Convert(spec);
+}
+
+/* All specifiers are ordinary or all are positional. */
+bool Formatter::ChooseMode(const FmtSpec& spec) {
+    const Mode mode = spec.position ? Mode::kPositional : Mode::kOrdinary;
+    if (mode_ == mode) return true;
+    if (mode_ != Mode::kUndecided) {
+        TESSEL_REPORT(kDebugInfo, 0x5F80B2D7u) << "Can't mix ANSI and %n$ specifiers";
+        return Unknown();
+    }
+    mode_ = mode;
+    recording_ = mode == Mode::kPositional;
+    if (recording_) arguments_.ClearTable();
+    return true;
+}
+
+bool Formatter::Convert(FmtSpec& spec) {
+    const FmtItem item = FmtItemOf(spec);
+    if (item == FmtItem::kUnknown) return Unknown();
+    if (spec.type == kFmtTypeFromArgument) {
+        if (spec.position) return Unknown();
+        spec.type = static_cast<int16>(arguments_.Next(FmtArgType::kInt).integer);
+        if (spec.type < kNumInt8 || spec.type > kNumComplexExtended) return Unknown();
+    }
+    const FmtArgType type = FmtArgTypeOf(item, spec);
+    if (recording_) return arguments_.Record(spec.position, type);
+    renderer_.SetDecimalPoint(decimalPoint_);
+    renderer_.Render(item, spec, spec.position ? arguments_.At(spec.position) : arguments_.Next(type));
+    return true;
+}
+
+bool Formatter::Unknown() {
+    TESSEL_REPORT(kDebugFatal, 0xE2947A06u) << "Unknown Conversion";
+    return false;
+}
+
+/* Formats and closes the arguments. `size` of kNoLimit writes as much as there is. */
+size_t Format(char* dst, int32 size, const char* format, size_t length, va_list args) {
+    const int32 limit = !dst || size == kNoLimit ? INT32_MAX : std::max(size, 0);
+    return Formatter(FmtOutput(dst, static_cast<size_t>(limit)), format, length, args).Run();
+}
+
+int32 FormatTerminated(char* dst, const char* format, size_t length, va_list args) {
+    const size_t written = Format(dst, kNoLimit, format, length, args);
+    if (dst) dst[written] = 0;
+    return static_cast<int32>(written);
+}
+
+int32 FormatPStr(PStr dst, const char* format, size_t length, va_list args) {
+    const size_t written = Format(reinterpret_cast<char*>(dst + 1), kMaxPStr, format, length, args);
+    dst[0] = static_cast<uint8>(written);
+    return dst[0];
+}
+
+}  // namespace
+
+int32 SPrintfv(char* dst, int32 size, const char* format, int32 formatLength, va_list args) {
+    return static_cast<int32>(Format(dst, size, format, static_cast<size_t>(std::max(formatLength, 0)), args));
+}
+
+int32 SPrintf(char* dst, CStr format, ...) {
+    va_list args;
+    va_start(args, format);
+    const int32 written = FormatTerminated(dst, format, std::strlen(format), args);
+    va_end(args);
+    return written;
+}
+
+int32 SPrintfp(char* dst, ConstPStr format, ...) {
+    va_list args;
+    va_start(args, format);
+    const int32 written = FormatTerminated(dst, reinterpret_cast<const char*>(format + 1), format[0], args);
+    va_end(args);
+    return written;
+}
+
+int32 SNPrintf(char* dst, int32 size, CStr format, ...) {
+    if (dst && size <= 0) return 0;
+    va_list args;
+    va_start(args, format);
+    const auto written = static_cast<int32>(Format(dst, size, format, std::strlen(format), args));
+    va_end(args);
+    if (dst) dst[std::min(written, size - 1)] = 0;
+    return written;
+}
+
+int32 PPrintf(PStr dst, CStr format, ...) {
+    va_list args;
+    va_start(args, format);
+    const int32 written = FormatPStr(dst, format, std::strlen(format), args);
+    va_end(args);
+    return written;
+}
+
+int32 PPrintfp(PStr dst, ConstPStr format, ...) {
+    va_list args;
+    va_start(args, format);
+    const int32 written = FormatPStr(dst, reinterpret_cast<const char*>(format + 1), format[0], args);
+    va_end(args);
+    return written;
+}
+
+MgErr LStrPrintf(LStrHandle dst, CStr format, ...) {
+    if (!dst) return kArgErr;
+    const size_t length = std::strlen(format);
+    va_list args;
+    va_start(args, format);
+    va_list countingArgs;
+    va_copy(countingArgs, args);
+    const size_t needed = Format(nullptr, kNoLimit, format, length, countingArgs);
+    va_end(countingArgs);
+
+    MgErr err = DSSetHandleSize(AsHandle(dst), LStrSize(needed));
+    if (!err) {
+        const size_t written =
+            Format(reinterpret_cast<char*>((*dst)->bytes), static_cast<int32>(needed), format, length, args);
+        (*dst)->count = static_cast<int32>(written);
+        if (written != needed) {
+            TESSEL_REPORT(kDebugFatal, 0x48A3D5F1u);
+            err = kGenericErr;
+        }
+    }
+    va_end(args);
+    return err;
+}

@@ -1,0 +1,250 @@
+#include <tessel/strings/StringFmtPrint.h>
+
+#include <tessel/base/NumericTypes.h>
+#include <tessel/strings/StringCStr.h>
+
+#include <cstdio>
+#include <cstring>
+#include <limits>
+#include <random>
+
+#include "strings/Support.h"
+#include "support/ReportRecorder.h"
+
+using namespace tessel;
+using namespace tessel::test;
+
+namespace {
+
+// What a format gives without a limit; counting must agree.
+std::string F(CStr format, ...) {
+    char text[2000];
+    const auto length = static_cast<int32>(std::strlen(format));
+    va_list args;
+    va_start(args, format);
+    va_list again;
+    va_copy(again, args);
+    const int32 written = SPrintfv(text, -1, format, length, args);
+    ReportRecorder quiet;  // what the first call reported
+    EXPECT_EQ(written, SPrintfv(nullptr, 0, format, length, again)) << format;
+    va_end(again);
+    va_end(args);
+    return {text, static_cast<size_t>(written)};
+}
+
+TEST(StringFmtPrint, PrintsIntegers) {
+    EXPECT_EQ("  -42|-42  |-0042", F("%5d|%-5d|%05d", -42, -42, -42));
+    EXPECT_EQ("-2147483648 4294967295 -9223372036854775808 18446744073709551615",
+              F("%d %u %lld %llu", INT32_MIN, -1, static_cast<long long>(INT64_MIN), -1LL));
+    EXPECT_EQ("FF 101 10 0 FFFFFFFFFFFFFFFE", F("%x %b %o %x %llx", 255, 5, 8, 0, -2LL));
+    EXPECT_EQ("7 8 9", F("%ld %Id %i", 7, 8, 9));
+    EXPECT_EQ("0x000000FF|0xFFFFFFFF|0x0000000A", F("%a|%-12a|%2a", 255, -1, 10));
+    EXPECT_EQ("12 ", F("%-03.9d", 12));  // no precision for integers
+    EXPECT_EQ("11111111111111111111111111111111", F("%b", -1));
+    EXPECT_EQ(64u, F("%llb", -1LL).size());
+    for (size_t digits = 1; digits <= 20; ++digits) {
+        const std::string number = std::string("18446744073709551615").substr(0, digits);
+        EXPECT_EQ(number, F("%llu", std::stoull(number)));
+    }
+}
+
+TEST(StringFmtPrint, PrintsTexts) {
+    EXPECT_EQ("abc|   abc|abc   |00abc", F("%.3s|%6.3s|%-6.3s|%05s", "abcdef", "abcdef", "abcdef", "abc"));
+    EXPECT_EQ("[][  ][]", F("[%s][%2s][%.0s]", nullptr, nullptr, "x"));
+    const char unterminated[] = {'a', 'b', 'c'};
+    EXPECT_EQ("abc", F("%.3s", unterminated));
+    EXPECT_EQ("ab|  ab|a",
+              F("%p|%4p|%.1p", static_cast<PStr>(P("ab")), static_cast<PStr>(P("ab")), static_cast<PStr>(P("ab"))));
+    L text("hello");
+    EXPECT_EQ("hello|hello|hell| hello", F("%P|%lp|%.4H|%6H", *text, *text, *&text, *&text));
+    EXPECT_EQ("|     ", F("%H|%5H", nullptr, nullptr));
+    const FmtBytes bytes = {"a\0b", 3};
+    EXPECT_EQ(std::string("a\0b..", 5), F("%h..", &bytes));
+    const std::string large(1000, 'x');
+    EXPECT_EQ(large + "!", F("%s!", large.c_str()));
+    EXPECT_EQ("A  DCBA BA A%", F("%c  %4c %2c %5c%", 'A', 0x41424344, 0x41424142, 'A'));
+    EXPECT_EQ("  DC", F("%4.2c", 0x41424344));
+}
+
+TEST(StringFmtPrint, PrintsPointsAndRectangles) {
+    const int16 rectangle[] = {1, 2, 3, 4};
+    EXPECT_EQ("(2,1) hv(2,1) (-1,-32768)", F("%q %Q %q", 0x00020001, 0x00020001, static_cast<int32>(0xFFFF8000)));
+    EXPECT_EQ("(1, 2, 3, 4) tlbr(1, 2, 3, 4)", F("%r %R", rectangle, rectangle));
+}
+
+TEST(StringFmtPrint, TakesPositionalParameters) {
+    ReportRecorder reports;
+    EXPECT_EQ("2 1", F("%2$d %1$d", 1, 2));
+    EXPECT_EQ("  b|a    |b", F("%2$3s|%1$-5s|%2$s", "a", "b"));
+    EXPECT_EQ("x 7 -1 DCBA (2,1) 7", F("%3$s %1$d %2$lld %4$4c %5$q %1$u", 7, -1LL, "x", 0x41424344, 0x00020001));
+    EXPECT_EQ("10987654321", F("%10$d%9$d%8$d%7$d%6$d%5$d%4$d%3$d%2$d%1$d", 1, 2, 3, 4, 5, 6, 7, 8, 9, 10));
+    char four[4];
+    EXPECT_EQ(4, SNPrintf(four, 4, "%2$d and %1$d", 1, 2));  // the first pass sees the whole format
+    EXPECT_STREQ("2 a", four);
+    EXPECT_EQ(0u, reports.Count());
+}
+
+// Reports of one call, as levels and texts.
+using Reports = std::vector<std::pair<int32, std::string>>;
+
+Reports ReportsOf(const ReportRecorder& recorder) {
+    Reports reports;
+    for (const Report& report : recorder.Reports()) reports.emplace_back(report.level, report.text);
+    return reports;
+}
+
+TEST(StringFmtPrint, StopsAtWhatItDoesNotKnow) {
+    const std::pair<int32, std::string> unknown(kDebugFatal, "Unknown Conversion");
+    const std::pair<int32, std::string> mixed(kDebugInfo, "Can't mix ANSI and %n$ specifiers");
+    const struct {
+        CStr format;
+        std::string written;
+        Reports reports;
+    } kCases[] = {
+        {"ab%yc", "ab", {unknown}},
+        {"%d %X", "1 ", {unknown}},
+        {"%n", "", {unknown}},
+        {"%5", "", {unknown}},
+        {"%-", "", {unknown}},
+        {"%5.l", "", {unknown}},
+        {"%{iX}d", "", {unknown}},
+        {"%{qB}d", "", {unknown}},
+        {"%{", "", {unknown}},
+        {"%0$d", "", {unknown}},
+        {"%11$d", "", {unknown}},
+        {"%-1$d", "", {unknown}},
+        {"%$d", "", {unknown}},
+        {"%1$2$d", "", {unknown}},
+        {"%1${*}d", "", {unknown}},
+        {"%d %1$d", "1 ", {mixed, unknown}},
+        {"%1$d %d", " ", {mixed, unknown}},
+        {"%1$d %1$s", " ", {{kDebugInfo, "Parameter 1 type info [-2] redefined (was [-1])"}}},
+        {"%1$Id%1$d", "", {{kDebugInfo, "Parameter 1 type info [-1] redefined (was [3])"}}},
+        {"ab%2$d", "", {{kDebugInfo, "Not all parameters between 1 and 2 specified"}}},
+    };
+    for (const auto& c : kCases) {
+        ReportRecorder recorder;
+        EXPECT_EQ(c.written, F(c.format, 1, 2)) << c.format;
+        EXPECT_EQ(c.reports, ReportsOf(recorder)) << c.format;
+    }
+}
+
+TEST(StringFmtPrint, InterpretsEscapesOfTheFormat) {
+    EXPECT_EQ("a\r\nA\tB\\ %", F("a\\n\\41\\tB\\\\ \\%"));
+    EXPECT_EQ("line\n", F("line\n"));
+    EXPECT_EQ("100%", F("100%"));
+    EXPECT_EQ("100% \\", F("100%% \\"));
+    char text[3] = {'x', 'x', 'x'};
+    EXPECT_EQ(2, SNPrintf(text, 2, "a\\n"));
+    EXPECT_STREQ("a", text);
+    char out[10];
+    EXPECT_EQ(4, SPrintfp(out, P(std::string_view("a\0b%d", 5)), 7));
+    EXPECT_EQ(0, std::memcmp("a\0b7", out, 5));
+}
+
+TEST(StringFmtPrint, CopiesDoubleByteCharactersWhole) {
+    {
+        const CodePage page(932);
+        EXPECT_EQ(
+            "\x83\x5C"
+            "b\x83\x25"
+            "d1 \x83\x5C",
+            F("\x83\x5C"
+              "b\x83\x25"
+              "d%d \\\x83\x5C",
+              1));
+        EXPECT_EQ(
+            "\xB1"
+            "A\xB1",
+            F("\xB1\\41%s", "\xB1"));  // half-width katakana are single bytes
+    }
+    EXPECT_EQ(
+        "\xC3\xA4"
+        "A \xE2\x82\xAC",
+        F("\xC3\xA4\\41 %s", "\xE2\x82\xAC"));
+}
+
+// Formats of the language that is shared with the C library, with what they take.
+TEST(StringFmtPrint, AgreesWithTheCLibrary) {
+    std::mt19937_64 random(3);
+    const auto pick = [&](size_t n) { return static_cast<size_t>(random() % n); };
+    const char* const kTexts[] = {"", "a", "some text", "text that is longer than eight bytes"};
+    for (int i = 0; i < 20000; ++i) {
+        const std::string before = std::string("plain, long enough text and ").substr(pick(20), pick(12));
+        std::string specifier = pick(3) == 0 ? "-" : "";
+        const char conversion = "duxos"[pick(5)];
+        if (conversion != 's' && pick(3) == 0) specifier += '0';
+        if (pick(2)) specifier += std::to_string(1 + pick(30));
+        if (conversion == 's' && pick(2)) specifier += "." + std::to_string(pick(12));
+        const bool wide = conversion != 's' && pick(2);
+        if (wide) specifier += "ll";
+        const std::string ours = before + "%" + specifier + conversion + "%%|%d";
+        const std::string theirs = before + "%" + specifier + (conversion == 'x' ? 'X' : conversion) + "%%|%d";
+
+        const auto bits = static_cast<long long>(random() >> pick(64));
+        const long long value = pick(2) ? bits : -bits;
+        const int last = static_cast<int>(value);
+        const char* text = kTexts[pick(4)];
+        char expected[200];
+        char actual[200];
+        const auto size = static_cast<int32>(1 + pick(120));
+        int32 full;
+        int32 length;
+        if (conversion == 's') {
+            full = std::snprintf(expected, static_cast<size_t>(size), theirs.c_str(), text, last);
+            length = SNPrintf(actual, size, ours.c_str(), text, last);
+        } else if (wide) {
+            full = std::snprintf(expected, static_cast<size_t>(size), theirs.c_str(), value, last);
+            length = SNPrintf(actual, size, ours.c_str(), value, last);
+        } else {
+            full = std::snprintf(expected, static_cast<size_t>(size), theirs.c_str(), last, last);
+            length = SNPrintf(actual, size, ours.c_str(), last, last);
+        }
+        ASSERT_STREQ(expected, actual) << ours;
+        ASSERT_EQ(std::min(full, size), length) << ours;
+    }
+}
+
+TEST(StringFmtPrint, WritesNothingPastItsSize) {
+    const char kGuard = '\x5A';
+    const std::string full = F("ab%08d|%-7s|%20d|\\n%x|%3s|%q", -42, "hello", 3, 255, "abcdef", 0x00020001);
+    ASSERT_EQ("ab-0000042|hello  |                   3|\r\nFF|abcdef|(2,1)", full);
+    const auto n = static_cast<int32>(full.size());
+    for (int32 size = 0; size <= n + 2; ++size) {
+        std::string room(full.size() + 10, kGuard);
+        const int32 length =
+            SNPrintf(room.data(), size, "ab%08d|%-7s|%20d|\\n%x|%3s|%q", -42, "hello", 3, 255, "abcdef", 0x00020001);
+        EXPECT_EQ(std::min(size, n), length);
+        std::string expected = size == 0 ? "" : full.substr(0, static_cast<size_t>(size - 1)) + '\0';
+        expected.resize(room.size(), kGuard);
+        EXPECT_EQ(expected, room) << size;
+    }
+    char four[4];
+    EXPECT_EQ(4, SNPrintf(four, 4, "%d", 123456));
+    EXPECT_STREQ("123", four);
+    EXPECT_EQ(6, SNPrintf(nullptr, 0, "%d", 123456));
+    EXPECT_EQ(4, SNPrintf(four, 4, "%99999999999999d", 1));
+    EXPECT_STREQ("   ", four);
+    EXPECT_EQ(INT32_MAX, SNPrintf(nullptr, 0, "%99999999999999d and more", 1));
+}
+
+TEST(StringFmtPrint, FillsPStrsAndHandles) {
+    P p;
+    EXPECT_EQ(255, PPrintf(p, "%s", std::string(300, 'y').c_str()));
+    EXPECT_EQ(std::string(255, 'y'), p.Text());
+    EXPECT_EQ(3, PPrintfp(p, P("%03d"), 7));
+    EXPECT_EQ("007", p.Text());
+    char c[8];
+    EXPECT_EQ(2, SPrintf(c, "%d", 42));
+    EXPECT_STREQ("42", c);
+
+    L text("x");
+    EXPECT_EQ(kNoErr, LStrPrintf(text, "%d %s", 42, "things"));
+    EXPECT_EQ("42 things", text.Text());
+    EXPECT_EQ(13u, text.Size());
+    EXPECT_EQ(kNoErr, LStrPrintf(text, ""));
+    EXPECT_EQ(4u, text.Size());
+    EXPECT_EQ(kArgErr, LStrPrintf(nullptr, "x"));
+}
+
+}  // namespace
