@@ -30,7 +30,7 @@ public:
     ~CPStrList();
 
     int32 Count() const;
-    CPStrHandle Handle() const { return m_list; }
+    CPStrHandle Handle() const { return list_; }
 
     /* Replace the content; null empties. */
     MgErr Copy(const CPStrList& other);
@@ -70,7 +70,7 @@ public:
     MgErr UnFlatten(BinDataReader& reader);
 
 private:
-    CPStrHandle m_list = nullptr;
+    CPStrHandle list_ = nullptr;
 };
 
 }  // namespace tessel

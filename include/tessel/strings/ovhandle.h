@@ -12,11 +12,11 @@ namespace tessel {
 class TESSEL_API OVHandle {
 public:
     OVHandle() = default;
-    OVHandle(OVHandle&& other) noexcept : m_handle(other.DetachHandle()) {}
+    OVHandle(OVHandle&& other) noexcept : handle_(other.DetachHandle()) {}
     OVHandle& operator=(OVHandle&& other) noexcept;
     ~OVHandle();
 
-    UHandle Handle() const { return m_handle; }
+    UHandle Handle() const { return handle_; }
     uint32 Size() const;
 
     /* Resizes the handle, creating it when there is none; n of 0 disposes of it. kMemFullErr when it cannot be created,
@@ -35,7 +35,9 @@ public:
     UHandle DetachHandle();
 
 private:
-    UHandle m_handle = nullptr;
+    friend class OVSubString; /* edits the text of an OVString in its handle */
+
+    UHandle handle_ = nullptr;
 };
 
 }  // namespace tessel

@@ -72,8 +72,8 @@ public:
     OVSubString(CPStrHandle list, int32 index);
     static OVSubString OnPStr(PStr buffer);
 
-    const uint8* Bytes() const { return m_bytes; }
-    int32 Length() const { return m_length; }
+    const uint8* Bytes() const { return bytes_; }
+    int32 Length() const { return length_; }
     int32 Class() const { return m_class; }
 
     /* ---- editing ---- */
@@ -113,7 +113,8 @@ public:
        empty `find` replaces nothing. */
     MgErr SearchReplace(const OVSubString& find, const OVSubString& replacement, int32* count);
 
-    /* Narrows the view past spaces, tabs, CR and LF at both ends. The stored bytes stay. */
+    /* Narrows the view past spaces, tabs, CR and LF at both ends. The stored bytes stay until the view is resized,
+       which makes its text all that is stored. */
     void TrimWhitespace();
 
     MgErr Printf(CStr format, ...);
@@ -151,19 +152,26 @@ public:
 protected:
     struct TempRecord;
 
-    OVSubString(int32 storageClass, const void* bytes, int32 length);
+    /* An element of a list. */
+    struct Element {
+        CPStrHandle list;
+        int32 index;
+    };
 
-    uint8* m_bytes;
-    int32 m_length;
-    int32 m_one = 1;
+    OVSubString(const void* bytes, int32 length, int32 storageClass);
+
+    uint8* bytes_;
+    int32 length_;
+    int32 one_ = 1;
     int32 m_class;
     union {
-        PStr m_pstr;          /* 4 */
-        int32 m_capacity;     /* 5 */
-        LStrHandle* m_handle; /* 10 */
-        CPStrHandle m_list;   /* 11 */
-        TempRecord* m_temp;   /* 12 */
+        PStr pstr_;          /* 4 */
+        int32 capacity_;     /* 5 */
+        LStrHandle* handle_; /* 10 */
+        Element element_;    /* 11 */
+        TempRecord* temp_;   /* 12 */
     };
+    int32 skipped_ = 0; /* bytes of the storage before the view */
 
 private:
     MgErr ResizePStr(int32 n);
@@ -171,7 +179,12 @@ private:
     MgErr ResizeHandle(int32 n);
     MgErr ResizeElement(int32 n);
     MgErr ResizeTemp(int32 n);
-    bool Holds(const void* bytes) const;
+    void MoveToStart(uint8* start);
+    template <class Edit>
+    MgErr WithoutOverlap(const void* source, int32 length, Edit edit);
+    MgErr ReplaceRange(const void* source, int32 length, int32 at, int32 count);
+
+    friend TESSEL_API MgErr OVSubStringPrintf(OVSubString* string, bool append, CStr format, va_list args);
 };
 
 /* The text and room of an OVTempString. */
@@ -189,7 +202,7 @@ public:
     OVTempString& operator=(const OVTempString&) = delete;
 
 private:
-    TempRecord m_record;
+    TempRecord record_;
 };
 
 /* What Printf (append false) and AppendPrintf of both classes do. Null is reported and gives kArgErr. */

@@ -1,0 +1,601 @@
+#include <tessel/strings/ovstring.h>
+
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/strings/StringCPStr.h>
+#include <tessel/strings/StringFmtPrint.h>
+#include <tessel/strings/StringPStr.h>
+
+#include <algorithm>
+#include <cstring>
+#include <string_view>
+
+#include "diagnostics/Guarded.h"
+#include "platform/CodePage.h"
+#include "strings/ByteOps.h"
+#include "strings/CPStrWalk.h"
+#include "strings/HandleOps.h"
+#include "strings/LStrView.h"
+
+namespace tessel {
+namespace {
+
+/* Storage kinds. */
+enum : int32 {
+    kText = 1,
+    kText2 = 2,
+    kText3 = 3,
+    kPStrBuffer = 4,
+    kCStrBuffer = 5,
+    kConstLStr = 7,
+    kLStrHandle = 10,
+    kListElement = 11,
+    kTemporary = 12,
+};
+
+constexpr int32 kMaxPStr = 255;
+constexpr int32 kMaxTerminatedPStr = 254;
+
+int32 LengthOf(CStr text) {
+    return text ? static_cast<int32>(std::strlen(text)) : 0;
+}
+
+bool IsEditable(int32 storageClass) {
+    return storageClass == kPStrBuffer || storageClass == kCStrBuffer ||
+           (storageClass >= kLStrHandle && storageClass <= kTemporary);
+}
+
+bool IsTrimmed(uint8 byte) {
+    return byte == ' ' || byte == '\t' || byte == '\r' || byte == '\n';
+}
+
+/* Brings an LStr handle to n bytes of text; n of 0 releases it. */
+MgErr ResizeLStr(LStrHandle* handle, int32 n) {
+    if (n == 0) return DSDisposeHandleAndNull(AsHandlePtr(handle));
+    if (static_cast<uint32>(n) > INT32_MAX - LStrSize(0)) return kMemFullErr;
+    if (MgErr err = DSSetHandleSizeOrNewHandle(AsHandlePtr(handle), LStrSize(n))) return err;
+    (**handle)->count = n;
+    return kNoErr;
+}
+
+std::string NarrowText(const char16_t* text, int32 length) {
+    std::string narrow;
+    const size_t units = length < 1 ? BSTRLength(text) : static_cast<size_t>(length);
+    if (text) platform::FromUtf16({text, units}, narrow);
+    return narrow;
+}
+
+}  // namespace
+
+// ---- OVString ----
+
+int32 OVString::Length() const {
+    return static_cast<int32>(LStrView(LHandle()).length);
+}
+
+const uint8* OVString::Bytes() const {
+    return LStrView(LHandle()).bytes;
+}
+
+MgErr OVString::Resize(int32 n) {
+    return OVSubString(this).Resize(n);
+}
+
+MgErr OVString::Assign(const void* bytes, int32 n) {
+    return OVSubString(this).Assign(bytes, n);
+}
+
+void OVString::CopyToCStr(char* buffer, int32 size) const {
+    OVSubString(*this).CopyToCStr(buffer, size);
+}
+
+void OVString::CopyToPStr(PStr buffer) const {
+    OVSubString(*this).CopyToPStr(buffer);
+}
+
+MgErr OVString::CopyToNarrowString(std::string& out) const {
+    return OVSubString(*this).CopyToNarrowString(out);
+}
+
+// ---- making a view ----
+
+OVSubString::OVSubString(const void* bytes, int32 length, int32 storageClass)
+    : bytes_(static_cast<uint8*>(const_cast<void*>(bytes))),
+      length_(bytes ? std::max(length, 0) : 0),
+      m_class(storageClass),
+      element_{nullptr, 0} {
+}
+
+OVSubString::OVSubString(CStr text) : OVSubString(text, LengthOf(text), kText) {
+}
+
+OVSubString::OVSubString(const void* bytes, int32 length) : OVSubString(bytes, length, kText) {
+}
+
+OVSubString::OVSubString(const OVString& string) : OVSubString(string.Bytes(), string.Length(), kText) {
+}
+
+OVSubString::OVSubString(LStrHandle handle)
+    : OVSubString(LStrView(handle).bytes, static_cast<int32>(LStrView(handle).length), kText) {
+}
+
+OVSubString::OVSubString(const LStr* text)
+    : OVSubString(LStrView(text).bytes, static_cast<int32>(LStrView(text).length), kConstLStr) {
+}
+
+OVSubString::OVSubString(int32 capacity, char* buffer) : OVSubString(buffer, 0, kCStrBuffer) {
+    capacity_ = buffer ? std::max(capacity, 0) : 0;
+    if (capacity_ == 0) return;
+    const void* terminator = std::memchr(buffer, 0, static_cast<size_t>(capacity_));
+    length_ = terminator ? static_cast<int32>(static_cast<CStr>(terminator) - buffer) : capacity_ - 1;
+    buffer[length_] = 0;
+}
+
+OVSubString::OVSubString(int32 capacity, char* buffer, int32 length) : OVSubString(buffer, 0, kCStrBuffer) {
+    capacity_ = buffer ? std::max(capacity, 0) : 0;
+    if (capacity_ == 0) return;
+    length_ = std::clamp(length, 0, capacity_ - 1);
+    buffer[length_] = 0;
+}
+
+OVSubString::OVSubString(OVString* string) : OVSubString(string->Bytes(), string->Length(), kLStrHandle) {
+    handle_ = reinterpret_cast<LStrHandle*>(&string->OVHandle::handle_);
+}
+
+OVSubString::OVSubString(LStrHandle* handle)
+    : OVSubString(LStrView(*handle).bytes, static_cast<int32>(LStrView(*handle).length), kLStrHandle) {
+    handle_ = handle;
+}
+
+OVSubString::OVSubString(CPStrHandle list, int32 index) : OVSubString(nullptr, 0, kListElement) {
+    const int32 count = list ? ElementCount(*list) : 0;
+    if (count == 0) return;
+    element_ = {list, std::clamp(index, 0, count - 1)};
+    PStr element = CPStrIndex(list, index);
+    bytes_ = element + 1;
+    length_ = element[0];
+}
+
+OVSubString OVSubString::OnPStr(PStr buffer) {
+    OVSubString view(buffer + 1, std::min<int32>(buffer[0], kMaxTerminatedPStr), kPStrBuffer);
+    view.pstr_ = buffer;
+    buffer[0] = static_cast<uint8>(view.length_);
+    buffer[1 + view.length_] = 0;
+    return view;
+}
+
+OVTempString::OVTempString() : OVSubString(record_.room, 0, kTemporary) {
+    temp_ = &record_;
+}
+
+// ---- resizing ----
+
+MgErr OVSubString::Resize(int32 n) {
+    if (n < 0) return kArgErr;
+    switch (m_class) {
+        case kText:
+        case kText2:
+        case kText3:
+        case kConstLStr:
+            return kArgErr;
+        case kPStrBuffer:
+            return ResizePStr(n);
+        case kCStrBuffer:
+            return ResizeBuffer(n);
+        case kLStrHandle:
+            return ResizeHandle(n);
+        case kListElement:
+            return ResizeElement(n);
+        case kTemporary:
+            return ResizeTemp(n);
+        default:
+            TESSEL_REPORT(kDebugWarning, 0x3B608FD4u) << "OVSubString::Resize: Unknown m_class (" << m_class << ")";
+            return kNoErr;
+    }
+}
+
+/* Makes the view's text the first bytes of the storage, which starts there. */
+void OVSubString::MoveToStart(uint8* start) {
+    if (skipped_ != 0) std::memmove(start, start + skipped_, static_cast<size_t>(length_));
+    skipped_ = 0;
+    bytes_ = start;
+}
+
+MgErr OVSubString::ResizePStr(int32 n) {
+    if (n > kMaxTerminatedPStr) return kArgErr;
+    MoveToStart(pstr_ + 1);
+    pstr_[0] = static_cast<uint8>(n);
+    bytes_[n] = 0;
+    length_ = n;
+    return kNoErr;
+}
+
+MgErr OVSubString::ResizeBuffer(int32 n) {
+    if (n >= capacity_) return kArgErr;
+    MoveToStart(bytes_ - skipped_);
+    bytes_[n] = 0;
+    length_ = n;
+    return kNoErr;
+}
+
+MgErr OVSubString::ResizeHandle(int32 n) {
+    if (*handle_) MoveToStart((**handle_)->bytes);
+    if (MgErr err = ResizeLStr(handle_, n)) return err;
+    bytes_ = *handle_ ? (**handle_)->bytes : nullptr;
+    length_ = n;
+    return kNoErr;
+}
+
+MgErr OVSubString::ResizeElement(int32 n) {
+    CPStrHandle list = element_.list;
+    if (n > kMaxPStr || !list || element_.index >= ElementCount(*list)) return kArgErr;
+    PStr element = CPStrIndex(list, element_.index);
+    MoveToStart(element + 1);
+    const auto offset = static_cast<uint32>(bytes_ - *AsHandle(list));
+    const HandleRange text = {CPStrSize(*list), offset, element[0]};
+    if (MgErr err = ResizeRange(AsHandle(list), text, static_cast<uint32>(n), true)) return err;
+    bytes_ = *AsHandle(list) + offset;
+    bytes_[-1] = static_cast<uint8>(n);
+    length_ = n;
+    return kNoErr;
+}
+
+MgErr OVSubString::ResizeTemp(int32 n) {
+    uint8* room = temp_->room;
+    OVString& overflow = temp_->overflow;
+    const bool wasInHandle = temp_->inHandle != 0;
+    MoveToStart(wasInHandle ? (*overflow.LHandle())->bytes : room);
+    const bool fits = n < static_cast<int32>(sizeof temp_->room);
+    if (fits && wasInHandle) {
+        std::memcpy(room, bytes_, static_cast<size_t>(std::min(n, length_)));
+        overflow.Resize(0);
+    } else if (!fits) {
+        if (MgErr err = overflow.Resize(n)) return err;
+        if (!wasInHandle) std::memcpy((*overflow.LHandle())->bytes, room, static_cast<size_t>(length_));
+    }
+    temp_->inHandle = !fits;
+    bytes_ = fits ? room : (*overflow.LHandle())->bytes;
+    length_ = n;
+    return kNoErr;
+}
+
+// ---- editing ----
+
+MgErr OVSubString::Replace(const void* source, int32 length, int32 at, int32 count) {
+    if (at < 0 || at > length_) at = length_;
+    length = std::max(length, 0);
+    if (count < 0 || count > length_ - at) {
+        TESSEL_REPORT(kDebugError, 0x92D7E6A0u) << "BadParams";
+        TESSEL_REPORT(kDebugInfo, 0x45FC138Bu)
+            << "Bad Params:at:" << at << "\tdstLen:" << count << "\tSize:" << length_ << " \n";
+        return kArgErr;
+    }
+    if (m_class == kText) {
+        TESSEL_REPORT(kDebugInfo, 0xDE2049B6u) << "Can't Change Fixed Strings!";
+        return kArgErr;
+    }
+    return WithoutOverlap(source, length, [&](const void* bytes) { return ReplaceRange(bytes, length, at, count); });
+}
+
+/* Runs an edit with the source, or with a copy of it when it lies in the view and may move. */
+template <class Edit>
+MgErr OVSubString::WithoutOverlap(const void* source, int32 length, Edit edit) {
+    const uintptr_t offset = reinterpret_cast<uintptr_t>(source) - reinterpret_cast<uintptr_t>(bytes_);
+    if (!source || !bytes_ || offset >= static_cast<size_t>(length_)) return edit(source);
+    return Guarded([&] {
+        const std::string copy(static_cast<const char*>(source), static_cast<size_t>(length));
+        return edit(copy.data());
+    });
+}
+
+MgErr OVSubString::ReplaceRange(const void* source, int32 length, int32 at, int32 count) {
+    if (length - count > INT32_MAX - length_) return kArgErr;
+    const int32 newLength = length_ - count + length;
+    const auto rest = static_cast<size_t>(length_ - at - count);
+    if (length > count || !IsEditable(m_class)) {
+        if (MgErr err = Resize(newLength)) return err;
+        if (!IsEditable(m_class)) return kArgErr;
+    }
+    if (!bytes_ && newLength != 0) {
+        TESSEL_REPORT(kDebugError, 0x1A85C7F3u) << "This shouldn't happen";
+        return kArgErr;
+    }
+    if (rest != 0) std::memmove(bytes_ + at + length, bytes_ + at + count, rest);
+    if (length < count) {
+        if (MgErr err = Resize(newLength)) return err;
+    }
+    if (source && length > 0) std::memcpy(bytes_ + at, source, static_cast<size_t>(length));
+    return kNoErr;
+}
+
+MgErr OVSubString::Assign(const void* bytes, int32 n) {
+    return WithoutOverlap(bytes, std::max(n, 0), [&](const void* source) {
+        const MgErr err = Resize(n);
+        if (!err && source && n > 0 && length_ == n) std::memcpy(bytes_, source, static_cast<size_t>(n));
+        return err;
+    });
+}
+
+MgErr OVSubString::Assign(const LStr* text) {
+    return Assign(OVSubString(text));
+}
+
+MgErr OVSubString::Assign(LStrHandle text) {
+    return Assign(OVSubString(text));
+}
+
+MgErr OVSubString::Assign(const OVString& text) {
+    return Assign(OVSubString(text));
+}
+
+MgErr OVSubString::Assign(const OVSubString& text) {
+    return Assign(text.bytes_, text.length_);
+}
+
+MgErr OVSubString::AssignCStr(CStr text) {
+    return Assign(text, LengthOf(text));
+}
+
+MgErr OVSubString::AssignPStr(ConstPStr text) {
+    return text ? Assign(text + 1, text[0]) : Assign(nullptr, 0);
+}
+
+MgErr OVSubString::AssignBSTR(const char16_t* text, int32 length) {
+    return Guarded([&] {
+        const std::string narrow = NarrowText(text, length);
+        return Assign(narrow.data(), static_cast<int32>(narrow.size()));
+    });
+}
+
+MgErr OVSubString::Replace(const OVSubString& source, int32 at, int32 count) {
+    return Replace(source.bytes_, source.length_, at, count);
+}
+
+MgErr OVSubString::ReplaceCStr(CStr source, int32 at, int32 count) {
+    return Replace(source, LengthOf(source), at, count);
+}
+
+MgErr OVSubString::ReplaceBSTR(const char16_t* source, int32 length, int32 at, int32 count) {
+    return Guarded([&] {
+        const std::string narrow = NarrowText(source, length);
+        return Replace(narrow.data(), static_cast<int32>(narrow.size()), at, count);
+    });
+}
+
+MgErr OVSubString::Insert(const void* source, int32 length, int32 at) {
+    return Replace(source, length, at, 0);
+}
+
+MgErr OVSubString::Insert(const OVSubString& source, int32 at) {
+    return Replace(source, at, 0);
+}
+
+MgErr OVSubString::InsertCStr(CStr source, int32 at) {
+    return ReplaceCStr(source, at, 0);
+}
+
+MgErr OVSubString::Append(const void* source, int32 length) {
+    return Replace(source, length, length_, 0);
+}
+
+MgErr OVSubString::Append(const OVSubString& source) {
+    return Replace(source, length_, 0);
+}
+
+MgErr OVSubString::AppendCStr(CStr source) {
+    return ReplaceCStr(source, length_, 0);
+}
+
+MgErr OVSubString::AppendBSTR(const char16_t* source, int32 length) {
+    return ReplaceBSTR(source, length, length_, 0);
+}
+
+MgErr OVSubString::SearchReplace(const OVSubString& find, const OVSubString& replacement, int32* count) {
+    int32 found = 0;
+    MgErr err = kNoErr;
+    for (int32 at = Search(find, 0); at >= 0 && !err; at = Search(find, at + replacement.length_ - find.length_ + 1)) {
+        ++found;
+        err = Replace(replacement, at, find.length_);
+    }
+    if (count) *count = found;
+    return err;
+}
+
+void OVSubString::TrimWhitespace() {
+    while (length_ > 0 && IsTrimmed(bytes_[0])) {
+        ++bytes_;
+        ++skipped_;
+        --length_;
+    }
+    while (length_ > 0 && IsTrimmed(bytes_[length_ - 1])) --length_;
+}
+
+// ---- comparing and searching ----
+
+int32 OVSubString::Compare(const void* bytes, int32 length) const {
+    if (length_ == 0) return length > 0 ? -1 : 0;
+    if (length <= 0) return 1;
+    return CompareBytes(bytes_, static_cast<size_t>(length_), static_cast<const uint8*>(bytes),
+                        static_cast<size_t>(length));
+}
+
+int32 OVSubString::CompareNC(const void* bytes, int32 length) const {
+    if (length_ == 0) return length > 0 ? -1 : 0;
+    if (length <= 0) return 1;
+    return CompareBytesNoCase(bytes_, static_cast<size_t>(length_), static_cast<const uint8*>(bytes),
+                              static_cast<size_t>(length));
+}
+
+int32 OVSubString::Compare(const OVSubString& text) const {
+    return Compare(text.bytes_, text.length_);
+}
+
+int32 OVSubString::CompareCStr(CStr text) const {
+    return Compare(text, LengthOf(text));
+}
+
+int32 OVSubString::CompareNC(const OVSubString& text) const {
+    return CompareNC(text.bytes_, text.length_);
+}
+
+int32 OVSubString::CompareNCCStr(CStr text) const {
+    return CompareNC(text, LengthOf(text));
+}
+
+int32 OVSubString::FindFirstOf(const void* set, int32 length, int32 start) const {
+    if (!set || length <= 0) return -1;
+    for (int32 at = std::max(start, 0); at < length_; ++at) {
+        if (std::memchr(set, bytes_[at], static_cast<size_t>(length))) return at;
+    }
+    return -1;
+}
+
+int32 OVSubString::FindFirstOf(const OVSubString& set, int32 start) const {
+    return FindFirstOf(set.bytes_, set.length_, start);
+}
+
+int32 OVSubString::FindFirstOfCStr(CStr set, int32 start) const {
+    return FindFirstOf(set, LengthOf(set), start);
+}
+
+int32 OVSubString::Search(const OVSubString& pattern, int32 start) const {
+    if (pattern.length_ == 0 || length_ == 0) return -1;
+    const std::string_view text(reinterpret_cast<const char*>(bytes_), static_cast<size_t>(length_));
+    const std::string_view sought(reinterpret_cast<const char*>(pattern.bytes_), static_cast<size_t>(pattern.length_));
+    const size_t at = text.find(sought, static_cast<size_t>(std::max(start, 0)));
+    return at == std::string_view::npos ? -1 : static_cast<int32>(at);
+}
+
+int32 OVSubString::SearchCStr(CStr pattern, int32 start) const {
+    return Search(pattern, start);
+}
+
+int32 OVSubString::SearchNC(const OVSubString& pattern, int32 start) const {
+    if (pattern.length_ == 0) return -1;
+    const auto n = static_cast<size_t>(pattern.length_);
+    for (int32 at = std::max(start, 0); at <= length_ - pattern.length_; ++at) {
+        if (FirstDifferenceNoCase(bytes_ + at, pattern.bytes_, n) == n) return at;
+    }
+    return -1;
+}
+
+int32 OVSubString::SearchNCCStr(CStr pattern, int32 start) const {
+    return SearchNC(pattern, start);
+}
+
+// ---- copying out ----
+
+void OVSubString::CopyToCStr(char* buffer, int32 size) const {
+    if (size < 1) {
+        TESSEL_REPORT(kDebugError, 0xF6093C5Eu) << "Bad Arg";
+        return;
+    }
+    const auto n = static_cast<size_t>(std::min(length_, size - 1));
+    if (n != 0) std::memcpy(buffer, bytes_, n);
+    buffer[n] = 0;
+}
+
+void OVSubString::CopyToPStr(PStr buffer) const {
+    buffer[0] = static_cast<uint8>(std::min(length_, kMaxPStr));
+    if (buffer[0] != 0) std::memmove(buffer + 1, bytes_, buffer[0]);
+}
+
+MgErr OVSubString::CopyToNarrowString(std::string& out) const {
+    return Guarded([&] {
+        out.assign(reinterpret_cast<const char*>(bytes_), static_cast<size_t>(length_));
+        return kNoErr;
+    });
+}
+
+// ---- printing ----
+
+MgErr OVSubStringPrintf(OVSubString* string, bool append, CStr format, va_list args) {
+    if (!string) {
+        TESSEL_REPORT(kDebugError, 0x83E51D29u) << "Bad string ptr";
+        return kArgErr;
+    }
+    const int32 formatLength = LengthOf(format);
+    va_list countingArgs;
+    va_copy(countingArgs, args);
+    const int32 added = SPrintfv(nullptr, 0, format, formatLength, countingArgs);
+    va_end(countingArgs);
+
+    const int32 start = append ? string->length_ : 0;
+    if (added > INT32_MAX - start) return kArgErr;
+    if (MgErr err = string->Resize(start + added)) return err;
+    if (added == 0) return kNoErr;
+    if (SPrintfv(reinterpret_cast<char*>(string->bytes_) + start, added, format, formatLength, args) != added) {
+        TESSEL_REPORT(kDebugError, 0x2CB470E8u) << "OVSubStringPrintf error";
+        return kArgErr;
+    }
+    return kNoErr;
+}
+
+MgErr OVString::Printf(CStr format, ...) {
+    OVSubString view(this);
+    va_list args;
+    va_start(args, format);
+    const MgErr err = OVSubStringPrintf(&view, false, format, args);
+    va_end(args);
+    return err;
+}
+
+MgErr OVString::Printf(const unsigned char* format, ...) {
+    OVSubString view(this);
+    va_list args;
+    va_start(args, format);
+    const MgErr err = OVSubStringPrintf(&view, false, reinterpret_cast<CStr>(format), args);
+    va_end(args);
+    return err;
+}
+
+MgErr OVString::AppendPrintf(CStr format, ...) {
+    OVSubString view(this);
+    va_list args;
+    va_start(args, format);
+    const MgErr err = OVSubStringPrintf(&view, true, format, args);
+    va_end(args);
+    return err;
+}
+
+MgErr OVString::AppendPrintf(const unsigned char* format, ...) {
+    OVSubString view(this);
+    va_list args;
+    va_start(args, format);
+    const MgErr err = OVSubStringPrintf(&view, true, reinterpret_cast<CStr>(format), args);
+    va_end(args);
+    return err;
+}
+
+MgErr OVSubString::Printf(CStr format, ...) {
+    va_list args;
+    va_start(args, format);
+    const MgErr err = OVSubStringPrintf(this, false, format, args);
+    va_end(args);
+    return err;
+}
+
+MgErr OVSubString::Printf(const unsigned char* format, ...) {
+    va_list args;
+    va_start(args, format);
+    const MgErr err = OVSubStringPrintf(this, false, reinterpret_cast<CStr>(format), args);
+    va_end(args);
+    return err;
+}
+
+MgErr OVSubString::AppendPrintf(CStr format, ...) {
+    va_list args;
+    va_start(args, format);
+    const MgErr err = OVSubStringPrintf(this, true, format, args);
+    va_end(args);
+    return err;
+}
+
+MgErr OVSubString::AppendPrintf(const unsigned char* format, ...) {
+    va_list args;
+    va_start(args, format);
+    const MgErr err = OVSubStringPrintf(this, true, reinterpret_cast<CStr>(format), args);
+    va_end(args);
+    return err;
+}
+
+}  // namespace tessel
