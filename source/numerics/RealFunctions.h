@@ -1,0 +1,207 @@
+/* The real functions of the math family, for float, double and the extended real. What the standard library has in the
+   same form is used from there directly. */
+#pragma once
+
+#include <bit>
+#include <cmath>
+#include <limits>
+#include <type_traits>
+
+#include "numerics/Extended.h"
+
+namespace tessel::real {
+
+template <class T>
+constexpr T kInfinity = std::numeric_limits<T>::infinity();
+
+/* The NaN of a precision: all bits set in a single or double, the sign clear in an extended real. */
+template <class T>
+T NaN() {
+    if constexpr (std::is_same_v<T, float>) {
+        return std::bit_cast<float>(~uint32{0});
+    } else if constexpr (std::is_same_v<T, double>) {
+        return std::bit_cast<double>(~uint64{0});
+    } else {
+        return ToExtended({~uint64{0}, kExtendedExponentMask});
+    }
+}
+
+/* The precision in which functions made of several steps are computed, so that the result is rounded once. */
+template <class T>
+using Wider = std::conditional_t<std::is_same_v<T, float>, double, Extended>;
+
+template <class T>
+T Widen(T x) = delete;
+inline double Widen(float x) {
+    return x;
+}
+inline Extended Widen(double x) {
+    return x;
+}
+inline Extended Widen(Extended x) {
+    return x;
+}
+
+// ---- logarithms ----------------------------------------------------------------------------------------------------
+
+/* What a logarithm is where it has no value: -infinity at 0, else (negative or NaN) a NaN. */
+template <class T>
+T LogOutside(T distanceFromPole) {
+    return distanceFromPole == 0 ? -kInfinity<T> : NaN<T>();
+}
+
+template <class T>
+T Logn(T x) {
+    return x > 0 ? std::log(x) : LogOutside(x);
+}
+
+template <class T>
+T Log10(T x) {
+    return x > 0 ? std::log10(x) : LogOutside(x);
+}
+
+template <class T>
+T Log2(T x) {
+    return x > 0 ? std::log2(x) : LogOutside(x);
+}
+
+template <class T>
+T Lognp1(T x) {
+    return x > -1 ? std::log1p(x) : LogOutside(x + 1);
+}
+
+template <class T>
+T Logx(T base, T x) {
+    const auto quotient = Logn(Widen(x)) / Logn(Widen(base));
+    return std::isnan(quotient) ? NaN<T>() : static_cast<T>(quotient);
+}
+
+// ---- powers --------------------------------------------------------------------------------------------------------
+
+template <class T>
+T Pow10(T x) {
+    return std::pow(T{10}, x);
+}
+
+/* x times 2 to the power trunc(n). */
+template <class T>
+T Scale(T x, T n) {
+    constexpr T kFarthest = 40000;  // moves any value out of range
+    if (std::isnan(n)) return n;
+    if (std::isinf(n)) return n > 0 ? x * n : x / n;
+    const T bounded = std::fmin(std::fmax(n, -kFarthest), kFarthest);
+    return std::scalbn(x, static_cast<int>(bounded));
+}
+
+template <class T>
+struct MantissaAndExponent {
+    T mantissa;
+    T exponent;
+};
+
+template <class T>
+MantissaAndExponent<T> GetMantExp(T x) {
+    if (x == 0) return {0, 0};
+    if (std::isnan(x)) return {x, x};
+    if (std::isinf(x)) return {x, kInfinity<T>};
+    int exponent = 0;
+    const T half = std::frexp(x, &exponent);
+    return {2 * half, static_cast<T>(exponent - 1)};
+}
+
+// ---- trigonometry --------------------------------------------------------------------------------------------------
+
+template <class T>
+T Sec(T x) {
+    return static_cast<T>(1 / std::cos(Widen(x)));
+}
+
+template <class T>
+T Csc(T x) {
+    return static_cast<T>(1 / std::sin(Widen(x)));
+}
+
+template <class T>
+T Cot(T x) {
+    return static_cast<T>(1 / std::tan(Widen(x)));
+}
+
+template <class T>
+T Sinc(T x) {
+    return x == 0 ? T{1} : static_cast<T>(std::sin(Widen(x)) / Widen(x));
+}
+
+/* Angle of the point (x, y). */
+template <class T>
+T Atan2(T x, T y) {
+    return std::atan2(y, x);
+}
+
+// ---- arithmetic ----------------------------------------------------------------------------------------------------
+
+template <class T>
+T Recip(T x) {
+    return 1 / x;
+}
+
+template <class T>
+T Inc(T x) {
+    return x + 1;
+}
+
+template <class T>
+T Dec(T x) {
+    return x - 1;
+}
+
+template <class T>
+T Neg(T x) {
+    return -x;
+}
+
+/* Halves to even. */
+template <class T>
+T Round(T x) {
+    return std::nearbyint(x);
+}
+
+template <class T>
+T Sign(T x) {
+    if (std::isnan(x)) return NaN<T>();
+    return x > 0 ? T{1} : x < 0 ? T{-1} : T{0};
+}
+
+/* x - floor(x / y) y, without the rounding of the quotient. */
+template <class T>
+T Mod(T x, T y) {
+    const T remainder = std::fmod(x, y);
+    return remainder != 0 && (remainder < 0) != (y < 0) ? remainder + y : remainder;
+}
+
+template <class T>
+struct QuotientAndRemainder {
+    T quotient;
+    T remainder;
+};
+
+template <class T>
+QuotientAndRemainder<T> QRem(T x, T y) {
+    const T quotient = std::floor(x / y);
+    if (!std::isfinite(x) || !std::isfinite(y) || y == 0) return {quotient, x - y * quotient};
+    const T remainder = Mod(x, y);
+    return {std::isinf(quotient) ? quotient : std::nearbyint((x - remainder) / y), remainder};
+}
+
+template <class T>
+struct MaximumAndMinimum {
+    T max;
+    T min;
+};
+
+template <class T>
+MaximumAndMinimum<T> MaxMin(T x, T y) {
+    if (std::isnan(x) || std::isnan(y)) return {NaN<T>(), NaN<T>()};
+    return {y > x ? y : x, y < x ? y : x};
+}
+
+}  // namespace tessel::real
