@@ -26,7 +26,7 @@ private:
     uint32 maximum_;
 };
 
-/* Makes the texts, one for each path, in their order. kArgErr for a null `out`. */
+/* Makes the texts, one for each path, in their order. kArgErr for a null `out`; raises what a writer raises. */
 class TESSEL_API PathRef::AbbreviationStyle {
 public:
     AbbreviationStyle();

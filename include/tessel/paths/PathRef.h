@@ -272,7 +272,11 @@ public:
     static void SetPathTooLongString(const StringType& text);
 
 private:
-    friend class PathManager;
+    friend struct PathRefAccess;
+
+    void Assign(PathItemElement* element);
+    void TakeOver(PathItemElement* element) noexcept;
+    StringType& TextCache();
 
     PathItemElement* mPathElement = nullptr;
     StringType* mTextCache = nullptr;

@@ -58,8 +58,8 @@ public:
 
 private:
     bool Room(uint32 n, uint8*& room);
-    uint32 WriteZeros(uint32 n);
-    uint32 WriteCounted(const void* bytes, uint32 count);
+    uint32 WriteByteCounted(const void* bytes, uint32 count, uint32 align);
+    uint32 WriteLongCounted(const void* bytes, uint32 count);
 
     const Endianizer* endianizer_;
     MgErr error_ = kNoErr;

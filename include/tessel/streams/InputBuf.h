@@ -66,12 +66,13 @@ public:
 private:
     LStrHandle text_;
     MgErr error_;
+    uint32 size_;
     uint32 position_ = 0;
 };
 
 /* A new buffer, or null when memory is short (the string handle then stays with the caller). The caller deletes it. */
-TESSEL_API InputBuf* CreateMemInputBuf(const void* data, uint32 size);
-TESSEL_API InputBuf* CreateLStrInputBuf(LStrHandle& text);
+TESSEL_API MemInputBuf* CreateMemInputBuf(const void* data, uint32 size);
+TESSEL_API LStrInputBuf* CreateLStrInputBuf(LStrHandle& text);
 
 }  // namespace tessel
 #endif

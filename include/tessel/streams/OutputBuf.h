@@ -102,8 +102,8 @@ private:
 };
 
 /* A new buffer, or null when memory is short. The caller deletes it. */
-TESSEL_API OutputBuf* CreatePreflightOutputBuf();
-TESSEL_API OutputBuf* CreateStaticOutputBuf(void* data, uint32 capacity);
+TESSEL_API PreflightOutputBuf* CreatePreflightOutputBuf();
+TESSEL_API StaticOutputBuf* CreateStaticOutputBuf(void* data, uint32 capacity);
 TESSEL_API LStrOutputBuf* CreateLStrOutputBuf(uint32 initialCapacity);
 
 }  // namespace tessel

@@ -1,0 +1,202 @@
+#include "paths/PathItemElement.h"
+
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/strings/StringUtils.h>
+
+#include <algorithm>
+#include <new>
+
+#include "paths/PathItemStorage.h"
+
+namespace tessel {
+namespace {
+
+ThMutex gPathMutex = nullptr;
+thread_local uint32 tPathLockDepth = 0;
+
+}  // namespace
+
+// ---- the path mutex -------------------------------------------------------------------------------------------------
+
+void PathLock::Acquire() {
+    if (tPathLockDepth++ == 0) ThMutexAcquire(gPathMutex);
+}
+
+void PathLock::Release() {
+    if (--tPathLockDepth == 0) ThMutexRelease(gPathMutex);
+}
+
+MgErr PathLock::CreateMutex() {
+    return ThMutexCreate(&gPathMutex, "PathMutex");
+}
+
+void PathLock::DestroyMutex() {
+    ThMutexDestroy(gPathMutex);
+    gPathMutex = nullptr;
+}
+
+ThMutex PathLock::Mutex() {
+    return gPathMutex;
+}
+
+// ---- walking --------------------------------------------------------------------------------------------------------
+
+const PathItemElement* PathItemElement::Base() const {
+    const PathItemElement* element = this;
+    while (element->parent_) element = element->parent_;
+    return element;
+}
+
+PathItemElement* PathItemElement::AtDepth(int32 depth) const {
+    PathItemElement* element = const_cast<PathItemElement*>(this);
+    while (element->depth_ > depth) element = element->parent_;
+    return element;
+}
+
+PathItemList::PathItemList(const PathItemElement* last) : count_(last ? last->Depth() : 0) {
+    if (static_cast<size_t>(count_) > few_.size()) many_.resize(static_cast<size_t>(count_));
+    items_ = many_.empty() ? few_.data() : many_.data();
+    for (int32 i = count_; i-- > 0; last = last->Parent()) items_[i] = last;
+}
+
+// ---- children -------------------------------------------------------------------------------------------------------
+
+// Where the child of that name stands, or else where it belongs.
+PathItemElement::Children::iterator PathItemElement::FindChild(const std::string& name, int32 hash, bool& found) {
+    auto position = std::lower_bound(children_.begin(), children_.end(), hash,
+                                     [](const ChildEntry& entry, int32 wanted) { return entry.hash < wanted; });
+    for (; position != children_.end() && position->hash == hash; ++position) {
+        if (position->element->name_ == name) {
+            found = true;
+            return position;
+        }
+    }
+    found = false;
+    return position;
+}
+
+PathItemElement* PathItemElement::Child(const std::string& name) {
+    const int32 hash = StringUtils::Hash(name, false);
+    PathLock lock;
+    bool found;
+    const auto position = FindChild(name, hash, found);
+    if (!found) return MakeChild(name, hash, position);
+    position->element->Retain();
+    return position->element;
+}
+
+PathItemElement* PathItemElement::MakeChild(const std::string& name, int32 hash, Children::iterator position) {
+    PathItemElement* child = PathItemStorage::Allocate();
+    if (!child) return nullptr;
+    try {
+        child->name_ = name;
+        children_.insert(position, ChildEntry{hash, child});
+    } catch (const std::bad_alloc&) {
+        child->Vacate();
+        return nullptr;
+    }
+    child->parent_ = this;
+    child->hash_ = hash;
+    child->depth_ = depth_ + 1;
+    child->retains_.store(1, std::memory_order_relaxed);
+    checked_ = false;
+    Retain();
+    return child;
+}
+
+// ---- the end of an element ------------------------------------------------------------------------------------------
+
+void PathItemElement::Release() {
+    // Only who gives up the last retain needs the lock, so that nobody finds a child that is about to end.
+    int32 retains = retains_.load(std::memory_order_relaxed);
+    while (retains > 1) {
+        if (retains_.compare_exchange_weak(retains, retains - 1, std::memory_order_release, std::memory_order_relaxed))
+            return;
+    }
+    PathItemCacheList caches;
+    PathLock lock;
+    PathItemElement* element = this;
+    while (element) {
+        const int32 left = element->retains_.fetch_sub(1, std::memory_order_acq_rel) - 1;
+        if (left < 0) element->ReportOverRelease();
+        if (left != 0) return;
+        element = element->End(caches);
+    }
+}
+
+// Takes an element that nobody retains out of the tree. Its parent loses a retain: the caller's to give up.
+PathItemElement* PathItemElement::End(PathItemCacheList& caches) {
+    caches.Add(cache_);
+    PathItemElement* parent = parent_;
+    if (parent) {
+        bool found;
+        const auto position = parent->FindChild(name_, hash_, found);
+        if (found) parent->children_.erase(position);
+    }
+    Vacate();
+    return parent;
+}
+
+void PathItemElement::ReportOverRelease() {
+    const int32 count = retains_.fetch_add(1, std::memory_order_relaxed);
+    TESSEL_REPORT(kDebugError, 0x3C5A9E10u) << "name= " << name_;
+    TESSEL_REPORT(kDebugError, 0x3C5A9E11u) << "element= " << DbgFmtPtr(this);
+    TESSEL_REPORT(kDebugError, 0x3C5A9E12u) << "count= " << count;
+    TESSEL_REPORT(kDebugError, 0x3C5A9E13u) << "Release of PathItemElement, but we did not have enough retains";
+}
+
+void PathItemElement::GiveBackUnusedRoom() {
+    if (children_.empty()) Children().swap(children_);
+}
+
+void PathItemElement::TakeCaches(PathItemCacheList& list) {
+    std::vector<PathItemElement*, TrackedAllocator<PathItemElement*>> waiting{this};
+    while (!waiting.empty()) {
+        PathItemElement* element = waiting.back();
+        waiting.pop_back();
+        list.Add(element->cache_);
+        for (const ChildEntry& entry : element->children_) waiting.push_back(entry.element);
+    }
+}
+
+// ---- checks ---------------------------------------------------------------------------------------------------------
+
+PathItemElement::Fault PathItemElement::Check() {
+    if (parent_ == this) return Fault::kOwnParent;
+    if (!parent_ && depth_ != 0) return Fault::kBaseDepth;
+    if (parent_ && depth_ != parent_->depth_ + 1) return Fault::kDepth;
+    if (checked_) return Fault::kNone;
+    int32 previous = INT32_MIN;
+    for (const ChildEntry& entry : children_) {
+        if (entry.hash < previous || entry.element->parent_ != this) return Fault::kChildren;
+        previous = entry.hash;
+    }
+    checked_ = true;
+    return Fault::kNone;
+}
+
+// ---- slots ----------------------------------------------------------------------------------------------------------
+
+bool PathItemElement::Claim() {
+    uint32 unused = 0;
+    return inUse_.compare_exchange_strong(unused, 1, std::memory_order_acq_rel);
+}
+
+void PathItemElement::BecomeBase(const char* name) {
+    name_ = name;
+    retains_.store(1, std::memory_order_relaxed);
+}
+
+void PathItemElement::Vacate() {
+    std::string().swap(name_);
+    Children().swap(children_);
+    parent_ = nullptr;
+    depth_ = 0;
+    hash_ = 0;
+    checked_ = false;
+    retains_.store(0, std::memory_order_relaxed);
+    inUse_.store(0, std::memory_order_release);
+    PathItemStorage::SlotVacated(this);
+}
+
+}  // namespace tessel

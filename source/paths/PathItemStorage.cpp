@@ -1,0 +1,343 @@
+#include "paths/PathItemStorage.h"
+
+#include <tessel/diagnostics/DebugStream.h>
+
+#include <bit>
+#include <map>
+#include <new>
+
+#include "paths/PathItemElement.h"
+
+namespace tessel {
+namespace {
+
+constexpr uint32 kSlotsPerBlock = 512;
+constexpr int kBaseCount = 5;
+
+struct Block {
+    Block* next = this;
+    uint32 cursor = kSlotsPerBlock - 1;
+    std::atomic<uint32> freeSlots{kSlotsPerBlock};
+    PathItemElement slots[kSlotsPerBlock];
+};
+
+// A block lies at a multiple of this, so that the address of a slot gives that of its block.
+constexpr size_t kBlockAlignment = std::bit_ceil(sizeof(Block));
+
+Block* BlockOf(const PathItemElement* element) {
+    return reinterpret_cast<Block*>(reinterpret_cast<uintptr_t>(element) & ~uintptr_t{kBlockAlignment - 1});
+}
+
+// The addresses of all blocks: a hash table that is read without a lock, by any number of threads, while one who holds
+// the storage mutex changes it. It grows by being replaced; tables that were replaced stay until the end.
+class BlockSet {
+public:
+    bool Contains(const Block* block) const {
+        const Table* table = table_.load(std::memory_order_acquire);
+        if (!table) return false;
+        for (size_t i = Hash(block);; ++i) {
+            const Block* entry = table->entries[i & table->mask].load(std::memory_order_relaxed);
+            if (entry == block) return true;
+            if (!entry) return false;
+        }
+    }
+
+    bool Add(Block* block) {
+        Table* table = table_.load(std::memory_order_relaxed);
+        if (!table || (table->used + 1) * 2 > table->mask + 1) table = Grow(table);
+        if (!table) return false;
+        Put(*table, block);
+        return true;
+    }
+
+    void Remove(const Block* block) {
+        Table* table = table_.load(std::memory_order_relaxed);
+        size_t i = Hash(block);
+        while (table->entries[i & table->mask].load(std::memory_order_relaxed) != block) ++i;
+        table->entries[i & table->mask].store(Removed(), std::memory_order_relaxed);
+    }
+
+    // No other thread may be reading.
+    void Clear() {
+        Table* table = table_.exchange(nullptr, std::memory_order_relaxed);
+        while (table) {
+            Table* previous = table->previous;
+            delete[] table->entries;
+            delete table;
+            table = previous;
+        }
+    }
+
+private:
+    struct Table {
+        size_t mask;
+        size_t used;  // entries that were ever filled
+        std::atomic<const Block*>* entries;
+        Table* previous;
+    };
+
+    static size_t Hash(const Block* block) { return reinterpret_cast<uintptr_t>(block) / kBlockAlignment; }
+    static const Block* Removed() { return reinterpret_cast<const Block*>(uintptr_t{1}); }
+
+    static void Put(Table& table, const Block* block) {
+        size_t i = Hash(block);
+        while (table.entries[i & table.mask].load(std::memory_order_relaxed)) ++i;
+        table.entries[i & table.mask].store(block, std::memory_order_release);
+        ++table.used;
+    }
+
+    Table* Grow(Table* old) {
+        const size_t size = old ? (old->mask + 1) * 2 : 16;
+        auto* entries = new (std::nothrow) std::atomic<const Block*>[size]();
+        Table* table = new (std::nothrow) Table{size - 1, 0, entries, old};
+        if (!entries || !table) {
+            delete[] entries;
+            delete table;
+            return nullptr;
+        }
+        for (size_t i = 0; old && i <= old->mask; ++i) {
+            const Block* block = old->entries[i].load(std::memory_order_relaxed);
+            if (block && block != Removed()) Put(*table, block);
+        }
+        table_.store(table, std::memory_order_release);
+        return table;
+    }
+
+    std::atomic<Table*> table_{nullptr};
+};
+
+using Locations = std::map<std::string, PathItemElement*, std::less<>,
+                           TrackedAllocator<std::pair<const std::string, PathItemElement*>>>;
+
+ThMutex gStorageMutex = nullptr;
+Block* gCurrentBlock = nullptr;
+BlockSet gBlocks;
+Locations* gLocations = nullptr;
+
+std::atomic<PathItemElement*> gStandards[kBaseCount];
+std::atomic<bool> gStandardsRead{false};
+
+Block* NewBlock() {
+    void* room = ::operator new (sizeof(Block), std::align_val_t{kBlockAlignment}, std::nothrow);
+    if (!room) return nullptr;
+    Block* block = new (room) Block;
+    if (!gBlocks.Add(block)) {
+        block->~Block();
+        ::operator delete (room, std::align_val_t{kBlockAlignment});
+        return nullptr;
+    }
+    if (gCurrentBlock) {
+        block->next = gCurrentBlock->next;
+        gCurrentBlock->next = block;
+    }
+    gCurrentBlock = block;
+    return block;
+}
+
+// Frees the block after `before`, which may be `before` itself.
+void FreeBlockAfter(Block* before) {
+    Block* block = before->next;
+    before->next = block->next;
+    if (gCurrentBlock == block) gCurrentBlock = before == block ? nullptr : before;
+    gBlocks.Remove(block);
+    block->~Block();
+    ::operator delete (block, std::align_val_t{kBlockAlignment});
+}
+
+template <class Visitor>
+void ForEachBlock(Visitor visit) {
+    Block* block = gCurrentBlock;
+    if (!block) return;
+    do {
+        visit(*block);
+        block = block->next;
+    } while (block != gCurrentBlock);
+}
+
+bool IsUnused(const Block& block) {
+    return block.freeSlots.load(std::memory_order_acquire) == kSlotsPerBlock;
+}
+
+PathItemElement* ClaimSlot(Block& block) {
+    if (block.freeSlots.load(std::memory_order_acquire) == 0) return nullptr;
+    for (uint32 i = 0; i < kSlotsPerBlock; ++i) {
+        PathItemElement& slot = block.slots[block.cursor];
+        block.cursor = block.cursor ? block.cursor - 1 : kSlotsPerBlock - 1;
+        if (slot.Claim()) {
+            block.freeSlots.fetch_sub(1, std::memory_order_relaxed);
+            return &slot;
+        }
+    }
+    return nullptr;
+}
+
+// The first free slot from the current block on. That block becomes the current one.
+PathItemElement* ClaimAnySlot() {
+    Block* block = gCurrentBlock;
+    if (!block) return nullptr;
+    do {
+        if (PathItemElement* slot = ClaimSlot(*block)) {
+            gCurrentBlock = block;
+            return slot;
+        }
+        block = block->next;
+    } while (block != gCurrentBlock);
+    return nullptr;
+}
+
+uint32 FreeUnusedBlocks() {
+    uint32 unvisited = 0;
+    ForEachBlock([&](Block&) { ++unvisited; });
+    uint32 bytes = 0;
+    for (Block* before = gCurrentBlock; unvisited > 0; --unvisited) {
+        if (IsUnused(*before->next)) {
+            FreeBlockAfter(before);
+            bytes += sizeof(Block);
+        } else {
+            before = before->next;
+        }
+    }
+    return bytes;
+}
+
+template <class Visitor>
+void ForEachLiveElement(Block& block, Visitor visit) {
+    for (PathItemElement& slot : block.slots)
+        if (slot.InUse()) visit(slot);
+}
+
+void ReportLiveElements(Block& block) {
+    const uint32 live = kSlotsPerBlock - block.freeSlots.load(std::memory_order_relaxed);
+    TESSEL_REPORT(kDebugWarning, 0x7A10D2C4u) << "Killing a storage buffer with " << live << " live object(s)";
+    ForEachLiveElement(block, [](const PathItemElement& element) {
+        TESSEL_REPORT(kDebugWarning, 0x7A10D2C5u) << "element= " << DbgFmtPtr(&element);
+        TESSEL_REPORT(kDebugWarning, 0x7A10D2C6u) << "name= " << element.Name();
+        TESSEL_REPORT(kDebugWarning, 0x7A10D2C7u) << "parent= " << DbgFmtPtr(element.Parent());
+    });
+}
+
+struct LeakedElement {
+    int32 retains;
+    std::string name;
+};
+using LeakedElements = std::vector<LeakedElement, TrackedAllocator<LeakedElement>>;
+
+// Elements that paths still refer to. The holds of children are no leaks, nor are the bases.
+LeakedElements FindLeakedElements() {
+    LeakedElements leaked;
+    ForEachBlock([&](Block& block) {
+        ForEachLiveElement(block, [&](const PathItemElement& element) {
+            const int32 retains = element.OutsideRetains();
+            if (retains > 0 && element.Parent()) leaked.push_back({retains, element.Name()});
+        });
+    });
+    return leaked;
+}
+
+}  // namespace
+
+// ---- start and stop -------------------------------------------------------------------------------------------------
+
+MgErr PathItemStorage::Start() {
+    return ThMutexCreate(&gStorageMutex, "PathStorageMutex");
+}
+
+void PathItemStorage::Stop() {
+    FreeUnusedBlocks();
+    ForEachBlock(ReportLiveElements);
+    if (!gCurrentBlock) gBlocks.Clear();
+    gStandardsRead.store(false, std::memory_order_relaxed);
+    ThMutexDestroy(gStorageMutex);
+    gStorageMutex = nullptr;
+}
+
+// ---- slots ----------------------------------------------------------------------------------------------------------
+
+PathItemElement* PathItemStorage::Allocate() {
+    PathItemElement* element = nullptr;
+    {
+        ThMutexHolder lock(gStorageMutex);
+        element = ClaimAnySlot();
+        if (!element && NewBlock()) element = ClaimSlot(*gCurrentBlock);
+    }
+    if (!element) TESSEL_REPORT(kDebugError, 0x5E0B77D9u) << "Out of memory!";
+    return element;
+}
+
+void PathItemStorage::SlotVacated(const PathItemElement* element) {
+    BlockOf(element)->freeSlots.fetch_add(1, std::memory_order_release);
+}
+
+bool PathItemStorage::Owns(const PathItemElement* element) {
+    const Block* block = BlockOf(element);
+    if (!block || !gBlocks.Contains(block)) return false;
+    const uintptr_t offset = reinterpret_cast<uintptr_t>(element) - reinterpret_cast<uintptr_t>(block->slots);
+    return offset < sizeof block->slots && offset % sizeof(PathItemElement) == 0;
+}
+
+// ---- bases ----------------------------------------------------------------------------------------------------------
+
+void PathItemStorage::SetStandard(PathRef::PathBase base, PathItemElement* element) {
+    if (gStandardsRead.load(std::memory_order_relaxed) && element)
+        TESSEL_REPORT(kDebugWarning, 0x90C3F1A8u)
+            << "Possible threading issue, see documentation note for PathItemStorage::SetStandard!";
+    if (element) element->Retain();
+    if (PathItemElement* previous = gStandards[base].exchange(element)) previous->Release();
+}
+
+PathItemElement* PathItemStorage::Standard(PathRef::PathBase base) {
+    if (!gStandardsRead.load(std::memory_order_relaxed)) gStandardsRead.store(true, std::memory_order_relaxed);
+    return gStandards[base].load(std::memory_order_acquire);
+}
+
+// ---- standard locations ---------------------------------------------------------------------------------------------
+
+MgErr PathItemStorage::AddLocation(const char* name, PathItemElement* element) {
+    ThMutexHolder lock(gStorageMutex);
+    if (!gLocations) gLocations = new (TrackedNew(sizeof(Locations))) Locations;
+    if (!gLocations->emplace(name, element).second) return kArgErr;
+    element->Retain();
+    return kNoErr;
+}
+
+PathItemElement* PathItemStorage::FindLocation(const char* name) {
+    ThMutexHolder lock(gStorageMutex);
+    if (!gLocations) return nullptr;
+    const auto found = gLocations->find(std::string_view(name));
+    if (found == gLocations->end()) return nullptr;
+    found->second->Retain();
+    return found->second;
+}
+
+void PathItemStorage::ForgetLocations() {
+    Locations* locations;
+    {
+        ThMutexHolder lock(gStorageMutex);
+        locations = gLocations;
+        gLocations = nullptr;
+    }
+    if (!locations) return;
+    for (const auto& entry : *locations) entry.second->Release();
+    locations->~Locations();
+    TrackedFree(locations);
+}
+
+// ---- garbage collection ---------------------------------------------------------------------------------------------
+
+uint32 PathItemStorage::GarbageCollect(PathRef::OptimizationMethod method) {
+    uint32 bytes = 0;
+    LeakedElements leaked;
+    {
+        PathLock pathLock;
+        ThMutexHolder lock(gStorageMutex);
+        if (method == PathRef::kFreeUnusedAndReport) leaked = FindLeakedElements();
+        if (method != PathRef::kCountOnly) bytes = FreeUnusedBlocks();
+    }
+    for (const LeakedElement& element : leaked)
+        TESSEL_REPORT(kDebugWarning, 0x21F4B9E3u)
+            << "Leaked Path Element: " << element.retains << " refs to " << element.name;
+    TESSEL_REPORT(kDebugInfo, 0x44D8E026u) << "Path Garbage Collect: " << bytes << " bytes reclaimed";
+    return bytes;
+}
+
+}  // namespace tessel

@@ -1,0 +1,227 @@
+// The flattened form, byte by byte, and what is damaged.
+#include <tessel/base/OVExcept.h>
+#include <tessel/streams/BinDataReader.h>
+#include <tessel/streams/BinDataWriter.h>
+
+#include "paths/PathTestSupport.h"
+#include "platform/CodePage.h"
+
+namespace tessel {
+namespace {
+
+using namespace test;
+using std::string_literals::operator""s;
+
+class PathFlatten : public PathTest {
+protected:
+    ~PathFlatten() override { platform::SetCodePage(platform::kCodePageUtf8); }
+
+    static std::string Flattened(const PathRef& path) {
+        PathRef copy(path);
+        std::string bytes(static_cast<size_t>(FFlattenPath(&copy, nullptr)), '#');
+        EXPECT_EQ(static_cast<int32>(bytes.size()), FFlattenPath(&copy, reinterpret_cast<uint8*>(bytes.data())));
+        return bytes;
+    }
+
+    // What is read, and whether all of the bytes were; the code of the failure otherwise.
+    static std::string Unflattened(const std::string& bytes, const Endianizer* order = BigEndianizer()) {
+        MemInputBuf buffer(bytes.data(), static_cast<uint32>(bytes.size()));
+        Path path = nullptr;
+        const MgErr err = FUnFlattenPath2(&buffer, &path, order);
+        if (err) return std::to_string(err);
+        std::string shown = Show(path) + (buffer.GetBytesRead() == bytes.size() ? "" : " +");
+        FDestroyPath(&path);
+        return shown;
+    }
+};
+
+TEST_F(PathFlatten, BytesOfBothFormats) {
+    struct Row {
+        PathRef path;
+        std::string bytes;
+    };
+    const Row rows[] = {
+        {Abs({"C", "dir"}),
+         "PTH0\0\0\0\x0A\0\0\0\x02\x01"s
+         "C\x03"
+         "dir"},
+        {Rel({"..", "a"}),
+         "PTH0\0\0\0\x07\0\x01\0\x02\0\x01"s
+         "a"},
+        {Unc({"s"}),
+         "PTH0\0\0\0\x06\0\x03\0\x01\x01"s
+         "s"},
+        {PathRef(), "PTH0\0\0\0\x04\0\x02\0\0"s},
+        {Abs({}), "PTH0\0\0\0\x04\0\0\0\0"s},
+        {Abs({"C", "\xC3\xA9"}),
+         "PTH1\0\0\0\x0B"
+         "abs \0\x01"
+         "C\0\x02\xC3\xA9"s},
+        {Rel({"..", "\xC3\xA9"}),
+         "PTH1\0\0\0\x0A"
+         "rel \0\0\0\x02\xC3\xA9"s},
+    };
+    for (const Row& row : rows) {
+        EXPECT_EQ(row.bytes, Flattened(row.path));
+        EXPECT_EQ(Show(row.path), Unflattened(row.bytes));
+        EXPECT_EQ(row.bytes.size(), row.path.FlattenedSize(row.bytes[3] == '0' ? PathRef::kPTH0 : PathRef::kPTH1));
+    }
+    char block[64];
+    StaticOutputBuf buffer(block, sizeof block);
+    uint32 size;
+    EXPECT_EQ(kNoErr, Unc({"s"}).Flatten(&buffer, PathRef::kPTH1, &size, LittleEndianizer()));
+    EXPECT_EQ("PTH1\x07\0\0\0unc \x01\0s"s, std::string(block, size));
+    EXPECT_EQ("unc:s", Unflattened("PTH1\x07\0\0\0unc \x01\0s"s, LittleEndianizer()));
+    EXPECT_EQ(kUnsupportedErr,
+              Abs({}).Flatten(&buffer, static_cast<PathRef::FlattenFormat>(2), &size, BigEndianizer()));
+}
+
+TEST_F(PathFlatten, TheNullPathIsNoPath) {
+    const std::string null = "PTH0\0\0\0\0\0\0\0\0"s;
+    std::string bytes(12, '#');
+    EXPECT_EQ(12, FFlattenPath(nullptr, reinterpret_cast<uint8*>(bytes.data())));
+    EXPECT_EQ(null, bytes);
+    EXPECT_EQ(null, Flattened(PathRef(PathRef::kNullPath)));
+    Path path = nullptr;
+    EXPECT_EQ(12, FUnFlattenPath(reinterpret_cast<const uint8*>(null.data()), &path));
+    EXPECT_EQ(nullptr, path);
+    path = FEmptyPath(nullptr);
+    EXPECT_EQ(0, FUnFlattenPath(reinterpret_cast<const uint8*>(null.data()), &path));
+    EXPECT_EQ("abs:", Show(path));
+    FDestroyPath(&path);
+}
+
+TEST_F(PathFlatten, LongNamesAndTheSettingChooseTheFormat) {
+    EXPECT_EQ('0', Flattened(Abs({std::string(255, 'n').c_str()}))[3]);
+    const PathRef longName = Abs({std::string(256, 'n').c_str()});
+    EXPECT_EQ('1', Flattened(longName)[3]);
+    EXPECT_EQ(Show(longName), Unflattened(Flattened(longName)));
+    EXPECT_EQ(kArgErr, CodeOf([&] { longName.FlattenedSize(PathRef::kPTH0); }));
+    PathRef::Setting("utf8");
+    EXPECT_EQ('1', Flattened(Abs({"C"}))[3]);
+    PathRef::Setting("sysenc");
+    EXPECT_EQ('0', Flattened(Abs({"C"}))[3]);
+}
+
+TEST_F(PathFlatten, NamesAreUtf8WhateverTheCodePage) {
+    ASSERT_TRUE(platform::SetCodePage(1252));
+    const std::string bytes =
+        "PTH1\0\0\0\x0A"
+        "abs \0\x04"
+        "b\xC3\xA9"
+        "b"s;
+    EXPECT_EQ(bytes, Flattened(Abs({"b\xE9"
+                                    "b"})));
+    EXPECT_EQ(
+        "abs:b\xE9"
+        "b",
+        Unflattened(bytes));
+    ASSERT_TRUE(platform::SetCodePage(932));
+    const std::string kanji =
+        "PTH1\0\0\0\x09"
+        "abs \0\x03\xE8\xA1\xA8"s;  // U+8868
+    EXPECT_EQ(kanji, Flattened(Abs({"\x95\x5C"})));
+    EXPECT_EQ("abs:\x95\x5C", Unflattened(kanji));
+}
+
+TEST_F(PathFlatten, DamagedBytes) {
+    struct Row {
+        std::string bytes;
+        const char* result;
+    };
+    const Row rows[] = {
+        {"", "74"},
+        {"PTH0\0\0\0"s, "74"},
+        {"PTH2\0\0\0\x04\0\0\0\0"s, "74"},
+        {"PTH0\0\0\0\x03\0\0"s, "74"},
+        {"PTH0\0\0\0\x09\0\0\0\x01\x01"s
+         "C",
+         "74"},  // the body is cut
+        {"PTH0\xFF\xFF\xFF\xFF\0\0\0\x01\x01"s
+         "C",
+         "74"},
+        {"PTH0\0\0\0\x06\0\0\0\x01\x02"s
+         "CC",
+         "74"},  // the name runs past the body
+        {"PTH0\0\0\0\x06\0\0\0\x02\x01"s
+         "C\x01"
+         "D",
+         "74"},  // and so does the second name
+        {"PTH0\0\0\0\x08\0\0\0\x01\x01"s
+         "C\x01"
+         "D",
+         "abs:C"},  // bytes behind the last name
+        {"PTH0\0\0\0\x06\0\x09\0\x01\x01"s
+         "C",
+         "not"},  // an unknown type
+        {"PTH1\0\0\0\x04"
+         "ABS "s,
+         "1"},
+        {"PTH1\0\0\0\x02"
+         "abs "s,
+         "74"},
+        {"PTH1\0\0\0\x04"
+         "ab"s,
+         "74"},
+        {"PTH1\0\0\0\x06"
+         "abs \x80\0"s,
+         "74"},
+        {"PTH1\0\0\0\x07"
+         "abs \0\x02"
+         "ab"s,
+         "74"},  // the name runs past the body
+        {"PTH1\0\0\0\x05"
+         "abs \0\0"s,
+         "74"},
+        {"PTH1\x7F\xFF\xFF\xFF"
+         "abs \0\x01"
+         "a"s,
+         "74"},  // a body that is not there
+        {"PTH1\0\0\0\x07"
+         "!pth\0\x01"
+         "a"s,
+         "1"},
+        {"PTH1\0\0\0\x04"
+         "abs \0\x01"
+         "a"s,
+         "abs: +"},  // what follows is not ours
+    };
+    for (const Row& row : rows) EXPECT_EQ(row.result, Unflattened(row.bytes)) << ::testing::PrintToString(row.bytes);
+    Path path = FEmptyPath(nullptr);
+    const auto* cut = reinterpret_cast<const uint8*>(
+        "PTH0\0\0\0\x06\0\x01\0\x01\x01"
+        "C");
+    EXPECT_EQ(14, FUnFlattenPath2(cut, &path, 14));
+    EXPECT_EQ("rel:C", Show(path));
+    EXPECT_EQ(14, FUnFlattenPath2(cut, &path, 13));
+    EXPECT_EQ(1, FUnFlattenPath2(nullptr, &path, 0));
+    EXPECT_EQ("rel:C", Show(path));
+    EXPECT_EQ(kArgErr, CodeOf([] { PathRef(static_cast<InputBuf*>(nullptr), BigEndianizer()); }));
+    FDestroyPath(&path);
+}
+
+TEST_F(PathFlatten, PathsInStreams) {
+    HandleOutputBuf out;
+    BinDataWriter writer(&out, LittleEndianizer());
+    PathRef path = Rel({"x"});
+    EXPECT_EQ(14u, writer.WritePath(&path));
+    EXPECT_EQ(12u, writer.WritePath(nullptr));
+    UHandle handle = out.GetHandle(0);
+    MemInputBuf in(*handle, 26);
+    BinDataReader reader(&in, LittleEndianizer());
+    Path read = reader.ReadPath();
+    EXPECT_EQ("rel:x", Show(read));
+    FDestroyPath(&read);
+    EXPECT_EQ(nullptr, reader.ReadPath());
+    EXPECT_EQ(kNoErr, reader.GetError());
+    EXPECT_EQ(nullptr, reader.ReadPath());
+    EXPECT_EQ(kCorruptErr, reader.GetError());
+    char block[13];
+    StaticOutputBuf tooSmall(block, sizeof block);
+    BinDataWriter failing(&tooSmall, LittleEndianizer());
+    EXPECT_EQ(0u, failing.WritePath(&path));
+    EXPECT_EQ(kCorruptErr, failing.GetError());
+}
+
+}  // namespace
+}  // namespace tessel

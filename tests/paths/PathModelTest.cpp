@@ -1,0 +1,267 @@
+// The elements of paths, their names and their relations.
+#include <tessel/base/OVExcept.h>
+#include <tessel/memory/MemoryManager.h>
+
+#include <thread>
+
+#include "paths/PathRefAccess.h"
+#include "paths/PathTestSupport.h"
+
+namespace tessel {
+namespace {
+
+using namespace test;
+using PathModel = PathTest;
+
+TEST_F(PathModel, AppendingStepsUpWhereItCan) {
+    struct Row {
+        PathRef path;
+        const char* shown;
+    };
+    const Row rows[] = {{Rel({"a", "..", "b"}), "rel:b"},
+                        {Rel({".."}), "rel:^"},
+                        {Rel({"..", "..", "a"}), "rel:^/^/a"},
+                        {Rel({"..", "..", "a", ""}), "rel:^/^"},
+                        {Rel({"a", ".", "b", ""}), "rel:a"},
+                        {Abs({"C", ".."}), "abs:"},
+                        {Abs({"C", "x"}).Append(Rel({"..", "..", "D"})), "abs:D"},
+                        {Rel({"a"}).Append(Rel({"..", "..", "b"})), "rel:^/b"}};
+    for (const Row& row : rows) EXPECT_EQ(row.shown, Show(row.path));
+    EXPECT_EQ(2, Rel({"..", "..", "a"}).CountUpDir());
+    EXPECT_EQ(kArgErr, CodeOf([] { PathRef(PathRef::kNullPath).Append("a"); }));
+    EXPECT_EQ(kArgErr, CodeOf([] { PathRef().Append(".."); }));
+    EXPECT_EQ(kArgErr, CodeOf([] { Abs({"C"}).Append(Abs({"C"})); }));
+    EXPECT_EQ(kArgErr, CodeOf([] { Abs({"C"}).Append(PathRef()); }));
+}
+
+TEST_F(PathModel, TheSameNamesAreTheSameElement) {
+    const PathRef a = Abs({"C", "dir", "file"});
+    const PathRef b = Abs({"C", "dir", "file"});
+    const PathRef otherCase = Abs({"C", "Dir", "file"});
+    EXPECT_EQ(PathRefAccess::Element(a), PathRefAccess::Element(b));
+    EXPECT_NE(PathRefAccess::Element(a), PathRefAccess::Element(otherCase));
+    EXPECT_TRUE(a.Equals(otherCase, PathRef::kIgnoreCase));
+    EXPECT_FALSE(a.Equals(otherCase, PathRef::kExact));
+    EXPECT_FALSE(a.Equals(Rel({"C", "dir", "file"}), PathRef::kExact));
+    // "ab" and "bR" have the same hash.
+    EXPECT_NE(PathRefAccess::Element(Rel({"ab"})), PathRefAccess::Element(Rel({"bR"})));
+    const PathRef first = Rel({"ab"}), second = Rel({"bR"});
+    EXPECT_EQ("rel:ab", Show(first));
+    EXPECT_EQ("rel:bR", Show(second));
+    EXPECT_EQ(PathRefAccess::Element(second), PathRefAccess::Element(Rel({"bR"})));
+}
+
+TEST_F(PathModel, NamesByIndex) {
+    PathRef path = Abs({"C", "dir", "file"});
+    EXPECT_EQ("C", path.ItemAt(0));
+    EXPECT_EQ("file", path.ItemAt(-1));
+    EXPECT_EQ("C", path.ItemAt(-3));
+    EXPECT_EQ("file", path.Name());
+    for (int32 bad : {3, -4, INT32_MAX, INT32_MIN}) {
+        EXPECT_EQ(kArgErr, CodeOf([&] { path.ItemAt(bad); }));
+        EXPECT_EQ(kArgErr, CodeOf([&] { path.Replace(bad, "x"); }));
+    }
+    path.Replace(-2, "other");
+    EXPECT_EQ("abs:C/other/file", Show(path));
+    path.Replace(0, "D");
+    EXPECT_EQ("abs:D/other/file", Show(path));
+    EXPECT_EQ(kArgErr, CodeOf([&] { path.Replace(0, static_cast<const char*>(nullptr)); }));
+    path = path;
+    EXPECT_EQ("abs:D/other/file", Show(path));
+}
+
+TEST_F(PathModel, Comparison) {
+    const PathRef notAPath;
+    struct Row {
+        PathRef a, b;
+        int32 exact, ignoringCase;
+    };
+    const Row rows[] = {
+        {Abs({"a"}), Abs({"a"}), 0, 0},
+        {Abs({"a"}), Abs({"A"}), 1, 0},
+        {Abs({"a", "b"}), Abs({"a", "c"}), -2, -2},
+        {Abs({"a", "c", "x"}), Abs({"a", "b"}), 2, 2},
+        {Abs({"a"}), Abs({"a", "b"}), -2, -2},
+        {Abs({"a", "b"}), Abs({"a"}), 2, 2},
+        {Abs({}), Abs({"a", "b"}), -2, -2},
+        {Unc({"s"}), Abs({"s"}), -1, -1},
+        {Rel({"s"}), Abs({"s"}), 1, -1},
+        {PathRef(PathRef::kNullPath), Rel({}), 1, -1},
+        {notAPath, Abs({}), 1, 1},
+        {Abs({}), notAPath, -1, -1},
+        {notAPath, notAPath, 0, 0},
+    };
+    for (const Row& row : rows) {
+        EXPECT_EQ(row.exact, row.a.Compare(row.b, PathRef::kExact)) << Show(row.a) << " " << Show(row.b);
+        EXPECT_EQ(row.ignoringCase, row.a.Compare(row.b, PathRef::kIgnoreCase)) << Show(row.a) << " " << Show(row.b);
+    }
+    EXPECT_EQ(1, Rel({}).Compare(Unc({"s"}), PathRef::kIgnoreCase3));
+    EXPECT_TRUE(PathRef::NameEquals("a", "A", static_cast<PathRef::ComparePolicy>(9)));
+    EXPECT_TRUE(reports_.Has(2, "Unexpected PathRef::ComparePolicy"));
+    EXPECT_EQ(-1, PathRef::NameCompare("B", "a", PathRef::kExact));
+    EXPECT_EQ(1, PathRef::NameCompare("B", "a", PathRef::kIgnoreCase));
+}
+
+TEST_F(PathModel, Relations) {
+    const PathRef abc = Abs({"a", "b", "c"});
+    EXPECT_EQ("rel:^/^/d", Show(abc.GetRelativePathFromThisToThat(Abs({"A", "d"}), PathRef::kIgnoreCase)));
+    EXPECT_EQ("rel:", Show(abc.GetRelativePathFromThisToThat(abc, PathRef::kExact)));
+    EXPECT_EQ("not", Show(abc.GetRelativePathFromThisToThat(Rel({"a"}), PathRef::kExact)));
+    EXPECT_EQ(kArgErr, CodeOf([&] { abc.GetRelativePathFromThisToThat(PathRef(), PathRef::kExact); }));
+    EXPECT_EQ("abs:a", Show(abc.GetInCommonWith(Abs({"a", "B", "c"}), PathRef::kExact)));
+    EXPECT_EQ("abs:a/b/c", Show(abc.GetInCommonWith(Abs({"a", "B", "c", "d"}), PathRef::kIgnoreCase)));
+    EXPECT_EQ("not", Show(abc.GetInCommonWith(Rel({"a"}), PathRef::kExact)));
+    EXPECT_EQ("abs:a/b", Show(abc.GetParentDirectory()));
+    EXPECT_EQ("not", Show(Abs({}).GetParentDirectory()));
+    EXPECT_EQ("rel:^", Show(Rel({"..", ".."}).GetParentDirectory()));
+    EXPECT_EQ("abs:a", Show(abc.Volume()));
+    EXPECT_EQ(kArgErr, CodeOf([] { Abs({}).Volume(); }));
+    EXPECT_TRUE(abc.StartsWith(Abs({"A"}), PathRef::kIgnoreCase));
+    EXPECT_FALSE(abc.StartsWith(Abs({"A"}), PathRef::kExact));
+    EXPECT_FALSE(abc.StartsWith(Rel({"a"}), PathRef::kExact));
+    EXPECT_TRUE(Abs({"a"}).IsParentDirectoryOf(abc, PathRef::kExact));
+    EXPECT_FALSE(abc.IsParentDirectoryOf(abc, PathRef::kExact));
+}
+
+TEST_F(PathModel, Rebase) {
+    PathRef path = Abs({"a", "b", "c"});
+    EXPECT_FALSE(path.Rebase(Abs({"b"}), Unc({"s"}), PathRef::kExact));
+    EXPECT_FALSE(path.Rebase(Abs({}), Unc({"s"}), PathRef::kExact));
+    EXPECT_EQ("abs:a/b/c", Show(path));
+    EXPECT_TRUE(path.Rebase(Abs({"A"}), Unc({"s", "t"}), PathRef::kIgnoreCase));
+    EXPECT_EQ("unc:s/t/b/c", Show(path));
+}
+
+class AtName final : public PathRef::SplitCriteria {
+public:
+    AtName(std::string name, int32 action) : name_(std::move(name)), action_(action) {}
+    int32 Decide(const PathRef&, int32, const std::string& name) const override {
+        return name == name_ ? action_ : int32{kContinue};
+    }
+
+private:
+    std::string name_;
+    int32 action_;
+};
+
+TEST_F(PathModel, Splitting) {
+    struct Row {
+        const char* name;
+        int32 action;
+        PathRef::SplitDirection direction;
+        bool split;
+        const char *head, *tail;
+    };
+    const Row rows[] = {{"b", 3, PathRef::kFromFirst, true, "abs:a", "rel:b/c/b"},
+                        {"b", 2, PathRef::kFromFirst, true, "abs:a/b", "rel:c/b"},
+                        {"b", 1, PathRef::kFromFirst, true, "abs:a", "rel:c/b"},
+                        {"b", 1, PathRef::kFromLast, true, "abs:a/b/c", "rel:"},
+                        {"a", 3, PathRef::kFromFirst, true, "abs:", "rel:a/b/c/b"},
+                        {"b", 7, PathRef::kFromFirst, true, "abs:a", "rel:c/b"},
+                        {"x", 1, PathRef::kFromFirst, false, "not", "not"}};
+    for (const Row& row : rows) {
+        const PathRef path = Abs({"a", "b", "c", "b"});
+        PathRef head, tail;
+        EXPECT_EQ(row.split, path.SplitOn(AtName(row.name, row.action), &head, &tail, row.direction));
+        EXPECT_EQ(row.head, Show(head));
+        EXPECT_EQ(row.tail, Show(tail));
+    }
+    EXPECT_EQ(1u, reports_.Count());
+    EXPECT_TRUE(reports_.Has(2, "Illegal action"));
+    PathRef path = Abs({"a", "b"});
+    EXPECT_TRUE(path.SplitOn(AtName("b", 3), nullptr, &path, PathRef::kFromFirst));
+    EXPECT_EQ("rel:b", Show(path));
+}
+
+TEST_F(PathModel, Extensions) {
+    PathRef path = Abs({"C", "archive.tar.gz"});
+    EXPECT_EQ("gz", path.GetExtension());
+    EXPECT_EQ("gz", path.Extension());
+    path.RemoveExtension();
+    EXPECT_EQ("abs:C/archive.tar", Show(path));
+    path = Rel({"readme"});
+    EXPECT_EQ("", path.GetExtension());
+    path.RemoveExtension();
+    path.AppendExtension("txt");
+    EXPECT_EQ("rel:readme.txt", Show(path));
+    EXPECT_EQ(kArgErr, CodeOf([] { Abs({}).GetExtension(); }));
+
+    const _FMFileType kText = TESSEL_FOURCC('T', 'E', 'X', 'T'), kData = TESSEL_FOURCC('D', 'A', 'T', 'A');
+    const auto list = [](std::initializer_list<PathRef::ExtensionEntry> entries) {
+        UHandle handle = DSNewHandle(static_cast<uint32>(4 + entries.size() * sizeof(PathRef::ExtensionEntry)));
+        const int32 count = static_cast<int32>(entries.size());
+        std::memcpy(*handle, &count, 4);
+        std::memcpy(*handle + 4, std::data(entries), entries.size() * sizeof(PathRef::ExtensionEntry));
+        return (const PathRef::ExtensionList**)handle;
+    };
+    PathRef::SetExtensionList(list({{kText, "txt"}}), list({{kData, "dat"}, {kData, "txt"}}));
+    EXPECT_EQ(kText, PathRef::NameGetExtensionType("a.TXT"));
+    EXPECT_EQ(kData, PathRef::NameGetExtensionType("a.b.dat"));
+    EXPECT_EQ(0u, PathRef::NameGetExtensionType("dat"));
+    EXPECT_TRUE(PathRef::NameHasExtension("x.Dat", kData));
+    EXPECT_FALSE(PathRef::NameHasExtension("x.dat", kText));
+    path = Rel({"x"});
+    path.AppendExtension(kData);
+    EXPECT_EQ("rel:x.dat", Show(path));
+    EXPECT_EQ(kArgErr, CodeOf([&] { path.AppendExtension(TESSEL_FOURCC('N', 'O', 'N', 'E')); }));
+    PathRef::SetExtensionList(list({}), nullptr);
+    EXPECT_TRUE(reports_.Has(2, "The extension lists should only be set once"));
+    EXPECT_EQ(0u, PathRef::NameGetExtensionType("a.txt"));
+}
+
+TEST_F(PathModel, StandardLocations) {
+    const PathRef temp = Abs({"C", "tmp"});
+    EXPECT_EQ(kNoErr, temp.AssignToName("os_temp"));
+    EXPECT_EQ(kArgErr, Abs({"D"}).AssignToName("os_temp"));
+    EXPECT_EQ("abs:C/tmp", Show(PathRef("os_temp")));
+    EXPECT_EQ(kArgErr, CodeOf([] { PathRef("os_nowhere"); }));
+}
+
+TEST_F(PathModel, Sanity) {
+    const PathRef path = Unc({"s", "x"});
+    EXPECT_TRUE(path.IsSane(false));
+    EXPECT_TRUE(PathRef().IsSane(false));
+    EXPECT_FALSE(Unc({}).IsValid());
+    EXPECT_FALSE(Unc({}).IsSane(false));
+    EXPECT_EQ((std::vector<std::string>{"PathRef is not valid"}), reports_.Texts());
+    PathRef wild;
+    alignas(PathItemElement) static char noElement[sizeof(PathItemElement)];
+    auto* element = reinterpret_cast<PathItemElement*>(noElement);
+    std::memcpy(static_cast<void*>(&wild), &element, sizeof element);
+    EXPECT_FALSE(wild.IsSane(true));
+    EXPECT_TRUE(reports_.Has(3, "mPathElement not in storage"));
+    std::memset(static_cast<void*>(&wild), 0, sizeof wild);
+    PathRef deep = Rel({});
+    for (int i = 0; i < 600; ++i) deep.Append("x");
+    EXPECT_TRUE(deep.IsSane(false));
+    EXPECT_EQ(2, reports_.Reports().back().level);
+}
+
+// Eight threads that make, copy and drop the same few paths: every element is made once and ends with its last user.
+TEST_F(PathModel, ThreadsShareElements) {
+    const auto work = [](uint32 seed) {
+        std::vector<PathRef> kept(16);
+        for (int i = 0; i < 4000; ++i) {
+            seed = seed * 1664525 + 1013904223;
+            PathRef path(PathRef::kAbsolute);
+            for (uint32 depth = 0; depth < 1 + (seed >> 8) % 4; ++depth)
+                path.Append(std::string(1, static_cast<char>('a' + (seed >> (10 + 2 * depth)) % 3)));
+            const PathRef copy(path);
+            ASSERT_EQ(0, copy.Compare(path, PathRef::kExact));
+            std::string text;
+            ASSERT_EQ(kNoErr, copy.ConvertToString(&text, PathRef::StringUnix()));
+            ASSERT_EQ(static_cast<size_t>(copy.ItemCount() * 2), text.size());
+            kept[(seed >> 20) % kept.size()] = copy;
+            ASSERT_TRUE(i % 64 != 0 || copy.IsSane(false));
+        }
+    };
+    std::vector<std::thread> threads;
+    for (uint32 i = 0; i < 8; ++i) threads.emplace_back(work, i);
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_EQ(0u, reports_.Count());
+    PathLock lock;
+    EXPECT_EQ(0, PathRefAccess::Element(Abs({}))->ChildCount());
+}
+
+}  // namespace
+}  // namespace tessel

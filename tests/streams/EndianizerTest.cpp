@@ -1,0 +1,85 @@
+#include <gtest/gtest.h>
+#include <tessel/streams/Endianizer.h>
+
+#include <array>
+#include <cstring>
+#include <limits>
+
+namespace tessel {
+namespace {
+
+using Bytes16 = std::array<uint8, 16>;
+
+TEST(ByteOrder, HelpersWorkInPlaceAtAnyAddress) {
+    uint8 bytes[9] = {0xEE, 1, 2, 3, 4, 5, 6, 7, 8};
+    RevBQ(bytes + 1);
+    EXPECT_EQ(0, std::memcmp(bytes, "\xEE\x08\x07\x06\x05\x04\x03\x02\x01", 9));
+    uint32 halves = 0x11223344;
+    SwapWL(&halves);
+    EXPECT_EQ(0x33441122u, halves);
+    RevBL(&halves);
+    EXPECT_EQ(0x22114433u, halves);
+    uint16 word = 0x1122;
+    SwapBW(&word);
+    EXPECT_EQ(0x2211u, word);
+}
+
+TEST(Endianizer, IntegersInBothOrders) {
+    const uint8 stream[16] = {0x81, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16};
+    EXPECT_EQ(int16(0x8102), BigEndianizer()->ToNative16(stream));
+    EXPECT_EQ(int16(0x0281), LittleEndianizer()->ToNative16(stream));
+    EXPECT_EQ(int32(0x81020304), BigEndianizer()->ToNative32(stream));
+    EXPECT_EQ(int32(0x04030281), NativeEndianizer()->ToNative32(stream));
+    uint64 value;
+    BigEndianizer()->CopyToNative64(stream, &value);
+    EXPECT_EQ(0x8102030405060708u, value);
+    uint8 all[16];
+    BigEndianizer()->CopyToNative128(stream, all);
+    for (int i = 0; i < 16; ++i) EXPECT_EQ(stream[15 - i], all[i]);
+    uint8 back[16];
+    BigEndianizer()->FromNative128(all, back);
+    EXPECT_EQ(0, std::memcmp(stream, back, 16));
+    EXPECT_EQ(1, BigEndianizer()->IsSwapping());
+    EXPECT_EQ(0, LittleEndianizer()->IsSwapping());
+    EXPECT_EQ(0, NativeEndianizer()->IsSwapping());
+}
+
+floatExt Extended(uint16 signExponent, uint64 mantissa) {
+    floatExt value;
+    value.signExponent = signExponent;
+    value.mantissa = mantissa;
+    return value;
+}
+
+// The stream form is that of binary128: -1.5 is BFFF 8000..., a denormal keeps its mantissa.
+TEST(Endianizer, ExtendedRealsInTheStandardForm) {
+    const floatExt minusOneAndAHalf = Extended(0xBFFF, 0xC000000000000000u);
+    const floatExt denormal = Extended(0, 0x0000000000000301u);
+    struct Row {
+        floatExt value;
+        Bytes16 big;
+    };
+    const Row rows[] = {{minusOneAndAHalf, {0xBF, 0xFF, 0x80}}, {denormal, {0, 0, 0, 0, 0, 0, 0, 0, 3, 1}}};
+    for (const Row& row : rows) {
+        Bytes16 big, little;
+        big.fill(0xAA);
+        little.fill(0xAA);
+        BigEndianizer()->FromNativeFX(row.value, big.data());
+        LittleEndianizer()->FromNativeFX(row.value, little.data());
+        EXPECT_EQ(row.big, big);
+        EXPECT_TRUE(std::equal(big.begin(), big.end(), little.rbegin()));
+        big[15] = 77;  // the last six bytes are not looked at
+        const floatExt fromBig = BigEndianizer()->ToNativeFX(big.data());
+        const floatExt fromLittle = LittleEndianizer()->ToNativeFX(little.data());
+        EXPECT_EQ(0, std::memcmp(&row.value, &fromBig, sizeof fromBig));
+        EXPECT_EQ(0, std::memcmp(&row.value, &fromLittle, sizeof fromLittle));
+    }
+    EXPECT_EQ(16u, BigEndianizer()->StreamFXSize());
+    EXPECT_EQ(10u, NativeEndianizer()->StreamFXSize());
+    uint8 native[10];
+    NativeEndianizer()->FromNativeFX(minusOneAndAHalf, native);
+    EXPECT_EQ(0, std::memcmp(native, &minusOneAndAHalf, 10));
+}
+
+}  // namespace
+}  // namespace tessel

@@ -1,0 +1,40 @@
+// What paths and streams need, started for as long as it lives. Leaks are failures.
+#ifndef TESSEL_TESTS_SUPPORT_STARTEDPATHS_H
+#define TESSEL_TESTS_SUPPORT_STARTEDPATHS_H
+
+#include <gtest/gtest.h>
+
+#include "memory/Service.h"
+#include "paths/Service.h"
+#include "support/ReportRecorder.h"
+#include "sync/Service.h"
+
+namespace tessel::test {
+
+class StartedPaths {
+public:
+    StartedPaths() {
+        EXPECT_EQ(kNoErr, ThEventStart());
+        EXPECT_EQ(kNoErr, ThMutexStart());
+        EXPECT_EQ(kNoErr, ProtectedAtomicOperationsStart());
+        EXPECT_EQ(kNoErr, MemoryManagerStart());
+        EXPECT_EQ(kNoErr, TrackedMallocFreeStart());
+        EXPECT_EQ(kNoErr, PathManagerStart());
+    }
+    ~StartedPaths() {
+        const ReportRecorder leaks;
+        PathManagerStop();
+        TrackedMallocFreeStop();
+        MemoryManagerStop();
+        ProtectedAtomicOperationsStop();
+        ThMutexStop();
+        ThEventStop();
+        EXPECT_EQ(0u, leaks.CountAt(kDebugError) + leaks.CountAt(kDebugWarning));
+    }
+    StartedPaths(const StartedPaths&) = delete;
+    StartedPaths& operator=(const StartedPaths&) = delete;
+};
+
+}  // namespace tessel::test
+
+#endif
