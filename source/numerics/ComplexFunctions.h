@@ -1,0 +1,302 @@
+/* The complex functions of the math family. W is double or the extended real; the members for singles and doubles
+   compute in the next wider one, which has room for the intermediate values and rounds the result once. */
+#pragma once
+
+#include <algorithm>
+#include <cmath>
+#include <complex>
+#include <limits>
+#include <type_traits>
+
+#include "numerics/RealFunctions.h"
+
+namespace tessel::cmplx {
+
+template <class W>
+using Complex = std::complex<W>;
+
+template <class W>
+bool IsFinite(const Complex<W>& z) {
+    return std::isfinite(z.real()) && std::isfinite(z.imag());
+}
+
+template <class W>
+bool IsNaN(const Complex<W>& z) {
+    return std::isnan(z.real()) || std::isnan(z.imag());
+}
+
+template <class W>
+bool IsZero(const Complex<W>& z) {
+    return z.real() == 0 && z.imag() == 0;
+}
+
+/* A constant in two parts, for arguments that must not lose its last bits. */
+template <class W>
+struct TwoParts {
+    W high;
+    W low;
+};
+
+template <class W>
+constexpr TwoParts<W> kLn10 = {0x935D8DDDAAA8AC17p-62L, -0xAD494EA3E967AEB9p-129L};
+template <>
+inline constexpr TwoParts<double> kLn10<double> = {0x126BB1BBB55516p-51, -0x1F48AD494EA3E9p-105};
+
+template <class W>
+constexpr TwoParts<W> kLn2 = {0xB17217F7D1CF79ACp-64L, -0xD871319FF0342543p-130L};
+template <>
+inline constexpr TwoParts<double> kLn2<double> = {0x162E42FEFA39EFp-53, 0x1ABC9E3B39803Fp-108};
+
+template <class W>
+constexpr W kLog10E = static_cast<W>(0xDE5BD8A937287195p-65L);
+template <class W>
+constexpr W kLog2E = static_cast<W>(0xB8AA3B295C17F0BCp-63L);
+template <class W>
+constexpr W kHalfPi = static_cast<W>(0xC90FDAA22168C235p-63L);
+
+// ---- arithmetic ----------------------------------------------------------------------------------------------------
+
+/* (ac - bd) + (ad + bc) i */
+template <class W>
+Complex<W> Multiply(const Complex<W>& x, const Complex<W>& y) {
+    const W a = x.real();
+    const W b = x.imag();
+    const W c = y.real();
+    const W d = y.imag();
+    if (b == 0 && d == 0) return {a * c, 0};
+    return {a * c - b * d, a * d + b * c};
+}
+
+template <class W>
+Complex<W> ScaleByPowerOf2(const Complex<W>& z, int power) {
+    return {std::scalbn(z.real(), power), std::scalbn(z.imag(), power)};
+}
+
+/* ((ac + bd) + (bc - ad) i) / (cc + dd) */
+template <class W>
+Complex<W> TextbookQuotient(const Complex<W>& x, const Complex<W>& y) {
+    const W a = x.real();
+    const W b = x.imag();
+    const W c = y.real();
+    const W d = y.imag();
+    const W divisor = c * c + d * d;
+    return {(a * c + b * d) / divisor, (b * c - a * d) / divisor};
+}
+
+template <class W>
+int Exponent(const Complex<W>& z) {
+    return std::ilogb(std::fmax(std::fabs(z.real()), std::fabs(z.imag())));
+}
+
+/* The textbook quotient; finite operands are brought near 1 where squares or products would leave the range. */
+template <class W>
+Complex<W> Divide(const Complex<W>& x, const Complex<W>& y) {
+    constexpr int kSafe = std::numeric_limits<W>::max_exponent / 4;
+    if (!IsFinite(x) || !IsFinite(y) || IsZero(x) || IsZero(y)) return TextbookQuotient(x, y);
+    const int xPower = Exponent(x);
+    const int yPower = Exponent(y);
+    if (std::abs(xPower) < kSafe && std::abs(yPower) < kSafe) return TextbookQuotient(x, y);
+    return ScaleByPowerOf2(TextbookQuotient(ScaleByPowerOf2(x, -xPower), ScaleByPowerOf2(y, -yPower)), xPower - yPower);
+}
+
+/* 1 / z: infinite for a zero, zero for an infinity. */
+template <class W>
+Complex<W> Recip(const Complex<W>& z) {
+    if (IsZero(z)) return {std::copysign(real::kInfinity<W>, z.real()), -z.imag()};
+    if (std::isinf(z.real()) || std::isinf(z.imag())) {
+        return {std::copysign(W{0}, z.real()), std::copysign(W{0}, -z.imag())};
+    }
+    return Divide(Complex<W>(1), z);
+}
+
+/* z brought to magnitude 1; an infinite part outweighs a finite one. */
+template <class W>
+Complex<W> Sign(const Complex<W>& z) {
+    if (IsNaN(z) || IsZero(z)) return z;
+    if (!IsFinite(z)) {
+        const auto direction = [](W part) { return std::copysign(std::isinf(part) ? W{1} : W{0}, part); };
+        return Sign(Complex<W>(direction(z.real()), direction(z.imag())));
+    }
+    const Complex<W> scaled = ScaleByPowerOf2(z, -Exponent(z));
+    const W magnitude = std::hypot(scaled.real(), scaled.imag());
+    return {scaled.real() / magnitude, scaled.imag() / magnitude};
+}
+
+// ---- forms ---------------------------------------------------------------------------------------------------------
+
+template <class W>
+W Magnitude(const Complex<W>& z) {
+    return std::hypot(z.real(), z.imag());
+}
+
+template <class W>
+W Angle(const Complex<W>& z) {
+    return std::atan2(z.imag(), z.real());
+}
+
+template <class W>
+Complex<W> ToPolar(const Complex<W>& z) {
+    return IsZero(z) ? z : Complex<W>(Magnitude(z), Angle(z));
+}
+
+/* Of magnitude and angle. */
+template <class W>
+Complex<W> ToRectangular(const Complex<W>& polar) {
+    const W magnitude = polar.real();
+    const W angle = polar.imag();
+    if (angle == 0) return {magnitude, angle};
+    return {magnitude * std::cos(angle), magnitude * std::sin(angle)};
+}
+
+// ---- logarithms ----------------------------------------------------------------------------------------------------
+
+template <class W>
+Complex<W> Logn(const Complex<W>& z) {
+    return std::log(z);
+}
+
+template <class W>
+Complex<W> Log10(const Complex<W>& z) {
+    const Complex<W> log = std::log(z);
+    return {log.real() * kLog10E<W>, log.imag() * kLog10E<W>};
+}
+
+template <class W>
+Complex<W> Log2(const Complex<W>& z) {
+    const Complex<W> log = std::log(z);
+    return {log.real() * kLog2E<W>, log.imag() * kLog2E<W>};
+}
+
+template <class W>
+Complex<W> Logx(const Complex<W>& base, const Complex<W>& z) {
+    return Divide(std::log(z), std::log(base));
+}
+
+/* The sum a + b and what rounding took from it. */
+template <class W>
+TwoParts<W> ExactSum(W a, W b) {
+    const W sum = a + b;
+    const W shifted = sum - a;
+    return {sum, (a - (sum - shifted)) + (b - shifted)};
+}
+
+/* |1 + z|^2 - 1 = 2x + x^2 + y^2, without losing bits where the terms cancel. */
+template <class W>
+W SquareOfOnePlusLessOne(W x, W y) {
+    const W xx = x * x;
+    const W yy = y * y;
+    const TwoParts<W> first = ExactSum(2 * x, yy);
+    const TwoParts<W> second = ExactSum(first.high, xx);
+    return second.high + (first.low + second.low + std::fma(x, x, -xx) + std::fma(y, y, -yy));
+}
+
+/* ln(1 + z) */
+template <class W>
+Complex<W> Lognp1(const Complex<W>& z) {
+    constexpr W kNear = 2;
+    const W x = z.real();
+    const W y = z.imag();
+    if (!(std::fabs(x) < kNear && std::fabs(y) < kNear)) return std::log(Complex<W>(1 + x, y));
+    return {std::log1p(SquareOfOnePlusLessOne(x, y)) / 2, std::atan2(y, 1 + x)};
+}
+
+// ---- powers --------------------------------------------------------------------------------------------------------
+
+/* e^z - 1 = (e^x - 1) cos y - 2 sin^2(y/2) + i e^x sin y */
+template <class W>
+Complex<W> Expm1(const Complex<W>& z) {
+    const W x = z.real();
+    const W y = z.imag();
+    if (y == 0) return {std::expm1(x), y};
+    if (!IsFinite(z)) return std::exp(z) - Complex<W>(1);
+    const W halfSine = std::sin(y / 2);
+    return {std::expm1(x) * std::cos(y) - 2 * halfSine * halfSine, std::exp(x) * std::sin(y)};
+}
+
+/* b^z for a positive real base: b^x at the angle y ln b. */
+template <class W>
+Complex<W> PowerOfBase(W magnitude, W y, const TwoParts<W>& lnBase) {
+    if (y == 0) return {magnitude, y};
+    const W angle = y * lnBase.high;
+    const W rest = std::fma(y, lnBase.high, -angle) + y * lnBase.low;
+    const W cosine = std::cos(angle);
+    const W sine = std::sin(angle);
+    return {magnitude * (cosine - rest * sine), magnitude * (sine + rest * cosine)};
+}
+
+template <class W>
+Complex<W> Pow10(const Complex<W>& z) {
+    if (!IsFinite(z)) return std::exp(Complex<W>(z.real() * kLn10<W>.high, z.imag() * kLn10<W>.high));
+    return PowerOfBase(real::Pow10(z.real()), z.imag(), kLn10<W>);
+}
+
+template <class W>
+Complex<W> Pow2(const Complex<W>& z) {
+    if (!IsFinite(z)) return std::exp(Complex<W>(z.real() * kLn2<W>.high, z.imag() * kLn2<W>.high));
+    return PowerOfBase(std::exp2(z.real()), z.imag(), kLn2<W>);
+}
+
+/* z to a whole power by repeated squaring. */
+template <class W>
+Complex<W> WholePower(Complex<W> z, int power) {
+    Complex<W> result(1);
+    for (int left = std::abs(power); left != 0; left /= 2) {
+        if (left % 2 != 0) result = Multiply(result, z);
+        z = Multiply(z, z);
+    }
+    return power < 0 ? Recip(result) : result;
+}
+
+template <class W>
+Complex<W> PowerOfZero(const Complex<W>& power) {
+    if (power.real() > 0) return 0;
+    if (power.real() < 0 && power.imag() == 0) return real::kInfinity<W>;
+    return {real::NaN<W>(), real::NaN<W>()};
+}
+
+/* x to the power y. Whole powers are products, all others e^(y ln x). */
+template <class W>
+Complex<W> Powx(const Complex<W>& x, const Complex<W>& y) {
+    constexpr W kLargestWhole = 64;
+    if (IsZero(y)) return 1;
+    if (IsZero(x)) return PowerOfZero(y);
+    const bool isWhole = y.imag() == 0 && y.real() == std::trunc(y.real());
+    if (x.imag() == 0 && y.imag() == 0 && (x.real() > 0 || isWhole)) return {std::pow(x.real(), y.real()), 0};
+    if (!IsFinite(x) || !IsFinite(y)) return std::exp(Multiply(y, std::log(x)));
+    if (isWhole && std::fabs(y.real()) <= kLargestWhole) return WholePower(x, static_cast<int>(y.real()));
+    const Complex<W> log = std::log(x);
+    const W magnitude = std::exp(y.real() * log.real() - y.imag() * log.imag());
+    return ToRectangular(Complex<W>(magnitude, y.imag() * log.real() + y.real() * log.imag()));
+}
+
+// ---- trigonometry --------------------------------------------------------------------------------------------------
+
+template <class W>
+Complex<W> Sec(const Complex<W>& z) {
+    return Recip(std::cos(z));
+}
+
+template <class W>
+Complex<W> Csc(const Complex<W>& z) {
+    return Recip(std::sin(z));
+}
+
+template <class W>
+Complex<W> Cot(const Complex<W>& z) {
+    return Recip(std::tan(z));
+}
+
+template <class W>
+Complex<W> Sinc(const Complex<W>& z) {
+    return IsZero(z) ? Complex<W>(1) : Divide(std::sin(z), z);
+}
+
+/* The arctangent of y / x. */
+template <class W>
+Complex<W> Atan2(const Complex<W>& x, const Complex<W>& y) {
+    if (!IsZero(x)) return std::atan(Divide(y, x));
+    if (IsZero(y)) return 0;
+    return std::copysign(kHalfPi<W>, y.real());
+}
+
+}  // namespace tessel::cmplx
