@@ -30,7 +30,6 @@ TESSEL_NOT_INLINE void BeforeCreation(ThreadMemory* mine) {
     if (MemoryDebugging()) masterPointers.CheckChains(mine);
 }
 
-// Not inline: with TrackHandle and the caller the three calls that a tracker leaves out of its call stacks.
 TESSEL_NOT_INLINE void AfterCreation(UHandle h, uint32 size) {
     Trace(kCreated, kNoErr, h, size, 0);
     TrackHandle(h, size);

@@ -11,7 +11,7 @@
 namespace tessel {
 namespace {
 
-constexpr int32 kStackSkip = 4;     // Record, TrackedMalloc, TrackedNew, operator new
+constexpr int32 kStackSkip = 4;     // the tracker's own calls and Record
 constexpr int32 kRecordLine = 140;  // the line that reports name for every tracked block
 constexpr char kLeakFile[] = "ovnewdelleaks.txt";
 

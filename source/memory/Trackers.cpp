@@ -44,12 +44,11 @@ void StopTrackers() {
     DestroyAllocTracker(pointerTracker.exchange(nullptr));
 }
 
-// Not inline, as TrackPointer: one of the three calls that a tracker leaves out of its call stacks.
-__attribute__((noinline)) void TrackHandle(UHandle h, uint32 size) {
+void TrackHandle(UHandle h, uint32 size) {
     if (AllocTracker* tracker = Get(handleTracker)) tracker->AddRecord(h, size, __FILE__, __LINE__);
 }
 
-__attribute__((noinline)) void TrackPointer(const void* p, uint32 size) {
+void TrackPointer(const void* p, uint32 size) {
     if (AllocTracker* tracker = Get(pointerTracker)) tracker->AddRecord(p, size, __FILE__, __LINE__);
 }
 

@@ -21,8 +21,7 @@ public:
         DumpLeakInfo(tracker, expected, name, fileName);
         DestroyAllocTracker(tracker);
     }
-    // Not inline: one of the three calls that the tracker leaves out of its call stacks.
-    __attribute__((noinline)) void Add(const void* object, uint32 size, const char* file, int32 line) {
+    void Add(const void* object, uint32 size, const char* file, int32 line) {
         if (AllocTracker* tracker = tracker_.load(std::memory_order_acquire))
             tracker->AddRecord(object, size, file, line);
     }

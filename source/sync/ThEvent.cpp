@@ -51,8 +51,7 @@ void ReportLatency(PlatformEvent& event) {
         << " max=" << DbgFmtType<double>(Milliseconds(maximum), "%.5f");
 }
 
-// Not inline: one of the three calls that the tracker leaves out of its call stacks.
-__attribute__((noinline)) MgErr CreateEvent(ThEvent* event, bool signaled, ThEventSignalProc customSignal) {
+MgErr CreateEvent(ThEvent* event, bool signaled, ThEventSignalProc customSignal) {
     if (!event) return kArgErr;
     *event = nullptr;
     std::unique_ptr<EventRecord> record(new (std::nothrow) EventRecord);

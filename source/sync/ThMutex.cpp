@@ -18,8 +18,7 @@ SyncTracker mutexTracker;
 
 struct MutexRecord : THMUTEXREC, PlainAllocation {};
 
-// Not inline: one of the three calls that the tracker leaves out of its call stacks.
-__attribute__((noinline)) MgErr CreateMutex(ThMutex* mutex) {
+MgErr CreateMutex(ThMutex* mutex) {
     if (!mutex) return kArgErr;
     *mutex = nullptr;
     std::unique_ptr<MutexRecord> record(new (std::nothrow) MutexRecord);

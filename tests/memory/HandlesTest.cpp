@@ -1,0 +1,256 @@
+#include <gmock/gmock.h>
+
+#include <random>
+#include <string>
+
+#include <tessel/memory/MemoryManager.h>
+
+#include "support/StartedMemory.h"
+
+namespace tessel {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+
+struct Handles : ::testing::Test {
+    test::StartedMemory memory;
+};
+
+std::string Content(UHandle h) {
+    return std::string(reinterpret_cast<const char*>(*h), DSGetHandleSize(h));
+}
+
+UHandle Make(const std::string& text) {
+    UHandle h = nullptr;
+    EXPECT_EQ(kNoErr, DSPtrToHand(text.data(), &h, static_cast<uint32>(text.size())));
+    return h;
+}
+
+bool IsAligned(UHandle h, uint32 alignment, uint32 offset) {
+    return (reinterpret_cast<uintptr_t>(*h) + offset) % alignment == 0;
+}
+
+TEST_F(Handles, AreAlignedByTheirSize) {
+    struct Case {
+        uint32 size, alignment, offset;
+    };
+    const Case cases[] = {{0, 8, 0},        {1, 8, 0},          {4, 8, 4},          {8, 8, 8},         {1020, 8, 4},
+                          {1023, 8, 0},     {1024, 16, 8},      {1025, 16, 0},      {1028, 16, 4},     {1048572, 16, 4},
+                          {1048575, 16, 0}, {1048576, 4096, 8}, {1048577, 4096, 0}, {1048580, 4096, 4}};
+    for (const Case& c : cases) {
+        UHandle h = DSNewHClr(c.size);
+        ASSERT_TRUE(h && *h) << c.size;
+        EXPECT_EQ(c.size, DSGetHandleSize(h));
+        EXPECT_TRUE(IsAligned(h, c.alignment, c.offset)) << c.size;
+        EXPECT_EQ(std::string(c.size, '\0'), Content(h));
+        EXPECT_EQ(kNoErr, DSDisposeHandle(h));
+    }
+}
+
+TEST_F(Handles, KeepTheirBytesAndAlignmentThroughResizes) {
+    std::mt19937 random(1);
+    const uint32 sizes[] = {0, 3, 17, 100, 1000, 5000, 70000, 300000};
+    for (uint32 alignment : {0u, 8u, 9u, 64u, 100u, 4096u}) {
+        uint32 effective = alignment <= 8 ? 8 : alignment == 9 ? 16 : alignment == 100 ? 128 : alignment;
+        uint32 offset = random() % 40;
+        std::string model = "some text to begin with";
+        UHandle h = Make(model);
+        for (int i = 0; i < 60; ++i) {
+            uint32 size = sizes[random() % 8] + random() % 20;
+            bool clear = random() % 2;
+            auto resize = clear ? DSSetAlignedHSzClr : DSSetAlignedHandleSize;
+            ASSERT_EQ(kNoErr, resize(h, size, alignment, offset));
+            ASSERT_TRUE(IsAligned(h, effective, (offset + 3) / 4 * 4));
+            size_t kept = std::min<size_t>(model.size(), size);
+            std::string now = Content(h);
+            ASSERT_EQ(model.substr(0, kept), now.substr(0, kept));
+            if (clear) {
+                ASSERT_EQ(std::string(size - kept, '\0'), now.substr(kept));
+            }
+            for (size_t at = kept; at < size; ++at) (*h)[at] = static_cast<uint8>(random());
+            model = Content(h);
+        }
+        DSDisposeHandle(h);
+    }
+}
+
+TEST_F(Handles, MoveOnlyWhenTheyMust) {
+    uint32 counters[4] = {0, 0, 0, 0};
+    UHandle h = DSNewHandle(17);
+    UPtr data = *h;
+    DSSetCounters(counters);
+    EXPECT_EQ(kNoErr, DSSetHandleSize(h, 17));  // nothing changes
+    EXPECT_EQ(kNoErr, DSSetHandleSize(h, 18));  // the same heap size
+    EXPECT_EQ(data, *h);
+    EXPECT_EQ(kMemFullErr, DSSetHandleSize(h, 0xFFFFFFFF));
+    EXPECT_EQ(18u, DSGetHandleSize(h));
+    DSReadCounters(counters);
+    EXPECT_THAT(counters, ElementsAre(0, 0, 3, 0));
+
+    ASSERT_EQ(kNoErr, DSSetHandleSize(h, 100));
+    data = *h;
+    ASSERT_EQ(kNoErr, DSSetHandleSize(h, 104));  // another alignment offset
+    EXPECT_NE(data, *h);
+    UHandle eights = DSNewHandle(64);
+    data = *eights;
+    ASSERT_EQ(kNoErr, DSSetHandleSize(eights, 64));
+    EXPECT_EQ(data, *eights);
+
+    DSReadCounters(counters);
+    SetStressHandles(true);
+    uint32 moves = counters[3];
+    for (uint32 size : {105u, 104u, 3000u}) {
+        data = *h;
+        EXPECT_EQ(kNoErr, DSSetHandleSize(h, size));
+        EXPECT_NE(data, *h);
+    }
+    data = *h;
+    EXPECT_EQ(kNoErr, DSSetHandleSize(h, 3000));
+    EXPECT_EQ(data, *h);
+    SetStressHandles(false);
+    DSReadCounters(counters);
+    EXPECT_EQ(moves, counters[3]);
+    DSDisposeHandle(h);
+    DSDisposeHandle(eights);
+}
+
+TEST_F(Handles, AreRecognised) {
+    UHandle first = DSNewHandle(1), second = DSNewHandle(2);
+    EXPECT_EQ(1, IsDSHandle(first));
+    EXPECT_EQ(kNoErr, DSDisposeHandle(first));
+    EXPECT_EQ(kNoErr, DSDisposeHandle(second));
+    EXPECT_EQ(0, IsDSHandle(first));  // a free slot
+    EXPECT_EQ(kHandleErr, DSCheckHandle(first));
+    EXPECT_EQ(second, DSNewHandle(5));  // last freed, first reused
+    EXPECT_EQ(first, DSNewHandle(5));
+
+    UPtr looksAlive = *first;
+    UHandle odd = reinterpret_cast<UHandle>(reinterpret_cast<uintptr_t>(first) + 1);
+    for (UHandle none : {static_cast<UHandle>(nullptr), &looksAlive, odd, reinterpret_cast<UHandle>(16)}) {
+        EXPECT_EQ(0, IsDSHandle(none));
+        EXPECT_EQ(kHandleErr, DSCheckHandle(none));
+        EXPECT_EQ(0u, DSGetHandleSize(none));
+        EXPECT_EQ(kHandleErr, DSSetHandleSize(none, 3));
+        EXPECT_EQ(kHandleErr, AZHLock(none));
+        AZHPurge(none);
+        EXPECT_EQ(none ? kHandleErr : kNoErr, DSDisposeHandle(none));
+    }
+    EXPECT_EQ(8u, memory.reports.CountAt(kDebugFatal));  // size query and resize of each
+    EXPECT_TRUE(memory.reports.Has(kDebugWarning, "Memory error 3 in DSSetHandleSize"));
+    EXPECT_TRUE(memory.reports.Has(kDebugWarning, "Memory error 3 in DSDisposeHandle"));
+    EXPECT_TRUE(memory.reports.Has(kDebugWarning, "Memory error 3 in AZHLock"));
+    EXPECT_TRUE(memory.reports.Has(kDebugWarning, "Memory error 3 in AZHPurge"));
+    EXPECT_EQ(kNoErr, AZHUnlock(first));
+    EXPECT_EQ(0, AZHGetState(first));
+
+    DSSetHandleChecking(1);  // a size query now believes what looks alive, a resize does not
+    EXPECT_EQ(5u, DSGetHandleSize(&looksAlive));
+    EXPECT_EQ(kHandleErr, DSSetHandleSize(&looksAlive, 6));
+    DSSetHandleChecking(0);
+    EXPECT_EQ(kNoErr, DSSetHandleSize(&looksAlive, 5));
+    DSSetHandleChecking(7);
+    EXPECT_EQ(0u, DSGetHandleSize(&looksAlive));
+    DSDisposeHandle(first);
+    DSDisposeHandle(second);
+}
+
+TEST_F(Handles, AreMadeResizedAndDroppedThroughTheirAddress) {
+    UHandle h = nullptr;
+    EXPECT_EQ(kNoErr, DataSetHandleSizeOrNewHandle(&h, 0));
+    EXPECT_EQ(nullptr, h);
+    EXPECT_EQ(kNoErr, DataSetHSzOrNewHClr(&h, 3));
+    EXPECT_EQ(std::string(3, '\0'), Content(h));
+    EXPECT_EQ(kNoErr, DSSetHSzOrNewHClr(&h, 5));
+    EXPECT_EQ(std::string(5, '\0'), Content(h));
+    EXPECT_EQ(kNoErr, DataSetHandleSizeOrNewHandle(&h, 0));
+    EXPECT_EQ(nullptr, h);
+    EXPECT_EQ(kNoErr, DSSetHandleSizeOrNewHandle(&h, 0));
+    EXPECT_EQ("", Content(h));
+    EXPECT_EQ(kNoErr, DSSetHandleFromPtrNULLMeansEmpty(&h, "abc", 3));
+    EXPECT_EQ("abc", Content(h));
+    EXPECT_EQ(kNoErr, DSSetHandleFromPtrNULLMeansEmpty(&h, "abc", 0));
+    EXPECT_EQ(nullptr, h);
+    EXPECT_EQ(kNoErr, DSSetHandleFromPtr(&h, "", 0));
+    EXPECT_EQ(kNoErr, DSDisposeHandleAndNull(&h));
+    EXPECT_EQ(nullptr, h);
+    EXPECT_EQ(kNoErr, DSDisposeHandleAndNull(&h));
+    EXPECT_EQ(kNoErr, DSDisposeHandleAndNull(nullptr));
+    EXPECT_EQ(kArgErr, DSDisposePtr(nullptr));
+    EXPECT_THAT(memory.reports.Texts(), ElementsAre("Memory error 1 in DSDisposePtr"));
+}
+
+TEST_F(Handles, AreCopiedAndAppended) {
+    UHandle source = Make("source"), copy = nullptr;
+    EXPECT_EQ(kNoErr, DSCopyHandle(&copy, source));
+    EXPECT_EQ("source", Content(copy));
+    EXPECT_EQ(kNoErr, DSPtrToXHand("xy", copy, 2));
+    EXPECT_EQ("xy", Content(copy));
+    EXPECT_EQ(kNoErr, DSCopyHandle(&copy, source));
+    EXPECT_EQ(kNoErr, DSPtrAndHand(" and", copy, 4));
+    EXPECT_EQ(kNoErr, DSHandAndHand(source, copy));
+    EXPECT_EQ("source andsource", Content(copy));
+    EXPECT_EQ(kNoErr, DSHandAndHand(source, source));
+    EXPECT_EQ("sourcesource", Content(source));
+    UHandle other = source;
+    EXPECT_EQ(kNoErr, DSHandToHand(&other));
+    EXPECT_NE(source, other);
+    EXPECT_EQ("sourcesource", Content(other));
+    EXPECT_EQ(kNoErr, DSSwapHandles(copy, other));
+    EXPECT_EQ("source andsource", Content(other));
+    EXPECT_EQ(other, DSRecoverHandle(*other));
+    EXPECT_THAT(memory.reports.Texts(), IsEmpty());
+
+    EXPECT_EQ(kNoErr, DSCopyHandle(&copy, copy));
+    EXPECT_TRUE(memory.reports.Has(kDebugWarning, "Should call DSHandToHand. This is a no-op"));
+    EXPECT_EQ(nullptr, DSRecoverHandle(*other + 1));
+    EXPECT_TRUE(memory.reports.Has(kDebugFatal, "Pointer passed to BRecoverHandle not linked to master pointer!"));
+    EXPECT_EQ(kNoErr, DSSwapHandles(copy, copy));
+    EXPECT_EQ(2u, memory.reports.CountAt(kDebugFatal));
+    EXPECT_EQ(kNoErr, DSCopyHandle(&copy, nullptr));
+    EXPECT_EQ(nullptr, copy);
+    DSDisposeHandle(source);
+    DSDisposeHandle(other);
+}
+
+// ---- procedures -----------------------------------------------------------------------------------------------------
+
+std::vector<std::string> calls;
+
+void TraceCall(int32 kind, MgErr err, UHandle h, uint32 newSize, uint32 oldSize) {
+    calls.push_back(std::to_string(kind) + ' ' + std::to_string(err) + (h ? " h " : " null ") +
+                    std::to_string(newSize) + ' ' + std::to_string(oldSize));
+}
+
+TEST_F(Handles, AreTracedAndTellWhenMemoryIsFull) {
+    calls.clear();
+    SetMemEventTraceProc(TraceCall);
+    EXPECT_EQ(nullptr, SetMemFullProc([](uint32 size) { calls.push_back("full " + std::to_string(size)); }));
+    UHandle h = DSNewHandle(10);
+    DSSetHandleSize(h, 12);
+    DSSetHandleSize(h, 12);
+    DSSetHandleSize(h, 0xFFFFFFFE);
+    EXPECT_EQ(nullptr, DSNewHandle(0xFFFFFFFF));
+    DSDisposeHandle(h);
+    SetMemEventTraceProc(nullptr);
+    CallSetMemFullProc(5);
+    EXPECT_THAT(calls, ElementsAre("0 0 h 10 0", "1 0 h 12 10", "1 0 h 12 12", "full 4294967294", "1 2 h 4294967294 12",
+                                   "full 4294967295", "0 2 null 4294967295 0", "2 0 h 12 0", "full 5"));
+    memory.Stop();
+    EXPECT_EQ(nullptr, SetMemFullProc(nullptr));  // the stop removed it
+}
+
+TEST_F(Handles, AreRecoveredAtTheStop) {
+    Make("twelve bytes");
+    DSDisposeHandle(Make("gone"));
+    Make("abc");
+    EXPECT_TRUE(GetMemoryManagerInitialized());
+    memory.Stop();
+    EXPECT_FALSE(GetMemoryManagerInitialized());
+    EXPECT_THAT(memory.reports.Texts(), ::testing::Contains(::testing::EndsWith("2 Handle Leaks (0 expected)")));
+    EXPECT_TRUE(memory.reports.Has(kDebugInfo, "Recovered 2 Handles for 15 bytes."));
+    EXPECT_THAT(memory.reports.Texts(), ::testing::Contains(::testing::EndsWith(", size 3 still allocated.")));
+}
+
+}  // namespace
+}  // namespace tessel

@@ -1,0 +1,43 @@
+#include "support/FailingAllocator.h"
+
+#include <atomic>
+#include <cstdlib>
+
+#include "diagnostics/TrackerHeap.h"
+#include "memory/Heap.h"
+
+namespace tessel::test {
+namespace {
+
+std::atomic<int> left;
+std::atomic<bool> failed;
+
+bool May(size_t) {
+    if (left.fetch_sub(1) != 1) return true;
+    failed = true;
+    return false;
+}
+
+}  // namespace
+
+FailingAllocator::FailingAllocator(int n) {
+    left = n;
+    failed = false;
+    heap::SetAllocationFilter(May);
+    SetTrackerHeapSource({[](size_t size) { return May(size) ? std::calloc(1, size) : nullptr; },
+                          [](void* block) {
+                              std::free(block);
+                              return true;
+                          }});
+}
+
+FailingAllocator::~FailingAllocator() {
+    heap::SetAllocationFilter(nullptr);
+    ResetTrackerHeapSource();
+}
+
+bool FailingAllocator::HasFailed() const {
+    return failed;
+}
+
+}  // namespace tessel::test

@@ -1,0 +1,21 @@
+// Makes the n-th allocation (from 1) of the library's heap fail while the object lives; with n = 0 none. The memory of
+// the trackers counts too. One object at a time.
+#ifndef TESSEL_TESTS_SUPPORT_FAILINGALLOCATOR_H
+#define TESSEL_TESTS_SUPPORT_FAILINGALLOCATOR_H
+
+namespace tessel::test {
+
+class FailingAllocator {
+public:
+    explicit FailingAllocator(int n);
+    ~FailingAllocator();
+    FailingAllocator(const FailingAllocator&) = delete;
+    FailingAllocator& operator=(const FailingAllocator&) = delete;
+
+    // Whether an allocation has failed.
+    bool HasFailed() const;
+};
+
+}  // namespace tessel::test
+
+#endif
