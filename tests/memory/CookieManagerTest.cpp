@@ -1,0 +1,234 @@
+#include <tessel/memory/CookieManager.h>
+
+#include <gmock/gmock.h>
+
+#include <atomic>
+#include <cstring>
+#include <thread>
+#include <vector>
+
+#include <tessel/memory/MemoryManager.h>
+
+#include "support/StartedMemory.h"
+
+namespace tessel {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::ElementsAreArray;
+using ::testing::EndsWith;
+
+struct Cookies : ::testing::Test {
+    test::StartedMemory memory;
+};
+
+uint32 GenerationOf(MagicCookie cookie) {
+    return cookie >> 20;
+}
+uint32 IndexOf(MagicCookie cookie) {
+    return cookie & 0xFFFFF;
+}
+void* Info(uintptr_t n) {
+    return reinterpret_cast<void*>(n);
+}
+
+std::vector<MagicCookie> ListOf(MagicCookieJar jar) {
+    UHandle list = nullptr;
+    EXPECT_EQ(kNoErr, MCGetCookieList(jar, &list));
+    auto words = reinterpret_cast<uint32*>(*list);
+    std::vector<MagicCookie> cookies(words + 1, words + 1 + words[0]);
+    DSDisposeHandle(list);
+    return cookies;
+}
+
+TEST_F(Cookies, AreRefusedOnceTheyAreStale) {
+    MagicCookieJar jar = MCNewJar();
+    ASSERT_NE(nullptr, jar);
+    void* info = Info(0x1234);
+    MagicCookie first = MCNewCookie(jar, &info), second = MCNewCookie(jar, &info);
+    EXPECT_EQ(0u, IndexOf(first));
+    EXPECT_EQ(1u, IndexOf(second));
+    EXPECT_EQ(GenerationOf(first) % 4095 + 1, GenerationOf(second));
+    void* out = nullptr;
+    EXPECT_EQ(kNoErr, MCDisposeCookie(jar, first, &out));
+    EXPECT_EQ(info, out);
+    void* other = Info(0x5678);
+    MagicCookie third = MCNewCookie(jar, &other);
+    EXPECT_EQ(0u, IndexOf(third));
+
+    void* untouched = Info(1);
+    void** place = &untouched;
+    for (MagicCookie stale : {first, 0u, IndexOf(second), third + 100, third ^ 0x00100000}) {
+        EXPECT_FALSE(MCIsACookie(jar, stale));
+        EXPECT_EQ(kArgErr, MCGetCookieInfo(jar, stale, &untouched));
+        EXPECT_EQ(kArgErr, MCSetCookieInfo(jar, stale, &info));
+        EXPECT_EQ(kArgErr, MCDisposeCookie(jar, stale, &untouched));
+        EXPECT_EQ(kArgErr, MCGetCookieInfoPtr(jar, stale, reinterpret_cast<void**>(&place)));
+        EXPECT_EQ(nullptr, place);
+    }
+    EXPECT_EQ(Info(1), untouched);
+    EXPECT_EQ(kNoErr, MCGetCookieInfoPtr(jar, third, reinterpret_cast<void**>(&place)));
+    EXPECT_EQ(other, *place);
+    EXPECT_EQ(third, MCGetCookieForInfo(jar, &other));
+    EXPECT_EQ(kNoErr, MCSetCookieInfo(jar, third, &info));
+    EXPECT_EQ(third, MCGetCookieForInfo(jar, &info));  // the lower index
+    EXPECT_EQ(0u, MCGetCookieForInfo(jar, &other));
+    EXPECT_EQ(0u, MCNewCookie(nullptr, &info));
+    EXPECT_EQ(kArgErr, MCJarSize(nullptr, nullptr));
+    EXPECT_EQ(kNoErr, MCDisposeJar(jar));
+    EXPECT_EQ(kNoErr, MCDisposeJar(nullptr));
+    EXPECT_TRUE(memory.reports.Has(kDebugInfo, "Disposing jar with 2 cookies remaining"));
+}
+
+// Indices over several pouches and arrays, and generations around their end.
+TEST_F(Cookies, AreListedByIndex) {
+    constexpr uint32 kCookies = 70000;
+    MagicCookieJar jar = MCNewBigJar(5);
+    std::vector<MagicCookie> cookies;
+    for (uint32 i = 0; i < kCookies; ++i) {
+        char info[5];
+        std::memcpy(info, &i, 4);
+        cookies.push_back(MCNewCookie(jar, info));
+        ASSERT_EQ(i, IndexOf(cookies[i]));
+        ASSERT_GE(GenerationOf(cookies[i]), 1u);
+        ASSERT_EQ(GenerationOf(i > 0 ? cookies[i - 1] : cookies[i] - 0x100000) % 4095 + 1, GenerationOf(cookies[i]));
+    }
+    for (uint32 i : {5u, 64u, 69999u}) {
+        uint32 n = 0;
+        char info[5];
+        EXPECT_EQ(kNoErr, MCGetCookieInfo(jar, cookies[i], info));
+        std::memcpy(&n, info, 4);
+        EXPECT_EQ(i, n);
+        EXPECT_EQ(kNoErr, MCDisposeCookie(jar, cookies[i], nullptr));
+    }
+    cookies[64] = 0;  // the last freed is the first reused
+    cookies[69999] = MCNewCookie(jar, "abcd");
+    EXPECT_EQ(69999u, IndexOf(cookies[69999]));
+    cookies[64] = MCNewCookie(jar, "abcd");
+    cookies.erase(cookies.begin() + 5);
+    EXPECT_THAT(ListOf(jar), ElementsAreArray(cookies));
+    int32 count = 0;
+    EXPECT_EQ(kNoErr, MCJarSize(jar, &count));
+    EXPECT_EQ(69999, count);
+    MCDisposeJar(jar);
+}
+
+TEST_F(Cookies, JarsReportTheirSize) {
+    constexpr uint32 kPointer = sizeof(void*);
+    constexpr uint32 kRecord = kPointer == 4 ? 36 : 48, kEntry = kPointer == 4 ? 16 : 24;
+    uint32 size = kRecord + (16 + 32 + 32) * kPointer + 64 * kEntry;
+    EXPECT_EQ(kPointer == 4 ? 1380u : 2224u, size);
+    for (uint32 n : {1u, 2u}) {
+        MagicCookieJar jar = MCNewJar();
+        void* info = nullptr;
+        MagicCookie cookie = MCNewCookie(jar, &info);
+        MCNewCookie(jar, &info);
+        MCDisposeCookie(jar, cookie, nullptr);
+        memory.reports.Clear();
+        MCDisposeJar(jar);
+        auto texts = memory.reports.Texts(kDebugInfo);
+        ASSERT_EQ(2u, texts.size());
+        EXPECT_THAT(texts[1], ::testing::HasSubstr("): highWater=2; nTreeNodes=3; nPouches=1; size=" +
+                                                   std::to_string(size) + "; total="));
+        static uint32 first = static_cast<uint32>(std::stoul(texts[1].substr(texts[1].rfind('=') + 1)));
+        EXPECT_THAT(texts[1], EndsWith("; total=" + std::to_string(first + (n - 1) * size)));
+    }
+}
+
+TEST_F(Cookies, CarryRights) {
+    int target = 0;
+    CookieJar<int*> jar;
+    int* out = &target;
+    EXPECT_EQ(0, jar.AcquireCookieRights(0x100000, &out));
+    ASSERT_EQ(kNoErr, jar.Init(1));
+    MagicCookie cookie = jar.NewCookie(&target);
+    EXPECT_EQ(1, jar.AcquireCookieRights(cookie, &out));
+    EXPECT_EQ(&target, out);
+    EXPECT_EQ(1, jar.AcquireCookieRights(cookie, nullptr));
+    EXPECT_EQ(3, jar.ReleaseCookieRights(cookie));
+    EXPECT_EQ(2, jar.ReleaseCookieRights(cookie));
+    EXPECT_EQ(1, jar.ReleaseCookieRights(cookie));
+    EXPECT_EQ(0, jar.AcquireCookieRights(cookie, &out));
+    EXPECT_EQ(nullptr, out);
+    EXPECT_EQ(0, jar.ReleaseCookieRights(cookie));
+    EXPECT_FALSE(jar.IsACookie(cookie));
+    int32 count = -1;
+    EXPECT_EQ(kNoErr, jar.GetNumCookies(&count));
+    EXPECT_EQ(0, count);
+    EXPECT_EQ(kNoErr, jar.Uninit());
+    EXPECT_FALSE(jar.IsAValidJar());
+
+    ASSERT_EQ(kNoErr, jar.Init());  // without rights
+    cookie = jar.NewCookie(&target);
+    EXPECT_EQ(0, jar.AcquireCookieRights(cookie, &out));
+    EXPECT_EQ(0, jar.ReleaseCookieRights(cookie));
+    EXPECT_TRUE(jar.IsACookie(cookie));
+    jar.Uninit();
+}
+
+TEST_F(Cookies, FillLists) {
+    CookieList list;
+    EXPECT_EQ(kArgErr, list.SetCount(-1));
+    EXPECT_EQ(kArgErr, list.SetCookie(0, 5));
+    EXPECT_EQ(kNoErr, list.SetCount(2));
+    EXPECT_EQ(kNoErr, list.SetCookie(1, 7));
+    EXPECT_EQ(kNoErr, list.SetCount(3));
+    EXPECT_THAT(
+        (std::vector{list.GetCookie(0), list.GetCookie(1), list.GetCookie(2), list.GetCookie(3), list.GetCookie(-1)}),
+        ElementsAre(0, 7, 0, 0, 0));
+    CookieJar<int*> jar;
+    EXPECT_EQ(kNoErr, jar.GetCookieList(&list));
+    EXPECT_EQ(0, list.GetCount());
+    ASSERT_EQ(kNoErr, jar.Init());
+    MagicCookie first = jar.NewCookie(nullptr), second = jar.NewCookie(nullptr);
+    EXPECT_EQ(kNoErr, jar.GetCookieList(&list));
+    EXPECT_THAT(
+        (std::vector{list.GetCount(), static_cast<int32>(list.GetCookie(0)), static_cast<int32>(list.GetCookie(1))}),
+        ElementsAre(2, static_cast<int32>(first), static_cast<int32>(second)));
+    jar.Uninit();
+    EXPECT_EQ(kNoErr, jar.GetCookieList(&list));
+    EXPECT_EQ(0u, list.GetCookie(0));
+}
+
+// Threads make, look up and end cookies; one holds rights while another gives them back. Every object is ended once.
+TEST_F(Cookies, AreSafeBetweenThreads) {
+    constexpr int kThreads = 8, kRounds = 3000;
+    CookieJar<std::atomic<int>*> jar;
+    ASSERT_EQ(kNoErr, jar.Init(1));
+    std::atomic<MagicCookie> offered{0};
+    std::atomic<int> ended{0}, wrong{0};
+    std::vector<std::atomic<int>> users(kThreads * kRounds);
+    auto release = [&](MagicCookie cookie) {
+        if (jar.ReleaseCookieRights(cookie) == 1) ++ended;
+    };
+    auto work = [&](int thread) {
+        for (int i = 0; i < kRounds; ++i) {
+            std::atomic<int>& mine = users[static_cast<size_t>(thread * kRounds + i)];
+            MagicCookie cookie = jar.NewCookie(&mine);
+            offered = cookie;
+            MagicCookie other = offered;
+            std::atomic<int>* object = nullptr;
+            if (jar.AcquireCookieRights(other, &object)) {
+                if (!object)
+                    ++wrong;
+                else
+                    object->fetch_add(1);
+                release(other);
+            }
+            if (jar.GetCookieInfo(cookie, &object) != kNoErr || object != &mine) ++wrong;
+            release(cookie);
+        }
+    };
+    std::vector<std::thread> threads;
+    for (int i = 0; i < kThreads; ++i) threads.emplace_back(work, i);
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_EQ(0, wrong);
+    EXPECT_EQ(kThreads * kRounds, ended);
+    int32 left = -1;
+    jar.GetNumCookies(&left);
+    EXPECT_EQ(0, left);
+    jar.Uninit();
+}
+
+}  // namespace
+}  // namespace tessel

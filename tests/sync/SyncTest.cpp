@@ -1,0 +1,345 @@
+#include <gmock/gmock.h>
+
+#include <atomic>
+#include <thread>
+#include <vector>
+
+#include <tessel/sync/PlatformEvent.h>
+#include <tessel/sync/PlatformEventTimer.h>
+#include <tessel/sync/PlatformMutex.h>
+#include <tessel/sync/ThAtomic.h>
+#include <tessel/sync/ThEvent.h>
+#include <tessel/sync/ThLocalStorage.h>
+#include <tessel/sync/ThMutex.h>
+#include <tessel/sync/ThSleep.h>
+#include <tessel/time/Millisecs.h>
+
+#include "support/HandClock.h"
+#include "support/ReportRecorder.h"
+#include "sync/ProtectedAtomicOperations.h"
+#include "sync/Service.h"
+
+namespace tessel {
+namespace {
+
+using ::testing::Contains;
+using ::testing::ElementsAre;
+using ::testing::EndsWith;
+
+struct Sync : ::testing::Test {
+    test::ReportRecorder reports;
+
+    ThEvent NewEvent(bool signaled = false) {
+        ThEvent event = nullptr;
+        EXPECT_EQ(kNoErr, ThEventCreate(&event, 0, signaled));
+        return event;
+    }
+    ThMutex NewMutex() {
+        ThMutex mutex = nullptr;
+        EXPECT_EQ(kNoErr, ThMutexCreate(&mutex, "test"));
+        return mutex;
+    }
+};
+
+template <class Work>
+void InThreads(int count, Work work) {
+    std::vector<std::thread> threads;
+    for (int i = 0; i < count; ++i) threads.emplace_back(work, i);
+    for (std::thread& thread : threads) thread.join();
+}
+
+TEST_F(Sync, SignalsCountAsOneUntilTheyAreTaken) {
+    ThEvent event = NewEvent(true);
+    EXPECT_EQ(kThEventVerifier, event->verifier);
+    EXPECT_EQ(1, ThEventReset(event));
+    EXPECT_EQ(0, ThEventReset(event));
+    EXPECT_EQ(0, ThEventSignal(event));
+    EXPECT_EQ(0, ThEventSignal(event));
+    EXPECT_EQ(kNoErr, ThEventWaitWithTimeout(event, 0));
+    EXPECT_EQ(kTimeOutErr, ThEventWaitWithTimeout(event, 0));
+    EXPECT_EQ(kTimeOutErr, ThEventWaitWithTimeout(event, 20));
+    ThEventDestroy(event);
+}
+
+TEST_F(Sync, NoWakeUpIsLost) {
+    constexpr int kRounds = 20000;
+    ThEvent ping = NewEvent(), pong = NewEvent();
+    int shared = 0;  // handed from one thread to the other
+    std::thread partner([&] {
+        for (int i = 0; i < kRounds; ++i) {
+            ThEventWait(ping);
+            ++shared;
+            ThEventSignal(pong);
+        }
+    });
+    for (int i = 0; i < kRounds; ++i) {
+        ++shared;
+        ThEventSignal(ping);
+        ASSERT_EQ(kNoErr, ThEventWaitWithTimeout(pong, 60000));
+    }
+    partner.join();
+    EXPECT_EQ(2 * kRounds, shared);
+    ThEventDestroy(ping);
+    ThEventDestroy(pong);
+}
+
+TEST_F(Sync, EachSignalReleasesOneOfManyWaiters) {
+    constexpr int kThreads = 8;
+    ThEvent event = NewEvent();
+    std::atomic<int> released{0}, timedOut{0};
+    std::thread signaler([&] {
+        // One signal for each waiter, the next when the one before has been taken.
+        for (int i = 0; i < kThreads; ++i) {
+            ThEventSignal(event);
+            while (released <= i) std::this_thread::yield();
+        }
+    });
+    InThreads(kThreads, [&](int) { ThEventWaitWithTimeout(event, 60000) == kNoErr ? ++released : ++timedOut; });
+    signaler.join();
+    EXPECT_EQ(kThreads, released);
+    EXPECT_EQ(kTimeOutErr, ThEventWaitWithTimeout(event, 0));
+    ThEventDestroy(event);
+}
+
+int customSignals;
+
+TEST_F(Sync, SignalsCallTheirProcedureFirst) {
+    ThEvent event = nullptr;
+    customSignals = 0;
+    EXPECT_EQ(kNoErr, ThEventCreateWithCustomSignal(&event, 7, false, [] { ++customSignals; }));
+    ThEventSignal(event);
+    ThEventSignal(event);
+    EXPECT_EQ(2, customSignals);
+    ThEventDestroy(event);
+}
+
+TEST_F(Sync, WaitsForSeveralThings) {
+    ThEvent first = NewEvent(), second = NewEvent();
+    EXPECT_EQ(0, ThEventMsgWaitMultiple(first, second, 0, false));
+    ThEventSignal(second);
+    EXPECT_EQ(0, ThEventMsgWaitMultiple(first, second, 1000, true));
+    EXPECT_EQ(kTimeOutErr, ThEventWaitWithTimeout(second, 0));  // its signal was taken
+    ThEventSignal(first);
+    EXPECT_EQ(1, ThEventMsgWaitMultiple(first, second, 1000, true));
+    ThEventSignal(first);
+    EXPECT_EQ(1, ThEventMsgWaitMultiple(first, first, 1000, false));
+    ThEventMessageArrived();
+    EXPECT_EQ(0, ThEventMsgWaitMultiple(first, nullptr, 0, false));
+    EXPECT_EQ(0, ThEventMsgWaitMultiple(first, nullptr, -1, true));  // the message, or it would wait for ever
+    std::thread signaler([&] { ThEventSignal(first); });
+    EXPECT_EQ(1, ThEventMsgWaitMultiple(first, second, -1, true));
+    signaler.join();
+
+    int calls = 0;
+    auto pump = [](void* argument) -> MgErr { return ++*static_cast<int*>(argument) + 40; };
+    EXPECT_EQ(kMemFullErr, ThEventWaitAndPump(first, pump, 10, &calls));
+    EXPECT_EQ(42, ThEventWaitAndPump(nullptr, pump, 10, &calls));
+    ThEventDestroy(first);
+    ThEventDestroy(second);
+}
+
+TEST_F(Sync, BadEventsAreReported) {
+    THEVENTREC bad{0, nullptr, nullptr};
+    EXPECT_EQ(0, ThEventSignal(&bad));
+    EXPECT_EQ(0, ThEventReset(&bad));
+    EXPECT_EQ(kArgErr, ThEventWait(&bad));
+    EXPECT_EQ(1, ThEventMsgWaitMultiple(&bad, nullptr, 0, false));
+    ThEventDestroy(&bad);
+    EXPECT_THAT(reports.Texts(kDebugFatal), ElementsAre("Bad verifier in event.", "", "", "", ""));
+    EXPECT_EQ(0, ThEventSignal(nullptr));
+    EXPECT_EQ(0, ThEventReset(nullptr));
+    EXPECT_EQ(kArgErr, ThEventWait(nullptr));
+    EXPECT_EQ(1, ThEventMsgWaitMultiple(nullptr, nullptr, 0, false));
+    ThEventDestroy(nullptr);
+    EXPECT_THAT(reports.Texts(kDebugError), ElementsAre("Bad ThEvent in ThEventDestroy()"));
+    THMUTEXREC badMutex{-1, nullptr, 0};
+    ThMutexDestroy(&badMutex);
+    EXPECT_TRUE(reports.Has(kDebugError, "bad mutex verifier in ThMutexDestroy"));
+    ThMutexDestroy(nullptr);
+    ThMutexAcquire(nullptr);
+    ThMutexRelease(nullptr);
+}
+
+// An event that has measured, and refuses to end.
+class MeasuringEvent final : public PlatformEvent {
+public:
+    int32 Signal() override { return 0; }
+    int32 Reset() override { return 0; }
+    int32 Wait(int32) override { return 0; }
+    MgErr WaitAndPump(ThEventPumpProc, void*, int32) override { return 0; }
+    int32 MsgWaitMultiple(PlatformEvent*, bool, int32, bool*, bool*) override { return 0; }
+    void GetLatencyStats(uint32* count, _HRTime* total, _HRTime*, _HRTime* minimum, _HRTime* maximum) override {
+        test::HandClock clock(1000);
+        PlatformEventTimer timer;
+        for (int latency : {3, 1, 4}) {
+            timer.Start();
+            clock.Advance(latency);
+            timer.RecordLatency();
+        }
+        clock.Advance(-2);
+        timer.Start();
+        clock.Advance(-1);
+        timer.RecordLatency();  // the clock went backwards: not counted
+        timer.GetLatencyStats(count, total, nullptr, minimum, maximum);
+    }
+    MgErr Init(bool) override { return kNoErr; }
+    MgErr Uninit() override { return kGenericErr; }
+};
+
+TEST_F(Sync, EventsReportTheirLatencies) {
+    ThEvent event = NewEvent();
+    DestroyPlatformEvent(event->platformEvent);
+    event->platformEvent = new MeasuringEvent;
+    ThEventDestroy(event);
+    EXPECT_THAT(reports.Texts(),
+                ElementsAre("ThEventDestroy:: (ms) avg latency=2.66667; nEvents=3; min=1.00000; max=4.00000",
+                            "DestroyPlatformEvent failed with MgErr 42."));
+}
+
+TEST_F(Sync, MutexesExclude) {
+    constexpr int kThreads = 8, kRounds = 20000;
+    ThMutex mutex = NewMutex();
+    int count = 0;
+    InThreads(kThreads, [&](int thread) {
+        for (int i = 0; i < kRounds; ++i) {
+            ThMutexHolder hold(mutex);
+            ++count;
+            if (i % 5000 == thread) std::this_thread::yield();
+        }
+    });
+    EXPECT_EQ(kThreads * kRounds, count);
+    EXPECT_EQ(-1, mutex->count);
+    EXPECT_EQ(kThMutexVerifier, mutex->verifier);
+    ThMutexDestroy(mutex);
+}
+
+TEST_F(Sync, ASleeperIsHandedTheMutex) {
+    ThMutex mutex = NewMutex();
+    ThMutexAcquire(mutex);
+    bool reached = false;
+    std::thread waiter([&] {
+        ThMutexAcquire(mutex);
+        reached = true;
+        ThMutexRelease(mutex);
+    });
+    while (__atomic_load_n(&mutex->count, __ATOMIC_ACQUIRE) != 1) std::this_thread::yield();
+    EXPECT_FALSE(reached);
+    ThMutexRelease(mutex);
+    waiter.join();
+    EXPECT_TRUE(reached);
+    EXPECT_EQ(-1, mutex->count);
+    ThMutexDestroy(mutex);
+}
+
+TEST_F(Sync, TrackersReportWhatIsLeft) {
+    EXPECT_EQ(kNoErr, ThEventStart());
+    EXPECT_EQ(kNoErr, ThMutexStart());
+    ThMutex one = NewMutex(), two = NewMutex();
+    ThEventDestroy(NewEvent());
+    EXPECT_EQ(kNoErr, ThMutexStop());
+    ThMutexDestroy(two);
+    EXPECT_EQ(kNoErr, ThEventStop());
+    EXPECT_THAT(reports.Texts(kDebugInfo), Contains(EndsWith("(1) : 2 Mutex Leaks (1 expected)")));
+    EXPECT_TRUE(reports.Has(kDebugInfo, "Total Event Leaks = 1.\n"));  // as many as expected
+    ThMutexDestroy(one);
+}
+
+TEST(Atomics, ReturnWhatTheyShould) {
+    int32 word = 0x7FFFFFFF;
+    EXPECT_EQ(INT32_MIN, _ThAtomicInc(&word));
+    EXPECT_EQ(0x7FFFFFFF, _ThAtomicDec(&word));
+    EXPECT_EQ(0x7FFFFFFF, ThAtomicSwap(&word, 5));
+    EXPECT_EQ(0, ThSwapIfSame(&word, 6, 4));
+    EXPECT_EQ(5, word);
+    EXPECT_EQ(1, ThSwapIfSame(&word, 6, 5));
+    EXPECT_EQ(6, word);
+    void* pointer = &word;
+    EXPECT_EQ(&word, ThAtomicSwapPtr(&pointer, nullptr));
+    EXPECT_EQ(0, ThSwapIfSamePtr(&pointer, &word, &word));
+    EXPECT_EQ(1, ThSwapIfSamePtr(&pointer, &word, nullptr));
+    EXPECT_EQ(&word, pointer);
+}
+
+// Writers store words whose halves agree; no reader may see two halves of different writes.
+TEST_F(Sync, EightBytesGoAtOnce) {
+    EXPECT_EQ(kNoErr, ProtectedAtomicOperationsStart());
+    EXPECT_TRUE(AtomicsInHardware());
+    for (bool hardware : {true, false}) {
+        SetAtomicsInHardware(hardware);
+        ThMutex mutex = NewMutex();
+        std::atomic<int> torn{0};
+        uint64 shared = 0;
+        InThreads(4, [&](int thread) {
+            for (uint64 i = 0; i < 5000; ++i) {
+                uint64 half = i * 4 + static_cast<uint64>(thread), own = half << 32 | half, seen;
+                Th8ByteAtomicWrtRd(&own, &shared, 1, mutex);
+                Th8ByteAtomicWrtRd(&seen, &shared, 0, mutex);
+                if (seen >> 32 != (seen & 0xFFFFFFFF)) ++torn;
+            }
+        });
+        EXPECT_EQ(0, torn);
+        uint64 own = 1, last = shared;
+        Th8ByteAtomicWrtRd(&own, &shared, 0, nullptr);
+        EXPECT_EQ(last, own);
+        EXPECT_EQ(last, shared);
+        ThMutexDestroy(mutex);
+    }
+    ProtectedAtomicOperationsStart();
+}
+
+TEST(Sleeping, EndsJustBeforeTheDeadline) {
+    test::HandClock clock(5000);
+    uint32 now = MilliSecs();
+    EXPECT_EQ(now, ThWaitTill(now, now));
+    EXPECT_EQ(now, ThWaitTill(now - 5, now));
+    EXPECT_EQ(now + 1, ThWaitTill(now + 1, now));
+    now = MilliSecs();
+    EXPECT_EQ(now + 99, ThWaitTill(now + 100, now));
+    ThSleep(7);
+    EXPECT_EQ(now + 106, MilliSecs());
+    ThPause(3);
+}
+
+TEST(LocalStorage, KeepsAValueForEachThread) {
+    uint32 key = ThLocalStorageAllocateKey(), other = ThLocalStorageAllocateKey();
+    ASSERT_NE(kThNoLocalStorageKey, key);
+    ASSERT_NE(key, other);
+    ThLocalStorageSetValue(key, &key);
+    InThreads(2, [&](int thread) {
+        EXPECT_EQ(nullptr, ThLocalStorageGetValue(key));
+        ThLocalStorageSetValue(key, &thread);
+        EXPECT_EQ(&thread, ThLocalStorageGetValue(key));
+    });
+    EXPECT_EQ(&key, ThLocalStorageGetValue(key));
+    EXPECT_EQ(nullptr, ThLocalStorageGetValue(other));
+    ThLocalStorageFreeKey(key);
+    ThLocalStorageFreeKey(other);
+}
+
+TEST(PlatformObjects, WorkByThemselves) {
+    PlatformEvent* event = CreatePlatformEvent(true);
+    ASSERT_NE(nullptr, event);
+    EXPECT_EQ(0, event->Wait(0));
+    EXPECT_EQ(1, event->Wait(0));
+    uint32 count = 5;
+    _HRTime total{1, 1};
+    event->GetLatencyStats(&count, &total, nullptr, nullptr, nullptr);
+    EXPECT_EQ(0u, count + total.high + total.low);
+    EXPECT_EQ(kNoErr, DestroyPlatformEvent(event));
+    EXPECT_EQ(kNoErr, DestroyPlatformEvent(nullptr));
+    PlatformMutex* mutex = CreatePlatformMutex();
+    ASSERT_NE(nullptr, mutex);
+    int sum = 0;
+    InThreads(4, [&](int) {
+        for (int i = 0; i < 5000; ++i) {
+            mutex->Lock();
+            ++sum;
+            mutex->Unlock();
+        }
+    });
+    EXPECT_EQ(20000, sum);
+    EXPECT_EQ(kNoErr, DestroyPlatformMutex(mutex));
+}
+
+}  // namespace
+}  // namespace tessel
