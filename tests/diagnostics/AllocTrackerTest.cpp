@@ -125,7 +125,7 @@ std::vector<uintptr_t> StackOf(AllocTracker& tracker, uintptr_t address) {
 
 bool IsIn(uintptr_t address, void (*function)(AllocTracker&, uintptr_t)) {
     const auto begin = reinterpret_cast<uintptr_t>(function);
-    return address > begin && address < begin + 64;
+    return address > begin && address < begin + 512;
 }
 
 TEST_F(AllocTrackerTest, RecordsTheCallsThatMadeTheObject) {

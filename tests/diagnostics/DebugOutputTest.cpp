@@ -38,7 +38,6 @@ TEST(DebugOutput, DefaultBehaviourCountsAndShowsSeriousReports) {
 }
 
 TEST(DebugOutputDeathTest, FatalReportEndsTheProcess) {
-    GTEST_FLAG_SET(death_test_style, "threadsafe");
     EXPECT_EXIT(TESSEL_REPORT(kDebugFatal, 0x2Au) << "the end", ExitedWithCode(1), "ERR 2a: .*: the end");
 }
 

@@ -1,0 +1,138 @@
+#include <gtest/gtest.h>
+#include <stdlib.h>
+#include <sys/mman.h>
+#include <tessel/base/OVExcept.h>
+#include <tessel/diagnostics/DumpLeakInfo.h>
+#include <tessel/diagnostics/FileLoc.h>
+
+#include <cstring>
+#include <filesystem>
+#include <memory>
+
+#include "support/ReportRecorder.h"
+#include "support/ScratchDrive.h"
+
+namespace tessel {
+namespace {
+
+using test::ReportRecorder;
+using Texts = std::vector<std::string>;
+
+// The temporary folder is on the scratch drive.
+class DumpLeakInfoTest : public testing::Test {
+protected:
+    DumpLeakInfoTest() { setenv("TMPDIR", drive.Native().c_str(), 1); }
+    ~DumpLeakInfoTest() override {
+        DestroyAllocTracker(tracker);
+        unsetenv("TMPDIR");
+    }
+    bool FileExists() const { return std::filesystem::exists(drive.Native("leaks.txt")); }
+
+    test::ScratchDrive drive;
+    ReportRecorder recorder;
+    AllocTracker* const tracker = CreateAllocTracker();
+};
+
+TEST_F(DumpLeakInfoTest, AsManyAsExpectedIsOnlyATotal) {
+    tracker->AddRecord(this, 1, "f.cpp", 1);
+    DumpLeakInfo(tracker, 1, "Thing Leaks", "leaks.txt");
+    EXPECT_EQ(Texts{"Total Thing Leaks = 1.\n"}, recorder.Texts(kDebugInfo));
+    EXPECT_EQ(1u, recorder.Count());
+    EXPECT_FALSE(FileExists());
+    DumpLeakInfo(nullptr, 1, "Thing Leaks", "leaks.txt");
+    EXPECT_EQ(1u, recorder.Count());
+}
+
+TEST_F(DumpLeakInfoTest, MoreThanExpectedAreWrittenToTheFile) {
+    const char object[] = "A\ttext\x80.";
+    const std::string big(300, 'b');
+    tracker->AddRecord(object, sizeof object, "maker.cpp", 77);
+    tracker->AddRecord(big.data(), 300, "maker.cpp", 78);
+    drive.Put("leaks.txt", "what was there before");
+    DumpLeakInfo(tracker, 1, "Thing Leaks", "leaks.txt");
+    const Texts infos = recorder.Texts(kDebugInfo);
+    ASSERT_EQ(1u, infos.size());
+    EXPECT_TRUE(infos[0].ends_with("\\leaks.txt(1) : 2 Thing Leaks (1 expected)")) << infos[0];
+    EXPECT_EQ(Texts{"We got 1 more Thing Leaks than we see from a basic launch and quit.\n"},
+              recorder.Texts(kDebugError));
+    const std::string text = drive.Get("leaks.txt");
+    EXPECT_EQ(0u, text.find("****************************************\n** List of currently allocated Thing Leaks"));
+    EXPECT_NE(std::string::npos, text.find("File maker.cpp      ; Line 77    # "));
+    EXPECT_NE(std::string::npos, text.find("\nMemory Contents: A.text...\n")) << text;
+    EXPECT_NE(std::string::npos, text.find("\nMemory Contents: " + std::string(254, 'b') + "\n"));
+    EXPECT_NE(std::string::npos, text.find("\nNumber of unfreed items: 2\n\n2 Thing Leaks\n"));
+}
+
+TEST_F(DumpLeakInfoTest, ManyRecordsAreWrittenWhole) {
+    static const char objects[2000] = {};
+    for (const char& object : objects) tracker->AddRecord(&object, 1, "maker.cpp", 1);
+    DumpLeakInfo(tracker, 0, "Thing Leaks", "leaks.txt");
+    const std::string text = drive.Get("leaks.txt");
+    size_t count = 0;
+    for (size_t at = text.find("\nMemory Contents: .\n"); at != std::string::npos;
+         at = text.find("\nMemory Contents: .\n", at + 1))
+        ++count;
+    EXPECT_EQ(2000u, count);
+    EXPECT_TRUE(text.ends_with("\n2000 Thing Leaks\n"));
+}
+
+TEST_F(DumpLeakInfoTest, AnObjectThatCannotBeReadIsEmpty) {
+    void* const page = mmap(nullptr, 4096, PROT_NONE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+    tracker->AddRecord(page, 100, "maker.cpp", 1);
+    DumpLeakInfo(tracker, 0, "Thing Leaks", "leaks.txt");
+    munmap(page, 4096);
+    EXPECT_NE(std::string::npos, drive.Get("leaks.txt").find("\nMemory Contents: \n"));
+}
+
+TEST_F(DumpLeakInfoTest, WithoutAFileTheSummaryStays) {
+    tracker->AddRecord(this, 1, "f.cpp", 1);
+    DumpLeakInfo(tracker, 0, "Thing Leaks", "no\\such\\folder.txt");
+    DumpLeakInfo(tracker, 0, "Thing Leaks", std::string(600, 'n').c_str());
+    DumpLeakInfo(tracker, 0, "Thing Leaks", nullptr);
+    EXPECT_EQ(Texts(3, "We got 1 more Thing Leaks than we see from a basic launch and quit.\n"),
+              recorder.Texts(kDebugError));
+    EXPECT_EQ(1u, recorder.CountAt(kDebugInfo)) << "the one whose location is good";
+}
+
+std::string Failure(int32 code, const char* name, bool addTxt) {
+    try {
+        delete CreateFileLoc(code, name, addTxt);
+        return "";
+    } catch (const OVExcept& e) {
+        return std::to_string(e.Code()) + ' ' + e.Detail();
+    }
+}
+
+std::string PathText(int32 code, const std::string& name, bool addTxt) {
+    const std::unique_ptr<FileLoc> location(CreateFileLoc(code, name.c_str(), addTxt));
+    return location->PathText();
+}
+
+TEST(FileLoc, PlacesTheNameByItsCode) {
+    EXPECT_EQ("C:\\dir\\f", PathText(1, "C:\\dir\\f", false));
+    EXPECT_EQ("C:\\dir\\f.txt", PathText(-1, "C:\\dir\\f", true));
+    setenv("TMPDIR", "/some/where", 1);
+    for (int32 code : {0, 2, 4}) EXPECT_EQ("C:\\some\\where\\f", PathText(code, "f", false));
+    unsetenv("TMPDIR");
+    const std::unique_ptr<FileLoc> location(CreateFileLoc(1, "name", false));
+    const std::unique_ptr<FileLoc> clone(location->Clone());
+    EXPECT_NE(location->PathText(), clone->PathText());
+    EXPECT_STREQ("name", clone->PathText());
+}
+
+TEST(FileLoc, RefusesWhatDoesNotFit) {
+    const std::string n511(511, 'n'), n512(512, 'n'), n516(516, 'n'), n517(517, 'n');
+    EXPECT_EQ("1 inFilename is NULL", Failure(4, nullptr, false));
+    EXPECT_EQ(n516, PathText(1, n516, false));
+    EXPECT_EQ("7 Path too long", Failure(1, n517.c_str(), false));
+    EXPECT_EQ(n511 + ".txt", PathText(1, n511, true));
+    EXPECT_EQ("7 Path too long", Failure(1, n512.c_str(), true));
+    setenv("TMPDIR", "/t", 1);  // "C:\t\" is five bytes
+    EXPECT_EQ("C:\\t\\" + n511, PathText(4, n511, false));
+    EXPECT_EQ("7 Path too long", Failure(4, n512.c_str(), false));
+    EXPECT_EQ("7 Path too long", Failure(4, n511.c_str(), true));
+    unsetenv("TMPDIR");
+}
+
+}  // namespace
+}  // namespace tessel
