@@ -22,6 +22,19 @@ constexpr auto kPowersOfTen = [] {
     return powers;
 }();
 
+/* For the values of each bit width from 1: added to a value it brings the number of digits into the upper half. */
+constexpr auto kDigitCounts = [] {
+    std::array<uint64, 32> counts{};
+    size_t digits = 1; /* of the smallest value of that width */
+    for (size_t i = 0; i < counts.size(); ++i) {
+        const uint64 smallest = uint64{1} << i;
+        while (digits < 10 && smallest >= kPowersOfTen[digits]) ++digits;
+        const bool grows = digits < 10 && kPowersOfTen[digits] < 2 * smallest;
+        counts[i] = grows ? (uint64{digits + 1} << 32) - kPowersOfTen[digits] : uint64{digits} << 32;
+    }
+    return counts;
+}();
+
 /* "00" to "99" */
 constexpr auto kDigitPairs = [] {
     std::array<char, 200> pairs{};
@@ -34,8 +47,12 @@ constexpr auto kDigitPairs = [] {
 
 /* At least 1. */
 inline size_t CountDecimalDigits(uint64 value) {
-    const auto guess = static_cast<size_t>(std::bit_width(value | 1) * 1233 >> 12); /* 1233 / 4096 is about log10(2) */
-    return guess + (guess < kMaxDecimalDigits && (value | 1) >= kPowersOfTen[guess]);
+    if (value <= UINT32_MAX) {
+        const auto small = static_cast<uint32>(value);
+        return static_cast<size_t>((small + kDigitCounts[std::bit_width(small | 1u) - 1]) >> 32);
+    }
+    const auto guess = static_cast<size_t>(std::bit_width(value) * 1233 >> 12); /* 1233 / 4096 is about log10(2) */
+    return guess + (guess < kMaxDecimalDigits && value >= kPowersOfTen[guess]);
 }
 
 /* Writes the digits so that they end at `end`. */

@@ -27,12 +27,14 @@ union FmtValue {
     const void* pointer;
 };
 
+/* A va_list that can be passed by reference on every host. */
+struct FmtArgumentList {
+    va_list list;
+};
+
 class FmtArguments {
 public:
-    explicit FmtArguments(va_list list) { va_copy(list_, list); }
-    ~FmtArguments() { va_end(list_); }
-    FmtArguments(const FmtArguments&) = delete;
-    FmtArguments& operator=(const FmtArguments&) = delete;
+    explicit FmtArguments(FmtArgumentList& arguments) : list_(arguments.list) {}
 
     FmtValue Next(FmtArgType type) {
         FmtValue value;
@@ -61,7 +63,7 @@ private:
         FmtValue value;
     };
 
-    va_list list_;
+    va_list& list_;
     Parameter table_[kFmtMaxPosition];
 };
 

@@ -7,6 +7,8 @@
 #include <algorithm>
 #include <cstring>
 
+#include "strings/DecimalDigits.h"
+
 namespace tessel {
 
 /* Copies and fills of a few bytes without a call, which would cost more than the work. */
@@ -75,6 +77,15 @@ public:
         if (dst_) FillFew(dst_ + used_, byte, n);
         used_ += n;
     }
+    void PutDecimal(uint64 magnitude, bool negative) {
+        const size_t length = CountDecimalDigits(magnitude) + negative;
+        char* place = Take(length);
+        char text[kMaxDecimalDigits + 1];
+        char* start = place ? place : text;
+        WriteDecimalDigits(start + length, magnitude);
+        if (negative) *start = '-';
+        if (!place) Put(text, length);
+    }
 
     /* The address of n bytes to be written by the caller, or null (then Put them). */
     char* Take(size_t n) {
@@ -89,6 +100,10 @@ private:
     size_t used_ = 0;
     size_t limit_;
 };
+
+inline uint64 Magnitude(int64 value) {
+    return value < 0 ? uint64{0} - static_cast<uint64>(value) : static_cast<uint64>(value);
+}
 
 }  // namespace tessel
 

@@ -83,6 +83,15 @@ void FmtRenderer::RenderInteger(FmtItem item, const FmtSpec& spec, int64 value) 
     PutNumber(spec, p, static_cast<size_t>(end - p));
 }
 
+/* For an output that has no room for all of it, or only counts. */
+void FmtRenderer::RenderDecimalInPieces(const FmtSpec& spec, uint64 magnitude, bool negative) {
+    char text[kMaxDecimalDigits + 1];
+    const size_t length = CountDecimalDigits(magnitude) + negative;
+    WriteDecimalDigits(text + length, magnitude);
+    if (negative) text[0] = '-';
+    PutNumber(spec, text, length);
+}
+
 void FmtRenderer::PutNumber(const FmtSpec& spec, const char* text, size_t length) {
     const size_t pad = Padding(spec, length);
     if (pad != 0 && !spec.left && spec.pad == '0' && text[0] == '-') {

@@ -4,7 +4,6 @@
 
 #include <tessel/base/StringTypes.h>
 
-#include "strings/DecimalDigits.h"
 #include "strings/FmtItem.h"
 #include "strings/FmtOutput.h"
 #include "strings/LStrView.h"
@@ -19,7 +18,7 @@ public:
 
     void Render(FmtItem item, const FmtSpec& spec, FmtValue value) {
         if (item == FmtItem::kSigned && spec.type == kFmtNoType) {
-            RenderSigned(spec, value.integer);
+            RenderDecimal(spec, Magnitude(value.integer), value.integer < 0);
         } else if (item == FmtItem::kCString) {
             RenderCString(spec, static_cast<CStr>(value.pointer));
         } else {
@@ -28,16 +27,17 @@ public:
     }
 
 private:
-    void RenderSigned(const FmtSpec& spec, int64 value) { RenderDecimal(spec, Magnitude(value), value < 0); }
-
     void RenderDecimal(const FmtSpec& spec, uint64 magnitude, bool negative) {
         const size_t length = CountDecimalDigits(magnitude) + negative;
         const size_t pad = Padding(spec, length);
-        const bool signFirst = pad != 0 && negative && spec.pad == '0' && !spec.left;
-        if (signFirst) output_.Put('-');
-        if (pad != 0 && !spec.left) output_.Fill(spec.pad, pad);
-        PutDecimal(magnitude, negative && !signFirst);
-        if (pad != 0 && spec.left) output_.Fill(' ', pad);
+        if (pad == 0) return output_.PutDecimal(magnitude, negative);
+        char* place = output_.Take(pad + length);
+        if (!place) return RenderDecimalInPieces(spec, magnitude, negative);
+        const bool signFirst = negative && spec.pad == '0' && !spec.left;
+        char* number = spec.left ? place : place + pad;
+        FillFew(spec.left ? place + length : place + signFirst, spec.left ? ' ' : spec.pad, pad);
+        WriteDecimalDigits(number + length, magnitude);
+        if (negative) *(signFirst ? place : number) = '-';
     }
 
     void RenderCString(const FmtSpec& spec, CStr text) {
@@ -58,27 +58,14 @@ private:
         if (pad != 0 && spec.left) output_.Fill(' ', pad);
     }
 
-    void PutDecimal(uint64 magnitude, bool negative) {
-        const size_t length = CountDecimalDigits(magnitude) + negative;
-        char digits[kMaxDecimalDigits + 1];
-        char* place = output_.Take(length);
-        char* text = place ? place : digits;
-        if (negative) *text = '-';
-        WriteDecimalDigits(text + length, magnitude);
-        if (!place) output_.Put(digits, length);
-    }
-
     static size_t Padding(const FmtSpec& spec, size_t length) {
         const auto width = static_cast<size_t>(spec.width);
         return width > length ? width - length : 0;
     }
 
-    static uint64 Magnitude(int64 value) {
-        return value < 0 ? uint64{0} - static_cast<uint64>(value) : static_cast<uint64>(value);
-    }
-
     void RenderOther(FmtItem item, const FmtSpec& spec, FmtValue value);
     void RenderNumber(FmtItem item, const FmtSpec& spec, FmtValue value);
+    void RenderDecimalInPieces(const FmtSpec& spec, uint64 magnitude, bool negative);
     void RenderInteger(FmtItem item, const FmtSpec& spec, int64 value);
     void RenderTyped(FmtItem item, const FmtSpec& spec, const void* value, int16 type);
     void RenderCharacter(const FmtSpec& spec, int32 value);
@@ -86,7 +73,7 @@ private:
     void RenderPoint(uint32 point);
     void RenderRectangle(const int16* rectangle);
     void PutNumber(const FmtSpec& spec, const char* text, size_t length);
-    void PutShort(int16 value) { PutDecimal(Magnitude(value), value < 0); }
+    void PutShort(int16 value) { output_.PutDecimal(Magnitude(value), value < 0); }
 
     FmtOutput& output_;
     uint8 decimalPoint_ = '.';

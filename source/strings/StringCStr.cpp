@@ -6,12 +6,13 @@
 
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"
+#include "strings/DecimalPoint.h"
 
 using namespace tessel;
 
-namespace {
+uint8 tessel::g_decimalPoint = '.';
 
-uint8 g_decimalPoint = '.';
+namespace {
 
 const uint8* Bytes(CStr s) {
     return reinterpret_cast<const uint8*>(s);

@@ -1,12 +1,12 @@
 #include <tessel/strings/StringFmtPrint.h>
 
 #include <tessel/diagnostics/DebugStream.h>
-#include <tessel/strings/StringCStr.h>
 #include <tessel/strings/StringFmtScan.h>
 
 #include <bit>
 
 #include "platform/CodePage.h"
+#include "strings/DecimalPoint.h"
 #include "strings/FmtOutput.h"
 #include "strings/FmtRenderer.h"
 #include "strings/HandleOps.h"
@@ -53,7 +53,7 @@ const char* FindSpecialByCharacters(const char* p, const char* end) {
 /* One formatting call. */
 class Formatter {
 public:
-    Formatter(FmtOutput output, const char* format, size_t length, va_list args)
+    Formatter(FmtOutput output, const char* format, size_t length, FmtArgumentList& args)
         : output_(output), arguments_(args), start_(format), end_(format + length) {
         const platform::CodePageTables& page = platform::ActiveCodePage();
         byCharacters_ = page.multiByte && !page.utf8;
@@ -75,7 +75,11 @@ private:
     enum class Mode : uint8 { kUndecided, kOrdinary, kPositional };
 
     bool Pass();
+    bool PlainConversion(const char* p, FmtOutput& output);
     void Escape();
+    bool MayBeDecimalPoint() const {
+        return *cursor_ == ';' || *cursor_ == '\\' || (end_ - cursor_ > 1 && cursor_[1] == ';');
+    }
     bool Specifier();
     bool ChooseMode(const FmtSpec& spec);
     bool Convert(FmtSpec& spec);
@@ -93,21 +97,48 @@ private:
     Mode mode_ = Mode::kUndecided;
 };
 
-/* Goes over the format once. While recording, the text between the specifiers is written and then overwritten. */
+/* Goes over the format once. While recording, the text between the specifiers is written and then overwritten. Cursor
+   and output are kept in registers for what is most frequent: plain text, "%d" and "%s". */
 bool Formatter::Pass() {
-    cursor_ = start_;
-    decimalPoint_ = StrGetDecimalPoint();
-    while (cursor_ < end_ && (output_.HasRoom() || recording_)) {
-        const char* special = byCharacters_ ? FindSpecialByCharacters(cursor_, end_) : FindSpecial(cursor_, end_);
-        output_.Put(cursor_, static_cast<size_t>(special - cursor_));
-        cursor_ = special;
-        if (cursor_ == end_ || !(output_.HasRoom() || recording_)) break;
-        if (*cursor_ == '\\') {
+    const char* p = start_;
+    FmtOutput output = output_;
+    decimalPoint_ = g_decimalPoint;
+    while (p < end_ && (output.HasRoom() || recording_)) {
+        const char* special = byCharacters_ ? FindSpecialByCharacters(p, end_) : FindSpecial(p, end_);
+        output.Put(p, static_cast<size_t>(special - p));
+        p = special;
+        if (p == end_ || !(output.HasRoom() || recording_)) break;
+        if (PlainConversion(p, output)) {
+            p += 2;
+            continue;
+        }
+        cursor_ = p;
+        output_ = output;
+        if (*p == '\\') {
             Escape();
         } else if (!Specifier()) {
             return false;
         }
+        p = cursor_;
+        output = output_;
     }
+    output_ = output;
+    return true;
+}
+
+/* Does "%d" and "%s"; false for everything else. */
+inline bool Formatter::PlainConversion(const char* p, FmtOutput& output) {
+    if (*p != '%' || end_ - p < 2 || mode_ == Mode::kPositional) return false;
+    if (p[1] == 'd') {
+        const int64 value = arguments_.Next(FmtArgType::kInt).integer;
+        output.PutDecimal(Magnitude(value), value < 0);
+    } else if (p[1] == 's') {
+        const auto* text = static_cast<CStr>(arguments_.Next(FmtArgType::kPointer).pointer);
+        if (text) output.Put(text, std::strlen(text));
+    } else {
+        return false;
+    }
+    mode_ = Mode::kOrdinary;
     return true;
 }
 
@@ -129,7 +160,7 @@ bool Formatter::Specifier() {
         if (cursor_ < end_) ++cursor_;
         return true;
     }
-    if (IsPunct(*cursor_) && ScanForFormatDecPoint(&cursor_, end_, &decimalPoint_)) return true;
+    if (MayBeDecimalPoint() && ScanForFormatDecPoint(&cursor_, end_, &decimalPoint_)) return true;
 
     FmtSpec spec;
     FmtSpecReader reader(cursor_, end_);
@@ -172,92 +203,95 @@ bool Formatter::Unknown() {
     return false;
 }
 
-/* Formats and closes the arguments. `size` of kNoLimit writes as much as there is. */
-size_t Format(char* dst, int32 size, const char* format, size_t length, va_list args) {
+/* `size` of kNoLimit writes as much as there is. */
+size_t Format(char* dst, int32 size, const char* format, size_t length, FmtArgumentList& args) {
     const int32 limit = !dst || size == kNoLimit ? INT32_MAX : std::max(size, 0);
     return Formatter(FmtOutput(dst, static_cast<size_t>(limit)), format, length, args).Run();
 }
 
-int32 FormatTerminated(char* dst, const char* format, size_t length, va_list args) {
+int32 FormatTerminated(char* dst, const char* format, size_t length, FmtArgumentList& args) {
     const size_t written = Format(dst, kNoLimit, format, length, args);
     if (dst) dst[written] = 0;
     return static_cast<int32>(written);
 }
 
-int32 FormatPStr(PStr dst, const char* format, size_t length, va_list args) {
+int32 FormatPStr(PStr dst, const char* format, size_t length, FmtArgumentList& args) {
     const size_t written = Format(reinterpret_cast<char*>(dst + 1), kMaxPStr, format, length, args);
     dst[0] = static_cast<uint8>(written);
     return dst[0];
 }
 
+const char* Chars(const uint8* bytes) {
+    return reinterpret_cast<const char*>(bytes);
+}
+
 }  // namespace
 
 int32 SPrintfv(char* dst, int32 size, const char* format, int32 formatLength, va_list args) {
-    return static_cast<int32>(Format(dst, size, format, static_cast<size_t>(std::max(formatLength, 0)), args));
+    FmtArgumentList copy;
+    va_copy(copy.list, args);
+    const size_t written = Format(dst, size, format, static_cast<size_t>(std::max(formatLength, 0)), copy);
+    va_end(copy.list);
+    return static_cast<int32>(written);
 }
 
 int32 SPrintf(char* dst, CStr format, ...) {
-    va_list args;
-    va_start(args, format);
+    FmtArgumentList args;
+    va_start(args.list, format);
     const int32 written = FormatTerminated(dst, format, std::strlen(format), args);
-    va_end(args);
+    va_end(args.list);
     return written;
 }
 
 int32 SPrintfp(char* dst, ConstPStr format, ...) {
-    va_list args;
-    va_start(args, format);
-    const int32 written = FormatTerminated(dst, reinterpret_cast<const char*>(format + 1), format[0], args);
-    va_end(args);
+    FmtArgumentList args;
+    va_start(args.list, format);
+    const int32 written = FormatTerminated(dst, Chars(format + 1), format[0], args);
+    va_end(args.list);
     return written;
 }
 
 int32 SNPrintf(char* dst, int32 size, CStr format, ...) {
     if (dst && size <= 0) return 0;
-    va_list args;
-    va_start(args, format);
+    FmtArgumentList args;
+    va_start(args.list, format);
     const auto written = static_cast<int32>(Format(dst, size, format, std::strlen(format), args));
-    va_end(args);
+    va_end(args.list);
     if (dst) dst[std::min(written, size - 1)] = 0;
     return written;
 }
 
 int32 PPrintf(PStr dst, CStr format, ...) {
-    va_list args;
-    va_start(args, format);
+    FmtArgumentList args;
+    va_start(args.list, format);
     const int32 written = FormatPStr(dst, format, std::strlen(format), args);
-    va_end(args);
+    va_end(args.list);
     return written;
 }
 
 int32 PPrintfp(PStr dst, ConstPStr format, ...) {
-    va_list args;
-    va_start(args, format);
-    const int32 written = FormatPStr(dst, reinterpret_cast<const char*>(format + 1), format[0], args);
-    va_end(args);
+    FmtArgumentList args;
+    va_start(args.list, format);
+    const int32 written = FormatPStr(dst, Chars(format + 1), format[0], args);
+    va_end(args.list);
     return written;
 }
 
 MgErr LStrPrintf(LStrHandle dst, CStr format, ...) {
     if (!dst) return kArgErr;
     const size_t length = std::strlen(format);
-    va_list args;
-    va_start(args, format);
-    va_list countingArgs;
-    va_copy(countingArgs, args);
-    const size_t needed = Format(nullptr, kNoLimit, format, length, countingArgs);
-    va_end(countingArgs);
+    FmtArgumentList args;
+    va_start(args.list, format);
+    const size_t needed = Format(nullptr, kNoLimit, format, length, args);
+    va_end(args.list);
+    if (MgErr err = DSSetHandleSize(AsHandle(dst), LStrSize(needed))) return err;
 
-    MgErr err = DSSetHandleSize(AsHandle(dst), LStrSize(needed));
-    if (!err) {
-        const size_t written =
-            Format(reinterpret_cast<char*>((*dst)->bytes), static_cast<int32>(needed), format, length, args);
-        (*dst)->count = static_cast<int32>(written);
-        if (written != needed) {
-            TESSEL_REPORT(kDebugFatal, 0x48A3D5F1u);
-            err = kGenericErr;
-        }
-    }
-    va_end(args);
-    return err;
+    va_start(args.list, format);
+    char* text = reinterpret_cast<char*>((*dst)->bytes);
+    const size_t written = Format(text, static_cast<int32>(needed), format, length, args);
+    va_end(args.list);
+    (*dst)->count = static_cast<int32>(written);
+    if (written == needed) return kNoErr;
+    TESSEL_REPORT(kDebugFatal, 0x48A3D5F1u);
+    return kGenericErr;
 }

@@ -205,5 +205,5 @@ int32 PStrHash32(ConstPStr s, bool caseInsensitive) {
     }
     uint32 hash = 0;
     for (size_t i = 1; i <= s[0]; ++i) hash = ElfHashStep(hash, s[i]);
-    return static_cast<int32>(hash);
+    return ElfHashResult(hash);
 }

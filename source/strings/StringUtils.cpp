@@ -657,7 +657,7 @@ int32 Hash(const std::string& text, bool caseInsensitive) {
         if (c == 0) break;
         hash = ElfHashStep(hash, static_cast<int8>(caseInsensitive ? Upper(c) : c));
     }
-    return static_cast<int32>(hash);
+    return ElfHashResult(hash);
 }
 
 const std::string& EmptyNarrowString() {

@@ -1,0 +1,13 @@
+/* The process-wide decimal point, for those who read it on every call. */
+#ifndef TESSEL_STRINGS_DECIMALPOINT_H
+#define TESSEL_STRINGS_DECIMALPOINT_H
+
+#include <tessel/base/Types.h>
+
+namespace tessel {
+
+extern uint8 g_decimalPoint;
+
+}  // namespace tessel
+
+#endif
