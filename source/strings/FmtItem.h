@@ -49,6 +49,14 @@ inline FmtItem FmtItemOf(const FmtSpec& spec) {
             return FmtItem::kBinary;
         case 'a':
             return FmtItem::kAddress;
+        case 'e':
+        case 'E':
+        case 'g':
+        case 'G':
+            return FmtItem::kExponential;
+        case 'f':
+        case 'F':
+            return FmtItem::kFixed;
         case 'c':
             return FmtItem::kCharacter;
         case 'q':
@@ -69,6 +77,8 @@ inline FmtItem FmtItemOf(const FmtSpec& spec) {
             return FmtItem::kLHandle;
         case 'h':
             return FmtItem::kBytes;
+        case 'z':
+            return FmtItem::kPath;
         default:
             return FmtItem::kUnknown;
     }

@@ -8,11 +8,21 @@
 #include <cmath>
 
 #include "numerics/Extended.h"
+#include "strings/PathText.h"
 
 namespace tessel {
 namespace {
 
+constexpr int32 kScratchSize = 256; /* no rendered number is longer */
 constexpr int32 kAddressDigits = 8;
+
+constexpr int32 kMaxSignificantDigits = 17;
+constexpr int32 kDefaultSignificantDigits = 7;
+constexpr int32 kExponentWidth = 5; /* sign, point and exponent of the exponential form, left out of a given width */
+constexpr int32 kDefaultDecimals = 6;
+constexpr int32 kMaxDecimals = 63;
+constexpr int32 kDefaultFixedLimit = 18; /* powers of ten that the fixed form shows when no width is given */
+constexpr int32 kSpecialTextLength = 3;  /* "NaN", "Inf" */
 
 LStrView TextOf(FmtItem item, const void* argument) {
     switch (item) {
@@ -29,6 +39,52 @@ LStrView TextOf(FmtItem item, const void* argument) {
             return range ? LStrView(range->bytes, range->length) : LStrView(nullptr, 0);
         }
     }
+}
+
+int32 IntegerCode(FmtItem item) {
+    switch (item) {
+        case FmtItem::kSigned:
+            return kFormatDecimal;
+        case FmtItem::kUnsigned:
+            return kFormatUnsigned;
+        case FmtItem::kOctal:
+            return kFormatOctal;
+        case FmtItem::kBinary:
+            return kFormatBinary;
+        default:
+            return kFormatHex;
+    }
+}
+
+int32 ExponentialCode(const FmtSpec& spec) {
+    int32 digits = kDefaultSignificantDigits;
+    if (spec.precision >= 0) {
+        digits = std::min(spec.precision, kMaxSignificantDigits) + 1;
+    } else if (spec.width > kExponentWidth + 1) {
+        digits = spec.width - kExponentWidth;
+    }
+    return std::min(digits, kMaxSignificantDigits);
+}
+
+/* Whether the fixed form of a real shows it without more digits than are sensible. */
+bool FixedFits(Extended value, int32 limit) {
+    if (value == 0) return limit >= 1;
+    if (!std::isfinite(value)) return limit >= kSpecialTextLength;
+    const auto power = static_cast<int32>(std::log10(std::fabs(value)));
+    return (value < 0) + std::abs(power) <= limit;
+}
+
+bool FixedFits(const void* value, int16 type, int32 limit) {
+    if (!value) return FixedFits(Extended{0}, limit);
+    cmplxExt parts;
+    ConvertNum(type, value, kNumComplexExtended, &parts);
+    return FixedFits(ToExtended(parts.re), limit) &&
+           (type < kNumComplexSingle || FixedFits(ToExtended(parts.im), limit));
+}
+
+int32 FixedCode(const FmtSpec& spec, const void* value, int16 type) {
+    if (!FixedFits(value, type, spec.width != 0 ? spec.width - 1 : kDefaultFixedLimit)) return ExponentialCode(spec);
+    return -std::min(spec.precision < 0 ? kDefaultDecimals : spec.precision, kMaxDecimals);
 }
 
 }  // namespace
@@ -48,6 +104,8 @@ void FmtRenderer::RenderOther(FmtItem item, const FmtSpec& spec, FmtValue value)
             [[fallthrough]];
         case FmtItem::kRectangle:
             return RenderRectangle(static_cast<const int16*>(value.pointer));
+        case FmtItem::kPath:
+            return RenderPath(static_cast<Path>(const_cast<void*>(value.pointer)));
         default:
             return IsNumber(item) ? RenderNumber(item, spec, value) : RenderText(spec, TextOf(item, value.pointer));
     }
@@ -63,6 +121,8 @@ void FmtRenderer::RenderNumber(FmtItem item, const FmtSpec& spec, FmtValue value
         shape.pad = '0';
         shape.width = kAddressDigits;
     }
+    if (spec.type != kFmtNoType) return RenderTyped(item, shape, value.pointer, spec.type);
+    if (item >= FmtItem::kExponential) return RenderTyped(item, shape, &value.real, kNumDouble);
     RenderInteger(item, shape, value.integer);
 }
 
@@ -92,6 +152,17 @@ void FmtRenderer::RenderDecimalInPieces(const FmtSpec& spec, uint64 magnitude, b
     PutNumber(spec, text, length);
 }
 
+/* Reals, and numbers of any type that the format names. */
+void FmtRenderer::RenderTyped(FmtItem item, const FmtSpec& spec, const void* value, int16 type) {
+    const int32 code = item == FmtItem::kExponential ? ExponentialCode(spec)
+                       : item == FmtItem::kFixed     ? FixedCode(spec, value, type)
+                                                     : IntegerCode(item);
+    const auto formatCode = static_cast<int16>(code);
+    char text[kScratchSize];
+    const int32 length = NumToAnyString(value, type, &formatCode, text, kScratchSize, decimalPoint_, nullptr);
+    PutNumber(spec, text, static_cast<size_t>(std::max(length, 0)));
+}
+
 void FmtRenderer::PutNumber(const FmtSpec& spec, const char* text, size_t length) {
     const size_t pad = Padding(spec, length);
     if (pad != 0 && !spec.left && spec.pad == '0' && text[0] == '-') {
@@ -116,6 +187,12 @@ void FmtRenderer::RenderCharacter(const FmtSpec& spec, int32 value) {
 void FmtRenderer::RenderText(const FmtSpec& spec, LStrView text) {
     const size_t length = spec.precision < 0 ? text.length : std::min(text.length, static_cast<size_t>(spec.precision));
     PutPadded(spec, reinterpret_cast<const char*>(text.bytes), length);
+}
+
+void FmtRenderer::RenderPath(Path path) {
+    Str255 text;
+    PathTextForPrinting(path, text);
+    output_.Put(text + 1, text[0]);
 }
 
 void FmtRenderer::RenderPoint(uint32 point) {

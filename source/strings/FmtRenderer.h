@@ -70,6 +70,7 @@ private:
     void RenderTyped(FmtItem item, const FmtSpec& spec, const void* value, int16 type);
     void RenderCharacter(const FmtSpec& spec, int32 value);
     void RenderText(const FmtSpec& spec, LStrView text);
+    void RenderPath(Path path);
     void RenderPoint(uint32 point);
     void RenderRectangle(const int16* rectangle);
     void PutNumber(const FmtSpec& spec, const char* text, size_t length);

@@ -50,7 +50,7 @@ public:
             ReadNumber(spec.precision);
         }
         if (Peek() == '{') {
-            return false;
+            if (!ReadType(spec)) return false;
         } else {
             ReadSize(spec);
         }

@@ -72,11 +72,41 @@ TEST(StringFmtPrint, PrintsPointsAndRectangles) {
     EXPECT_EQ("(1, 2, 3, 4) tlbr(1, 2, 3, 4)", F("%r %R", rectangle, rectangle));
 }
 
+TEST(StringFmtPrint, PrintsReals) {
+    EXPECT_EQ("3,25 3.25 3;2", F("%,;%.2f %;%.2f %\\3B;%.1f", 3.25, 3.25, 3.2));
+    EXPECT_EQ("0.500000 -1.50 1E+3", F("%f %.2f %.0e", 0.5, -1.5, 1000.0));
+    EXPECT_EQ("1.000000E+30", F("%f", 1e30));             // 30 is beyond the 18 of no width
+    EXPECT_EQ("1.00000000000000E+30", F("%20f", 1e30));   // and beyond 19; 15 digits
+    EXPECT_EQ("1000000000000000000.0", F("%.1f", 1e18));  // 18 is not
+    EXPECT_EQ("1.0E-19", F("%.1f", 1e-19));
+    EXPECT_EQ("1.234568E+3 1.234568E+3 1.234568E+3", F("%e %g %G", 1234.5678, 1234.5678, 1234.5678));
+    EXPECT_EQ("1.2346E+3", F("%10.4E", 1234.5678).substr(1));
+    EXPECT_EQ("  1.235E+3|1.235E+3  ", F("%10.3e|%-10.3e", 1234.5678, 1234.5678));
+    EXPECT_EQ("-003.5", F("%06.1F", -3.5));
+    const double infinity = std::numeric_limits<double>::infinity();
+    EXPECT_EQ("NaN Inf -Inf", F("%f %f %e", std::numeric_limits<double>::quiet_NaN(), infinity, -infinity));
+}
+
+TEST(StringFmtPrint, PrintsNumbersOfNamedTypes) {
+    const int8 small = -1;
+    const uint16 word = 0x1234;
+    const int64 large = INT64_MIN;
+    const float single = 1.5;
+    const cmplx128 complex = {1.5, -2};
+    EXPECT_EQ("-1 FF 0x000000FF 255", F("%{iB}d %{iB}x %{iB}a %{uB}u", &small, &small, &small, &small));
+    EXPECT_EQ("1234 -9223372036854775808 -9223372036854775808", F("%{uW}x %{iQd %{iQ}d", &word, &large, &large));
+    EXPECT_EQ("1.50|  1.5", F("%.2{fS}f|%5.1{fS}f", &single, &single));
+    EXPECT_EQ("1.5 -2.0 i", F("%.1{cD}f", &complex));
+    EXPECT_EQ("-1 1.5", F("%{*}d %.1{*}f", kNumInt8, &small, kNumSingle, &single));
+}
+
 TEST(StringFmtPrint, TakesPositionalParameters) {
     ReportRecorder reports;
     EXPECT_EQ("2 1", F("%2$d %1$d", 1, 2));
     EXPECT_EQ("  b|a    |b", F("%2$3s|%1$-5s|%2$s", "a", "b"));
-    EXPECT_EQ("x 7 -1 DCBA (2,1) 7", F("%3$s %1$d %2$lld %4$4c %5$q %1$u", 7, -1LL, "x", 0x41424344, 0x00020001));
+    EXPECT_EQ("x 7 -1 0.5 DCBA (2,1) 7",
+              F("%3$s %1$d %2$lld %4$.1f %5$4c %6$q %1$u", 7, -1LL, "x", 0.5, 0x41424344, 0x00020001));
+    EXPECT_EQ("0.5,0,5", F("%1$.1f%,;,%1$.1f", 0.5));  // the second pass starts anew
     EXPECT_EQ("10987654321", F("%10$d%9$d%8$d%7$d%6$d%5$d%4$d%3$d%2$d%1$d", 1, 2, 3, 4, 5, 6, 7, 8, 9, 10));
     char four[4];
     EXPECT_EQ(4, SNPrintf(four, 4, "%2$d and %1$d", 1, 2));  // the first pass sees the whole format
@@ -207,13 +237,13 @@ TEST(StringFmtPrint, AgreesWithTheCLibrary) {
 
 TEST(StringFmtPrint, WritesNothingPastItsSize) {
     const char kGuard = '\x5A';
-    const std::string full = F("ab%08d|%-7s|%20d|\\n%x|%3s|%q", -42, "hello", 3, 255, "abcdef", 0x00020001);
-    ASSERT_EQ("ab-0000042|hello  |                   3|\r\nFF|abcdef|(2,1)", full);
+    const std::string full = F("ab%08d|%-7s|%20.3f|\\n%x|%3s|%q", -42, "hello", 3.25, 255, "abcdef", 0x00020001);
+    ASSERT_EQ("ab-0000042|hello  |               3.250|\r\nFF|abcdef|(2,1)", full);
     const auto n = static_cast<int32>(full.size());
     for (int32 size = 0; size <= n + 2; ++size) {
         std::string room(full.size() + 10, kGuard);
-        const int32 length =
-            SNPrintf(room.data(), size, "ab%08d|%-7s|%20d|\\n%x|%3s|%q", -42, "hello", 3, 255, "abcdef", 0x00020001);
+        const int32 length = SNPrintf(room.data(), size, "ab%08d|%-7s|%20.3f|\\n%x|%3s|%q", -42, "hello", 3.25, 255,
+                                      "abcdef", 0x00020001);
         EXPECT_EQ(std::min(size, n), length);
         std::string expected = size == 0 ? "" : full.substr(0, static_cast<size_t>(size - 1)) + '\0';
         expected.resize(room.size(), kGuard);
@@ -245,6 +275,12 @@ TEST(StringFmtPrint, FillsPStrsAndHandles) {
     EXPECT_EQ(kNoErr, LStrPrintf(text, ""));
     EXPECT_EQ(4u, text.Size());
     EXPECT_EQ(kArgErr, LStrPrintf(nullptr, "x"));
+}
+
+TEST(StringFmtPrint, StartsWithTheProcessWideDecimalPoint) {
+    StrSetDecimalPoint(',');
+    EXPECT_EQ("0,5 0.5 0,5", F("%.1f %.;%.1f %;%.1f", 0.5, 0.5, 0.5));
+    StrSetDecimalPoint('.');
 }
 
 }  // namespace
