@@ -3,6 +3,7 @@
 #define TESSEL_TESTS_PATHS_PATHTESTSUPPORT_H
 
 #include <gtest/gtest.h>
+#include <tessel/base/OVExcept.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
 

@@ -1,0 +1,63 @@
+#include <tessel/streams/BinDataReader.h>
+#include <tessel/streams/BinDataWriter.h>
+#include <tessel/strings/CPStrList.h>
+#include <tessel/strings/StringPStr.h>
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+#include "support/StartedPaths.h"
+
+namespace tessel {
+namespace {
+
+class CPStrListFlatten : public testing::Test {
+protected:
+    static std::string Flattened(const CPStrList& list, const Endianizer* order) {
+        uint8 room[64];
+        StaticOutputBuf buffer(room, sizeof room);
+        BinDataWriter writer(&buffer, order);
+        EXPECT_EQ(kNoErr, list.Flatten(writer));
+        return {reinterpret_cast<const char*>(room), buffer.GetBytesWritten()};
+    }
+    static MgErr UnFlatten(CPStrList& list, const std::string& bytes, const Endianizer* order) {
+        MemInputBuf buffer(bytes.data(), static_cast<uint32>(bytes.size()));
+        BinDataReader reader(&buffer, order);
+        return list.UnFlatten(reader);
+    }
+
+    test::StartedPaths started_;
+};
+
+using std::string_literals::operator""s;
+
+TEST_F(CPStrListFlatten, BytesOfBothOrders) {
+    CPStrList list;
+    EXPECT_EQ("\0\0\0\0"s, Flattened(list, BigEndianizer()));
+    for (const char* text : {"\2ab", "\0", "\1c"})
+        EXPECT_EQ(kNoErr, list.Insert(reinterpret_cast<ConstPStr>(text), -1));
+    EXPECT_EQ("\0\0\0\3\2ab\0\1c"s, Flattened(list, BigEndianizer()));
+    EXPECT_EQ("\3\0\0\0\2ab\0\1c"s, Flattened(list, LittleEndianizer()));
+
+    CPStrList read;
+    EXPECT_EQ(kNoErr, read.Insert(reinterpret_cast<ConstPStr>("\3old"), 0));
+    EXPECT_EQ(kNoErr, UnFlatten(read, "\0\0\0\3\2ab\0\1c"s, BigEndianizer()));
+    EXPECT_TRUE(read.Equal(list));
+    EXPECT_EQ(kNoErr, UnFlatten(read, "\0\0\0\0"s, BigEndianizer()));
+    EXPECT_EQ(0, read.Count());
+}
+
+TEST_F(CPStrListFlatten, StopsAtTheFirstError) {
+    CPStrList list;
+    EXPECT_EQ(kCorruptErr, UnFlatten(list, "\0\0"s, BigEndianizer()));
+    EXPECT_EQ(0, list.Count());
+    EXPECT_EQ(kCorruptErr, UnFlatten(list, "\x7F\0\0\2\2ab\5c"s, BigEndianizer()));
+    EXPECT_EQ(1, list.Count());
+    EXPECT_TRUE(PStrEqual(list[0], reinterpret_cast<ConstPStr>("\2ab")));
+    EXPECT_EQ(kNoErr, UnFlatten(list, "\xFF\xFF\xFF\xFF"s, BigEndianizer()));  // a count below 0
+    EXPECT_EQ(0, list.Count());
+}
+
+}  // namespace
+}  // namespace tessel
