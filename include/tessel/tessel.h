@@ -17,7 +17,9 @@
 #include <tessel/diagnostics/DumpLeakInfo.h>
 #include <tessel/diagnostics/FileLoc.h>
 #include <tessel/diagnostics/StackChain.h>
+#include <tessel/files/AppPath.h>
 #include <tessel/files/FileManager.h>
+#include <tessel/files/SystemDirs.h>
 #include <tessel/files/shortcut.h>
 #include <tessel/frame/CoreServices.h>
 #include <tessel/frame/ServiceRegistry.h>

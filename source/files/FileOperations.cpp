@@ -1,0 +1,221 @@
+// Files and folders as whole objects: creating, copying, moving, removing.
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/files/FileManager.h>
+#include <tessel/paths/PathManager.h>
+#include <tessel/paths/PathRef.h>
+#include <tessel/paths/PathTextFormat.h>
+
+#include "diagnostics/Guarded.h"
+#include "files/FileSupport.h"
+#include "platform/FileSystem.h"
+#include "platform/LastError.h"
+
+namespace tessel {
+
+namespace {
+
+constexpr uint32 kCopyBlock = 8192;
+constexpr int32 kNewFolderPermissions = 0777;
+
+MgErr ErrUnless(bool ok) {
+    return ok ? kNoErr : Win32ToOVFileErr();
+}
+
+// An open file that closes itself.
+class OpenFile {
+public:
+    OpenFile() = default;
+    ~OpenFile() {
+        if (file_) FMClose(file_);
+    }
+    OpenFile(const OpenFile&) = delete;
+    OpenFile& operator=(const OpenFile&) = delete;
+
+    MgErr Open(Path path, int32 openMode, int32 denyMode) { return FMOpen(&file_, path, openMode, denyMode); }
+    MgErr Close() {
+        File_t* file = file_;
+        file_ = nullptr;
+        return FMClose(file);
+    }
+    File_t* get() const { return file_; }
+
+private:
+    File_t* file_ = nullptr;
+};
+
+// Copies until a read returns nothing, and cuts the destination there.
+MgErr CopyBytes(File_t* from, File_t* to) {
+    uint8 block[kCopyBlock];
+    int64 copied = 0;
+    for (;;) {
+        uint32 got = 0;
+        const MgErr err = FMRead(from, kCopyBlock, &got, block);
+        if (err && err != kEOFErr) return kIOErr;
+        if (!got) break;
+        if (const MgErr writeErr = FMWrite(to, got, nullptr, block)) return writeErr;
+        copied += got;
+    }
+    return FSetEOF64(to, copied);
+}
+
+MgErr CopyInto(Path from, Path to) {
+    OpenFile source;
+    if (const MgErr err = source.Open(from, kFOpenRead, kFDenyWrite)) return err;
+    OpenFile destination;
+    if (const MgErr err = destination.Open(to, kFOpenWrite, kFDenyReadWrite)) {
+        TESSEL_REPORT(kDebugWarning, 0x71B0E3A4u) << "FCopyIntoWin32 got error " << err;
+        return err;
+    }
+    if (const MgErr err = CopyBytes(source.get(), destination.get())) return err;
+    const MgErr sourceErr = source.Close();
+    const MgErr destinationErr = destination.Close();
+    return sourceErr || destinationErr ? kIOErr : kNoErr;
+}
+
+// Removes the item that `name` names, which is also `path`.
+MgErr RemoveItem(Path path, const char* name) {
+    platform::ItemInfo info;
+    if (!platform::ItemGetInfo(name, info)) return Win32ToOVFileErr();
+    if (!info.folder) return ErrUnless(platform::FileDelete(name));
+    LeaveFolder(path);
+    return ErrUnless(platform::FolderRemove(name));
+}
+
+}  // namespace
+
+void LeaveFolder(Path path) {
+    MgErr err = kNoErr;
+    try {
+        std::string current;
+        if (!platform::CurrentFolder(current)) return;
+        const PathRef here(current, PathRef::StringDisplay());
+        const PathRef common = path->GetInCommonWith(here, PathRef::kIgnoreCase);
+        if (common.ItemCount() != path->ItemCount() || path->ItemCount() == 0) return;
+        PathRef parent = path->GetParentDirectory();
+        PlatformName name;
+        err = name.Make(&parent, false);
+        if (!err) err = ErrUnless(platform::SetCurrentFolder(name.Text()));
+    } catch (...) {
+        err = CaughtErr();
+    }
+    if (err)
+        TESSEL_REPORT(kDebugWarning, 0x2F9D6C18u) << "failed to preprocess move file " << path << ", error " << err;
+}
+
+}  // namespace tessel
+
+using namespace tessel;
+
+// ---- creating -------------------------------------------------------------------------------------------------------
+
+MgErr FGenericCreate(File_t** file, Path path, int32, int32 openMode, int32 denyMode, int32, int32 always) {
+    if (!file) return kArgErr;
+    return Guarded([&]() -> MgErr {
+        FlushPathCache(path);
+        *file = nullptr;
+        OpenAccess modes;
+        if (!FIsAbsPath(path)) return kArgErr;
+        if (const MgErr err = TranslateModes(openMode, denyMode, &modes)) return err;
+        PlatformName name;
+        if (const MgErr err = name.Make(path, true)) return err;
+        if (IsVolume(path)) return kArgErr;
+        const auto disposition = always ? platform::Disposition::kCreateAlways : platform::Disposition::kCreateNew;
+        const platform::FileHandle handle = platform::FileOpen(name.Text(), modes.access, modes.denied, disposition);
+        if (handle == platform::kNoFile) return Win32ToOVFileErr();
+        *file = FileOf(handle);
+        return kNoErr;
+    });
+}
+
+MgErr FCreate(File_t** file, Path path, int32 unused1, int32 openMode, int32 denyMode, int32 unused2) {
+    return FGenericCreate(file, path, unused1, openMode, denyMode, unused2, 0);
+}
+
+MgErr FCreateAlways(File_t** file, Path path, int32 unused1, int32 openMode, int32 denyMode, int32 unused2) {
+    return FGenericCreate(file, path, unused1, openMode, denyMode, unused2, 1);
+}
+
+MgErr FNewDir(Path path, int32) {
+    return Guarded([&]() -> MgErr {
+        if (!FIsAbsPath(path)) return kArgErr;
+        FlushPathCache(path);
+        PlatformName name;
+        if (const MgErr err = name.Make(path, true)) return err;
+        return ErrUnless(platform::FolderCreate(name.Text()));
+    });
+}
+
+MgErr FNewDirHier(Path path) {
+    return Guarded([&]() -> MgErr {
+        if (!FIsAbsPath(path)) return kArgErr;
+        switch (FExists(path)) {
+            case 1:
+                return kGenericErr;
+            case 2:
+                return kNoErr;
+            default:
+                break;
+        }
+        PathRef parent = path->GetParentDirectory();
+        if (const MgErr err = FNewDirHier(&parent)) return err;
+        const MgErr err = FNewDir(path, FGetDefPerm(kNewFolderPermissions));
+        // Someone else may have made it in between.
+        return err == kExistsErr && FExists(path) == 2 ? kNoErr : err;
+    });
+}
+
+// ---- copying and moving ---------------------------------------------------------------------------------------------
+
+MgErr FCopyResolve(Path from, Path to, int32 resolve) {
+    return Guarded([&]() -> MgErr {
+        if (!FIsAbsPath(from) || !FIsAbsPath(to) || IsVolume(from)) return kArgErr;
+        FlushPathCache(to);
+        PlatformName source, destination;
+        if (const MgErr err = source.Make(from, resolve != 0)) return err;
+        if (const MgErr err = destination.Make(to, true)) return err;
+        return ErrUnless(platform::FileCopy(source.Text(), destination.Text()));
+    });
+}
+
+MgErr FCopy(Path from, Path to) {
+    return FCopyResolve(from, to, 1);
+}
+
+MgErr FMoveResolve(Path from, Path to, int32 resolve) {
+    return Guarded([&]() -> MgErr {
+        if (!FIsAbsPath(from) || !FIsAbsPath(to)) return kArgErr;
+        FlushPathCache(from);
+        FlushPathCache(to);
+        LeaveFolder(from);
+        if (FDepth(from) < 2 || FDepth(to) < 1) return kArgErr;
+        PlatformName source, destination;
+        if (const MgErr err = source.Make(from, resolve != 0)) return err;
+        if (const MgErr err = destination.Make(to, true)) return err;
+        return ErrUnless(platform::ItemRename(source.Text(), destination.Text()));
+    });
+}
+
+MgErr FMove(Path from, Path to) {
+    return FMoveResolve(from, to, 1);
+}
+
+MgErr FMoveInto(Path from, Path to) {
+    return Guarded([&]() -> MgErr {
+        if (!FIsAbsPath(from) || !FIsAbsPath(to)) return kArgErr;
+        if (const MgErr err = CopyInto(from, to)) return err;
+        FRemove(from);
+        return kNoErr;
+    });
+}
+
+// ---- removing -------------------------------------------------------------------------------------------------------
+
+MgErr FRemove(Path path) {
+    return Guarded([&]() -> MgErr {
+        if (!FIsAbsPath(path)) return kArgErr;
+        FlushPathCache(path);
+        PlatformName name;
+        if (const MgErr err = name.Make(path, false)) return err;
+        return RemoveItem(path, name.Text());
+    });
+}
