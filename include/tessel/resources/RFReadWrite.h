@@ -5,12 +5,13 @@
 #include <tessel/resources/ovresfile.h>
 
 #ifdef __cplusplus
+#    include <tessel/memory/TrackedMallocFree.h>
 
 namespace tessel {
 
 /* Reads resources of a chain or a file, which stays its maker's unless the reader opened it itself. Without one, every
    read gives kResNotFoundErr. One thread at a time. */
-class TESSEL_API RFReader {
+class TESSEL_API RFReader : public TrackedObject {
 public:
     RFReader() = default;
     explicit RFReader(ResChain* chain);
@@ -41,7 +42,7 @@ public:
     MgErr GetIndPath(Path* path, int32 id, int32 index);
 
     /* A refnum for the chain, made on first call, until it is released. 0 without a chain. */
-    RsrcFile MapToObsoleteRsrcFile();
+    virtual RsrcFile MapToObsoleteRsrcFile();
     MgErr ReleaseRsrcFileRefnum();
 
     /* The chain. Reports when there is none. */
@@ -74,9 +75,13 @@ public:
     MgErr Remove(ResType type, int32 id);
     MgErr ReplaceFromHandle(UHandle data, int32 mode, ResType type, int32 id, ConstPStr name);
     MgErr UpdateFile();
+    RsrcFile MapToObsoleteRsrcFile() override;
 
     /* The file. Reports when there is none. */
     ResFile* LowLevelResFile();
+
+private:
+    ResFile* File() const { return static_cast<ResFile*>(fChain); }
 };
 
 /* On the heap, for the caller to delete; null when memory is full. */

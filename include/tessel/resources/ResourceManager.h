@@ -88,7 +88,8 @@ TESSEL_API MgErr RCloseFileForce(RsrcFile refnum);
 /* (file) Writes pending changes and packs the file. On failure they stay pending, and the next update tries again. */
 TESSEL_API MgErr RUpdateFile(RsrcFile refnum);
 
-/* (file) Takes back the handle given to ROpenUHandle, updated. kGenericErr: there is none, or it was taken already. */
+/* (file) Takes back the handle given to ROpenUHandle; it must outlive the file, which goes on using it. kGenericErr:
+   there is none, or it was taken already. */
 TESSEL_API MgErr RGetUHandleOwnership(RsrcFile refnum, UHandle* image);
 
 /* (file) The image of the whole file. Over ROpenUHandle it is that handle itself; else a new one, for which all
@@ -145,7 +146,7 @@ TESSEL_API MgErr RCount(RsrcFile refnum, ResType type, int32* count);
 TESSEL_API MgErr RCountTypes(RsrcFile refnum, int32* count);
 TESSEL_API MgErr RGetIndType(RsrcFile refnum, ResType* type, int32 index);
 
-/* (file) An ID from 128 up that the type does not have, or 0. */
+/* (file) An ID from 128 up that the type does not have, or 0. No ID either: 13, for an unknown refnum. */
 TESSEL_API int32 RUniqueID(RsrcFile refnum, ResType type);
 
 /* ---- resources by handle ------------------------------------------------------------------------------------------

@@ -83,16 +83,6 @@ public:
     virtual MgErr Open(OVResfileIO* io, _FMFileType* type, _FMFileCreator* creator) = 0;
 };
 
-/* Files searched in order: the first result that is not kResNotFoundErr counts. */
-class TESSEL_API OVResChain : public ResChain {
-public:
-    OVResChain(const OVResChain&) = delete;
-    OVResChain& operator=(const OVResChain&) = delete;
-
-    /* Empties the chain, after closing and destroying its files if it owns them. Always kNoErr. */
-    MgErr RCloseFile() override = 0;
-};
-
 /* Makes files and chains. `*file` is null on failure; close it with RCloseFile, then delete it. Modes, types and
    creators are as in the flat functions; type and creator outputs may be null. */
 class TESSEL_API ResFileFactory {
@@ -116,7 +106,8 @@ public:
     static MgErr RCreateMemFile(ResFile** file, _FMFileCreator creator, _FMFileType type);
     static MgErr ROpenAppResFile(Path path, int32 mode, ResFile** file);
 
-    /* A chain of `count` files in this order. With `owns` it closes and deletes them when it is closed. */
+    /* A chain of `count` files, searched in this order: the first result that is not kResNotFoundErr counts. Closing it
+       empties it, after closing and deleting the files if it `owns` them. Delete it when you are done. */
     static MgErr RChain(ResChain** chain, int32 count, ResFile* const* files, bool owns);
 };
 

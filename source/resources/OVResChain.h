@@ -1,0 +1,74 @@
+// Resource files searched in order.
+#ifndef TESSEL_SOURCE_RESOURCES_OVRESCHAIN_H
+#define TESSEL_SOURCE_RESOURCES_OVRESCHAIN_H
+
+#include <tessel/memory/TrackedMallocFree.h>
+#include <tessel/resources/ovresfile.h>
+
+#include <utility>
+#include <vector>
+
+#include "resources/ResFileLock.h"
+
+namespace tessel {
+
+// The first result that is not kResNotFoundErr counts. The files are the chain's only if it `owns` them.
+class OVResChain final : public ResChain, public TrackedObject {
+public:
+    using Files = std::vector<ResFile*, TrackedAllocator<ResFile*>>;
+
+    OVResChain(Files files, bool owns) : fFiles(std::move(files)), fOwns(owns) {}
+
+    MgErr RCloseFile() override {
+        ResFileLock lock;
+        for (ResFile* file : fFiles) {
+            if (!fOwns) break;
+            file->RCloseFile();
+            delete file;
+        }
+        fFiles.clear();
+        return kNoErr;
+    }
+    MgErr RGet(ResType type, int32 id, Resource** resource) override {
+        return Search(resource, [&](ResFile* file) { return file->RGet(type, id, resource); });
+    }
+    MgErr RExists(ResType type, int32 id, int32* exists) override {
+        return Search(exists, [&](ResFile* file) { return file->RExists(type, id, exists); });
+    }
+    MgErr RGetNamed(ResType type, ConstPStr name, Resource** resource) override {
+        return Search(resource, [&](ResFile* file) { return file->RGetNamed(type, name, resource); });
+    }
+    MgErr RIsLoaded(ResType type, int32 id, bool* loaded) override {
+        return Search(loaded, [&](ResFile* file) { return file->RIsLoaded(type, id, loaded); });
+    }
+    MgErr RGetIndStringPtr(ConstPStr* string, int32 id, int32 index, ResType type) override {
+        return Search(string, [&](ResFile* file) { return file->RGetIndStringPtr(string, id, index, type); });
+    }
+    Resource* GetResourceForHandle(UHandle data) override {
+        ResFileLock lock;
+        for (ResFile* file : fFiles) {
+            if (Resource* resource = file->GetResourceForHandle(data)) return resource;
+        }
+        return nullptr;
+    }
+
+private:
+    template <class Output, class Operation>
+    MgErr Search(Output* output, Operation operation) {
+        ResFileLock lock;
+        if (!output) return kArgErr;
+        *output = {};
+        for (ResFile* file : fFiles) {
+            const MgErr err = operation(file);
+            if (err != kResNotFoundErr) return err;
+        }
+        return kResNotFoundErr;
+    }
+
+    Files fFiles;
+    bool fOwns;
+};
+
+}  // namespace tessel
+
+#endif

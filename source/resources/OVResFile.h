@@ -1,0 +1,162 @@
+// An open resource file, its resources, and the cache of the last one found.
+#ifndef TESSEL_SOURCE_RESOURCES_OVRESFILE_H
+#define TESSEL_SOURCE_RESOURCES_OVRESFILE_H
+
+#include <tessel/memory/TrackedMallocFree.h>
+#include <tessel/resources/ovresfile.h>
+
+#include <memory>
+#include <vector>
+
+#include "resources/OVResfileIO.h"
+#include "resources/ResourceData.h"
+#include "resources/ResourceMap.h"
+
+namespace tessel {
+
+class OVResFile;
+
+// A loaded resource. Belongs to its file until it is detached; without a file its map side fails with kResNotFoundErr.
+class OVResource final : public Resource, public TrackedObject {
+public:
+    OVResource(OVResFile* file, std::unique_ptr<ResourceData> data) : fFile(file), fData(std::move(data)) {}
+    ~OVResource() override;
+    OVResource(const OVResource&) = delete;
+    OVResource& operator=(const OVResource&) = delete;
+
+    MgErr RRelease() override;
+    MgErr RChanged() override;
+    MgErr DetachResource() override;
+    MgErr RSetAttrs(uint32 attrs) override;
+    MgErr RSize(uint32* size) override;
+    MgErr RGetInfo(int32* id, ResType* type, PStr name) override;
+    MgErr RGetAttrs(uint32* attrs) override;
+    UHandle GetSharedDSHandle() override;
+    MgErr DetachHandle(UHandle* data) override;
+    uint32 GetSize() override;
+    const uint8* GetData() override;
+    bool ContainsHandle(UHandle data) override;
+
+private:
+    friend class OVResFile;
+
+    OVResFile* fFile;
+    std::unique_ptr<ResourceData> fData;
+    uint32 fSlot = 0;         // in the file's table of loaded resources, plus one
+    bool fUnwritten = false;  // the data are only here, whatever the attributes say
+};
+
+// The last resource found in a file, where its entry stands, and its type.
+class ResCache {
+public:
+    void Set(const OVResource* resource, ResType type, uint32 position);
+    void Empty() { fPosition = kNothing; }
+    // Answers when `resource` is the cached one.
+    bool FindRL(const OVResource* resource, const ResourceMap& map, ResType* type, RsrcList** entry) const;
+
+private:
+    static constexpr uint32 kNothing = ~uint32{0};
+
+    const OVResource* fResource = nullptr;
+    ResType fType = 0;
+    uint32 fPosition = kNothing;
+};
+
+class OVResFile final : public ResFile, public TrackedObject {
+public:
+    OVResFile() = default;
+    ~OVResFile() override;
+    OVResFile(const OVResFile&) = delete;
+    OVResFile& operator=(const OVResFile&) = delete;
+
+    MgErr RCloseFile() override;
+    MgErr RGet(ResType type, int32 id, Resource** resource) override;
+    MgErr RExists(ResType type, int32 id, int32* exists) override;
+    MgErr RGetNamed(ResType type, ConstPStr name, Resource** resource) override;
+    MgErr RIsLoaded(ResType type, int32 id, bool* loaded) override;
+    MgErr RGetIndStringPtr(ConstPStr* string, int32 id, int32 index, ResType type) override;
+    Resource* GetResourceForHandle(UHandle data) override;
+    MgErr RUpdateFile() override;
+    MgErr RAddPtr(const void* data, uint32 size, ResType type, int32 id, ConstPStr name) override;
+    MgErr RAdd(UHandle data, ResType type, int32 id, ConstPStr name) override;
+    MgErr RReplacePtr(const void* data, uint32 size, ResType type, int32 id) override;
+    MgErr RReplaceDSHandle(UHandle data, ResType type, int32 id) override;
+    MgErr RRemove(Resource* resource) override;
+    MgErr RCount(ResType type, int32* count) override;
+    MgErr RCountTypes(int32* count) override;
+    MgErr RGetInd(ResType type, int32 index, Resource** resource) override;
+    MgErr RGetIndType(ResType* type, int32 index) override;
+    int32 RUniqueID(ResType type) override;
+    MgErr RGetModDate(Path path, uint32* date, int32* readOnly) override;
+    MgErr RGetFileAttrs(uint32* attrs) override;
+    MgErr RSetFileAttrs(uint32 attrs) override;
+    MgErr RPreAllocFile(uint32 size) override;
+    MgErr RGetUHandleOwnership(UHandle* handle) override;
+    MgErr RGetMemFileHandle(UHandle* handle) override;
+    MgErr Open(OVResfileIO* io, _FMFileType* type, _FMFileCreator* creator) override;
+
+    // A new empty file that is only in memory.
+    MgErr CreateInMemory(_FMFileType type, _FMFileCreator creator);
+
+private:
+    friend class OVResource;
+    using Positions = ResourceMap::Positions;
+    struct Entry;    // an entry on its way through an update
+    class Updating;  // an update
+
+    // opening and closing
+    MgErr OpenSource();
+    MgErr ReadMap(const RsrcHeader& header, uint64 base);
+    void Dispose();
+
+    // loading
+    uint64 DataStart() const { return fBase + fMap.Head()->header.dataOffset; }
+    MgErr DataLengthAt(const RsrcList& entry, uint32* length);
+    MgErr LoadData(const RsrcList& entry, std::unique_ptr<ResourceData>* data);
+    MgErr Load(ResType type, RsrcList* entry, OVResource** resource);
+    OVResource* LoadedAt(const RsrcList& entry) const;
+    MgErr Attach(OVResource* resource);  // gives it a slot
+    void Forget(OVResource* resource);   // takes the slot back
+
+    // the entry of a resource
+    MgErr FindRL(const OVResource* resource, ResType* type, RsrcList** entry);
+    bool IsChanged(const RsrcList& entry) const;
+    void Touch() { fMap.Head()->fileAttrs |= kRFileChanged; }
+    bool IsReadOnly() const { return (fMap.Head()->fileAttrs & kRFileReadOnly) != 0; }
+
+    MgErr AddHandle(UHandle data, ResType type, int32 id, ConstPStr name);
+    MgErr ReplaceWith(UHandle copy, ResType type, RsrcList* entry);
+    OVResource* OwnResource(Resource* resource) const;
+
+    // what the resources ask their file
+    MgErr Release(OVResource* resource);
+    MgErr MarkChanged(OVResource* resource);
+    MgErr Detach(OVResource* resource);
+    MgErr SetAttrs(const OVResource* resource, uint32 attrs);
+    MgErr GetInfo(const OVResource* resource, int32* id, ResType* type, PStr name);
+    MgErr GetAttrs(const OVResource* resource, uint32* attrs);
+
+    // writing (OVResFileUpdate.cpp)
+    MgErr WriteEmpty();
+    MgErr RebaseData();
+    MgErr UpdateMap(uint64 dataLength);
+    MgErr BuildImage(UHandle* image);
+    MgErr MeasureLoaded(const Positions& positions, uint64* dataLength) const;
+    void LayOut(ResourceMap* map, const Positions& positions, uint32 dataLength, uint8* image) const;
+
+    std::unique_ptr<OVResfileIO> fIO;  // null for a file made in memory
+    ResourceMap fMap;
+    uint64 fBase = 0;  // where the resource file starts in its source
+    std::vector<OVResource*, TrackedAllocator<OVResource*>> fLoaded;
+    std::vector<uint32, TrackedAllocator<uint32>> fFreeSlots;
+    ResCache fCache;
+    bool fOpen = false;
+};
+
+// Reads the header at the start of the source or, in a read-only one, behind a trailer; in host order, its offsets from
+// `base`.
+MgErr ReadRsrcHeader(OVResfileIO& io, RsrcHeader* header, uint64* base);
+
+}  // namespace tessel
+
+#endif

@@ -1,0 +1,77 @@
+// The bytes that a resource file is made of, wherever they are.
+#ifndef TESSEL_SOURCE_RESOURCES_OVRESFILEIO_H
+#define TESSEL_SOURCE_RESOURCES_OVRESFILEIO_H
+
+#include <tessel/base/MgErr.h>
+#include <tessel/memory/TrackedMallocFree.h>
+
+namespace tessel {
+
+// The source of one open file: a file on disk, a handle with a whole file in it, or memory of the caller's. A small
+// read-only file on disk is read as a whole when it is opened, so that resources are used in place; a large one is read
+// piece by piece, so that a file which someone cuts meanwhile gives an error and nothing worse.
+class OVResfileIO : public TrackedObject {
+public:
+    OVResfileIO() = default;
+    ~OVResfileIO();
+    OVResfileIO(const OVResfileIO&) = delete;
+    OVResfileIO& operator=(const OVResfileIO&) = delete;
+
+    // Each sets up a source. The path's file is asked for from the cached-file hook first when it is read-only.
+    MgErr OpenPath(Path path, bool readOnly, int32 denyMode);
+    void UseFile(File_t* file, bool readOnly);
+    void UseHandle(UHandle handle, bool readOnly);
+    void OwnHandle() { fOwnsHandle = true; }  // from now on
+    void UseMemory(const void* data, uint32 size);
+
+    // Brings a read-only file on disk into memory if that pays. Checks that the source is of one kind.
+    MgErr Prepare();
+
+    // Exactly `count` bytes at `position`, else kEOFErr.
+    MgErr Read(uint64 position, void* buffer, uint32 count);
+    // A memory handle grows when it has to.
+    MgErr Write(uint64 position, const void* data, uint32 count);
+    MgErr Size(uint64* size);
+    MgErr SetSize(uint32 size);
+    // Makes room for `size` bytes in a memory handle; nothing for a file on disk.
+    MgErr Reserve(uint32 size);
+    // Appends `count` zero bytes. Nothing stays of them on failure.
+    MgErr Extend(uint32 count);
+    MgErr Flush();
+    // Closes what was opened here; disposes of the handle if it is still owned.
+    MgErr Close();
+
+    // The bytes in place, when they stay where they are; else null.
+    const uint8* InPlace(uint64 position) const;
+
+    bool IsReadOnly() const { return fReadOnly; }
+    bool CanWrite() const { return !fReadOnly && (fFile || fHandle); }
+    File_t* File() const { return fFile; }
+    UHandle Handle() const { return fHandle; }
+    // The handle if it is owned, which it is not any more afterwards; else null.
+    UHandle ReleaseHandle();
+
+private:
+    MgErr SeekTo(uint64 position);
+    const uint8* Bytes() const { return fHandle ? *fHandle : fData; }
+    bool InMemory() const { return fHandle || fData; }
+    MgErr ReadWhole(uint32 size);
+
+    bool fFromCacheHook = false;
+    bool fOpenedByPath = false;
+    bool fReadOnly = false;
+    bool fOwnsHandle = false;
+    bool fOwnsData = false;
+    File_t* fFile = nullptr;
+    void* fView = nullptr;  // the hook's
+    UHandle fHandle = nullptr;
+    const uint8* fData = nullptr;
+    uint64 fLength = 0;                   // of what is in memory
+    uint64 fPosition = kUnknownPosition;  // of a file that only we move
+
+    static constexpr uint64 kUnknownPosition = ~uint64{0};
+};
+
+}  // namespace tessel
+
+#endif

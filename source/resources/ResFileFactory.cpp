@@ -1,0 +1,245 @@
+// Making resource files and chains of them.
+#include <tessel/base/MGModule.h>
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/files/FileManager.h>
+#include <tessel/memory/MemoryManager.h>
+#include <tessel/paths/PathManager.h>
+#include <tessel/paths/PathTextFormat.h>
+#include <tessel/resources/ovresfile.h>
+
+#include <cstring>
+#include <memory>
+#include <vector>
+
+#include "diagnostics/Guarded.h"
+#include "resources/OVResChain.h"
+#include "resources/OVResFile.h"
+#include "resources/ResFileLock.h"
+
+namespace tessel {
+
+namespace {
+
+constexpr int32 kLongestModuleName = 512;
+
+MgErr CheckMode(int32 mode) {
+    return mode == kROpenReadWrite || mode == kROpenReadOnly ? kNoErr : kArgErr;
+}
+
+// Opens a file over a source that is set up.
+MgErr OpenOver(std::unique_ptr<OVResfileIO> io, ResFile** file, _FMFileType* type, _FMFileCreator* creator) {
+    auto made = std::make_unique<OVResFile>();
+    if (const MgErr err = made->Open(io.release(), type, creator)) return err;
+    *file = made.release();
+    return kNoErr;
+}
+
+// The header at the start of the map of an open file. In host order; nothing for a file without a map.
+MgErr ReadMapHead(OVResfileIO& io, const RsrcHeader& header, uint64 base, RsrcMap* head) {
+    *head = {};
+    if (header.mapLength <= kHeaderSize) return kNoErr;
+    const uint32 length = std::min<uint32>(header.mapLength, sizeof *head);
+    if (const MgErr err = io.Read(base + header.mapOffset, head, length)) return err;
+    SwapHeader(&head->header);
+    head->fileAttrs = ToBig32(head->fileAttrs);
+    head->typeList = ToBig32(head->typeList);
+    head->nameList = ToBig32(head->nameList);
+    return kNoErr;
+}
+
+MgErr WriteHeader(OVResfileIO& io, uint64 position, RsrcHeader header) {
+    SwapHeader(&header);
+    return io.Write(position, &header, kHeaderSize);
+}
+
+MgErr SetTypeIn(OVResfileIO& io, _FMFileType type, _FMFileCreator creator) {
+    RsrcHeader header;
+    RsrcMap head;
+    uint64 base = 0;
+    if (const MgErr err = ReadRsrcHeader(io, &header, &base)) return err;
+    if (const MgErr err = ReadMapHead(io, header, base, &head)) return err;
+    const bool hasMap = header.mapLength > kHeaderSize;
+    if (hasMap && !SanityCheckRsrcMap(head.header, header)) return kIOErr;
+    head.header.type = header.type = type;
+    head.header.creator = header.creator = creator;
+    if (hasMap) {
+        if (const MgErr err = WriteHeader(io, header.mapOffset, head.header)) return err;
+    }
+    return WriteHeader(io, 0, header);
+}
+
+// The file of the application's own module.
+MgErr ApplicationModule(Path* path) {
+    char name[kLongestModuleName] = {};
+    const int32 length = MSWinGetModulePath(MGModuleGetInstance(), name, sizeof name);
+    if (length <= 0) {
+        TESSEL_REPORT(kDebugError, 0x7D05E3B9u) << "OVResFile::ROpenAppResFile, len<=0";
+        return kNotFoundErr;
+    }
+    return FTextToPath(name, length, path);
+}
+
+}  // namespace
+
+MgErr ResFileFactory::InitResourceMgr() {
+    return ResFileLock::Create();
+}
+
+MgErr ResFileFactory::UninitResourceMgr() {
+    ResFileLock::Destroy();
+    return kNoErr;
+}
+
+MgErr ResFileFactory::RCreateFile(Path path, int32 replace, _FMFileCreator creator, _FMFileType type, int32) {
+    File_t* file = nullptr;
+    if (const MgErr err = FGenericCreate(&file, path, 0, kFOpenReadWrite, kFDenyNone, 0, replace ? 1 : 0)) return err;
+    RsrcHeader header = EmptyHeader(type, creator);
+    SwapHeader(&header);
+    const MgErr err = FMWrite(file, kHeaderSize, nullptr, &header);
+    const MgErr closeErr = FMClose(file);
+    return err ? err : closeErr;
+}
+
+MgErr ResFileFactory::RGetFileType(Path path, _FMFileType* type, _FMFileCreator* creator) {
+    RFileHeader header;
+    if (const MgErr err = RGetFileHeader(path, &header)) return err;
+    if (type) *type = header.type;
+    if (creator) *creator = header.creator;
+    return kNoErr;
+}
+
+MgErr ResFileFactory::RSetFileType(Path path, _FMFileType type, _FMFileCreator creator) {
+    ResFileLock lock;
+    OVResfileIO io;
+    if (const MgErr err = io.OpenPath(path, false, kFDenyWrite)) return err;
+    const MgErr err = SetTypeIn(io, type, creator);
+    const MgErr closeErr = io.Close();
+    return err ? err : closeErr;
+}
+
+MgErr ResFileFactory::RGetModDate(Path path, uint32* date, int32* readOnly) {
+    if (!date) {
+        TESSEL_REPORT(kDebugError, 0x2B61F4C8u) << "ResFileFactory::RGetModDate, modDate==NULL.";
+        return kArgErr;
+    }
+    return FMGetModDate(path, nullptr, date, readOnly);
+}
+
+MgErr ResFileFactory::ROpenPath(Path path, int32 mode, ResFile** file, _FMFileType* type, _FMFileCreator* creator) {
+    if (!file) return kArgErr;
+    *file = nullptr;
+    if (const MgErr err = CheckMode(mode)) return err;
+    return Guarded([&]() -> MgErr {
+        auto io = std::make_unique<OVResfileIO>();
+        if (const MgErr err = io->OpenPath(path, mode == kROpenReadOnly, kFDenyWrite)) return err;
+        return OpenOver(std::move(io), file, type, creator);
+    });
+}
+
+MgErr ResFileFactory::ROpenFileref(File_t* fileRef, int32 mode, ResFile** file, _FMFileType* type,
+                                   _FMFileCreator* creator) {
+    if (!file) return kArgErr;
+    *file = nullptr;
+    if (!fileRef || CheckMode(mode)) return kArgErr;
+    return Guarded([&]() -> MgErr {
+        auto io = std::make_unique<OVResfileIO>();
+        io->UseFile(fileRef, mode == kROpenReadOnly);
+        return OpenOver(std::move(io), file, type, creator);
+    });
+}
+
+MgErr ResFileFactory::ROpenMemFile(UHandle image, int32 mode, ResFile** file, _FMFileType* type,
+                                   _FMFileCreator* creator) {
+    if (!file) return kArgErr;
+    *file = nullptr;
+    if (!image || CheckMode(mode)) return kArgErr;
+    if (const MgErr err = DSCheckHandle(image)) return err;
+    return Guarded([&]() -> MgErr {
+        auto io = std::make_unique<OVResfileIO>();
+        io->UseHandle(image, mode == kROpenReadOnly);
+        OVResfileIO* source = io.get();
+        auto made = std::make_unique<OVResFile>();
+        if (const MgErr err = made->Open(io.release(), type, creator)) return err;
+        source->OwnHandle();
+        *file = made.release();
+        return kNoErr;
+    });
+}
+
+MgErr ResFileFactory::ROpenMemFile(const void* image, uint32 size, ResFile** file, _FMFileType* type,
+                                   _FMFileCreator* creator) {
+    if (!file) return kArgErr;
+    *file = nullptr;
+    if (!image) return kArgErr;
+    return Guarded([&]() -> MgErr {
+        auto io = std::make_unique<OVResfileIO>();
+        io->UseMemory(image, size);
+        return OpenOver(std::move(io), file, type, creator);
+    });
+}
+
+MgErr ResFileFactory::RCreateMemFile(ResFile** file, _FMFileCreator creator, _FMFileType type) {
+    if (!file) return kArgErr;
+    *file = nullptr;
+    return Guarded([&]() -> MgErr {
+        auto made = std::make_unique<OVResFile>();
+        if (const MgErr err = made->CreateInMemory(type, creator)) return err;
+        *file = made.release();
+        return kNoErr;
+    });
+}
+
+MgErr ResFileFactory::ROpenAppResFile(Path path, int32 mode, ResFile** file) {
+    if (!file) return kArgErr;
+    *file = nullptr;
+    if (path && FDepth(path) > 0) return ROpenPath(path, mode, file, nullptr, nullptr);
+    Path module = nullptr;
+    if (const MgErr err = ApplicationModule(&module)) return err;
+    const MgErr err = ROpenPath(module, mode, file, nullptr, nullptr);
+    FDestroyPath(&module);
+    return err;
+}
+
+MgErr ResFileFactory::RChain(ResChain** chain, int32 count, ResFile* const* files, bool owns) {
+    if (!chain) return kArgErr;
+    *chain = nullptr;
+    if (count < 0 || (count && !files)) return kArgErr;
+    return Guarded([&]() -> MgErr {
+        OVResChain::Files list;
+        for (int32 i = 0; i < count; ++i) {
+            if (files[i]) list.push_back(files[i]);
+        }
+        *chain = new OVResChain(std::move(list), owns);
+        return kNoErr;
+    });
+}
+
+}  // namespace tessel
+
+using namespace tessel;
+
+MgErr RGetFileHeader(Path path, RFileHeader* out) {
+    if (!out) return kArgErr;
+    *out = {};
+    ResFileLock lock;
+    OVResfileIO io;
+    if (const MgErr err = io.OpenPath(path, true, kFDenyNone)) return err;
+    RsrcHeader header;
+    RsrcMap head;
+    uint64 base = 0;
+    if (const MgErr err = ReadRsrcHeader(io, &header, &base)) return err;
+    if (const MgErr err = ReadMapHead(io, header, base, &head)) return err;
+    *out = {base,
+            {header.eol[0], header.eol[1]},
+            header.version,
+            header.type,
+            header.creator,
+            header.mapOffset,
+            header.mapLength,
+            header.dataOffset,
+            header.dataLength,
+            head.fileAttrs,
+            head.typeList,
+            head.nameList};
+    return kNoErr;
+}

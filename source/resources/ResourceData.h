@@ -1,0 +1,63 @@
+// The data of one loaded resource.
+#ifndef TESSEL_SOURCE_RESOURCES_RESOURCEDATA_H
+#define TESSEL_SOURCE_RESOURCES_RESOURCEDATA_H
+
+#include <tessel/base/Types.h>
+#include <tessel/memory/TrackedMallocFree.h>
+
+namespace tessel {
+
+class ResourceData : public TrackedObject {
+public:
+    ResourceData() = default;
+    virtual ~ResourceData() = default;
+    ResourceData(const ResourceData&) = delete;
+    ResourceData& operator=(const ResourceData&) = delete;
+
+    // Forgets the data: whoever had the handle owns it from then on.
+    virtual void DetachHandle() = 0;
+    virtual uint32 GetSize() const = 0;
+    virtual const uint8* GetData() const = 0;
+    // The data as a handle, which stays ours. Null when memory is full.
+    virtual UHandle GetSharedDSHandle() = 0;
+    virtual bool ContainsHandle(UHandle handle) const = 0;
+};
+
+// Owns a handle.
+class DSHandleResource final : public ResourceData {
+public:
+    explicit DSHandleResource(UHandle handle) : fHandle(handle) {}
+    ~DSHandleResource() override;
+
+    void Adopt(UHandle handle) { fHandle = handle; }
+    void DetachHandle() override { fHandle = nullptr; }
+    uint32 GetSize() const override;
+    const uint8* GetData() const override { return fHandle ? *fHandle : nullptr; }
+    UHandle GetSharedDSHandle() override { return fHandle; }
+    bool ContainsHandle(UHandle handle) const override { return handle && handle == fHandle; }
+
+private:
+    UHandle fHandle;
+};
+
+// Points into memory of its file, and copies it into a handle when one is asked for.
+class MappedResource final : public ResourceData {
+public:
+    MappedResource(const uint8* data, uint32 size) : fData(data), fSize(size) {}
+    ~MappedResource() override;
+
+    void DetachHandle() override;
+    uint32 GetSize() const override { return fSize; }
+    const uint8* GetData() const override { return fData; }
+    UHandle GetSharedDSHandle() override;
+    bool ContainsHandle(UHandle handle) const override { return handle && handle == fCopy; }
+
+private:
+    const uint8* fData;
+    uint32 fSize;
+    UHandle fCopy = nullptr;
+};
+
+}  // namespace tessel
+
+#endif

@@ -1,0 +1,458 @@
+#include "resources/ResourceMap.h"
+
+#include <tessel/memory/MemoryManager.h>
+
+#include <algorithm>
+#include <cstring>
+#include <limits>
+
+namespace tessel {
+
+namespace {
+
+uint32 NameSize(ConstPStr name) {
+    return name && name[0] ? name[0] + 1u : 0;
+}
+
+RsrcList NewEntry(int32 id, int32 name) {
+    return {id, name, 0x02, 0, 0};
+}
+
+bool LessID(const RsrcList& a, const RsrcList& b) {
+    return a.id < b.id;
+}
+
+void SwapWord(uint8* word) {
+    uint32 value;
+    std::memcpy(&value, word, sizeof value);
+    value = ToBig32(value);
+    std::memcpy(word, &value, sizeof value);
+}
+
+uint32 HostWord(const uint8* word) {
+    uint32 value;
+    std::memcpy(&value, word, sizeof value);
+    return value;
+}
+
+// A part of a map, as offsets from its start.
+struct Extent {
+    uint64 begin;
+    uint64 end;
+};
+using Extents = std::vector<Extent, TrackedAllocator<Extent>>;
+
+bool Overlap(Extents* extents) {
+    std::sort(extents->begin(), extents->end(), [](const Extent& a, const Extent& b) { return a.begin < b.begin; });
+    for (size_t i = 1; i < extents->size(); ++i) {
+        if ((*extents)[i].begin < (*extents)[i - 1].end) return true;
+    }
+    return false;
+}
+
+// A walk over the lists of a map whose counts and offsets nobody has checked yet. Nothing outside `size` is touched.
+class UncheckedMap {
+public:
+    UncheckedMap(uint8* map, uint32 size) : map_(map), size_(size) {}
+
+    MgErr Standardize(MapDirection direction) {
+        RsrcMap* head = reinterpret_cast<RsrcMap*>(map_);
+        const bool fromDisk = direction == MapDirection::kFromDisk;
+        if (!fromDisk) ReadHead(*head);
+        SwapHeader(&head->header);
+        for (size_t at = offsetof(RsrcMap, fileAttrs); at < sizeof(RsrcMap); at += 4) SwapWord(map_ + at);
+        if (fromDisk) ReadHead(*head);
+        if (size_ <= kEmptyMapSize) return kNoErr;
+        if (!Fits(typeList_, kTypeCountSize) || typeList_ < kEmptyMapSize) return kIOErr;
+        return StandardizeTypes(fromDisk);
+    }
+
+    // Whether names and lists lie apart and names end inside the map. Host order.
+    MgErr CheckExtents() {
+        if (Overlap(&lists_) || TypeTwice()) return kIOErr;
+        const uint64 listsEnd = lists_.empty() ? typeList_ : lists_.back().end;
+        if (nameList_ != 0 && (nameList_ < listsEnd || nameList_ > size_)) return kIOErr;
+        if (!CollectNames()) return kIOErr;
+        return Overlap(&names_) ? kIOErr : kNoErr;
+    }
+
+private:
+    bool Fits(uint64 at, uint64 length) const { return at <= size_ && length <= size_ - at; }
+
+    void ReadHead(const RsrcMap& head) {
+        typeList_ = head.typeList;
+        nameList_ = head.nameList;
+    }
+
+    // The count of a list in host order, which is stored as one less.
+    int64 TakeCount(uint8* word, bool fromDisk) {
+        if (fromDisk) SwapWord(word);
+        const auto lastIndex = static_cast<int32>(HostWord(word));
+        if (!fromDisk) SwapWord(word);
+        return int64{lastIndex} + 1;
+    }
+
+    MgErr StandardizeTypes(bool fromDisk) {
+        const int64 count = TakeCount(map_ + typeList_, fromDisk);
+        const uint64 first = typeList_ + kTypeCountSize;
+        if (count < 0 || !Fits(first, static_cast<uint64>(count) * kTypeEntrySize)) return kIOErr;
+        typesEnd_ = first + static_cast<uint64>(count) * kTypeEntrySize;
+        if (fromDisk) lists_.reserve(static_cast<size_t>(count));
+        for (uint64 at = first; at < typesEnd_; at += kTypeEntrySize) {
+            if (const MgErr err = StandardizeList(map_ + at, fromDisk)) return err;
+        }
+        return kNoErr;
+    }
+
+    MgErr StandardizeList(uint8* typeEntry, bool fromDisk) {
+        const int64 count = TakeCount(typeEntry + offsetof(TypeList, lastIndex), fromDisk);
+        uint8* offsetWord = typeEntry + offsetof(TypeList, list);
+        if (fromDisk) SwapWord(offsetWord);
+        const uint64 begin = typeList_ + uint64{HostWord(offsetWord)};
+        if (!fromDisk) SwapWord(offsetWord);
+        const uint64 length = static_cast<uint64>(count) * kRefEntrySize;
+        if (count < 1 || begin < typesEnd_ || !Fits(begin, length)) return kIOErr;
+        // Lists that overlap must not cost more than the map is long; Overlap refuses them later.
+        listBytes_ += length;
+        if (listBytes_ > size_) return kIOErr;
+        if (fromDisk) lists_.push_back({begin, begin + length});
+        for (uint64 at = begin; at < begin + length; at += kRefEntrySize) {
+            for (uint64 word = 0; word < offsetof(RsrcList, loaded); word += 4) SwapWord(map_ + at + word);
+        }
+        return kNoErr;
+    }
+
+    bool TypeTwice() const {
+        std::vector<ResType, TrackedAllocator<ResType>> types;
+        for (uint64 at = typeList_ + kTypeCountSize; at < typesEnd_; at += kTypeEntrySize)
+            types.push_back(HostWord(map_ + at));
+        std::sort(types.begin(), types.end());
+        return std::adjacent_find(types.begin(), types.end()) != types.end();
+    }
+
+    bool CollectNames() {
+        for (const Extent& list : lists_) {
+            for (uint64 at = list.begin; at < list.end; at += kRefEntrySize) {
+                const auto name = static_cast<int32>(HostWord(map_ + at + offsetof(RsrcList, name)));
+                if (name == kNoName) continue;
+                const uint64 begin = nameList_ + uint64{static_cast<uint32>(name)};
+                if (nameList_ == 0 || name < 0 || !Fits(begin, 1)) return false;
+                const uint64 length = 1u + map_[begin];
+                if (!Fits(begin, length)) return false;
+                names_.push_back({begin, begin + length});
+            }
+        }
+        return true;
+    }
+
+    uint8* map_;
+    uint64 size_;
+    uint64 typeList_ = 0;
+    uint64 nameList_ = 0;
+    uint64 typesEnd_ = 0;
+    uint64 listBytes_ = 0;
+    Extents lists_;
+    Extents names_;
+};
+
+}  // namespace
+
+bool SanityCheckRsrcMap(const RsrcHeader& copy, const RsrcHeader& header) {
+    return copy.magic == header.magic && std::memcmp(copy.eol, header.eol, sizeof copy.eol) == 0 &&
+           copy.version == header.version && copy.type == header.type && copy.creator == header.creator;
+}
+
+MgErr StandardizeAndSanityChkRsrcMap(uint8* map, uint32 size, MapDirection direction, const RsrcHeader& header) {
+    UncheckedMap unchecked(map, size);
+    if (const MgErr err = unchecked.Standardize(direction)) return err;
+    if (direction == MapDirection::kToDisk) return kNoErr;
+    const RsrcMap* head = reinterpret_cast<const RsrcMap*>(map);
+    if (!SanityCheckRsrcMap(head->header, header)) return kIOErr;
+    const auto length = static_cast<int32>(size);
+    if (static_cast<int32>(head->typeList) > length || static_cast<int32>(head->nameList) > length) return kIOErr;
+    return unchecked.CheckExtents();
+}
+
+void ResourceMap::Dispose() {
+    if (fHandle) DSDisposeHandle(fHandle);
+    fHandle = nullptr;
+    fSize = 0;
+}
+
+// ---- coming and going -----------------------------------------------------------------------------------------------
+
+MgErr ResourceMap::MakeEmpty(const RsrcHeader& header) {
+    fHandle = DSNewHClr(kEmptyMapSize);
+    if (!fHandle) return kMemFullErr;
+    fSize = kEmptyMapSize;
+    Head()->header = header;
+    MakeBlank();
+    return kNoErr;
+}
+
+// Keeps what is not about resources.
+void ResourceMap::MakeBlank() {
+    RsrcMap* head = Head();
+    head->header.mapOffset = kHeaderSize;
+    head->header.mapLength = 0;
+    head->header.dataOffset = kHeaderSize;
+    head->header.dataLength = 0;
+    head->typeList = kEmptyMapSize;
+    head->nameList = 0;
+}
+
+MgErr ResourceMap::FromDisk(UHandle bytes, const RsrcHeader& header) {
+    fHandle = bytes;
+    fSize = DSGetHandleSize(bytes);
+    const uint32 mapLength = fSize;
+    if (fSize < kEmptyMapSize) {
+        if (const MgErr err = DSSetHSzClr(bytes, kEmptyMapSize)) return err;
+        fSize = kEmptyMapSize;
+    }
+    const MgErr err = StandardizeAndSanityChkRsrcMap(*bytes, fSize, MapDirection::kFromDisk, header);
+    if (err) return err;
+    Head()->header = header;
+    if (mapLength <= kEmptyMapSize || TypeCount() == 0) {
+        MakeBlank();
+        Shrink(kEmptyMapSize);
+        return kNoErr;
+    }
+    for (int32 i = 0; i < TypeCount(); ++i) {
+        RsrcList* entries = Entries(TypeAt(i));
+        for (int32 k = 0; k < CountOf(TypeAt(i)); ++k) entries[k].loaded = 0;
+    }
+    return kNoErr;
+}
+
+MgErr ResourceMap::CopyOf(const ResourceMap& other) {
+    fSize = other.fSize;
+    return DSPtrToHand(*other.fHandle, &fHandle, fSize);
+}
+
+void ResourceMap::SetLayout(uint32 dataLength) {
+    RsrcHeader& header = Head()->header;
+    const bool empty = IsEmpty();
+    header.dataOffset = kHeaderSize;
+    header.dataLength = dataLength;
+    header.mapOffset = kHeaderSize + dataLength;
+    header.mapLength = empty ? 0 : fSize;
+}
+
+void ResourceMap::ToDisk(uint8* bytes) const {
+    std::memcpy(bytes, *fHandle, fSize);
+    const uint8* start = *fHandle;
+    for (int32 i = 0, types = TypeCount(); i < types; ++i) {
+        const RsrcList* entries = Entries(TypeAt(i));
+        auto* copies = reinterpret_cast<RsrcList*>(bytes + (reinterpret_cast<const uint8*>(entries) - start));
+        for (int32 k = 0, count = CountOf(TypeAt(i)); k < count; ++k) copies[k].loaded = 0;
+    }
+    StandardizeAndSanityChkRsrcMap(bytes, fSize, MapDirection::kToDisk, Head()->header);
+}
+
+void ResourceMap::Sort() {
+    for (int32 i = 0, types = TypeCount(); i < types; ++i) {
+        RsrcList* first = Entries(TypeAt(i));
+        RsrcList* last = first + CountOf(TypeAt(i));
+        if (!std::is_sorted(first, last, LessID)) std::stable_sort(first, last, LessID);
+    }
+}
+
+// ---- finding --------------------------------------------------------------------------------------------------------
+
+int32 ResourceMap::TypeCount() const {
+    return fSize <= kEmptyMapSize ? 0 : Types()->lastIndex + 1;
+}
+
+TypeList* ResourceMap::FindType(ResType type) const {
+    for (int32 i = 0, types = TypeCount(); i < types; ++i) {
+        if (TypeAt(i)->type == type) return TypeAt(i);
+    }
+    return nullptr;
+}
+
+int64 ResourceMap::ReferenceCount() const {
+    int64 sum = 0;
+    for (int32 i = 0, types = TypeCount(); i < types; ++i) sum += CountOf(TypeAt(i));
+    return sum;
+}
+
+RsrcList* ResourceMap::Entries(const TypeList* type) const {
+    return reinterpret_cast<RsrcList*>(reinterpret_cast<uint8*>(Types()) + type->list);
+}
+
+RsrcList* ResourceMap::FindEntry(ResType type, int32 id) const {
+    const TypeList* list = FindType(type);
+    if (!list) return nullptr;
+    RsrcList* first = Entries(list);
+    RsrcList* last = first + CountOf(list);
+    RsrcList* found =
+        std::lower_bound(first, last, id, [](const RsrcList& entry, int32 key) { return entry.id < key; });
+    return found != last && found->id == id ? found : nullptr;
+}
+
+uint32 ResourceMap::PositionOf(const RsrcList* entry) const {
+    return static_cast<uint32>(reinterpret_cast<const uint8*>(entry) - *fHandle);
+}
+
+void ResourceMap::CollectEntries(Positions* positions) const {
+    for (int32 i = 0, types = TypeCount(); i < types; ++i) {
+        const uint64 begin = uint64{Head()->typeList} + TypeAt(i)->list;
+        for (int32 k = 0, count = CountOf(TypeAt(i)); k < count; ++k) {
+            const uint64 at = begin + static_cast<uint64>(k) * kRefEntrySize;
+            if (at + kRefEntrySize > fSize) break;
+            positions->push_back(static_cast<uint32>(at));
+        }
+    }
+}
+
+ConstPStr ResourceMap::NameOf(const RsrcList* entry) const {
+    static constexpr uint8 kEmptyName[1] = {0};
+    if (entry->name == kNoName) return kEmptyName;
+    return *fHandle + Head()->nameList + static_cast<uint32>(entry->name);
+}
+
+// ---- changing -------------------------------------------------------------------------------------------------------
+
+MgErr ResourceMap::Resize(uint64 size) {
+    if (size > static_cast<uint64>(std::numeric_limits<int32>::max())) return kMemFullErr;
+    if (const MgErr err = DSSetHandleSize(fHandle, static_cast<uint32>(size))) return err;
+    fSize = static_cast<uint32>(size);
+    return kNoErr;
+}
+
+// A handle that stays too large does no harm.
+void ResourceMap::Shrink(uint32 size) {
+    fSize = size;
+    DSSetHandleSize(fHandle, size);
+}
+
+// Moves what lies from `at` to the end of the first `used` bytes up. The room for it is there already.
+void ResourceMap::OpenGap(uint32 at, uint32 size, uint32 used) {
+    uint8* map = *fHandle;
+    std::memmove(map + at + size, map + at, used - at);
+}
+
+void ResourceMap::CloseGap(uint32 at, uint32 size) {
+    uint8* map = *fHandle;
+    std::memmove(map + at, map + at + size, fSize - at - size);
+    fSize -= size;
+}
+
+// Moves the lists that begin at `fromOffset` (from the type list start) or later.
+void ResourceMap::ShiftLists(uint32 fromOffset, int32 by) {
+    for (int32 i = 0, types = TypeCount(); i < types; ++i) {
+        TypeList* type = TypeAt(i);
+        if (type->list >= fromOffset) type->list += static_cast<uint32>(by);
+    }
+}
+
+uint32 ResourceMap::TypesEnd() const {
+    return Head()->typeList + kTypeCountSize + static_cast<uint32>(TypeCount()) * kTypeEntrySize;
+}
+
+// Stores a name at `end`, the end of the map as it was with everything else in place. Returns its offset.
+int32 ResourceMap::AppendName(ConstPStr name, uint32 end) {
+    if (!NameSize(name)) return kNoName;
+    RsrcMap* head = Head();
+    if (head->nameList == 0) head->nameList = end;
+    std::memcpy(*fHandle + end, name, NameSize(name));
+    return static_cast<int32>(end - head->nameList);
+}
+
+MgErr ResourceMap::Insert(ResType type, int32 id, ConstPStr name, uint32* position) {
+    if (IsEmpty()) return InsertFirst(type, id, name, position);
+    if (FindEntry(type, id)) return kResIDExistsErr;
+    TypeList* list = FindType(type);
+    const MgErr err = list ? InsertEntry(list, id, name, position) : InsertType(type, id, name, position);
+    if (!err) Head()->header.mapLength = fSize;
+    return err;
+}
+
+MgErr ResourceMap::InsertFirst(ResType type, int32 id, ConstPStr name, uint32* position) {
+    constexpr uint32 kListOffset = kTypeCountSize + kTypeEntrySize;
+    constexpr uint32 kEnd = kEmptyMapSize + kListOffset + kRefEntrySize;
+    if (const MgErr err = Resize(kEnd + NameSize(name))) return err;
+    Types()->lastIndex = 0;
+    *TypeAt(0) = {type, 0, kListOffset};
+    *position = kEmptyMapSize + kListOffset;
+    *EntryAt(*position) = NewEntry(id, AppendName(name, kEnd));
+    Head()->header.mapLength = fSize;
+    return kNoErr;
+}
+
+MgErr ResourceMap::InsertEntry(TypeList* type, int32 id, ConstPStr name, uint32* position) {
+    const uint32 oldSize = fSize;
+    const auto typePosition = static_cast<uint32>(reinterpret_cast<uint8*>(type) - *fHandle);
+    RsrcList* first = Entries(type);
+    const RsrcList* after = std::upper_bound(first, first + CountOf(type), NewEntry(id, kNoName), LessID);
+    *position = PositionOf(after);
+
+    if (const MgErr err = Resize(uint64{oldSize} + kRefEntrySize + NameSize(name))) return err;
+    type = reinterpret_cast<TypeList*>(*fHandle + typePosition);
+    OpenGap(*position, kRefEntrySize, oldSize);
+    ShiftLists(type->list + 1, kRefEntrySize);
+    ++type->lastIndex;
+    if (Head()->nameList != 0) Head()->nameList += kRefEntrySize;
+    *EntryAt(*position) = NewEntry(id, AppendName(name, oldSize + kRefEntrySize));
+    return kNoErr;
+}
+
+MgErr ResourceMap::InsertType(ResType type, int32 id, ConstPStr name, uint32* position) {
+    const uint32 oldSize = fSize;
+    const uint32 listsEnd = Head()->nameList != 0 ? Head()->nameList : oldSize;
+    constexpr uint32 kGrowth = kTypeEntrySize + kRefEntrySize;
+    if (const MgErr err = Resize(uint64{oldSize} + kGrowth + NameSize(name))) return err;
+
+    const uint32 typePosition = TypesEnd();
+    OpenGap(listsEnd, kRefEntrySize, oldSize);
+    OpenGap(typePosition, kTypeEntrySize, oldSize + kRefEntrySize);
+    ShiftLists(0, kTypeEntrySize);
+    *position = listsEnd + kTypeEntrySize;
+    *reinterpret_cast<TypeList*>(*fHandle + typePosition) = {type, 0, *position - Head()->typeList};
+    ++Types()->lastIndex;
+    if (Head()->nameList != 0) Head()->nameList += kGrowth;
+    *EntryAt(*position) = NewEntry(id, AppendName(name, oldSize + kGrowth));
+    return kNoErr;
+}
+
+MgErr ResourceMap::Remove(ResType type, uint32 position) {
+    TypeList* list = FindType(type);
+    if (CountOf(list) == 1 && TypeCount() == 1) {
+        MakeBlank();
+        Shrink(kEmptyMapSize);
+        return kNoErr;
+    }
+    const int32 name = EntryAt(position)->name;
+    const uint32 listOffset = list->list;
+    if (name != kNoName) RemoveName(static_cast<uint32>(name));
+
+    CloseGap(position, kRefEntrySize);
+    ShiftLists(listOffset + 1, -static_cast<int32>(kRefEntrySize));
+    uint32 removed = kRefEntrySize;
+    if (CountOf(list) == 1) {
+        CloseGap(static_cast<uint32>(reinterpret_cast<uint8*>(list) - *fHandle), kTypeEntrySize);
+        --Types()->lastIndex;
+        ShiftLists(0, -static_cast<int32>(kTypeEntrySize));
+        removed += kTypeEntrySize;
+    } else {
+        --list->lastIndex;
+    }
+    if (Head()->nameList != 0) Head()->nameList -= removed;
+    Head()->header.mapLength = fSize;
+    Shrink(fSize);
+    return kNoErr;
+}
+
+void ResourceMap::RemoveName(uint32 nameOffset) {
+    const uint32 at = Head()->nameList + nameOffset;
+    const uint32 size = (*fHandle)[at] + 1u;
+    CloseGap(at, size);
+    for (int32 i = 0, types = TypeCount(); i < types; ++i) {
+        RsrcList* entries = Entries(TypeAt(i));
+        for (int32 k = 0, count = CountOf(TypeAt(i)); k < count; ++k) {
+            if (entries[k].name > static_cast<int32>(nameOffset)) entries[k].name -= static_cast<int32>(size);
+        }
+    }
+}
+
+}  // namespace tessel
