@@ -2,8 +2,11 @@
 #include "frame/CoreServices.h"
 
 #include "diagnostics/Service.h"
+#include "files/Service.h"
 #include "memory/Service.h"
 #include "numerics/Service.h"
+#include "paths/Service.h"
+#include "resources/Service.h"
 #include "sync/Service.h"
 
 namespace tessel {
@@ -78,22 +81,22 @@ struct TrackedMallocFree_Service final : CoreService<TrackedMallocFree_Service> 
 struct PathManager_Service final : CoreService<PathManager_Service> {
     static constexpr char kName[] = "PathManager";
     static constexpr Accessor kDependencies[] = {TrackedMallocFreeService, MemoryManagerService};
-    static MgErr Start() { return kNoErr; }
-    static MgErr Stop() { return kNoErr; }
+    static MgErr Start() { return PathManagerStart(); }
+    static MgErr Stop() { return PathManagerStop(); }
 };
 
 struct FileManager_Service final : CoreService<FileManager_Service> {
     static constexpr char kName[] = "FileManager";
     static constexpr Accessor kDependencies[] = {PathManagerService, MemoryManagerService};
-    static MgErr Start() { return kNoErr; }
-    static MgErr Stop() { return kNoErr; }
+    static MgErr Start() { return FileManagerStart(); }
+    static MgErr Stop() { return FileManagerStop(); }
 };
 
 struct ResourceManager_Service final : CoreService<ResourceManager_Service> {
     static constexpr char kName[] = "ResourceManager";
     static constexpr Accessor kDependencies[] = {MemoryManagerService, PathManagerService, FileManagerService};
-    static MgErr Start() { return kNoErr; }
-    static MgErr Stop() { return kNoErr; }
+    static MgErr Start() { return ResourceManagerStart(); }
+    static MgErr Stop() { return ResourceManagerStop(); }
 };
 
 struct ConfigCoreTypes_Service final : CoreService<ConfigCoreTypes_Service> {
