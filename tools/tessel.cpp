@@ -1,0 +1,51 @@
+// The command `tessel`: what the library does with files, from the command line.
+#include <cstdio>
+#include <exception>
+#include <string>
+#include <vector>
+
+#include "Rsrc.h"
+#include "Support.h"
+
+namespace {
+
+constexpr int kRefused = 1;
+constexpr int kWrongUsage = 2;
+
+void PrintHelp() {
+    std::printf(
+        "usage: tessel COMMAND ARGUMENTS\n"
+        "\n"
+        "  rsrc     lists, reads, creates, changes and checks resource files\n"
+        "\n"
+        "`tessel COMMAND --help` says more. FILE names are those of this system.\n"
+        "Exit status: 0 done, 1 refused (the reason is on standard error), 2 wrong usage.\n");
+}
+
+int Run(const std::vector<std::string>& words) {
+    if (words.empty()) throw tool::UsageError{"a command is missing"};
+    if (words[0] == "--help" || words[0] == "-h") {
+        PrintHelp();
+        return 0;
+    }
+    if (words[0] == "rsrc") return tool::RunRsrc(std::vector<std::string>(words.begin() + 1, words.end()));
+    throw tool::UsageError{"there is no command " + words[0]};
+}
+
+}  // namespace
+
+int main(int count, char** words) {
+    try {
+        return Run(std::vector<std::string>(words + 1, words + count));
+    } catch (const tool::UsageError& error) {
+        std::fprintf(stderr, "tessel: %s\nTry `tessel --help`.\n", error.message.c_str());
+        return kWrongUsage;
+    } catch (const tool::Refusal& refusal) {
+        std::fprintf(stderr, "tessel: %s: %s (%d)\n", refusal.subject.c_str(), MgErrMeaning(refusal.code),
+                     refusal.code);
+        return kRefused;
+    } catch (const std::exception& error) {
+        std::fprintf(stderr, "tessel: %s\n", error.what());
+        return kRefused;
+    }
+}
