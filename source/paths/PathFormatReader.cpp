@@ -173,7 +173,9 @@ Token PathFormatReaderWin::NextToken(const Token& token) const {
 
 std::string PathFormatReaderWin::TokenText(const Token& token) const {
     if (!IsDrive(token)) return PathFormatReaderPlatformIndependent::TokenText(token);
-    return token.end > 0 ? PathFormatReader::TokenText(token) : CurrentDrive();
+    if (token.end > 0) return PathFormatReader::TokenText(token);
+    if (!IsSeparator(0)) TESSEL_THROW(kArgErr, "PathRef from string constructor");  // a colon without a drive
+    return CurrentDrive();
 }
 
 // ---- Mac ------------------------------------------------------------------------------------------------------------

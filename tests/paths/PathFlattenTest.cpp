@@ -1,5 +1,4 @@
 // The flattened form, byte by byte, and what is damaged.
-#include <tessel/base/OVExcept.h>
 #include <tessel/streams/BinDataReader.h>
 #include <tessel/streams/BinDataWriter.h>
 

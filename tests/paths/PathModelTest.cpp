@@ -1,5 +1,4 @@
 // The elements of paths, their names and their relations.
-#include <tessel/base/OVExcept.h>
 #include <tessel/memory/MemoryManager.h>
 
 #include <thread>

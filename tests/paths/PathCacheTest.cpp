@@ -1,0 +1,206 @@
+// Cached attributes; the start and stop of paths, and what they leave behind.
+#include <tessel/paths/PathCachedItem.h>
+
+#include <thread>
+
+#include "paths/PathRefAccess.h"
+#include "paths/PathTestSupport.h"
+#include "support/HandClock.h"
+
+namespace tessel {
+namespace {
+
+using namespace test;
+using Item = PathRef::CachedItem;
+
+// Counts those that live.
+class CountedItem final : public PathRef::CachedInt32 {
+public:
+    CountedItem(uint32 lifetime, RelationToMetaData relation, int32 value, int& living)
+        : CachedInt32(lifetime, relation, value), living_(living) {
+        ++living_;
+    }
+    ~CountedItem() override { --living_; }
+    void Attached() override { attached = true; }
+    bool attached = false;
+
+private:
+    int& living_;
+};
+
+class PathCache : public PathTest {
+protected:
+    int32 Found(const PathRef& path, const char* key, PathRef::SearchDirection direction = PathRef::kSearchHere,
+                PathItemElement** at = nullptr) {
+        const PathRef::CacheLock lock;
+        const Item* item = path.GetCachedProxy(key, "CachedInt32", direction, at);
+        return item ? static_cast<const PathRef::CachedInt32*>(item)->Get() : -1;
+    }
+    Item* New(int32 value, Item::RelationToMetaData relation = Item::kIndependent, uint32 lifetime = 1000) {
+        return new CountedItem(lifetime, relation, value, living_);
+    }
+
+    HandClock clock_{0xFFFFFF00u};  // the tick wraps during the tests
+    int living_ = 0;
+};
+
+TEST_F(PathCache, ItemsBelongToTheElement) {
+    {
+        const PathRef path = Abs({"C", "x"});
+        auto* item = New(1);
+        EXPECT_EQ(kNoErr, path.Cache("key", item));
+        EXPECT_TRUE(static_cast<CountedItem*>(item)->attached);
+        EXPECT_EQ(1, Found(Abs({"C", "x"}), "key"));
+        EXPECT_EQ(-1, Found(Abs({"C", "X"}), "key"));
+        EXPECT_EQ(-1, Found(path, "other"));
+        EXPECT_EQ(nullptr, path.GetCachedProxy("key", "CachedBool", PathRef::kSearchHere));
+        EXPECT_NE(nullptr, path.GetCachedProxy("key", "CachedItem", PathRef::kSearchHere));
+        EXPECT_EQ(kNoErr, path.Cache("key", New(2)));
+        EXPECT_EQ(2, Found(path, "key"));
+        EXPECT_EQ(1, living_);
+        EXPECT_EQ(kNoErr, path.Cache("gone", New(3)));
+        EXPECT_EQ(kNoErr, path.Cache("gone", nullptr));
+        EXPECT_EQ(-1, Found(path, "gone"));
+        EXPECT_EQ(kArgErr, PathRef().Cache("key", New(4)));
+        EXPECT_EQ(1, living_);
+    }
+    EXPECT_EQ(0, living_);  // with the last path there
+}
+
+TEST_F(PathCache, SearchDirections) {
+    const PathRef a = Abs({"a"}), abc = Abs({"a", "b", "c"});
+    a.Cache("up", New(1));
+    abc.Cache("down", New(2));
+    PathItemElement* at = nullptr;
+    EXPECT_EQ(1, Found(abc, "up", PathRef::kSearchUp, &at));
+    EXPECT_EQ(PathRefAccess::Element(a), at);
+    EXPECT_EQ(-1, Found(abc, "up", PathRef::kSearchHere, &at));
+    EXPECT_EQ(nullptr, at);
+    EXPECT_EQ(2, Found(Abs({}), "down", PathRef::kSearchDown, &at));
+    EXPECT_EQ(PathRefAccess::Element(abc), at);
+    EXPECT_EQ(-1, Found(a, "down", PathRef::kSearchUp));
+}
+
+TEST_F(PathCache, ExpiryAndFlushing) {
+    PathRef path = Abs({"C", "x"});
+    path.Cache("file", New(1, Item::kDependsOnFile, 1000));
+    path.Cache("short", New(2, Item::kIndependent, 300));
+    path.Cache("long", New(3, Item::kIndependent, 1000));
+    clock_.Advance(299);
+    EXPECT_EQ(2, Found(path, "short"));
+    clock_.Advance(1);
+    EXPECT_EQ(-1, Found(path, "short"));
+    EXPECT_EQ(3, living_);
+    EXPECT_EQ(2 * sizeof(PathRef::CachedInt32), path.FlushCache());
+    EXPECT_EQ(1, living_);
+    EXPECT_EQ(-1, Found(path, "file"));
+    EXPECT_EQ(3, Found(path, "long"));
+    EXPECT_EQ(0u, FShrinkPath(&path));
+    PathRef::CachedBool item(10, Item::kIndependent, true);
+    clock_.Advance(25);
+    EXPECT_TRUE(item.Expired());
+    EXPECT_EQ(15u, item.Rotten());
+    item.ResetBool(10, false);
+    EXPECT_FALSE(item.Expired() || item.Get() || item.Invalidate());
+    EXPECT_EQ(0u, item.Rotten());
+}
+
+// The text of a path is remembered on its element, and outlives a flush.
+TEST_F(PathCache, TextsAreRemembered) {
+    const PathRef path = Abs({"C", "x"});
+    std::string text;
+    path.ConvertToString(&text, PathRef::StringDisplay());
+    path.FlushCache();
+    const PathRef::CacheLock lock;
+    const Item* item = path.GetCachedProxy("internal_display", "CachedPathString", PathRef::kSearchHere);
+    ASSERT_NE(nullptr, item);
+    EXPECT_EQ("C:\\x", static_cast<const PathRef::CachedPathString*>(item)->Get());
+    EXPECT_EQ(nullptr, path.GetCachedProxy("internal_unix", "CachedItem", PathRef::kSearchHere));
+}
+
+TEST_F(PathCache, ThreadsStoreFindAndFlush) {
+    const PathRef path = Abs({"C", "x"});
+    const auto work = [&] {
+        int living = 0;
+        for (int i = 0; i < 500; ++i) {
+            path.Cache("key", new PathRef::CachedPath(1000, Item::kDependsOnFile, Abs({"C", "y"})));
+            {
+                const PathRef::CacheLock lock;
+                if (const Item* item = path.GetCachedProxy("key", "CachedPath", PathRef::kSearchHere)) {
+                    ASSERT_EQ("abs:C/y", Show(static_cast<const PathRef::CachedPath*>(item)->Get()));
+                    ++living;
+                }
+            }
+            path.FlushCache();
+        }
+        EXPECT_LE(living, 500);
+    };
+    std::vector<std::thread> threads;
+    for (int i = 0; i < 8; ++i) threads.emplace_back(work);
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_EQ(-1, Found(path, "key"));
+}
+
+// ---- start and stop -------------------------------------------------------------------------------------------------
+
+TEST_F(PathCache, LeakedPathsAreReported) {
+    Path leaked = nullptr;
+    Abs({"C", "left"}).ConvertToPath(&leaked);
+    EXPECT_EQ(kNoErr, PathManagerStop());
+    EXPECT_TRUE(reports_.Has(3, "We got 1 more Path Leaks than we see from a basic launch and quit.\n"));
+    EXPECT_TRUE(reports_.Has(2, "Possible path leak, unable to purge elements of base #0"));
+    EXPECT_TRUE(reports_.Has(2, "Killing a storage buffer with 3 live object(s)"));
+    EXPECT_TRUE(reports_.Has(2, "name= left"));
+    reports_.Clear();
+    EXPECT_EQ(nullptr, PathRefAccess::Element(PathRef::NotAPath()));
+    EXPECT_TRUE(reports_.Has(2, "Call to GetNotAPath before PathRef::Init() or after PathRef::Uninit()?"));
+    // A path that outlives a restart is no good, and does no harm.
+    EXPECT_EQ(kNoErr, PathManagerStart());
+    EXPECT_FALSE(FIsAPathOrNotAPath(leaked));
+    const PathRef again = Abs({"C", "left"});
+    EXPECT_NE(PathRefAccess::Element(*leaked), PathRefAccess::Element(again));
+    FDestroyPath(&leaked);
+}
+
+TEST_F(PathCache, CachedPathsAreNoLeaks) {
+    const auto cache = [](const PathRef& path) {
+        path.Cache("me", new PathRef::CachedPath(1000, Item::kIndependent, path));  // keeps its own element
+    };
+    cache(Abs({"C", "x", "y"}));
+    EXPECT_EQ(kNoErr, PathManagerStop());
+    EXPECT_EQ(0u, reports_.CountAt(2) + reports_.CountAt(3));
+    EXPECT_EQ(kNoErr, PathManagerStart());
+}
+
+TEST_F(PathCache, GarbageCollection) {
+    const PathRef kept = Abs({"kept"});
+    {
+        std::vector<PathRef> many;
+        for (int i = 0; i < 2000; ++i) many.push_back(Rel({std::to_string(i).c_str()}));
+        EXPECT_EQ(0u, PathRef::GarbageCollect(PathRef::kFreeUnused));
+        reports_.Clear();
+    }
+    EXPECT_EQ(0u, PathRef::GarbageCollect(PathRef::kCountOnly));
+    const uint32 bytes = PathRef::GarbageCollect(PathRef::kFreeUnusedAndReport);
+    EXPECT_GE(bytes, 3 * 512 * sizeof(PathItemElement));
+    EXPECT_TRUE(reports_.Has(2, "Leaked Path Element: 1 refs to kept"));
+    EXPECT_TRUE(reports_.Has(0, "Path Garbage Collect: " + std::to_string(bytes) + " bytes reclaimed"));
+    EXPECT_TRUE(kept.IsSane(false));
+    EXPECT_EQ("rel:new", Show(Rel({"new"})));
+}
+
+TEST_F(PathCache, DebugModeShowsTheText) {
+    PathRef::Setting("debug");
+    EXPECT_TRUE(PathRef::DebugModeEnabled());
+    PathRef path;
+    path = Abs({"C", "x"});
+    EXPECT_EQ("C:\\x", PathRefAccess::TextCache(path));
+    PathRef::Setting("nodebug");
+    path.Append("y");
+    EXPECT_EQ("C:\\x", PathRefAccess::TextCache(path));
+    TESSEL_REPORT(kDebugInfo, 1) << path << " " << &path << " " << static_cast<Path>(nullptr);
+    EXPECT_TRUE(reports_.Has(0, "C:\\x\\y C:\\x\\y NULL"));
+}
+
+}  // namespace
+}  // namespace tessel

@@ -1,0 +1,208 @@
+// The flat interface: what it accepts, and what it answers for null and for bad paths.
+#include <tessel/memory/MemoryManager.h>
+
+#include "paths/PathTestSupport.h"
+
+namespace tessel {
+namespace {
+
+using namespace test;
+
+class PathManagerFlat : public PathTest {
+protected:
+    static constexpr ConstPStr kEnd = nullptr;
+    PathRef abs_ = Abs({"C", "dir"});
+    PathRef rel_ = Rel({"..", "x"});
+    PathRef none_;
+    PathRef null_{PathRef::kNullPath};
+    PathRef bareUnc_{PathRef::kUNC};
+};
+
+TEST_F(PathManagerFlat, Making) {
+    Path path = FMakePath(nullptr, kPathUNC, PStrOf("s"), static_cast<ConstPStr>(PStrOf("x")), kEnd);
+    EXPECT_EQ("unc:s/x", Show(path));
+    EXPECT_EQ(path, FMakePath(path, 0x10000 + kPathRelative, PStrOf(".."), kEnd));  // 16 bits count
+    EXPECT_EQ("rel:^", Show(path));
+    EXPECT_EQ(nullptr, FMakePath(nullptr, 4, PStrOf("x"), kEnd));
+    EXPECT_EQ(nullptr, FMakePath(&bareUnc_, 0, PStrOf("x"), kEnd));
+    EXPECT_EQ(nullptr, FMakePath(nullptr, kPathNotAPath, PStrOf("x"), kEnd));
+    EXPECT_EQ(path, FMakePath(path, kPathNotAPath, kEnd));
+    EXPECT_EQ("not", Show(path));
+    EXPECT_EQ("abs:", Show(FEmptyPath(path)));
+    EXPECT_EQ("not", Show(FNotAPath(path)));
+    EXPECT_EQ(kArgErr, FAppendName(path, PStrOf("x")));
+    EXPECT_EQ(kArgErr, FAppendName(&abs_, PStrOf("")));
+    EXPECT_EQ(kArgErr, FAppendName(&abs_, nullptr));
+    EXPECT_EQ(kNoErr, FAppendName(&rel_, PStrOf("")));
+    EXPECT_EQ("rel:^", Show(&rel_));
+    Path copy = path;
+    EXPECT_EQ(kNoErr, FPathCpy(path, &abs_));
+    EXPECT_EQ(kNoErr, FPathToPath(&copy));
+    EXPECT_NE(path, copy);
+    EXPECT_EQ("abs:C/dir", Show(copy));
+    EXPECT_EQ(kArgErr, FPathCpy(path, nullptr));
+    FDestroyPath(&path);
+    EXPECT_EQ(nullptr, path);
+    FDestroyPath(&path);
+    EXPECT_EQ(0u, reports_.Count());
+    FDestroyPath(nullptr);
+    FDisposePath(copy);
+    EXPECT_EQ((std::vector<std::string>{"This is a noop.",
+                                        "FDisposePath is deprecated within OV code; use FDestroyPath instead."}),
+              reports_.Texts(2));
+}
+
+TEST_F(PathManagerFlat, Inspecting) {
+    struct Row {
+        Path path;
+        MgErr err;
+        int32 type;
+        bool isPath, isPathOrNot, isAbs, isEmpty, isCDUp;
+        int32 depth, count;
+    };
+    PathRef bareAbs = Abs({});
+    const Row rows[] = {{nullptr, 1, 2, false, false, false, false, false, -1, 0},
+                        {&abs_, 0, 0, true, true, true, false, false, 2, 2},
+                        {&rel_, 0, 1, true, true, false, false, true, 2, 2},
+                        {&none_, 0, 2, false, true, false, false, false, -1, 0},
+                        {&bareUnc_, 1, 2, true, false, false, true, false, -1, 0},
+                        {&null_, 1, 2, true, false, false, true, false, -1, 0},
+                        {&bareAbs, 0, 0, true, true, true, true, false, 0, 0}};
+    for (const Row& row : rows) {
+        SCOPED_TRACE(Show(row.path));
+        int32 type = 99;
+        EXPECT_EQ(row.err, FGetPathType(row.path, &type));
+        EXPECT_EQ(row.type, type);
+        EXPECT_EQ(row.isPath, FIsAPath(row.path));
+        EXPECT_EQ(row.isPathOrNot, FIsAPathOrNotAPath(row.path));
+        EXPECT_EQ(row.isAbs, FIsAbsPath(row.path));
+        EXPECT_EQ(row.isEmpty, FIsEmptyPath(row.path));
+        EXPECT_EQ(row.isCDUp, FIsCDUp(row.path));
+        EXPECT_EQ(row.depth, FDepth(row.path));
+        EXPECT_EQ(row.count, PathCnt(row.path));
+        EXPECT_EQ(row.path ? sizeof(PathRef) : 0, PathSize(row.path));
+    }
+    EXPECT_EQ(kPathUNC, PathType(&bareUnc_));
+    EXPECT_TRUE(FIsAPathOfType(&bareUnc_, kPathUNC));
+    EXPECT_FALSE(FIsAPathOfType(&abs_, 4));
+}
+
+TEST_F(PathManagerFlat, NamesAreCopiedWhole) {
+    Str255 name;
+    EXPECT_EQ(kNoErr, FNamePtr(&abs_, name));
+    EXPECT_EQ("dir", TextOf(name));
+    EXPECT_EQ(kNoErr, FPathComponent(&rel_, 0, name));
+    EXPECT_EQ("", TextOf(name));
+    EXPECT_EQ(name, PathCopyElt(&abs_, -2, name));
+    EXPECT_EQ("C", TextOf(name));
+    EXPECT_EQ(nullptr, PathCopyElt(&abs_, -3, name));
+    EXPECT_EQ(0, name[0]);
+    EXPECT_EQ(nullptr, PathCopyName(&none_, name));
+    PathRef tooLong = Rel({std::string(256, 'x').c_str()});
+    EXPECT_EQ(kArgErr, FNamePtr(&tooLong, name));
+    UHandle handle = DSNewHandle(0);
+    EXPECT_EQ(kNoErr, FName(&abs_, handle));
+    EXPECT_EQ(4u, DSGetHandleSize(handle));
+    EXPECT_EQ("dir", TextOf(*handle));
+    DSDisposeHandle(handle);
+    EXPECT_EQ(kNoErr, PathReplaceElt(&abs_, PStrOf("D"), 0));
+    EXPECT_EQ("abs:D/dir", Show(&abs_));
+    for (auto [file, extension] : {std::pair{"a.tar.gz", ".gz"}, {"noext", ""}, {".profile", ""}, {"x.", "."}}) {
+        char out[16] = "#";
+        FGetFileExtension(file, out);
+        EXPECT_STREQ(extension, out);
+    }
+}
+
+TEST_F(PathManagerFlat, Types) {
+    EXPECT_EQ(kNoErr, FSetPathType(&abs_, kPathRelative));
+    EXPECT_EQ("rel:C/dir", Show(&abs_));
+    EXPECT_EQ(kNoErr, FSetPathType(&abs_, kPathUNC));
+    EXPECT_EQ("unc:C/dir", Show(&abs_));
+    EXPECT_EQ(kArgErr, FSetPathType(&abs_, kPathNotAPath));
+    EXPECT_EQ(kArgErr, FSetPathType(&abs_, 4));
+    EXPECT_EQ(kArgErr, FSetPathType(&none_, kPathAbsolute));
+    PathRef slashes = Abs({"\\\\srv\\share", "x"});
+    EXPECT_EQ(kNoErr, FNormalizePath(&slashes));
+    EXPECT_EQ("unc:\\\\srv\\share/x", Show(&slashes));
+    EXPECT_EQ(kArgErr, FNormalizePath(nullptr));
+    EXPECT_EQ(0u, reports_.Count());
+}
+
+TEST_F(PathManagerFlat, Comparing) {
+    PathRef ab = Abs({"a", "b"}), AB = Abs({"A", "B"}), ac = Abs({"a", "c"}), xb = Abs({"x", "q", "b"});
+    PathRef bare = Abs({});
+    EXPECT_TRUE(FPathEqual(&ab, &AB));
+    EXPECT_FALSE(FPathEqual(&ab, nullptr));
+    EXPECT_TRUE(FPathEqual(nullptr, nullptr));
+    EXPECT_EQ(1, FPathCmpExact(&ab, &AB));
+    EXPECT_EQ(-1, FPathCmpExact(nullptr, &ab));
+    EXPECT_EQ(1, FPathCmpExact(&ab, nullptr));
+    EXPECT_EQ(0, FPathCmpLexical(&ab, &AB));
+    EXPECT_EQ(1, FPathCmpLexical(nullptr, &ab));
+    EXPECT_EQ(0, FPathCmp(&ab, &AB));
+    EXPECT_EQ(2, FPathCmp(&ab, &ac));
+    EXPECT_EQ(2, FPathCmp(&ac, &ab));
+    EXPECT_EQ(-1, FPathCmp(&ab, &rel_));
+    EXPECT_EQ(-1, FPathCmp(&bare, &ab));
+    EXPECT_EQ(1, FPathCmp(&ab, &bare));
+    EXPECT_EQ(2, FPathMatchingTailCount(&AB, &xb));
+    EXPECT_EQ(0, FPathMatchingTailCount(&ab, &AB));
+    EXPECT_EQ(1, FPathMatchingTailCount(&ab, &ac));
+    EXPECT_EQ(-1, FPathMatchingTailCount(&ab, &rel_));
+    EXPECT_TRUE(FileNameEqual(PStrOf("Name"), PStrOf("nAME")));
+    EXPECT_FALSE(FileNameEqual(PStrOf("Name"), PStrOf("Names")));
+    EXPECT_TRUE(FileNameNEqual(PStrOf("Name1"), PStrOf("nAME2"), 4));
+    EXPECT_FALSE(FileNameNEqual(PStrOf("Na"), PStrOf("nAME2"), 4));
+    EXPECT_TRUE(FileNameCStrEqual("Name", "nAME"));
+}
+
+TEST_F(PathManagerFlat, Combining) {
+    struct Row {
+        PathRef base, rel;
+        MgErr err;
+        const char* result;
+    };
+    const Row rows[] = {{Abs({"a", "b"}), Rel({"..", "c"}), 0, "abs:a/c"},
+                        {Abs({}), Unc({"s"}), 0, "unc:s"},
+                        {Abs({"a"}), Abs({"b"}), 1, "not"},
+                        {Abs({"a"}), Rel({}), 0, "abs:a"},
+                        {Abs({"a"}), Rel({"..", "..", "b"}), 0, "rel:^/b"},
+                        {Rel({".."}), Rel({"..", "b"}), 0, "rel:^/^/b"},
+                        {Rel({}), Rel({"\\\\s\\t", "x"}), 0, "unc:\\\\s\\t/x"}};
+    for (const Row& row : rows) {
+        PathRef base(row.base), rel(row.rel), result;
+        EXPECT_EQ(row.err, FAddPath(&base, &rel, &result)) << Show(base) << Show(rel);
+        EXPECT_EQ(row.result, Show(result));
+    }
+    EXPECT_EQ(kArgErr, FAddPath(&abs_, &rel_, nullptr));
+    EXPECT_EQ(kNoErr, FAddPath(&abs_, &rel_, &abs_));
+    EXPECT_EQ("abs:C/x", Show(&abs_));
+    PathRef other = Abs({"c", "y"}), result;
+    EXPECT_EQ(kNoErr, FRelPath(&abs_, &other, &result));
+    EXPECT_EQ("rel:^/y", Show(result));
+    EXPECT_EQ(kNoErr, FVolName(&abs_, &result));
+    EXPECT_EQ("abs:C", Show(result));
+    EXPECT_EQ(kNoErr, FCommonPath(&abs_, &other));
+    EXPECT_EQ("abs:C", Show(&abs_));
+    PathRef unc = Unc({"s"}), otherUnc = Unc({"t"});
+    EXPECT_EQ(kNoErr, FCommonPath(&unc, &otherUnc));
+    EXPECT_EQ("abs:", Show(unc));
+    EXPECT_EQ(kArgErr, FCommonPath(nullptr, &unc));
+}
+
+TEST_F(PathManagerFlat, TheTextsOfTheHostAreTwoPairs) {
+    PathRef::SetPathTooLongString("class");
+    FSetPathTooLongString(PStrOf("flat"));
+    Str255 text;
+    FGetPathTooLongString(text);
+    EXPECT_EQ("flat", TextOf(text));
+    EXPECT_EQ("class", PathRef::GetPathTooLongString());
+    FGetNotAPathString(text);
+    EXPECT_EQ("", TextOf(text));
+    FSetPathTooLongString(PStrOf(""));
+    PathRef::SetPathTooLongString("");
+}
+
+}  // namespace
+}  // namespace tessel
