@@ -15,6 +15,11 @@ if(CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
   target_compile_options(tessel_compile_options INTERFACE -Wno-gnu-zero-variadic-macro-arguments)
 endif()
 
+if(CMAKE_SIZEOF_VOID_P EQUAL 4 AND CMAKE_SYSTEM_PROCESSOR MATCHES "^(x86_64|amd64|AMD64|i[3-6]86)$")
+  # A float or double operation rounds to its own type, as on 64-bit hosts, and not to the x87 registers' 64 bits.
+  target_compile_options(tessel_compile_options INTERFACE -msse2 -mfpmath=sse)
+endif()
+
 if(TESSEL_SANITIZE)
   target_compile_options(tessel_compile_options INTERFACE -fsanitize=${TESSEL_SANITIZE} -fno-sanitize-recover=all)
   target_link_options(tessel_compile_options INTERFACE -fsanitize=${TESSEL_SANITIZE})
