@@ -14,6 +14,7 @@ typedef enum VersionStringDetailLevel {
     kVersionStringMajor = 1,    /* "13.0": major and minor version only */
     kVersionStringFix = 2,      /* "13.0.0": and the fix version */
     kVersionStringComplete = 3, /* "13.0.0r0": everything */
+    kVersionStringLevelLimit = 0x7FFFFFFF, /* any larger level counts as kVersionStringFix */
 } VersionStringDetailLevel;
 
 #define kVersionStringSize 12 /* takes every text and its terminator */

@@ -1,0 +1,76 @@
+#include <tessel/sync/ThMutex.h>
+#include <tessel/time/Millisecs.h>
+#include <tessel/utilities/RandomGen.h>
+
+#include <cmath>
+
+namespace {
+
+struct Seeds {
+    int32 s[3];
+};
+
+ThMutex gRandomMutex = nullptr;  // guards gSeeds; nothing is taken inside
+Seeds gSeeds = {};
+
+// 15 bits a step, from a first seed that is not 0.
+Seeds SeedsFrom(int32 first) {
+    constexpr int32 kStandIn = 1234, kFactor = 8191, kMask = 0x3FFF;
+    if (first == 0) first = kStandIn;
+    int32 second = (first * kFactor) & kMask;
+    return {{first, second, (second * kFactor) & kMask}};
+}
+
+// Unsigned, so that seeds from outside do not overflow: the bits are those of the 32-bit signed product.
+int32 Step(int32 seed, uint32 factor, int32 modulus) {
+    return static_cast<int32>(static_cast<uint32>(seed) * factor) % modulus;
+}
+
+Seeds Next(const Seeds& seeds) {
+    return {{Step(seeds.s[0], 171, 30269), Step(seeds.s[1], 172, 30307), Step(seeds.s[2], 170, 30323)}};
+}
+
+double Number(const Seeds& seeds) {
+    constexpr double kFirst = 1.0 / 30269, kSecond = 1.0 / 30307, kThird = 1.0 / 30323;
+    double x = seeds.s[0] * kFirst + seeds.s[1] * kSecond + seeds.s[2] * kThird;
+    return x - std::floor(x);
+}
+
+}  // namespace
+
+MgErr InitRandomGen() {
+    constexpr uint32 kMask = 0x3FFF;
+    gSeeds = SeedsFrom(static_cast<int32>(MilliSecs() & kMask));
+    if (gRandomMutex) return kNoErr;
+    return ThMutexCreate(&gRandomMutex, "RandomGen");
+}
+
+MgErr UninitRandomGen() {
+    ThMutexDestroy(gRandomMutex);
+    gRandomMutex = nullptr;
+    gSeeds = {};
+    return kNoErr;
+}
+
+void RandomGen(double* out) {
+    Seeds seeds;
+    {
+        tessel::ThMutexHolder holder(gRandomMutex);
+        seeds = gSeeds = Next(gSeeds);
+    }
+    *out = Number(seeds);
+}
+
+void RandomGenWithState(double* out, int32 state[3]) {
+    Seeds seeds = Next({{state[0], state[1], state[2]}});
+    for (int i = 0; i < 3; ++i) state[i] = seeds.s[i];
+    *out = Number(seeds);
+}
+
+void RandomGenInitState(int32 state[3]) {
+    constexpr double kRange = 30000;
+    double number;
+    RandomGen(&number);
+    Seeds seeds = SeedsFrom(static_cast<int32>(number * kRange));
+    for (int i = 0; i < 3; ++i) state[i] = seeds.s[i];
+}

@@ -1,0 +1,282 @@
+#include <tessel/utilities/SortSearch.h>
+
+#include <cstddef>
+#include <cstring>
+
+namespace {
+
+// ---- exchanging two records -----------------------------------------------------------------------------------------
+
+template <class Unit>
+void SwapUnits(char* a, char* b) {
+    Unit left, right;
+    std::memcpy(&left, a, sizeof left);
+    std::memcpy(&right, b, sizeof right);
+    std::memcpy(a, &right, sizeof right);
+    std::memcpy(b, &left, sizeof left);
+}
+
+// Records of exactly one unit.
+template <class Unit>
+struct OneUnit {
+    static constexpr size_t size = sizeof(Unit);
+    void operator()(char* a, char* b) const { SwapUnits<Unit>(a, b); }
+    void If(bool yes, char* a, char* b) const {
+        Unit left, right;
+        std::memcpy(&left, a, sizeof left);
+        std::memcpy(&right, b, sizeof right);
+        Unit change = (left ^ right) & (Unit{0} - Unit{yes});
+        left ^= change;
+        right ^= change;
+        std::memcpy(a, &left, sizeof left);
+        std::memcpy(b, &right, sizeof right);
+    }
+};
+
+// Records of any number of units.
+template <class Unit>
+struct ManyUnits {
+    size_t size;
+    void operator()(char* a, char* b) const {
+        for (size_t i = 0; i < size; i += sizeof(Unit)) SwapUnits<Unit>(a + i, b + i);
+    }
+    void If(bool yes, char* a, char* b) const {
+        if (yes) (*this)(a, b);
+    }
+};
+
+// ---- from one record to the next
+// -------------------------------------------------------------------------------------
+
+template <size_t N>
+struct FixedStride {
+    static constexpr size_t Bytes() { return N; }
+};
+
+struct Stride {
+    size_t bytes;
+    size_t Bytes() const { return bytes; }
+};
+
+// ---- comparing two records ------------------------------------------------------------------------------------------
+
+struct Plain {
+    CompareProc compare;
+    int32 operator()(const void* a, const void* b) const { return compare(a, b); }
+};
+
+struct WithContext {
+    CompareProcEx compare;
+    void* context;
+    int32 operator()(const void* a, const void* b) const { return compare(a, b, context); }
+};
+
+template <class T>
+T Load(const void* address) {
+    T value;
+    std::memcpy(&value, address, sizeof value);
+    return value;
+}
+
+struct Int32s {
+    int32 operator()(const void* a, const void* b) const {
+        return static_cast<int32>(Load<uint32>(a) - Load<uint32>(b));
+    }
+};
+
+// ---- quicksort ------------------------------------------------------------------------------------------------------
+
+template <class Compare, class Swap, class RecordStride>
+class Sorter {
+public:
+    Sorter(RecordStride stride, Compare compare, Swap swap) : stride_(stride), compare_(compare), swap_(swap) {}
+
+    // Sorts from the first to the last record, both included.
+    void Sort(char* lo, char* hi) {
+        const size_t size = stride_.Bytes();
+        Range pending[kMaxPending];
+        size_t count = 0;
+        for (;;) {
+            if (static_cast<size_t>(hi - lo) > 2 * size) {
+                char* pivot = Partition(lo, hi);
+                if (pivot - lo > hi - pivot) {
+                    if (pivot - size != lo) pending[count++] = {lo, pivot - size};
+                    lo = pivot;
+                } else {
+                    if (pivot + size != hi) pending[count++] = {pivot + size, hi};
+                    hi = pivot;
+                }
+                continue;
+            }
+            SortFew(lo, hi);
+            if (count == 0) return;
+            lo = pending[--count].lo;
+            hi = pending[count].hi;
+        }
+    }
+
+private:
+    struct Range {
+        char *lo, *hi;
+    };
+    // The larger part is always put off, so what goes on halves: of 2^31 records no more than 31 ranges are pending.
+    static constexpr size_t kMaxPending = 64;
+
+    void Order(char* a, char* b) { swap_.If(compare_(a, b) > 0, a, b); }
+
+    void MedianOfThree(char* lo, char* mid, char* hi) {
+        Order(lo, mid);
+        Order(lo, hi);
+        Order(mid, hi);
+    }
+
+    // One, two or three records.
+    void SortFew(char* lo, char* hi) {
+        const size_t size = stride_.Bytes();
+        if (lo + size == hi)
+            Order(lo, hi);
+        else if (lo != hi)
+            MedianOfThree(lo, lo + size, hi);
+    }
+
+    // The pivot's final place. Each scan stops at the other one, whatever the comparison answers.
+    char* Partition(char* lo, char* hi) {
+        const size_t size = stride_.Bytes();
+        char* mid = lo + static_cast<size_t>(hi - lo) / size / 2 * size;
+        char* pivot = hi - size;
+        MedianOfThree(lo, mid, hi);
+        if (mid != pivot) swap_(mid, pivot);
+        char* i = lo;
+        char* j = pivot;
+        for (;;) {
+            do i += size;
+            while (i != j && compare_(i, pivot) < 0);
+            if (i == j) break;
+            do j -= size;
+            while (j != i && compare_(j, pivot) > 0);
+            if (j == i) break;
+            swap_(i, j);
+        }
+        if (i != pivot) swap_(i, pivot);
+        return i;
+    }
+
+    RecordStride stride_;
+    Compare compare_;
+    Swap swap_;
+};
+
+// Whether every record stands strictly before the next one (direction -1) or behind it (1), or is the same in every
+// byte. Then there is one sorted order only, and no need to sort.
+template <class Compare>
+bool IsRun(const char* first, const char* last, size_t size, int32 direction, Compare compare) {
+    for (const char* record = first; record != last; record += size) {
+        int32 order = compare(record, record + size);
+        if (order == 0 ? std::memcmp(record, record + size, size) != 0 : (order < 0) != (direction < 0)) return false;
+    }
+    return true;
+}
+
+// Leaves what is in order alone and turns round what is in reverse.
+template <class Compare, class Swap>
+bool SortRun(char* first, char* last, size_t size, Compare compare, Swap swap) {
+    if (IsRun(first, last, size, -1, compare)) return true;
+    if (!IsRun(first, last, size, 1, compare)) return false;
+    for (; first < last; first += size, last -= size) swap(first, last);
+    return true;
+}
+
+template <class Compare, class Swap, class RecordStride>
+void SortWith(void* base, int32 count, Compare compare, Swap swap, RecordStride stride) {
+    constexpr int32 kWorthALook = 8;
+    const size_t size = stride.Bytes();
+    char* first = static_cast<char*>(base);
+    char* last = first + (static_cast<size_t>(count) - 1) * size;
+    if (count >= kWorthALook && swap.size == size && SortRun(first, last, size, compare, swap)) return;
+    Sorter<Compare, Swap, RecordStride>(stride, compare, swap).Sort(first, last);
+}
+
+// Picks the exchange by the swap size: the largest units that fit.
+template <class Compare>
+void SortRecords(void* base, int32 count, int32 swapSize, int32 recordSize, Compare compare) {
+    if (count < 2 || recordSize < 1 || swapSize < 0) return;
+    const size_t size = static_cast<size_t>(swapSize);
+    const Stride stride{static_cast<size_t>(recordSize)};
+    if (size == 4 && stride.bytes == 4) {
+        SortWith(base, count, compare, OneUnit<uint32>(), FixedStride<4>());
+    } else if (size == 8 && stride.bytes == 8) {
+        SortWith(base, count, compare, OneUnit<uint64>(), FixedStride<8>());
+    } else if (size % 8 == 0) {
+        SortWith(base, count, compare, ManyUnits<uint64>{size}, stride);
+    } else if (size % 4 == 0) {
+        SortWith(base, count, compare, ManyUnits<uint32>{size}, stride);
+    } else if (size % 2 == 0) {
+        SortWith(base, count, compare, ManyUnits<uint16>{size}, stride);
+    } else {
+        SortWith(base, count, compare, ManyUnits<uint8>{size}, stride);
+    }
+}
+
+// ---- binary search --------------------------------------------------------------------------------------------------
+
+template <class Compare>
+int32 Search(const void* base, int32 count, int32 recordSize, const void* key, Compare compare) {
+    const char* records = static_cast<const char*>(base);
+    const size_t size = static_cast<size_t>(recordSize);
+    size_t lo = 0, end = count > 0 ? static_cast<size_t>(count) : 0;  // of the records that may match
+    while (lo < end) {
+        size_t mid = (lo + end - 1) / 2;
+        // Fetch both halves' middles, and select rather than branch: which half it is cannot be predicted.
+        __builtin_prefetch(records + (lo + mid) / 2 * size);
+        __builtin_prefetch(records + (mid + end) / 2 * size);
+        int32 order = compare(key, records + mid * size);
+        if (order == 0) return static_cast<int32>(mid);
+        const size_t before = static_cast<size_t>(order >> 31);
+        end ^= (end ^ mid) & before;
+        lo ^= (lo ^ (mid + 1)) & ~before;
+    }
+    return -static_cast<int32>(lo) - 1;  // lo is where the key would be inserted
+}
+
+}  // namespace
+
+void QSort2(void* base, int32 count, int32 swapSize, int32 recordSize, CompareProc compare) {
+    if (compare == CompareInt32s)
+        SortRecords(base, count, swapSize, recordSize, Int32s());  // needs no calls
+    else
+        SortRecords(base, count, swapSize, recordSize, Plain{compare});
+}
+
+void QSort(void* base, int32 count, int32 recordSize, CompareProc compare) {
+    QSort2(base, count, recordSize, recordSize, compare);
+}
+
+void QSort2Ex(void* base, int32 count, int32 swapSize, int32 recordSize, CompareProcEx compare, void* context) {
+    SortRecords(base, count, swapSize, recordSize, WithContext{compare, context});
+}
+
+void QSortEx(void* base, int32 count, int32 recordSize, CompareProcEx compare, void* context) {
+    QSort2Ex(base, count, recordSize, recordSize, compare, context);
+}
+
+int32 BinSearch(const void* base, int32 count, int32 recordSize, const void* key, CompareProc compare) {
+    return Search(base, count, recordSize, key, Plain{compare});
+}
+
+int32 BinSearchEx(const void* base, int32 count, int32 recordSize, const void* key, CompareProcEx compare,
+                  void* context) {
+    return Search(base, count, recordSize, key, WithContext{compare, context});
+}
+
+int32 CompareInt16s(const void* a, const void* b) {
+    return Load<int16>(a) - Load<int16>(b);
+}
+
+int32 CompareInt32s(const void* a, const void* b) {
+    return Int32s()(a, b);
+}
+
+int32 CompareUIntPtrTs(const void* a, const void* b) {
+    uintptr_t left = Load<uintptr_t>(a), right = Load<uintptr_t>(b);
+    return static_cast<int32>(left > right) - static_cast<int32>(left < right);
+}

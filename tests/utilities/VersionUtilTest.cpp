@@ -1,0 +1,64 @@
+#include <tessel/utilities/VersionUtil.h>
+#include <tessel/utilities/pheventlog.h>
+
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <string>
+
+namespace {
+
+TEST(VersionUtil, WritesEachLevel) {
+    const struct {
+        uint32 version;
+        const char* texts[5];  // by level
+    } cases[] = {
+        {0x13008000, {"13.0", "13.0", "13.0.0", "13.0.0r0", "13.0.0"}},
+        {0x08526012, {"8.5.2b12", "8.5", "8.5.2", "8.5.2b12", "8.5.2"}},
+        {0x09802305, {"9.8d305", "9.8", "9.8.0", "9.8.0d305", "9.8.0"}},
+        {0x10014203, {"10.0.1a203", "10.0", "10.0.1", "10.0.1a203", "10.0.1"}},
+        {0x00005000, {"0.0?0", "0.0", "0.0.0", "0.0.0?0", "0.0.0"}},
+        {0xABCD8EFF, {":;.<.=", ":;.<", ":;.<.=", ":;.<.=r>\?\?", ":;.<.="}},
+    };
+    for (const auto& each : cases) {
+        const int32 version = static_cast<int32>(each.version);
+        for (int level = 0; level < 5; ++level) {
+            auto detail = static_cast<VersionStringDetailLevel>(level);
+            EXPECT_EQ(tessel::BuildVersStdStr(version, detail), each.texts[level]);
+            char buffer[kVersionStringSize];
+            EXPECT_EQ(BuildVersionString(version, detail, buffer, sizeof buffer), std::strlen(each.texts[level]));
+            EXPECT_STREQ(buffer, each.texts[level]);
+        }
+        Str255 text;
+        BuildVersStr(version, text);
+        EXPECT_EQ(std::string(reinterpret_cast<char*>(text + 1), text[0]), each.texts[0]);
+    }
+}
+
+TEST(VersionUtil, FillsABufferWholeOrNotAtAll) {
+    char buffer[6] = "12345";
+    EXPECT_EQ(BuildVersionString(0x13008000, kVersionStringShort, buffer, 4), 4u);
+    EXPECT_EQ(std::memcmp(buffer, "\0\0\0\0005", 6), 0);
+    EXPECT_EQ(BuildVersionString(0x13008000, kVersionStringShort, buffer, 5), 4u);
+    EXPECT_STREQ(buffer, "13.0");
+    EXPECT_EQ(BuildVersionString(0x13008000, kVersionStringShort, nullptr, 5), 4u);
+    EXPECT_EQ(BuildVersionString(0x13008000, kVersionStringShort, buffer, 0), 4u);
+}
+
+TEST(EventLog, ReadsAsEmpty) {
+    EventLoggingLogUserEvent(1, 2);
+    EventLoggingLogUserBuffer(1, "x", 1);
+    uint32 words[5] = {1, 2, 3, 4, 5};
+    LStr text = {1, {'x'}};
+    LStrPtr master = &text;
+    EXPECT_EQ(EventLoggingEnumLogEntry(0, &words[0], &words[1], &words[2], &words[3], &words[4], &master), 0);
+    for (uint32 word : words) EXPECT_EQ(word, 0u);
+    EXPECT_EQ(text.count, 0);
+    EXPECT_EQ(EventLoggingEnumLogEntry(0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), 0);
+    uint32 flags = 1, mask = 1;
+    EventLoggingGetFlags(&flags, nullptr);
+    EventLoggingGetFlags(nullptr, &mask);
+    EXPECT_EQ(flags + mask, 0u);
+}
+
+}  // namespace
