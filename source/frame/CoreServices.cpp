@@ -8,6 +8,7 @@
 #include "paths/Service.h"
 #include "resources/Service.h"
 #include "sync/Service.h"
+#include "threads/Service.h"
 
 namespace tessel {
 namespace {
@@ -118,8 +119,8 @@ struct ThThread_Service final : CoreService<ThThread_Service> {
     static constexpr char kName[] = "ThThread";
     static constexpr Accessor kDependencies[] = {ThMutexService, ThEventService, ConfigManagerService,
                                                  ConfigCoreTypesService};
-    static MgErr Start() { return kNoErr; }
-    static MgErr Stop() { return kNoErr; }
+    static MgErr Start() { return ThThreadStart(); }
+    static MgErr Stop() { return ThThreadStop(); }
 };
 
 struct HardWaitBehavior_Service final : CoreService<HardWaitBehavior_Service> {
