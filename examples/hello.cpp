@@ -1,5 +1,6 @@
-#include <cstdio>
 #include <tessel/tessel.h>
+
+#include <cstdio>
 
 int main() {
     if (InitTesselBase() != kNoErr || InitTesselAppSupport() != kNoErr) return 1;
