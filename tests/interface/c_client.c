@@ -28,7 +28,7 @@ static void UsePaths(void) {
     Path path = NULL;
     char name[300];
     static const char text[] = "C:\\dir\\..\\file";
-    Expect(FTextToPath((const uint8*)text, (int32)sizeof text - 1, &path) == kNoErr && FDepth(path) == 2, "a path from text");
+    Expect(FTextToPath(text, (int32)sizeof text - 1, &path) == kNoErr && FDepth(path) == 2, "a path from text");
     Expect(MakeDOSPathName(path, name, 0) == kNoErr && strcmp(name, "C:\\file") == 0, "its file name");
     FDestroyPath(&path);
     Expect(path == NULL, "it is gone");
@@ -40,8 +40,10 @@ static void UseResources(void) {
     RsrcFile file = 0;
     UHandle data = NULL;
     Str255 string;
-    Expect(RCreateMemFile(&file, TESSEL_FOURCC('O', 'R', 'V', 'N'), TESSEL_FOURCC('O', 'V', 'R', 'S')) == kNoErr, "a file in memory");
-    Expect(DSPtrToHand(list, &data, sizeof list) == kNoErr && RAdd(data, file, type, 128, NULL) == kNoErr, "a list in it");
+    Expect(RCreateMemFile(&file, TESSEL_FOURCC('O', 'R', 'V', 'N'), TESSEL_FOURCC('O', 'V', 'R', 'S')) == kNoErr,
+           "a file in memory");
+    Expect(DSPtrToHand(list, &data, sizeof list) == kNoErr && RAdd(data, file, type, 128, NULL) == kNoErr,
+           "a list in it");
     Expect(RGetIndString(file, string, 128, 2) == kNoErr && memcmp(string, "\3two", 4) == 0, "its second string");
     Expect(RGetIndString(file, string, 128, 3) == kResNotFoundErr, "and no third");
     Expect(RCloseFile(file) == kNoErr, "closed");
