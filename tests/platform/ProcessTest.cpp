@@ -213,7 +213,7 @@ TEST(Thread, RunsAndReturnsItsCode) {
 }
 
 TEST(Thread, HandlesMayGoBeforeTheThread) {
-    Worker worker;
+    static Worker worker; /* the thread is not waited for */
     ThreadId id = 0;
     ThreadClose(ThreadStart(WorkUntilStopped, &worker, id));
     while (!worker.started) YieldThread();

@@ -1,11 +1,9 @@
 #include "platform/Event.h"
 
 #include <errno.h>
-#include <limits.h>
 #include <linux/futex.h>
 
 #include <algorithm>
-#include <optional>
 
 #include "platform/Mutex.h"
 #include "platform/Thread.h"
@@ -36,19 +34,20 @@ public:
        its time from after our look at the clock, so it is never over early. */
     bool SleepWhile(std::atomic<std::uint32_t>& word, std::uint32_t value) const {
         timespec left{};
-        if (at_) {
-            std::int64_t remaining = *at_ - MonotonicNanoseconds();
+        if (at_ != kNever) {
+            std::int64_t remaining = at_ - MonotonicNanoseconds();
             if (remaining <= 0) return false;
             left.tv_sec = static_cast<time_t>(remaining / kNanosecondsPerSecond);
             left.tv_nsec = static_cast<long>(remaining % kNanosecondsPerSecond);
         }
         long result = systemCalls.futex(reinterpret_cast<std::uint32_t*>(&word), FUTEX_WAIT_PRIVATE, value,
-                                        at_ ? &left : nullptr);
+                                        at_ != kNever ? &left : nullptr);
         return result == 0 || errno != ETIMEDOUT;
     }
 
 private:
-    std::optional<std::int64_t> at_;
+    static constexpr std::int64_t kNever = -1;
+    std::int64_t at_ = kNever; /* nanoseconds of the monotonic clock */
 };
 
 void WakeOne(std::atomic<std::uint32_t>& word) {
