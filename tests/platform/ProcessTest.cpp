@@ -23,6 +23,15 @@
 #include "platform/posix/Errors.h"
 #include "support/FailingPlatform.h"
 
+namespace tessel::test {
+
+/* A function that the dynamic linker does not know: it is in the program's own symbols only. */
+__attribute__((noinline)) int Landmark(int value) {
+    return value + 42;
+}
+
+}  // namespace tessel::test
+
 namespace tessel::platform {
 namespace {
 
@@ -125,6 +134,11 @@ TEST(Debugger, AttachedIsWhoTraces) {
 
 TEST(Module, AddressesHaveNames) {
     AddressEntry entry;
+    const char* landmark = reinterpret_cast<const char*>(&test::Landmark);
+    ASSERT_TRUE(DescribeAddress(landmark + 1, entry));
+    EXPECT_EQ("tessel::test::Landmark(int)", entry.symbol);
+    EXPECT_EQ("platform_tests", entry.module);
+    EXPECT_EQ(1u, entry.offset);
     ASSERT_TRUE(DescribeAddress(reinterpret_cast<const void*>(&std::terminate), entry));
     EXPECT_EQ("std::terminate()", entry.symbol);
     EXPECT_FALSE(DescribeAddress(nullptr, entry));

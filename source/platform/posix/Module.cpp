@@ -8,6 +8,7 @@
 #include <cstdlib>
 #include <memory>
 
+#include "platform/posix/ElfSymbols.h"
 #include "platform/posix/NativeNames.h"
 
 namespace tessel::platform {
@@ -57,6 +58,15 @@ std::string FullFile(const std::string& file) {
     return full ? full.get() : file;
 }
 
+ModuleHandle ExecutableBase() {
+    ModuleHandle executable = kExecutable;
+    ForEachModule([&](ModuleHandle base, const char*) {
+        executable = base;
+        return false;
+    });
+    return executable;
+}
+
 std::string Demangled(const char* symbol) {
     int status = 0;
     std::unique_ptr<char, decltype(&std::free)> text(abi::__cxa_demangle(symbol, nullptr, nullptr, &status), std::free);
@@ -95,10 +105,16 @@ bool DescribeAddress(const void* address, AddressEntry& entry) {
     Dl_info info{};
     entry = {};
     if (dladdr(address, &info) == 0) return FailWith(kErrorModuleNotFound);
-    entry.module = NameFromDisk(NativeLast(info.dli_fname ? info.dli_fname : ""));
-    const void* start = info.dli_saddr ? info.dli_saddr : info.dli_fbase;
-    entry.offset = static_cast<std::size_t>(static_cast<const char*>(address) - static_cast<const char*>(start));
-    if (info.dli_sname) entry.symbol = Demangled(info.dli_sname);
+    std::string file = info.dli_fname ? info.dli_fname : "";
+    std::uintptr_t base = reinterpret_cast<std::uintptr_t>(info.dli_fbase);
+    if (base == ExecutableBase()) file = ExecutableFile(); /* its name here is what it was called by */
+    entry.module = NameFromDisk(NativeLast(file));
+    entry.offset = reinterpret_cast<std::uintptr_t>(address) - base;
+    std::uintptr_t start = reinterpret_cast<std::uintptr_t>(info.dli_saddr) - base;
+    std::string symbol = info.dli_sname ? info.dli_sname : "";
+    if (symbol.empty() && !FindElfSymbol(file, entry.offset, symbol, start)) return true;
+    entry.symbol = Demangled(symbol.c_str());
+    entry.offset -= start;
     return true;
 }
 
