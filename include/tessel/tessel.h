@@ -18,6 +18,7 @@
 #include <tessel/diagnostics/FileLoc.h>
 #include <tessel/diagnostics/StackChain.h>
 #include <tessel/files/AppPath.h>
+#include <tessel/files/CachedPathFlavor.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/files/SystemDirs.h>
 #include <tessel/files/shortcut.h>

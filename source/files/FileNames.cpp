@@ -18,6 +18,9 @@ namespace tessel {
 
 namespace {
 
+// How long a corrected name may be answered from the cache.
+constexpr double kCorrectedCaseSeconds = 10.0;
+
 std::string StringOf(ConstPStr text) {
     return std::string(reinterpret_cast<const char*>(text + 1), text[0]);
 }
@@ -59,6 +62,26 @@ Path FResolvePath(Path out, Path path) {
         PlatformName name;
         if (name.Make(path, true)) return nullptr;
         return NameToPath(name.Text(), &out) ? nullptr : out;
+    });
+}
+
+MgErr FGetCanonicalPath(Path path, Path* out) {
+    if (!FIsAbsPath(path)) {
+        TESSEL_REPORT(kDebugWarning, 0x3B40C6E2u) << "FGetCanonicalPath: relative path passed in!";
+        return kArgErr;
+    }
+    if (!out) {
+        TESSEL_REPORT(kDebugWarning, 0x68F91D05u) << "FGetCanonicalPath: NULL resolvedPath passed in!";
+        return kArgErr;
+    }
+    return Guarded([&]() -> MgErr {
+        PathRef resolved(*path);
+        if (resolved.ItemCount() != 0) {
+            PlatformName name;
+            if (const MgErr err = name.Make(path, true)) return err;
+            resolved = PathRef(PathRef(name.Text(), PathRef::StringDisplay()).GetCorrectedCase(kCorrectedCaseSeconds));
+        }
+        return resolved.ConvertToPath(out);
     });
 }
 
