@@ -113,9 +113,10 @@ REAL_UNARY(ACosX, std::acos)
 REAL_UNARY(FPIsInt, IsInteger)
 REAL_BINARY(FPCompareExt, Compare)
 
-// 2^x - 1 = e^(x ln 2) - 1
+// 2^x - 1, which is e^(x ln 2) - 1 where that is small.
 void _F2XM1(void) {
-    PushRegister(std::expm1(PopRegister() * cmplx::kLn2<Extended>.high));
+    const Extended x = PopRegister();
+    PushRegister(std::fabs(x) < 1 ? std::expm1(x * cmplx::kLn2<Extended>.high) : std::exp2(x) - 1);
 }
 
 void FMantExpX(void) {

@@ -88,7 +88,7 @@ template <class T>
 T Scale(T x, T n) {
     constexpr T kFarthest = 40000;  // moves any value out of range
     if (std::isnan(n)) return n;
-    if (std::isinf(n)) return n > 0 ? x * n : x / n;
+    if (std::isinf(n)) return n > 0 ? x * n : x / -n;
     const T bounded = std::fmin(std::fmax(n, -kFarthest), kFarthest);
     return std::scalbn(x, static_cast<int>(bounded));
 }
