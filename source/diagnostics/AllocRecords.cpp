@@ -62,8 +62,9 @@ bool AllocRecords::Grow(Shard& shard, TrackerFailure& failure) {
     return true;
 }
 
-AllocRecords::Insertion AllocRecords::Insert(AllocRecord& record, TrackerFailure& failure) {
-    const Place place(record.address);
+AllocRecords::Insertion AllocRecords::Insert(uintptr_t address, const CallSite* site, uint64 number, uint32 size,
+                                             AllocRecord& earlier, TrackerFailure& failure) {
+    const Place place(address);
     Shard& shard = ShardOf(place);
     ShardHolder hold(shard.lock);
     // At most three quarters are taken.
@@ -71,13 +72,13 @@ AllocRecords::Insertion AllocRecords::Insert(AllocRecord& record, TrackerFailure
         return Insertion::kFailed;
     AllocRecord* const slot = Look(shard, place);
     if (slot->address) {
-        record = *slot;
+        earlier = *slot;
         return Insertion::kDuplicate;
     }
-    *slot = record;
+    *slot = {address, site, number, size, 0};
     ++shard.counts.made;
-    shard.counts.bytesMade += record.size;
-    shard.counts.bytes += record.size;
+    shard.counts.bytesMade += size;
+    shard.counts.bytes += size;
     ++shard.counts.live;
     ++shard.counts.unreported;
     return Insertion::kDone;

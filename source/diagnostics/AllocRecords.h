@@ -38,9 +38,10 @@ public:
     explicit AllocRecords(TrackerHeap& heap) : heap_(heap) {}
 
     enum class Insertion { kDone, kDuplicate, kFailed };
-    // Of a duplicate the earlier record is copied into `record`; with kFailed it is not kept. `failure` may be set in
-    // any case.
-    Insertion Insert(AllocRecord& record, TrackerFailure& failure);
+    // Of a duplicate the earlier record is copied into `earlier`; with kFailed the new one is not kept. `failure` may
+    // be set in any case.
+    Insertion Insert(uintptr_t address, const CallSite* site, uint64 number, uint32 size, AllocRecord& earlier,
+                     TrackerFailure& failure);
     bool Remove(uintptr_t address);
     bool Find(uintptr_t address, AllocRecord& record);
 

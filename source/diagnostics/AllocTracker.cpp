@@ -84,18 +84,22 @@ void AllocTracker::Implementation::SetSkip(int32 skip) {
 
 void AllocTracker::Implementation::Add(uintptr_t address, uint32 size, const char* file, int32 line,
                                        const StackFrame* frame) {
-    if (IsIdle()) return;
+    if (deactivated_.load(std::memory_order_relaxed)) return;
     TrackerFailure failure = TrackerFailure::kNone;
-    if (const CallSite* site = sites_.SiteOf(file, line, frame, failure)) {
-        AllocRecord record{address, site, sites_.NextNumber(), size, 0};
-        if (records_.Insert(record, failure) == AllocRecords::Insertion::kDuplicate) {
-            CallSites::Reporting reporting(sites_);
-            DefaultDumper dumper;
-            dumper.FormatToOutput("Duplicate pointer first returned in this context:\n");
-            WriteRecord(dumper, record);
-        }
+    uint64 number;
+    if (const CallSite* site = sites_.Enter(file, line, frame, number, failure)) {
+        AllocRecord earlier;
+        if (records_.Insert(address, site, number, size, earlier, failure) == AllocRecords::Insertion::kDuplicate)
+            ReportDuplicate(earlier);
     }
     if (failure != TrackerFailure::kNone) Deactivate(failure);
+}
+
+void AllocTracker::Implementation::ReportDuplicate(const AllocRecord& earlier) {
+    CallSites::Reporting reporting(sites_);
+    DefaultDumper dumper;
+    dumper.FormatToOutput("Duplicate pointer first returned in this context:\n");
+    WriteRecord(dumper, earlier);
 }
 
 void AllocTracker::Implementation::Remove(uintptr_t address) {

@@ -28,6 +28,7 @@ private:
     explicit Implementation(int32 skip) : sites_(heap_, skip), records_(heap_) {}
 
     bool IsIdle() const { return deactivated_.load(std::memory_order_relaxed) || sites_.IsReporting(); }
+    void ReportDuplicate(const AllocRecord& earlier);
     void Deactivate(TrackerFailure failure);
     void WriteAll(AllocDumper& dumper, AllocRecord* records, size_t count);
     void WriteRecord(AllocDumper& dumper, const AllocRecord& record);

@@ -1,6 +1,7 @@
 #include "diagnostics/CallSites.h"
 
 #include <algorithm>
+#include <array>
 #include <cstdlib>
 #include <cstring>
 #include <utility>
@@ -20,6 +21,19 @@ constexpr uint32 kMostNumbersAtOnce = 64;
 
 std::atomic<uint64> theNextSerial{1};
 
+// One odd factor for each word of a key, so that the products do not wait for each other.
+constexpr auto kFactors = [] {
+    std::array<uint64, CallStack::kCapacity + 2> factors{};
+    uint64 state = 0x9E3779B97F4A7C15u;
+    for (uint64& factor : factors) {
+        state = (state ^ (state >> 29)) * 0xBF58476D1CE4E5B9u + 0x94D049BB133111EBu;
+        factor = (state ^ (state >> 31)) | 1;
+    }
+    return factors;
+}();
+
+}  // namespace
+
 // A walk as it was done last: the frames, innermost first, and what came of it.
 struct RememberedWalk {
     uint64 serial;
@@ -37,6 +51,8 @@ struct NumberRange {
     uint64 end;
     uint32 size;
 };
+
+namespace {
 
 // What a thread remembers. All its own, so that no lock is needed.
 struct ThreadMemory {
@@ -76,6 +92,7 @@ RememberedWalk& WalkFrom(ThreadMemory& memory, const StackFrame* frame, uint64 s
 __attribute__((no_sanitize("address"), no_sanitize("thread"))) bool IsSameWalk(const RememberedWalk& walk) {
     const StackFrame* frame = walk.first;
     uintptr_t difference = 0;
+#pragma GCC unroll 4
     for (int32 i = 0; i < walk.depth; ++i) {
         const StackFrame& remembered = walk.frames[i];
         difference |= reinterpret_cast<uintptr_t>(frame->caller) ^ reinterpret_cast<uintptr_t>(remembered.caller);
@@ -108,11 +125,12 @@ __attribute__((no_sanitize("address"), no_sanitize("thread"))) int32 CopyFrames(
 struct CallSites::Key {
     Key(const char* file_, int32 line_, const StackFrame* frames, int32 count_)
         : file(file_), line(line_), count(count_) {
-        hash = (reinterpret_cast<uintptr_t>(file) ^ (uint64(static_cast<uint32>(line)) << 32)) * 0x9E3779B97F4A7C15u;
+        hash = reinterpret_cast<uintptr_t>(file) * kFactors[0] + static_cast<uint32>(line) * kFactors[1];
         for (int32 i = 0; i < count; ++i) {
             addresses[i] = frames[i].returnAddress;
-            hash = (hash ^ (hash >> 29) ^ reinterpret_cast<uintptr_t>(addresses[i])) * 0xBF58476D1CE4E5B9u;
+            hash += reinterpret_cast<uintptr_t>(addresses[i]) * kFactors[i + 2];
         }
+        hash ^= hash >> 32;
     }
     bool Is(const CallSite& site) const {
         return site.hash == hash && site.fileKey == file && site.line == line && site.count == count &&
@@ -133,16 +151,33 @@ void CallSites::SetSkip(int32 skip) {
     skip_ = skip;
 }
 
-const CallSite* CallSites::SiteOf(const char* file, int32 line, const StackFrame* frame, TrackerFailure& failure) {
+const CallSite* CallSites::Enter(const char* file, int32 line, const StackFrame* frame, uint64& number,
+                                 TrackerFailure& failure) {
     ThreadMemory* const memory = MemoryOfThread();
-    if (!memory) return Walk(file, line, frame, failure);
+    if (!memory) {
+        number = numbers_.fetch_add(1, std::memory_order_relaxed);
+        return Walk(file, line, frame, nullptr, failure);
+    }
+    if (memory->reporting == this) return nullptr;
+    NumberRange& range = memory->numbers[serial_ % kNumberRanges];
+    if (range.serial != serial_ || range.next == range.end) TakeNumbers(range);
+    number = range.next++;
     RememberedWalk& walk = WalkFrom(*memory, frame, serial_);
     if (walk.first == frame && walk.serial == serial_ && walk.file == file && walk.line == line && IsSameWalk(walk))
         return walk.site;
-    return Walk(file, line, frame, failure);
+    return Walk(file, line, frame, &walk, failure);
 }
 
-const CallSite* CallSites::Walk(const char* file, int32 line, const StackFrame* frame, TrackerFailure& failure) {
+__attribute__((noinline)) void CallSites::TakeNumbers(NumberRange& range) {
+    if (range.serial != serial_) range = {serial_, 0, 0, 1};
+    range.next = numbers_.fetch_add(range.size, std::memory_order_relaxed);
+    range.end = range.next + range.size;
+    range.size = std::min(2 * range.size, kMostNumbersAtOnce);
+}
+
+// Remembers the walk when asked to.
+const CallSite* CallSites::Walk(const char* file, int32 line, const StackFrame* frame, RememberedWalk* remembered,
+                                TrackerFailure& failure) {
     StackFrame frames[kMostFrames];
     const int32 skip = skip_.load(std::memory_order_relaxed);
     int32 depth, first;
@@ -158,11 +193,10 @@ const CallSite* CallSites::Walk(const char* file, int32 line, const StackFrame* 
     const Key key(file, line, frames + first, depth - first);
     const CallSite* site = Find(key);
     if (!site) site = Add(key, failure);
-    ThreadMemory* const memory = theMemory;
-    if (!site || !memory || skip > kMostSkipRemembered) return site;
-    RememberedWalk& walk = WalkFrom(*memory, frame, serial_);
-    walk = {serial_, file, line, depth, frame, site, {}};
-    std::copy_n(frames, depth, walk.frames);
+    if (site && remembered && skip <= kMostSkipRemembered) {
+        *remembered = {serial_, file, line, depth, frame, site, {}};
+        std::copy_n(frames, depth, remembered->frames);
+    }
     return site;
 }
 
@@ -240,19 +274,6 @@ const char* CallSites::CopyText(const char* text, TrackerFailure& failure) {
     const size_t size = std::strlen(text) + 1;
     void* const copy = AllocateSmall(size, failure);
     return copy ? static_cast<const char*>(std::memcpy(copy, text, size)) : nullptr;
-}
-
-uint64 CallSites::NextNumber() {
-    ThreadMemory* const memory = MemoryOfThread();
-    if (!memory) return numbers_.fetch_add(1, std::memory_order_relaxed);
-    NumberRange& range = memory->numbers[serial_ % kNumberRanges];
-    if (range.serial != serial_) range = {serial_, 0, 0, 1};
-    if (range.next == range.end) {
-        range.next = numbers_.fetch_add(range.size, std::memory_order_relaxed);
-        range.end = range.next + range.size;
-        range.size = std::min(2 * range.size, kMostNumbersAtOnce);
-    }
-    return range.next++;
 }
 
 CallSites::Reporting::Reporting(const CallSites& sites) : outer_(theMemory ? theMemory->reporting : nullptr) {

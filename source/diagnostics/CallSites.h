@@ -25,6 +25,9 @@ struct CallSite {
     const void* addresses[CallStack::kCapacity];  // `count` of them; no more are allocated
 };
 
+struct RememberedWalk;
+struct NumberRange;
+
 class CallSites {
 public:
     // `skip` calls are left out of every stack.
@@ -34,13 +37,14 @@ public:
 
     void SetSkip(int32 skip);
 
-    // The site of the calling thread whose innermost frame is given. Null, and `failure` set, when memory runs out. No
-    // lock, unless the site is new. Any thread.
-    const CallSite* SiteOf(const char* file, int32 line, const StackFrame* frame, TrackerFailure& failure);
-
-    // The next of the tracker's numbers, from 1. A thread that takes many takes several at a time, so that threads do
-    // not hold each other up: numbers are unique, and rise within a thread.
-    uint64 NextNumber();
+    // For a new object: where the calling thread makes it (its innermost frame is given), and the next of the tracker's
+    // numbers, from 1. Null while the thread reports for this tracker, and, with `failure` set, when memory runs out.
+    // No lock, unless the site is new. Any thread.
+    //
+    // A thread that takes many numbers takes several at a time, so that threads do not hold each other up: numbers are
+    // unique, and rise within a thread.
+    const CallSite* Enter(const char* file, int32 line, const StackFrame* frame, uint64& number,
+                          TrackerFailure& failure);
 
     // The tracker that the calling thread is reporting for: whatever it makes meanwhile is not tracked.
     class Reporting {
@@ -62,7 +66,9 @@ private:
     };
     struct Key;
 
-    const CallSite* Walk(const char* file, int32 line, const StackFrame* frame, TrackerFailure& failure);
+    void TakeNumbers(NumberRange& range);
+    const CallSite* Walk(const char* file, int32 line, const StackFrame* frame, RememberedWalk* remembered,
+                         TrackerFailure& failure);
     const CallSite* Find(const Key& key) const;
     const CallSite* Add(const Key& key, TrackerFailure& failure);
     bool MakeRoom(TrackerFailure& failure);
