@@ -219,8 +219,8 @@ bool IsFolder(const std::string& native) {
     return systemCalls.statx(AT_FDCWD, native.c_str(), 0, STATX_TYPE, &status) == 0 && S_ISDIR(status.stx_mode);
 }
 
-/* The entry of `folder` that is `name`, exactly or in another case. The first in byte order where several are, so that
-   the answer does not hang on the order of the listing. */
+}  // namespace
+
 bool FindInFolder(const std::string& folder, std::string_view name, std::string& found) {
     std::unique_ptr<DIR, int (*)(DIR*)> listing(opendir(folder.c_str()), closedir);
     if (!listing) return false;
@@ -234,8 +234,6 @@ bool FindInFolder(const std::string& folder, std::string_view name, std::string&
     }
     return !found.empty();
 }
-
-}  // namespace
 
 bool EqualNames(std::string_view a, std::string_view b) noexcept {
     while (!a.empty() && !b.empty()) {
@@ -257,6 +255,21 @@ Match MatchOnDisk(std::string& native) {
     native += there ? found : last;
     if (there) return Match::kAll;
     return parentThere && IsFolder(parent) ? Match::kLastMissing : Match::kParentMissing;
+}
+
+bool NameToAbsoluteText(std::string_view name, std::string& native) {
+    if (!NameToNativeText(name, native)) return false;
+    if (native[0] == '/') return true;
+    std::string current = NativeCurrentFolder();
+    native.insert(0, current == "/" ? current : current + "/");
+    return true;
+}
+
+bool NameToAbsoluteNative(const char* name, std::string& native) {
+    if (!NameToAbsoluteText(name, native)) return false;
+    Match match = MatchOnDisk(native);
+    if (match == Match::kAll) return true;
+    return FailWith(match == Match::kLastMissing ? kErrorFileNotFound : kErrorPathNotFound);
 }
 
 // ---- names from the host's ------------------------------------------------------------------------------------------

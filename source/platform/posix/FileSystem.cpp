@@ -82,34 +82,17 @@ ItemKind ItemExists(const char* name) {
     return kind;
 }
 
-namespace {
-
-bool FindNative(const char* name, std::string& native) {
-    if (!NameToNativeText(name, native)) return false;
-    Match match = MatchOnDisk(native);
-    if (match == Match::kAll) return true;
-    return FailWith(match == Match::kLastMissing ? kErrorFileNotFound : kErrorPathNotFound);
-}
-
-}  // namespace
-
 bool ItemRealName(const char* name, std::string& real) {
     std::string native, path;
-    if (!FindNative(name, native)) return false;
-    bool drive = native[0] == '/' && NativeToName(native, path) && path.size() == 3; /* `T:` and the separator */
+    if (!NameToAbsoluteNative(name, native)) return false;
+    bool drive = NativeToName(native, path) && path.size() == 3; /* `T:` and the separator */
     real = drive ? "" : NameFromDisk(NativeLast(native));
     return true;
 }
 
 bool ItemRealPath(const char* name, std::string& real) {
     std::string native;
-    if (!FindNative(name, native)) return false;
-    if (native[0] != '/') {
-        std::string current;
-        if (!CurrentFolder(current) || !NameToNativeText(current, current)) return false;
-        native.insert(0, current == "/" ? current : current + "/");
-    }
-    return NativeToName(native, real);
+    return NameToAbsoluteNative(name, native) && NativeToName(native, real);
 }
 
 // ---- folders --------------------------------------------------------------------------------------------------------
@@ -231,7 +214,7 @@ bool MoveAcross(const std::string& native, const char* from, const char* to) {
 
 bool ItemRename(const char* from, const char* to) {
     std::string source, target, respelled;
-    if (!FindNative(from, source) || !NameToNativeText(to, target)) return false;
+    if (!NameToAbsoluteNative(from, source) || !NameToAbsoluteText(to, target)) return false;
     respelled = target;
     Match match = MatchOnDisk(respelled);
     if (match == Match::kParentMissing) return FailWith(kErrorPathNotFound);
@@ -239,8 +222,7 @@ bool ItemRename(const char* from, const char* to) {
     if (match == Match::kAll && !otherSpelling) return FailWith(kErrorAlreadyExists);
     /* The parent as on the disk, the last part as the caller wants it. */
     std::string wanted = NativeParent(respelled);
-    if (respelled.find('/') == std::string::npos) wanted.clear();
-    if (!wanted.empty() && wanted != "/") wanted += '/';
+    if (wanted != "/") wanted += '/';
     wanted += NativeLast(target);
     if (wanted == source || RenameWithoutReplacing(source, wanted)) return true;
     if (errno == EXDEV) return MoveAcross(source, from, to);

@@ -4,6 +4,7 @@
 #include <fcntl.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <atomic>
 #include <cstdio>
 
@@ -31,35 +32,36 @@ bool WriteAll(int file, const std::string& data) {
     return true;
 }
 
-/* Unlike any other's, in this process or another: who made it, and which it is. */
+/* Unlike any other's, in this process or another: who made it, and which it is. Hidden, beside the file it will be. */
 std::string TemporaryName(const std::string& native) {
     static std::atomic<unsigned> number{0};
     char ending[48];
     std::snprintf(ending, sizeof ending, ".%d.%u.tmp", ::getpid(), number.fetch_add(1));
-    return native + ending;
+    std::size_t last = native.rfind('/') + 1; /* 0 when there is no folder */
+    return native.substr(0, last) + "." + native.substr(last) + ending;
 }
 
 }  // namespace
 
-bool ReadTextFile(const char* native, std::string& text) {
+bool ReadTextFile(const char* native, std::string& text, std::size_t most) {
     text.clear();
     int file = OpenRetrying(native, O_RDONLY, 0);
     if (file < 0) return false;
     char buffer[4096];
-    ssize_t moved;
-    while ((moved = systemCalls.read(file, buffer, sizeof buffer)) != 0) {
+    ssize_t moved = 1;
+    while (moved != 0 && text.size() < most) {
+        moved = systemCalls.read(file, buffer, std::min(sizeof buffer, most - text.size()));
         if (moved < 0 && errno != EINTR) break;
         if (moved > 0) text.append(buffer, static_cast<std::size_t>(moved));
     }
     int error = errno;
     systemCalls.close(file);
     errno = error;
-    return moved == 0;
+    return moved >= 0;
 }
 
-bool ReplaceFile(const std::string& native, const std::string& data) {
-    std::string temporary = TemporaryName(native);
-    int file = OpenRetrying(temporary.c_str(), O_WRONLY | O_CREAT | O_EXCL, 0666);
+bool CreateTextFile(const std::string& native, const std::string& data) {
+    int file = OpenRetrying(native.c_str(), O_WRONLY | O_CREAT | O_EXCL, 0666);
     if (file < 0) return false;
     bool written = WriteAll(file, data);
     int error = errno;
@@ -67,8 +69,16 @@ bool ReplaceFile(const std::string& native, const std::string& data) {
         written = false;
         error = errno;
     }
-    if (written && systemCalls.renameat2(AT_FDCWD, temporary.c_str(), AT_FDCWD, native.c_str(), 0) == 0) return true;
-    if (written) error = errno;
+    if (!written) systemCalls.unlink(native.c_str());
+    errno = error;
+    return written;
+}
+
+bool ReplaceFile(const std::string& native, const std::string& data) {
+    std::string temporary = TemporaryName(native);
+    if (!CreateTextFile(temporary, data)) return false;
+    if (systemCalls.renameat2(AT_FDCWD, temporary.c_str(), AT_FDCWD, native.c_str(), 0) == 0) return true;
+    int error = errno;
     systemCalls.unlink(temporary.c_str());
     errno = error;
     return false;

@@ -1,0 +1,57 @@
+#include "platform/posix/Folders.h"
+
+#include <errno.h>
+#include <pwd.h>
+#include <unistd.h>
+
+#include <cstdlib>
+
+#include "platform/posix/NativeNames.h"
+#include "platform/posix/SystemCalls.h"
+
+namespace tessel::platform {
+
+namespace {
+
+std::string WithoutEnd(std::string folder) {
+    while (folder.size() > 1 && folder.back() == '/') folder.pop_back();
+    return folder;
+}
+
+std::string AccountHome() {
+    passwd account{};
+    passwd* found = nullptr;
+    char buffer[2048];
+    bool known = getpwuid_r(::getuid(), &account, buffer, sizeof buffer, &found) == 0 && found && *found->pw_dir == '/';
+    return known ? found->pw_dir : "/";
+}
+
+}  // namespace
+
+std::string HomeFolder() {
+    const char* home = std::getenv("HOME");
+    return WithoutEnd(home && *home == '/' ? home : AccountHome());
+}
+
+std::string XdgFolder(const char* variable, const char* underHome) {
+    const char* value = std::getenv(variable);
+    if (value && *value == '/') return WithoutEnd(value);
+    std::string home = HomeFolder();
+    return (home == "/" ? home : home + "/") + underHome;
+}
+
+bool MakeFolders(const std::string& native, unsigned mode) {
+    if (systemCalls.mkdir(native.c_str(), static_cast<mode_t>(mode)) == 0) return true;
+    struct statx status;
+    if (errno == EEXIST) {
+        bool folder = systemCalls.statx(AT_FDCWD, native.c_str(), 0, STATX_TYPE, &status) == 0;
+        if (folder && S_ISDIR(status.stx_mode)) return true;
+        errno = ENOTDIR;
+        return false;
+    }
+    std::string parent = NativeParent(native);
+    if (errno != ENOENT || parent == native || !MakeFolders(parent, mode)) return false;
+    return systemCalls.mkdir(native.c_str(), static_cast<mode_t>(mode)) == 0 || errno == EEXIST;
+}
+
+}  // namespace tessel::platform

@@ -1,0 +1,337 @@
+#include "platform/Registry.h"
+
+#include <dirent.h>
+#include <errno.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <charconv>
+#include <cstdio>
+#include <cstdlib>
+#include <memory>
+#include <string_view>
+#include <vector>
+
+#include "platform/CodePage.h"
+#include "platform/posix/Folders.h"
+#include "platform/posix/NativeNames.h"
+#include "platform/posix/SystemCalls.h"
+#include "platform/posix/TextFile.h"
+
+/* On the disk:
+
+     <store>/HKEY_LOCAL_MACHINE/SOFTWARE/Maker/=Path
+
+   A key is a folder of its name; a value is a file of its name behind `=`, so that the two never meet. `%` and two
+   hexadecimal digits stand for a byte that a file's name cannot have, or that would read as something else. Names that
+   begin with a dot belong to the store: its lock, and values being written. The 64-bit view is a store of its own in
+   the folder `.view64`.
+
+   A value's file holds `REG `, the type in decimal digits, a line feed, and the raw data. */
+
+namespace tessel::platform {
+
+struct RegistryKey {
+    std::string folder; /* the host's name; that of a root need not exist */
+    bool write;
+    mutable std::vector<std::string> listing; /* of the enumeration under way */
+};
+
+namespace {
+
+ErrorNumber ErrnoNumber() {
+    return ErrorOfErrno(errno);
+}
+
+// ---- names ----------------------------------------------------------------------------------------------------------
+
+constexpr char kValueMark = '=';
+
+std::string Escaped(std::string_view name) {
+    std::string escaped;
+    for (std::size_t i = 0; i < name.size(); ++i) {
+        unsigned char byte = static_cast<unsigned char>(name[i]);
+        bool special = byte < 0x20 || byte == '/' || byte == '%' || (i == 0 && (byte == '.' || byte == kValueMark));
+        char text[4] = {name[i]};
+        if (special) std::snprintf(text, sizeof text, "%%%02X", byte);
+        escaped += text;
+    }
+    return escaped;
+}
+
+std::string Unescaped(std::string_view escaped) {
+    std::string name;
+    for (std::size_t i = 0; i < escaped.size(); ++i) {
+        unsigned byte = 0;
+        bool special = escaped[i] == '%' && i + 2 < escaped.size() &&
+                       std::from_chars(&escaped[i + 1], &escaped[i + 1] + 2, byte, 16).ptr == &escaped[i + 1] + 2;
+        name += special ? static_cast<char>(byte) : escaped[i];
+        if (special) i += 2;
+    }
+    return name;
+}
+
+/* Between the code page of the library and the UTF-8 of the disk. */
+std::string ForDisk(const char* name) {
+    std::string text = name ? name : "";
+    if (ActiveCodePage().utf8) return text;
+    std::string utf8;
+    ToUtf8(text, utf8);
+    return utf8;
+}
+
+std::string FromDisk(std::string_view diskName) {
+    std::string text = Unescaped(diskName);
+    if (ActiveCodePage().utf8) return text;
+    std::string name;
+    FromUtf8(text, name);
+    return name;
+}
+
+std::string ValueFileName(const char* name) {
+    return kValueMark + Escaped(ForDisk(name));
+}
+
+std::vector<std::string> PathParts(const char* path) {
+    std::vector<std::string> parts;
+    std::string text = ForDisk(path);
+    for (std::size_t start = 0; start <= text.size();) {
+        std::size_t end = std::min(text.find('\\', start), text.size());
+        if (end > start) parts.push_back(Escaped(std::string_view(text).substr(start, end - start)));
+        start = end + 1;
+    }
+    return parts;
+}
+
+// ---- the store ------------------------------------------------------------------------------------------------------
+
+std::string StoreFolder() {
+    const char* setting = std::getenv("TESSEL_REGISTRY");
+    return setting && *setting == '/' ? setting : XdgFolder("XDG_CONFIG_HOME", ".config") + "/tessel/registry";
+}
+
+/* Held by whoever changes the store, in whatever process: so no two make one name in two spellings, and no key goes
+   while a value is put into it. Where it cannot be had (a file system without locks) things go on without. */
+class StoreLock {
+public:
+    StoreLock() {
+        std::string folder = StoreFolder();
+        if (!MakeFolders(folder)) return;
+        file_ = systemCalls.open((folder + "/.lock").c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0666);
+        struct flock range {};
+        range.l_type = F_WRLCK;
+        while (file_ >= 0 && systemCalls.lock(file_, F_OFD_SETLKW, &range) != 0 && errno == EINTR) {
+        }
+    }
+    ~StoreLock() {
+        if (file_ >= 0) systemCalls.close(file_);
+    }
+    StoreLock(const StoreLock&) = delete;
+    StoreLock& operator=(const StoreLock&) = delete;
+
+private:
+    int file_ = -1;
+};
+
+bool Exists(const std::string& native) {
+    struct statx status;
+    return systemCalls.statx(AT_FDCWD, native.c_str(), 0, STATX_TYPE, &status) == 0;
+}
+
+/* The item of `folder` with that name, in whatever case; the name as given where there is none. */
+std::string ItemIn(const std::string& folder, const std::string& diskName) {
+    std::string native = folder + "/" + diskName, found;
+    if (!Exists(native) && FindInFolder(folder, diskName, found)) native = folder + "/" + found;
+    return native;
+}
+
+std::string KeyFolder(const RegistryKey* parent, const char* path) {
+    std::string folder = parent->folder;
+    for (const std::string& part : PathParts(path)) folder = ItemIn(folder, part);
+    return folder;
+}
+
+enum class Kind { kKey, kValue, kOther };
+
+/* Calls visit(name on the disk, kind) for all that a key's folder holds. A folder that is missing holds nothing. */
+template <typename Visitor>
+void VisitKey(const std::string& folder, Visitor visit) {
+    std::unique_ptr<DIR, int (*)(DIR*)> listing(opendir(folder.c_str()), closedir);
+    if (!listing) return;
+    while (const dirent* entry = readdir(listing.get())) {
+        std::string_view name = entry->d_name;
+        if (name == "." || name == "..") continue;
+        bool key = name[0] != '.' && name[0] != kValueMark;
+        visit(name, key ? Kind::kKey : name[0] == kValueMark ? Kind::kValue : Kind::kOther);
+    }
+}
+
+std::vector<std::string> NamesIn(const std::string& folder, Kind wanted) {
+    std::vector<std::string> names;
+    VisitKey(folder, [&](std::string_view name, Kind kind) {
+        if (kind == wanted) names.push_back(FromDisk(name.substr(kind == Kind::kValue ? 1 : 0)));
+    });
+    std::sort(names.begin(), names.end());
+    return names;
+}
+
+RegistryKey* NewKey(std::string folder, bool write) {
+    return new RegistryKey{std::move(folder), write, {}};
+}
+
+}  // namespace
+
+// ---- keys -----------------------------------------------------------------------------------------------------------
+
+ErrorNumber RegistryOpenRoot(RegistryRoot root, std::uint32_t view, RegistryKey*& key) {
+    constexpr const char* kNames[] = {"HKEY_CLASSES_ROOT", "HKEY_CURRENT_CONFIG", "HKEY_CURRENT_USER",
+                                      "HKEY_DYN_DATA",     "HKEY_LOCAL_MACHINE",  "HKEY_PERFORMANCE_DATA",
+                                      "HKEY_USERS"};
+    key = nullptr;
+    if (view != kRegistryDefaultView && view != kRegistryView64) return kErrorInvalidParameter;
+    std::string folder = StoreFolder() + (view == kRegistryView64 ? "/.view64/" : "/");
+    key = NewKey(folder + kNames[static_cast<int>(root)], true);
+    return kErrorSuccess;
+}
+
+ErrorNumber RegistryOpen(const RegistryKey* parent, const char* path, bool write, RegistryKey*& key) {
+    key = nullptr;
+    if (!parent) return kErrorInvalidHandle;
+    std::string folder = KeyFolder(parent, path);
+    if (folder != parent->folder) {
+        if (!Exists(folder)) return kErrorFileNotFound;
+        if (write && ::access(folder.c_str(), W_OK) != 0) return ErrnoNumber();
+    }
+    key = NewKey(std::move(folder), write);
+    return kErrorSuccess;
+}
+
+ErrorNumber RegistryCreate(const RegistryKey* parent, const char* path, RegistryKey*& key) {
+    key = nullptr;
+    if (!parent) return kErrorInvalidHandle;
+    StoreLock lock;
+    std::string folder = KeyFolder(parent, path);
+    if (!MakeFolders(folder)) return ErrnoNumber();
+    key = NewKey(std::move(folder), true);
+    return kErrorSuccess;
+}
+
+ErrorNumber RegistryClose(RegistryKey* key) {
+    if (!key) return kErrorInvalidHandle;
+    delete key;
+    return kErrorSuccess;
+}
+
+ErrorNumber RegistryDelete(const RegistryKey* parent, const char* path) {
+    if (!parent) return kErrorInvalidHandle;
+    StoreLock lock;
+    std::string folder = KeyFolder(parent, path);
+    if (folder == parent->folder) return kErrorInvalidParameter;
+    if (!NamesIn(folder, Kind::kKey).empty()) return kErrorAccessDenied;
+    std::vector<std::string> files;
+    VisitKey(folder, [&](std::string_view name, Kind) { files.push_back(folder + "/" + std::string(name)); });
+    for (const std::string& file : files) systemCalls.unlink(file.c_str());
+    return systemCalls.rmdir(folder.c_str()) == 0 ? kErrorSuccess : ErrnoNumber();
+}
+
+ErrorNumber RegistryCounts(const RegistryKey* key, std::uint32_t& subKeys, std::uint32_t& values) {
+    subKeys = values = 0;
+    if (!key) return kErrorInvalidHandle;
+    VisitKey(key->folder, [&](std::string_view, Kind kind) {
+        if (kind == Kind::kKey) ++subKeys;
+        if (kind == Kind::kValue) ++values;
+    });
+    return kErrorSuccess;
+}
+
+namespace {
+
+/* The first index lists the folder, the others read on in that listing. */
+ErrorNumber Enumerate(const RegistryKey* key, Kind kind, std::uint32_t index, std::string& name) {
+    if (!key) return kErrorInvalidHandle;
+    if (index == 0) key->listing = NamesIn(key->folder, kind);
+    if (index >= key->listing.size()) return kErrorNoMoreItems;
+    name = key->listing[index];
+    return kErrorSuccess;
+}
+
+}  // namespace
+
+ErrorNumber RegistryEnumerateKey(const RegistryKey* key, std::uint32_t index, std::string& name) {
+    return Enumerate(key, Kind::kKey, index, name);
+}
+
+ErrorNumber RegistryEnumerateValue(const RegistryKey* key, std::uint32_t index, std::string& name) {
+    return Enumerate(key, Kind::kValue, index, name);
+}
+
+// ---- values ---------------------------------------------------------------------------------------------------------
+
+namespace {
+
+constexpr std::string_view kValueHeader = "REG ";
+
+bool ParseValue(std::string& text, std::uint32_t& type) {
+    if (text.compare(0, kValueHeader.size(), kValueHeader) != 0) return false;
+    const char* start = text.data() + kValueHeader.size();
+    const char* end = text.data() + text.size();
+    std::from_chars_result number = std::from_chars(start, end, type);
+    if (number.ec != std::errc() || number.ptr == end || *number.ptr != '\n') return false;
+    text.erase(0, static_cast<std::size_t>(number.ptr + 1 - text.data()));
+    return true;
+}
+
+}  // namespace
+
+ErrorNumber RegistryQueryValue(const RegistryKey* key, const char* name, std::uint32_t& type, std::string& data) {
+    if (!key) return kErrorInvalidHandle;
+    data.clear();
+    if (!ReadTextFile(ItemIn(key->folder, ValueFileName(name)).c_str(), data)) return ErrnoNumber();
+    return ParseValue(data, type) ? kErrorSuccess : kErrorRegistryCorrupt;
+}
+
+ErrorNumber RegistrySetValue(const RegistryKey* key, const char* name, std::uint32_t type, const void* data,
+                             std::size_t size) {
+    if (!key) return kErrorInvalidHandle;
+    if (!key->write) return kErrorAccessDenied;
+    if (!data && size != 0) return kErrorInvalidParameter;
+    std::string text(kValueHeader);
+    text += std::to_string(type) + "\n";
+    if (size != 0) text.append(static_cast<const char*>(data), size);
+    StoreLock lock;
+    if (!Exists(key->folder) && !MakeFolders(key->folder)) return ErrnoNumber();
+    return ReplaceFile(ItemIn(key->folder, ValueFileName(name)), text) ? kErrorSuccess : ErrnoNumber();
+}
+
+ErrorNumber RegistryDeleteValue(const RegistryKey* key, const char* name) {
+    if (!key) return kErrorInvalidHandle;
+    if (!key->write) return kErrorAccessDenied;
+    StoreLock lock;
+    std::string file = ItemIn(key->folder, ValueFileName(name));
+    return systemCalls.unlink(file.c_str()) == 0 ? kErrorSuccess : ErrnoNumber();
+}
+
+namespace {
+
+bool Synchronize(const std::string& native) {
+    int file = systemCalls.open(native.c_str(), O_RDONLY | O_CLOEXEC, 0);
+    if (file < 0) return errno == ENOENT;
+    int result = systemCalls.fsync(file);
+    int error = errno;
+    systemCalls.close(file);
+    errno = error;
+    return result == 0 || error == EINVAL;
+}
+
+}  // namespace
+
+ErrorNumber RegistryFlush(const RegistryKey* key) {
+    if (!key) return kErrorInvalidHandle;
+    bool done = true;
+    VisitKey(key->folder, [&](std::string_view name, Kind kind) {
+        if (kind == Kind::kValue) done = Synchronize(key->folder + "/" + std::string(name)) && done;
+    });
+    return done && Synchronize(key->folder) ? kErrorSuccess : ErrnoNumber();
+}
+
+}  // namespace tessel::platform
