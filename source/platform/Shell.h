@@ -5,6 +5,7 @@
 #define TESSEL_PLATFORM_SHELL_H
 
 #include <string>
+#include <string_view>
 
 namespace tessel::platform {
 
@@ -31,6 +32,10 @@ bool ShellTrash(const char* name);
 /* The target that the shortcut file `name` points to. 2 when it is missing, 1006 when it is no shortcut or has no
    target of its own. */
 bool ShellReadShortcut(const char* name, std::string& target);
+
+/* The same of the file's bytes. `linkFolder`, with a separator at its end, is what a target that is only known by its
+   way from the shortcut counts from. */
+bool ParseShortcut(std::string_view bytes, std::string_view linkFolder, std::string& target);
 
 }  // namespace tessel::platform
 

@@ -1,0 +1,139 @@
+#include "platform/Shell.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <map>
+
+#include "platform/LastError.h"
+#include "support/ScratchDrive.h"
+
+namespace tessel::platform {
+namespace {
+
+using test::ScratchDrive;
+namespace fs = std::filesystem;
+
+/* A home in the scratch folder; what the environment said before comes back. */
+class Shell : public ::testing::Test {
+protected:
+    Shell() {
+        fs::create_directories(drive_.Native("home/.config"));
+        Set("HOME", drive_.Native("home"));
+        for (const char* variable : {"XDG_CONFIG_HOME", "XDG_DATA_HOME", "XDG_DATA_DIRS"}) Set(variable, "");
+    }
+    ~Shell() override {
+        for (const auto& [variable, value] : before_) setenv(variable.c_str(), value.c_str(), 1);
+    }
+    void Set(const char* variable, const std::string& value) {
+        const char* old = std::getenv(variable);
+        before_.try_emplace(variable, old ? old : "");
+        setenv(variable, value.c_str(), 1);
+    }
+    static std::string Folder(ShellFolder kind, bool create = false) {
+        std::string name;
+        return ShellFolderName(kind, create, name) ? name : "error " + std::to_string(LastError());
+    }
+
+    ScratchDrive drive_;
+    std::map<std::string, std::string> before_;
+};
+
+TEST_F(Shell, FoldersComeFromTheUsersSettings) {
+    EXPECT_EQ("T:\\home", Folder(ShellFolder::kProfile));
+    EXPECT_EQ("error 2", Folder(ShellFolder::kDocuments));
+    EXPECT_EQ("T:\\home\\Documents", Folder(ShellFolder::kDocuments, true));
+    EXPECT_EQ("T:\\home\\Documents", Folder(ShellFolder::kDocuments));
+    drive_.Put("home/.config/user-dirs.dirs",
+               "# made by hand\nXDG_DESKTOP_DIR=\"$HOME/Bureau/\"\n  XDG_DOCUMENTS_DIR=\"relative\"\n"
+               "XDG_PUBLICSHARE_DIR=\"" +
+                   drive_.Native("public") + "\"\nXDG_DESKTOP_DIRX=\"$HOME/x\"\n");
+    EXPECT_EQ("T:\\home\\Bureau", Folder(ShellFolder::kDesktop, true));
+    EXPECT_EQ("T:\\home\\Documents", Folder(ShellFolder::kDocuments));
+    EXPECT_EQ("T:\\public", Folder(ShellFolder::kCommonDocuments, true));
+    EXPECT_EQ("T:\\home\\.local\\share", Folder(ShellFolder::kLocalAppData, true));
+    Set("XDG_DATA_HOME", drive_.Native("data"));
+    EXPECT_EQ("T:\\data", Folder(ShellFolder::kLocalAppData, true));
+    Set("XDG_DATA_DIRS", drive_.Native("home") + ":/nowhere");
+    EXPECT_EQ("T:\\home", Folder(ShellFolder::kCommonAppData));
+    EXPECT_EQ("C:\\", Folder(ShellFolder::kWindows));
+}
+
+TEST_F(Shell, TrashKeepsItemsAndWhereTheyCameFrom) {
+    for (const char* content : {"first", "second"}) {
+        drive_.Put("A file.txt", content);
+        EXPECT_TRUE(ShellTrash(drive_.Name("a FILE.txt").c_str()));
+        EXPECT_FALSE(fs::exists(drive_.Native("A file.txt")));
+    }
+    const std::string trash = "home/.local/share/Trash/";
+    EXPECT_EQ("first", drive_.Get(trash + "files/A file.txt"));
+    EXPECT_EQ("second", drive_.Get(trash + "files/A file.txt.2"));
+    std::string path = drive_.Native() + "/A%20file.txt";
+    EXPECT_THAT(drive_.Get(trash + "info/A file.txt.2.trashinfo"),
+                ::testing::MatchesRegex("\\[Trash Info\\]\nPath=" + path + "\nDeletionDate=....-..-..T..:..:..\n"));
+    fs::create_directories(drive_.Native("folder/sub"));
+    EXPECT_TRUE(ShellTrash(drive_.Name("folder").c_str()));
+    EXPECT_TRUE(fs::exists(drive_.Native(trash + "files/folder/sub")));
+    EXPECT_FALSE(ShellTrash(drive_.Name("none").c_str()));
+    EXPECT_EQ(kErrorFileNotFound, LastError());
+}
+
+std::string Bytes(std::uint64_t value, int size) {
+    std::string bytes;
+    for (int i = 0; i < size; ++i) bytes += static_cast<char>(value >> (8 * i));
+    return bytes;
+}
+
+/* The header of a shortcut with these flags, and nothing else in it. */
+std::string Header(std::uint32_t flags) {
+    return std::string("\x4C\0\0\0\x01\x14\x02\0\0\0\0\0\xC0\0\0\0\0\0\0\x46", 20) + Bytes(flags, 4) +
+           std::string(52, '\0');
+}
+
+std::string Wide(std::string_view text) {
+    std::string wide;
+    for (char c : text) wide += {c, '\0'};
+    return wide;
+}
+
+TEST_F(Shell, ShortcutsTellTheirTarget) {
+    const std::string idList = Bytes(4, 2) + std::string(4, '\0');
+    std::string local = Bytes(28 + 17 + 6, 4) + Bytes(28, 4) + Bytes(1, 4) + Bytes(0, 4) + Bytes(28, 4) + Bytes(0, 4) +
+                        Bytes(45, 4) + std::string("C:\\folder\\\0\0\0\0\0\0\0", 17) + std::string("a.txt\0", 6);
+    std::string wide = Bytes(36 + 12, 4) + Bytes(36, 4) + Bytes(1, 4) + Bytes(0, 4) + Bytes(36, 4) + Bytes(0, 4) +
+                       Bytes(0, 4) + Bytes(38, 4) + Bytes(0, 4) + std::string("X\0", 2) + Wide("C:\\\xE9") +
+                       Wide(std::string(1, '\0'));
+    std::string network = Bytes(28 + 36 + 5, 4) + Bytes(28, 4) + Bytes(2, 4) + Bytes(0, 4) + Bytes(0, 4) +
+                          Bytes(28, 4) + Bytes(64, 4) + Bytes(36, 4) + Bytes(0, 4) + Bytes(20, 4) + Bytes(0, 4) +
+                          Bytes(0, 4) + std::string("\\\\server\\share\0", 16) + std::string("b\\c\0\0", 5);
+    std::string relative = Bytes(4, 2) + Wide("name") + Bytes(8, 2) + Wide("..\\b.txt");
+    std::string environment =
+        Bytes(788, 4) + Bytes(0xA0000001, 4) + std::string("%TESSEL_LNK%\\x") + std::string(766, '\0') + Bytes(0, 4);
+    setenv("TESSEL_LNK", "C:\\env", 1);
+    const std::pair<std::string, std::string> rows[] = {
+        {Header(3) + idList + local, "C:\\folder\\a.txt"}, {Header(2) + wide, "C:\\\xC3\xA9"},
+        {Header(2) + network, "\\\\server\\share\\b\\c"},  {Header(4 | 8 | 0x80) + relative, "T:\\..\\b.txt"},
+        {Header(0x200) + environment, "C:\\env\\x"},
+    };
+    std::string target;
+    for (const auto& [bytes, expected] : rows) {
+        drive_.Put("a.lnk", bytes);
+        EXPECT_TRUE(ShellReadShortcut(drive_.Name("A.LNK").c_str(), target));
+        EXPECT_EQ(expected, target);
+        for (std::size_t cut = 0; cut < bytes.size(); ++cut) ParseShortcut(bytes.substr(0, cut), "T:\\", target);
+    }
+    unsetenv("TESSEL_LNK");
+    for (const std::string& bad : {std::string("no shortcut"), std::string(), Header(0), Header(3) + idList,
+                                   Header(2) + std::string(28, '\xFF')}) {
+        EXPECT_FALSE(ParseShortcut(bad, "T:\\", target));
+        EXPECT_EQ(kErrorFileInvalid, LastError());
+    }
+    EXPECT_FALSE(ShellReadShortcut(drive_.Name("none.lnk").c_str(), target));
+    EXPECT_EQ(kErrorFileNotFound, LastError());
+}
+
+}  // namespace
+}  // namespace tessel::platform
