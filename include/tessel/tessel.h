@@ -63,6 +63,7 @@
 #include <tessel/strings/StringFmtScan.h>
 #include <tessel/strings/StringLStr.h>
 #include <tessel/strings/StringLStrArray.h>
+#include <tessel/strings/StringOutput.h>
 #include <tessel/strings/StringPStr.h>
 #include <tessel/strings/StringUtils.h>
 #include <tessel/strings/ovhandle.h>
