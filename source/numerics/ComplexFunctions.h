@@ -54,6 +54,44 @@ constexpr W kLog2E = static_cast<W>(0xB8AA3B295C17F0BCp-63L);
 template <class W>
 constexpr W kHalfPi = static_cast<W>(0xC90FDAA22168C235p-63L);
 
+// ---- exact steps ---------------------------------------------------------------------------------------------------
+
+/* The sum a + b and what rounding took from it. */
+template <class W>
+TwoParts<W> ExactSum(W a, W b) {
+    const W sum = a + b;
+    const W shifted = sum - a;
+    return {sum, (a - (sum - shifted)) + (b - shifted)};
+}
+
+/* The product a * b and what rounding took from it; the factors must not be near the largest value. */
+template <class W>
+TwoParts<W> ExactProduct(W a, W b) {
+    constexpr W kSplitter = static_cast<W>((uint64{1} << (std::numeric_limits<W>::digits + 1) / 2) + 1);
+    const auto upperHalf = [](W x) {
+        const W scaled = kSplitter * x;
+        return scaled - (scaled - x);
+    };
+    const W product = a * b;
+    const W aHigh = upperHalf(a);
+    const W bHigh = upperHalf(b);
+    const W aLow = a - aHigh;
+    const W bLow = b - bHigh;
+    return {product, ((aHigh * bHigh - product) + aHigh * bLow + aLow * bHigh) + aLow * bLow};
+}
+
+/* ab - cd, keeping what cancellation would lose. */
+template <class W>
+W DifferenceOfProducts(W a, W b, W c, W d) {
+    constexpr W kCancelled = 16;
+    const W first = a * b;
+    const W second = c * d;
+    const W difference = first - second;
+    if (std::fabs(difference) * kCancelled >= std::fabs(first) || !std::isfinite(difference)) return difference;
+    const W rest = ExactProduct(a, b).low - ExactProduct(c, d).low;
+    return std::isfinite(rest) ? difference + rest : difference;
+}
+
 // ---- arithmetic ----------------------------------------------------------------------------------------------------
 
 /* (ac - bd) + (ad + bc) i */
@@ -64,7 +102,7 @@ Complex<W> Multiply(const Complex<W>& x, const Complex<W>& y) {
     const W c = y.real();
     const W d = y.imag();
     if (b == 0 && d == 0) return {a * c, 0};
-    return {a * c - b * d, a * d + b * c};
+    return {DifferenceOfProducts(a, c, b, d), DifferenceOfProducts(a, d, -b, c)};
 }
 
 template <class W>
@@ -80,7 +118,7 @@ Complex<W> TextbookQuotient(const Complex<W>& x, const Complex<W>& y) {
     const W c = y.real();
     const W d = y.imag();
     const W divisor = c * c + d * d;
-    return {(a * c + b * d) / divisor, (b * c - a * d) / divisor};
+    return {DifferenceOfProducts(a, c, -b, d) / divisor, DifferenceOfProducts(b, c, a, d) / divisor};
 }
 
 template <class W>
@@ -172,32 +210,27 @@ Complex<W> Logx(const Complex<W>& base, const Complex<W>& z) {
     return Divide(std::log(z), std::log(base));
 }
 
-/* The sum a + b and what rounding took from it. */
-template <class W>
-TwoParts<W> ExactSum(W a, W b) {
-    const W sum = a + b;
-    const W shifted = sum - a;
-    return {sum, (a - (sum - shifted)) + (b - shifted)};
-}
-
 /* |1 + z|^2 - 1 = 2x + x^2 + y^2, without losing bits where the terms cancel. */
 template <class W>
 W SquareOfOnePlusLessOne(W x, W y) {
-    const W xx = x * x;
-    const W yy = y * y;
-    const TwoParts<W> first = ExactSum(2 * x, yy);
-    const TwoParts<W> second = ExactSum(first.high, xx);
-    return second.high + (first.low + second.low + std::fma(x, x, -xx) + std::fma(y, y, -yy));
+    const TwoParts<W> xx = ExactProduct(x, x);
+    const TwoParts<W> yy = ExactProduct(y, y);
+    const TwoParts<W> first = ExactSum(2 * x, yy.high);
+    const TwoParts<W> second = ExactSum(first.high, xx.high);
+    return second.high + (first.low + second.low + xx.low + yy.low);
 }
 
-/* ln(1 + z) */
+/* ln(1 + z), by |1 + z|^2 where that is not near 0 nor large. */
 template <class W>
 Complex<W> Lognp1(const Complex<W>& z) {
     constexpr W kNear = 2;
     const W x = z.real();
     const W y = z.imag();
-    if (!(std::fabs(x) < kNear && std::fabs(y) < kNear)) return std::log(Complex<W>(1 + x, y));
-    return {std::log1p(SquareOfOnePlusLessOne(x, y)) / 2, std::atan2(y, 1 + x)};
+    if (std::fabs(x) < kNear && std::fabs(y) < kNear) {
+        const W square = SquareOfOnePlusLessOne(x, y);
+        if (square > W{-0.5}) return {std::log1p(square) / 2, std::atan2(y, 1 + x)};
+    }
+    return std::log(Complex<W>(1 + x, y));
 }
 
 // ---- powers --------------------------------------------------------------------------------------------------------
@@ -217,10 +250,10 @@ Complex<W> Expm1(const Complex<W>& z) {
 template <class W>
 Complex<W> PowerOfBase(W magnitude, W y, const TwoParts<W>& lnBase) {
     if (y == 0) return {magnitude, y};
-    const W angle = y * lnBase.high;
-    const W rest = std::fma(y, lnBase.high, -angle) + y * lnBase.low;
-    const W cosine = std::cos(angle);
-    const W sine = std::sin(angle);
+    const TwoParts<W> angle = ExactProduct(y, lnBase.high);
+    const W rest = angle.low + y * lnBase.low;
+    const W cosine = std::cos(angle.high);
+    const W sine = std::sin(angle.high);
     return {magnitude * (cosine - rest * sine), magnitude * (sine + rest * cosine)};
 }
 

@@ -42,6 +42,16 @@ inline Extended Widen(Extended x) {
     return x;
 }
 
+/* A function of the library's that is not at its best for singles: those go through double. */
+template <class T, class Function>
+T Careful(T x, Function function) {
+    if constexpr (std::is_same_v<T, float>) {
+        return static_cast<float>(function(double{x}));
+    } else {
+        return function(x);
+    }
+}
+
 // ---- logarithms ----------------------------------------------------------------------------------------------------
 
 /* What a logarithm is where it has no value: -infinity at 0, else (negative or NaN) a NaN. */
@@ -57,7 +67,7 @@ T Logn(T x) {
 
 template <class T>
 T Log10(T x) {
-    return x > 0 ? std::log10(x) : LogOutside(x);
+    return x > 0 ? Careful(x, [](auto wide) { return std::log10(wide); }) : LogOutside(x);
 }
 
 template <class T>
@@ -134,7 +144,32 @@ T Sinc(T x) {
 /* Angle of the point (x, y). */
 template <class T>
 T Atan2(T x, T y) {
-    return std::atan2(y, x);
+    return Careful(x, [y](auto wide) { return std::atan2(decltype(wide){y}, wide); });
+}
+
+template <class T>
+T Sinh(T x) {
+    return Careful(x, [](auto wide) { return std::sinh(wide); });
+}
+
+template <class T>
+T Tanh(T x) {
+    return Careful(x, [](auto wide) { return std::tanh(wide); });
+}
+
+template <class T>
+T Asinh(T x) {
+    return Careful(x, [](auto wide) { return std::asinh(wide); });
+}
+
+template <class T>
+T Acosh(T x) {
+    return Careful(x, [](auto wide) { return std::acosh(wide); });
+}
+
+template <class T>
+T Atanh(T x) {
+    return Careful(x, [](auto wide) { return std::atanh(wide); });
 }
 
 // ---- arithmetic ----------------------------------------------------------------------------------------------------

@@ -157,12 +157,12 @@ REAL_UNARY(RTfAsin, std::asin)
 REAL_UNARY(RTfAcos, std::acos)
 REAL_UNARY(RTfAtan, std::atan)
 REAL_BINARY(RTfAtan2, real::Atan2)
-REAL_UNARY(RTfSinh, std::sinh)
+REAL_UNARY(RTfSinh, real::Sinh)
 REAL_UNARY(RTfCosh, std::cosh)
-REAL_UNARY(RTfTanh, std::tanh)
-REAL_UNARY(RTfAsinh, std::asinh)
-REAL_UNARY(RTfAcosh, std::acosh)
-REAL_UNARY(RTfAtanh, std::atanh)
+REAL_UNARY(RTfTanh, real::Tanh)
+REAL_UNARY(RTfAsinh, real::Asinh)
+REAL_UNARY(RTfAcosh, real::Acosh)
+REAL_UNARY(RTfAtanh, real::Atanh)
 
 // ---- one operand, two results ----
 
