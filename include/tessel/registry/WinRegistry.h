@@ -10,8 +10,8 @@
    for no value. A null or empty value name is the key's unnamed value. The uint8 forms take the same names and texts as
    bytes.
 
-   A key, and what was made from it, is for one thread at a time; release it after what was made from it. The roots
-   may be used by any thread to open and create keys. */
+   A key is for one thread at a time, and may be released before what was made from it. The roots may be used by any
+   thread to open and create keys. */
 #ifndef TESSEL_REGISTRY_WINREGISTRY_H
 #define TESSEL_REGISTRY_WINREGISTRY_H
 
@@ -105,7 +105,7 @@ public:
     virtual MgErr CreateSubKey(const uint8* name, IWinRegistryKey** key) = 0;
     virtual MgErr CreateSubKey(CStr name, IWinRegistryKey** key) = 0;
 
-    /// The caller releases *enumeration, before the key.
+    /// The caller releases *enumeration.
     virtual MgErr EnumerateSubKeys(IWinRegistryKeyEnumeration** enumeration) = 0;
     virtual MgErr EnumerateValues(IWinRegistryValueEnumeration** enumeration) = 0;
 
