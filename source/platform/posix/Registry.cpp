@@ -271,6 +271,16 @@ namespace {
 
 constexpr std::string_view kValueHeader = "REG ";
 
+/* As the name is spelled first: a name that fits costs no look at the folder. False with errno. */
+bool ReadValueFile(const std::string& folder, const std::string& diskName, std::string& text) {
+    std::string found;
+    if (ReadTextFile((folder + "/" + diskName).c_str(), text)) return true;
+    if (errno != ENOENT) return false;
+    if (FindInFolder(folder, diskName, found)) return ReadTextFile((folder + "/" + found).c_str(), text);
+    errno = ENOENT;
+    return false;
+}
+
 bool ParseValue(std::string& text, std::uint32_t& type) {
     if (text.compare(0, kValueHeader.size(), kValueHeader) != 0) return false;
     const char* start = text.data() + kValueHeader.size();
@@ -285,8 +295,7 @@ bool ParseValue(std::string& text, std::uint32_t& type) {
 
 ErrorNumber RegistryQueryValue(const RegistryKey* key, const char* name, std::uint32_t& type, std::string& data) {
     if (!key) return kErrorInvalidHandle;
-    data.clear();
-    if (!ReadTextFile(ItemIn(key->folder, ValueFileName(name)).c_str(), data)) return ErrnoNumber();
+    if (!ReadValueFile(key->folder, ValueFileName(name), data)) return ErrnoNumber();
     return ParseValue(data, type) ? kErrorSuccess : kErrorRegistryCorrupt;
 }
 
