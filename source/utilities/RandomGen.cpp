@@ -2,8 +2,6 @@
 #include <tessel/time/Millisecs.h>
 #include <tessel/utilities/RandomGen.h>
 
-#include <cmath>
-
 namespace {
 
 struct Seeds {
@@ -21,6 +19,12 @@ Seeds SeedsFrom(int32 first) {
     return {{first, second, (second * kFactor) & kMask}};
 }
 
+// Rounded down, without a call: the sums are small.
+double Floor(double x) {
+    const double whole = static_cast<int32>(x);
+    return whole > x ? whole - 1 : whole;
+}
+
 // Unsigned, so that seeds from outside do not overflow: the bits are those of the 32-bit signed product.
 int32 Step(int32 seed, uint32 factor, int32 modulus) {
     return static_cast<int32>(static_cast<uint32>(seed) * factor) % modulus;
@@ -33,7 +37,7 @@ Seeds Next(const Seeds& seeds) {
 double Number(const Seeds& seeds) {
     constexpr double kFirst = 1.0 / 30269, kSecond = 1.0 / 30307, kThird = 1.0 / 30323;
     double x = seeds.s[0] * kFirst + seeds.s[1] * kSecond + seeds.s[2] * kThird;
-    return x - std::floor(x);
+    return x - Floor(x);
 }
 
 }  // namespace
