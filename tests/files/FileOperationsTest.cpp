@@ -1,0 +1,331 @@
+#include <sys/stat.h>
+#include <tessel/base/OVExcept.h>
+#include <tessel/files/CachedPathFlavor.h>
+#include <tessel/files/FileManager.h>
+#include <tessel/memory/MemoryManager.h>
+#include <tessel/strings/StringCPStr.h>
+#include <unistd.h>
+
+#include <cstring>
+#include <filesystem>
+#include <string>
+
+#include "support/StartedFiles.h"
+
+namespace tessel::test {
+namespace {
+
+constexpr uint32 kSecondsFrom1904To1970 = 2082844800u;
+
+class FileOperationsTest : public testing::Test {
+protected:
+    MgErr Create(std::string_view name, int32 always, int32 mode = kFOpenReadWrite) {
+        PathRef path = started.On(name);
+        File_t* file = nullptr;
+        const MgErr err = FGenericCreate(&file, &path, 0, mode, kFDenyNone, 0, always);
+        if (!err) {
+            EXPECT_EQ(kNoErr, FMWrite(file, 3, nullptr, "new"));
+            EXPECT_EQ(kNoErr, FMClose(file));
+        }
+        return err;
+    }
+    int32 Exists(std::string_view name) {
+        PathRef path = started.On(name);
+        return FExists(&path);
+    }
+    template <class Operation, class... Names>
+    MgErr Do(Operation operation, Names... names) {
+        std::vector<PathRef> paths = {started.On(names)...};
+        if constexpr (sizeof...(names) == 1)
+            return operation(&paths[0]);
+        else
+            return operation(&paths[0], &paths[1]);
+    }
+    FInfo64Rec Info(std::string_view name) {
+        PathRef path = started.On(name);
+        FInfo64Rec info;
+        EXPECT_EQ(kNoErr, FGetInfo64(&path, &info, kFInfoAll));
+        return info;
+    }
+
+    StartedFiles started;
+};
+
+TEST_F(FileOperationsTest, CreatesNewFilesAndReplacesOnlyWhenAsked) {
+    EXPECT_EQ(kNoErr, Create("f", 0));
+    EXPECT_EQ("new", started.drive.Get("f"));
+    started.drive.Put("f", "an older and longer one");
+    EXPECT_EQ(kExistsErr, Create("f", 0));
+    EXPECT_EQ("an older and longer one", started.drive.Get("f"));
+    EXPECT_EQ(kNoErr, Create("f", 1, kFOpenWrite));
+    EXPECT_EQ("new", started.drive.Get("f"));
+    EXPECT_EQ(kArgErr, Create("f", 1, 8));
+    EXPECT_EQ(kNotFoundErr, Create("no/f", 0));
+}
+
+TEST_F(FileOperationsTest, CopiesAndMoves) {
+    started.drive.Put("a", "data");
+    EXPECT_EQ(kNoErr, Do(FCopy, "a", "b"));
+    EXPECT_EQ("data", started.drive.Get("b"));
+    started.drive.Put("b", "kept");
+    EXPECT_EQ(kExistsErr, Do(FCopy, "a", "b"));
+    EXPECT_EQ(kExistsErr, Do(FMove, "a", "b"));
+    EXPECT_EQ("kept", started.drive.Get("b"));
+    EXPECT_EQ(kNoErr, Do(FMove, "a", "c"));
+    EXPECT_EQ(0, Exists("a"));
+
+    started.drive.Put("big", std::string(20000, 'x'));
+    EXPECT_EQ(kNoErr, Do(FMoveInto, "big", "b"));
+    EXPECT_EQ(std::string(20000, 'x'), started.drive.Get("b"));
+    EXPECT_EQ(0, Exists("big"));
+    const ReportRecorder reports;
+    EXPECT_EQ(kNotFoundErr, Do(FMoveInto, "c", "nothing"));
+    EXPECT_TRUE(reports.Has(kDebugWarning, "FCopyIntoWin32 got error 7"));
+    EXPECT_EQ("data", started.drive.Get("c"));
+
+    PathRef volume = started.On("").Volume(), to = started.On("x");
+    EXPECT_EQ(kArgErr, FMove(&volume, &to));
+    EXPECT_EQ(kArgErr, FCopy(&volume, &to));
+}
+
+TEST_F(FileOperationsTest, MovingTheCurrentFolderGoesToItsParentFirst) {
+    const auto before = std::filesystem::current_path();
+    ASSERT_EQ(kNoErr, Do(FNewDirHier, "one/two"));
+    std::filesystem::current_path(started.drive.Native("one/two"));
+    EXPECT_EQ(kNoErr, Do(FMove, "one/two", "one/three"));
+    EXPECT_EQ(std::filesystem::canonical(started.drive.Native("one")), std::filesystem::current_path());
+    Path here = nullptr;
+    EXPECT_EQ(kNoErr, GetWorkingDir(&here));
+    EXPECT_TRUE(here->Equals(started.On("one"), PathRef::kExact));
+    PathRef::DisposePath(here);
+    std::filesystem::current_path(before);
+}
+
+TEST_F(FileOperationsTest, FoldersAreMadeAndRemoved) {
+    EXPECT_EQ(kNoErr, Do(FNewDirHier, "a/b/c"));
+    EXPECT_EQ(kNoErr, Do(FNewDirHier, "a/b/c"));
+    EXPECT_EQ(2, Exists("a/b/c"));
+    started.drive.Put("a/f", "");
+    EXPECT_EQ(1, Exists("A/F"));
+    EXPECT_EQ(kGenericErr, Do(FNewDirHier, "a/f"));
+    PathRef again = started.On("a/b");
+    EXPECT_EQ(kExistsErr, FNewDir(&again, 0));
+    EXPECT_EQ(kIOErr, Do(FRemove, "a"));
+    EXPECT_EQ(kNoErr, Do(FRemove, "a/b/c"));
+    EXPECT_EQ(kNoErr, Do(FRemove, "a/f"));
+    EXPECT_EQ(kNotFoundErr, Do(FRemove, "a/f"));
+    EXPECT_EQ(0, Exists("a/f"));
+    PathRef volumes(PathRef::kAbsolute), relative("a", PathRef::StringDisplay());
+    EXPECT_EQ(2, FExists(&volumes));
+    EXPECT_EQ(0, FExists(&relative));
+}
+
+TEST_F(FileOperationsTest, InformationIsWhatTheSystemSays) {
+    started.drive.Put("f.zzz", "12345");
+    ASSERT_EQ(kNoErr, Do(FNewDirHier, "d"));
+    for (const char* name : {"d/1", "d/2", "d/3"}) started.drive.Put(name, "");
+    struct stat native;
+    ASSERT_EQ(0, stat(started.drive.Native("f.zzz").c_str(), &native));
+
+    const FInfo64Rec file = Info("f.zzz");
+    EXPECT_EQ(0, std::memcmp(&file.type, "????", 4));
+    EXPECT_EQ(0, std::memcmp(&file.creator, "????", 4));
+    EXPECT_EQ(5, file.size);
+    EXPECT_EQ(0666, file.permissions);
+    EXPECT_EQ(0, file.folder);
+    const auto rounded = static_cast<uint32>(native.st_mtim.tv_sec + (native.st_mtim.tv_nsec >= 500000000));
+    EXPECT_EQ(rounded + kSecondsFrom1904To1970, file.modificationDate);
+
+    const FInfo64Rec folder = Info("d");
+    EXPECT_EQ(3, folder.size);
+    EXPECT_EQ(1, folder.folder);
+    EXPECT_EQ(0777, folder.permissions);
+
+    PathRef volumes(PathRef::kAbsolute), missing = started.On("missing");
+    FInfo64Rec info;
+    EXPECT_EQ(kNoErr, FGetInfo64(&volumes, &info, kFInfoAll));
+    EXPECT_EQ(1, info.folder);
+    EXPECT_EQ(2, info.size);
+    EXPECT_EQ(kNotFoundErr, FGetInfo64(&missing, &info, kFInfoAll));
+}
+
+TEST_F(FileOperationsTest, ASizeThat32BitsCannotHoldIsReported) {
+    started.drive.Put("f", "");
+    ASSERT_EQ(0, truncate(started.drive.Native("f").c_str(), 3000000000));
+    PathRef path = started.On("f");
+    FInfoRec info;
+    const ReportRecorder reports;
+    EXPECT_EQ(kNoErr, FGetInfo(&path, &info));
+    EXPECT_EQ(static_cast<int32>(3000000000u), info.size);
+    EXPECT_TRUE(reports.Has(kDebugWarning, "Converting 64-bit to 32-bit, but size is too big! size=3000000000"));
+}
+
+TEST_F(FileOperationsTest, DatesAndPermissionsAreSet) {
+    started.drive.Put("f", "");
+    FInfo64Rec info = Info("f");
+    info.modificationDate = kSecondsFrom1904To1970 + 1000000000;
+    info.creationDate = info.modificationDate - 1;
+    info.permissions = 0444;
+    PathRef path = started.On("f");
+    EXPECT_EQ(kNoErr, FSetInfo64(&path, &info));
+    struct stat native;
+    ASSERT_EQ(0, stat(started.drive.Native("f").c_str(), &native));
+    EXPECT_EQ(1000000000, native.st_mtim.tv_sec);
+    EXPECT_EQ(0444u, native.st_mode & 0777);
+    uint32 seconds = 0;
+    int32 readOnly = 0;
+    EXPECT_EQ(kNoErr, FMGetModDate(&path, nullptr, &seconds, &readOnly));
+    EXPECT_EQ(info.modificationDate, seconds);
+    EXPECT_EQ(1, readOnly);
+    EXPECT_EQ(0444, Info("f").permissions);
+
+    EXPECT_EQ(kNoErr, path.MakeWriteable(PathRef::kItemOnly));
+    EXPECT_EQ(0666, Info("f").permissions);
+    EXPECT_EQ(kUnsupportedErr, path.MakeWriteable(PathRef::kItemAndContents));
+    info.folder = 1;
+    EXPECT_EQ(kNoErr, FSetInfo64(&path, &info));
+    EXPECT_EQ(0666, Info("f").permissions);
+    PathRef missing = started.On("missing");
+    int32 permissions = 0644;
+    EXPECT_EQ(kNotFoundErr, FSetAccessRights(&missing, nullptr, nullptr, &permissions));
+    EXPECT_EQ(kNoErr, FSetAccessRights(&missing, nullptr, nullptr, nullptr));
+    int64 ticks = 0;
+    EXPECT_EQ(95616288010000000, SecsToWin32FileTime(1, &ticks));
+    EXPECT_EQ(95616288010000000, ticks);
+}
+
+TEST_F(FileOperationsTest, SpecialNames) {
+    started.drive.Put(".hidden", "");
+    started.drive.Put("x.LNK", "");
+    started.drive.Put(".lnk", "");
+    int32 flag = 7;
+    const auto ask = [&](MgErr (*query)(Path, int32*), const char* name) {
+        PathRef path = started.On(name);
+        EXPECT_EQ(kNoErr, query(&path, &flag)) << name;
+        return flag;
+    };
+    EXPECT_EQ(1, ask(FIsHiddenFile, ".hidden"));
+    EXPECT_EQ(0, ask(FIsHiddenFile, "x.LNK"));
+    EXPECT_EQ(1, ask(FIsShortcut, "x.LNK"));
+    EXPECT_EQ(0, ask(FIsShortcut, ".lnk"));
+    EXPECT_EQ(0, ask(FIsShortcut, "missing.lnk"));
+    const ReportRecorder reports;
+    PathRef relative("a", PathRef::StringDisplay()), file = started.On("x.LNK");
+    EXPECT_EQ(kArgErr, FIsHiddenFile(&relative, &flag));
+    EXPECT_EQ(kArgErr, FIsShortcut(&file, nullptr));
+    EXPECT_EQ((std::vector<std::string>{"FIsHiddenFile: relative path passed in!",
+                                        "FIsShortcut: NULL isShortcut passed in!"}),
+              reports.Texts());
+
+    Str255 name = {5, 'a', '.', 'b', '.', 'c'};
+    EXPECT_EQ(2, PStrStripRezExt(name, 0));
+    EXPECT_EQ(3, name[0]);
+    EXPECT_EQ(0, PStrStripRezExt(name, TESSEL_FOURCC('t', 'e', 's', 't')));
+}
+
+TEST_F(FileOperationsTest, CaseIsCorrectedAndRemembered) {
+    ASSERT_EQ(kNoErr, Do(FNewDirHier, "Folder"));
+    started.drive.Put("Folder/File.txt", "");
+    PathRef path = started.On("fOLDER/fILE.TXT");
+    EXPECT_TRUE(path.GetCorrectedCase(100).Equals(started.On("Folder/File.txt"), PathRef::kExact));
+    std::filesystem::remove_all(started.drive.Native("Folder"));
+    EXPECT_TRUE(path.GetCorrectedCase(100).Equals(started.On("Folder/File.txt"), PathRef::kExact));
+    path.FlushCache();
+    EXPECT_FALSE(path.GetCorrectedCase(100).Equals(started.On("Folder/File.txt"), PathRef::kExact));
+
+    started.drive.Put("Mixed", "");
+    PathRef lower = started.On("mixed"), missing = started.On("none");
+    EXPECT_EQ(kNoErr, Win32GetLongFileName(&lower));
+    EXPECT_TRUE(lower.Equals(started.On("Mixed"), PathRef::kExact));
+    EXPECT_EQ(kNotFoundErr, Win32GetLongFileName(&missing));
+}
+
+TEST_F(FileOperationsTest, PathsAskTheDisk) {
+    started.drive.Put("f", "12345");
+    PathRef file = started.On("f"), folder = started.On("");
+    EXPECT_TRUE(file.IsAFile() && folder.IsADirectory() && !started.On("g").Exists());
+    EXPECT_EQ(5u, file.Size(PathRef::kLogicalSize));
+    EXPECT_EQ(1u, folder.DirectoryItemCount());
+    EXPECT_GE(folder.VolumeSize(), folder.VolumeFree());
+    EXPECT_GT(folder.VolumeFree(), 0.0);
+    const auto thrown = [](auto call) {
+        try {
+            call();
+        } catch (const OVExcept& error) {
+            return std::to_string(error.Code()) + " " + error.Detail();
+        }
+        return std::string();
+    };
+    EXPECT_EQ("53 PathRef::Size: Only logical size is supported at the moment",
+              thrown([&] { file.Size(static_cast<PathRef::SizeType>(2)); }));
+    EXPECT_EQ("1 PathRef::Size: Can't get the size of a folder, get DirectoryItemCount",
+              thrown([&] { folder.Size(PathRef::kLogicalSize); }));
+    // What the host says about the file counts more than the disk.
+    file.Cache(kPathFlavorKey, new CachedPathFlavor(60000, PathRef::CachedItem::kDependsOnFile, false, false));
+    EXPECT_EQ("7 PathRef::Size: Does not exist", thrown([&] { file.Size(PathRef::kLogicalSize); }));
+
+    PathRef copy = started.On("copy"), moved = started.On("moved"), temporary = folder;
+    EXPECT_EQ(kNoErr, file.CopyFileTo(copy, PathRef::kDontResolve));
+    EXPECT_EQ(kNoErr, copy.MoveFileTo(moved, PathRef::kDontResolve));
+    EXPECT_EQ("12345", started.drive.Get("moved"));
+    EXPECT_EQ(kNoErr, moved.RemoveFile(PathRef::kResolveShortcuts));
+    EXPECT_FALSE(moved.Exists());
+    temporary.AppendTemporaryName("tmp", "a", "z");
+    EXPECT_TRUE(PathRef::NameWildCardMatch(temporary.Name(), "a*z.tmp")) << temporary.Name();
+}
+
+TEST_F(FileOperationsTest, VolumesAndLists) {
+    CPStrHandle names = reinterpret_cast<CPStrHandle>(DSNewHClr(4));
+    UHandle kinds = DSNewHandle(0);
+    ASSERT_EQ(kNoErr, FListDesktop(names, kinds));
+    ASSERT_EQ(2, (*names)->count);
+    EXPECT_EQ(0, std::memcmp((*names)->bytes, "\1C\1T", 4));
+    EXPECT_EQ(2u, reinterpret_cast<VolKindRec*>(*kinds)->flags);
+
+    ASSERT_EQ(kNoErr, CPStrClear(names));
+    ASSERT_EQ(kNoErr, DSSetHandleSize(kinds, 3 * sizeof(VolKindRec)));
+    const char* const kUnsorted[] = {"\1b", "\2AA", "\1C"};
+    for (uint32 i = 0; i < 3; ++i) {
+        ASSERT_EQ(kNoErr, CPStrInsert(names, reinterpret_cast<ConstPStr>(kUnsorted[i]), static_cast<int32>(i)));
+        reinterpret_cast<VolKindRec*>(*kinds)[i] = {i, i};
+    }
+    EXPECT_EQ(kNoErr, LSort(names, kinds));
+    EXPECT_EQ(0, std::memcmp((*names)->bytes, "\2AA\1b\1C", 7));
+    EXPECT_EQ(1u, reinterpret_cast<VolKindRec*>(*kinds)[0].flags);
+    DSDisposeHandle(reinterpret_cast<UHandle>(names));
+    DSDisposeHandle(kinds);
+
+    PathRef odd(PathRef::kAbsolute), file = started.On("f");
+    odd.Append("CC");
+    VolInfoRec info;
+    EXPECT_EQ(kArgErr, FGetVolInfo(&odd, &info));
+    EXPECT_EQ(kNoErr, FGetVolInfo(&file, &info));
+    Path volume = nullptr;
+    EXPECT_EQ(kNoErr, FMGetVolPath(&file, &volume));
+    EXPECT_TRUE(volume->Equals(started.On("").Volume(), PathRef::kExact));
+    PathRef::DisposePath(volume);
+}
+
+TEST_F(FileOperationsTest, NamesOfTheHostAndBack) {
+    started.drive.Put("Some File", "");
+    Path path = nullptr;
+    ASSERT_EQ(kNoErr, NativeToPath(started.drive.Native("Some File").c_str(), &path));
+    EXPECT_TRUE(path->Equals(started.On("Some File"), PathRef::kExact));
+    char native[512];
+    EXPECT_EQ(kNoErr, PathToNative(path, native, sizeof native));
+    EXPECT_EQ(started.drive.Native("Some File"), native);
+    EXPECT_EQ(kArgErr, PathToNative(path, native, 5));
+    PathRef::DisposePath(path);
+
+    Path program = nullptr;
+    const auto before = std::filesystem::current_path();
+    EXPECT_EQ(kArgErr, NativeToPath("", &program));
+    std::filesystem::current_path(started.drive.Native());
+    EXPECT_EQ(kNoErr, NativeToPath("Some File", &program));
+    EXPECT_TRUE(program->Equals(started.On("Some File"), PathRef::kExact));
+    PathRef::DisposePath(program);
+    std::filesystem::current_path(before);
+}
+
+}  // namespace
+}  // namespace tessel::test

@@ -1,0 +1,33 @@
+// The library as far as files and resource files need it, with a scratch drive T:. Leaks are failures.
+#ifndef TESSEL_TESTS_SUPPORT_STARTEDFILES_H
+#define TESSEL_TESTS_SUPPORT_STARTEDFILES_H
+
+#include <tessel/paths/PathRef.h>
+
+#include "files/Service.h"
+#include "resources/Service.h"
+#include "support/ScratchDrive.h"
+#include "support/StartedPaths.h"
+
+namespace tessel::test {
+
+class StartedFiles : public StartedPaths {
+public:
+    StartedFiles() {
+        EXPECT_EQ(kNoErr, FileManagerStart());
+        EXPECT_EQ(kNoErr, ResourceManagerStart());
+    }
+    ~StartedFiles() {
+        ResourceManagerStop();
+        FileManagerStop();
+    }
+
+    // Something on the scratch drive, "sub/file".
+    PathRef On(std::string_view inside) const { return PathRef(drive.Name(inside), PathRef::StringDisplay()); }
+
+    ScratchDrive drive;
+};
+
+}  // namespace tessel::test
+
+#endif
