@@ -2,8 +2,10 @@
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/AppPath.h>
 #include <tessel/files/FileManager.h>
+#include <tessel/files/shortcut.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
+#include <tessel/paths/PathTextFormat.h>
 #include <tessel/strings/StringPStr.h>
 
 #include <cstring>
@@ -59,9 +61,10 @@ Path FResolvePath(Path out, Path path) {
     return GuardedOr<Path>(nullptr, [&]() -> Path {
         if (!path) return nullptr;
         if (FDepth(path) == 0) return FEmptyPath(out);
-        PlatformName name;
-        if (name.Make(path, true)) return nullptr;
-        return NameToPath(name.Text(), &out) ? nullptr : out;
+        char name[kPlatformNameSize];
+        if (MakeDOSPathName(path, name, 0)) return nullptr;
+        Win32ResolveAllShortCuts(name);
+        return NameToPath(name, &out) ? nullptr : out;
     });
 }
 

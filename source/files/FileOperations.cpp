@@ -9,6 +9,7 @@
 #include "files/FileSupport.h"
 #include "platform/FileSystem.h"
 #include "platform/LastError.h"
+#include "platform/Shell.h"
 
 namespace tessel {
 
@@ -217,5 +218,15 @@ MgErr FRemove(Path path) {
         PlatformName name;
         if (const MgErr err = name.Make(path, false)) return err;
         return RemoveItem(path, name.Text());
+    });
+}
+
+MgErr FRemoveToRecycle(Path path, int32) {
+    return Guarded([&]() -> MgErr {
+        if (!FIsAbsPath(path)) return kArgErr;
+        FlushPathCache(path);
+        PlatformName name;
+        if (const MgErr err = name.Make(path, false)) return err;
+        return ErrUnless(platform::ShellTrash(name.Text()));
     });
 }
