@@ -68,6 +68,21 @@ void AppendWord(std::string& out, int32 value, const Endianizer& endianizer) {
     out.append(bytes, sizeof bytes);
 }
 
+// Where names are UTF-8 already they are taken as they are, so that also one that is no good UTF-8 comes back the same.
+void ConvertToUtf8(std::string_view name, std::string& utf8) {
+    if (platform::ActiveCodePage().utf8)
+        utf8 = name;
+    else
+        platform::ToUtf8(name, utf8);
+}
+
+void ConvertFromUtf8(std::string_view utf8, std::string& name) {
+    if (platform::ActiveCodePage().utf8)
+        name = utf8;
+    else
+        platform::FromUtf8(utf8, name);
+}
+
 MgErr AppendByteNames(std::string& out, const PathItemList& names) {
     for (int32 i = 0; i < names.Count(); ++i) {
         const std::string& name = names[i].Name();
@@ -80,7 +95,7 @@ MgErr AppendByteNames(std::string& out, const PathItemList& names) {
 MgErr AppendWordNames(std::string& out, const PathItemList& names, const Endianizer& endianizer) {
     std::string utf8;
     for (int32 i = 0; i < names.Count(); ++i) {
-        platform::ToUtf8(names[i].Name(), utf8);
+        ConvertToUtf8(names[i].Name(), utf8);
         if (utf8.size() > kLongestWordName) return kArgErr;
         AppendWord(out, static_cast<int32>(utf8.size()), endianizer);
         out.append(utf8);
@@ -163,7 +178,7 @@ PathRef ReadPTH1(InputBuf& buffer, uint32 bodySize, const Endianizer& endianizer
         if (length > 0) {
             const char* bytes =
                 Take(buffer, static_cast<uint32>(length), "PathRef unflatten constructor, name element data read");
-            platform::FromUtf8(std::string_view(bytes, static_cast<size_t>(length)), name);
+            ConvertFromUtf8(std::string_view(bytes, static_cast<size_t>(length)), name);
         }
         path.Append(name);
     }

@@ -103,6 +103,8 @@ TEST_F(PathFlatten, LongNamesAndTheSettingChooseTheFormat) {
 }
 
 TEST_F(PathFlatten, NamesAreUtf8WhateverTheCodePage) {
+    const PathRef badUtf8 = Abs({"C", "a\xFF\xC3"});  // as a disk may have it
+    EXPECT_EQ(Show(badUtf8), Unflattened(Flattened(badUtf8)));
     ASSERT_TRUE(platform::SetCodePage(1252));
     const std::string bytes =
         "PTH1\0\0\0\x0A"
