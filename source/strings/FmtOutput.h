@@ -11,6 +11,13 @@
 
 namespace tessel {
 
+/* GCC 12 warns of the branches that a constant length does not take, in instrumented builds. */
+#if defined(__GNUC__) && !defined(__clang__)
+#    pragma GCC diagnostic push
+#    pragma GCC diagnostic ignored "-Warray-bounds"
+#    pragma GCC diagnostic ignored "-Wstringop-overread"
+#endif
+
 /* Copies and fills of a few bytes without a call, which would cost more than the work. */
 inline void CopyFew(char* dst, const char* src, size_t n) {
     if (n > 16) {
@@ -52,6 +59,10 @@ inline void FillFew(char* dst, char byte, size_t n) {
         if (n > 1) std::memcpy(dst + n - 2, &word, 2);
     }
 }
+
+#if defined(__GNUC__) && !defined(__clang__)
+#    pragma GCC diagnostic pop
+#endif
 
 class FmtOutput {
 public:
