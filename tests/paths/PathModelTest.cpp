@@ -190,7 +190,7 @@ TEST_F(PathModel, Extensions) {
         UHandle handle = DSNewHandle(static_cast<uint32>(4 + entries.size() * sizeof(PathRef::ExtensionEntry)));
         const int32 count = static_cast<int32>(entries.size());
         std::memcpy(*handle, &count, 4);
-        std::memcpy(*handle + 4, std::data(entries), entries.size() * sizeof(PathRef::ExtensionEntry));
+        std::copy(entries.begin(), entries.end(), reinterpret_cast<PathRef::ExtensionEntry*>(*handle + 4));
         return (const PathRef::ExtensionList**)handle;
     };
     PathRef::SetExtensionList(list({{kText, "txt"}}), list({{kData, "dat"}, {kData, "txt"}}));
