@@ -95,12 +95,12 @@ void FmtRenderer::RenderOther(FmtItem item, const FmtSpec& spec, FmtValue value)
         case FmtItem::kCharacter:
             return RenderCharacter(spec, word);
         case FmtItem::kNamedPoint:
-            output_.Put("hv", 2);
+            PutWord("hv");
             [[fallthrough]];
         case FmtItem::kPoint:
             return RenderPoint(static_cast<uint32>(word));
         case FmtItem::kNamedRectangle:
-            output_.Put("tlbr", 4);
+            PutWord("tlbr");
             [[fallthrough]];
         case FmtItem::kRectangle:
             return RenderRectangle(static_cast<const int16*>(value.pointer));
@@ -116,7 +116,7 @@ void FmtRenderer::RenderOther(FmtItem item, const FmtSpec& spec, FmtValue value)
 void FmtRenderer::RenderNumber(FmtItem item, const FmtSpec& spec, FmtValue value) {
     FmtSpec shape = spec;
     if (item == FmtItem::kAddress) {
-        output_.Put("0x", 2);
+        PutWord("0x");
         shape.left = false;
         shape.pad = '0';
         shape.width = kAddressDigits;
@@ -204,12 +204,8 @@ void FmtRenderer::RenderPoint(uint32 point) {
 }
 
 void FmtRenderer::RenderRectangle(const int16* rectangle) {
-    output_.Put('(');
     for (int i = 0; i < 4; ++i) {
-        if (i > 0) {
-            output_.Put(',');
-            output_.Put(' ');
-        }
+        PutWord(i == 0 ? "(" : ", ");
         PutShort(rectangle[i]);
     }
     output_.Put(')');

@@ -74,6 +74,9 @@ private:
     void RenderPoint(uint32 point);
     void RenderRectangle(const int16* rectangle);
     void PutNumber(const FmtSpec& spec, const char* text, size_t length);
+    void PutWord(const char* word) {
+        while (*word) output_.Put(*word++);
+    }
     void PutShort(int16 value) { output_.PutDecimal(Magnitude(value), value < 0); }
 
     FmtOutput& output_;

@@ -27,8 +27,7 @@ TEST(StringCStr, ComparesByTheFirstDifference) {
         {"abC", "ab", 1, 1},
         {"", "", 0, 0},
         {"\xFF", "\x01", 254, 254},
-        {"a long text with its DIFFERENCE far on", "a long text with its difference far of", 'D' - 'd', 'n' - 'f'},
-    };
+        {"a long text with its DIFFERENCE far on", "a long text with its difference far of", 'D' - 'd', 'n' - 'f'}};
     for (const auto& c : kCases) {
         EXPECT_EQ(c.exact, StrCmp(c.a, c.b)) << c.a << " " << c.b;
         EXPECT_EQ(c.noCase, StrCaseCmp(c.a, c.b)) << c.a << " " << c.b;
@@ -99,14 +98,9 @@ TEST(StringCStr, MapsCaseWithTheCodePage) {
         EXPECT_TRUE(IsLower(0xE4));
         EXPECT_FALSE(IsUpper(0xE4));
         EXPECT_EQ(0, StrCaseCmp("\xC4rger", "\xE4RGER"));
-        char text[] =
-            "gr\xFC\xDF"
-            "e";
+        char text[] = "gr\xFC\xDFn";
         StrToUpper(text, 4);
-        EXPECT_STREQ(
-            "GR\xDC\xDF"
-            "e",
-            text);
+        EXPECT_STREQ("GR\xDC\xDFn", text);
     }
     const CodePage page(932);
     char text[] = "a\x83\x61z";  // the second byte of the katakana looks like a letter
@@ -120,9 +114,7 @@ TEST(StringCStr, StepsOverWholeCharacters) {
     ReportRecorder reports;
     {
         const CodePage page(932);
-        CStr text =
-            "a\x83\x5C"
-            "b";
+        CStr text = "a\x83\x5Cz";
         EXPECT_EQ(1, StrNextChar(text, 0));
         EXPECT_EQ(3, StrNextChar(text, 1));
         EXPECT_EQ(4, StrNextChar(text, 3));

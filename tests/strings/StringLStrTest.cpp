@@ -1,4 +1,5 @@
 #include <tessel/strings/StringLStr.h>
+#include <tessel/strings/StringPStr.h>
 
 #include <cstring>
 
@@ -9,25 +10,26 @@ using namespace tessel::test;
 
 namespace {
 
+// PStrs compare by the same rules.
 TEST(StringLStr, ComparesWithNullAsEmpty) {
     const struct {
         CStr a;  // null: a null pointer
         CStr b;
         int32 exact;
         int32 noCase;
-    } kCases[] = {
-        {nullptr, "", 0, 0},
-        {"", nullptr, 0, 0},
-        {nullptr, nullptr, 0, 0},
-        {nullptr, "a", -1, -1},
-        {"abc", nullptr, 1, 1},
-        {"ab", "abc", -1, -1},
-        {"abcde", "ab", 3, 3},
-        {"B", "a", 'B' - 'a', 1},
-        {"same", "same", 0, 0},
-        {"SAME", "same", 'S' - 's', 0},
-        {"long enough for words A", "long enough for words a", 'A' - 'a', 0},
-    };
+    } kCases[] = {{nullptr, "", 0, 0},
+                  {"", nullptr, 0, 0},
+                  {nullptr, nullptr, 0, 0},
+                  {nullptr, "a", -1, -1},
+                  {"abc", nullptr, 1, 1},
+                  {"ab", "abc", -1, -1},
+                  {"abcde", "ab", 3, 3},
+                  {"ABC", "abd", 'A' - 'a', -1},
+                  {"\xFF", "\x01", 254, 254},
+                  {"B", "a", 'B' - 'a', 1},
+                  {"same", "same", 0, 0},
+                  {"SAME", "same", 'S' - 's', 0},
+                  {"long enough for words A", "long enough for words a", 'A' - 'a', 0}};
     for (const auto& c : kCases) {
         uint8 aRoom[64];
         uint8 bRoom[64];
@@ -41,8 +43,16 @@ TEST(StringLStr, ComparesWithNullAsEmpty) {
         if (!c.a || !c.b) continue;
         EXPECT_EQ(c.exact, PtrLenStrCmp(a->bytes, a->count, b->bytes, b->count));
         EXPECT_EQ(c.noCase, PtrLenStrCaseCmp(a->bytes, a->count, b->bytes, b->count));
-        EXPECT_EQ(c.exact, PLStrCmp(P(c.a), b));
-        EXPECT_EQ(c.noCase, PLStrCaseCmp(P(c.a), b));
+        P pa(c.a);
+        P pb(c.b);
+        ConstPStr aText = pa;
+        ConstPStr bText = pb;
+        EXPECT_EQ(c.exact, PLStrCmp(pa, b));
+        EXPECT_EQ(c.noCase, PLStrCaseCmp(pa, b));
+        EXPECT_EQ(c.exact, PPStrCmp(&aText, &bText));
+        EXPECT_EQ(c.noCase, PPStrCaseCmp(&aText, &bText));
+        EXPECT_EQ(c.exact == 0, PPStrEqual(&aText, &bText));
+        EXPECT_EQ(c.noCase == 0, PPStrCaseEqual(&aText, &bText));
     }
     EXPECT_EQ(-3, LHStrCmp(nullptr, L("abc")));
     EXPECT_EQ(2, LHStrCaseCmp(L("ab"), nullptr));

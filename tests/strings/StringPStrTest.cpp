@@ -49,32 +49,6 @@ TEST(StringPStr, Terminates) {
     EXPECT_EQ('x', text[256]);
 }
 
-TEST(StringPStr, Compares) {
-    const struct {
-        CStr a;
-        CStr b;
-        int32 exact;
-        int32 noCase;
-    } kCases[] = {
-        {"abc", "abc", 0, 0}, {"ABC", "abd", 'A' - 'a', -1}, {"ab", "abcd", -2, -2}, {"", "", 0, 0},
-        {"a", "", 1, 1},      {"\xFF", "\x01", 254, 254},    {"ab", "AB", 32, 0},
-    };
-    for (const auto& c : kCases) {
-        P a(c.a);
-        P b(c.b);
-        ConstPStr aText = a;
-        ConstPStr bText = b;
-        EXPECT_EQ(c.exact, PStrCmp(a, b)) << c.a << " " << c.b;
-        EXPECT_EQ(c.noCase, PStrCaseCmp(a, b)) << c.a << " " << c.b;
-        EXPECT_EQ(c.exact == 0, PStrEqual(a, b));
-        EXPECT_EQ(c.noCase == 0, PStrCaseEqual(a, b));
-        EXPECT_EQ(c.exact, PPStrCmp(&aText, &bText));
-        EXPECT_EQ(c.noCase, PPStrCaseCmp(&aText, &bText));
-        EXPECT_EQ(c.exact == 0, PPStrEqual(&aText, &bText));
-        EXPECT_EQ(c.noCase == 0, PPStrCaseEqual(&aText, &bText));
-    }
-}
-
 TEST(StringPStr, Searches) {
     P text("one Two one");
     EXPECT_EQ(3, PStrInPStr(text, 0, P("ONE")));
@@ -97,10 +71,9 @@ TEST(StringPStr, SplitsAtTheFirstUnescapedCharacter) {
         bool split;
         CStr left;
         CStr right;
-    } kCases[] = {
-        {"a\\,b,c", true, "a,b", "c"}, {"a,b,c", true, "a", "b,c"}, {",b", true, "", "b"}, {"a,", true, "a", ""},
-        {"abc", false, "abc", ""},     {"a\\,b", false, "a,b", ""}, {"", false, "", ""},   {"a\\b,", true, "a\\b", ""},
-    };
+    } kCases[] = {{"a\\,b,c", true, "a,b", "c"}, {"a,b,c", true, "a", "b,c"}, {",b", true, "", "b"},
+                  {"a,", true, "a", ""},         {"abc", false, "abc", ""},   {"a\\,b", false, "a,b", ""},
+                  {"", false, "", ""},           {"a\\b,", true, "a\\b", ""}};
     for (const auto& c : kCases) {
         P left("junk");
         P right("junk");
