@@ -57,7 +57,7 @@ bool IsValid(const CookieEntry* entry, MagicCookie cookie) {
 }
 
 // The entry of a valid cookie, or null.
-CookieEntry* Find(const JarRecord& record, MagicCookie cookie) {
+inline __attribute__((always_inline)) CookieEntry* Find(const JarRecord& record, MagicCookie cookie) {
     CookieEntry* entry = record.tree->Find(IndexOf(cookie));
     return entry && IsValid(entry, cookie) ? entry : nullptr;
 }
@@ -259,17 +259,24 @@ MgErr MCSetCookieInfo(MagicCookieJar jar, MagicCookie cookie, const void* info) 
     return kNoErr;
 }
 
+namespace {
+
+__attribute__((noinline)) MgErr CopyInfoUnderMutex(JarRecord& record, CookieEntry* entry, MagicCookie cookie,
+                                                   void* infoOut) {
+    ThMutexHolder hold(record.mutex);
+    if (!IsValid(entry, cookie)) return kArgErr;
+    LoadInfo(record, entry, infoOut);
+    return kNoErr;
+}
+
+}  // namespace
+
 MgErr MCGetCookieInfo(MagicCookieJar jar, MagicCookie cookie, void* infoOut) {
     if (!jar || !infoOut) return kArgErr;
     JarRecord& record = Record(jar);
     CookieEntry* entry = Find(record, cookie);
     if (!entry) return kArgErr;
-    if (record.infoSize != kWord) {
-        ThMutexHolder hold(record.mutex);
-        if (!IsValid(entry, cookie)) return kArgErr;
-        LoadInfo(record, entry, infoOut);
-        return kNoErr;
-    }
+    if (record.infoSize != kWord) return CopyInfoUnderMutex(record, entry, cookie, infoOut);
     void* word = LoadWord(entry);
     bool valid = IsValid(entry, cookie);  // still, so the word was the cookie's
     if (!valid) word = nullptr;

@@ -9,36 +9,16 @@ namespace {
 
 constexpr uint32 kPtrHeader = 16;  // unused 4, size 4, guard 8
 
-// To a power of two.
-uint64 RoundUp(uint64 value, uint64 power) {
-    return (value + power - 1) & ~(power - 1);
-}
-
 }  // namespace
 
 Alignment AlignmentFor(uint32 alignment, uint32 offset) {
     constexpr uint32 kMost = 32768;
     uint32 power = 8;
     while (power < alignment && power < kMost) power *= 2;
-    uint64 rounded = RoundUp(offset, 4);
+    uint64 rounded = (uint64{offset} + 3) & ~uint64{3};
     if (rounded > UINT16_MAX) rounded %= power;  // places the data as well
     if (power == 8) rounded &= 4;
     return {static_cast<uint16>(power), static_cast<uint16>(rounded)};
-}
-
-uint32 AlignedBlockSize(uint32 size, Alignment alignment, uint32 guards) {
-    uint64 bytes = uint64{size} + guards + sizeof(HandleHeader) + sizeof(Alignment);
-    if (alignment.alignment > 8) bytes += ((alignment.offset & 4) ? 0 : 4) + alignment.alignment + alignment.offset;
-    bytes = RoundUp(bytes, alignment.alignment);
-    return bytes <= UINT32_MAX ? static_cast<uint32>(bytes) : 0;
-}
-
-UPtr PlaceData(void* block, Alignment alignment) {
-    uintptr_t data = reinterpret_cast<uintptr_t>(block) + sizeof(HandleHeader) + GuardRoom(GuardKind::kHandle);
-    if (!alignment.IsDefault())
-        data = static_cast<uintptr_t>(RoundUp(data + sizeof(Alignment) + alignment.offset, alignment.alignment)) -
-               alignment.offset;
-    return reinterpret_cast<UPtr>(data);
 }
 
 UPtr NewGuardedBlock(size_t size, GuardKind kind) {

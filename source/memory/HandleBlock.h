@@ -28,6 +28,9 @@ struct Alignment {
 
     bool operator==(const Alignment&) const = default;
     bool IsDefault() const { return alignment == 8 && offset == 0; }
+    bool Suits(const void* data) const {
+        return ((reinterpret_cast<uintptr_t>(data) + offset) & (alignment - 1u)) == 0;
+    }
 };
 static_assert(sizeof(Alignment) == 4);
 
@@ -42,44 +45,64 @@ inline Alignment AlignmentForSize(uint32 size) {
 // The alignment that a caller asked for, made good.
 Alignment AlignmentFor(uint32 alignment, uint32 offset);
 
-// Heap bytes for a handle; 0 when they do not fit in 32 bits.
-uint32 AlignedBlockSize(uint32 size, Alignment alignment, uint32 guards);
-inline uint32 BlockSize(uint32 size, Alignment alignment) {
-    uint32 guards = 2 * GuardRoom(GuardKind::kHandle);
-    if (__builtin_expect(!alignment.IsDefault(), false)) return AlignedBlockSize(size, alignment, guards);
-    uint32 bytes = (size + guards + static_cast<uint32>(sizeof(HandleHeader)) + 7) & ~7u;
-    return bytes > size ? bytes : 0;
-}
+// How handle blocks are laid out now: looked up once for an operation.
+class HandleLayout {
+public:
+    HandleLayout() : room_(GuardRoom(GuardKind::kHandle)) {}
 
-// ---- a handle's block, by the address of its data
-// ---------------------------------------------------------------------
+    // Heap bytes for a handle; 0 when they do not fit in 32 bits.
+    uint32 BlockSize(uint32 size, Alignment alignment) const {
+        uint64 bytes = uint64{size} + 2 * room_ + sizeof(HandleHeader);
+        if (__builtin_expect(!alignment.IsDefault(), false)) {
+            bytes += sizeof(Alignment);
+            if (alignment.alignment > 8)
+                bytes += ((alignment.offset & 4) ? 0u : 4u) + alignment.alignment + alignment.offset;
+        }
+        bytes = (bytes + alignment.alignment - 1) & ~uint64{alignment.alignment - 1u};
+        return bytes <= UINT32_MAX ? static_cast<uint32>(bytes) : 0;
+    }
 
-inline HandleHeader* HeaderOf(const void* data) {
-    uintptr_t header = reinterpret_cast<uintptr_t>(data) - GuardRoom(GuardKind::kHandle) - sizeof(HandleHeader);
-    return reinterpret_cast<HandleHeader*>(header);
-}
-inline uint32 SizeOfData(const void* data) {
-    return HeaderOf(data)->size;
-}
-inline void* BlockOf(const void* data) {
-    HandleHeader* header = HeaderOf(data);
-    return reinterpret_cast<char*>(header) - header->distance;
-}
-inline Alignment AlignmentOf(const void* data) {
-    return HeaderOf(data)->distance == 0 ? Alignment() : *static_cast<Alignment*>(BlockOf(data));
-}
+    // The same for the default alignment, without guards, below the size from which larger alignments are chosen.
+    static uint32 PlainBlockSize(uint32 size) { return (size + static_cast<uint32>(sizeof(HandleHeader)) + 7) & ~7u; }
 
-// Where the data of a handle goes in a heap block.
-UPtr PlaceData(void* block, Alignment alignment);
+    // From the data of a handle back to the start of its header.
+    uint32 HeaderRoom() const { return static_cast<uint32>(sizeof(HandleHeader)) + room_; }
 
-// Writes header, alignment record and guard bytes for data placed at `data`.
-inline void WriteHeader(void* block, UPtr data, uint32 size, Alignment alignment) {
-    HandleHeader* header = HeaderOf(data);
-    header->size = size;
-    header->distance = static_cast<uint32>(reinterpret_cast<char*>(header) - static_cast<char*>(block));
-    if (header->distance != 0) *static_cast<Alignment*>(block) = alignment;
-    if (__builtin_expect(WritesGuards(GuardKind::kHandle), false)) WriteGuards(data, size);
-}
+    HandleHeader* HeaderOf(const void* data) const {
+        return reinterpret_cast<HandleHeader*>(reinterpret_cast<uintptr_t>(data) - HeaderRoom());
+    }
+    uint32 SizeOf(const void* data) const { return HeaderOf(data)->size; }
+    void* BlockOf(const void* data) const {
+        HandleHeader* header = HeaderOf(data);
+        return reinterpret_cast<char*>(header) - header->distance;
+    }
+    Alignment AlignmentOf(const void* data) const {
+        HandleHeader* header = HeaderOf(data);
+        return header->distance == 0 ? Alignment() : *static_cast<Alignment*>(BlockOf(data));
+    }
+
+    // Where the data goes in a heap block.
+    UPtr PlaceData(void* block, Alignment alignment) const {
+        uintptr_t data = reinterpret_cast<uintptr_t>(block) + HeaderRoom();
+        if (__builtin_expect(!alignment.IsDefault(), false)) {
+            uintptr_t least = data + sizeof(Alignment) + alignment.offset;
+            data = ((least + alignment.alignment - 1) & ~uintptr_t{alignment.alignment - 1u}) - alignment.offset;
+        }
+        return reinterpret_cast<UPtr>(data);
+    }
+
+    // Writes header, alignment record and guard bytes for data placed at `data`.
+    void WriteHeader(void* block, UPtr data, uint32 size, Alignment alignment) const {
+        HandleHeader* header = HeaderOf(data);
+        header->size = size;
+        header->distance = static_cast<uint32>(reinterpret_cast<char*>(header) - static_cast<char*>(block));
+        if (!alignment.IsDefault()) *static_cast<Alignment*>(block) = alignment;
+        if (__builtin_expect(room_ != 0, false) && WritesGuards(GuardKind::kHandle)) WriteGuards(data, size);
+    }
+
+private:
+    uint32 room_;
+};
 
 // ---- pointer blocks without their tracking
 // ------------------------------------------------------------------------------

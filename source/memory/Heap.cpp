@@ -4,13 +4,15 @@
 
 #include <tessel/diagnostics/DebugStream.h>
 
+#include "memory/MemorySettings.h"
 #include "platform/Mutex.h"
 #include "platform/Process.h"
 
 namespace tessel::heap {
 namespace {
 
-constexpr size_t kAlignment = 16;  // as malloc's
+constexpr size_t kAlignment = 16;                  // as malloc's
+constexpr size_t kMostBytes = PTRDIFF_MAX - 4096;  // of a block: no object is larger than PTRDIFF_MAX
 
 // In front of every plain block.
 struct alignas(kAlignment) Link {
@@ -102,6 +104,7 @@ std::atomic<AllocationFilter> allocationFilter{nullptr};
 
 void SetAllocationFilter(AllocationFilter filter) {
     allocationFilter.store(filter, std::memory_order_relaxed);
+    SetDetour(kHeapFiltered, filter != nullptr);
 }
 
 ErrorCallback SetErrorCallback(ErrorCallback callback) {
@@ -118,7 +121,7 @@ void* OutOfMemory() {
 }
 
 void* Allocate(size_t size) {
-    if (size > SIZE_MAX - sizeof(Link) || !MayAllocate(size)) return OutOfMemory();
+    if (size > kMostBytes || !MayAllocate(size)) return OutOfMemory();
     if (StraightThrough()) return std::malloc(size);
     Link* link = static_cast<Link*>(std::malloc(size + sizeof(Link)));
     if (!link) return OutOfMemory();
@@ -137,7 +140,7 @@ void Free(void* block) {
 }
 
 void* Resize(void* block, size_t size) {
-    if (size > SIZE_MAX - sizeof(Link) || !MayAllocate(size)) return OutOfMemory();
+    if (size > kMostBytes || !MayAllocate(size)) return OutOfMemory();
     if (StraightThrough()) return std::realloc(block, size);
     Link* link = static_cast<Link*>(block) - 1;
     if (!Remove(link)) {

@@ -58,9 +58,11 @@ inline void FreeHandleBlock(ThreadMemory* mine, void* block, size_t size) {
     ThreadMemory::Count(mine, &MemoryCounters::bytes, -static_cast<int64>(size));
 }
 
-// In place when the allocator gave more than was asked for. Null leaves the block as it is.
+// In place when the allocator gave more than was asked for, which is less than its granule. Null leaves the block as it
+// is.
 inline void* ResizeHandleBlock(ThreadMemory* mine, void* block, size_t oldSize, size_t newSize) {
-    bool fits = newSize > oldSize && newSize <= platform::AllocatedSize(block);
+    constexpr size_t kGranule = 16;
+    bool fits = newSize - oldSize < kGranule && newSize <= platform::AllocatedSize(block);
     void* resized = fits ? block : MayAllocate(newSize) ? std::realloc(block, newSize) : nullptr;
     if (resized)
         ThreadMemory::Count(mine, &MemoryCounters::bytes, static_cast<int64>(newSize) - static_cast<int64>(oldSize));

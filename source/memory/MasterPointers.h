@@ -84,16 +84,20 @@ public:
     // that takes another lock of the memory manager, but for the heap's.
     ThMutex mutex = nullptr;
 
-    // A slot for a new handle, or null. It holds 0.
-    UHandle Take(ThreadMemory* mine) {
-        if (__builtin_expect(mine != nullptr && mine->slots.head != nullptr, true)) return Pop(mine->slots);
-        return TakeShared(mine);
-    }
+    // A slot for a new handle, or null. It is not live before it is given data.
+    UHandle Take(ThreadMemory* mine) { return mine && mine->slots.head ? Pop(mine->slots) : TakeShared(mine); }
     // Frees a slot: the next that this thread takes.
     void Put(ThreadMemory* mine, UHandle slot) {
-        if (__builtin_expect(mine == nullptr || mine->slots.count == kChainSlots, false)) return PutShared(mine, slot);
-        Push(mine->slots, slot);
+        if (mine && HasRoom(mine))
+            Push(mine->slots, slot);
+        else
+            PutShared(mine, slot);
     }
+    // The two without their exceptions: for a thread that has a slot at hand, and one that has room for it.
+    UHandle TakePlain(ThreadMemory* mine) { return Pop(mine->slots); }
+    static bool HasRoom(const ThreadMemory* mine) { return mine->slots.count != kChainSlots; }
+    void PutPlain(ThreadMemory* mine, UHandle slot) { Push(mine->slots, slot); }
+
     // Gives back all slots of a chain.
     void Return(SlotChain& chain);
 
@@ -135,7 +139,6 @@ private:
         UHandle slot = chain.head;
         chain.head = reinterpret_cast<UHandle>(SlotContent(slot) & ~uintptr_t{1});
         --chain.count;
-        SetSlotContent(slot, 0);
         return slot;
     }
     static void Push(SlotChain& chain, UHandle slot) {

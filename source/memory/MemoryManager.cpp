@@ -25,37 +25,39 @@ void Trace(TraceKind kind, MgErr err, UHandle h, uint32 newSize, uint32 oldSize)
 
 // ---- creation -------------------------------------------------------------------------------------------------------
 
-TESSEL_NOT_INLINE void BeforeCreation(ThreadMemory* mine) {
+void BeforeCreation(ThreadMemory* mine) {
     NeedMemorySettings();
     if (MemoryDebugging()) masterPointers.CheckChains(mine);
 }
 
-TESSEL_NOT_INLINE void AfterCreation(UHandle h, uint32 size) {
+void AfterCreation(UHandle h, uint32 size) {
     Trace(kCreated, kNoErr, h, size, 0);
     TrackHandle(h, size);
     if (Detours() & kScopeTracked) ScopeAdd(h, size);
 }
 
-TESSEL_NOT_INLINE UHandle CreationFailed(uint32 size) {
+UHandle CreationFailed(uint32 size) {
     CallSetMemFullProc(size);
     Trace(kCreated, kMemFullErr, nullptr, size, 0);
     return nullptr;
 }
 
 // A heap block with the data of a handle in it; null when there is no memory.
-TESSEL_ALWAYS_INLINE UPtr NewData(ThreadMemory* mine, uint32 size, Alignment alignment) {
-    uint32 bytes = BlockSize(size, alignment);
+UPtr NewData(ThreadMemory* mine, uint32 size, Alignment alignment) {
+    HandleLayout layout;
+    uint32 bytes = layout.BlockSize(size, alignment);
     if (TESSEL_UNLIKELY(bytes == 0)) return nullptr;
     void* block = heap::AllocateHandleBlock(mine, bytes);
     if (TESSEL_UNLIKELY(!block)) return nullptr;
-    UPtr data = PlaceData(block, alignment);
-    WriteHeader(block, data, size, alignment);
+    UPtr data = layout.PlaceData(block, alignment);
+    layout.WriteHeader(block, data, size, alignment);
     return data;
 }
 
-TESSEL_ALWAYS_INLINE UHandle NewHandle(uint32 size, Alignment alignment, bool clear) {
+TESSEL_NOT_INLINE UHandle NewHandle(uint32 size, Alignment alignment, bool clear) {
     ThreadMemory* mine = ThreadMemory::Mine();
-    if (TESSEL_UNLIKELY(Detours())) BeforeCreation(mine);
+    uint32 detours = Detours();
+    if (detours) BeforeCreation(mine);
     UHandle h = masterPointers.Take(mine);
     if (TESSEL_UNLIKELY(!h)) return CreationFailed(size);
     UPtr data = NewData(mine, size, alignment);
@@ -66,11 +68,27 @@ TESSEL_ALWAYS_INLINE UHandle NewHandle(uint32 size, Alignment alignment, bool cl
     if (clear) std::memset(data, 0, size);
     SetSlotContent(h, reinterpret_cast<uintptr_t>(data));
     ThreadMemory::Count(mine, &MemoryCounters::handles, 1u);
-    if (TESSEL_UNLIKELY(Detours())) AfterCreation(h, size);
+    if (detours) AfterCreation(h, size);
     return h;
 }
 
-TESSEL_NOT_INLINE void AfterPtrCreation(UPtr p, uint32 size) {
+// The short way: a small handle without anything special, on a thread that has a free slot at hand. Null when that is
+// not so, or there is no memory: then NewHandle sees to it.
+TESSEL_ALWAYS_INLINE UHandle NewPlainHandle(uint32 size) {
+    ThreadMemory* mine = ThreadMemory::MineIfAny();
+    if (TESSEL_UNLIKELY(Detours() != 0 || !mine || !mine->slots.head)) return nullptr;
+    uint32 bytes = HandleLayout::PlainBlockSize(size);
+    auto header = static_cast<HandleHeader*>(std::malloc(bytes));
+    if (TESSEL_UNLIKELY(!header)) return nullptr;
+    *header = {size, 0};
+    UHandle h = masterPointers.TakePlain(mine);
+    SetSlotContent(h, reinterpret_cast<uintptr_t>(header + 1));
+    mine->counters.handles.Add(1);
+    mine->counters.bytes.Add(bytes);
+    return h;
+}
+
+void AfterPtrCreation(UPtr p, uint32 size) {
     if (MemoryDebugging()) {
         if (reinterpret_cast<uintptr_t>(p) % 4 != 0)
             TESSEL_REPORT(kDebugFatal, 0x7B19C4D2u) << "Ptr block not ptr-aligned";
@@ -80,7 +98,7 @@ TESSEL_NOT_INLINE void AfterPtrCreation(UPtr p, uint32 size) {
     if (Detours() & kScopeTracked) ScopeAdd(p, size);
 }
 
-TESSEL_ALWAYS_INLINE UPtr NewPointer(uint32 size, bool clear) {
+UPtr NewPointer(uint32 size, bool clear) {
     NeedMemorySettings();
     UPtr p = NewPtrBlock(size);
     if (!p) {
@@ -95,21 +113,46 @@ TESSEL_ALWAYS_INLINE UPtr NewPointer(uint32 size, bool clear) {
 
 // ---- disposal -------------------------------------------------------------------------------------------------------
 
-TESSEL_NOT_INLINE void AfterDisposal(UHandle h, uint32 size) {
-    Trace(kDisposed, kNoErr, h, size, 0);
-}
-
-TESSEL_ALWAYS_INLINE void Free(ThreadMemory* mine, UHandle h, UPtr data) {
+void Free(ThreadMemory* mine, UHandle h, UPtr data) {
+    HandleLayout layout;
     HandleGate gate(mine);
-    uint32 bytes = BlockSize(SizeOfData(data), AlignmentOf(data));
-    void* block = BlockOf(data);
+    uint32 bytes = layout.BlockSize(layout.SizeOf(data), layout.AlignmentOf(data));
+    void* block = layout.BlockOf(data);
     masterPointers.Put(mine, h);
     heap::FreeHandleBlock(mine, block, bytes);
+}
+
+TESSEL_NOT_INLINE MgErr DisposeHandle(UHandle h) {
+    uint32 detours = Detours();
+    if (detours) UntrackHandle(h);
+    if (!IsGoodHandle(h, kQueryProves)) return ReportMemoryError(kHandleErr, "DSDisposeHandle");
+    UPtr data = *h;
+    uint32 size = HandleLayout().SizeOf(data);
+    if (detours & kScopeTracked) ScopeRemove(h);
+    Free(ThreadMemory::Mine(), h, data);
+    if (detours & kHandlesTraced) Trace(kDisposed, kNoErr, h, size, 0);
+    return kNoErr;
+}
+
+// The short way, for a handle that NewPlainHandle could have made. False when there is more to do: then DisposeHandle
+// sees to it.
+TESSEL_ALWAYS_INLINE bool DisposePlainHandle(UHandle h) {
+    ThreadMemory* mine = ThreadMemory::MineIfAny();
+    if (TESSEL_UNLIKELY(Detours() != 0 || !mine || !masterPointers.HasRoom(mine))) return false;
+    if (TESSEL_UNLIKELY(!IsLiveHandle(h, kQueryProves))) return false;
+    HandleHeader* header = reinterpret_cast<HandleHeader*>(*h) - 1;
+    if (TESSEL_UNLIKELY(header->distance != 0 || !HandleGate::TryEnter(mine))) return false;
+    mine->counters.bytes.Add(-static_cast<int64>(HandleLayout::PlainBlockSize(header->size)));
+    masterPointers.PutPlain(mine, h);
+    std::free(header);
+    HandleGate::Leave(mine);
+    return true;
 }
 
 // ---- resizing -------------------------------------------------------------------------------------------------------
 
 struct Resizing {
+    HandleLayout layout;
     ThreadMemory* mine;
     UHandle h;
     uint32 newSize, oldSize;
@@ -117,46 +160,41 @@ struct Resizing {
     uint32 newBytes, oldBytes;
 };
 
-// Brings the data of a block that realloc has moved to where its alignment wants it, if it is not there by chance.
-UPtr Realign(void* block, UPtr data, const Resizing& r) {
-    uintptr_t misplaced = (reinterpret_cast<uintptr_t>(data) + r.newAlignment.offset) % r.newAlignment.alignment;
-    if (misplaced == 0) return data;
-    UPtr placed = PlaceData(block, r.newAlignment);
-    std::memmove(placed, data, std::min(r.oldSize, r.newSize));
-    return placed;
-}
-
 // Keeps the block, or lets the allocator move it. Null when it cannot.
-UPtr ResizeInPlace(const Resizing& r) {
+TESSEL_ALWAYS_INLINE UPtr ResizeInPlace(const Resizing& r) {
     UPtr data = *r.h;
-    void* block = BlockOf(data);
+    void* block = r.layout.BlockOf(data);
     if (r.newBytes != r.oldBytes) {
-        size_t distance = HeaderOf(data)->distance + sizeof(HandleHeader) + GuardRoom(GuardKind::kHandle);
+        uint32 distance = r.layout.HeaderOf(data)->distance + r.layout.HeaderRoom();
         block = heap::ResizeHandleBlock(r.mine, block, r.oldBytes, r.newBytes);
-        if (!block) return nullptr;
-        data = Realign(block, static_cast<UPtr>(block) + distance, r);
+        if (TESSEL_UNLIKELY(!block)) return nullptr;
+        data = static_cast<UPtr>(block) + distance;
+        if (TESSEL_UNLIKELY(!r.newAlignment.Suits(data))) {  // the allocator has moved it elsewhere in a page
+            data = r.layout.PlaceData(block, r.newAlignment);
+            std::memmove(data, static_cast<UPtr>(block) + distance, std::min(r.oldSize, r.newSize));
+        }
     }
-    WriteHeader(block, data, r.newSize, r.newAlignment);
+    r.layout.WriteHeader(block, data, r.newSize, r.newAlignment);
     return data;
 }
 
-UPtr ResizeByCopy(const Resizing& r) {
+TESSEL_NOT_INLINE UPtr ResizeByCopy(const Resizing& r) {
     UPtr old = *r.h;
     UPtr data = NewData(r.mine, r.newSize, r.newAlignment);
     if (!data) return nullptr;
     std::memcpy(data, old, std::min(r.oldSize, r.newSize));
-    heap::FreeHandleBlock(r.mine, BlockOf(old), r.oldBytes);
+    heap::FreeHandleBlock(r.mine, r.layout.BlockOf(old), r.oldBytes);
     return data;
 }
 
 // The data's place afterwards, or null when there is no memory.
-UPtr ResizeData(const Resizing& r) {
+TESSEL_ALWAYS_INLINE UPtr ResizeData(const Resizing& r) {
     bool stress = memorySettings.stress.load(std::memory_order_relaxed);
     HandleGate gate(r.mine);
     UPtr data = nullptr;
     if (!stress && r.newAlignment == r.oldAlignment) data = ResizeInPlace(r);
-    if (!data) data = ResizeByCopy(r);
-    if (!data) return nullptr;
+    if (TESSEL_UNLIKELY(!data)) data = ResizeByCopy(r);
+    if (TESSEL_UNLIKELY(!data)) return nullptr;
     if (data != *r.h) {
         SetSlotContent(r.h, reinterpret_cast<uintptr_t>(data));
         if (!stress) ThreadMemory::Count(r.mine, &MemoryCounters::moves, 1u);
@@ -164,30 +202,44 @@ UPtr ResizeData(const Resizing& r) {
     return data;
 }
 
-MgErr ResizeChecked(ThreadMemory* mine, UHandle h, uint32 size, Alignment alignment, bool clear, uint32 oldSize) {
-    Resizing r{mine, h, size, oldSize, alignment, AlignmentOf(*h), BlockSize(size, alignment), 0};
+TESSEL_NOT_INLINE MgErr ResizeFailed(uint32 bytes) {
+    CallSetMemFullProc(bytes);
+    return kMemFullErr;
+}
+
+TESSEL_ALWAYS_INLINE MgErr ResizeChecked(ThreadMemory* mine, UHandle h, uint32 size, Alignment alignment, bool clear,
+                                         HandleLayout layout, uint32 oldSize) {
+    Resizing r{layout, mine, h, size, oldSize, alignment, layout.AlignmentOf(*h), 0, 0};
     if (r.newSize == r.oldSize && r.newAlignment == r.oldAlignment) return kNoErr;
-    r.oldBytes = BlockSize(r.oldSize, r.oldAlignment);
-    UPtr data = r.newBytes != 0 ? ResizeData(r) : nullptr;
-    if (!data) {
-        CallSetMemFullProc(r.newBytes != 0 ? r.newBytes : size);
-        return kMemFullErr;
-    }
+    r.newBytes = layout.BlockSize(size, alignment);
+    if (TESSEL_UNLIKELY(r.newBytes == 0)) return ResizeFailed(size);
+    r.oldBytes = layout.BlockSize(r.oldSize, r.oldAlignment);
+    UPtr data = ResizeData(r);
+    if (TESSEL_UNLIKELY(!data)) return ResizeFailed(r.newBytes);
     if (clear && size > oldSize) std::memset(data + oldSize, 0, size - oldSize);
     return kNoErr;
+}
+
+TESSEL_NOT_INLINE MgErr ReportBadHandle(const char* operation) {
+    TESSEL_REPORT(kDebugFatal, 0x53C8E70Bu);
+    return ReportMemoryError(kHandleErr, operation);
+}
+
+TESSEL_NOT_INLINE MgErr AfterResize(MgErr err, UHandle h, uint32 size, uint32 oldSize, const char* operation) {
+    if (Detours() & kHandlesTraced) Trace(kResized, err, h, size, oldSize);
+    return ReportMemoryError(err, operation);
 }
 
 MgErr Resize(UHandle h, uint32 size, Alignment alignment, bool clear, const char* operation) {
     ThreadMemory* mine = ThreadMemory::Mine();
     ThreadMemory::Count(mine, &MemoryCounters::resizes, 1u);
-    if (TESSEL_UNLIKELY(!IsGoodHandle(h, kChangeProves))) {
-        TESSEL_REPORT(kDebugFatal, 0x53C8E70Bu);
-        return ReportMemoryError(kHandleErr, operation);
-    }
-    uint32 oldSize = SizeOfData(*h);
-    MgErr err = ResizeChecked(mine, h, size, alignment, clear, oldSize);
-    if (TESSEL_UNLIKELY(Detours() & kHandlesTraced)) Trace(kResized, err, h, size, oldSize);
-    return ReportMemoryError(err, operation);
+    if (TESSEL_UNLIKELY(!IsGoodHandle(h, kChangeProves))) return ReportBadHandle(operation);
+    HandleLayout layout;
+    uint32 oldSize = layout.SizeOf(*h);
+    MgErr err = ResizeChecked(mine, h, size, alignment, clear, layout, oldSize);
+    if (TESSEL_UNLIKELY(err != kNoErr || (Detours() & kHandlesTraced)))
+        return AfterResize(err, h, size, oldSize, operation);
+    return kNoErr;
 }
 
 MgErr ResizeOrNew(UHandle* h, uint32 size, bool clear, const char* operation) {
@@ -219,7 +271,9 @@ void FreeHandle(UHandle h) {
 using namespace tessel;
 
 UHandle DSNewHandle(uint32 size) {
-    return NewHandle(size, AlignmentForSize(size), false);
+    Alignment alignment = AlignmentForSize(size);
+    UHandle h = alignment.IsDefault() ? NewPlainHandle(size) : nullptr;
+    return h ? h : NewHandle(size, alignment, false);
 }
 
 UHandle DSNewHClr(uint32 size) {
@@ -243,16 +297,8 @@ UPtr DSNewPClr(uint32 size) {
 }
 
 MgErr DSDisposeHandle(UHandle h) {
-    if (!h) return kNoErr;
-    uint32 detours = Detours();
-    if (TESSEL_UNLIKELY(detours)) UntrackHandle(h);
-    if (TESSEL_UNLIKELY(!IsGoodHandle(h, kQueryProves))) return ReportMemoryError(kHandleErr, "DSDisposeHandle");
-    UPtr data = *h;
-    uint32 size = SizeOfData(data);
-    if (TESSEL_UNLIKELY(detours & kScopeTracked)) ScopeRemove(h);
-    Free(ThreadMemory::Mine(), h, data);
-    if (TESSEL_UNLIKELY(detours & kHandlesTraced)) AfterDisposal(h, size);
-    return kNoErr;
+    if (!h || DisposePlainHandle(h)) return kNoErr;
+    return DisposeHandle(h);
 }
 
 MgErr DSDisposeHandleAndNull(UHandle* h) {
@@ -279,7 +325,7 @@ uint32 DSGetHandleSize(UHandle h) {
         TESSEL_REPORT(kDebugFatal, 0x2F9D86C1u);
         return 0;
     }
-    return SizeOfData(*h);
+    return HandleLayout().SizeOf(*h);
 }
 
 MgErr DSSetHandleSize(UHandle h, uint32 size) {

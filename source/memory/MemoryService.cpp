@@ -23,9 +23,10 @@ void PassOnHeapError(heap::Error error, const void* block) {
 
 // Names the blocks of all handles to a walk over the heap. What the header says must fit into the block.
 bool NameHandleBlocks(void* context, heap::Visitor visitor) {
+    HandleLayout layout;
     return masterPointers.ForEachLive([&](UHandle h) {
-        void* block = BlockOf(*h);
-        uint32 bytes = BlockSize(SizeOfData(*h), AlignmentOf(*h));
+        void* block = layout.BlockOf(*h);
+        uint32 bytes = layout.BlockSize(layout.SizeOf(*h), layout.AlignmentOf(*h));
         return bytes != 0 && bytes <= platform::AllocatedSize(block) && visitor(context, block, bytes);
     });
 }
@@ -35,7 +36,7 @@ void RecoverHandles() {
     uint32 count = 0;
     uint64 bytes = 0;
     masterPointers.ForEachLeft([&](UHandle h) {
-        uint32 size = SizeOfData(*h);
+        uint32 size = HandleLayout().SizeOf(*h);
         TESSEL_REPORT(kDebugInfo, 0x66B5D82Cu) << "handle " << DbgFmtPtr(h) << ", size " << size << " still allocated.";
         UntrackHandle(h);
         FreeHandle(h);

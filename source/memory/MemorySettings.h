@@ -16,6 +16,7 @@ enum Detour : uint32 {
     kScopeTracked = 8,     // scoped tracking is on
     kHandlesTraced = 16,   // a trace procedure is installed
     kMemoryDebugged = 32,  // memory debugging is on
+    kHeapFiltered = 64,    // allocations may be made to fail
 };
 
 struct MemorySettings {

@@ -85,7 +85,9 @@ private:
     }
     void* FindPouch(uint32 index) const {
         void* node = __atomic_load_n(&root_, __ATOMIC_ACQUIRE);
-        for (int level = 0; node && level < 3; ++level) node = Slot(node, (index >> kShifts[level]) % kSlots[level]);
+        if (node) node = Slot(node, index >> kShifts[0]);
+        if (node) node = Slot(node, (index >> kShifts[1]) % kSlots[1]);
+        if (node) node = Slot(node, (index >> kShifts[2]) % kSlots[2]);
         return node;
     }
     void* MakePouch(uint32 base) const;

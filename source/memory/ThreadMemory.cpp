@@ -88,20 +88,19 @@ void ThreadMemory::ForgetSlots() {
 
 // ---- the gate -------------------------------------------------------------------------------------------------------
 
-std::atomic<bool> HandleGate::closed{false};
-std::atomic<bool> HandleGate::light{false};
+std::atomic<uint32> HandleGate::state{kOwnFences};
 
 void PrepareHandleGate() {
-    HandleGate::light.store(platform::FenceEveryThreadAvailable(), std::memory_order_relaxed);
+    if (platform::FenceEveryThreadAvailable()) HandleGate::state.fetch_and(~HandleGate::kOwnFences);
 }
 
-void HandleGate::WaitUntilOpen() {
-    do {
+// The exchange is the fence that the short way leaves to the host.
+void HandleGate::EnterSlowly() {
+    while (mine_->inside_.exchange(1, std::memory_order_seq_cst), state.load(std::memory_order_seq_cst) & kClosed) {
         mine_->inside_.store(0, std::memory_order_release);
         threadsMutex.Lock();  // held by whoever closed the gate
         threadsMutex.Unlock();
-        mine_->inside_.exchange(1, std::memory_order_seq_cst);
-    } while (closed.load(std::memory_order_seq_cst));
+    }
 }
 
 void HandleGate::LockShared() {
@@ -114,14 +113,14 @@ void HandleGate::UnlockShared() {
 
 GateClosed::GateClosed() {
     threadsMutex.Lock();
-    HandleGate::closed.store(true, std::memory_order_seq_cst);
-    if (HandleGate::light.load(std::memory_order_relaxed)) platform::FenceEveryThread();
+    uint32 before = HandleGate::state.fetch_or(HandleGate::kClosed, std::memory_order_seq_cst);
+    if (!(before & HandleGate::kOwnFences)) platform::FenceEveryThread();
     for (ThreadMemory* thread = threads; thread; thread = thread->next_)
         while (thread->inside_.load(std::memory_order_seq_cst) != 0) platform::YieldThread();
 }
 
 GateClosed::~GateClosed() {
-    HandleGate::closed.store(false, std::memory_order_seq_cst);
+    HandleGate::state.fetch_and(~HandleGate::kClosed, std::memory_order_seq_cst);
     threadsMutex.Unlock();
 }
 

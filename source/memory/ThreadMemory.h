@@ -50,6 +50,9 @@ public:
         return __builtin_expect(mine != nullptr, true) ? mine : Adopt();
     }
 
+    // The same for the short ways, which leave the making to others.
+    static ThreadMemory* MineIfAny() { return current; }
+
     // Counts for the calling thread, whose `mine` may be null.
     template <class T>
     static void Count(ThreadMemory* mine, OwnCounter<T> MemoryCounters::*counter, T n) {
@@ -91,36 +94,40 @@ private:
 class HandleGate {
 public:
     explicit HandleGate(ThreadMemory* mine) : mine_(mine) {
-        if (__builtin_expect(mine == nullptr, false)) {
+        if (!mine)
             LockShared();
-            return;
-        }
-        if (light.load(std::memory_order_relaxed)) {
-            mine->inside_.store(1, std::memory_order_relaxed);
-            std::atomic_signal_fence(std::memory_order_seq_cst);
-        } else {
-            mine->inside_.exchange(1, std::memory_order_seq_cst);
-        }
-        if (__builtin_expect(closed.load(std::memory_order_seq_cst), false)) WaitUntilOpen();
+        else if (!TryEnter(mine))
+            EnterSlowly();
     }
     ~HandleGate() {
-        if (__builtin_expect(mine_ != nullptr, true))
-            mine_->inside_.store(0, std::memory_order_release);
+        if (mine_)
+            Leave(mine_);
         else
             UnlockShared();
     }
     HandleGate(const HandleGate&) = delete;
     HandleGate& operator=(const HandleGate&) = delete;
 
+    // For the short ways. False when it takes more than a look: then the gate is not entered.
+    static bool TryEnter(ThreadMemory* mine) {
+        mine->inside_.store(1, std::memory_order_relaxed);
+        std::atomic_signal_fence(std::memory_order_seq_cst);
+        if (__builtin_expect(state.load(std::memory_order_acquire) == 0, true)) return true;
+        Leave(mine);
+        return false;
+    }
+    static void Leave(ThreadMemory* mine) { mine->inside_.store(0, std::memory_order_release); }
+
 private:
     friend class GateClosed;
     friend void PrepareHandleGate();
-    void WaitUntilOpen();
+    void EnterSlowly();
     static void LockShared();
     static void UnlockShared();
 
-    static std::atomic<bool> closed;
-    static std::atomic<bool> light;  // the host fences every thread for the one that walks
+    static constexpr uint32 kClosed = 1;
+    static constexpr uint32 kOwnFences = 2;  // the host cannot fence every thread for the one that walks
+    static std::atomic<uint32> state;
 
     ThreadMemory* mine_;
 };

@@ -65,7 +65,7 @@ void HandleLeakDumper::DumpItemContents(const void* handle, uint32) {
     UHandle h = static_cast<UHandle>(const_cast<void*>(handle));
     if (!masterPointers.Contains(h) || !IsLiveContent(SlotContent(h))) return;
     FormatToOutput("Master Pointer: 0x%s\n", AddressText(*h).Text());
-    LeakDumper::DumpItemContents(*h, SizeOfData(*h));
+    LeakDumper::DumpItemContents(*h, HandleLayout().SizeOf(*h));
 }
 
 }  // namespace tessel

@@ -38,15 +38,12 @@ bool TakeFree(ThMutex mutex) {
 }
 
 // A sleep and a wake-up cost many times a short hold, and a mutex that was handed to a sleeper stays held until that
-// wakes: so spin for about that long, looking ever more rarely, to leave the line to the holder.
+// wakes: so spin for about that long. Each look is twice as long after the one before, to leave the line to the holder.
 bool SpinForFree(ThMutex mutex) {
-    constexpr int kRounds = 60;
-    constexpr int kMostPauses = 64;
-    int pauses = 4;
-    for (int round = 0; round < kRounds; ++round) {
+    constexpr int kFirstPauses = 4, kLastPauses = 1024;  // some 40 us in all
+    for (int pauses = kFirstPauses; pauses <= kLastPauses; pauses *= 2) {
         if (TakeFree(mutex)) return true;
         for (int i = 0; i < pauses; ++i) platform::SpinPause();
-        if (pauses < kMostPauses) pauses *= 2;
     }
     return TakeFree(mutex);
 }
