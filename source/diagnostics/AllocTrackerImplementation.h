@@ -18,7 +18,7 @@ public:
     void SetSkip(int32 skip);
     void Add(uintptr_t address, uint32 size, const char* file, int32 line, const StackFrame* frame);
     void Remove(uintptr_t address);
-    AllocRecords::Counts Count() { return records_.Count(); }
+    AllocRecords::Counts Count() { return deactivated_ ? AllocRecords::Counts{} : records_.Count(); }
     void DumpAll(AllocDumper& dumper);
     void DumpOne(uintptr_t address, AllocDumper& dumper);
     bool IsTracked(uintptr_t address);

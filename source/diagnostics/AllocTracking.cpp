@@ -1,8 +1,11 @@
 #include "diagnostics/AllocTracking.h"
 
+#include <algorithm>
 #include <atomic>
 #include <cstring>
+#include <string>
 
+#include "diagnostics/Guarded.h"
 #include "platform/Process.h"
 
 namespace tessel {
@@ -11,13 +14,26 @@ namespace {
 enum class Tracking { kNotAsked, kOff, kOn };
 std::atomic<Tracking> theTracking{Tracking::kNotAsked};
 
+constexpr char kVariable[] = "OV_ALLOC_TRACKER";
+constexpr char kOff[] = "off";
+
+bool IsOffInEnvironment() {
+    const char* const value = platform::EnvironmentGet(kVariable);
+    return value && std::strcmp(value, kOff) == 0;
+}
+
+bool IsOffInArguments() {
+    return GuardedOr(false, [] {
+        const auto arguments = platform::ProcessArguments();
+        const std::string off = std::string(kVariable) + '=' + kOff;
+        return std::find(arguments.begin(), arguments.end(), off) != arguments.end();
+    });
+}
+
 }  // namespace
 
 bool IsAllocTrackingOn() {
-    if (theTracking == Tracking::kNotAsked) {
-        const char* const value = platform::EnvironmentGet("OV_ALLOC_TRACKER");
-        theTracking = value && std::strcmp(value, "off") == 0 ? Tracking::kOff : Tracking::kOn;
-    }
+    if (theTracking == Tracking::kNotAsked) SetAllocTracking(!IsOffInEnvironment() && !IsOffInArguments());
     return theTracking == Tracking::kOn;
 }
 

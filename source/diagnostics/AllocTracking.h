@@ -4,7 +4,8 @@
 
 namespace tessel {
 
-// On, unless the environment variable OV_ALLOC_TRACKER said "off" when it was first asked, or it was turned off.
+// On, unless OV_ALLOC_TRACKER=off stood in the environment or among the arguments of the process when it was first
+// asked, or it was turned off.
 bool IsAllocTrackingOn();
 void SetAllocTracking(bool on);
 

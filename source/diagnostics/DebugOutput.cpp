@@ -2,6 +2,7 @@
 
 #include <atomic>
 #include <cstdio>
+#include <cstring>
 
 #include <tessel/diagnostics/DebugStream.h>
 
@@ -15,6 +16,7 @@ namespace {
 
 constexpr int kMostNestedReports = 8;  // a handler whose own work is reported, and so on
 constexpr int kBytesPerLine = 16;
+constexpr size_t kMessageSize = 1024;
 
 std::atomic<DebugOutputHandler> theHandler{nullptr};
 std::atomic<int32> theEventCounts[kNumDebugLevels];
@@ -36,9 +38,10 @@ CStr OrEmpty(CStr text) {
 void DefaultHandler(CStr file, int32 line, int32 level, uint32 siteCode, CStr text) {
     DebugOutputIncrementEventCount(level);
     if (level == kDebugError || level == kDebugFatal) {
-        char message[1024];
-        std::snprintf(message, sizeof message, "ERR %lx: %s(%d): %s", static_cast<unsigned long>(siteCode), file, line,
+        char message[kMessageSize + 1];  // and the end of the line
+        std::snprintf(message, kMessageSize, "ERR %lx: %s(%d): %s", static_cast<unsigned long>(siteCode), file, line,
                       text);
+        std::strcat(message, "\n");
         DebugOutputCoreBreak(message);
     }
     if (level == kDebugFatal) DebugOutputCoreDie();

@@ -25,8 +25,9 @@ Slot thePool[kPoolSlots];
 std::atomic<bool> thePoolReady{false};
 std::atomic<int32> theFailedCheckouts{0};
 
-// For a thread that can get no memory. One stream of the thread has it, the others go without text.
-thread_local Slot theLastResort;
+// For a thread that can get no memory, so it is there from the start. One stream of the thread has it, the others go
+// without text.
+[[gnu::tls_model("initial-exec")]] thread_local Slot theLastResort;
 char theNoText[1];
 
 bool Claim(Slot& slot) {
@@ -140,6 +141,15 @@ void DebugStream::GiveBack() noexcept {
         std::free(text_);
     inUse_ = nullptr;
     text_ = write_ = last_ = theNoText;
+}
+
+DebugReport::DebugReport(CStr file, int32 line, CStr identifier, _DebugOutputLevel level, uint32 siteCode)
+    : stream_(file, line, identifier, level) {
+    stream_.SetSiteCode(siteCode);
+}
+
+DebugReport::~DebugReport() {
+    stream_.Process();
 }
 
 void ToDebugStream(DebugStream& stream, char byte) {

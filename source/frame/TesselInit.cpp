@@ -1,6 +1,7 @@
 #include <tessel/frame/TesselInit.h>
 
 #include <algorithm>
+#include <iterator>
 
 #include "frame/CoreServices.h"
 
@@ -9,6 +10,10 @@ namespace {
 
 IServiceRegistry* theBaseRegistry = nullptr;
 bool theAppSupportIsOn = false;
+
+// In the order they are started.
+constexpr IServiceObject* (*kAppSupport[])() = {ConfigManagerService, ConfigCoreTypesService, ThThreadService,
+                                                ResourceManagerService};
 
 }  // namespace
 }  // namespace tessel
@@ -43,22 +48,19 @@ MgErr UninitTesselBase(void) {
     return kNoErr;
 }
 
+// Their results are not looked at: the library goes on without what did not start.
 MgErr InitTesselAppSupport(void) {
     if (theAppSupportIsOn) return kNoErr;
-    ConfigManagerService()->Init();
-    ConfigCoreTypesService()->Init();
-    ThThreadService()->Init();
-    ResourceManagerService()->Init();
+    for (auto accessor : kAppSupport)
+        if (IServiceObject* service = accessor()) service->Init();
     theAppSupportIsOn = true;
     return kNoErr;
 }
 
 MgErr UninitTesselAppSupport(void) {
     if (!theAppSupportIsOn) return kNoErr;
-    ResourceManagerService()->Uninit();
-    ThThreadService()->Uninit();
-    ConfigCoreTypesService()->Uninit();
-    ConfigManagerService()->Uninit();
+    for (auto accessor = std::rbegin(kAppSupport); accessor != std::rend(kAppSupport); ++accessor)
+        if (IServiceObject* service = (*accessor)()) service->Uninit();
     theAppSupportIsOn = false;
     return kNoErr;
 }

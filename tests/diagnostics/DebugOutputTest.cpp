@@ -1,10 +1,12 @@
 #include <gtest/gtest.h>
 #include <sys/mman.h>
+#include <sys/resource.h>
 #include <tessel/diagnostics/DebugOutput.h>
 #include <tessel/diagnostics/DebugStream.h>
 #include <unistd.h>
 
 #include <algorithm>
+#include <cstdlib>
 
 #include "support/ReportRecorder.h"
 
@@ -22,8 +24,8 @@ TEST(DebugOutput, DefaultBehaviourCountsAndShowsSeriousReports) {
     DebugOutputCallHandler("f.cpp", 12, "f", 3, 0x2A, "boom");
     DebugOutputCallHandler(nullptr, 1, nullptr, 3, 0xABCDEF01u, std::string(2000, 'x').c_str());
     const std::string shown = testing::internal::GetCapturedStderr();
-    EXPECT_EQ(0u, shown.find("ERR 2a: f.cpp(12): boom"));
-    EXPECT_NE(std::string::npos, shown.find("ERR abcdef01: (1): xxx"));
+    EXPECT_EQ(0u, shown.find("ERR 2a: f.cpp(12): boom\n"));
+    EXPECT_NE(std::string::npos, shown.find("\nERR abcdef01: (1): xxx"));
     EXPECT_EQ(1023u - 19u, static_cast<size_t>(std::count(shown.begin(), shown.end(), 'x'))) << "cut at 1023 bytes";
     EXPECT_EQ(0, DebugOutputGetNumEvents(1));
     EXPECT_EQ(1, DebugOutputGetNumEvents(2));
@@ -39,6 +41,31 @@ TEST(DebugOutput, DefaultBehaviourCountsAndShowsSeriousReports) {
 
 TEST(DebugOutputDeathTest, FatalReportEndsTheProcess) {
     EXPECT_EXIT(TESSEL_REPORT(kDebugFatal, 0x2Au) << "the end", ExitedWithCode(1), "ERR 2a: .*: the end");
+}
+
+// A call of malloc that the compiler cannot leave out.
+void* Take(size_t size) {
+    void* block = std::malloc(size);
+    asm volatile("" : "+r"(block));
+    return block;
+}
+
+// Takes all memory there is, then reports.
+[[noreturn]] void ReportWithoutMemory() {
+    rlimit limit{256u << 20, 256u << 20};
+    setrlimit(RLIMIT_AS, &limit);
+    for (size_t size = 64u << 20; size >= 8; size /= 2)
+        while (Take(size)) {
+        }
+    TESSEL_REPORT(kDebugError, 0x3Bu) << "no memory " << 1;
+    _exit(Take(256) ? 2 : 3);
+}
+
+TEST(DebugOutputDeathTest, ReportsWithoutMemory) {
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+    GTEST_SKIP() << "a sanitizer takes more address space than the limit";
+#endif
+    EXPECT_EXIT(ReportWithoutMemory(), ExitedWithCode(3), "ERR 3b: .*: no memory 1");
 }
 
 TEST(DebugOutput, AHandlerTakesEverything) {

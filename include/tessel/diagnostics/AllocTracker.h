@@ -1,8 +1,9 @@
 /* Allocation trackers: registers of living objects with the call stacks that made them, and the reports on those that
    should be gone.
 
-   The trackers of the library are on unless the environment says OV_ALLOC_TRACKER=off. A tracker never affects what it
-   tracks: when it runs out of memory it goes quiet. All operations may be called from any thread. */
+   Tracking is on unless OV_ALLOC_TRACKER=off stands in the environment or among the arguments of the process. A tracker
+   never affects what it tracks: when it runs out of memory it goes quiet. All operations may be called from any thread.
+ */
 #ifndef TESSEL_DIAGNOSTICS_ALLOCTRACKER_H
 #define TESSEL_DIAGNOSTICS_ALLOCTRACKER_H
 

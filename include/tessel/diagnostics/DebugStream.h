@@ -196,11 +196,10 @@ private:
 /// A report that is processed at the end of the statement that makes it.
 class TESSEL_API DebugReport {
 public:
-    DebugReport(CStr file, int32 line, CStr identifier, _DebugOutputLevel level, uint32 siteCode)
-        : stream_(file, line, identifier, level) {
-        stream_.SetSiteCode(siteCode);
-    }
-    ~DebugReport() { stream_.Process(); }
+    DebugReport(CStr file, int32 line, CStr identifier, _DebugOutputLevel level, uint32 siteCode);
+    ~DebugReport();
+    DebugReport(const DebugReport&) = delete;
+    DebugReport& operator=(const DebugReport&) = delete;
 
     /// Appends anything that some ToDebugStream takes. Found where the value's type is declared.
     template <class T>
