@@ -37,8 +37,6 @@ constexpr int16 kCode<uint8> = kNumUInt8;
 template <>
 constexpr int16 kCode<uint16> = kNumUInt16;
 template <>
-constexpr int16 kCode<uint32> = kNumUInt32;
-template <>
 constexpr int16 kCode<uint64> = kNumUInt64;
 template <>
 constexpr int16 kCode<float> = kNumSingle;
