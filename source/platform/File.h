@@ -68,7 +68,8 @@ bool FileUnmap(const void* data, std::size_t size);
 bool FileLock(FileHandle file, std::int64_t offset, std::int64_t count);
 bool FileUnlock(FileHandle file, std::int64_t offset, std::int64_t count);
 
-/* Times: 100 ns since 1601-01-01 00:00:00 UTC; 0 leaves a time as it is. */
+/* Times: 100 ns since 1601-01-01 00:00:00 UTC; 0 leaves a time as it is. The host sets no time of creation; one that is
+   set here is kept, and told afterwards, where the file system keeps attributes of files. */
 bool FileSetTimes(FileHandle file, std::int64_t created, std::int64_t accessed, std::int64_t modified);
 
 }  // namespace tessel::platform
