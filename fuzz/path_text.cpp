@@ -49,9 +49,11 @@ void CheckTexts(const PathRef& path) {
     }
 }
 
-void CheckSystemName(PathRef& path) {
+// The name that the system is given stands for the same path. In a double-byte page a name may end in half a character,
+// which takes the separator behind it along.
+void CheckSystemName(PathRef& path, bool separatorsStandAlone) {
     const std::unique_ptr<char[]> name(new char[kMaxDOSPathName]);
-    if (MakeDOSPathName(&path, name.get(), 0) != kNoErr) return;
+    if (MakeDOSPathName(&path, name.get(), 0) != kNoErr || !separatorsStandAlone) return;
     const std::optional<PathRef> again = Read(name.get(), PathRef::StringDisplay());
     Require(again && again->Equals(path, PathRef::kExact));
 }
@@ -65,13 +67,14 @@ extern "C" int LLVMFuzzerInitialize(int*, char***) {
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8* data, size_t size) {
     if (size == 0) return -1;
-    Require(tessel::platform::SetCodePage(kCodePages[data[0] % 3]));
+    const uint32 codePage = kCodePages[data[0] % 3];
+    Require(tessel::platform::SetCodePage(codePage));
     const std::string text(reinterpret_cast<const char*>(data + 1), size - 1);
     std::optional<PathRef> path = Read(text, kFormats[(data[0] / 3) % 4]);
     if (path) {
         Require(path->IsSane(false));
         CheckTexts(*path);
-        CheckSystemName(*path);
+        CheckSystemName(*path, codePage != 932);
         Require(PathRef::NameWildCardMatch(text, "**"));
         PathRef::NameWildCardMatch("name.txt", text);
     }
