@@ -152,6 +152,14 @@ void* Resize(void* block, size_t size) {
     return resized ? resized + 1 : OutOfMemory();
 }
 
+void* Reallocate(void* block, size_t oldSize, size_t newSize) {
+    if (!MayAllocate(newSize)) return nullptr;
+    size_t more = newSize / 8;
+    bool growsByLittle = newSize > oldSize && newSize - oldSize < more && newSize <= kMostBytes - more;
+    void* resized = growsByLittle ? std::realloc(block, newSize + more) : nullptr;
+    return resized ? resized : std::realloc(block, newSize);
+}
+
 void SetHandleBlocks(HandleBlocks blocks) {
     handleBlocks.store(blocks);
 }

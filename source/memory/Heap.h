@@ -58,12 +58,13 @@ inline void FreeHandleBlock(ThreadMemory* mine, void* block, size_t size) {
     ThreadMemory::Count(mine, &MemoryCounters::bytes, -static_cast<int64>(size));
 }
 
-// In place when the allocator gave more than was asked for, which is less than its granule. Null leaves the block as it
-// is.
+// Moves the block only when it must: a block that grows by little will often grow again, and is given an eighth more
+// than asked for; one that shrinks by less than that keeps its place. Null leaves the block as it is.
+void* Reallocate(void* block, size_t oldSize, size_t newSize);
 inline void* ResizeHandleBlock(ThreadMemory* mine, void* block, size_t oldSize, size_t newSize) {
-    constexpr size_t kGranule = 16;
-    bool fits = newSize - oldSize < kGranule && newSize <= platform::AllocatedSize(block);
-    void* resized = fits ? block : MayAllocate(newSize) ? std::realloc(block, newSize) : nullptr;
+    size_t room = platform::AllocatedSize(block);
+    bool fits = newSize <= room && newSize >= room - room / 8;
+    void* resized = fits ? block : Reallocate(block, oldSize, newSize);
     if (resized)
         ThreadMemory::Count(mine, &MemoryCounters::bytes, static_cast<int64>(newSize) - static_cast<int64>(oldSize));
     return resized;
