@@ -17,6 +17,8 @@ namespace {
 // Up to this size one read of the whole file costs less than the reads of its parts.
 constexpr uint64 kReadWholeLimit = 256 * 1024;
 
+constexpr uint32 kSmallRead = 64;
+
 constexpr uint32 kExtendBlock = 10240;
 
 std::atomic<IsFileAlreadyInCacheProc> gIsFileAlreadyInCache{nullptr};
@@ -109,10 +111,32 @@ MgErr OVResfileIO::Read(uint64 position, void* buffer, uint32 count) {
         return kNoErr;
     }
     if (!fFile) return kEOFErr;
+    return fOpenedByPath && count <= kSmallRead ? ReadAhead(position, buffer, count)
+                                                : ReadFile(position, buffer, count);
+}
+
+MgErr OVResfileIO::ReadFile(uint64 position, void* buffer, uint32 count) {
     if (const MgErr err = SeekTo(position)) return err;
     const MgErr err = FMRead(fFile, count, nullptr, buffer);
     fPosition = err ? kUnknownPosition : position + count;
     return err;
+}
+
+MgErr OVResfileIO::ReadAhead(uint64 position, void* buffer, uint32 count) {
+    if (position < fAheadStart || position + count > fAheadStart + fAheadLength) {
+        fAheadLength = 0;
+        if (const MgErr err = SeekTo(position)) return err;
+        const MgErr err = FMRead(fFile, kAhead, &fAheadLength, fAhead);
+        fPosition = err ? kUnknownPosition : position + fAheadLength;
+        if (err && err != kEOFErr) {
+            fAheadLength = 0;
+            return err;
+        }
+        fAheadStart = position;
+        if (count > fAheadLength) return kEOFErr;
+    }
+    std::memcpy(buffer, fAhead + (position - fAheadStart), count);
+    return kNoErr;
 }
 
 MgErr OVResfileIO::Write(uint64 position, const void* data, uint32 count) {
@@ -127,6 +151,7 @@ MgErr OVResfileIO::Write(uint64 position, const void* data, uint32 count) {
         if (count) std::memcpy(*fHandle + position, data, count);
         return kNoErr;
     }
+    fAheadLength = 0;
     if (const MgErr err = SeekTo(position)) return err;
     const MgErr err = FMWrite(fFile, count, nullptr, data);
     fPosition = err ? kUnknownPosition : position + count;
@@ -148,6 +173,7 @@ MgErr OVResfileIO::SetSize(uint32 size) {
         return err;
     }
     fPosition = kUnknownPosition;
+    fAheadLength = 0;
     return FSetEOF64(fFile, size);
 }
 

@@ -53,6 +53,8 @@ public:
 
 private:
     MgErr SeekTo(uint64 position);
+    MgErr ReadFile(uint64 position, void* buffer, uint32 count);
+    MgErr ReadAhead(uint64 position, void* buffer, uint32 count);
     const uint8* Bytes() const { return fHandle ? *fHandle : fData; }
     bool InMemory() const { return fHandle || fData; }
     MgErr ReadWhole(uint32 size);
@@ -70,6 +72,12 @@ private:
     uint64 fPosition = kUnknownPosition;  // of a file that only we move
 
     static constexpr uint64 kUnknownPosition = ~uint64{0};
+    static constexpr uint32 kAhead = 4096;
+
+    // The bytes around the last small read of a file that only we change: length words of neighbours come with it.
+    uint64 fAheadStart = 0;
+    uint32 fAheadLength = 0;
+    uint8 fAhead[kAhead];
 };
 
 }  // namespace tessel
