@@ -77,7 +77,7 @@ Uint128 NormalizedProduct(const Uint128& a, const Uint128& b) {
     return {(high << 1) | (low >> 63), (low << 1) | (lowest >> 63)};
 }
 
-Power DistantPowerOfTen(int32 n) {
+[[gnu::noinline]] Power DistantPowerOfTen(int32 n) {
     const int32 step = n > 0 ? kTablePower : -kTablePower;
     int32 rest = n;
     Uint128 bits = kPowerTable[kTablePower];
@@ -89,7 +89,7 @@ Power DistantPowerOfTen(int32 n) {
     return {bits, FloorLog2OfPower(n) - 127, 64};
 }
 
-Power PowerOfTen(int32 n) {
+[[gnu::always_inline]] inline Power PowerOfTen(int32 n) {
     if (n < -kTablePower || n > kTablePower) return DistantPowerOfTen(n);
     const uint32 error = n >= 0 && n <= kLastExactPower ? 0 : 1;
     return {kPowerTable[kTablePower + n], FloorLog2OfPower(n) - 127, error};
@@ -102,7 +102,7 @@ using Exact = BigUnsigned<400>;
 
 // a * 2^aExponent * 10^power compared with b * 2^bExponent, or with (b + 1/2) * 2^bExponent: -1, 0 or 1. The two must
 // be of about the same size.
-int CompareExactly(uint64 a, int32 aExponent, int32 power, uint64 b, int32 bExponent, bool plusHalf) {
+[[gnu::noinline]] int CompareExactly(uint64 a, int32 aExponent, int32 power, uint64 b, int32 bExponent, bool plusHalf) {
     Exact left(a);
     Exact right(b);
     if (plusHalf) {
@@ -132,7 +132,7 @@ struct Scaled {
     uint32 error;
 };
 
-Scaled Scale(uint64 mantissa, int32 exponent, const Power& power) {
+[[gnu::always_inline]] inline Scaled Scale(uint64 mantissa, int32 exponent, const Power& power) {
     const Uint128 top = Multiply64(mantissa, power.bits.high);
     const Uint128 bottom = Multiply64(mantissa, power.bits.low);
     const uint64 middle = top.low + bottom.high;
@@ -142,7 +142,7 @@ Scaled Scale(uint64 mantissa, int32 exponent, const Power& power) {
 enum class Tail { kBelowHalf, kHalf, kAboveHalf, kUnclear };
 
 // How what lies below bit `position` of the high word compares with half of that bit. position is 0 to 64.
-Tail ClassifyTail(const Scaled& x, int32 position) {
+[[gnu::always_inline]] inline Tail ClassifyTail(const Scaled& x, int32 position) {
     const uint64 half = uint64{1} << (position == 0 ? 63 : position - 1);
     uint64 tail = x.middle;
     bool more = x.low != 0;
@@ -193,9 +193,7 @@ uint64 RoundScaled(const RealParts& x, int32 power) {
 
 // ---- decimal to binary ---------------------------------------------------------------------------------------------
 
-constexpr int32 kExtendedBias = 16383;
-constexpr int32 kInfiniteExponent = 0x7FFF;
-constexpr uint64 kIntegerBit = uint64{1} << 63;
+constexpr int32 kInfiniteExponent = kExtendedExponentMask;
 
 // Beyond these the result is certainly infinite or zero, whatever the digits.
 constexpr int32 kLargestDecimalExponent = 4933;
@@ -209,22 +207,22 @@ constexpr std::array<uint64, 28> MakePowersOfFive() {
 }
 constexpr std::array<uint64, 28> kPowersOfFive = MakePowersOfFive();
 
-NearestExtended Exact64(uint64 mantissa, int32 exponent) {
+RoundedExtended Exact64(uint64 mantissa, int32 exponent) {
     const int zeros = std::countl_zero(mantissa);
-    return {{mantissa << zeros, static_cast<uint16>(exponent - zeros + 63 + kExtendedBias)}, 0};
+    return {mantissa << zeros, static_cast<uint32>(exponent - zeros + 63 + kExtendedBias), 0};
+}
+
+// ---- records -------------------------------------------------------------------------------------------------------
+
+// Eight digits, two a byte.
+uint32 PackEight(uint32 value) {
+    uint64 lanes = SpreadDigits(value);
+    lanes = (lanes | lanes >> 4) & 0x00FF00FF00FF00FF;
+    lanes = (lanes | lanes >> 8) & 0x0000FFFF0000FFFF;
+    return static_cast<uint32>(lanes | lanes >> 16);
 }
 
 }  // namespace
-
-uint64 PowerOfTen64(int32 power) {
-    static constexpr std::array<uint64, 20> kPowers = [] {
-        std::array<uint64, 20> powers{};
-        powers[0] = 1;
-        for (int i = 1; i < 20; ++i) powers[i] = powers[i - 1] * 10;
-        return powers;
-    }();
-    return kPowers[power];
-}
 
 uint64 UnpackDigits(const PackedDecimal& record) {
     if (record.mdigits < 0) return 0;
@@ -249,11 +247,12 @@ uint64 UnpackDigits(const PackedDecimal& record) {
 }
 
 void PackDigits(uint64 digits, PackedDecimal& record) {
-    for (uint8& byte : record.mantissa) {
-        const auto pair = static_cast<uint32>(digits % 100);
-        digits /= 100;
-        byte = static_cast<uint8>(pair / 10 << 4 | pair % 10);
-    }
+    constexpr uint32 kEightDigits = 100000000;
+    const uint64 upper = digits / kEightDigits;
+    const uint64 low = PackEight(static_cast<uint32>(digits % kEightDigits)) |
+                       static_cast<uint64>(PackEight(static_cast<uint32>(upper % kEightDigits))) << 32;
+    std::memcpy(record.mantissa, &low, sizeof low);
+    record.mantissa[8] = static_cast<uint8>(PackEight(static_cast<uint32>(upper / kEightDigits)));
 }
 
 RealParts TakeApart(double x) {
@@ -265,9 +264,9 @@ RealParts TakeApart(double x) {
     const auto exponent = static_cast<int32>((bits >> kMantissaBits) & kSpecial);
     const uint64 fraction = bits << (63 - kMantissaBits);  // at the mantissa's place, below bit 63
     if (exponent != 0 && exponent != kSpecial) {
-        return {kIntegerBit | fraction, exponent - kBias - 63, RealKind::kFinite, negative};
+        return {kExtendedIntegerBit | fraction, exponent - kBias - 63, RealKind::kFinite, negative};
     }
-    const uint64 low = fraction & ~kIntegerBit;
+    const uint64 low = fraction & ~kExtendedIntegerBit;
     if (exponent == kSpecial) return {0, 0, low == 0 ? RealKind::kInfinite : RealKind::kNaN, negative};
     if (low == 0) return {0, 0, RealKind::kFinite, negative};
     const int zeros = std::countl_zero(low);
@@ -300,9 +299,9 @@ DecimalDigits RoundToDecimal(const RealParts& x, int32 precision) {
     return {digits, unit, count + 1};
 }
 
-NearestExtended FromDecimal(uint64 digits, int32 exponent) {
-    if (digits == 0 || exponent < kSmallestDecimalExponent) return {{0, 0}, digits == 0 ? 0 : 1};
-    if (exponent > kLargestDecimalExponent) return {{kIntegerBit, kInfiniteExponent}, 0};
+RoundedExtended FromDecimal(uint64 digits, int32 exponent) {
+    if (digits == 0 || exponent < kSmallestDecimalExponent) return {0, 0, digits == 0 ? 0 : 1};
+    if (exponent > kLargestDecimalExponent) return {kExtendedIntegerBit, kInfiniteExponent, 0};
 
     const int zeros = std::countl_zero(digits);
     Scaled scaled = Scale(digits << zeros, -zeros, PowerOfTen(exponent));
@@ -323,7 +322,7 @@ NearestExtended FromDecimal(uint64 digits, int32 exponent) {
     int32 unit = scaled.exponent + 128;  // the value of bit 0 of the high word, as a power of two
     int32 biased = unit + 63 + kExtendedBias;
     const int32 position = biased > 0 ? 0 : 1 - biased;  // denormal: fewer bits are kept
-    if (position > kLowestBitPosition) return {{0, 0}, 1};
+    if (position > kLowestBitPosition) return {0, 0, 1};
     uint64 kept = position == kLowestBitPosition ? 0 : scaled.high >> position;
     unit += position;
     const Tail tail = ClassifyTail(scaled, position);
@@ -335,14 +334,14 @@ NearestExtended FromDecimal(uint64 digits, int32 exponent) {
         rest = -1;
     }
     if (position == 0 && kept == 0) {  // carried out of the mantissa
-        kept = kIntegerBit;
+        kept = kExtendedIntegerBit;
         ++unit;
         ++biased;
     }
     if (hairsbreadth) rest = CompareExactly(digits, 0, exponent, kept, unit, false);
     if (position > 0) biased = kept >> 63 != 0 ? 1 : 0;
-    if (biased >= kInfiniteExponent) return {{kIntegerBit, kInfiniteExponent}, 0};
-    return {{kept, static_cast<uint16>(biased)}, rest};
+    if (biased >= kInfiniteExponent) return {kExtendedIntegerBit, kInfiniteExponent, 0};
+    return {kept, static_cast<uint32>(biased), rest};
 }
 
 }  // namespace tessel

@@ -2,11 +2,14 @@
    even one of two that are equally near. */
 #pragma once
 
+#include <array>
 #include <bit>
 #include <cstring>
 
 #include <tessel/base/NumericTypes.h>
 #include <tessel/numerics/PackedDecimal.h>
+
+#include "numerics/Extended.h"
 
 namespace tessel {
 
@@ -35,21 +38,32 @@ struct DecimalDigits {
    (at most 18 digits in all). Zero is one digit 0 with the exponent 0. */
 DecimalDigits RoundToDecimal(const RealParts& x, int32 precision);
 
-/* The positive extended real nearest to a decimal, and on which side of it the exact value lies (-1 below, 1 above, 0
-   when they are equal), for those who round once more. */
-struct NearestExtended {
-    floatExt value;
-    int32 rest;
-};
+/* The positive extended real nearest to digits * 10^exponent. digits must be below 10^18. */
+RoundedExtended FromDecimal(uint64 digits, int32 exponent);
 
-/* digits must be below 10^18. */
-NearestExtended FromDecimal(uint64 digits, int32 exponent);
+/* Eight decimal digits as bytes, the last digit in the lowest byte. */
+inline uint64 SpreadDigits(uint32 value) {
+    // Every step splits what it has in two, in all lanes at once: 4 digits, 2, 1. The factors divide by 100 and by 10.
+    uint64 lanes = (value % 10000) | static_cast<uint64>(value / 10000) << 32;
+    const uint64 hundreds = (lanes * 10486 >> 20) & 0x0000007F0000007F;
+    lanes = (lanes - 100 * hundreds) | hundreds << 16;
+    const uint64 tens = (lanes * 103 >> 10) & 0x000F000F000F000F;
+    return (lanes - 10 * tens) | tens << 8;
+}
 
 /* The digits of a record as an integer, and the reverse (at most 18 digits). */
 uint64 UnpackDigits(const PackedDecimal& record);
 void PackDigits(uint64 digits, PackedDecimal& record);
 
 /* 10 to the power 0 to 19. */
-uint64 PowerOfTen64(int32 power);
+inline constexpr std::array<uint64, 20> kPowersOfTen64 = [] {
+    std::array<uint64, 20> powers{};
+    powers[0] = 1;
+    for (size_t i = 1; i < powers.size(); ++i) powers[i] = powers[i - 1] * 10;
+    return powers;
+}();
+inline uint64 PowerOfTen64(int32 power) {
+    return kPowersOfTen64[static_cast<size_t>(power)];
+}
 
 }  // namespace tessel

@@ -17,6 +17,22 @@ inline constexpr uint16 kExtendedExponentMask = 0x7FFF;
 inline constexpr int kExtendedBias = 16383;
 inline constexpr uint64 kExtendedIntegerBit = uint64{1} << 63;
 
+/* An extended real that came about by rounding, as it is kept in registers: `rest` tells on which side of it the exact
+   value lies (-1 below, 1 above, 0 when they are equal), for those who round once more. */
+struct RoundedExtended {
+    uint64 mantissa;
+    uint32 signExponent;
+    int32 rest;
+};
+
+inline floatExt Pack(const RoundedExtended& x) {
+    return {x.mantissa, static_cast<uint16>(x.signExponent)};
+}
+
+inline RoundedExtended Unpack(const floatExt& x) {
+    return {x.mantissa, x.signExponent, 0};
+}
+
 #if LDBL_MANT_DIG == 64 && LDBL_MAX_EXP == 16384
 
 inline Extended ToExtended(const floatExt& value) {

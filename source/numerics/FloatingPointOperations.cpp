@@ -30,21 +30,34 @@ Extended IsInteger(Extended x) {
     return std::isfinite(x) && std::trunc(x) == x ? 1 : 0;
 }
 
-// Adds elements of type T that lie `stride` bytes apart.
-template <class T>
-Extended Sum(const T* first, int32 stride, int32 count) {
-    Extended sum = 0;
-    const auto* at = reinterpret_cast<const uint8*>(first);
-    for (int32 i = 0; i < count; ++i, at += stride) sum += ReadAs<T>(at);
-    return sum;
+Extended ReadElement(const uint8* at, const float*) {
+    return ReadAs<float>(at);
+}
+Extended ReadElement(const uint8* at, const double*) {
+    return ReadAs<double>(at);
+}
+Extended ReadElement(const uint8* at, const floatExt*) {
+    return ToExtended(ReadAs<floatExt>(at));
 }
 
-template <>
-Extended Sum(const floatExt* first, int32 stride, int32 count) {
-    Extended sum = 0;
+// Elements that lie `stride` bytes apart. Four sums side by side, so that an addition need not wait for the one before.
+template <class T>
+Extended Sum(const T* first, int32 stride, int32 count) {
     const auto* at = reinterpret_cast<const uint8*>(first);
-    for (int32 i = 0; i < count; ++i, at += stride) sum += ToExtended(ReadAs<floatExt>(at));
-    return sum;
+    const ptrdiff_t step = stride;
+    Extended a = 0;
+    Extended b = 0;
+    Extended c = 0;
+    Extended d = 0;
+    int32 left = count;
+    for (; left >= 4; left -= 4, at += 4 * step) {
+        a += ReadElement(at, first);
+        b += ReadElement(at + step, first);
+        c += ReadElement(at + 2 * step, first);
+        d += ReadElement(at + 3 * step, first);
+    }
+    for (; left > 0; --left, at += step) a += ReadElement(at, first);
+    return (a + b) + (c + d);
 }
 
 Complex Load(const cmplx64& z) {

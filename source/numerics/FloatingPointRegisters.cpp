@@ -1,12 +1,13 @@
 #include <tessel/numerics/FloatingPointRegisters.h>
 
-#include <algorithm>
+#include <bit>
 #include <cfenv>
+#include <limits>
+#include <type_traits>
 
 #include <tessel/numerics/NumericSupport.h>
 
 #include "numerics/DecimalConversion.h"
-#include "numerics/RealFunctions.h"
 #include "numerics/Registers.h"
 
 namespace tessel {
@@ -15,17 +16,21 @@ namespace {
 constexpr int kRegisters = 8;
 constexpr int kTopShift = 11;
 constexpr uint64 kQuietBit = uint64{1} << 62;
+constexpr RoundedExtended kNaN = {~uint64{0}, kExtendedExponentMask, 0};
+constexpr RoundedExtended kInfinity = {kExtendedIntegerBit, kExtendedExponentMask, 0};
+
+// A register holds a value's bits, so that what only passes through costs no floating-point instruction.
+using Register = RoundedExtended;
 
 // Registers are used from the last to the first, as a ring; `depth` of them are in use from `top` on.
 struct FloatingPointUnit {
-    Extended value[kRegisters];
-    int8 rest[kRegisters];
+    Register registers[kRegisters];
     int32 top;
     int32 depth;
     uint16 status;
 };
 
-thread_local FloatingPointUnit tUnit{};
+[[gnu::tls_model("initial-exec")]] thread_local FloatingPointUnit tUnit{};
 
 // The one save area of the process.
 struct SaveArea {
@@ -46,42 +51,83 @@ uint16 HostExceptions() {
     return status;
 }
 
-struct Register {
-    Extended value;
-    int32 rest;
-};
+void Push(const Register& value) {
+    FloatingPointUnit& unit = tUnit;
+    unit.top = (unit.top + kRegisters - 1) % kRegisters;
+    if (unit.depth == kRegisters) {
+        unit.status |= kFPStatInvalid | kFPStatStackFault | kFPStatStackOverflow;
+        unit.registers[unit.top] = kNaN;
+        return;
+    }
+    ++unit.depth;
+    unit.registers[unit.top] = value;
+}
 
-Register PopWithRest() {
+Register Pop() {
     FloatingPointUnit& unit = tUnit;
     if (unit.depth == 0) {
         unit.status = static_cast<uint16>((unit.status | kFPStatInvalid | kFPStatStackFault) & ~kFPStatStackOverflow);
-        return {real::NaN<Extended>(), 0};
+        return kNaN;
     }
-    const Register result{unit.value[unit.top], unit.rest[unit.top]};
+    const Register top = unit.registers[unit.top];
     unit.top = (unit.top + 1) % kRegisters;
     --unit.depth;
-    return result;
+    return top;
 }
 
-bool IsSignaling(Extended x) {
-    return std::isnan(x) && (FromExtended(x).mantissa & kQuietBit) == 0;
+// A double's bits as those of an extended real.
+Register Widen(double x) {
+    constexpr int32 kSpecial = 0x7FF;
+    constexpr int32 kRebias = kExtendedBias - 1023;
+    const auto bits = std::bit_cast<uint64>(x);
+    const auto exponent = static_cast<int32>(bits >> 52 & kSpecial);
+    if (exponent == 0 || exponent == kSpecial) return Unpack(FromExtended(x));
+    const auto sign = static_cast<uint32>(bits >> 48) & kExtendedSign;
+    return {kExtendedIntegerBit | bits << 11, sign | static_cast<uint32>(exponent + kRebias), 0};
 }
 
-// Stores a value into a narrower real. Where the value lies exactly between two of them, the rest decides.
+bool IsSignaling(const Register& x) {
+    return (x.signExponent & kExtendedExponentMask) == kExtendedExponentMask && (x.mantissa & kQuietBit) == 0 &&
+           x.mantissa << 1 != 0;
+}
+
+// How a narrower real is put together.
+template <class Real>
+struct NarrowFormat {
+    using Bits = std::conditional_t<sizeof(Real) == 4, uint32, uint64>;
+    static constexpr int32 kDropped = 64 - std::numeric_limits<Real>::digits;  // bits of the mantissa
+    static constexpr int32 kRebias = kExtendedBias - (std::numeric_limits<Real>::max_exponent - 1);
+    static constexpr int32 kLargestExponent = 2 * std::numeric_limits<Real>::max_exponent - 2;
+    static constexpr int32 kFractionBits = std::numeric_limits<Real>::digits - 1;
+    static constexpr int32 kSignBit = 8 * sizeof(Real) - 1;
+};
+
+// Rounds to nearest; where the value lies exactly between two of the narrower reals, the rest decides.
 template <class Real>
 Real Narrow(const Register& from) {
-    const auto nearest = static_cast<Real>(from.value);
-    if (from.rest == 0 || !std::isfinite(nearest) || static_cast<Extended>(nearest) == from.value) return nearest;
-    const Real toward = static_cast<Extended>(nearest) < from.value ? real::kInfinity<Real> : -real::kInfinity<Real>;
-    const Real other = std::nextafter(nearest, toward);
-    const bool between = from.value - nearest == other - from.value;
-    return between && (from.rest > 0) == (toward > 0) ? other : nearest;
+    using Format = NarrowFormat<Real>;
+    const uint64 mantissa = from.mantissa;
+    const int32 exponent = (from.signExponent & kExtendedExponentMask) - Format::kRebias;
+    const int32 dropped = Format::kDropped + (exponent < 1 ? 1 - exponent : 0);
+    if (mantissa >> 63 == 0 || dropped > 63 || exponent >= Format::kLargestExponent) {
+        return static_cast<Real>(ToExtended(Pack(from)));
+    }
+    const uint64 half = uint64{1} << (dropped - 1);
+    const uint64 tail = mantissa & (2 * half - 1);
+    const uint64 kept = mantissa >> dropped;
+    const int32 outward = (from.signExponent & kExtendedSign) != 0 ? -from.rest : from.rest;
+    const bool up = tail > half || (tail == half && (outward > 0 || (outward == 0 && (kept & 1) != 0)));
+    // The integer bit adds one to the exponent, and so does a carry out of the mantissa.
+    const auto below = static_cast<uint64>(exponent < 1 ? 0 : exponent - 1);
+    const uint64 magnitude = (below << Format::kFractionBits) + kept + (up ? 1 : 0);
+    const uint64 sign = static_cast<uint64>(from.signExponent >> 15) << Format::kSignBit;
+    return std::bit_cast<Real>(static_cast<typename Format::Bits>(sign | magnitude));
 }
 
 template <class Real>
 Real PopNarrow() {
-    const Register top = PopWithRest();
-    if (IsSignaling(top.value)) tUnit.status |= kFPStatInvalid;
+    const Register top = Pop();
+    if (IsSignaling(top)) tUnit.status |= kFPStatInvalid;
     return Narrow<Real>(top);
 }
 
@@ -123,22 +169,12 @@ void StoreDecimal(const RealParts& x, int32 digits, PackedDecimal& record) {
 
 }  // namespace
 
-void PushRegister(Extended value, int32 rest) {
-    FloatingPointUnit& unit = tUnit;
-    unit.top = (unit.top + kRegisters - 1) % kRegisters;
-    if (unit.depth == kRegisters) {
-        unit.status |= kFPStatInvalid | kFPStatStackFault | kFPStatStackOverflow;
-        value = real::NaN<Extended>();
-        rest = 0;
-    } else {
-        ++unit.depth;
-    }
-    unit.value[unit.top] = value;
-    unit.rest[unit.top] = static_cast<int8>(rest);
+void PushRegister(Extended value) {
+    Push(Unpack(FromExtended(value)));
 }
 
 Extended PopRegister() {
-    return PopWithRest().value;
+    return ToExtended(Pack(Pop()));
 }
 
 void PushComplex(const ExtendedComplex& value) {
@@ -198,27 +234,25 @@ void FPLoadFlt32(const float* value) {
 }
 
 void FPLoadFlt64(const double* value) {
-    PushRegister(*value);
+    Push(Widen(*value));
 }
 
 void FPLoadExt(const floatExt* value) {
-    PushRegister(ToExtended(*value));
+    Push(Unpack(*value));
 }
 
 void FPLoadPDR(const PackedDecimal* record) {
-    const bool negative = record->sign != 0;
-    Extended value = 0;
-    int32 rest = 0;
-    if (record->exponent == kPackedDecimalNaNExponent) {
-        value = real::NaN<Extended>();
-    } else if (record->exponent == kPackedDecimalInfExponent) {
-        value = real::kInfinity<Extended>;
-    } else {
-        const NearestExtended nearest = FromDecimal(UnpackDigits(*record), record->exponent);
-        value = ToExtended(nearest.value);
-        rest = nearest.rest;
+    Register value = kNaN;
+    if (record->exponent == kPackedDecimalInfExponent) {
+        value = kInfinity;
+    } else if (record->exponent != kPackedDecimalNaNExponent) {
+        value = FromDecimal(UnpackDigits(*record), record->exponent);
     }
-    PushRegister(negative ? -value : value, negative ? -rest : rest);
+    if (record->sign != 0) {
+        value.signExponent |= kExtendedSign;
+        value.rest = -value.rest;
+    }
+    Push(value);
 }
 
 void NumToFPR(int16 code, const void* value) {
@@ -232,13 +266,13 @@ void NumToFPR(int16 code, const void* value) {
 
 void FPPush(void) {
     const bool wasEmpty = tUnit.depth == 0;
-    const Register top = PopWithRest();
-    if (!wasEmpty) PushRegister(top.value, top.rest);
-    PushRegister(top.value, top.rest);
+    const Register top = Pop();
+    if (!wasEmpty) Push(top);
+    Push(top);
 }
 
 void FPPop(void) {
-    PopWithRest();
+    Pop();
 }
 
 // ---- stores ----
@@ -266,11 +300,11 @@ void FPStoreFlt64(double* value) {
 }
 
 void FPStoreExt(floatExt* value) {
-    *value = FromExtended(PopRegister());
+    *value = Pack(Pop());
 }
 
 void FPStorePDR(int32 digits, PackedDecimal* record) {
-    StoreDecimal(TakeApart(FromExtended(PopRegister())), digits, *record);
+    StoreDecimal(TakeApart(Pack(Pop())), digits, *record);
 }
 
 int32 FPRToNum(int16 code, void* value) {

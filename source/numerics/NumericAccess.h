@@ -41,8 +41,39 @@ inline int16 TypeOfCode(int16 code) {
     return static_cast<int16>(code & 15);
 }
 
+/* The integer types are 1 to 4 (signed) and 5 to 8 (unsigned), by width. */
+inline bool IsIntegerType(int16 type) {
+    return type >= kNumInt8 && type <= kNumUInt64;
+}
+inline bool IsSignedType(int16 type) {
+    return type <= kNumInt64;
+}
+inline int32 IntegerBits(int16 type) {
+    return 8 << ((type - kNumInt8) & 3);
+}
+
 /* The bits of an integer, sign- or zero-extended; 0 for a type that is not an integer. */
-uint64 ReadInteger(int16 type, const void* source);
+inline uint64 ReadInteger(int16 type, const void* source) {
+    switch (type) {
+        case kNumInt8:
+            return static_cast<uint64>(int64{ReadAs<int8>(source)});
+        case kNumInt16:
+            return static_cast<uint64>(int64{ReadAs<int16>(source)});
+        case kNumInt32:
+            return static_cast<uint64>(int64{ReadAs<int32>(source)});
+        case kNumUInt8:
+            return ReadAs<uint8>(source);
+        case kNumUInt16:
+            return ReadAs<uint16>(source);
+        case kNumUInt32:
+            return ReadAs<uint32>(source);
+        case kNumInt64:
+        case kNumUInt64:
+            return ReadAs<uint64>(source);
+        default:
+            return 0;
+    }
+}
 
 /* Writes the low bytes. */
 void WriteInteger(int16 type, uint64 value, void* destination);

@@ -27,37 +27,11 @@ bool IsNumericCode(int16 code) {
     return code >= kFirstCode && code <= kLastCode;
 }
 
-bool IsInteger(int16 type) {
-    return kNumClasses[type] <= kNumClassUnsigned;
-}
-
 const void* ImaginaryExtended(const void* value) {
     return static_cast<const uint8*>(value) + gNumSizes[kNumExtended];
 }
 
 }  // namespace
-
-uint64 ReadInteger(int16 type, const void* source) {
-    switch (type) {
-        case kNumInt8:
-            return static_cast<uint64>(int64{ReadAs<int8>(source)});
-        case kNumInt16:
-            return static_cast<uint64>(int64{ReadAs<int16>(source)});
-        case kNumInt32:
-            return static_cast<uint64>(int64{ReadAs<int32>(source)});
-        case kNumUInt8:
-            return ReadAs<uint8>(source);
-        case kNumUInt16:
-            return ReadAs<uint16>(source);
-        case kNumUInt32:
-            return ReadAs<uint32>(source);
-        case kNumInt64:
-        case kNumUInt64:
-            return ReadAs<uint64>(source);
-        default:
-            return 0;
-    }
-}
 
 void WriteInteger(int16 type, uint64 value, void* destination) {
     switch (type) {
@@ -177,7 +151,7 @@ void ConvertNum(int16 sourceCode, const void* source, int16 destinationCode, voi
     }
     const int16 from = TypeOfCode(sourceCode);
     const int16 to = TypeOfCode(destinationCode);
-    if (IsInteger(from) && IsInteger(to)) {
+    if (IsIntegerType(from) && IsIntegerType(to)) {
         WriteInteger(to, ReadInteger(from, source), destination);
     } else {
         WriteNumber(to, ReadNumber(from, source), destination);

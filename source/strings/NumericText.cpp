@@ -74,7 +74,7 @@ IntegerImage ConvertTo(const ExtendedComplex& value) {
 }
 
 // Reals and complex values in an integer format.
-IntegerImage ImageOfReal(int16 type, const void* value, int32 code) {
+[[gnu::noinline]] IntegerImage ImageOfReal(int16 type, const void* value, int32 code) {
     const ExtendedComplex number = ReadNumber(type, value);
     if (code == kFormatDecimal) return ConvertTo<int32>(number);
     if (code == kFormatUnsigned) return ConvertTo<uint32>(number);
@@ -86,13 +86,16 @@ IntegerImage ImageOfReal(int16 type, const void* value, int32 code) {
 }
 
 int32 RenderIntegerFormat(const void* value, int16 type, int32 code, char* buffer, int32 size) {
-    const int32 numberClass = NumClass(type);
-    const bool isInteger = numberClass <= kNumClassUnsigned;
+    const bool isInteger = IsIntegerType(type);
     const IntegerImage image =
-        isInteger ? IntegerImage{ReadInteger(type, value), 8 * NumSize(type)} : ImageOfReal(type, value, code);
-    if (code == kFormatDecimal && numberClass != kNumClassUnsigned) {
+        isInteger ? IntegerImage{ReadInteger(type, value), IntegerBits(type)} : ImageOfReal(type, value, code);
+    if (code == kFormatDecimal && (!isInteger || IsSignedType(type))) {
         const bool negative = static_cast<int64>(image.bits) < 0;
-        return NumToStr(negative ? 0 - image.bits : image.bits, negative, 10, buffer, size);
+        const uint64 magnitude = negative ? 0 - image.bits : image.bits;
+        if (size <= kLongestDecimal) return NumToStr(magnitude, negative, 10, buffer, size);
+        char* const end = WriteDecimal(buffer, magnitude, negative);
+        *end = 0;
+        return static_cast<int32>(end - buffer);
     }
     return NumToStr(image.bits & (~uint64{0} >> (64 - image.width)), false, RadixOf(code), buffer, size);
 }
@@ -270,19 +273,6 @@ int32 RenderComplex(const ExtendedComplex& value, int32 code, char* buffer, int3
     return out.Length();
 }
 
-int32 RenderNumber(const void* value, int16 type, int32 code, char* buffer, int32 size, char decimalPoint,
-                   int32* slot) {
-    const bool isComplex = NumClass(type) == kNumClassComplex;
-    const FormatClass format = Classify(code);
-    if (format == FormatClass::kUnknown) TESSEL_REPORT(kDebugWarning, 0x83C7E15Au) << "Bad k_code: " << code;
-    if (isComplex) {
-        if (format == FormatClass::kOther) code = SetFormat(code);
-        return RenderComplex(ReadNumber(type, value), code, buffer, size, decimalPoint, slot);
-    }
-    if (format == FormatClass::kPolar) code += kPolarOffset;
-    return RenderPart(SourceOf(type, value), code, buffer, size, decimalPoint, slot);
-}
-
 // Terminates a rendering that has no terminator yet.
 int32 Terminate(char* buffer, int32 size, int32 length) {
     if (length >= size) {
@@ -293,10 +283,25 @@ int32 Terminate(char* buffer, int32 size, int32 length) {
     return length;
 }
 
-int32 RenderNull(int16 type, char* buffer, int32 size) {
+[[gnu::noinline]] int32 RenderNull(int16 type, char* buffer, int32 size) {
     TextOut out(buffer, size);
     out.Put(NumClass(type) == kNumClassComplex ? "0 + 0i" : "0");
     return Terminate(buffer, size, out.Length());
+}
+
+[[gnu::noinline]] int32 RenderNumber(const void* value, int16 type, int32 code, char* buffer, int32 size,
+                                     char decimalPoint, int32* slot) {
+    const FormatClass format = Classify(code);
+    if (format == FormatClass::kUnknown) TESSEL_REPORT(kDebugWarning, 0x83C7E15Au) << "Bad k_code: " << code;
+    int32 length = 0;
+    if (NumClass(type) == kNumClassComplex) {
+        if (format == FormatClass::kOther) code = SetFormat(code);
+        length = RenderComplex(ReadNumber(type, value), code, buffer, size, decimalPoint, slot);
+    } else {
+        if (format == FormatClass::kPolar) code += kPolarOffset;
+        length = RenderPart(SourceOf(type, value), code, buffer, size, decimalPoint, slot);
+    }
+    return Terminate(buffer, size, length);
 }
 
 }  // namespace
@@ -311,6 +316,5 @@ int32 NumToAnyString(const void* value, int16 typeCode, const int16* formatCode,
     const int32 code = *formatCode;
     if (value == nullptr) return RenderNull(type, buffer, size);
     if (code >= kFormatDecimal && code <= kFormatBinary) return RenderIntegerFormat(value, type, code, buffer, size);
-    const int32 length = RenderNumber(value, type, code, buffer, size, static_cast<char>(decimalPoint), sharedExponent);
-    return Terminate(buffer, size, length);
+    return RenderNumber(value, type, code, buffer, size, static_cast<char>(decimalPoint), sharedExponent);
 }

@@ -1,5 +1,3 @@
-#include <array>
-
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/numerics/NumericSupport.h>
 #include <tessel/strings/NumericText.h>
@@ -11,17 +9,7 @@ namespace tessel {
 namespace {
 
 constexpr char kDigitTable[] = "0123456789ABCDEF";
-constexpr int32 kLongestDecimal = 20;  // of 64 bits, or 63 and a sign
-constexpr int32 kMostDigits = 64;      // of 64 bits in radix 2
-
-constexpr std::array<char, 200> kDigitPairs = [] {
-    std::array<char, 200> pairs{};
-    for (int i = 0; i < 100; ++i) {
-        pairs[2 * i] = static_cast<char>('0' + i / 10);
-        pairs[2 * i + 1] = static_cast<char>('0' + i % 10);
-    }
-    return pairs;
-}();
+constexpr int32 kMostDigits = 64;  // of 64 bits in radix 2
 
 bool IsRadix(int32 radix) {
     return radix == 2 || radix == 8 || radix == 10 || radix == 16;
@@ -62,28 +50,11 @@ int32 WriteLowDigits(uint64 magnitude, bool negative, int32 radix, char* buffer,
 
 }  // namespace
 
-void WriteDigits(uint64 value, int32 count, char* out) {
-    char* at = out + count;
-    for (; at - out >= 2 && value > 0xFFFFFFFF; value /= 100) {
-        at -= 2;
-        std::memcpy(at, &kDigitPairs[2 * (value % 100)], 2);
-    }
-    auto rest = static_cast<uint32>(value);
-    for (; at - out >= 2; rest /= 100) {
-        at -= 2;
-        std::memcpy(at, &kDigitPairs[2 * (rest % 100)], 2);
-    }
-    if (at > out) *out = static_cast<char>('0' + rest % 10);
-}
-
 int32 NumToStr(uint64 magnitude, bool negative, int32 radix, char* buffer, int32 size, bool* complete) {
-    if (radix == 10 && size > kLongestDecimal + 1) {
-        const int32 count = CountDigits(magnitude);
-        char* at = buffer;
-        if (negative) *at++ = '-';
-        WriteDigits(magnitude, count, at);
-        at[count] = 0;
-        return static_cast<int32>(at - buffer) + count;
+    if (radix == 10 && size > kLongestDecimal) {
+        char* const end = WriteDecimal(buffer, magnitude, negative);
+        *end = 0;
+        return static_cast<int32>(end - buffer);
     }
     if (size < 2) {
         TESSEL_REPORT(kDebugWarning, 0xD40A5E72u) << "NumToStr requires at least 2 bytes in the input buffer.";
@@ -99,11 +70,9 @@ int32 NumToStr(uint64 magnitude, bool negative, int32 radix, char* buffer, int32
 
 int32 WriteExponent(int32 exponent, char* out) {
     const auto magnitude = static_cast<uint32>(exponent < 0 ? -exponent : exponent);
-    const int32 count = CountDigits(magnitude);
     out[0] = 'E';
     out[1] = exponent < 0 ? '-' : '+';
-    WriteDigits(magnitude, count, out + 2);
-    return count + 2;
+    return static_cast<int32>(WriteDecimal(out + 2, magnitude, false) - out);
 }
 
 }  // namespace tessel
@@ -113,14 +82,14 @@ using namespace tessel;
 int32 NumToIntString(const void* value, char* buffer, int32 size, int32 radix, bool isSigned, int16 typeCode) {
     int16 type = TypeOfCode(typeCode);
     uint32 converted = 0;
-    if (value == nullptr || NumClass(type) > kNumClassUnsigned) {
+    if (value == nullptr || !IsIntegerType(type)) {
         const int16 integerType = isSigned ? kNumInt32 : kNumUInt32;
         if (value != nullptr && NumClass(type) != kNumClassNone) ConvertNum(type, value, integerType, &converted);
         value = &converted;
         type = integerType;
     }
     const uint64 bits = ReadInteger(type, value);
-    const int32 width = 8 * NumSize(type);
+    const int32 width = IntegerBits(type);
     if (isSigned && radix == 10) {
         const int64 number = width == 64 ? static_cast<int64>(bits) : static_cast<int32>(bits);
         const auto magnitude = static_cast<uint64>(number);

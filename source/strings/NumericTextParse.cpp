@@ -1,9 +1,7 @@
 // Text to numbers: reals into decimal records, integers in any radix.
 #include <array>
 #include <limits>
-#include <type_traits>
 
-#include <tessel/numerics/NumericSupport.h>
 #include <tessel/strings/NumericText.h>
 
 #include "numerics/NumericAccess.h"
@@ -22,200 +20,173 @@ constexpr int32 kMostExponentDigits = 4;
 constexpr int32 kLargestExponent = 32765;  // of a finite record
 constexpr int32 kFarPoint = 1000000;       // beyond any exponent; keeps the position of the point from overflowing
 
+// A state of the text is a function, which goes on to the next state. Each returns true when a number was read, and
+// false when the record holds already what it should (a zero, a special value).
 class RealParser {
 public:
     RealParser(const char* text, int32 length, char decimalPoint)
-        : at_(text), end_(text + length), decimalPoint_(decimalPoint) {}
+        : at_(text), end_(text + std::max(length, int32{0})), decimalPoint_(decimalPoint == 0 ? '.' : decimalPoint) {}
 
     // True when the whole text was one number.
     bool Parse(PackedDecimal& record) {
-        record = {};
-        record.mdigits = 1;
-        State state = State::kStart;
-        while (state != State::kStop && state != State::kFinish) state = Step(state, record);
-        if (state == State::kFinish) Finish(record);
+        record = {{}, 0, 0, 1};
+        if (Start(record)) Finish(record);
         return whole_;
     }
 
 private:
-    enum class State {
-        kStart,
-        kAfterSign,
-        kInteger,
-        kFraction,
-        kMantissaFull,
-        kFractionIgnored,
-        kExponentLetter,
-        kExponentSign,
-        kExponentDigits,
-        kFinish,
-        kStop
-    };
-
     // The character at the cursor; the end of the text acts as a zero byte.
     char Peek() const { return at_ < end_ ? *at_ : '\0'; }
-    bool AtPoint(char c) const { return c == '.' || (c == decimalPoint_ && c != 0); }
+    bool AtPoint(char c) const { return c == '.' || c == decimalPoint_; }
     static bool IsExponentLetter(char c) { return c == 'E' || c == 'e'; }
 
-    State Step(State state, PackedDecimal& record) {
-        switch (state) {
-            case State::kStart:
-            case State::kAfterSign:
-                return Begin(state, record);
-            case State::kInteger:
-                return Integer();
-            case State::kFraction:
-                return Fraction();
-            case State::kMantissaFull:
-                return MantissaFull();
-            case State::kFractionIgnored:
-                return FractionIgnored();
-            case State::kExponentLetter:
-            case State::kExponentSign:
-                return BeginExponent(state);
-            default:
-                return ExponentDigits();
+    bool Start(PackedDecimal& record) {
+        for (;; ++at_) {
+            const char c = Peek();
+            if (c == '+' || c == '-') {
+                ++at_;
+                if (c == '-') record.sign = kPackedDecimalNegativeSign;
+                return AfterSign(record);
+            }
+            if (c == 0) return false;
+            if (StartsNumber(c)) return Number(c, record);
+            if (c != '0') whole_ = false;
         }
     }
 
-    State Begin(State state, PackedDecimal& record) {
-        const bool mayHaveSign = state == State::kStart;
-        const char c = Peek();
-        if (c >= '1' && c <= '9') return State::kInteger;
-        if (c == 0) return State::kStop;
+    bool AfterSign(PackedDecimal& record) {
+        for (;; ++at_) {
+            const char c = Peek();
+            if (StartsNumber(c)) return Number(c, record);
+            if (c != ' ' && c != '0') return Stop(c);
+        }
+    }
+
+    bool StartsNumber(char c) const {
+        return (c >= '1' && c <= '9') || AtPoint(c) || IsExponentLetter(c) || AtWord("inf") || AtWord("nan");
+    }
+
+    bool Number(char c, PackedDecimal& record) {
+        if (c >= '1' && c <= '9') return Integer();
         if (AtPoint(c)) {
             ++at_;
             point_ = -1;
-            return State::kFraction;
+            return Fraction();
         }
-        if (IsExponentLetter(c)) return TakeExponentLetter();
-        if (TakeWord("inf")) return StopAtSpecial(record, kPackedDecimalInfExponent);
-        if (TakeWord("nan")) return StopAtSpecial(record, kPackedDecimalNaNExponent);
-        if (mayHaveSign && (c == '+' || c == '-')) {
-            if (c == '-') record.sign = kPackedDecimalNegativeSign;
-            ++at_;
-            return State::kAfterSign;
-        }
-        if (c != '0' && (mayHaveSign || c != ' ')) {
-            whole_ = false;
-            if (!mayHaveSign) return State::kStop;
-        }
-        ++at_;
-        return state;
+        if (IsExponentLetter(c)) return ExponentLetter();
+        record.exponent = AtWord("inf") ? kPackedDecimalInfExponent : kPackedDecimalNaNExponent;
+        at_ += 3;
+        return Stop(Peek());
     }
 
-    bool TakeWord(const char* word) {
+    bool AtWord(const char* word) const {
         if (end_ - at_ < 3) return false;
         for (int i = 0; i < 3; ++i) {
             if ((at_[i] | 0x20) != word[i]) return false;
         }
-        at_ += 3;
         return true;
     }
 
-    State StopAtSpecial(PackedDecimal& record, int16 exponent) {
-        record.exponent = exponent;
-        if (Peek() != 0) whole_ = false;
-        return State::kStop;
-    }
-
-    // Copies digits while there is room for them.
+    // Takes digits while there is room for them.
     void KeepDigits() {
-        for (; at_ < end_ && IsDigit(*at_) && count_ < kPackedDecimalDigits; ++at_) digits_[count_++] = *at_;
+        for (; at_ < end_ && IsDigit(*at_) && count_ < kPackedDecimalDigits; ++at_, ++count_) {
+            highDigits_ = highDigits_ << 4 | lowDigits_ >> 60;
+            lowDigits_ = lowDigits_ << 4 | static_cast<uint64>(*at_ - '0');
+        }
     }
 
-    State Integer() {
+    bool Integer() {
         KeepDigits();
         point_ = count_ - 1;
-        if (count_ == kPackedDecimalDigits) return State::kMantissaFull;
+        if (count_ == kPackedDecimalDigits) return MantissaFull();
         const char c = Peek();
         if (AtPoint(c)) {
             ++at_;
-            return State::kFraction;
+            return Fraction();
         }
-        if (IsExponentLetter(c)) return TakeExponentLetter();
-        if (c == ' ') return State::kMantissaFull;
-        return FinishAt(c);
+        if (IsExponentLetter(c)) return ExponentLetter();
+        return c == ' ' ? MantissaFull() : FinishAt(c);
     }
 
-    State Fraction() {
+    bool Fraction() {
         if (count_ == 0) {
             for (; Peek() == '0'; ++at_) point_ = std::max(point_ - 1, -kFarPoint);
         }
         KeepDigits();
         const char c = Peek();
-        if (count_ == kPackedDecimalDigits || c == ' ') return State::kFractionIgnored;
-        if (IsExponentLetter(c)) return TakeExponentLetter();
-        return FinishAt(c);
+        if (count_ == kPackedDecimalDigits || c == ' ') return FractionIgnored();
+        return IsExponentLetter(c) ? ExponentLetter() : FinishAt(c);
     }
 
     // Digits that are not kept raise the exponent. A digit after a space is not part of the number.
-    State MantissaFull() {
+    bool MantissaFull() {
         for (; IsDigit(Peek()); ++at_) point_ = std::min(point_ + 1, kFarPoint);
         while (Peek() == ' ') ++at_;
         const char c = Peek();
         if (AtPoint(c)) {
             ++at_;
-            return State::kFractionIgnored;
+            return FractionIgnored();
         }
-        if (IsExponentLetter(c)) return TakeExponentLetter();
-        return FinishAt(c);
+        return IsExponentLetter(c) ? ExponentLetter() : FinishAt(c);
     }
 
-    State FractionIgnored() {
-        const char c = Peek();
-        if (c == 0) return State::kFinish;
-        if (IsExponentLetter(c)) return TakeExponentLetter();
-        if (!IsDigit(c) && c != ' ') whole_ = false;
+    bool FractionIgnored() {
+        for (;; ++at_) {
+            const char c = Peek();
+            if (c == 0) return true;
+            if (IsExponentLetter(c)) return ExponentLetter();
+            if (!IsDigit(c) && c != ' ') whole_ = false;
+        }
+    }
+
+    bool ExponentLetter() {
         ++at_;
-        return State::kFractionIgnored;
-    }
-
-    State TakeExponentLetter() {
-        ++at_;
-        return State::kExponentLetter;
-    }
-
-    State BeginExponent(State state) {
-        while (Peek() == ' ') ++at_;
+        SkipSpaces();
         const char c = Peek();
-        if (IsDigit(c)) return State::kExponentDigits;
-        if (state == State::kExponentLetter && (c == '+' || c == '-')) {
+        if (c == '+' || c == '-') {
             exponentNegative_ = c == '-';
             ++at_;
-            return State::kExponentSign;
+            SkipSpaces();
         }
-        return FinishAt(c);
+        return IsDigit(Peek()) ? ExponentDigits() : FinishAt(Peek());
     }
 
-    State ExponentDigits() {
+    bool ExponentDigits() {
         int32 read = 0;
         for (; read < kMostExponentDigits && IsDigit(Peek()); ++read) exponent_ = 10 * exponent_ + (*at_++ - '0');
-        return read == kMostExponentDigits ? State::kFinish : FinishAt(Peek());
+        return read == kMostExponentDigits || FinishAt(Peek());
     }
 
-    State FinishAt(char c) {
+    void SkipSpaces() {
+        while (Peek() == ' ') ++at_;
+    }
+
+    bool FinishAt(char c) {
         if (c != 0) whole_ = false;
-        return State::kFinish;
+        return true;
+    }
+
+    bool Stop(char c) {
+        FinishAt(c);
+        return false;
     }
 
     void Finish(PackedDecimal& record) {
         const int32 exponent = (exponentNegative_ ? -exponent_ : exponent_) + point_ - count_ + 1;
         record.exponent = static_cast<int16>(std::clamp(exponent, -kLargestExponent, kLargestExponent));
         record.mdigits = static_cast<int16>(count_);
-        for (int32 i = 0; i < count_; ++i) {
-            const int32 digit = digits_[count_ - 1 - i] - '0';
-            record.mantissa[i / 2] |= static_cast<uint8>(i % 2 == 0 ? digit : digit << 4);
-        }
+        std::memcpy(record.mantissa, &lowDigits_, sizeof lowDigits_);
+        record.mantissa[sizeof lowDigits_] = static_cast<uint8>(highDigits_);
     }
 
     const char* at_;
     const char* const end_;
     const char decimalPoint_;
     bool whole_ = true;
-    char digits_[kPackedDecimalDigits];
+    uint64 lowDigits_ = 0;  // the digits kept, four bits each
+    uint64 highDigits_ = 0;
     int32 count_ = 0;
-    int32 point_ = 0;  // the power of ten of the first kept digit
+    int32 point_ = 0;  // the power of ten of the first digit kept
     int32 exponent_ = 0;
     bool exponentNegative_ = false;
 };
@@ -232,16 +203,40 @@ constexpr std::array<uint8, 256> kDigitValues = [] {
     return values;
 }();
 
-class PointerSource {
+// Text in memory.
+class MemoryText {
 public:
-    explicit PointerSource(const char* at) : at_(at) {}
+    MemoryText(const char* text, int32 length) : begin_(text), at_(text), end_(text + std::max(length, int32{0})) {}
+    bool AtEnd() const { return at_ == end_; }
     uint8 Current() const { return static_cast<uint8>(*at_); }
     void Advance() { ++at_; }
-    void StepBack(int32 count) { at_ -= count; }
+    void Rewind() { at_ = begin_; }
     const char* At() const { return at_; }
 
 private:
+    const char* begin_;
     const char* at_;
+    const char* end_;
+};
+
+// The characters of a source, up to a length.
+class SourceText {
+public:
+    SourceText(CharacterSource& source, int32 length) : source_(source), length_(length) {}
+    bool AtEnd() const { return read_ >= length_; }
+    uint8 Current() const { return source_.Current(); }
+    void Advance() {
+        source_.Advance();
+        ++read_;
+    }
+    void Rewind() {
+        if (read_ != 0) source_.StepBack(read_);
+    }
+
+private:
+    CharacterSource& source_;
+    int32 length_;
+    int32 read_ = 0;
 };
 
 // What an integer is parsed into: its width and whether it is signed.
@@ -252,17 +247,15 @@ struct IntegerType {
 
 IntegerType IntegerTypeOf(int16 typeCode, int32 widest) {
     const int16 type = TypeOfCode(typeCode);
-    const int32 numberClass = NumClass(type);
-    if (numberClass > kNumClassUnsigned) return {32, true};
-    return {std::min(8 * NumSize(type), widest), numberClass == kNumClassSigned};
+    if (!IsIntegerType(type)) return {32, true};
+    return {std::min(IntegerBits(type), widest), IsSignedType(type)};
 }
 
-// Value and sign of a text, before they are fitted to the type; `value` is held at `limit`.
+// Magnitude and sign of a text, before they are fitted to the type.
 template <class Word>
 struct Parsed {
     Word value;
     bool negative;
-    bool overflowed;
 };
 
 template <class Word>
@@ -270,51 +263,58 @@ constexpr Word kSignBit = Word{1} << (8 * sizeof(Word) - 1);
 
 template <class Word>
 bool AddDigit(Word& value, uint32 radix, uint32 digit, Word limit) {
-    Word next;
-    if (__builtin_mul_overflow(value, static_cast<Word>(radix), &next) ||
-        __builtin_add_overflow(next, static_cast<Word>(digit), &next) || next > limit) {
-        return false;
+    if constexpr (sizeof(Word) < sizeof(uint64)) {
+        const uint64 next = uint64{value} * radix + digit;
+        if (next > limit) return false;
+        value = static_cast<Word>(next);
+    } else {
+        Word next;
+        if (__builtin_mul_overflow(value, Word{radix}, &next) || __builtin_add_overflow(next, Word{digit}, &next) ||
+            next > limit) {
+            return false;
+        }
+        value = next;
     }
-    value = next;
     return true;
 }
 
-// Reads spaces, sign and digits. The source is left where it was when there is no digit.
-template <class Word, class Source>
-Parsed<Word> ScanInteger(Source& source, int32 length, bool isSigned, int32 radix, bool noSign) {
-    Parsed<Word> parsed{0, false, false};
-    int32 read = 0;
-    auto advance = [&] {
-        source.Advance();
-        ++read;
-    };
-    while (read < length && source.Current() == ' ') advance();
-    if (!noSign && read < length && (source.Current() == '+' || source.Current() == '-')) {
-        parsed.negative = source.Current() == '-';
-        advance();
-    }
+template <class Text>
+uint32 DigitAt(const Text& text) {
+    return text.AtEnd() ? kNoDigit : kDigitValues[text.Current()];
+}
+
+template <class Text>
+[[gnu::always_inline]] inline bool TakeSign(Text& text) {
+    if (text.AtEnd()) return false;
+    const uint8 c = text.Current();
+    if (c == '+' || c == '-') text.Advance();
+    return c == '-';
+}
+
+// Reads spaces, sign and digits. The text is left where it was when there is no digit.
+template <class Word, class Text>
+[[gnu::always_inline]] inline Parsed<Word> ScanInteger(Text& text, bool isSigned, uint32 radix, bool noSign) {
+    while (!text.AtEnd() && text.Current() == ' ') text.Advance();
+    const bool negative = !noSign && TakeSign(text);
     Word limit = std::numeric_limits<Word>::max();
-    if (isSigned && radix == 10) limit = parsed.negative ? kSignBit<Word> : kSignBit<Word> - 1;
-    const int32 beforeDigits = read;
-    while (read < length) {
-        const uint32 digit = kDigitValues[source.Current()];
-        if (digit >= static_cast<uint32>(radix)) break;
-        if (!parsed.overflowed && !AddDigit(parsed.value, static_cast<uint32>(radix), digit, limit)) {
-            parsed.overflowed = true;
-            parsed.value = isSigned && radix != 10 ? kSignBit<Word> - 1 : limit;
-        }
-        advance();
+    if (isSigned && radix == 10) limit = kSignBit<Word> - (negative ? 0 : 1);
+    if (DigitAt(text) >= radix) {
+        text.Rewind();
+        return {0, false};
     }
-    if (read == beforeDigits) {
-        if (read != 0) source.StepBack(read);
-        return {0, false, false};
+    Word value = 0;
+    for (uint32 digit = DigitAt(text); digit < radix; digit = DigitAt(text)) {
+        text.Advance();
+        if (AddDigit(value, radix, digit, limit)) continue;
+        while (DigitAt(text) < radix) text.Advance();
+        return {isSigned && radix != 10 ? kSignBit<Word> - 1 : limit, negative};
     }
-    return parsed;
+    return {value, negative};
 }
 
 // In radix 10: the number, held at the limits of the type.
 template <class Word>
-Word FitNumber(const Parsed<Word>& parsed, const IntegerType& type) {
+[[gnu::always_inline]] inline Word FitNumber(const Parsed<Word>& parsed, const IntegerType& type) {
     const Word unsignedMaximum =
         std::numeric_limits<Word>::max() >> (8 * sizeof(Word) - static_cast<size_t>(type.bits));
     if (!type.isSigned) return parsed.negative ? 0 : std::min(parsed.value, unsignedMaximum);
@@ -324,30 +324,30 @@ Word FitNumber(const Parsed<Word>& parsed, const IntegerType& type) {
 
 // In another radix: the bits, or the largest value of the type when there are too many.
 template <class Word>
-Word FitBits(const Parsed<Word>& parsed, const IntegerType& type) {
+[[gnu::always_inline]] inline Word FitBits(const Parsed<Word>& parsed, const IntegerType& type) {
     const Word mask = std::numeric_limits<Word>::max() >> (8 * sizeof(Word) - static_cast<size_t>(type.bits));
     Word bits = parsed.value;
     if (bits > mask) bits = type.isSigned ? mask >> 1 : mask;
     return parsed.negative ? Word{0} - bits : bits;
 }
 
-template <class Word, class Source>
-Word ParseInteger(Source& source, int32 length, const IntegerType& type, int32 radix, bool noSign) {
+template <class Word, class Text>
+[[gnu::always_inline]] inline Word ParseInteger(Text& text, const IntegerType& type, int32 radix, bool noSign) {
+    if (radix == 10) return FitNumber(ScanInteger<Word>(text, type.isSigned, 10, noSign), type);
     if (radix < 2 || radix > 36) return 0;
-    const Parsed<Word> parsed = ScanInteger<Word>(source, length, type.isSigned, radix, noSign);
-    return radix == 10 ? FitNumber(parsed, type) : FitBits(parsed, type);
+    return FitBits(ScanInteger<Word>(text, type.isSigned, static_cast<uint32>(radix), noSign), type);
 }
 
-template <class Source>
-int32 Parse32(Source& source, int32 length, int16 typeCode, int32 radix, bool noSign) {
-    return static_cast<int32>(ParseInteger<uint32>(source, length, IntegerTypeOf(typeCode, 32), radix, noSign));
+template <class Text>
+[[gnu::always_inline]] inline int32 Parse32(Text& text, int16 typeCode, int32 radix, bool noSign) {
+    return static_cast<int32>(ParseInteger<uint32>(text, IntegerTypeOf(typeCode, 32), radix, noSign));
 }
 
-template <class Source>
-int64 Parse64(Source& source, int32 length, int16 typeCode, int32 radix, bool noSign) {
+template <class Text>
+[[gnu::always_inline]] inline int64 Parse64(Text& text, int16 typeCode, int32 radix, bool noSign) {
     const IntegerType type = IntegerTypeOf(typeCode, 64);
-    if (type.bits == 64) return static_cast<int64>(ParseInteger<uint64>(source, length, type, radix, noSign));
-    const auto value = ParseInteger<uint32>(source, length, type, radix, noSign);
+    if (type.bits == 64) return static_cast<int64>(ParseInteger<uint64>(text, type, radix, noSign));
+    const auto value = ParseInteger<uint32>(text, type, radix, noSign);
     return type.isSigned ? static_cast<int32>(value) : int64{value};
 }
 
@@ -356,11 +356,13 @@ int64 Parse64(Source& source, int32 length, int16 typeCode, int32 radix, bool no
 CharacterSource::~CharacterSource() = default;
 
 int32 StringToNumL(CharacterSource& source, int32 length, int16 typeCode, int32 radix, bool noSign) {
-    return Parse32(source, length, typeCode, radix, noSign);
+    SourceText text(source, length);
+    return Parse32(text, typeCode, radix, noSign);
 }
 
 int64 StringToNumQ(CharacterSource& source, int32 length, int16 typeCode, int32 radix, bool noSign) {
-    return Parse64(source, length, typeCode, radix, noSign);
+    SourceText text(source, length);
+    return Parse64(text, typeCode, radix, noSign);
 }
 
 }  // namespace tessel
@@ -372,15 +374,15 @@ bool StringToPacked(const char* text, int32 length, PackedDecimal* record, uint8
 }
 
 int32 StringToNum32(const char** cursor, int32 length, int16 typeCode, int32 radix, bool noSign) {
-    PointerSource source(*cursor);
-    const int32 value = Parse32(source, length, typeCode, radix, noSign);
-    *cursor = source.At();
+    MemoryText text(*cursor, length);
+    const int32 value = Parse32(text, typeCode, radix, noSign);
+    *cursor = text.At();
     return value;
 }
 
 int64 StringToNum64(const char** cursor, int32 length, int16 typeCode, int32 radix, bool noSign) {
-    PointerSource source(*cursor);
-    const int64 value = Parse64(source, length, typeCode, radix, noSign);
-    *cursor = source.At();
+    MemoryText text(*cursor, length);
+    const int64 value = Parse64(text, typeCode, radix, noSign);
+    *cursor = text.At();
     return value;
 }

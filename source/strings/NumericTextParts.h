@@ -2,6 +2,7 @@
 #pragma once
 
 #include <algorithm>
+#include <array>
 #include <bit>
 #include <cstring>
 
@@ -15,13 +16,67 @@ namespace tessel {
 
 /* Number of decimal digits; 1 for 0. */
 inline int32 CountDigits(uint64 value) {
-    const int32 bits = 64 - std::countl_zero(value | 1);
+    value |= 1;  // no power of ten but 1 is odd: this changes the answer for 0 alone
+    const int32 bits = 64 - std::countl_zero(value);
     const int32 guess = (bits * 1233) >> 12;  // floor(bits * log10(2)): right, or one short
-    return value >= PowerOfTen64(guess) ? guess + 1 : std::max(guess, int32{1});
+    return guess + (value >= PowerOfTen64(guess) ? 1 : 0);
 }
 
-/* Writes exactly `count` decimal digits, leading zeros included. */
-void WriteDigits(uint64 value, int32 count, char* out);
+inline constexpr std::array<char, 200> kDigitPairs = [] {
+    std::array<char, 200> pairs{};
+    for (size_t i = 0; i < 100; ++i) {
+        pairs[2 * i] = static_cast<char>('0' + i / 10);
+        pairs[2 * i + 1] = static_cast<char>('0' + i % 10);
+    }
+    return pairs;
+}();
+
+/* Writes exactly `count` decimal digits, leading zeros included, the last one just before `end`. */
+template <class Word>
+void WriteDigitsBefore(char* end, Word value, int32 count) {
+    for (; count >= 2; count -= 2, value /= 100) std::memcpy(end -= 2, &kDigitPairs[2 * (value % 100)], 2);
+    if (count == 1) *--end = static_cast<char>('0' + value % 10);
+}
+
+/* Writes a decimal integer, at most 20 characters, and returns where it ends. */
+inline char* WriteDecimal(char* out, uint64 magnitude, bool negative) {
+    *out = '-';
+    out += negative ? 1 : 0;
+    const int32 count = CountDigits(magnitude);
+    if (magnitude <= 0xFFFFFFFF) {
+        WriteDigitsBefore(out + count, static_cast<uint32>(magnitude), count);
+    } else {
+        WriteDigitsBefore(out + count, magnitude, count);
+    }
+    return out + count;
+}
+
+/* The digits of a real, most significant first, with zeros after them: what is copied may run past the last digit. */
+struct DigitText {
+    static constexpr int32 kDigits = 24;
+    static constexpr int32 kZeros = 24;
+
+    char text[kDigits + kZeros];
+    int32 count;
+
+    const char* First() const { return text + kDigits - count; }
+
+    void Set(uint64 value, int32 digits) {
+        count = digits;
+        constexpr uint32 kEight = 100000000;
+        const uint64 upper = value / kEight;
+        SetEight(2, static_cast<uint32>(value % kEight));
+        if (digits > 8) SetEight(1, static_cast<uint32>(upper % kEight));
+        if (digits > 16) SetEight(0, static_cast<uint32>(upper / kEight));
+        std::memset(text + kDigits, '0', kZeros);
+    }
+
+private:
+    void SetEight(int32 group, uint32 value) {
+        const uint64 characters = __builtin_bswap64(SpreadDigits(value) | 0x3030303030303030);
+        std::memcpy(text + 8 * group, &characters, sizeof characters);
+    }
+};
 
 // ---- bounded output ----
 
@@ -40,9 +95,22 @@ public:
     }
     void Put(CStr text) { Put(text, static_cast<int32>(std::strlen(text))); }
     void Fill(char c, int32 count) {
-        const size_t fitting = std::min(static_cast<size_t>(std::max(count, int32{0})), Room());
+        if (count <= 0) return;
+        const size_t fitting = std::min(static_cast<size_t>(count), Room());
         std::memset(at_, c, fitting);
         at_ += fitting;
+    }
+    /* Digits from the `from`-th on, zeros after the last. */
+    void PutDigits(const DigitText& digits, int32 from, int32 length) {
+        constexpr int32 kChunk = DigitText::kZeros;
+        if (length <= kChunk && from <= digits.count && Room() >= static_cast<size_t>(kChunk)) {
+            std::memcpy(at_, digits.First() + from, kChunk);
+            at_ += length;
+            return;
+        }
+        const int32 known = std::clamp(digits.count - from, int32{0}, length);
+        Put(digits.First() + std::min(from, digits.count), known);
+        Fill('0', length - known);
     }
     void Skip(int32 length) { at_ += length; }  // over what was written at At()
 
@@ -62,13 +130,12 @@ int32 WriteExponent(int32 exponent, char* out);
 
 // ---- reals ----
 
-/* A real as decimal digits, most significant first: d.ddd times ten to `lead`. */
+/* A real as decimal digits: d.ddd times ten to `lead`. */
 struct RealText {
     RealKind kind;
     bool negative;
     int32 lead;
-    int32 count;
-    char digits[20];
+    DigitText digits;
 };
 
 /* What is rendered: a real, or an integer that is rendered exactly. */
@@ -84,6 +151,8 @@ int32 FormatReal(const RealText& text, int32 k, char* buffer, int32 size, char d
 int32 RenderReal(const RealSource& source, int32 k, char* buffer, int32 size, char decimalPoint);
 
 // ---- integers ----
+
+inline constexpr int32 kLongestDecimal = 20;  // of 64 bits, or of 63 and a sign
 
 /* Renders an integer, terminated; a minus sign stands before the magnitude of a negative one. What does not fit is cut
    at the front: that is reported, or tells `complete` where it is given. Returns the length; 0 for a radix other than

@@ -25,34 +25,33 @@ CStr SpecialText(RealKind kind) {
 // ---- digits to text ----
 
 void PutExponential(const RealText& text, int32 k, char decimalPoint, TextOut& out) {
-    const bool isZero = text.lead < kLeastLead;
-    const int32 known = isZero ? 0 : std::min(text.count, k);
-    out.Put(known > 0 ? text.digits[0] : '0');
-    if (k > 1) {
-        out.Put(decimalPoint);
-        if (known > 1) out.Put(text.digits + 1, known - 1);
-        out.Fill('0', k - std::max(known, int32{1}));
+    if (text.lead < kLeastLead) {
+        out.Put('0');
+        if (k > 1) out.Put(decimalPoint);
+        out.Fill('0', k - 1);
+    } else {
+        out.Put(*text.digits.First());
+        if (k > 1) {
+            out.Put(decimalPoint);
+            out.PutDigits(text.digits, 1, k - 1);
+        }
     }
     char exponent[kExponentTextSize];
-    out.Put(exponent, WriteExponent(isZero ? 0 : text.lead, exponent));
+    out.Put(exponent, WriteExponent(text.lead < kLeastLead ? 0 : text.lead, exponent));
 }
 
 void PutFixed(const RealText& text, int32 decimals, char decimalPoint, TextOut& out) {
-    int32 used = 0;
-    if (text.lead >= 0) {
-        used = std::min(text.count, text.lead + 1);
-        out.Put(text.digits, used);
-        out.Fill('0', text.lead + 1 - used);
-    } else {
+    const int32 whole = std::max(text.lead + 1, int32{0});
+    if (whole == 0) {
         out.Put('0');
+    } else {
+        out.PutDigits(text.digits, 0, whole);
     }
     if (decimals == 0) return;
     out.Put(decimalPoint);
     const int32 zeros = std::min(std::max(-text.lead - 1, int32{0}), decimals);
-    const int32 known = std::min(text.count - used, decimals - zeros);
     out.Fill('0', zeros);
-    out.Put(text.digits + used, known);
-    out.Fill('0', decimals - zeros - known);
+    out.PutDigits(text.digits, whole, decimals - zeros);
 }
 
 RealText RoundToText(const RealParts& parts, int32 k) {
@@ -61,9 +60,8 @@ RealText RoundToText(const RealParts& parts, int32 k) {
     text.negative = parts.negative;
     if (parts.kind != RealKind::kFinite) return text;
     const DecimalDigits decimal = RoundToDecimal(parts, k);
-    text.count = decimal.count;
     text.lead = decimal.exponent + decimal.count - 1;
-    WriteDigits(decimal.digits, decimal.count, text.digits);
+    text.digits.Set(decimal.digits, decimal.count);
     return text;
 }
 
@@ -72,19 +70,19 @@ RealText RoundToText(const RealParts& parts, int32 k) {
 // The digits cut to k of them, the last one rounded half up; a carry out of the first raises the exponent.
 RealText CutInteger(uint64 magnitude, int32 k) {
     RealText text;
-    text.count = CountDigits(magnitude);
-    text.lead = text.count - 1;
-    if (text.count > k) {
-        const uint64 unit = PowerOfTen64(text.count - k);
+    int32 count = CountDigits(magnitude);
+    text.lead = count - 1;
+    if (count > k) {
+        const uint64 unit = PowerOfTen64(count - k);
         const bool up = magnitude % unit >= unit / 2;
         magnitude = magnitude / unit + (up ? 1 : 0);
-        text.count = k;
+        count = k;
         if (magnitude == PowerOfTen64(k)) {
             magnitude /= 10;
             ++text.lead;
         }
     }
-    WriteDigits(magnitude, text.count, text.digits);
+    text.digits.Set(magnitude, count);
     return text;
 }
 
@@ -95,10 +93,9 @@ int32 RenderInteger(const RealSource& source, int32 k, char* buffer, int32 size,
         PutExponential(CutInteger(source.magnitude, k), k, decimalPoint, out);
         return out.Length();
     }
-    char digits[20];
-    const int32 count = CountDigits(source.magnitude);
-    WriteDigits(source.magnitude, count, digits);
-    out.Put(digits, count);
+    DigitText digits;
+    digits.Set(source.magnitude, CountDigits(source.magnitude));
+    out.PutDigits(digits, 0, digits.count);
     if (k < 0) out.Put(decimalPoint);
     out.Fill('0', std::min(-k, kMostDecimals));
     return out.Length();
@@ -107,7 +104,6 @@ int32 RenderInteger(const RealSource& source, int32 k, char* buffer, int32 size,
 // ---- records ----
 
 uint8 Nibble(const PackedDecimal& record, int32 index) {
-    if (index >= kPackedDecimalDigits) return 0;
     return (record.mantissa[index / 2] >> (index % 2 == 0 ? 0 : 4)) & 15;
 }
 
@@ -126,15 +122,16 @@ RealKind KindOf(const PackedDecimal& record) {
 bool ReadRecord(const PackedDecimal& record, RealText& text) {
     text.kind = KindOf(record);
     text.negative = record.sign != 0;
-    text.count = 0;
     if (text.kind != RealKind::kFinite) return true;
     bool good = true;
-    for (int32 i = std::min<int32>(record.mdigits, kPackedDecimalDigits); i >= 0; --i) {
+    uint64 digits = 0;
+    for (int32 i = std::min<int32>(record.mdigits, kPackedDecimalDigits - 1); i >= 0; --i) {
         const uint8 digit = Nibble(record, i);
         good = good && digit <= 9;
-        if (digit != 0 || text.count != 0) text.digits[text.count++] = static_cast<char>('0' + digit);
+        digits = 10 * digits + digit;
     }
-    text.lead = text.count == 0 ? 0 : record.exponent + text.count - 1;
+    text.digits.Set(digits, CountDigits(digits));
+    text.lead = digits == 0 ? 0 : record.exponent + text.digits.count - 1;
     return good;
 }
 
