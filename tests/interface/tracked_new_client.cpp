@@ -34,7 +34,8 @@ void CheckOperators() {
     volatile size_t huge = size_t(-1) / 2;
     Check(new (std::nothrow) char[huge] == nullptr, "the no-throw form returns null");
     try {
-        delete[] new char[huge];
+        char* volatile block = new char[huge]; /* a pair that nobody sees may be left out */
+        delete[] block;
         Check(false, "out of memory throws");
     } catch (const std::bad_alloc& e) {
         Check(std::string(e.what()) == "bad allocation", "the text of the exception");
