@@ -119,7 +119,7 @@ void ShowMemory(const char* when) {
 }
 
 void WriteFiles(Path phrases, Path fallback) {
-    Say("1. A new resource file, " + TextOf(phrases));
+    Say("\n1. A new resource file, " + TextOf(phrases));
     RsrcFile file = 0;
     Must(RCreateFile(phrases, 0, kCreator, kFileType, 0), "RCreateFile");
     Must(ROpenFile(phrases, kROpenReadWrite, &file, nullptr, nullptr), "ROpenFile");
@@ -226,6 +226,7 @@ int main() {
     fs::create_directory(folder);
     setenv("TMPDIR", folder.c_str(), 1);
 
+    Say("The library starts, and says what it does");
     DebugOutputSetHandler(ShowReport);
     Must(InitTesselBase(), "InitTesselBase");
     Must(InitTesselAppSupport(), "InitTesselAppSupport");

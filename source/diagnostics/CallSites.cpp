@@ -40,6 +40,7 @@ struct RememberedWalk {
     const char* file;
     int32 line;
     int32 depth;
+    int32 skip;
     const StackFrame* first;
     const CallSite* site;
     StackFrame frames[kMostFrames];
@@ -163,7 +164,8 @@ const CallSite* CallSites::Enter(const char* file, int32 line, const StackFrame*
     if (range.serial != serial_ || range.next == range.end) TakeNumbers(range);
     number = range.next++;
     RememberedWalk& walk = WalkFrom(*memory, frame, serial_);
-    if (walk.first == frame && walk.serial == serial_ && walk.file == file && walk.line == line && IsSameWalk(walk))
+    if (walk.first == frame && walk.serial == serial_ && walk.file == file && walk.line == line &&
+        walk.skip == skip_.load(std::memory_order_relaxed) && IsSameWalk(walk))
         return walk.site;
     return Walk(file, line, frame, &walk, failure);
 }
@@ -194,7 +196,7 @@ const CallSite* CallSites::Walk(const char* file, int32 line, const StackFrame* 
     const CallSite* site = Find(key);
     if (!site) site = Add(key, failure);
     if (site && remembered && skip <= kMostSkipRemembered) {
-        *remembered = {serial_, file, line, depth, frame, site, {}};
+        *remembered = {serial_, file, line, depth, skip, frame, site, {}};
         std::copy_n(frames, depth, remembered->frames);
     }
     return site;
