@@ -22,9 +22,9 @@ namespace {
 // Written under gCreateThread. Entry 0 is looked at without it.
 std::atomic<ThThread> table[kMaxThThreads];
 
-AllocTrackerPtr threadTracker = nullptr;     // of the threads started here
-uint32 ownRecordKey = kThNoLocalStorageKey;  // the slot of the calling thread's record
-THTHREADREC startUpRecord;                   // not from the allocator
+AllocTrackerPtr threadTracker = nullptr;                 // of the threads started here
+std::atomic<uint32> ownRecordKey{kThNoLocalStorageKey};  // the slot of the calling thread's record
+THTHREADREC startUpRecord;                               // not from the allocator
 std::atomic<uint32> startUpThreadId{0};
 
 ThThread OwnRecord() {
