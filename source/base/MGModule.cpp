@@ -66,8 +66,7 @@ private:
 };
 
 void CopyView(std::string_view text, char* out) {
-    std::memcpy(out, text.data(), text.size());
-    out[text.size()] = 0;
+    out[text.copy(out, text.size())] = 0;
 }
 
 bool LastWritten(MGModuleHandle module, int64& time) {
