@@ -34,7 +34,7 @@ std::string AddressDigits(uintptr_t address) {
 class AllocTrackerTest : public testing::Test {
 protected:
     struct Destroyer {
-        void operator()(AllocTracker* tracker) const { DestroyAllocTracker(tracker); }
+        void operator()(AllocTracker* ended) const { DestroyAllocTracker(ended); }
     };
     std::unique_ptr<AllocTracker, Destroyer> tracker_{CreateAllocTracker()};
     AllocTracker& tracker = *tracker_;

@@ -65,7 +65,8 @@ TEST_F(PathModel, NamesByIndex) {
     path.Replace(0, "D");
     EXPECT_EQ("abs:D/other/file", Show(path));
     EXPECT_EQ(kArgErr, CodeOf([&] { path.Replace(0, static_cast<const char*>(nullptr)); }));
-    path = path;
+    const PathRef& same = path;
+    path = same;
     EXPECT_EQ("abs:D/other/file", Show(path));
 }
 
