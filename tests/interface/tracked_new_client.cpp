@@ -32,9 +32,10 @@ void CheckOperators() {
     delete[] other;
     delete static_cast<int*>(nullptr);
     volatile size_t huge = size_t(-1) / 2;
-    Check(new (std::nothrow) char[huge] == nullptr, "the no-throw form returns null");
+    char* volatile block = new (std::nothrow) char[huge]; /* what nobody sees may be left out */
+    Check(block == nullptr, "the no-throw form returns null");
     try {
-        char* volatile block = new char[huge]; /* a pair that nobody sees may be left out */
+        block = new char[huge];
         delete[] block;
         Check(false, "out of memory throws");
     } catch (const std::bad_alloc& e) {
