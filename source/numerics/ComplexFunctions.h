@@ -9,6 +9,7 @@
 #include <type_traits>
 
 #include "numerics/RealFunctions.h"
+#include "numerics/TwoParts.h"
 
 namespace tessel::cmplx {
 
@@ -30,13 +31,7 @@ bool IsZero(const Complex<W>& z) {
     return z.real() == 0 && z.imag() == 0;
 }
 
-/* A constant in two parts, for arguments that must not lose its last bits. */
-template <class W>
-struct TwoParts {
-    W high;
-    W low;
-};
-
+/* Constants in two parts, for arguments that must not lose their last bits. */
 template <class W>
 constexpr TwoParts<W> kLn10 = {0x935D8DDDAAA8AC17p-62L, -0xAD494EA3E967AEB9p-129L};
 template <>
@@ -55,30 +50,6 @@ template <class W>
 constexpr W kHalfPi = static_cast<W>(0xC90FDAA22168C235p-63L);
 
 // ---- exact steps ---------------------------------------------------------------------------------------------------
-
-/* The sum a + b and what rounding took from it. */
-template <class W>
-TwoParts<W> ExactSum(W a, W b) {
-    const W sum = a + b;
-    const W shifted = sum - a;
-    return {sum, (a - (sum - shifted)) + (b - shifted)};
-}
-
-/* The product a * b and what rounding took from it; the factors must not be near the largest value. */
-template <class W>
-TwoParts<W> ExactProduct(W a, W b) {
-    constexpr W kSplitter = static_cast<W>((uint64{1} << (std::numeric_limits<W>::digits + 1) / 2) + 1);
-    const auto upperHalf = [](W x) {
-        const W scaled = kSplitter * x;
-        return scaled - (scaled - x);
-    };
-    const W product = a * b;
-    const W aHigh = upperHalf(a);
-    const W bHigh = upperHalf(b);
-    const W aLow = a - aHigh;
-    const W bLow = b - bHigh;
-    return {product, ((aHigh * bHigh - product) + aHigh * bLow + aLow * bHigh) + aLow * bLow};
-}
 
 /* ab - cd, keeping what cancellation would lose. */
 template <class W>

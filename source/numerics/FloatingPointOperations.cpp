@@ -40,24 +40,13 @@ Extended ReadElement(const uint8* at, const floatExt*) {
     return ToExtended(ReadAs<floatExt>(at));
 }
 
-// Elements that lie `stride` bytes apart. Four sums side by side, so that an addition need not wait for the one before.
+// Elements that lie `stride` bytes apart, one after the other.
 template <class T>
 Extended Sum(const T* first, int32 stride, int32 count) {
     const auto* at = reinterpret_cast<const uint8*>(first);
-    const ptrdiff_t step = stride;
-    Extended a = 0;
-    Extended b = 0;
-    Extended c = 0;
-    Extended d = 0;
-    int32 left = count;
-    for (; left >= 4; left -= 4, at += 4 * step) {
-        a += ReadElement(at, first);
-        b += ReadElement(at + step, first);
-        c += ReadElement(at + 2 * step, first);
-        d += ReadElement(at + 3 * step, first);
-    }
-    for (; left > 0; --left, at += step) a += ReadElement(at, first);
-    return (a + b) + (c + d);
+    Extended sum = 0;
+    for (; count > 0; --count, at += stride) sum += ReadElement(at, first);
+    return sum;
 }
 
 Complex Load(const cmplx64& z) {

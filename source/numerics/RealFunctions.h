@@ -7,6 +7,7 @@
 #include <limits>
 #include <type_traits>
 
+#include "numerics/DoubleMath.h"
 #include "numerics/Extended.h"
 
 namespace tessel::real {
@@ -42,11 +43,13 @@ inline Extended Widen(Extended x) {
     return x;
 }
 
-/* A function of the library's that is not at its best for singles: those go through double. */
-template <class T, class Function>
-T Careful(T x, Function function) {
+/* Singles go through double, doubles have a function of their own, and the extended reals take the library's. */
+template <class T, class OfDouble, class Function>
+T Careful(T x, OfDouble ofDouble, Function function) {
     if constexpr (std::is_same_v<T, float>) {
         return static_cast<float>(function(double{x}));
+    } else if constexpr (std::is_same_v<T, double>) {
+        return ofDouble(x);
     } else {
         return function(x);
     }
@@ -67,7 +70,7 @@ T Logn(T x) {
 
 template <class T>
 T Log10(T x) {
-    return x > 0 ? Careful(x, [](auto wide) { return std::log10(wide); }) : LogOutside(x);
+    return x > 0 ? Careful(x, precise::Log10, [](auto wide) { return std::log10(wide); }) : LogOutside(x);
 }
 
 template <class T>
@@ -123,53 +126,57 @@ MantissaAndExponent<T> GetMantExp(T x) {
 
 template <class T>
 T Sec(T x) {
-    return static_cast<T>(1 / std::cos(Widen(x)));
+    return Careful(x, precise::Sec, [](auto wide) { return 1 / std::cos(wide); });
 }
 
 template <class T>
 T Csc(T x) {
-    return static_cast<T>(1 / std::sin(Widen(x)));
+    return Careful(x, precise::Csc, [](auto wide) { return 1 / std::sin(wide); });
 }
 
 template <class T>
 T Cot(T x) {
-    return static_cast<T>(1 / std::tan(Widen(x)));
+    return Careful(x, precise::Cot, [](auto wide) { return 1 / std::tan(wide); });
 }
 
 template <class T>
 T Sinc(T x) {
-    return x == 0 ? T{1} : static_cast<T>(std::sin(Widen(x)) / Widen(x));
+    return x == 0 ? T{1} : Careful(x, precise::Sinc, [](auto wide) { return std::sin(wide) / wide; });
 }
 
 /* Angle of the point (x, y). */
 template <class T>
 T Atan2(T x, T y) {
-    return Careful(x, [y](auto wide) { return std::atan2(decltype(wide){y}, wide); });
+    if constexpr (std::is_same_v<T, float>) {
+        return static_cast<float>(std::atan2(double{y}, double{x}));
+    } else {
+        return std::atan2(y, x);
+    }
 }
 
 template <class T>
 T Sinh(T x) {
-    return Careful(x, [](auto wide) { return std::sinh(wide); });
+    return Careful(x, precise::Sinh, [](auto wide) { return std::sinh(wide); });
 }
 
 template <class T>
 T Tanh(T x) {
-    return Careful(x, [](auto wide) { return std::tanh(wide); });
+    return Careful(x, precise::Tanh, [](auto wide) { return std::tanh(wide); });
 }
 
 template <class T>
 T Asinh(T x) {
-    return Careful(x, [](auto wide) { return std::asinh(wide); });
+    return Careful(x, precise::Asinh, [](auto wide) { return std::asinh(wide); });
 }
 
 template <class T>
 T Acosh(T x) {
-    return Careful(x, [](auto wide) { return std::acosh(wide); });
+    return Careful(x, precise::Acosh, [](auto wide) { return std::acosh(wide); });
 }
 
 template <class T>
 T Atanh(T x) {
-    return Careful(x, [](auto wide) { return std::atanh(wide); });
+    return Careful(x, precise::Atanh, [](auto wide) { return std::atanh(wide); });
 }
 
 // ---- arithmetic ----------------------------------------------------------------------------------------------------
@@ -206,9 +213,10 @@ T Sign(T x) {
     return x > 0 ? T{1} : x < 0 ? T{-1} : T{0};
 }
 
-/* x - floor(x / y) y, without the rounding of the quotient. */
+/* x - floor(x / y) y, without the rounding of the quotient where that is finite. */
 template <class T>
 T Mod(T x, T y) {
+    if (!std::isfinite(x) || !std::isfinite(y)) return x - std::floor(x / y) * y;
     const T remainder = std::fmod(x, y);
     return remainder != 0 && (remainder < 0) != (y < 0) ? remainder + y : remainder;
 }
