@@ -21,9 +21,11 @@ if(CMAKE_SIZEOF_VOID_P EQUAL 4 AND CMAKE_SYSTEM_PROCESSOR MATCHES "^(x86_64|amd6
 endif()
 
 if(TESSEL_SANITIZE)
-  # The checks put into the code mislead the compiler's own flow analysis; the plain builds keep those warnings.
-  target_compile_options(tessel_compile_options INTERFACE -Wno-array-bounds -Wno-stringop-overflow
-    -Wno-maybe-uninitialized)
+  # The checks put into the code mislead GCC's own flow analysis; the plain builds keep those warnings.
+  if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+    target_compile_options(tessel_compile_options INTERFACE -Wno-array-bounds -Wno-stringop-overflow
+      -Wno-maybe-uninitialized)
+  endif()
   target_compile_options(tessel_compile_options INTERFACE -fsanitize=${TESSEL_SANITIZE} -fno-sanitize-recover=all)
   target_link_options(tessel_compile_options INTERFACE -fsanitize=${TESSEL_SANITIZE})
 endif()
