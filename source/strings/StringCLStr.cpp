@@ -41,26 +41,25 @@ int32 ClampToElement(const CLStr* list, int32 i) {
     return std::clamp(i, 0, std::max(ElementCount(list) - 1, 0));
 }
 
+/* The element may lie in the list. */
 MgErr InsertAt(CLStrHandle list, LStrView element, uint32 offset, bool exact) {
     const uint32 size = ElementSize(element.length);
-    if (MgErr err = ResizeRange(AsHandle(list), {CLStrSize(*list), offset, 0}, size, exact)) return err;
+    const uint32 listSize = CLStrSize(*list);
+    const size_t place = reinterpret_cast<uintptr_t>(element.bytes) - reinterpret_cast<uintptr_t>(*list);
+    if (MgErr err = ResizeRange(AsHandle(list), {listSize, offset, 0}, size, exact)) return err;
+    const uint8* source = element.bytes;
+    if (place < listSize) source = *AsHandle(list) + place + (place >= offset ? size : 0);
     LStrPtr inserted = ElementAt(*list, offset);
     std::memset(inserted, 0, size);
     inserted->count = static_cast<int32>(element.length);
-    if (element.length != 0) std::memcpy(inserted->bytes, element.bytes, element.length);
+    if (element.length != 0) std::memcpy(inserted->bytes, source, element.length);
     ++(*list)->count;
     return kNoErr;
 }
 
-uint32 ReverseBytes(uint32 value) {
-    return value >> 24 | (value >> 8 & 0xFF00) | (value << 8 & 0xFF0000) | value << 24;
-}
-
 /* Brings the number at `at` into host order. */
 uint32 StdToHost(uint8* at) {
-    uint32 value;
-    std::memcpy(&value, at, sizeof value);
-    value = ReverseBytes(value);
+    const uint32 value = uint32{at[0]} << 24 | uint32{at[1]} << 16 | uint32{at[2]} << 8 | at[3];
     std::memcpy(at, &value, sizeof value);
     return value;
 }

@@ -36,6 +36,7 @@ uint8 EscapedByte(char c) {
 
 uint8 ScanForBackslash(CStr* cursor, CStr end) {
     CStr p = *cursor;
+    if (p >= end) return 0;
     const char first = *p++;
     if (first != '\\' || p == end) {
         *cursor = p;

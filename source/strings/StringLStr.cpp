@@ -48,11 +48,17 @@ size_t CopyTerminated(LStrView src, char* dst, uint32 size) {
     return length;
 }
 
+/* Where bytes lie in the handle's own block, which may move when it is resized; false for bytes outside it. */
+bool OffsetInBlock(LStrHandle handle, const void* bytes, size_t* offset) {
+    *offset = reinterpret_cast<uintptr_t>(bytes) - reinterpret_cast<uintptr_t>(*handle);
+    return *offset < LStrSize(LStrView(*handle).length);
+}
+
 /* Appends bytes, which may lie in the handle's own block. */
 MgErr Append(LStrHandle dst, const uint8* bytes, size_t n, bool exact) {
     const size_t count = LStrView(*dst).length;
-    const size_t offset = reinterpret_cast<uintptr_t>(bytes) - reinterpret_cast<uintptr_t>(*dst);
-    const bool own = offset < LStrSize(count);
+    size_t offset = 0;
+    const bool own = OffsetInBlock(dst, bytes, &offset);
     if (n > static_cast<size_t>(INT32_MAX) - LStrSize(count)) return kMemFullErr;
 
     if (MgErr err = SizeHandle(dst, LStrSize(count + n), exact)) return err;
@@ -158,6 +164,11 @@ int32 LToPStr(const LStr* src, PStr dst) {
 MgErr LStrFromPtr(LStrHandle* handle, int32 length, const void* src) {
     if (!handle || length < 0) return kArgErr;
     if (!src || length == 0) return DSDisposeHandleAndNull(AsHandlePtr(handle));
+    size_t offset = 0;
+    if (*handle && OffsetInBlock(*handle, src, &offset)) {
+        Store(src, static_cast<size_t>(length), **handle);
+        return SizeHandle(*handle, LStrSize(length), true);
+    }
     if (MgErr err = DSSetHandleSizeOrNewHandle(AsHandlePtr(handle), LStrSize(length))) return err;
     Store(src, static_cast<size_t>(length), **handle);
     return kNoErr;
@@ -216,10 +227,12 @@ MgErr LStrPrependCStr(LStrHandle* dst, CStr src) {
     const size_t added = std::strlen(src);
     const size_t count = LStrView(*dst).length;
     if (added > static_cast<size_t>(INT32_MAX) - LStrSize(count)) return kMemFullErr;
+    size_t offset = 0;
+    const bool own = OffsetInBlock(*dst, src, &offset);
     if (MgErr err = SizeHandle(*dst, LStrSize(count + added), false)) return err;
     LStrPtr text = **dst;
     std::memmove(text->bytes + added, text->bytes, count);
-    std::memcpy(text->bytes, src, added);
+    std::memcpy(text->bytes, own ? reinterpret_cast<CStr>(text) + offset + added : src, added);
     text->count = static_cast<int32>(count + added);
     return kNoErr;
 }

@@ -149,7 +149,7 @@ bool PPStrCaseEqual(const ConstPStr* a, const ConstPStr* b) {
 
 int32 PStrInPStr(ConstPStr s, int32 start, ConstPStr pattern) {
     if (start < 0 || pattern[0] == 0) return -1;
-    for (int32 at = start; at + pattern[0] <= s[0]; ++at) {
+    for (int32 at = start; at <= s[0] - pattern[0]; ++at) {
         if (FirstDifferenceNoCase(s + 1 + at, pattern + 1, pattern[0]) == pattern[0]) return at + pattern[0];
     }
     return -1;
@@ -176,8 +176,9 @@ bool PStrSplitAtChar(ConstPStr s, uint8 c, PStr left, PStr right) {
         left[leftLength] = byte;
     }
     const bool found = at <= length;
-    right[0] = static_cast<uint8>(found ? length - at : 0);
-    std::memcpy(right + 1, s + at + 1, right[0]);
+    const size_t rightLength = found ? length - at : 0;
+    std::memmove(right + 1, s + at + 1, rightLength);
+    right[0] = static_cast<uint8>(rightLength);
     left[0] = static_cast<uint8>(leftLength);
     return found;
 }

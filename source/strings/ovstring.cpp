@@ -276,11 +276,25 @@ MgErr OVSubString::Replace(const void* source, int32 length, int32 at, int32 cou
     return WithoutOverlap(source, length, [&](const void* bytes) { return ReplaceRange(bytes, length, at, count); });
 }
 
-/* Runs an edit with the source, or with a copy of it when it lies in the view and may move. */
+/* Whether bytes lie in what an edit may move: the view, the block of its handle, or the whole list of its element. */
+bool OVSubString::IsInStorage(const void* bytes, int32 length) const {
+    auto start = reinterpret_cast<uintptr_t>(bytes_) - static_cast<uint32>(skipped_);
+    auto end = reinterpret_cast<uintptr_t>(bytes_) + static_cast<uint32>(length_);
+    if (m_class == kLStrHandle && *handle_) {
+        start = reinterpret_cast<uintptr_t>(**handle_);
+        end = start + LStrSize(LStrView(*handle_).length);
+    } else if (m_class == kListElement && element_.list) {
+        start = reinterpret_cast<uintptr_t>(*element_.list);
+        end = start + CPStrSize(*element_.list);
+    }
+    const auto at = reinterpret_cast<uintptr_t>(bytes);
+    return at < end && at + static_cast<uint32>(length) > start;
+}
+
+/* Runs an edit with the source, or with a copy of it when the edit may move it. */
 template <class Edit>
 MgErr OVSubString::WithoutOverlap(const void* source, int32 length, Edit edit) {
-    const uintptr_t offset = reinterpret_cast<uintptr_t>(source) - reinterpret_cast<uintptr_t>(bytes_);
-    if (!source || !bytes_ || offset >= static_cast<size_t>(length_)) return edit(source);
+    if (!source || length <= 0 || !IsInStorage(source, length)) return edit(source);
     return Guarded([&] {
         const std::string copy(static_cast<const char*>(source), static_cast<size_t>(length));
         return edit(copy.data());

@@ -132,6 +132,9 @@ TEST(StringCLStr, PadsElements) {
               BlockOf(list));
     EXPECT_EQ("hello", TextOf(CLStrIndex(*list, 9)));
     EXPECT_EQ("four", TextOf(CLStrIndex(*list, -9)));
+    EXPECT_EQ(kNoErr, CLStrInsert(list, CLStrIndex(*list, 1), 0, true));  // its own element
+    EXPECT_EQ("hello", TextOf(CLStrIndex(*list, 0)));
+    EXPECT_EQ(kNoErr, CLStrRemove(list, 0));
     EXPECT_EQ(kNoErr, CLStrRemove(list, 0));
     EXPECT_EQ(16u, CLStrSize(*list));
     EXPECT_EQ(kNoErr, CLStrRemove(list, 0));

@@ -114,6 +114,8 @@ TEST(OVSubString, EditsInPlace) {
     CheckEdits(OVSubString(list, 1), element);
     EXPECT_EQ("", test::TextOf(CPStrIndex(list, 0)));
     EXPECT_EQ("after", test::TextOf(CPStrIndex(list, 2)));
+    EXPECT_EQ(kNoErr, OVSubString(list, 1).Append(OVSubString(list, 2)));  // from a part of the list that moves
+    EXPECT_EQ("againafter", element());
     DSDisposeHandle(reinterpret_cast<UHandle>(list));
 }
 

@@ -14,7 +14,7 @@ TEST(StringFmtScan, ReadsEscapes) {
     } kCases[] = {{"x\\", 'x', 1},  {"\\", '\\', 1},    {"\\41", 0x41, 3},  {"\\4G", 4, 2},     {"\\4", 4, 2},
                   {"\\4f", 4, 2},   {"\\FF7", 0xFF, 3}, {"\\a", 'a', 2},    {"\\\\n", '\\', 2}, {"\\b", 8, 2},
                   {"\\f", 12, 2},   {"\\n", 10, 2},     {"\\r", 13, 2},     {"\\s", ' ', 2},    {"\\t", 9, 2},
-                  {"\\B", 0x0B, 2}, {"\\%", '%', 2},    {"\\0A5", 0x0A, 3}, {"\\z", 'z', 2}};
+                  {"\\B", 0x0B, 2}, {"\\%", '%', 2},    {"\\0A5", 0x0A, 3}, {"\\z", 'z', 2},    {"", 0, 0}};
     for (const auto& c : kCases) {
         CStr cursor = c.text.data();
         EXPECT_EQ(c.byte, ScanForBackslash(&cursor, c.text.data() + c.text.size())) << c.text;

@@ -128,6 +128,12 @@ TEST(StringLStr, AppendsExactlyOrWithRoomLeft) {
     EXPECT_EQ("abcdefgabcdefg", text.Text());
     EXPECT_EQ(18u, text.Size());
     EXPECT_EQ(kArgErr, LStrCat(nullptr, *text));
+    EXPECT_EQ(kNoErr, LStrFromPtr(&text, 4, (*LStrHandle(text))->bytes + 3));
+    EXPECT_EQ("defg", text.Text());
+    EXPECT_EQ(8u, text.Size());
+    EXPECT_EQ(kNoErr, LStrAppendChar(text, 0));
+    EXPECT_EQ(kNoErr, LStrPrependCStr(&text, reinterpret_cast<CStr>((*LStrHandle(text))->bytes + 1)));
+    EXPECT_EQ(std::string("efgdefg\0", 8), text.Text());
 
     L made;
     EXPECT_EQ(kNoErr, LStrAppendPStr(&made, nullptr));

@@ -56,6 +56,7 @@ TEST(StringPStr, Searches) {
     EXPECT_EQ(-1, PStrInPStr(text, 9, P("one")));
     EXPECT_EQ(-1, PStrInPStr(text, 0, P("")));
     EXPECT_EQ(-1, PStrInPStr(text, 11, P("e")));
+    EXPECT_EQ(-1, PStrInPStr(text, INT32_MAX, P("e")));
     EXPECT_EQ(-1, PStrInPStr(text, 0, P("two one and more")));
 
     P file("FILE.TXT");
@@ -81,6 +82,10 @@ TEST(StringPStr, SplitsAtTheFirstUnescapedCharacter) {
         EXPECT_EQ(c.left, left.Text());
         EXPECT_EQ(c.right, right.Text());
     }
+    P left;
+    P text("one,and more");
+    EXPECT_TRUE(PStrSplitAtChar(text, ',', left, text));  // over its own rest
+    EXPECT_EQ("and more", text.Text());
 }
 
 TEST(StringPStr, Replaces) {

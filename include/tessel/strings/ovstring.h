@@ -180,6 +180,7 @@ private:
     MgErr ResizeElement(int32 n);
     MgErr ResizeTemp(int32 n);
     void MoveToStart(uint8* start);
+    bool IsInStorage(const void* bytes, int32 length) const;
     template <class Edit>
     MgErr WithoutOverlap(const void* source, int32 length, Edit edit);
     MgErr ReplaceRange(const void* source, int32 length, int32 at, int32 count);
