@@ -14,6 +14,7 @@
 #include "files/Service.h"
 #include "platform/Clock.h"
 #include "platform/LastError.h"
+#include "strings/FmtEngine.h"
 
 namespace tessel {
 
@@ -53,20 +54,24 @@ MgErr MoveTo(File_t* file, int64 position) {
 }
 
 // Formats into a pointer block of its own and writes it. *written is what went to the file.
-MgErr PrintToFile(File_t* file, CStr format, va_list args, uint32* written) {
+// What stands before the fault of a bad format is written only on request.
+enum class BadFormat { kWriteStart, kWriteNothing };
+
+MgErr PrintToFile(File_t* file, CStr format, va_list args, BadFormat bad, uint32* written) {
     *written = 0;
     if (!file || !format) return kArgErr;
     const auto length = static_cast<int32>(std::strlen(format));
     va_list measured;
     va_copy(measured, args);
-    const int32 size = SPrintfv(nullptr, 0, format, length, measured);
+    const Formatted needed = FormatText(nullptr, 0, format, length, measured);
     va_end(measured);
-    if (size < 0) return kFormatErr;
+    if (!needed.good && bad == BadFormat::kWriteNothing) return kFormatErr;
 
-    UPtr text = DSNewPtr(static_cast<uint32>(size));
+    const auto size = static_cast<uint32>(needed.length);
+    UPtr text = DSNewPtr(size);
     if (!text) return kMemFullErr;
-    SPrintfv(reinterpret_cast<char*>(text), size, format, length, args);
-    const MgErr err = FMWrite(file, static_cast<uint32>(size), written, text);
+    SPrintfv(reinterpret_cast<char*>(text), needed.length, format, length, args);
+    const MgErr err = FMWrite(file, size, written, text);
     DSDisposePtr(text);
     return err;
 }
@@ -255,7 +260,7 @@ int32 FPrintf(File_t* file, CStr format, ...) {
     va_list args;
     va_start(args, format);
     uint32 written = 0;
-    const MgErr err = PrintToFile(file, format, args, &written);
+    const MgErr err = PrintToFile(file, format, args, BadFormat::kWriteStart, &written);
     va_end(args);
     return err ? -1 : static_cast<int32>(written);
 }
@@ -270,7 +275,7 @@ MgErr FPrintfWErr(File_t* file, CStr format, ...) {
 
 MgErr FPrintfWErrv(File_t* file, CStr format, va_list args) {
     uint32 written = 0;
-    return PrintToFile(file, format, args, &written);
+    return PrintToFile(file, format, args, BadFormat::kWriteNothing, &written);
 }
 
 // ---- errors ---------------------------------------------------------------------------------------------------------

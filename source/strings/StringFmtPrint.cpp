@@ -7,6 +7,7 @@
 
 #include "platform/CodePage.h"
 #include "strings/DecimalPoint.h"
+#include "strings/FmtEngine.h"
 #include "strings/FmtOutput.h"
 #include "strings/FmtRenderer.h"
 #include "strings/HandleOps.h"
@@ -15,7 +16,6 @@ using namespace tessel;
 
 namespace {
 
-constexpr int32 kNoLimit = -1;
 constexpr int32 kMaxPStr = 255;
 constexpr char kCarriageReturn = 13;
 constexpr uint8 kLineFeed = 10;
@@ -59,16 +59,16 @@ public:
         byCharacters_ = page.multiByte && !page.utf8;
     }
 
-    /* The bytes that were, or would be, written. */
-    size_t Run() {
-        const bool completed = Pass();
-        if (completed && mode_ == Mode::kPositional) {
-            if (!arguments_.Fetch()) return 0;
+    /* The bytes that were, or would be, written, and whether the format was good. */
+    Formatted Run() {
+        bool good = Pass();
+        if (good && mode_ == Mode::kPositional) {
+            if (!arguments_.Fetch()) return {0, false};
             recording_ = false;
             output_.Restart();
-            Pass();
+            good = Pass();
         }
-        return output_.Used();
+        return {static_cast<int32>(output_.Used()), good};
     }
 
 private:
@@ -98,7 +98,7 @@ private:
 };
 
 /* Goes over the format once. While recording, the text between the specifiers is written and then overwritten. Cursor
-   and output are kept in registers for what is most frequent: plain text, "%d" and "%s". */
+   and output are kept in registers for what is most frequent: plain text and specifiers of one letter. */
 bool Formatter::Pass() {
     const char* p = start_;
     FmtOutput output = output_;
@@ -126,7 +126,7 @@ bool Formatter::Pass() {
     return true;
 }
 
-/* Does "%d" and "%s"; false for everything else. */
+/* Does what is most frequent; false for everything else. */
 inline bool Formatter::PlainConversion(const char* p, FmtOutput& output) {
     if (*p != '%' || end_ - p < 2 || mode_ == Mode::kPositional) return false;
     if (p[1] == 'd') {
@@ -135,6 +135,10 @@ inline bool Formatter::PlainConversion(const char* p, FmtOutput& output) {
     } else if (p[1] == 's') {
         const auto* text = static_cast<CStr>(arguments_.Next(FmtArgType::kPointer).pointer);
         if (text) output.Put(text, std::strlen(text));
+    } else if (p[1] == 'x') {
+        output.PutHex(static_cast<uint32>(arguments_.Next(FmtArgType::kInt).integer));
+    } else if (p[1] == 'u') {
+        output.PutDecimal(static_cast<uint32>(arguments_.Next(FmtArgType::kInt).integer), false);
     } else {
         return false;
     }
@@ -203,14 +207,17 @@ bool Formatter::Unknown() {
     return false;
 }
 
-/* `size` of kNoLimit writes as much as there is. */
-size_t Format(char* dst, int32 size, const char* format, size_t length, FmtArgumentList& args) {
-    const int32 limit = !dst || size == kNoLimit ? INT32_MAX : std::max(size, 0);
+Formatted Run(char* dst, int32 size, const char* format, size_t length, FmtArgumentList& args) {
+    const int32 limit = !dst || size == kFmtNoLimit ? INT32_MAX : std::max(size, 0);
     return Formatter(FmtOutput(dst, static_cast<size_t>(limit)), format, length, args).Run();
 }
 
+size_t Format(char* dst, int32 size, const char* format, size_t length, FmtArgumentList& args) {
+    return static_cast<size_t>(Run(dst, size, format, length, args).length);
+}
+
 int32 FormatTerminated(char* dst, const char* format, size_t length, FmtArgumentList& args) {
-    const size_t written = Format(dst, kNoLimit, format, length, args);
+    const size_t written = Format(dst, kFmtNoLimit, format, length, args);
     if (dst) dst[written] = 0;
     return static_cast<int32>(written);
 }
@@ -227,12 +234,16 @@ const char* Chars(const uint8* bytes) {
 
 }  // namespace
 
-int32 SPrintfv(char* dst, int32 size, const char* format, int32 formatLength, va_list args) {
+Formatted tessel::FormatText(char* dst, int32 size, const char* format, int32 formatLength, va_list args) {
     FmtArgumentList copy;
     va_copy(copy.list, args);
-    const size_t written = Format(dst, size, format, static_cast<size_t>(std::max(formatLength, 0)), copy);
+    const Formatted result = Run(dst, size, format, static_cast<size_t>(std::max(formatLength, 0)), copy);
     va_end(copy.list);
-    return static_cast<int32>(written);
+    return result;
+}
+
+int32 SPrintfv(char* dst, int32 size, const char* format, int32 formatLength, va_list args) {
+    return FormatText(dst, size, format, formatLength, args).length;
 }
 
 int32 SPrintf(char* dst, CStr format, ...) {
@@ -282,7 +293,7 @@ MgErr LStrPrintf(LStrHandle dst, CStr format, ...) {
     const size_t length = std::strlen(format);
     FmtArgumentList args;
     va_start(args.list, format);
-    const size_t needed = Format(nullptr, kNoLimit, format, length, args);
+    const size_t needed = Format(nullptr, kFmtNoLimit, format, length, args);
     va_end(args.list);
     if (MgErr err = DSSetHandleSize(AsHandle(dst), LStrSize(needed))) return err;
 

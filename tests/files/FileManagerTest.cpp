@@ -171,8 +171,14 @@ TEST_F(FileManagerTest, PrintsInTheLibrarysFormat) {
     EXPECT_EQ(6, FPrintf(file, "%05d;", 42));
     EXPECT_EQ(kNoErr, FPrintfWErr(file, "%s", "text"));
     EXPECT_EQ(0, FPrintf(file, ""));
+    {
+        const ReportRecorder reports;
+        EXPECT_EQ(kFormatErr, FPrintfWErr(file, "lost %y"));
+        EXPECT_EQ(kFormatErr, FPrintfWErr(file, "%2$d", 1, 2));
+        EXPECT_EQ(5, FPrintf(file, "kept %y"));
+    }
     FMClose(file);
-    EXPECT_EQ("00042;text", started.drive.Get("f"));
+    EXPECT_EQ("00042;textkept ", started.drive.Get("f"));
 
     file = Open("f", kFOpenRead);
     EXPECT_EQ(-1, FPrintf(file, "x"));
