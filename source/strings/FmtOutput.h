@@ -5,6 +5,7 @@
 #include <tessel/base/Types.h>
 
 #include <algorithm>
+#include <bit>
 #include <cstring>
 
 #include "strings/DecimalDigits.h"
@@ -96,6 +97,15 @@ public:
         WriteDecimalDigits(start + length, magnitude);
         if (negative) *start = '-';
         if (!place) Put(text, length);
+    }
+
+    void PutHex(uint32 value) {
+        constexpr int kDigits = 8;
+        const uint64 digits = HexDigits(value);
+        const int unused = std::countl_zero(value | 1u) / 4;
+        char text[kDigits];
+        std::memcpy(text, &digits, sizeof text);
+        Put(text + unused, static_cast<size_t>(kDigits - unused));
     }
 
     /* The address of n bytes to be written by the caller, or null (then Put them). */

@@ -7,7 +7,7 @@
 
 #include <cmath>
 
-#include "numerics/Extended.h"
+#include "numerics/NumericAccess.h"
 #include "strings/PathText.h"
 
 namespace tessel {
@@ -66,16 +66,25 @@ int32 ExponentialCode(const FmtSpec& spec) {
     return std::min(digits, kMaxSignificantDigits);
 }
 
+/* |trunc(log10 x)| is at most `limit`. Mostly the power of two tells; x > 0. */
+bool PowerFits(Extended x, int32 limit) {
+    const auto fits = [limit](Extended power) { return std::fabs(std::trunc(power)) <= static_cast<Extended>(limit); };
+    constexpr Extended kLog10Of2 = 0.30102999566398119521L;
+    const Extended below = kLog10Of2 * std::ilogb(x);
+    const bool fitsBelow = fits(below);
+    return fitsBelow == fits(below + kLog10Of2) ? fitsBelow : fits(std::log10(x));
+}
+
 /* Whether the fixed form of a real shows it without more digits than are sensible. */
 bool FixedFits(Extended value, int32 limit) {
     if (value == 0) return limit >= 1;
     if (!std::isfinite(value)) return limit >= kSpecialTextLength;
-    const auto power = static_cast<int32>(std::log10(std::fabs(value)));
-    return (value < 0) + std::abs(power) <= limit;
+    return PowerFits(std::fabs(value), limit - (value < 0));
 }
 
 bool FixedFits(const void* value, int16 type, int32 limit) {
     if (!value) return FixedFits(Extended{0}, limit);
+    if (type == kNumDouble) return FixedFits(ReadAs<double>(value), limit);
     cmplxExt parts;
     ConvertNum(type, value, kNumComplexExtended, &parts);
     return FixedFits(ToExtended(parts.re), limit) &&

@@ -19,8 +19,7 @@ UHandle* AsHandlePtr(T*** handle) {
 /* Brings a handle to `needed` bytes: exactly, or only when it is smaller. */
 template <class T>
 MgErr SizeHandle(T** handle, uint32 needed, bool exact) {
-    const uint32 size = DSGetHandleSize(AsHandle(handle));
-    if (exact ? size == needed : size >= needed) return kNoErr;
+    if (!exact && DSGetHandleSize(AsHandle(handle)) >= needed) return kNoErr;
     return DSSetHandleSize(AsHandle(handle), needed);
 }
 

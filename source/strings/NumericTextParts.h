@@ -2,54 +2,16 @@
 #pragma once
 
 #include <algorithm>
-#include <array>
-#include <bit>
 #include <cstring>
 
 #include <tessel/base/NumericTypes.h>
 
 #include "numerics/DecimalConversion.h"
+#include "strings/DecimalDigits.h"
 
 namespace tessel {
 
 // ---- digits ----
-
-/* Number of decimal digits; 1 for 0. */
-inline int32 CountDigits(uint64 value) {
-    value |= 1;  // no power of ten but 1 is odd: this changes the answer for 0 alone
-    const int32 bits = 64 - std::countl_zero(value);
-    const int32 guess = (bits * 1233) >> 12;  // floor(bits * log10(2)): right, or one short
-    return guess + (value >= PowerOfTen64(guess) ? 1 : 0);
-}
-
-inline constexpr std::array<char, 200> kDigitPairs = [] {
-    std::array<char, 200> pairs{};
-    for (size_t i = 0; i < 100; ++i) {
-        pairs[2 * i] = static_cast<char>('0' + i / 10);
-        pairs[2 * i + 1] = static_cast<char>('0' + i % 10);
-    }
-    return pairs;
-}();
-
-/* Writes exactly `count` decimal digits, leading zeros included, the last one just before `end`. */
-template <class Word>
-void WriteDigitsBefore(char* end, Word value, int32 count) {
-    for (; count >= 2; count -= 2, value /= 100) std::memcpy(end -= 2, &kDigitPairs[2 * (value % 100)], 2);
-    if (count == 1) *--end = static_cast<char>('0' + value % 10);
-}
-
-/* Writes a decimal integer, at most 20 characters, and returns where it ends. */
-inline char* WriteDecimal(char* out, uint64 magnitude, bool negative) {
-    *out = '-';
-    out += negative ? 1 : 0;
-    const int32 count = CountDigits(magnitude);
-    if (magnitude <= 0xFFFFFFFF) {
-        WriteDigitsBefore(out + count, static_cast<uint32>(magnitude), count);
-    } else {
-        WriteDigitsBefore(out + count, magnitude, count);
-    }
-    return out + count;
-}
 
 /* The digits of a real, most significant first, with zeros after them: what is copied may run past the last digit. */
 struct DigitText {

@@ -70,7 +70,7 @@ RealText RoundToText(const RealParts& parts, int32 k) {
 // The digits cut to k of them, the last one rounded half up; a carry out of the first raises the exponent.
 RealText CutInteger(uint64 magnitude, int32 k) {
     RealText text;
-    int32 count = CountDigits(magnitude);
+    auto count = static_cast<int32>(CountDecimalDigits(magnitude));
     text.lead = count - 1;
     if (count > k) {
         const uint64 unit = PowerOfTen64(count - k);
@@ -94,7 +94,7 @@ int32 RenderInteger(const RealSource& source, int32 k, char* buffer, int32 size,
         return out.Length();
     }
     DigitText digits;
-    digits.Set(source.magnitude, CountDigits(source.magnitude));
+    digits.Set(source.magnitude, static_cast<int32>(CountDecimalDigits(source.magnitude)));
     out.PutDigits(digits, 0, digits.count);
     if (k < 0) out.Put(decimalPoint);
     out.Fill('0', std::min(-k, kMostDecimals));
@@ -130,7 +130,7 @@ bool ReadRecord(const PackedDecimal& record, RealText& text) {
         good = good && digit <= 9;
         digits = 10 * digits + digit;
     }
-    text.digits.Set(digits, CountDigits(digits));
+    text.digits.Set(digits, static_cast<int32>(CountDecimalDigits(digits)));
     text.lead = digits == 0 ? 0 : record.exponent + text.digits.count - 1;
     return good;
 }
