@@ -8,6 +8,7 @@
 #include <tessel/paths/PathTextFormat.h>
 #include <tessel/strings/StringPStr.h>
 
+#include <algorithm>
 #include <cstring>
 #include <string>
 
@@ -154,7 +155,7 @@ MgErr PStrAppendRezExt(PStr name, _FMFileType type) {
         PathRef::NameAppendExtension(&text, type);
         if (text.size() > 255) return kArgErr;
         name[0] = static_cast<uint8>(text.size());
-        std::memcpy(name + 1, text.data(), text.size());
+        std::copy(text.begin(), text.end(), name + 1);
         return kNoErr;
     });
 }

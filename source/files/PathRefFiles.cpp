@@ -186,8 +186,11 @@ void PathRef::AppendTemporaryName(const StringType& extension, const StringType&
     for (;;) {
         uint32 number = 0;
         if (!platform::RandomBytes(&number, sizeof number)) TESSEL_THROW(kIOErr, "PathRef AppendTemporaryName");
+        StringType name = prefix;
+        name.append(std::to_string(number)).append(suffix);
+        if (!extension.empty()) name.append(".").append(extension);
         PathRef candidate(*this);
-        candidate.Append(prefix + std::to_string(number) + suffix + (extension.empty() ? "" : "." + extension));
+        candidate.Append(name);
         if (candidate.Exists()) continue;
         *this = candidate;
         return;

@@ -430,7 +430,7 @@ MgErr BaseCookieJar::GetCookieList(CookieList* list) {
     MgErr err = fJar ? MCGetCookieList(fJar, &cookies) : kNoErr;
     int32 count = cookies && err == kNoErr ? *reinterpret_cast<const int32*>(*cookies) : 0;
     MgErr listErr = list->SetCount(count);
-    for (int32 i = 0; i < list->GetCount(); ++i)
+    for (int32 i = 0; listErr == kNoErr && i < count; ++i)
         list->SetCookie(i, reinterpret_cast<const MagicCookie*>(*cookies)[i + 1]);
     DSDisposeHandle(cookies);
     return err != kNoErr ? err : listErr;

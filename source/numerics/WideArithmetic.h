@@ -98,8 +98,8 @@ public:
 private:
     constexpr uint32 Limb(int index) const { return index >= 0 && index < size_ ? limbs_[index] : 0; }
     constexpr uint64 Bits64(int first) const {
-        const int index = first >= 0 ? first / 32 : -((31 - first) / 32);
-        const int shift = first - 32 * index;
+        const int shift = first & 31;
+        const int index = (first - shift) / 32;
         const uint64 low = (static_cast<uint64>(Limb(index + 1)) << 32) | Limb(index);
         return shift == 0 ? low : (low >> shift) | (static_cast<uint64>(Limb(index + 2)) << (64 - shift));
     }
