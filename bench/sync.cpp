@@ -4,6 +4,7 @@
 #include <time.h>
 
 #include <atomic>
+#include <chrono>
 #include <condition_variable>
 #include <mutex>
 #include <semaphore>
@@ -95,6 +96,28 @@ void CompareMutexes(bench::Table& table) {
     ThMutexDestroy(ours);
 }
 
+// Processor time of the calling thread, in seconds.
+double ProcessorTime() {
+    timespec used;
+    clock_gettime(CLOCK_THREAD_CPUTIME_ID, &used);
+    return static_cast<double>(used.tv_sec) + static_cast<double>(used.tv_nsec) * 1e-9;
+}
+
+// What a wait for nothing costs: it must not burn a processor. The event was in heavy use just before.
+void CompareIdleWaits(bench::Table& table, ThEvent event) {
+    auto used = [](auto wait) {
+        return [wait] {
+            double before = ProcessorTime();
+            wait();
+            return ProcessorTime() - before;
+        };
+    };
+    std::binary_semaphore semaphore(0);
+    table.CompareTimed("processor time of a wait of 20 ms for nothing",
+                       used([=] { ThEventWaitWithTimeout(event, 20); }), "std::binary_semaphore",
+                       used([&] { (void)semaphore.try_acquire_for(std::chrono::milliseconds(20)); }), 1.0);
+}
+
 void CompareEvents(bench::Table& table) {
     ThEvent events[2];
     for (ThEvent& event : events) ThEventCreate(&event, 0, false);
@@ -139,6 +162,7 @@ void CompareEvents(bench::Table& table) {
     Flag flags[2];
     table.Compare("the same", ours, "condition variable",
                   PingPong([&](int i) { flags[i].Signal(); }, [&](int i) { flags[i].Wait(); }), 1.0);
+    CompareIdleWaits(table, event);
     for (ThEvent each : events) ThEventDestroy(each);
 }
 

@@ -5,7 +5,7 @@
 
      state          Set                       Wait
      signaled       stays so                  resets it and goes on
-     not, nobody    signaled                  spins briefly, then sleeps
+     not, nobody    signaled                  looks again for a while, then sleeps
      not, waiters   wakes one if it sleeps    joins them
 
    Nothing allocates or throws; nobody asleep, no system call. Any thread. The memory may be released as soon as no
@@ -19,54 +19,65 @@
 
 namespace tessel::platform {
 
+/* kFailed: the host cannot wait. */
+enum class EventWait { kTaken, kTimedOut, kFailed };
+
 class Event {
 public:
-    explicit constexpr Event(bool signaled = false) noexcept : word_(signaled ? kSignaled : 0) {}
+    explicit constexpr Event(bool signaled = false) noexcept : signaled_(signaled ? 1 : 0) {}
     Event(const Event&) = delete;
     Event& operator=(const Event&) = delete;
 
     /* True when a thread was waiting. */
     bool Set() noexcept {
-        std::uint32_t before = word_.fetch_or(kSignaled, std::memory_order_seq_cst);
-        if (before > kSignaled) {
-            Wake(before);
-            return true;
-        }
-        return awake_.load(std::memory_order_relaxed) != 0;
+        bool before = signaled_.exchange(1, std::memory_order_seq_cst) != 0;
+        std::uint32_t sleepers = sleepers_.load(std::memory_order_seq_cst);
+        if (sleepers == 0) return awake_.load(std::memory_order_relaxed) != 0;
+        /* Only the signal that was not there before wakes: the earlier one woke somebody, who is on the way. */
+        if (!before) Wake(sleepers);
+        return true;
     }
 
     /* Not signaled from here on. True when it was. */
-    bool Reset() noexcept { return (word_.fetch_and(~kSignaled, std::memory_order_seq_cst) & kSignaled) != 0; }
+    bool Reset() noexcept { return signaled_.exchange(0, std::memory_order_seq_cst) != 0; }
 
-    /* True when the signal was taken, false when so many milliseconds passed without one. Negative: waits for ever.
-       Never early; changes of the time of day do not matter. */
-    bool Wait(std::int32_t milliseconds) noexcept;
+    /* kTaken when the signal was taken, kTimedOut when so many milliseconds passed without one. Negative: waits for
+       ever. Never early; changes of the time of day do not matter. */
+    EventWait Wait(std::int32_t milliseconds) noexcept {
+        if (Take()) return EventWait::kTaken;
+        return milliseconds == 0 ? EventWait::kTimedOut : WaitForSignal(milliseconds);
+    }
 
     /* Waits until one of `count` (at most kMostEvents) different events is signaled, and takes the signal of the first
-       such. Its index, or -1 after so many milliseconds. */
+       such; its index is in `first`, which is -1 otherwise. */
     static constexpr std::size_t kMostEvents = 4;
-    static int WaitAny(Event* const* events, std::size_t count, std::int32_t milliseconds) noexcept;
+    static EventWait WaitAny(Event* const* events, std::size_t count, std::int32_t milliseconds, int& first) noexcept;
 
 private:
     struct Watch;
-    static constexpr std::uint32_t kSignaled = 1; /* bit 0 of word_ */
-    static constexpr std::uint32_t kWatched = 2;  /* bit 1: a WaitAny watches this event among others */
-    static constexpr std::uint32_t kSleeper = 4;  /* the rest counts the threads asleep in Wait */
+    static constexpr std::uint32_t kWatched = 1; /* bit 0 of sleepers_: a WaitAny watches this event among others */
+    static constexpr std::uint32_t kSleeper = 2; /* the rest counts the threads asleep in Wait */
 
-    bool Take() noexcept;
-    bool Spin() noexcept;
-    bool SleepFor(std::int32_t milliseconds) noexcept;
-    void Wake(std::uint32_t before) noexcept;
-    void PassOn(std::uint32_t now) noexcept;
+    bool Take() noexcept {
+        return signaled_.load(std::memory_order_seq_cst) != 0 && signaled_.exchange(0, std::memory_order_seq_cst) != 0;
+    }
+    EventWait WaitForSignal(std::int32_t milliseconds) noexcept;
+    bool LookAgain() noexcept;
+    EventWait SleepFor(std::int32_t milliseconds) noexcept;
+    void Wake(std::uint32_t sleepers) noexcept;
     void AddWatch(Watch& watch) noexcept;
     void RemoveWatch(Watch& watch) noexcept;
     void WakeWatches() noexcept;
     static int TakeFirst(Event* const* events, std::size_t count) noexcept;
 
-    std::atomic<std::uint32_t> word_;
-    std::atomic<std::uint16_t> awake_{0}; /* threads in Wait that do not sleep */
-    std::atomic<std::uint16_t> spins_{0}; /* how long the last waits were worth spinning */
-    Watch* watches_ = nullptr;            /* guarded by the one lock of all watches */
+    /* Who waits first counts itself and then looks for the signal, who signals does it the other way round: so one of
+       them sees the other. */
+    std::atomic<std::uint32_t> signaled_; /* 0 or 1; sleepers sleep on it */
+    std::atomic<std::uint32_t> sleepers_{0};
+    std::atomic<std::uint32_t> awake_{0}; /* threads in Wait that do not sleep */
+    std::atomic<std::uint8_t> habit_{0};  /* how soon signals came lately */
+    std::atomic<std::uint8_t> shortSleeps_{0};
+    Watch* watches_ = nullptr; /* guarded by the one lock of all watches */
 };
 
 /* Signaled by the host when input for the thread that handles its messages has arrived. One for the process. */

@@ -14,7 +14,7 @@ class HostEvent final : public PlatformEvent, public PlainAllocation {
 public:
     int32 Signal() override { return event_.Set() ? 1 : 0; }
     int32 Reset() override { return event_.Reset() ? 1 : 0; }
-    int32 Wait(int32 milliseconds) override { return event_.Wait(milliseconds) ? kSignaled : kTimedOut; }
+    int32 Wait(int32 milliseconds) override { return ResultOf(event_.Wait(milliseconds)); }
     MgErr WaitAndPump(ThEventPumpProc, void*, int32) override { return kMemFullErr; }
     int32 MsgWaitMultiple(PlatformEvent* other, bool pump, int32 milliseconds, bool* messageArrived,
                           bool* otherSignaled) override;
@@ -22,9 +22,12 @@ public:
     MgErr Init(bool signaled) override;
     MgErr Uninit() override { return kNoErr; }
 
-    enum WaitResult : int32 { kSignaled = 0, kTimedOut = 1, kFailed = 2 };
-
 private:
+    static int32 ResultOf(platform::EventWait wait) {
+        if (wait == platform::EventWait::kTaken) return kSignaled;
+        return wait == platform::EventWait::kTimedOut ? kTimedOut : kFailed;
+    }
+
     platform::Event event_;
 };
 

@@ -29,10 +29,11 @@ int32 HostEvent::MsgWaitMultiple(PlatformEvent* other, bool pump, int32 millisec
         messageIndex = count;
         events[count++] = &platform::MessageEvent();
     }
-    int first = platform::Event::WaitAny(events, static_cast<std::size_t>(count), milliseconds);
+    int first = -1;
+    platform::EventWait wait = platform::Event::WaitAny(events, static_cast<std::size_t>(count), milliseconds, first);
     if (messageArrived) *messageArrived = first >= 0 && first == messageIndex;
     if (otherSignaled) *otherSignaled = first >= 0 && first == otherIndex;
-    return first < 0 ? kTimedOut : kSignaled;
+    return ResultOf(wait);
 }
 
 void HostEvent::GetLatencyStats(uint32* count, _HRTime* total, _HRTime* third, _HRTime* minimum, _HRTime* maximum) {

@@ -119,11 +119,14 @@ int32 ThEventReset(ThEvent event) {
 
 MgErr ThEventWaitWithTimeout(ThEvent event, int32 milliseconds) {
     if (!IsEvent(event)) return kArgErr;
-    switch (Host(event).Wait(milliseconds)) {
-        case HostEvent::kSignaled:
+    switch (event->platformEvent->Wait(milliseconds)) {
+        case PlatformEvent::kSignaled:
             return kNoErr;
-        case HostEvent::kTimedOut:
+        case PlatformEvent::kTimedOut:
             return kTimeOutErr;
+        case PlatformEvent::kRetry:
+            TESSEL_REPORT(kDebugWarning, 0x2C8F6A13u) << "We were not supposed to retry here";
+            return kArgErr;
         default:
             TESSEL_REPORT(kDebugFatal, 0x0D6E47F2u) << "Wait on event failed";
             return kArgErr;
@@ -139,7 +142,7 @@ int32 ThEventMsgWaitMultiple(ThEvent event, ThEvent second, int32 milliseconds, 
     bool messageArrived = false, secondSignaled = false;
     PlatformEvent* other = second && second != event && IsEvent(second) ? second->platformEvent : nullptr;
     int32 result = Host(event).MsgWaitMultiple(other, pumpMessages, milliseconds, &messageArrived, &secondSignaled);
-    return result == HostEvent::kSignaled && !messageArrived && !secondSignaled ? 1 : 0;
+    return result == PlatformEvent::kSignaled && !messageArrived && !secondSignaled ? 1 : 0;
 }
 
 void ThEventMessageArrived(void) {

@@ -1,7 +1,9 @@
 #include <gmock/gmock.h>
 
 #include <atomic>
+#include <cstdlib>
 #include <thread>
+#include <utility>
 #include <vector>
 
 #include <tessel/sync/PlatformEvent.h>
@@ -61,44 +63,42 @@ TEST_F(Sync, SignalsCountAsOneUntilTheyAreTaken) {
     ThEventDestroy(event);
 }
 
-TEST_F(Sync, NoWakeUpIsLost) {
-    constexpr int kRounds = 20000;
-    ThEvent ping = NewEvent(), pong = NewEvent();
-    int shared = 0;  // handed from one thread to the other
-    std::thread partner([&] {
-        for (int i = 0; i < kRounds; ++i) {
-            ThEventWait(ping);
-            ++shared;
-            ThEventSignal(pong);
+// One slot between makers and takers. The two events are all that guards it: a signal that is lost stops them, one that
+// two threads take breaks the slot. The takers wait in all ways there are. TESSEL_TEST_HANDOVERS makes it more than
+// the few that a test run has time for.
+TEST_F(Sync, EverySignalReleasesOneOfManyThreads) {
+    constexpr int kMakers = 4, kTakers = 4;
+    const char* wanted = std::getenv("TESSEL_TEST_HANDOVERS");
+    const int64 handovers = wanted ? std::atoll(wanted) : 20000, each = handovers / kTakers;
+    ThEvent empty = NewEvent(true), full = NewEvent(), never = NewEvent();
+    int64 slot = 0, made = 0;  // what is in the slot, 0 for nothing; all that was ever in it
+    std::atomic<int64> sum{0};
+    auto make = [&] {
+        for (int64 i = 0; i < each; ++i) {
+            ASSERT_EQ(kNoErr, ThEventWaitWithTimeout(empty, 100000));
+            ASSERT_EQ(0, slot);
+            slot = ++made;
+            ThEventSignal(full);
         }
-    });
-    for (int i = 0; i < kRounds; ++i) {
-        ++shared;
-        ThEventSignal(ping);
-        ASSERT_EQ(kNoErr, ThEventWaitWithTimeout(pong, 60000));
-    }
-    partner.join();
-    EXPECT_EQ(2 * kRounds, shared);
-    ThEventDestroy(ping);
-    ThEventDestroy(pong);
-}
-
-TEST_F(Sync, EachSignalReleasesOneOfManyWaiters) {
-    constexpr int kThreads = 8;
-    ThEvent event = NewEvent();
-    std::atomic<int> released{0}, timedOut{0};
-    std::thread signaler([&] {
-        // One signal for each waiter, the next when the one before has been taken.
-        for (int i = 0; i < kThreads; ++i) {
-            ThEventSignal(event);
-            while (released <= i) std::this_thread::yield();
+    };
+    auto take = [&](int kind) {
+        for (int64 taken = 0; taken < each;) {
+            bool got = kind == 0   ? ThEventWaitWithTimeout(full, 1) == kNoErr
+                       : kind == 1 ? ThEventMsgWaitMultiple(full, never, 100000, true) == 1
+                                   : ThEventWait(full) == kNoErr;
+            if (!got) continue;
+            ASSERT_NE(0, slot);
+            sum += std::exchange(slot, 0);
+            ++taken;
+            ThEventSignal(empty);
         }
-    });
-    InThreads(kThreads, [&](int) { ThEventWaitWithTimeout(event, 60000) == kNoErr ? ++released : ++timedOut; });
-    signaler.join();
-    EXPECT_EQ(kThreads, released);
-    EXPECT_EQ(kTimeOutErr, ThEventWaitWithTimeout(event, 0));
-    ThEventDestroy(event);
+    };
+    InThreads(kMakers + kTakers, [&](int thread) { thread < kMakers ? make() : take(thread - kMakers); });
+    EXPECT_EQ(each * kTakers, made);
+    EXPECT_EQ(made * (made + 1) / 2, sum);
+    EXPECT_EQ(kNoErr, ThEventWaitWithTimeout(empty, 0));
+    EXPECT_EQ(kTimeOutErr, ThEventWaitWithTimeout(full, 0));
+    for (ThEvent event : {empty, full, never}) ThEventDestroy(event);
 }
 
 int customSignals;
@@ -160,12 +160,14 @@ TEST_F(Sync, BadEventsAreReported) {
     ThMutexRelease(nullptr);
 }
 
-// An event that has measured, and refuses to end.
-class MeasuringEvent final : public PlatformEvent {
+// An event of another platform: it has measured, its waits end as told, and it refuses to end.
+class ForeignEvent final : public PlatformEvent {
 public:
+    int32 result = kFailed;
+
     int32 Signal() override { return 0; }
     int32 Reset() override { return 0; }
-    int32 Wait(int32) override { return 0; }
+    int32 Wait(int32) override { return result; }
     MgErr WaitAndPump(ThEventPumpProc, void*, int32) override { return 0; }
     int32 MsgWaitMultiple(PlatformEvent*, bool, int32, bool*, bool*) override { return 0; }
     void GetLatencyStats(uint32* count, _HRTime* total, _HRTime*, _HRTime* minimum, _HRTime* maximum) override {
@@ -186,13 +188,20 @@ public:
     MgErr Uninit() override { return kGenericErr; }
 };
 
-TEST_F(Sync, EventsReportTheirLatencies) {
+TEST_F(Sync, WhatThePlatformSaysIsReported) {
     ThEvent event = NewEvent();
     DestroyPlatformEvent(event->platformEvent);
-    event->platformEvent = new MeasuringEvent;
+    ForeignEvent* foreign = new ForeignEvent;
+    event->platformEvent = foreign;
+    EXPECT_EQ(kArgErr, ThEventWait(event));
+    EXPECT_EQ(1u, reports.CountAt(kDebugFatal));
+    foreign->result = PlatformEvent::kRetry;
+    EXPECT_EQ(kArgErr, ThEventWait(event));
+    EXPECT_EQ(1u, reports.CountAt(kDebugWarning));
     ThEventDestroy(event);
     EXPECT_THAT(reports.Texts(),
-                ElementsAre("ThEventDestroy:: (ms) avg latency=2.66667; nEvents=3; min=1.00000; max=4.00000",
+                ElementsAre("Wait on event failed", "We were not supposed to retry here",
+                            "ThEventDestroy:: (ms) avg latency=2.66667; nEvents=3; min=1.00000; max=4.00000",
                             "DestroyPlatformEvent failed with MgErr 42."));
 }
 

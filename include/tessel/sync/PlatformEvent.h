@@ -11,9 +11,12 @@
 
 namespace tessel {
 
-/* Results of the waits: 0 signaled, 1 timed out, 2 the platform failed. Milliseconds below 0 wait for ever. */
+/* Milliseconds below 0 wait for ever. Any thread; Init and Uninit while no other uses the event. */
 class TESSEL_API PlatformEvent {
 public:
+    /* Results of the waits. No event of this host asks for another try. */
+    enum WaitResult : int32 { kSignaled = 0, kTimedOut = 1, kFailed = 2, kRetry = 3 };
+
     virtual ~PlatformEvent();
     /* 1 when a thread was waiting, else 0. */
     virtual int32 Signal() = 0;

@@ -30,19 +30,20 @@ public:
         if (milliseconds >= 0) at_ = MonotonicNanoseconds() + std::int64_t{milliseconds} * 1'000'000;
     }
 
-    /* Sleeps while the word holds `value`, or until somebody wakes it. False when the time is over. The kernel counts
-       its time from after our look at the clock, so it is never over early. */
-    bool SleepWhile(std::atomic<std::uint32_t>& word, std::uint32_t value) const {
+    /* Sleeps while the word is 0: kTaken when that may have changed. The kernel counts its time from after our look at
+       the clock, so it is never over early. */
+    EventWait SleepWhileZero(std::atomic<std::uint32_t>& word) const {
         timespec left{};
         if (at_ != kNever) {
             std::int64_t remaining = at_ - MonotonicNanoseconds();
-            if (remaining <= 0) return false;
+            if (remaining <= 0) return EventWait::kTimedOut;
             left.tv_sec = static_cast<time_t>(remaining / kNanosecondsPerSecond);
             left.tv_nsec = static_cast<long>(remaining % kNanosecondsPerSecond);
         }
-        long result = systemCalls.futex(reinterpret_cast<std::uint32_t*>(&word), FUTEX_WAIT_PRIVATE, value,
+        long result = systemCalls.futex(reinterpret_cast<std::uint32_t*>(&word), FUTEX_WAIT_PRIVATE, 0,
                                         at_ != kNever ? &left : nullptr);
-        return result == 0 || errno != ETIMEDOUT;
+        if (result == 0 || errno == EAGAIN || errno == EINTR) return EventWait::kTaken;
+        return errno == ETIMEDOUT ? EventWait::kTimedOut : EventWait::kFailed;
     }
 
 private:
@@ -54,11 +55,20 @@ void WakeOne(std::atomic<std::uint32_t>& word) {
     systemCalls.futex(reinterpret_cast<std::uint32_t*>(&word), FUTEX_WAKE_PRIVATE, 1, nullptr);
 }
 
-/* Spinning pays when the signal comes sooner than a sleep and a wake-up cost. Each event remembers whether it lately
-   did: a short sleep says that spinning would have paid, a long one that it did not. */
-constexpr std::uint16_t kMostSpins = 128;
-constexpr std::uint16_t kLeastSpins = 4;
-constexpr std::int64_t kShortSleep = 50'000; /* nanoseconds */
+/* Looking again pays when the signal comes sooner than a sleep and a wake-up cost. What each event lately met decides
+   how: a signaler on another processor needs no more than a short spin, one on this processor cannot run before we
+   yield, and one that was long in coming is not worth either. Two threads that hand a turn to each other would go on
+   sleeping once they began to, as each takes longer to wake than the other looks: so one short sleep in eight is
+   followed by a look that outlasts a wake-up. */
+enum Habit : std::uint8_t {
+    kLong = 0,             /* the last wait slept long */
+    kSoon = 1,             /* spin, then yield */
+    kOnThisProcessor = 16, /* yield at once; counts down to kSoon, as threads move */
+    kPatient = 17          /* yield at once, and many times */
+};
+constexpr int kSpins = 32, kYields = 6;       /* some 2 us in all */
+constexpr int kPatientYields = 160;           /* some 40 us */
+constexpr std::int64_t kShortSleep = 100'000; /* nanoseconds; wake-ups among them may take half */
 
 bool SpinningHelps() {
     static const bool several = NumberOfProcessors() > 1;
@@ -69,46 +79,43 @@ bool SpinningHelps() {
 
 // ---- one event ------------------------------------------------------------------------------------------------------
 
-bool Event::Take() noexcept {
-    if (!(word_.load(std::memory_order_relaxed) & kSignaled)) return false;
-    return (word_.fetch_and(~kSignaled, std::memory_order_acq_rel) & kSignaled) != 0;
-}
-
-bool Event::Spin() noexcept {
-    if (!SpinningHelps()) return false;
-    std::uint16_t limit = std::max(spins_.load(std::memory_order_relaxed), kLeastSpins);
-    for (std::uint16_t i = 0; i < limit; ++i) {
+bool Event::LookAgain() noexcept {
+    std::uint8_t habit = habit_.load(std::memory_order_relaxed);
+    if (habit == kLong) return Take();
+    for (int i = 0; habit == kSoon && SpinningHelps() && i < kSpins; ++i) {
         if (Take()) return true;
         SpinPause();
+    }
+    for (int i = 0; i < (habit == kPatient ? kPatientYields : kYields); ++i) {
+        YieldThread();
+        if (!Take()) continue;
+        int next = habit == kSoon ? kOnThisProcessor : habit == kPatient ? kSoon : habit - 1;
+        habit_.store(static_cast<std::uint8_t>(next), std::memory_order_relaxed);
+        return true;
     }
     return false;
 }
 
-bool Event::Wait(std::int32_t milliseconds) noexcept {
-    if (Take()) return true;
-    if (milliseconds == 0) return false;
+EventWait Event::WaitForSignal(std::int32_t milliseconds) noexcept {
     awake_.fetch_add(1, std::memory_order_relaxed);
-    bool taken = Spin();
-    if (!taken) word_.fetch_add(kSleeper, std::memory_order_seq_cst);
+    bool taken = LookAgain();
+    if (!taken) sleepers_.fetch_add(kSleeper, std::memory_order_seq_cst);
     awake_.fetch_sub(1, std::memory_order_relaxed);
-    return taken || SleepFor(milliseconds);
+    return taken ? EventWait::kTaken : SleepFor(milliseconds);
 }
 
 /* The calling thread is counted among the sleepers already. */
-bool Event::SleepFor(std::int32_t milliseconds) noexcept {
+EventWait Event::SleepFor(std::int32_t milliseconds) noexcept {
     Deadline deadline(milliseconds);
     std::int64_t start = MonotonicNanoseconds();
-    bool taken = Take();
-    bool inTime = true;
-    while (!taken && inTime) {
-        std::uint32_t now = word_.load(std::memory_order_relaxed);
-        if (!(now & kSignaled)) inTime = deadline.SleepWhile(word_, now);
-        taken = Take();
-    }
+    EventWait slept = EventWait::kTaken;
+    bool taken;
+    while (!(taken = Take()) && slept == EventWait::kTaken) slept = deadline.SleepWhileZero(signaled_);
     bool isShort = taken && MonotonicNanoseconds() - start < kShortSleep;
-    spins_.store(isShort ? kMostSpins : std::uint16_t{0}, std::memory_order_relaxed);
-    PassOn(word_.fetch_sub(kSleeper, std::memory_order_seq_cst) - kSleeper);
-    return taken;
+    bool isEighth = isShort && shortSleeps_.fetch_add(1, std::memory_order_relaxed) % 8 == 0;
+    habit_.store(isEighth ? kPatient : isShort ? kSoon : kLong, std::memory_order_relaxed);
+    sleepers_.fetch_sub(kSleeper, std::memory_order_seq_cst);
+    return taken ? EventWait::kTaken : slept;
 }
 
 // ---- several events -------------------------------------------------------------------------------------------------
@@ -134,29 +141,22 @@ void Event::WakeWatches() noexcept {
     }
 }
 
-/* Only the signal that was not there before wakes: the earlier one woke somebody, and who leaves a signal behind passes
-   it on. */
-void Event::Wake(std::uint32_t before) noexcept {
-    if (before & kSignaled) return;
-    if (before & kWatched) WakeWatches();
-    if (before >= kSleeper) WakeOne(word_);
-}
-
-void Event::PassOn(std::uint32_t now) noexcept {
-    if (now & kSignaled) Wake(now & ~kSignaled);
+void Event::Wake(std::uint32_t sleepers) noexcept {
+    if (sleepers & kWatched) WakeWatches();
+    if (sleepers >= kSleeper) WakeOne(signaled_);
 }
 
 void Event::AddWatch(Watch& watch) noexcept {
     watch.next = watches_;
     watches_ = &watch;
-    word_.fetch_or(kWatched, std::memory_order_seq_cst);
+    sleepers_.fetch_or(kWatched, std::memory_order_seq_cst);
 }
 
 void Event::RemoveWatch(Watch& watch) noexcept {
     Watch** link = &watches_;
     while (*link != &watch) link = &(*link)->next;
     *link = watch.next;
-    if (!watches_) word_.fetch_and(~kWatched, std::memory_order_seq_cst);
+    if (!watches_) sleepers_.fetch_and(~kWatched, std::memory_order_seq_cst);
 }
 
 int Event::TakeFirst(Event* const* events, std::size_t count) noexcept {
@@ -166,10 +166,11 @@ int Event::TakeFirst(Event* const* events, std::size_t count) noexcept {
     return -1;
 }
 
-int Event::WaitAny(Event* const* events, std::size_t count, std::int32_t milliseconds) noexcept {
+EventWait Event::WaitAny(Event* const* events, std::size_t count, std::int32_t milliseconds, int& first) noexcept {
     count = std::min(count, kMostEvents);
-    int taken = TakeFirst(events, count);
-    if (taken >= 0 || milliseconds == 0) return taken;
+    first = TakeFirst(events, count);
+    if (first >= 0) return EventWait::kTaken;
+    if (milliseconds == 0) return EventWait::kTimedOut;
 
     Deadline deadline(milliseconds);
     std::atomic<std::uint32_t> woken{0};
@@ -181,17 +182,16 @@ int Event::WaitAny(Event* const* events, std::size_t count, std::int32_t millise
             events[i]->AddWatch(watches[i]);
         }
     }
-    bool inTime = true;
-    while ((taken = TakeFirst(events, count)) < 0 && inTime) {
-        inTime = deadline.SleepWhile(woken, 0);
+    EventWait slept = EventWait::kTaken;
+    while ((first = TakeFirst(events, count)) < 0 && slept == EventWait::kTaken) {
+        slept = deadline.SleepWhileZero(woken);
         woken.store(0, std::memory_order_seq_cst);
     }
     {
         MutexHolder holder(watchMutex);
         for (std::size_t i = 0; i < count; ++i) events[i]->RemoveWatch(watches[i]);
     }
-    for (std::size_t i = 0; i < count; ++i) events[i]->PassOn(events[i]->word_.load(std::memory_order_seq_cst));
-    return taken;
+    return first >= 0 ? EventWait::kTaken : slept;
 }
 
 Event& MessageEvent() noexcept {

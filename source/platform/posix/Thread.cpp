@@ -220,7 +220,9 @@ bool ThreadJoin(ThreadHandle thread, std::int32_t milliseconds) noexcept {
     if (!thread) return FailWith(kErrorInvalidHandle);
     if (!thread->started) return AwaitForeign(*thread, milliseconds);
     if (!thread->ended.load(std::memory_order_acquire)) {
-        if (!thread->over.Wait(milliseconds)) return FailWith(kErrorTimedOut);
+        EventWait waited = thread->over.Wait(milliseconds);
+        if (waited != EventWait::kTaken)
+            return FailWith(waited == EventWait::kTimedOut ? kErrorTimedOut : kErrorGeneralFailure);
         thread->over.Set();
     }
     MutexHolder holder(thread->joinMutex);
