@@ -45,8 +45,7 @@ struct ManyUnits {
     }
 };
 
-// ---- from one record to the next
-// -------------------------------------------------------------------------------------
+// ---- from one record to the next ------------------------------------------------------------------------------------
 
 template <size_t N>
 struct FixedStride {
@@ -97,7 +96,7 @@ public:
         Range pending[kMaxPending];
         size_t count = 0;
         for (;;) {
-            if (static_cast<size_t>(hi - lo) > 2 * size) {
+            if (static_cast<size_t>(hi - lo) > 2 * size && !SortRun(lo, hi)) {
                 char* pivot = Partition(lo, hi);
                 if (pivot - lo > hi - pivot) {
                     if (pivot - size != lo) pending[count++] = {lo, pivot - size};
@@ -108,7 +107,7 @@ public:
                 }
                 continue;
             }
-            SortFew(lo, hi);
+            if (static_cast<size_t>(hi - lo) <= 2 * size) SortFew(lo, hi);
             if (count == 0) return;
             lo = pending[--count].lo;
             hi = pending[count].hi;
@@ -130,6 +129,30 @@ private:
         Order(mid, hi);
     }
 
+    // What is in order, or in reverse, needs no partition: it is left alone, or turned round. Only where there is one
+    // sorted order: all records differ, or are the same in every byte. Elsewhere that is found out soon, as an order is
+    // mostly disturbed in the middle, where the pivot was taken, or at an end.
+    bool SortRun(char* lo, char* hi) {
+        constexpr size_t kWorthALook = 32;  // records
+        const size_t size = stride_.Bytes();
+        const size_t count = static_cast<size_t>(hi - lo) / size;
+        if (count < kWorthALook || swap_.size != size) return false;
+        const bool falling = compare_(lo, lo + size) > 0;
+        const char* const mid = lo + count / 2 * size;
+        if (!IsInRun(mid, falling) || !IsInRun(mid - size, falling)) return false;
+        for (const char *low = lo, *high = hi - size; low <= high; low += size, high -= size) {
+            if (!IsInRun(high, falling) || !IsInRun(low, falling)) return false;
+        }
+        for (; falling && lo < hi; lo += size, hi -= size) swap_(lo, hi);
+        return true;
+    }
+
+    bool IsInRun(const char* record, bool falling) const {
+        const size_t size = stride_.Bytes();
+        const int32 order = compare_(record, record + size);
+        return order == 0 ? std::memcmp(record, record + size, size) == 0 : (order > 0) == falling;
+    }
+
     // One, two or three records.
     void SortFew(char* lo, char* hi) {
         const size_t size = stride_.Bytes();
@@ -148,6 +171,7 @@ private:
         if (mid != pivot) swap_(mid, pivot);
         char* i = lo;
         char* j = pivot;
+        PartitionBlocks(i, j, pivot);
         for (;;) {
             do i += size;
             while (i != j && compare_(i, pivot) < 0);
@@ -161,45 +185,57 @@ private:
         return i;
     }
 
+    // Where a scan stops cannot be predicted. So while much lies between the two, they go ahead by blocks: a block is
+    // compared without branches, and its stops are noted. They are exchanged in pairs just as one by one, and what
+    // remains of a block when the two come near is scanned again.
+    void PartitionBlocks(char*& i, char*& j, const char* pivot) {
+        constexpr size_t kBlock = 64;
+        const size_t size = stride_.Bytes();
+        struct Stops {
+            uint8 at[kBlock];  // distances from where the scan stands
+            size_t next = 0, count = 0;
+            bool IsDone() const { return next == count; }
+        } left, right;
+        while (static_cast<size_t>(j - i) > 2 * kBlock * size) {
+            if (left.IsDone()) {
+                left.next = left.count = 0;
+                for (size_t k = 1; k <= kBlock; ++k) {
+                    left.at[left.count] = static_cast<uint8>(k);
+                    left.count += compare_(i + k * size, pivot) >= 0;
+                }
+            }
+            if (right.IsDone()) {
+                right.next = right.count = 0;
+                for (size_t k = 1; k <= kBlock; ++k) {
+                    right.at[right.count] = static_cast<uint8>(k);
+                    right.count += compare_(j - k * size, pivot) <= 0;
+                }
+            }
+            while (!left.IsDone() && !right.IsDone())
+                swap_(i + left.at[left.next++] * size, j - right.at[right.next++] * size);
+            if (left.IsDone()) i += kBlock * size;
+            if (right.IsDone()) j -= kBlock * size;
+        }
+        if (!left.IsDone()) i += (left.at[left.next] - 1u) * size;
+        if (!right.IsDone()) j -= (right.at[right.next] - 1u) * size;
+    }
+
     RecordStride stride_;
     Compare compare_;
     Swap swap_;
 };
 
-// Whether every record stands strictly before the next one (direction -1) or behind it (1), or is the same in every
-// byte. Then there is one sorted order only, and no need to sort.
-template <class Compare>
-bool IsRun(const char* first, const char* last, size_t size, int32 direction, Compare compare) {
-    for (const char* record = first; record != last; record += size) {
-        int32 order = compare(record, record + size);
-        if (order == 0 ? std::memcmp(record, record + size, size) != 0 : (order < 0) != (direction < 0)) return false;
-    }
-    return true;
-}
-
-// Leaves what is in order alone and turns round what is in reverse.
-template <class Compare, class Swap>
-bool SortRun(char* first, char* last, size_t size, Compare compare, Swap swap) {
-    if (IsRun(first, last, size, -1, compare)) return true;
-    if (!IsRun(first, last, size, 1, compare)) return false;
-    for (; first < last; first += size, last -= size) swap(first, last);
-    return true;
-}
-
 template <class Compare, class Swap, class RecordStride>
 void SortWith(void* base, int32 count, Compare compare, Swap swap, RecordStride stride) {
-    constexpr int32 kWorthALook = 8;
-    const size_t size = stride.Bytes();
     char* first = static_cast<char*>(base);
-    char* last = first + (static_cast<size_t>(count) - 1) * size;
-    if (count >= kWorthALook && swap.size == size && SortRun(first, last, size, compare, swap)) return;
+    char* last = first + (static_cast<size_t>(count) - 1) * stride.Bytes();
     Sorter<Compare, Swap, RecordStride>(stride, compare, swap).Sort(first, last);
 }
 
 // Picks the exchange by the swap size: the largest units that fit.
 template <class Compare>
 void SortRecords(void* base, int32 count, int32 swapSize, int32 recordSize, Compare compare) {
-    if (count < 2 || recordSize < 1 || swapSize < 0) return;
+    if (count < 2 || recordSize < 1 || swapSize < 0 || swapSize > recordSize) return;
     const size_t size = static_cast<size_t>(swapSize);
     const Stride stride{static_cast<size_t>(recordSize)};
     if (size == 4 && stride.bytes == 4) {

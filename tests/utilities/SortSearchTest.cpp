@@ -7,6 +7,7 @@
 #include <cstring>
 #include <random>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace {
@@ -99,10 +100,64 @@ TEST(QSort, EndsWithinTheArrayWhateverTheComparisonAnswers) {
     }
 }
 
+using Marked = std::pair<int32, int32>;  // a key, and where it stood
+
+int32 CompareMarked(const void* a, const void* b) {
+    const int32 left = static_cast<const Marked*>(a)->first, right = static_cast<const Marked*>(b)->first;
+    return (left > right) - (left < right);
+}
+
+void SortByTheSteps(std::vector<Marked>& records, int lo, int hi) {
+    auto at = [&](int i) -> Marked& { return records[static_cast<size_t>(i)]; };
+    auto order = [&](int a, int b) {
+        if (at(a).first > at(b).first) std::swap(at(a), at(b));
+    };
+    if (hi - lo < 2) {
+        if (hi > lo) order(lo, hi);
+        return;
+    }
+    const int mid = lo + (hi - lo) / 2, pivot = hi - 1;
+    order(lo, mid);
+    order(lo, hi);
+    order(mid, hi);
+    if (hi - lo == 2) return;
+    std::swap(at(mid), at(pivot));
+    int i = lo, j = pivot;
+    while (i != j) {
+        do ++i;
+        while (i != j && at(i).first < at(pivot).first);
+        if (i == j) break;
+        do --j;
+        while (j != i && at(j).first > at(pivot).first);
+        if (i != j) std::swap(at(i), at(j));
+    }
+    std::swap(at(i), at(pivot));
+    const bool largerBefore = i - lo > hi - i;
+    SortByTheSteps(records, largerBefore ? i : lo, largerBefore ? hi : i);
+    if (largerBefore)
+        SortByTheSteps(records, lo, i - 1);
+    else
+        SortByTheSteps(records, i + 1, hi);
+}
+
 TEST(QSort, TakesTheStepsDescribed) {
     Bench three({3, 1, 2}, 1);
     three.Sort();
     EXPECT_EQ(three.calls, 3);  // the median step alone
+
+    // The described steps, record by record, leave equal keys in one certain order.
+    for (int count : {4, 5, 100, 131, 400, 5000}) {
+        std::mt19937 random(static_cast<unsigned>(count));
+        std::vector<Marked> sorted(static_cast<size_t>(count)), model;
+        for (int distinct : {2, 50, 100000}) {
+            for (int i = 0; i < count; ++i)
+                sorted[static_cast<size_t>(i)] = {static_cast<int32>(random()) % distinct, i};
+            model = sorted;
+            SortByTheSteps(model, 0, count - 1);
+            QSort(sorted.data(), count, sizeof(Marked), CompareMarked);
+            EXPECT_EQ(sorted, model) << count << " of " << distinct;
+        }
+    }
 
     // Worked by hand: the median 2c goes before the last record, in place of 1d, and is where it belongs; of 2a 1b 1d
     // the median step makes 1b 1d 2a.
@@ -113,6 +168,7 @@ TEST(QSort, TakesTheStepsDescribed) {
     QSort(equals, 5, 2, compareChars);
     EXPECT_STREQ(equals, "1b1d2a2c2e");
     QSort2(keysOnly, 3, 1, 2, compareChars);
+    QSort2(keysOnly, 3, 3, 2, compareChars);  // exchanges would reach beyond the last record: nothing happens
     EXPECT_STREQ(keysOnly, "1a2b3c");
 
     int32 ints[] = {5, -1000000000, 7, 0, 1000000000, -3, 5, 9, -9, 1};

@@ -17,7 +17,8 @@ TESSEL_BEGIN_C
 TESSEL_API void QSort(void* base, int32 count, int32 recordSize, CompareProc compare);
 TESSEL_API void QSortEx(void* base, int32 count, int32 recordSize, CompareProcEx compare, void* context);
 
-/* The same where only the first `swapSize` bytes of each record are exchanged; the rest stays where it is. */
+/* The same where only the first `swapSize` bytes of each record are exchanged; the rest stays where it is. Nothing for
+   more bytes than a record has. */
 TESSEL_API void QSort2(void* base, int32 count, int32 swapSize, int32 recordSize, CompareProc compare);
 TESSEL_API void QSort2Ex(void* base, int32 count, int32 swapSize, int32 recordSize, CompareProcEx compare,
                          void* context);
