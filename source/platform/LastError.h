@@ -53,6 +53,7 @@ constexpr ErrorNumber kErrorOperationAborted = 995;
 constexpr ErrorNumber kErrorNoAccess = 998;
 constexpr ErrorNumber kErrorFileInvalid = 1006;
 constexpr ErrorNumber kErrorRegistryCorrupt = 1015;
+constexpr ErrorNumber kErrorKeyDeleted = 1018;
 constexpr ErrorNumber kErrorNoUnicodeTranslation = 1113;
 constexpr ErrorNumber kErrorIODevice = 1117;
 constexpr ErrorNumber kErrorDeadlock = 1131;

@@ -3,8 +3,9 @@
    A folder a key, a file a value, under TESSEL_REGISTRY (not set: $XDG_CONFIG_HOME/tessel/registry). Names ignore case.
    A value is written whole: a reader, in whatever process, sees the old or the new one.
 
-   Functions return an error number, 0 for success, and do not touch LastError. They may throw std::bad_alloc. A key is
-   for one thread at a time; different keys for any. */
+   Functions return an error number, 0 for success, and do not touch LastError. What changes a key, lists it or makes
+   one in it returns 1018 once somebody has deleted it. They may throw std::bad_alloc. A key is for one thread at a
+   time; different keys for any. */
 #ifndef TESSEL_PLATFORM_REGISTRY_H
 #define TESSEL_PLATFORM_REGISTRY_H
 
@@ -53,7 +54,9 @@ ErrorNumber RegistryCounts(const RegistryKey* key, std::uint32_t& subKeys, std::
 ErrorNumber RegistryEnumerateKey(const RegistryKey* key, std::uint32_t index, std::string& name);
 ErrorNumber RegistryEnumerateValue(const RegistryKey* key, std::uint32_t index, std::string& name);
 
-/* A null or empty name is the key's unnamed value. 2 when there is none. `data` is the raw bytes. */
+/* A null or empty name is the key's unnamed value. 2 when there is none, 1015 when what is stored is none. `data` is
+   the raw bytes. Setting: 87 for more bytes than a value may have. */
+constexpr std::size_t kLargestRegistryValue = 64 * 1024 * 1024;
 ErrorNumber RegistryQueryValue(const RegistryKey* key, const char* name, std::uint32_t& type, std::string& data);
 ErrorNumber RegistrySetValue(const RegistryKey* key, const char* name, std::uint32_t type, const void* data,
                              std::size_t size); /* 5 without write access */

@@ -27,13 +27,15 @@
    begin with a dot belong to the store: its lock, and values being written. The 64-bit view is a store of its own in
    the folder `.view64`.
 
-   A value's file holds `REG `, the type in decimal digits, a line feed, and the raw data. */
+   A value's file holds `REG `, the type in decimal digits, a line feed, and the raw data. What a folder holds
+   otherwise, links to other folders too, is none of the registry's and goes with its key. */
 
 namespace tessel::platform {
 
 struct RegistryKey {
+    std::string store;  /* the host's name of the folder that holds all */
     std::string folder; /* the host's name; that of a root need not exist */
-    bool write;
+    bool root, write;
     mutable std::vector<std::string> listing; /* of the enumeration under way */
 };
 
@@ -114,10 +116,9 @@ std::string StoreFolder() {
    while a value is put into it. Where it cannot be had (a file system without locks) things go on without. */
 class StoreLock {
 public:
-    StoreLock() {
-        std::string folder = StoreFolder();
-        if (!MakeFolders(folder)) return;
-        file_ = systemCalls.open((folder + "/.lock").c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0666);
+    explicit StoreLock(const std::string& store) {
+        if (!MakeFolders(store)) return;
+        file_ = systemCalls.open((store + "/.lock").c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0666);
         struct flock range {};
         range.l_type = F_WRLCK;
         while (file_ >= 0 && systemCalls.lock(file_, F_OFD_SETLKW, &range) != 0 && errno == EINTR) {
@@ -135,7 +136,19 @@ private:
 
 bool Exists(const std::string& native) {
     struct statx status;
-    return systemCalls.statx(AT_FDCWD, native.c_str(), 0, STATX_TYPE, &status) == 0;
+    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0;
+}
+
+/* Whether it is a folder itself: a link might lead out of the store, and what is deleted must lie within. */
+bool IsFolder(const std::string& native) {
+    struct statx status;
+    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0 &&
+           S_ISDIR(status.stx_mode);
+}
+
+/* 1018 when somebody has deleted the key meanwhile. A root is always there, if only by name. */
+ErrorNumber CheckThere(const RegistryKey* key) {
+    return key->root || IsFolder(key->folder) ? kErrorSuccess : kErrorKeyDeleted;
 }
 
 /* The item of `folder` with that name, in whatever case; the name as given where there is none. */
@@ -153,30 +166,30 @@ std::string KeyFolder(const RegistryKey* parent, const char* path) {
 
 enum class Kind { kKey, kValue, kOther };
 
-/* Calls visit(name on the disk, kind) for all that a key's folder holds. A folder that is missing holds nothing. */
+Kind KindOf(const std::string& folder, const dirent& entry) {
+    if (entry.d_name[0] == kValueMark) return Kind::kValue;
+    if (entry.d_name[0] == '.') return Kind::kOther;
+    bool isFolder = entry.d_type == DT_DIR || (entry.d_type == DT_UNKNOWN && IsFolder(folder + "/" + entry.d_name));
+    return isFolder ? Kind::kKey : Kind::kOther;
+}
+
+/* Calls visit(name on the disk, kind) for all that a key's folder holds. */
 template <typename Visitor>
-void VisitKey(const std::string& folder, Visitor visit) {
+ErrorNumber VisitFolder(const std::string& folder, Visitor visit) {
     std::unique_ptr<DIR, int (*)(DIR*)> listing(opendir(folder.c_str()), closedir);
-    if (!listing) return;
-    while (const dirent* entry = readdir(listing.get())) {
+    if (!listing) return ErrnoNumber();
+    for (errno = 0; const dirent* entry = readdir(listing.get()); errno = 0) {
         std::string_view name = entry->d_name;
-        if (name == "." || name == "..") continue;
-        bool key = name[0] != '.' && name[0] != kValueMark;
-        visit(name, key ? Kind::kKey : name[0] == kValueMark ? Kind::kValue : Kind::kOther);
+        if (name != "." && name != "..") visit(name, KindOf(folder, *entry));
     }
+    return errno == 0 ? kErrorSuccess : ErrnoNumber();
 }
 
-std::vector<std::string> NamesIn(const std::string& folder, Kind wanted) {
-    std::vector<std::string> names;
-    VisitKey(folder, [&](std::string_view name, Kind kind) {
-        if (kind == wanted) names.push_back(FromDisk(name.substr(kind == Kind::kValue ? 1 : 0)));
-    });
-    std::sort(names.begin(), names.end());
-    return names;
-}
-
-RegistryKey* NewKey(std::string folder, bool write) {
-    return new RegistryKey{std::move(folder), write, {}};
+template <typename Visitor>
+ErrorNumber VisitKey(const RegistryKey* key, Visitor visit) {
+    ErrorNumber number = VisitFolder(key->folder, visit);
+    if (number != kErrorFileNotFound) return number;
+    return key->root ? kErrorSuccess : kErrorKeyDeleted;
 }
 
 }  // namespace
@@ -189,8 +202,9 @@ ErrorNumber RegistryOpenRoot(RegistryRoot root, std::uint32_t view, RegistryKey*
                                       "HKEY_USERS"};
     key = nullptr;
     if (view != kRegistryDefaultView && view != kRegistryView64) return kErrorInvalidParameter;
-    std::string folder = StoreFolder() + (view == kRegistryView64 ? "/.view64/" : "/");
-    key = NewKey(folder + kNames[static_cast<int>(root)], true);
+    std::string store = StoreFolder();
+    std::string folder = store + (view == kRegistryView64 ? "/.view64/" : "/") + kNames[static_cast<int>(root)];
+    key = new RegistryKey{std::move(store), std::move(folder), true, true, {}};
     return kErrorSuccess;
 }
 
@@ -198,21 +212,25 @@ ErrorNumber RegistryOpen(const RegistryKey* parent, const char* path, bool write
     key = nullptr;
     if (!parent) return kErrorInvalidHandle;
     std::string folder = KeyFolder(parent, path);
-    if (folder != parent->folder) {
-        if (!Exists(folder)) return kErrorFileNotFound;
+    const bool root = parent->root && folder == parent->folder;
+    if (!root) {
+        if (!IsFolder(folder)) return kErrorFileNotFound;
         if (write && ::access(folder.c_str(), W_OK) != 0) return ErrnoNumber();
     }
-    key = NewKey(std::move(folder), write);
+    key = new RegistryKey{parent->store, std::move(folder), root, write, {}};
     return kErrorSuccess;
 }
 
 ErrorNumber RegistryCreate(const RegistryKey* parent, const char* path, RegistryKey*& key) {
     key = nullptr;
     if (!parent) return kErrorInvalidHandle;
-    StoreLock lock;
+    StoreLock lock(parent->store);
+    if (ErrorNumber gone = CheckThere(parent)) return gone;
     std::string folder = KeyFolder(parent, path);
     if (!MakeFolders(folder)) return ErrnoNumber();
-    key = NewKey(std::move(folder), true);
+    if (!IsFolder(folder)) return kErrorAccessDenied;
+    const bool root = parent->root && folder == parent->folder;
+    key = new RegistryKey{parent->store, std::move(folder), root, true, {}};
     return kErrorSuccess;
 }
 
@@ -224,12 +242,18 @@ ErrorNumber RegistryClose(RegistryKey* key) {
 
 ErrorNumber RegistryDelete(const RegistryKey* parent, const char* path) {
     if (!parent) return kErrorInvalidHandle;
-    StoreLock lock;
+    StoreLock lock(parent->store);
     std::string folder = KeyFolder(parent, path);
     if (folder == parent->folder) return kErrorInvalidParameter;
-    if (!NamesIn(folder, Kind::kKey).empty()) return kErrorAccessDenied;
+    if (!IsFolder(folder)) return kErrorFileNotFound;
+    bool hasSubKeys = false;
     std::vector<std::string> files;
-    VisitKey(folder, [&](std::string_view name, Kind) { files.push_back(folder + "/" + std::string(name)); });
+    ErrorNumber number = VisitFolder(folder, [&](std::string_view name, Kind kind) {
+        if (kind == Kind::kKey) hasSubKeys = true;
+        files.push_back(folder + "/" + std::string(name));
+    });
+    if (number != kErrorSuccess) return number;
+    if (hasSubKeys) return kErrorAccessDenied;
     for (const std::string& file : files) systemCalls.unlink(file.c_str());
     return systemCalls.rmdir(folder.c_str()) == 0 ? kErrorSuccess : ErrnoNumber();
 }
@@ -237,11 +261,10 @@ ErrorNumber RegistryDelete(const RegistryKey* parent, const char* path) {
 ErrorNumber RegistryCounts(const RegistryKey* key, std::uint32_t& subKeys, std::uint32_t& values) {
     subKeys = values = 0;
     if (!key) return kErrorInvalidHandle;
-    VisitKey(key->folder, [&](std::string_view, Kind kind) {
+    return VisitKey(key, [&](std::string_view, Kind kind) {
         if (kind == Kind::kKey) ++subKeys;
         if (kind == Kind::kValue) ++values;
     });
-    return kErrorSuccess;
 }
 
 namespace {
@@ -249,7 +272,14 @@ namespace {
 /* The first index lists the folder, the others read on in that listing. */
 ErrorNumber Enumerate(const RegistryKey* key, Kind kind, std::uint32_t index, std::string& name) {
     if (!key) return kErrorInvalidHandle;
-    if (index == 0) key->listing = NamesIn(key->folder, kind);
+    if (index == 0) {
+        key->listing.clear();
+        ErrorNumber number = VisitKey(key, [&](std::string_view item, Kind itemKind) {
+            if (itemKind == kind) key->listing.push_back(FromDisk(item.substr(kind == Kind::kValue ? 1 : 0)));
+        });
+        if (number != kErrorSuccess) return number;
+        std::sort(key->listing.begin(), key->listing.end());
+    }
     if (index >= key->listing.size()) return kErrorNoMoreItems;
     name = key->listing[index];
     return kErrorSuccess;
@@ -270,13 +300,16 @@ ErrorNumber RegistryEnumerateValue(const RegistryKey* key, std::uint32_t index, 
 namespace {
 
 constexpr std::string_view kValueHeader = "REG ";
+constexpr std::size_t kLongestHeader = kValueHeader.size() + 11; /* ten digits and the line feed */
 
-/* As the name is spelled first: a name that fits costs no look at the folder. False with errno. */
+/* As the name is spelled first: a name that fits costs no look at the folder. False with errno. No more is read than
+   a value may have, and a byte: a damaged store must not take all memory. */
 bool ReadValueFile(const std::string& folder, const std::string& diskName, std::string& text) {
+    constexpr std::size_t kMost = kLongestHeader + kLargestRegistryValue + 1;
     std::string found;
-    if (ReadTextFile((folder + "/" + diskName).c_str(), text)) return true;
+    if (ReadTextFile((folder + "/" + diskName).c_str(), text, kMost)) return true;
     if (errno != ENOENT) return false;
-    if (FindInFolder(folder, diskName, found)) return ReadTextFile((folder + "/" + found).c_str(), text);
+    if (FindInFolder(folder, diskName, found)) return ReadTextFile((folder + "/" + found).c_str(), text, kMost);
     errno = ENOENT;
     return false;
 }
@@ -288,7 +321,7 @@ bool ParseValue(std::string& text, std::uint32_t& type) {
     std::from_chars_result number = std::from_chars(start, end, type);
     if (number.ec != std::errc() || number.ptr == end || *number.ptr != '\n') return false;
     text.erase(0, static_cast<std::size_t>(number.ptr + 1 - text.data()));
-    return true;
+    return text.size() <= kLargestRegistryValue;
 }
 
 }  // namespace
@@ -303,44 +336,48 @@ ErrorNumber RegistrySetValue(const RegistryKey* key, const char* name, std::uint
                              std::size_t size) {
     if (!key) return kErrorInvalidHandle;
     if (!key->write) return kErrorAccessDenied;
-    if (!data && size != 0) return kErrorInvalidParameter;
+    if ((!data && size != 0) || size > kLargestRegistryValue) return kErrorInvalidParameter;
     std::string text(kValueHeader);
     text += std::to_string(type) + "\n";
     if (size != 0) text.append(static_cast<const char*>(data), size);
-    StoreLock lock;
-    if (!Exists(key->folder) && !MakeFolders(key->folder)) return ErrnoNumber();
+    StoreLock lock(key->store);
+    if (ErrorNumber gone = CheckThere(key)) return gone;
+    if (key->root && !MakeFolders(key->folder)) return ErrnoNumber();
     return ReplaceFile(ItemIn(key->folder, ValueFileName(name)), text) ? kErrorSuccess : ErrnoNumber();
 }
 
 ErrorNumber RegistryDeleteValue(const RegistryKey* key, const char* name) {
     if (!key) return kErrorInvalidHandle;
     if (!key->write) return kErrorAccessDenied;
-    StoreLock lock;
+    StoreLock lock(key->store);
     std::string file = ItemIn(key->folder, ValueFileName(name));
     return systemCalls.unlink(file.c_str()) == 0 ? kErrorSuccess : ErrnoNumber();
 }
 
 namespace {
 
-bool Synchronize(const std::string& native) {
-    int file = systemCalls.open(native.c_str(), O_RDONLY | O_CLOEXEC, 0);
-    if (file < 0) return errno == ENOENT;
-    int result = systemCalls.fsync(file);
-    int error = errno;
+ErrorNumber Synchronize(const std::string& native) {
+    int file = systemCalls.open(native.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK, 0);
+    if (file < 0) return errno == ENOENT ? kErrorSuccess : ErrnoNumber();
+    ErrorNumber number = kErrorSuccess;
+    if (systemCalls.fsync(file) != 0 && errno != EINVAL) number = ErrnoNumber();
     systemCalls.close(file);
-    errno = error;
-    return result == 0 || error == EINVAL;
+    return number;
 }
 
 }  // namespace
 
 ErrorNumber RegistryFlush(const RegistryKey* key) {
     if (!key) return kErrorInvalidHandle;
-    bool done = true;
-    VisitKey(key->folder, [&](std::string_view name, Kind kind) {
-        if (kind == Kind::kValue) done = Synchronize(key->folder + "/" + std::string(name)) && done;
-    });
-    return done && Synchronize(key->folder) ? kErrorSuccess : ErrnoNumber();
+    ErrorNumber first = kErrorSuccess;
+    auto keep = [&first](ErrorNumber number) {
+        if (first == kErrorSuccess) first = number;
+    };
+    keep(VisitKey(key, [&](std::string_view name, Kind kind) {
+        if (kind == Kind::kValue) keep(Synchronize(key->folder + "/" + std::string(name)));
+    }));
+    keep(Synchronize(key->folder));
+    return first;
 }
 
 }  // namespace tessel::platform

@@ -32,20 +32,21 @@ bool WriteAll(int file, const std::string& data) {
     return true;
 }
 
-/* Unlike any other's, in this process or another: who made it, and which it is. Hidden, beside the file it will be. */
+/* Unlike any other's, in this process or another: who made it, and which it is. Hidden, beside the file it will be.
+   Short, as that file's name may be as long as a name can be. */
 std::string TemporaryName(const std::string& native) {
     static std::atomic<unsigned> number{0};
-    char ending[48];
-    std::snprintf(ending, sizeof ending, ".%d.%u.tmp", ::getpid(), number.fetch_add(1));
+    char name[48];
+    std::snprintf(name, sizeof name, ".%d.%u.tmp", ::getpid(), number.fetch_add(1));
     std::size_t last = native.rfind('/') + 1; /* 0 when there is no folder */
-    return native.substr(0, last) + "." + native.substr(last) + ending;
+    return native.substr(0, last) + name;
 }
 
 }  // namespace
 
 bool ReadTextFile(const char* native, std::string& text, std::size_t most) {
     text.clear();
-    int file = OpenRetrying(native, O_RDONLY, 0);
+    int file = OpenRetrying(native, O_RDONLY | O_NONBLOCK, 0); /* a pipe of that name must not make us wait */
     if (file < 0) return false;
     char buffer[4096];
     ssize_t moved = 1;
@@ -75,8 +76,15 @@ bool CreateTextFile(const std::string& native, const std::string& data) {
 }
 
 bool ReplaceFile(const std::string& native, const std::string& data) {
-    std::string temporary = TemporaryName(native);
-    if (!CreateTextFile(temporary, data)) return false;
+    constexpr int kTries = 100; /* a process of our number may have ended and left its files behind */
+    std::string temporary;
+    bool made = false;
+    for (int i = 0; i < kTries && !made; ++i) {
+        temporary = TemporaryName(native);
+        made = CreateTextFile(temporary, data);
+        if (!made && errno != EEXIST) return false;
+    }
+    if (!made) return false;
     if (systemCalls.renameat2(AT_FDCWD, temporary.c_str(), AT_FDCWD, native.c_str(), 0) == 0) return true;
     int error = errno;
     systemCalls.unlink(temporary.c_str());
