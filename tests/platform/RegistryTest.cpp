@@ -1,10 +1,9 @@
 #include "platform/Registry.h"
 
 #include <gtest/gtest.h>
-#include <sys/wait.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <cerrno>
 #include <cstdlib>
 #include <filesystem>
@@ -148,42 +147,48 @@ TEST_F(Registry, AFailedWriteLeavesTheOldValue) {
     EXPECT_EQ(1, std::distance(std::filesystem::directory_iterator(drive_.Native("store/HKEY_LOCAL_MACHINE/Key")), {}));
 }
 
-/* Two processes write one value, and make one key in two spellings, as fast as they can, while this one reads. */
-TEST_F(Registry, ProcessesNeverSeeHalfAValue) {
+TEST_F(Registry, WhatIsNoneOfItsOwnIsLeftAlone) {
+    std::filesystem::create_directory(drive_.Native("outside"));
+    drive_.Put("outside/.precious", "file");
     RegistryKey* key = Create("Key");
-    const auto valueOf = [](int i) {
-        return std::string(static_cast<std::size_t>(i % 7 + 1) * 3000, static_cast<char>('a' + i % 7));
-    };
-    ASSERT_EQ(kErrorSuccess, RegistrySetValue(key, "Value", 1, "a", 1));
-    pid_t writers[2];
-    for (int w = 0; w < 2; ++w) {
-        writers[w] = fork();
-        if (writers[w] != 0) continue;
-        for (int i = 0; i < 300; ++i) {
-            std::string value = valueOf(i + w);
-            if (RegistrySetValue(key, w ? "VALUE" : "value", 1, value.data(), value.size()) != 0) _exit(1);
-            RegistryKey* made = nullptr;
-            if (RegistryCreate(key, ((w ? "Sub" : "sUB") + std::to_string(i)).c_str(), made) != 0) _exit(2);
-        }
-        _exit(0);
-    }
-    std::uint32_t type = 0;
+    const std::string folder = drive_.Native("store/HKEY_LOCAL_MACHINE/Key/");
+    ASSERT_EQ(0, symlink(drive_.Native("outside").c_str(), (folder + "Link").c_str()));
+    ASSERT_EQ(0, mkfifo((folder + "=pipe").c_str(), 0600));
+    drive_.Put("store/HKEY_LOCAL_MACHINE/Key/=endless", "REG 1\n");
+    ASSERT_EQ(0, truncate((folder + "=endless").c_str(), off_t{1} << 40));
+    drive_.Put("store/HKEY_LOCAL_MACHINE/Key/stray", "");
+
+    std::uint32_t keys = 9, values = 0, type = 0;
     std::string data;
-    int ended = 0, status = 0, seen = 0;
-    while (ended < 2) {
-        if (waitpid(-1, &status, WNOHANG) > 0) {
-            EXPECT_EQ(0, status);
-            ++ended;
-        }
-        ASSERT_EQ(kErrorSuccess, RegistryQueryValue(key, "Value", type, data));
-        EXPECT_TRUE(data == "a" || data == valueOf(data[0] - 'a')) << data.size();
-        ++seen;
-    }
-    EXPECT_GT(seen, 1);
-    std::uint32_t keys = 0, values = 0;
     EXPECT_EQ(kErrorSuccess, RegistryCounts(key, keys, values));
-    EXPECT_EQ(300u, keys);
-    EXPECT_EQ(1u, values);
+    EXPECT_EQ(0u, keys);
+    EXPECT_EQ(kErrorFileNotFound, TryOpen("Key\\Link"));
+    EXPECT_EQ(kErrorFileNotFound, TryOpen("Key\\stray"));
+    EXPECT_EQ(kErrorFileNotFound, RegistryDelete(key, "Link"));
+    RegistryKey* made = nullptr;
+    EXPECT_EQ(kErrorAccessDenied, RegistryCreate(key, "Link", made));
+    for (const char* damaged : {"pipe", "endless"})
+        EXPECT_EQ(kErrorRegistryCorrupt, RegistryQueryValue(key, damaged, type, data)) << damaged;
+    EXPECT_EQ(kErrorInvalidParameter, RegistrySetValue(key, "large", 3, "", kLargestRegistryValue + 1));
+    EXPECT_EQ(kErrorSuccess, RegistryDelete(root_, "Key"));
+    EXPECT_EQ("file", drive_.Get("outside/.precious"));
+
+    /* It does not come back by what is done to it from now on. */
+    EXPECT_EQ(kErrorKeyDeleted, RegistrySetValue(key, "x", 1, "x", 1));
+    EXPECT_EQ(kErrorKeyDeleted, RegistryCreate(key, "Sub", made));
+    EXPECT_EQ(kErrorKeyDeleted, RegistryEnumerateKey(key, 0, data));
+    EXPECT_EQ(kErrorKeyDeleted, RegistryCounts(key, keys, values));
+    EXPECT_EQ(kErrorFileNotFound, TryOpen("Key"));
+    RegistryClose(key);
+}
+
+TEST_F(Registry, NamesMayBeLongAndFilesLeftBehind) {
+    RegistryKey* key = Create("Key");
+    const std::string name(250, 'n');
+    FailingPlatform failing("open", 2, EEXIST, 3); /* the first call is for the lock */
+    EXPECT_EQ(kErrorSuccess, RegistrySetValue(key, name.c_str(), 1, "x", 1));
+    EXPECT_EQ(5, failing.Calls());
+    EXPECT_EQ(kErrorNameTooLong, RegistrySetValue(key, (name + name).c_str(), 1, "x", 1));
     RegistryClose(key);
 }
 

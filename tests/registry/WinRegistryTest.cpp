@@ -4,6 +4,8 @@
 #include <errno.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 #include <cstdlib>
 #include <memory>
@@ -16,6 +18,7 @@
 #include "support/FailingPlatform.h"
 #include "support/ReportRecorder.h"
 #include "support/ScratchDrive.h"
+#include "support/malloc/FailingMalloc.h"
 
 namespace tessel {
 namespace {
@@ -279,6 +282,69 @@ TEST_F(Registry, WhatIsNoStringOrDamagedIsRaised) {
                  [] { WinRegistryKeyEnumeration enumeration(nullptr); });
     ExpectRaises(kArgErr, "Parent for Registry Enumeration cannot be NULL",
                  [] { WinRegistryValueEnumeration enumeration(nullptr); });
+}
+
+/* Two processes write one value, and make one key in two spellings, as fast as they can, while this one reads. */
+TEST_F(Registry, ProcessesNeverSeeHalfAValue) {
+    constexpr int kRounds = 200;
+    const auto valueOf = [](int i) {
+        return std::string(static_cast<size_t>(i % 7 + 1) * 3000, static_cast<char>('a' + i % 7));
+    };
+    SetRaw("Value", 3, "a");
+    pid_t writers[2];
+    for (int w = 0; w < 2; ++w) {
+        writers[w] = ::fork();
+        if (writers[w] != 0) continue;
+        for (int i = 0; i < kRounds; ++i) {
+            const std::string value = valueOf(i + w);
+            if (key_->SetValue(w ? "VALUE" : "value", 3, value.data(), static_cast<uint32>(value.size()))) ::_exit(1);
+            Key made;
+            if (key_->CreateSubKey(((w ? "Sub" : "sUB") + std::to_string(i)).c_str(), made.Out())) ::_exit(2);
+        }
+        ::_exit(0);
+    }
+    int ended = 0, status = 0, halves = 0;
+    while (ended < 2) {
+        if (::waitpid(-1, &status, WNOHANG) > 0) {
+            EXPECT_EQ(status, 0);
+            ++ended;
+        }
+        uint32 size = 0;
+        const char* data = static_cast<const char*>(key_->QueryValue("Value", nullptr, &size));
+        ASSERT_NE(data, nullptr);
+        const std::string seen(data, size);
+        halves += seen != "a" && seen != valueOf(seen[0] - 'a');
+    }
+    EXPECT_EQ(halves, 0);
+    EXPECT_EQ(key_->GetSubKeyCount(), kRounds);
+    EXPECT_EQ(key_->GetValueCount(), 1);
+}
+
+TEST_F(Registry, WithoutMemoryNothingIsLost) {
+    int failures = test::WithEachAllocationFailing([&] {
+        const auto expected = [&](IWinRegistryKey& key, MgErr err) {
+            EXPECT_TRUE(err == kNoErr || (err == kMemFullErr && key.GetLastError() == 14));
+            return err == kNoErr;
+        };
+        Key made;
+        AutoRelease<IWinRegistryValueEnumeration> values;
+        if (!expected(*key_, key_->CreateSubKey("A\\B", made.Out()))) return;
+        if (!expected(*made, made->SetStringValue("a value whose name and text are long", "too long to be at hand")))
+            return;
+        try {
+            EXPECT_STREQ(made->GetStringValue("a value whose name and text are long"), "too long to be at hand");
+        } catch (const OVExcept& exception) {
+            EXPECT_EQ(exception.Code(), kMemFullErr);
+            EXPECT_STREQ(exception.Detail(), "Unable to allocate buffer for registry query");
+            return;
+        }
+        if (!expected(*made, made->EnumerateValues(values.Out()))) return;
+        EXPECT_TRUE(values->MoveNext() || values->GetLastError() == 14u);
+        made.Reset(nullptr);
+        expected(*key_, key_->DeleteSubKey("A"));
+    });
+    EXPECT_GT(failures, 10);
+    EXPECT_EQ(key_->GetSubKeyCount(), 0);
 }
 
 // ---- enumerations ---------------------------------------------------------------------------------------------------

@@ -18,6 +18,7 @@
 
 #include "support/HandClock.h"
 #include "support/ReportRecorder.h"
+#include "support/malloc/FailingMalloc.h"
 #include "sync/ProtectedAtomicOperations.h"
 #include "sync/Service.h"
 
@@ -203,6 +204,19 @@ TEST_F(Sync, WhatThePlatformSaysIsReported) {
                 ElementsAre("Wait on event failed", "We were not supposed to retry here",
                             "ThEventDestroy:: (ms) avg latency=2.66667; nEvents=3; min=1.00000; max=4.00000",
                             "DestroyPlatformEvent failed with MgErr 42."));
+}
+
+TEST_F(Sync, WithoutMemoryNothingIsMade) {
+    int failures = test::WithEachAllocationFailing([] {
+        ThEvent event = nullptr;
+        ThMutex mutex = nullptr;
+        const MgErr eventErr = ThEventCreate(&event, 0, true), mutexErr = ThMutexCreate(&mutex, nullptr);
+        EXPECT_EQ(event ? kNoErr : kMemFullErr, eventErr);
+        EXPECT_EQ(mutex ? kNoErr : kMemFullErr, mutexErr);
+        if (event) ThEventDestroy(event);
+        ThMutexDestroy(mutex);
+    });
+    EXPECT_EQ(5, failures);  // two for the event, three for the mutex, whose event is another
 }
 
 TEST_F(Sync, MutexesExclude) {

@@ -15,6 +15,7 @@
 #include "support/FailingPlatform.h"
 #include "support/HandClock.h"
 #include "support/ReportRecorder.h"
+#include "support/malloc/FailingMalloc.h"
 
 namespace {
 
@@ -73,6 +74,15 @@ TEST(RandomGen, ThreadsShareOneSeededStream) {
     std::sort(drawn.begin(), drawn.end());
     std::sort(expected.begin(), expected.end());
     EXPECT_EQ(drawn, expected);
+}
+
+TEST(RandomGen, WithoutMemoryForItsLockItFails) {
+    int failures = tessel::test::WithEachAllocationFailing([] {
+        MgErr err = InitRandomGen();
+        EXPECT_TRUE(err == kNoErr || err == kMemFullErr);
+        UninitRandomGen();
+    });
+    EXPECT_EQ(failures, 3);  // the mutex, its event and that of the platform
 }
 
 constexpr OVGuidType kSample = {0x00112233, 0x4455, 0x6677, {0x88, 0x99, 0xAA, 0xBB, 0xCC, 0xDD, 0xEE, 0xFF}};

@@ -5,6 +5,8 @@
 #include <string>
 #include <vector>
 
+#include "support/malloc/FailingMalloc.h"
+
 namespace {
 
 using Words = std::vector<std::string>;
@@ -75,6 +77,26 @@ TEST(UserCommandLine, RefusesNoneAndASecondOne) {
     EXPECT_STREQ(GetPrefsPath(), "own.ini");
     EXPECT_EQ(SetPrefsPath(nullptr), kNoErr);
     EXPECT_EQ(GetPrefsPath(), nullptr);
+}
+
+TEST(UserCommandLine, WithoutMemoryNothingIsKept) {
+    std::string program = "prog";
+    Host host({"prog", "--", "a"});
+    int failures = tessel::test::WithEachAllocationFailing([&] {
+        MgErr err = host.Init();
+        int32 count = -1;
+        char** args = nullptr;
+        GetUserCommandLine(&count, &args);
+        EXPECT_TRUE(err == kNoErr ? count == 2 : err == kMemFullErr && count == 0 && !args);
+        err = SetPrefsPath("first.ini") != kNoErr ? kNoErr : SetPrefsPath("second.ini");
+        EXPECT_TRUE(GetPrefsPath() ? err == kNoErr : err == kNoErr || err == kMemFullErr);
+        NewCommandLineArgsFromSingleLine("a b", program.data(), &count, &args);
+        EXPECT_EQ(count, args ? 3 : 0);
+        DeleteCommandLineArgsFromSingleLine(count, args);
+        SetPrefsPath(nullptr);
+        UninitUserCommandLine();
+    });
+    EXPECT_EQ(failures, 4);
 }
 
 TEST(UserCommandLine, KnowsTheLibrarysOwnArguments) {
