@@ -201,9 +201,7 @@ void AllocTracker::Unregister(const void* object) {
 }
 
 void AllocTracker::Register(const void* object) {
-    if (implementation_ && object)
-        implementation_->Add(Number(object), 0, kHeaderFile, kRegisterLine,
-                             static_cast<const StackFrame*>(__builtin_frame_address(0)));
+    AddRecordFrom(__builtin_frame_address(0), object, 0, kHeaderFile, kRegisterLine);
 }
 
 void AllocTracker::SetSkip(int32 skip) {
@@ -219,9 +217,12 @@ void AllocTracker::Shutdown() {
 }
 
 void AllocTracker::AddRecord(const void* address, uint32 size, const char* file, int32 line) {
+    AddRecordFrom(__builtin_frame_address(0), address, size, file, line);
+}
+
+void AllocTracker::AddRecordFrom(const void* frame, const void* address, uint32 size, const char* file, int32 line) {
     if (implementation_ && address)
-        implementation_->Add(Number(address), size, file, line,
-                             static_cast<const StackFrame*>(__builtin_frame_address(0)));
+        implementation_->Add(Number(address), size, file, line, static_cast<const StackFrame*>(frame));
 }
 
 void AllocTracker::RemoveRecord(const void* address) {

@@ -10,6 +10,8 @@ using namespace tessel;
 
 namespace {
 
+constexpr char kResizeOrNew[] = "DSSetHandleSizeOrNewHandle";
+
 // Enlarges a handle by `size` bytes; *end = where they begin.
 MgErr Append(UHandle h, uint32 size, uint32* end) {
     *end = IsGoodHandle(h, kChangeProves) ? DSGetHandleSize(h) : 0;
@@ -21,9 +23,7 @@ void Copy(const void* from, UHandle to, uint32 at, uint32 size) {
     if (size != 0) std::memmove(*to + at, from, size);
 }
 
-}  // namespace
-
-MgErr DSCopyHandle(UHandle* destination, UHandle source) {
+MgErr CopyHandle(UHandle* destination, UHandle source, const void* frame) {
     if (!destination) return kArgErr;
     if (!source) return DSDisposeHandleAndNull(destination);
     if (source == *destination) {
@@ -32,28 +32,58 @@ MgErr DSCopyHandle(UHandle* destination, UHandle source) {
     }
     if (!IsGoodHandle(source, kChangeProves)) return kHandleErr;
     uint32 size = DSGetHandleSize(source);
-    MgErr err = DSSetHandleSizeOrNewHandle(destination, size);
+    MgErr err = ResizeOrCreate(destination, size, false, kResizeOrNew, frame);
     if (err == kNoErr) Copy(*source, *destination, 0, size);
     return err;
 }
 
-MgErr DSHandToHand(UHandle* h) {
+MgErr HandToHand(UHandle* h, const void* frame) {
     if (!h) return kArgErr;
     if (!IsGoodHandle(*h, kChangeProves)) return kHandleErr;
     uint32 size = DSGetHandleSize(*h);
-    UHandle copy = DSNewHandle(size);
+    UHandle copy = CreateHandle(size, false, frame);
     if (!copy) return kMemFullErr;
     Copy(**h, copy, 0, size);
     *h = copy;
     return kNoErr;
 }
 
-MgErr DSPtrToHand(const void* p, UHandle* h, uint32 size) {
+MgErr PtrToHand(const void* p, UHandle* h, uint32 size, const void* frame) {
     if (!h) return kArgErr;
-    *h = DSNewHandle(size);
+    *h = CreateHandle(size, false, frame);
     if (!*h) return kMemFullErr;
     Copy(p, *h, 0, size);
     return kNoErr;
+}
+
+MgErr SetHandleFromPtr(UHandle* h, const void* p, uint32 size, const void* frame) {
+    MgErr err = ResizeOrCreate(h, size, false, kResizeOrNew, frame);
+    if (err == kNoErr) Copy(p, *h, 0, size);
+    return err;
+}
+
+}  // namespace
+
+// The twins stand together here, so that a handle is known by who called either.
+MgErr DSCopyHandle(UHandle* destination, UHandle source) {
+    return CopyHandle(destination, source, TESSEL_THIS_FRAME);
+}
+MgErr AZCopyHandle(UHandle* destination, UHandle source) {
+    return CopyHandle(destination, source, TESSEL_THIS_FRAME);
+}
+
+MgErr DSHandToHand(UHandle* h) {
+    return HandToHand(h, TESSEL_THIS_FRAME);
+}
+MgErr AZHandToHand(UHandle* h) {
+    return HandToHand(h, TESSEL_THIS_FRAME);
+}
+
+MgErr DSPtrToHand(const void* p, UHandle* h, uint32 size) {
+    return PtrToHand(p, h, size, TESSEL_THIS_FRAME);
+}
+MgErr AZPtrToHand(const void* p, UHandle* h, uint32 size) {
+    return PtrToHand(p, h, size, TESSEL_THIS_FRAME);
 }
 
 MgErr DSPtrToXHand(const void* p, UHandle h, uint32 size) {
@@ -63,13 +93,14 @@ MgErr DSPtrToXHand(const void* p, UHandle h, uint32 size) {
 }
 
 MgErr DSSetHandleFromPtr(UHandle* h, const void* p, uint32 size) {
-    MgErr err = DSSetHandleSizeOrNewHandle(h, size);
-    if (err == kNoErr) Copy(p, *h, 0, size);
-    return err;
+    return SetHandleFromPtr(h, p, size, TESSEL_THIS_FRAME);
+}
+MgErr AZSetHandleFromPtr(UHandle* h, const void* p, uint32 size) {
+    return SetHandleFromPtr(h, p, size, TESSEL_THIS_FRAME);
 }
 
 MgErr DSSetHandleFromPtrNULLMeansEmpty(UHandle* h, const void* p, uint32 size) {
-    return size == 0 ? DSDisposeHandleAndNull(h) : DSSetHandleFromPtr(h, p, size);
+    return size == 0 ? DSDisposeHandleAndNull(h) : SetHandleFromPtr(h, p, size, TESSEL_THIS_FRAME);
 }
 
 MgErr DSPtrAndHand(const void* p, UHandle h, uint32 size) {
@@ -93,6 +124,7 @@ MgErr DSSwapHandles(UHandle a, UHandle b) {
         return kHandleErr;
     }
     if (a == b) TESSEL_REPORT(kDebugFatal, 0x0E8C53B6u);
+    HandleGate gate(ThreadMemory::Mine());  // a walk meets each block once
     uintptr_t first = SlotContent(a), second = SlotContent(b);
     SetSlotContent(a, second);
     SetSlotContent(b, first);

@@ -25,6 +25,14 @@ inline bool IsGoodHandle(UHandle h, CheckFrom from) {
            (__builtin_expect(!ChecksGuards(GuardKind::kHandle), true) || CheckGuards(*h, GuardKind::kHandle));
 }
 
+// Creation for the caller of an operation of the interface, which gives its frame, TESSEL_THIS_FRAME: that caller is
+// where the call stacks of leak reports begin.
+#define TESSEL_THIS_FRAME __builtin_frame_address(0)
+UHandle CreateHandle(uint32 size, bool clear, const void* frame);
+UPtr CreatePtr(uint32 size, bool clear, const void* frame);
+// For a null handle stored at `h`, else its size is set; reports under the operation's name.
+MgErr ResizeOrCreate(UHandle* h, uint32 size, bool clear, const char* operation, const void* frame);
+
 // Returns the error after reporting "Memory error 3 in DSDisposeHandle"; 0 is not reported.
 MgErr ReportMemoryError(MgErr err, const char* operation);
 

@@ -30,10 +30,10 @@ void BeforeCreation(ThreadMemory* mine) {
     if (MemoryDebugging()) masterPointers.CheckChains(mine);
 }
 
-void AfterCreation(UHandle h, uint32 size) {
+void AfterCreation(UHandle h, uint32 size, const void* frame) {
     Trace(kCreated, kNoErr, h, size, 0);
-    TrackHandle(h, size);
-    if (Detours() & kScopeTracked) ScopeAdd(h, size);
+    TrackHandle(h, size, frame);
+    if (Detours() & kScopeTracked) ScopeAdd(h, size, frame);
 }
 
 UHandle CreationFailed(uint32 size) {
@@ -54,7 +54,7 @@ UPtr NewData(ThreadMemory* mine, uint32 size, Alignment alignment) {
     return data;
 }
 
-TESSEL_NOT_INLINE UHandle NewHandle(uint32 size, Alignment alignment, bool clear) {
+TESSEL_NOT_INLINE UHandle NewHandle(uint32 size, Alignment alignment, bool clear, const void* frame) {
     ThreadMemory* mine = ThreadMemory::Mine();
     uint32 detours = Detours();
     if (detours) BeforeCreation(mine);
@@ -68,7 +68,7 @@ TESSEL_NOT_INLINE UHandle NewHandle(uint32 size, Alignment alignment, bool clear
     if (clear) std::memset(data, 0, size);
     SetSlotContent(h, reinterpret_cast<uintptr_t>(data));
     ThreadMemory::Count(mine, &MemoryCounters::handles, 1u);
-    if (detours) AfterCreation(h, size);
+    if (detours) AfterCreation(h, size, frame);
     return h;
 }
 
@@ -88,27 +88,20 @@ TESSEL_ALWAYS_INLINE UHandle NewPlainHandle(uint32 size) {
     return h;
 }
 
-void AfterPtrCreation(UPtr p, uint32 size) {
+TESSEL_ALWAYS_INLINE UHandle NewHandleBySize(uint32 size, bool clear, const void* frame) {
+    Alignment alignment = AlignmentForSize(size);
+    UHandle h = !clear && alignment.IsDefault() ? NewPlainHandle(size) : nullptr;
+    return h ? h : NewHandle(size, alignment, clear, frame);
+}
+
+void AfterPtrCreation(UPtr p, uint32 size, const void* frame) {
     if (MemoryDebugging()) {
         if (reinterpret_cast<uintptr_t>(p) % 4 != 0)
             TESSEL_REPORT(kDebugFatal, 0x7B19C4D2u) << "Ptr block not ptr-aligned";
         DSHeapCheck(0);
     }
-    TrackPointer(p, size);
-    if (Detours() & kScopeTracked) ScopeAdd(p, size);
-}
-
-UPtr NewPointer(uint32 size, bool clear) {
-    NeedMemorySettings();
-    UPtr p = NewPtrBlock(size);
-    if (!p) {
-        CallSetMemFullProc(size);
-        return nullptr;
-    }
-    if (clear) std::memset(p, 0, size);
-    ThreadMemory::Count(ThreadMemory::Mine(), &MemoryCounters::pointers, 1u);
-    if (Detours()) AfterPtrCreation(p, size);
-    return p;
+    TrackPointer(p, size, frame);
+    if (Detours() & kScopeTracked) ScopeAdd(p, size, frame);
 }
 
 // ---- disposal -------------------------------------------------------------------------------------------------------
@@ -242,19 +235,36 @@ MgErr Resize(UHandle h, uint32 size, Alignment alignment, bool clear, const char
     return kNoErr;
 }
 
-MgErr ResizeOrNew(UHandle* h, uint32 size, bool clear, const char* operation) {
-    if (!h) return kArgErr;
-    if (*h) return Resize(*h, size, AlignmentForSize(size), clear, operation);
-    *h = clear ? DSNewHClr(size) : DSNewHandle(size);
-    return *h ? kNoErr : kMemFullErr;
-}
-
 // An empty datum is a null handle.
-MgErr ResizeOrNull(UHandle* h, uint32 size, bool clear, const char* operation) {
-    return size == 0 ? DSDisposeHandleAndNull(h) : ResizeOrNew(h, size, clear, operation);
+MgErr ResizeOrNull(UHandle* h, uint32 size, bool clear, const char* operation, const void* frame) {
+    return size == 0 ? DSDisposeHandleAndNull(h) : ResizeOrCreate(h, size, clear, operation, frame);
 }
 
 }  // namespace
+
+UHandle CreateHandle(uint32 size, bool clear, const void* frame) {
+    return NewHandleBySize(size, clear, frame);
+}
+
+UPtr CreatePtr(uint32 size, bool clear, const void* frame) {
+    NeedMemorySettings();
+    UPtr p = NewPtrBlock(size);
+    if (!p) {
+        CallSetMemFullProc(size);
+        return nullptr;
+    }
+    if (clear) std::memset(p, 0, size);
+    ThreadMemory::Count(ThreadMemory::Mine(), &MemoryCounters::pointers, 1u);
+    if (Detours()) AfterPtrCreation(p, size, frame);
+    return p;
+}
+
+MgErr ResizeOrCreate(UHandle* h, uint32 size, bool clear, const char* operation, const void* frame) {
+    if (!h) return kArgErr;
+    if (*h) return Resize(*h, size, AlignmentForSize(size), clear, operation);
+    *h = CreateHandle(size, clear, frame);
+    return *h ? kNoErr : kMemFullErr;
+}
 
 MgErr ReportMemoryError(MgErr err, const char* operation) {
     if (TESSEL_UNLIKELY(err != kNoErr))
@@ -271,29 +281,27 @@ void FreeHandle(UHandle h) {
 using namespace tessel;
 
 UHandle DSNewHandle(uint32 size) {
-    Alignment alignment = AlignmentForSize(size);
-    UHandle h = alignment.IsDefault() ? NewPlainHandle(size) : nullptr;
-    return h ? h : NewHandle(size, alignment, false);
+    return NewHandleBySize(size, false, TESSEL_THIS_FRAME);
 }
 
 UHandle DSNewHClr(uint32 size) {
-    return NewHandle(size, AlignmentForSize(size), true);
+    return CreateHandle(size, true, TESSEL_THIS_FRAME);
 }
 
 UHandle DSNewAlignedHandle(uint32 size, uint32 alignment, uint32 offset) {
-    return NewHandle(size, AlignmentFor(alignment, offset), false);
+    return NewHandle(size, AlignmentFor(alignment, offset), false, TESSEL_THIS_FRAME);
 }
 
 UHandle DSNewAlignedHClr(uint32 size, uint32 alignment, uint32 offset) {
-    return NewHandle(size, AlignmentFor(alignment, offset), true);
+    return NewHandle(size, AlignmentFor(alignment, offset), true, TESSEL_THIS_FRAME);
 }
 
 UPtr DSNewPtr(uint32 size) {
-    return NewPointer(size, false);
+    return CreatePtr(size, false, TESSEL_THIS_FRAME);
 }
 
 UPtr DSNewPClr(uint32 size) {
-    return NewPointer(size, true);
+    return CreatePtr(size, true, TESSEL_THIS_FRAME);
 }
 
 MgErr DSDisposeHandle(UHandle h) {
@@ -345,17 +353,17 @@ MgErr DSSetAlignedHSzClr(UHandle h, uint32 size, uint32 alignment, uint32 offset
 }
 
 MgErr DSSetHandleSizeOrNewHandle(UHandle* h, uint32 size) {
-    return ResizeOrNew(h, size, false, "DSSetHandleSizeOrNewHandle");
+    return ResizeOrCreate(h, size, false, "DSSetHandleSizeOrNewHandle", TESSEL_THIS_FRAME);
 }
 
 MgErr DSSetHSzOrNewHClr(UHandle* h, uint32 size) {
-    return ResizeOrNew(h, size, true, "DSSetHSzOrNewHClr");
+    return ResizeOrCreate(h, size, true, "DSSetHSzOrNewHClr", TESSEL_THIS_FRAME);
 }
 
 MgErr DataSetHandleSizeOrNewHandle(UHandle* h, uint32 size) {
-    return ResizeOrNull(h, size, false, "DataSetHandleSizeOrNewHandle");
+    return ResizeOrNull(h, size, false, "DataSetHandleSizeOrNewHandle", TESSEL_THIS_FRAME);
 }
 
 MgErr DataSetHSzOrNewHClr(UHandle* h, uint32 size) {
-    return ResizeOrNull(h, size, true, "DataSetHSzOrNewHClr");
+    return ResizeOrNull(h, size, true, "DataSetHSzOrNewHClr", TESSEL_THIS_FRAME);
 }

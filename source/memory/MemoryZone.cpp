@@ -1,17 +1,20 @@
-// The second names: each calls the operation of the same ending.
-#include <tessel/memory/MemoryManager.h>
+// The second names: each does what the operation of the same ending does. Those that copy stand with their twins in
+// HandleCopying.cpp.
+#include "memory/Handles.h"
+
+using namespace tessel;
 
 UHandle AZNewHandle(uint32 size) {
-    return DSNewHandle(size);
+    return CreateHandle(size, false, TESSEL_THIS_FRAME);
 }
 UHandle AZNewHClr(uint32 size) {
-    return DSNewHClr(size);
+    return CreateHandle(size, true, TESSEL_THIS_FRAME);
 }
 UPtr AZNewPtr(uint32 size) {
-    return DSNewPtr(size);
+    return CreatePtr(size, false, TESSEL_THIS_FRAME);
 }
 UPtr AZNewPClr(uint32 size) {
-    return DSNewPClr(size);
+    return CreatePtr(size, true, TESSEL_THIS_FRAME);
 }
 MgErr AZDisposeHandle(UHandle h) {
     return DSDisposeHandle(h);
@@ -28,20 +31,8 @@ MgErr AZSetHandleSize(UHandle h, uint32 size) {
 MgErr AZSetHSzClr(UHandle h, uint32 size) {
     return DSSetHSzClr(h, size);
 }
-MgErr AZCopyHandle(UHandle* destination, UHandle source) {
-    return DSCopyHandle(destination, source);
-}
-MgErr AZHandToHand(UHandle* h) {
-    return DSHandToHand(h);
-}
-MgErr AZPtrToHand(const void* p, UHandle* h, uint32 size) {
-    return DSPtrToHand(p, h, size);
-}
 MgErr AZPtrToXHand(const void* p, UHandle h, uint32 size) {
     return DSPtrToXHand(p, h, size);
-}
-MgErr AZSetHandleFromPtr(UHandle* h, const void* p, uint32 size) {
-    return DSSetHandleFromPtr(h, p, size);
 }
 MgErr AZPtrAndHand(const void* p, UHandle h, uint32 size) {
     return DSPtrAndHand(p, h, size);

@@ -7,14 +7,13 @@
 #include <tessel/diagnostics/StackChain.h>
 #include <tessel/sync/ThMutex.h>
 
+#include "diagnostics/CallStackWalk.h"
 #include "diagnostics/Guarded.h"
 #include "memory/MemorySettings.h"
 #include "memory/Trackers.h"
 
 namespace tessel {
 namespace {
-
-constexpr int32 kStackSkip = 2;
 
 struct ScopedAllocation {
     uint32 size;
@@ -74,9 +73,9 @@ void StopScopedTracker() {
     record = nullptr;
 }
 
-void ScopeAdd(const void* address, uint32 size) {
+void ScopeAdd(const void* address, uint32 size, const void* frame) {
     ScopedAllocation allocation{size, {}};
-    allocation.stack.Record(kStackSkip);
+    allocation.stack.RecordFrom(frame, static_cast<const StackFrame*>(frame)->returnAddress, 0);
     ThMutexHolder hold(record->mutex);
     if (!record->active) return;
     Guarded([&] {

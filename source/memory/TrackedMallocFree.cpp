@@ -1,5 +1,6 @@
 #include <tessel/memory/TrackedMallocFree.h>
 
+#include <algorithm>
 #include <atomic>
 
 #include <tessel/diagnostics/DumpLeakInfo.h>
@@ -11,15 +12,21 @@
 namespace tessel {
 namespace {
 
-constexpr int32 kStackSkip = 4;     // the tracker's own calls and Record
+constexpr int32 kStackSkip = 4;     // the tracker's own, and the function that the host called
 constexpr int32 kRecordLine = 140;  // the line that reports name for every tracked block
 constexpr char kLeakFile[] = "ovnewdelleaks.txt";
 
 std::atomic<AllocTracker*> tracker{nullptr};
 
-__attribute__((noinline)) void Record(const void* address, size_t size) {
-    if (AllocTracker* own = tracker.load(std::memory_order_acquire))
-        own->AddRecord(address, size <= UINT32_MAX ? static_cast<uint32>(size) : UINT32_MAX, __FILE__, kRecordLine);
+// Called by every function that allocates, itself called by the host. Not inlined, so that its frame tells where from.
+__attribute__((noinline)) void* Allocate(size_t size) {
+    NeedMemorySettings();
+    void* address = NewGuardedBlock(size, GuardKind::kNewDelete);
+    AllocTracker* own = address ? tracker.load(std::memory_order_acquire) : nullptr;
+    if (own)
+        own->AddRecordFrom(__builtin_frame_address(0), address, static_cast<uint32>(std::min<size_t>(size, UINT32_MAX)),
+                           __FILE__, kRecordLine);
+    return address;
 }
 
 class BadAllocation final : public std::bad_alloc {
@@ -42,13 +49,13 @@ MgErr TrackedMallocFreeStop() {
 }
 
 void* TrackedNew(size_t size) {
-    void* address = TrackedMalloc(size != 0 ? size : 1);
+    void* address = Allocate(size != 0 ? size : 1);
     if (!address) throw BadAllocation();
     return address;
 }
 
 void* TrackedNewNoThrow(size_t size) noexcept {
-    return TrackedMalloc(size != 0 ? size : 1);
+    return Allocate(size != 0 ? size : 1);
 }
 
 }  // namespace tessel
@@ -56,10 +63,7 @@ void* TrackedNewNoThrow(size_t size) noexcept {
 using namespace tessel;
 
 void* TrackedMalloc(size_t size) {
-    NeedMemorySettings();
-    void* address = NewGuardedBlock(size, GuardKind::kNewDelete);
-    if (address) Record(address, size);
-    return address;
+    return Allocate(size);
 }
 
 void TrackedFree(void* address) {

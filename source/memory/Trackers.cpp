@@ -44,12 +44,12 @@ void StopTrackers() {
     DestroyAllocTracker(pointerTracker.exchange(nullptr));
 }
 
-void TrackHandle(UHandle h, uint32 size) {
-    if (AllocTracker* tracker = Get(handleTracker)) tracker->AddRecord(h, size, __FILE__, __LINE__);
+void TrackHandle(UHandle h, uint32 size, const void* frame) {
+    if (AllocTracker* tracker = Get(handleTracker)) tracker->AddRecordFrom(frame, h, size, __FILE__, __LINE__);
 }
 
-void TrackPointer(const void* p, uint32 size) {
-    if (AllocTracker* tracker = Get(pointerTracker)) tracker->AddRecord(p, size, __FILE__, __LINE__);
+void TrackPointer(const void* p, uint32 size, const void* frame) {
+    if (AllocTracker* tracker = Get(pointerTracker)) tracker->AddRecordFrom(frame, p, size, __FILE__, __LINE__);
 }
 
 void UntrackHandle(UHandle h) {

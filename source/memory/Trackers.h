@@ -12,9 +12,9 @@ void StartTrackers();
 void WriteLeakReports();
 void StopTrackers();
 
-// Tell both. The file and line are the operation's.
-void TrackHandle(UHandle h, uint32 size);
-void TrackPointer(const void* p, uint32 size);
+// `frame` is that of the function that the host called: the call stacks recorded begin with its caller.
+void TrackHandle(UHandle h, uint32 size, const void* frame);
+void TrackPointer(const void* p, uint32 size, const void* frame);
 void UntrackHandle(UHandle h);
 void UntrackPointer(const void* p);
 
@@ -30,7 +30,7 @@ public:
 
 void StartScopedTracker();  // makes the record; tracking is not on
 void StopScopedTracker();
-void ScopeAdd(const void* address, uint32 size);
+void ScopeAdd(const void* address, uint32 size, const void* frame);
 void ScopeRemove(const void* address);
 
 }  // namespace tessel

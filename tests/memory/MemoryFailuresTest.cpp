@@ -16,6 +16,7 @@
 #include "memory/Heap.h"
 #include "memory/Service.h"
 #include "support/FailingAllocator.h"
+#include "support/ScratchDrive.h"
 #include "support/StartedMemory.h"
 
 namespace tessel {
@@ -137,6 +138,74 @@ TEST(TrackedAllocation, IsReportedWhenItLeaks) {
     EXPECT_THAT(memory.reports.Texts(kDebugInfo), Contains(EndsWith("(1) : 1 new/delete leaks (0 expected)")));
     delete left;
     TrackedFree(none);
+}
+
+// Calls every operation that makes something; the frames of all lie in this function.
+__attribute__((noinline)) void MakeOneOfEach(std::vector<UHandle>& handles, std::vector<void*>& blocks) {
+    UHandle some = nullptr, copy = nullptr;
+    for (auto make : {DSNewHandle, DSNewHClr, AZNewHandle, AZNewHClr}) handles.push_back(make(8));
+    for (auto make : {DSNewAlignedHandle, DSNewAlignedHClr}) handles.push_back(make(8, 16, 0));
+    for (auto make :
+         {DSSetHandleSizeOrNewHandle, DSSetHSzOrNewHClr, DataSetHandleSizeOrNewHandle, DataSetHSzOrNewHClr}) {
+        UHandle h = nullptr;
+        make(&h, 8);
+        handles.push_back(h);
+    }
+    for (auto make : {DSPtrToHand, AZPtrToHand}) {
+        make("12345678", &some, 8);
+        handles.push_back(some);
+    }
+    for (auto make : {DSSetHandleFromPtr, AZSetHandleFromPtr, DSSetHandleFromPtrNULLMeansEmpty}) {
+        UHandle h = nullptr;
+        make(&h, "12345678", 8);
+        handles.push_back(h);
+    }
+    for (auto make : {DSHandToHand, AZHandToHand}) {
+        make(&some);
+        handles.push_back(some);
+    }
+    for (auto make : {DSCopyHandle, AZCopyHandle}) {
+        copy = nullptr;
+        make(&copy, some);
+        handles.push_back(copy);
+    }
+    for (auto make : {DSNewPtr, DSNewPClr, AZNewPtr, AZNewPClr}) blocks.push_back(make(8));
+    blocks.push_back(TrackedMalloc(8));
+    blocks.push_back(TrackedNew(8));
+    blocks.push_back(TrackedNewNoThrow(8));
+    asm volatile("");
+}
+
+// Of each record in a leak report, whether its call stack begins in the function above.
+std::vector<bool> StacksThatBeginThere(const std::string& report) {
+    const auto begin = reinterpret_cast<uintptr_t>(&MakeOneOfEach);
+    std::vector<bool> results;
+    for (size_t at = report.find("\nMemory Contents: "); at != std::string::npos;
+         at = report.find("\nMemory Contents: ", at)) {
+        at = report.find("\n0x", at + 1);
+        uintptr_t address = at == std::string::npos ? 0 : std::stoull(report.substr(at + 3), nullptr, 16);
+        results.push_back(address > begin && address < begin + 16384);
+    }
+    return results;
+}
+
+TEST(LeakReports, BeginWithTheCallerOfTheLibrary) {
+    test::ScratchDrive drive;
+    setenv("TMPDIR", drive.Native().c_str(), 1);
+    test::StartedMemory memory;
+    MemResetTracker();
+    std::vector<UHandle> handles;
+    std::vector<void*> blocks;
+    MakeOneOfEach(handles, blocks);
+    MemDumpTracker();
+    for (UHandle h : handles) EXPECT_EQ(kNoErr, DSDisposeHandle(h));
+    for (size_t i = 0; i < 4; ++i) DSDisposePtr(blocks[i]);
+    memory.Stop();
+    unsetenv("TMPDIR");
+    EXPECT_EQ(std::vector<bool>(handles.size(), true), StacksThatBeginThere(drive.Get("ovHandleLeaks.txt")));
+    EXPECT_EQ(std::vector<bool>(4, true), StacksThatBeginThere(drive.Get("ovPointerLeaks.txt")));
+    EXPECT_EQ(std::vector<bool>(3, true), StacksThatBeginThere(drive.Get("ovnewdelleaks.txt")));
+    for (size_t i = 4; i < blocks.size(); ++i) TrackedFree(blocks[i]);
 }
 
 TEST(ScopedTracking, ReportsWhatIsLeft) {

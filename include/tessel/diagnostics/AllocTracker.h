@@ -99,6 +99,9 @@ public:
     /// Records an object (null: does nothing) and the call stack that made it. The file name should be a constant. An
     /// address that is recorded already is reported, and the earlier record stays.
     virtual void AddRecord(const void* address, uint32 size, const char* file, int32 line);
+    /// The same for a function that makes objects for its callers: gives its own frame, __builtin_frame_address(0),
+    /// which stands for that of AddRecord, so that the call stack begins where the function was called.
+    void AddRecordFrom(const void* frame, const void* address, uint32 size, const char* file, int32 line);
     /// Forgets an object. Nothing happens when it is not recorded.
     virtual void RemoveRecord(const void* address);
 
