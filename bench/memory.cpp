@@ -150,14 +150,16 @@ private:
     std::vector<const void*> next_;
 };
 
+// The jar is filled before the map, so that neither lies scattered among the other's blocks.
 class Cookies {
 public:
     explicit Cookies(std::uint32_t count) : jar_(MCNewJar()), cookies_(count) {
-        for (std::uint32_t index : RandomOrder(count)) {
+        const std::vector<std::uint32_t> order = RandomOrder(count);
+        for (std::uint32_t index : order) {
             void* info = &cookies_[index];
             cookies_[index] = MCNewCookie(jar_, &info);
-            map_.emplace(cookies_[index], info);
         }
+        for (std::uint32_t index : order) map_.emplace(cookies_[index], &cookies_[index]);
     }
     ~Cookies() { MCDisposeJar(jar_); }
     Cookies(const Cookies&) = delete;

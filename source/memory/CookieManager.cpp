@@ -51,9 +51,9 @@ MagicCookie CookieOf(uint32 generation, uint32 index) {
     return generation << PouchTree::kIndexBits | index;
 }
 
-// Generation 0 is a free entry's: no cookie has it.
+// Generation 0 is a free entry's, and only a free entry's: no cookie has it, and the link need not be looked at.
 bool IsValid(const CookieEntry* entry, MagicCookie cookie) {
-    return entry->Generation() == GenerationOf(cookie) && cookie >= kLeastCookie && entry->Link() < 0;
+    return entry->Generation() == GenerationOf(cookie) && cookie >= kLeastCookie;
 }
 
 // The entry of a valid cookie, or null.

@@ -5,11 +5,14 @@
 //   a slot is    a level 1      a level 2      a pouch      an entry
 //
 // Arrays and pouches are pointer blocks, made when first needed and kept until the jar goes: an entry never moves, and
-// finding one takes no lock.
+// finding one takes no lock. Pouches are made in the order of their indices, so that a directory of them, which lookups
+// go by instead of walking the levels, has no gaps.
 #ifndef TESSEL_SOURCE_MEMORY_POUCHTREE_H
 #define TESSEL_SOURCE_MEMORY_POUCHTREE_H
 
 #include <tessel/memory/TrackedMallocFree.h>
+
+#include <atomic>
 
 #include <tessel/base/Types.h>
 
@@ -46,8 +49,10 @@ public:
 
     // The entry of an index below kIndices; null while its pouch has not been made.
     CookieEntry* Find(uint32 index) const {
-        void* node = index < kSlots[3] ? __atomic_load_n(&firstPouch_, __ATOMIC_ACQUIRE) : FindPouch(index);
-        return node ? EntryIn(node, index % kSlots[3]) : nullptr;
+        const Directory* directory = directory_.load(std::memory_order_acquire);
+        uint32 pouch = index / kSlots[3];
+        if (pouch >= directory->count.load(std::memory_order_acquire)) return nullptr;
+        return EntryIn(directory->pouches[pouch], index % kSlots[3]);
     }
     // Makes what is missing; null when there is no memory. Callers serialise.
     CookieEntry* FindOrMake(uint32 index);
@@ -83,14 +88,8 @@ private:
     CookieEntry* EntryIn(void* pouch, uint32 i) const {
         return reinterpret_cast<CookieEntry*>(static_cast<uint8*>(pouch) + size_t{entrySize_} * i);
     }
-    void* FindPouch(uint32 index) const {
-        void* node = __atomic_load_n(&root_, __ATOMIC_ACQUIRE);
-        if (node) node = Slot(node, index >> kShifts[0]);
-        if (node) node = Slot(node, (index >> kShifts[1]) % kSlots[1]);
-        if (node) node = Slot(node, (index >> kShifts[2]) % kSlots[2]);
-        return node;
-    }
-    void* MakePouch(uint32 base) const;
+    void* MakePouch(uint32 base);
+    bool MakeRoomInDirectory();
 
     // Visits the arrays and pouches below (and with) a node depth first, each after what hangs on it, by index:
     // visitor(node, level, index of its first entry). Ends when that returns false.
@@ -102,9 +101,18 @@ private:
         return visitor(node, level, base);
     }
 
+    // The pouches by index / 64. One that is full is replaced by a larger one, and stays for those who are reading it.
+    struct Directory {
+        Directory* older;
+        uint32 room;
+        std::atomic<uint32> count;
+        void* pouches[1];  // `room` of them, the first `count` there
+    };
+
     uint32 entrySize_;
     void* root_ = nullptr;
-    void* firstPouch_ = nullptr;  // that of indices 0 to 63
+    Directory first_{nullptr, 1, {0}, {nullptr}};  // enough for a jar with few cookies
+    std::atomic<Directory*> directory_{&first_};
 };
 
 }  // namespace tessel
