@@ -22,6 +22,17 @@ std::set<IServiceObject*>& RunningServices() {
     return services;
 }
 
+class Busy {
+public:
+    explicit Busy(bool& busy) : busy_(busy) { busy_ = true; }
+    ~Busy() { busy_ = false; }
+    Busy(const Busy&) = delete;
+    Busy& operator=(const Busy&) = delete;
+
+private:
+    bool& busy_;
+};
+
 }  // namespace
 
 IServiceDependencyList::~IServiceDependencyList() = default;
@@ -68,7 +79,7 @@ void ServiceRegistry::Register(IServiceObject* service) {
 }
 
 MgErr ServiceRegistry::AddService(IServiceObject* service) {
-    if (startedCount_ > 0) return kGenericErr;
+    if (IsInUse()) return kGenericErr;
     if (!service || Find(service)) return kArgErr;
     return Guarded([&] {
         Register(service);
@@ -77,7 +88,7 @@ MgErr ServiceRegistry::AddService(IServiceObject* service) {
 }
 
 MgErr ServiceRegistry::RemoveService(IServiceObject* service) {
-    if (startedCount_ > 0) return kGenericErr;
+    if (IsInUse()) return kGenericErr;
     const auto item =
         std::find_if(items_.begin(), items_.end(), [&](const auto& each) { return each->service == service; });
     if (item == items_.end()) return kArgErr;
@@ -135,7 +146,8 @@ void ServiceRegistry::Place(Items work) {
 // ---- ServiceRegistry: start and stop --------------------------------------------------------------------------------
 
 MgErr ServiceRegistry::InitServices() {
-    if (startedCount_ > 0) return kGenericErr;
+    if (IsInUse()) return kGenericErr;
+    Busy busy(busy_);
     return Guarded([&]() -> MgErr {
         Order();
         for (const auto& item : startOrder_)
@@ -160,6 +172,8 @@ MgErr ServiceRegistry::Start(ServiceRegistryItem& item) {
 }
 
 MgErr ServiceRegistry::UninitServices() {
+    if (busy_) return kGenericErr;
+    Busy busy(busy_);
     while (startedCount_ > 0) {
         if (const MgErr err = Stop(*startOrder_[static_cast<size_t>(startedCount_) - 1])) return err;
         --startedCount_;

@@ -49,7 +49,11 @@ private:
     MgErr Start(ServiceRegistryItem& item);
     MgErr Stop(ServiceRegistryItem& item);
 
-    Items items_;  // in the order of registration
+    // What a service may not do from its own start, stop or GetDependencies: these get 42 meanwhile.
+    bool IsInUse() const { return startedCount_ > 0 || busy_; }
+
+    bool busy_ = false;  // ordering, starting or stopping
+    Items items_;        // in the order of registration
     Items startOrder_;
     int32 startedCount_ = 0;  // so many from the front of the start order are started
 };

@@ -107,6 +107,37 @@ TEST_F(ServiceRegistryTest, RegistrationIsRefusedWhileStarted) {
     EXPECT_EQ(Texts{}, recorder.Texts());
 }
 
+// A service that uses its registry whenever it is called.
+class Meddler : public Service {
+public:
+    Meddler() : Service("M") {}
+    MgErr Init() override { return Meddle(), Service::Init(); }
+    MgErr Uninit() override { return Meddle(), Service::Uninit(); }
+    void GetDependencies(IServiceDependencyList&) override { Meddle(); }
+    IServiceRegistry* registry = nullptr;
+    int calls = 0;
+
+private:
+    void Meddle() {
+        EXPECT_EQ(kGenericErr, registry->AddService(&other_));
+        EXPECT_EQ(kGenericErr, registry->RemoveService(this));
+        EXPECT_EQ(kGenericErr, registry->InitServices());
+        EXPECT_EQ(kGenericErr, registry->UninitServices());
+        ++calls;
+    }
+    Service other_{"O"};
+};
+
+TEST_F(ServiceRegistryTest, AServiceCannotChangeARegistryThatIsStartingIt) {
+    Meddler meddler;
+    const Registry registry = MakeRegistry({&meddler, &free});
+    meddler.registry = registry.get();
+    EXPECT_EQ(kNoErr, registry->InitServices());
+    EXPECT_EQ(kNoErr, registry->UninitServices());
+    EXPECT_EQ("+M +F -F -M ", theLog);
+    EXPECT_EQ(3, meddler.calls);
+}
+
 TEST_F(ServiceRegistryTest, AServiceThatStandsTwiceIsHeldOnce) {
     const Registry registry = MakeRegistry({&c, &c});
     EXPECT_EQ(Texts{"ServiceRegistry: A service has already been registered that has the name \"C\"."},

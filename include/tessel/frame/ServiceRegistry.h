@@ -92,7 +92,8 @@ private:
     std::vector<IServiceObject*> services_;
 };
 
-/// Starts and stops a set of services, which it does not own.
+/// Starts and stops a set of services, which it does not own. A service that calls its registry from its own start,
+/// stop or GetDependencies gets 42.
 class TESSEL_API IServiceRegistry {
 public:
     /// Starts every service after those that it depends on, and else in the order of registration. A dependency must be
