@@ -50,7 +50,7 @@ MgErr UninitTesselBase(void) {
 
 // Their results are not looked at: the library goes on without what did not start.
 MgErr InitTesselAppSupport(void) {
-    if (theAppSupportIsOn) return kNoErr;
+    if (theAppSupportIsOn || !theBaseRegistry) return kNoErr;
     for (auto accessor : kAppSupport)
         if (IServiceObject* service = accessor()) service->Init();
     theAppSupportIsOn = true;

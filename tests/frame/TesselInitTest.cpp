@@ -68,6 +68,7 @@ TEST_F(TesselInitTest, StartsAndStopsCleanlyAgainAndAgain) {
 }
 
 TEST_F(TesselInitTest, OutOfTurnNothingHappens) {
+    EXPECT_EQ(kNoErr, InitTesselAppSupport());
     EXPECT_EQ(kNoErr, UninitTesselAppSupport());
     EXPECT_EQ(kNoErr, UninitTesselBase());
     EXPECT_EQ(0u, recorder.Count());

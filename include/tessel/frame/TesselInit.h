@@ -15,7 +15,8 @@ TESSEL_API MgErr InitTesselBase(void);
 /* Stops them in the reverse order, with the leak reports. Always 0. */
 TESSEL_API MgErr UninitTesselBase(void);
 
-/* Starts configuration, threads and resources, after InitTesselBase. Does nothing when they are started. Always 0. */
+/* Starts configuration, threads and resources. Does nothing before InitTesselBase, and when they are started. Always 0.
+ */
 TESSEL_API MgErr InitTesselAppSupport(void);
 
 /* Stops them. Does nothing when they are not started. Always 0. */
