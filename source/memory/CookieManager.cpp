@@ -293,37 +293,45 @@ MgErr MCGetCookieInfoPtr(MagicCookieJar jar, MagicCookie cookie, void** info) {
 
 namespace {
 
-// Under the mutex. The number collected goes to *collected.
-MgErr CollectCookies(const JarRecord& record, UHandle* list, uint32* collected) {
-    uint32 live = static_cast<uint32>(record.liveCount);
-    MgErr err = DSSetHandleSizeOrNewHandle(list, static_cast<uint32>(sizeof(uint32)) * (live + 1));
-    if (err != kNoErr) return err;
-    uint32* words = reinterpret_cast<uint32*>(**list);
+uint32 ListSize(uint32 cookies) {
+    return static_cast<uint32>(sizeof(uint32)) * (cookies + 1);
+}
+
+uint32 LiveCount(const JarRecord& record) {
+    return static_cast<uint32>(__atomic_load_n(&record.liveCount, __ATOMIC_RELAXED));
+}
+
+// Under the mutex, into a list that has room for all that live.
+void CollectCookies(const JarRecord& record, uint32* list) {
+    uint32 live = LiveCount(record);
     uint32 count = 0;
     if (live != 0)
         record.tree->ForEachInUse([&](CookieEntry* entry, uint32 index) {
-            words[++count] = CookieOf(entry->Generation(), index);
+            list[++count] = CookieOf(entry->Generation(), index);
             return count < live;
         });
-    *collected = words[0] = count;
-    return kNoErr;
+    list[0] = count;
 }
 
 }  // namespace
 
+// The list is resized without the mutex, since that may call the host: again when cookies were made meanwhile.
 MgErr MCGetCookieList(MagicCookieJar jar, UHandle* list) {
     if (!list) return kArgErr;
     JarRecord& record = Record(jar);
-    uint32 live, collected = 0;
-    {
-        ThMutexHolder hold(record.mutex);
-        live = static_cast<uint32>(record.liveCount);
-        MgErr err = CollectCookies(record, list, &collected);
+    uint32 room = LiveCount(record), live;
+    for (;; room = live) {
+        MgErr err = DSSetHandleSizeOrNewHandle(list, ListSize(room));
         if (err != kNoErr) return err;
+        ThMutexHolder hold(record.mutex);
+        live = LiveCount(record);
+        if (live > room) continue;
+        CollectCookies(record, reinterpret_cast<uint32*>(**list));
+        break;
     }
-    if (collected != live)
+    if (*reinterpret_cast<const uint32*>(**list) != live)
         TESSEL_REPORT(kDebugError, 0x51EB0F47u) << "PouchTree::CollectMagicCookies: cookie count discrepancy";
-    return kNoErr;
+    return live < room ? DSSetHandleSize(*list, ListSize(live)) : kNoErr;
 }
 
 bool MCIsACookie(MagicCookieJar jar, MagicCookie cookie) {
