@@ -1,6 +1,7 @@
 #include "memory/HandleBlock.h"
 
 #include <algorithm>
+#include <bit>
 
 #include "memory/Heap.h"
 
@@ -8,17 +9,27 @@ namespace tessel {
 namespace {
 
 constexpr uint32 kPtrHeader = 16;  // unused 4, size 4, guard 8
+constexpr uint32 kMostAlignment = 32768;
 
 }  // namespace
 
 Alignment AlignmentFor(uint32 alignment, uint32 offset) {
-    constexpr uint32 kMost = 32768;
     uint32 power = 8;
-    while (power < alignment && power < kMost) power *= 2;
+    while (power < alignment && power < kMostAlignment) power *= 2;
     uint64 rounded = (uint64{offset} + 3) & ~uint64{3};
     if (rounded > UINT16_MAX) rounded %= power;  // places the data as well
     if (power == 8) rounded &= 4;
     return {static_cast<uint16>(power), static_cast<uint16>(rounded)};
+}
+
+// A distance that no block can have is told without following it.
+bool HandleLayout::IsPlaced(UPtr data) const {
+    constexpr uint32 kMostDistance = sizeof(Alignment) + UINT16_MAX + kMostAlignment;
+    const uint32 distance = HeaderOf(data)->distance;
+    if (distance == 0) return true;
+    if (distance > kMostDistance || distance % sizeof(Alignment) != 0) return false;
+    const Alignment alignment = AlignmentOf(data);
+    return std::has_single_bit(alignment.alignment) && PlaceData(BlockOf(data), alignment) == data;
 }
 
 UPtr NewGuardedBlock(size_t size, GuardKind kind) {

@@ -81,6 +81,9 @@ public:
         return header->distance == 0 ? Alignment() : *static_cast<Alignment*>(BlockOf(data));
     }
 
+    // Whether the header leads back to a block in which the data would be placed there.
+    bool IsPlaced(UPtr data) const;
+
     // Where the data goes in a heap block.
     UPtr PlaceData(void* block, Alignment alignment) const {
         uintptr_t data = reinterpret_cast<uintptr_t>(block) + HeaderRoom();

@@ -25,6 +25,7 @@ void PassOnHeapError(heap::Error error, const void* block) {
 bool NameHandleBlocks(void* context, heap::Visitor visitor) {
     HandleLayout layout;
     return masterPointers.ForEachLive([&](UHandle h) {
+        if (!layout.IsPlaced(*h)) return false;
         void* block = layout.BlockOf(*h);
         uint32 bytes = layout.BlockSize(layout.SizeOf(*h), layout.AlignmentOf(*h));
         return bytes != 0 && bytes <= platform::AllocatedSize(block) && visitor(context, block, bytes);
@@ -43,8 +44,9 @@ void RecoverHandles() {
         ++count;
         bytes += size;
     });
-    masterPointers.Stop();
+    // Before the end of the master pointers: a handler may use handles while it shows a report.
     TESSEL_REPORT(kDebugInfo, 0x0D94A7F3u) << "Recovered " << count << " Handles for " << bytes << " bytes.";
+    masterPointers.Stop();
 }
 
 }  // namespace

@@ -235,10 +235,10 @@ TEST(MemoryChecks, FindPlantedDamage) {
 TEST(MemoryChecks, FindDamagedBlocks) {
     test::StartedMemory memory;
     UPtr p = DSNewPtr(8);
-    UHandle h = DSNewHandle(8);
+    UHandle h = DSNewHandle(8), aligned = DSNewHandle(2000);
     uint8 saved[16];
     uint32 words[3];
-    for (UPtr header : {p - 16, *h - 8}) {
+    for (UPtr header : {p - 16, *h - 8, *h - 4, *aligned - 4}) {  // links, size, and the ways back to the block
         std::memcpy(saved, header, 8);
         memory.reports.Clear();
         std::memset(header, 0xEE, 4);
@@ -249,6 +249,7 @@ TEST(MemoryChecks, FindDamagedBlocks) {
         EXPECT_TRUE(heap::Check());
     }
     DSDisposePtr(p);
+    DSDisposeHandle(aligned);
     DSDisposeHandle(h);
 }
 
