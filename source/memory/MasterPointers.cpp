@@ -76,6 +76,7 @@ MgErr MasterPointers::Start() {
     for (int i = 0; i < kFirstBlocks; ++i)
         if (!AddBlock()) {
             Stop();
+            CallSetMemFullProc(sizeof(MasterPointerBlock));
             return kMemFullErr;
         }
     return kNoErr;
