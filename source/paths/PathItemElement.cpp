@@ -149,14 +149,21 @@ void PathItemElement::GiveBackUnusedRoom() {
     if (children_.empty()) Children().swap(children_);
 }
 
+// Part of the stop, which must not want memory: finds its way by the places of the elements in their parents.
 void PathItemElement::TakeCaches(PathItemCacheList& list) {
-    std::vector<PathItemElement*, TrackedAllocator<PathItemElement*>> waiting{this};
-    while (!waiting.empty()) {
-        PathItemElement* element = waiting.back();
-        waiting.pop_back();
+    for (PathItemElement* element = this; element;) {
         list.Add(element->cache_);
-        for (const ChildEntry& entry : element->children_) waiting.push_back(entry.element);
+        element = element->children_.empty() ? element->NextBelow(this) : element->children_.front().element;
     }
+}
+
+PathItemElement* PathItemElement::NextBelow(const PathItemElement* top) {
+    for (PathItemElement* element = this; element != top; element = element->parent_) {
+        bool found;
+        auto position = element->parent_->FindChild(element->name_, element->hash_, found);
+        if (found && ++position != element->parent_->children_.end()) return position->element;
+    }
+    return nullptr;
 }
 
 // ---- checks ---------------------------------------------------------------------------------------------------------

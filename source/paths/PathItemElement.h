@@ -112,6 +112,8 @@ private:
     Children::iterator FindChild(const std::string& name, int32 hash, bool& found);
     PathItemElement* MakeChild(const std::string& name, int32 hash, Children::iterator position);
     PathItemElement* End(PathItemCacheList& caches);
+    // The element that follows this one and those below it in the tree of `top`; null at its end.
+    PathItemElement* NextBelow(const PathItemElement* top);
     void ReportOverRelease();
 
     std::string name_;
