@@ -1,6 +1,7 @@
 // The start-up map: every service of the library, what it depends on, and what starts and stops it.
 #include "frame/CoreServices.h"
 
+#include "diagnostics/Guarded.h"
 #include "diagnostics/Service.h"
 #include "files/Service.h"
 #include "memory/Service.h"
@@ -26,8 +27,8 @@ public:
     }
 
 protected:
-    MgErr DoInit() override { return T::Start(); }
-    MgErr DoUninit() override { return T::Stop(); }
+    MgErr DoInit() override { return Guarded(T::Start); }
+    MgErr DoUninit() override { return Guarded(T::Stop); }
 };
 
 struct DebugStream_Service final : CoreService<DebugStream_Service> {

@@ -171,6 +171,11 @@ MgErr ServiceRegistry::Start(ServiceRegistryItem& item) {
     return item.startResult;
 }
 
+IServiceObject* ServiceRegistry::Failed() const {
+    const auto next = static_cast<size_t>(startedCount_);
+    return next < startOrder_.size() && startOrder_[next]->startResult != kNoErr ? startOrder_[next]->service : nullptr;
+}
+
 MgErr ServiceRegistry::UninitServices() {
     if (busy_) return kGenericErr;
     Busy busy(busy_);

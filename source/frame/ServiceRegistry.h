@@ -35,6 +35,9 @@ public:
     MgErr RemoveService(IServiceObject* service) override;
     bool HasService(IServiceObject* service) override { return Find(service) != nullptr; }
 
+    // The service whose start failed last, or null. It is not stopped with the others.
+    IServiceObject* Failed() const;
+
     // Registers a service of a list: one that is registered already is reported.
     void Register(IServiceObject* service);
 

@@ -2,8 +2,10 @@
 
 #include <algorithm>
 #include <iterator>
+#include <utility>
 
 #include "frame/CoreServices.h"
+#include "frame/ServiceRegistry.h"
 
 namespace tessel {
 namespace {
@@ -14,6 +16,8 @@ bool theAppSupportIsOn = false;
 // In the order they are started.
 constexpr IServiceObject* (*kAppSupport[])() = {ConfigManagerService, ConfigCoreTypesService, ThThreadService,
                                                 ResourceManagerService};
+// Those of them that were taken hold of.
+IServiceObject* theAppServices[std::size(kAppSupport)];
 
 }  // namespace
 }  // namespace tessel
@@ -40,8 +44,10 @@ MgErr InitTesselBase(void) {
     return theBaseRegistry ? theBaseRegistry->InitServices() : kMemFullErr;
 }
 
+// A service that failed to start keeps its error until it is let go: then the next start finds a new one.
 MgErr UninitTesselBase(void) {
     if (!theBaseRegistry) return kNoErr;
+    if (IServiceObject* failed = static_cast<ServiceRegistry*>(theBaseRegistry)->Failed()) failed->Uninit();
     theBaseRegistry->UninitServices();
     theBaseRegistry->Release();
     theBaseRegistry = nullptr;
@@ -51,16 +57,18 @@ MgErr UninitTesselBase(void) {
 // Their results are not looked at: the library goes on without what did not start.
 MgErr InitTesselAppSupport(void) {
     if (theAppSupportIsOn || !theBaseRegistry) return kNoErr;
-    for (auto accessor : kAppSupport)
-        if (IServiceObject* service = accessor()) service->Init();
+    for (size_t i = 0; i < std::size(kAppSupport); ++i) {
+        theAppServices[i] = kAppSupport[i]();
+        if (theAppServices[i]) theAppServices[i]->Init();
+    }
     theAppSupportIsOn = true;
     return kNoErr;
 }
 
 MgErr UninitTesselAppSupport(void) {
     if (!theAppSupportIsOn) return kNoErr;
-    for (auto accessor = std::rbegin(kAppSupport); accessor != std::rend(kAppSupport); ++accessor)
-        if (IServiceObject* service = (*accessor)()) service->Uninit();
+    for (size_t i = std::size(kAppSupport); i-- > 0;)
+        if (IServiceObject* service = std::exchange(theAppServices[i], nullptr)) service->Uninit();
     theAppSupportIsOn = false;
     return kNoErr;
 }

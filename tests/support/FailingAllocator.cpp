@@ -12,13 +12,13 @@ namespace {
 std::atomic<int> left;
 std::atomic<bool> failed;
 
-bool May(size_t) {
+}  // namespace
+
+bool FailingAllocator::May(size_t) {
     if (left.fetch_sub(1) != 1) return true;
     failed = true;
     return false;
 }
-
-}  // namespace
 
 FailingAllocator::FailingAllocator(int n) {
     left = n;
@@ -32,6 +32,7 @@ FailingAllocator::FailingAllocator(int n) {
 }
 
 FailingAllocator::~FailingAllocator() {
+    left = 0;
     heap::SetAllocationFilter(nullptr);
     ResetTrackerHeapSource();
 }

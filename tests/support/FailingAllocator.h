@@ -3,6 +3,8 @@
 #ifndef TESSEL_TESTS_SUPPORT_FAILINGALLOCATOR_H
 #define TESSEL_TESTS_SUPPORT_FAILINGALLOCATOR_H
 
+#include <cstddef>
+
 namespace tessel::test {
 
 class FailingAllocator {
@@ -14,6 +16,9 @@ public:
 
     // Whether an allocation has failed.
     bool HasFailed() const;
+
+    // Counts an allocation, and tells whether it may succeed: for operators new that a test program replaces.
+    static bool May(std::size_t size);
 };
 
 }  // namespace tessel::test
