@@ -76,14 +76,6 @@ MgErr PrintToFile(File_t* file, CStr format, va_list args, BadFormat bad, uint32
     return err;
 }
 
-}  // namespace
-
-// ---- shared by the file functions -----------------------------------------------------------------------------------
-
-MgErr PlatformName::Make(Path path, bool resolveShortcuts) {
-    return MakeDOSPathName(path, text_, resolveShortcuts ? 1 : 0);
-}
-
 MgErr TranslateModes(int32 openMode, int32 denyMode, OpenAccess* out) {
     static constexpr uint32 kAccess[] = {platform::kRead | platform::kWrite, platform::kRead, platform::kWrite,
                                          platform::kWrite};
@@ -93,6 +85,33 @@ MgErr TranslateModes(int32 openMode, int32 denyMode, OpenAccess* out) {
     out->access = kAccess[openMode % 4];
     out->denied = kDenied[denyMode];
     return kNoErr;
+}
+
+}  // namespace
+
+// ---- shared by the file functions -----------------------------------------------------------------------------------
+
+MgErr PlatformName::Make(Path path, bool resolveShortcuts) {
+    return MakeDOSPathName(path, text_, resolveShortcuts ? 1 : 0);
+}
+
+MgErr OpenWith(File_t** file, Path path, int32 openMode, int32 denyMode,
+               const std::function<platform::FileHandle(const char* name, const OpenAccess& access)>& open) {
+    if (!file) return kArgErr;
+    return Guarded([&]() -> MgErr {
+        FlushPathCache(path);
+        *file = nullptr;
+        OpenAccess modes;
+        if (!FIsAbsPath(path)) return kArgErr;
+        if (const MgErr err = TranslateModes(openMode, denyMode, &modes)) return err;
+        PlatformName name;
+        if (const MgErr err = name.Make(path, true)) return err;
+        if (IsVolume(path)) return kArgErr;
+        const platform::FileHandle handle = open(name.Text(), modes);
+        if (handle == platform::kNoFile) return Win32ToOVFileErr();
+        *file = FileOf(handle);
+        return kNoErr;
+    });
 }
 
 FileManagerLock::FileManagerLock() {
@@ -119,22 +138,10 @@ using namespace tessel;
 // ---- opening and closing --------------------------------------------------------------------------------------------
 
 MgErr FMOpen(File_t** file, Path path, int32 openMode, int32 denyMode) {
-    if (!file) return kArgErr;
-    return Guarded([&]() -> MgErr {
-        FlushPathCache(path);
-        *file = nullptr;
-        OpenAccess modes;
-        if (!FIsAbsPath(path)) return kArgErr;
-        if (const MgErr err = TranslateModes(openMode, denyMode, &modes)) return err;
-        PlatformName name;
-        if (const MgErr err = name.Make(path, true)) return err;
-        if (IsVolume(path)) return kArgErr;
-        const auto disposition = openMode == kFOpenWriteTrunc ? platform::Disposition::kTruncateExisting
-                                                              : platform::Disposition::kOpenExisting;
-        const platform::FileHandle handle = OpenPatiently(name.Text(), modes, disposition);
-        if (handle == platform::kNoFile) return Win32ToOVFileErr();
-        *file = FileOf(handle);
-        return kNoErr;
+    const auto disposition =
+        openMode == kFOpenWriteTrunc ? platform::Disposition::kTruncateExisting : platform::Disposition::kOpenExisting;
+    return OpenWith(file, path, openMode, denyMode, [=](const char* name, const OpenAccess& access) {
+        return OpenPatiently(name, access, disposition);
     });
 }
 

@@ -110,21 +110,9 @@ using namespace tessel;
 // ---- creating -------------------------------------------------------------------------------------------------------
 
 MgErr FGenericCreate(File_t** file, Path path, int32, int32 openMode, int32 denyMode, int32, int32 always) {
-    if (!file) return kArgErr;
-    return Guarded([&]() -> MgErr {
-        FlushPathCache(path);
-        *file = nullptr;
-        OpenAccess modes;
-        if (!FIsAbsPath(path)) return kArgErr;
-        if (const MgErr err = TranslateModes(openMode, denyMode, &modes)) return err;
-        PlatformName name;
-        if (const MgErr err = name.Make(path, true)) return err;
-        if (IsVolume(path)) return kArgErr;
-        const auto disposition = always ? platform::Disposition::kCreateAlways : platform::Disposition::kCreateNew;
-        const platform::FileHandle handle = platform::FileOpen(name.Text(), modes.access, modes.denied, disposition);
-        if (handle == platform::kNoFile) return Win32ToOVFileErr();
-        *file = FileOf(handle);
-        return kNoErr;
+    const auto disposition = always ? platform::Disposition::kCreateAlways : platform::Disposition::kCreateNew;
+    return OpenWith(file, path, openMode, denyMode, [=](const char* name, const OpenAccess& access) {
+        return platform::FileOpen(name, access.access, access.denied, disposition);
     });
 }
 

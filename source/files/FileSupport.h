@@ -5,6 +5,7 @@
 #include <tessel/base/MgErr.h>
 #include <tessel/base/StringTypes.h>
 
+#include <functional>
 #include <string>
 
 #include "platform/File.h"
@@ -36,7 +37,10 @@ struct OpenAccess {
     uint32 access = 0;
     uint32 denied = 0;
 };
-MgErr TranslateModes(int32 openMode, int32 denyMode, OpenAccess* out);
+// What opening and creating have in common: checks the path and the modes, then lets `open` have the name and the
+// access.
+MgErr OpenWith(File_t** file, Path path, int32 openMode, int32 denyMode,
+               const std::function<platform::FileHandle(const char* name, const OpenAccess& access)>& open);
 
 // Drops what a path has cached about its item. Nothing for null.
 void FlushPathCache(Path path);
