@@ -7,7 +7,7 @@
 
 #include <cmath>
 
-#include "numerics/NumericAccess.h"
+#include "strings/NumericTextParts.h"
 #include "strings/PathText.h"
 
 namespace tessel {
@@ -66,33 +66,35 @@ int32 ExponentialCode(const FmtSpec& spec) {
     return std::min(digits, kMaxSignificantDigits);
 }
 
-/* |trunc(log10 x)| is at most `limit`. Mostly the power of two tells; x > 0. */
-bool PowerFits(Extended x, int32 limit) {
-    const auto fits = [limit](Extended power) { return std::fabs(std::trunc(power)) <= static_cast<Extended>(limit); };
-    constexpr Extended kLog10Of2 = 0.30102999566398119521L;
-    const Extended below = kLog10Of2 * std::ilogb(x);
+/* |trunc(log10 |x|)| is at most `limit`. Mostly the power of two tells; x is finite and not 0. */
+bool PowerFits(const RealParts& x, int32 limit) {
+    constexpr double kLog10Of2 = 0.301029995663981195;
+    const auto fits = [limit](auto power) { return std::abs(static_cast<int32>(power)) <= limit; };
+    const double below = kLog10Of2 * (x.exponent + 63);
     const bool fitsBelow = fits(below);
-    return fitsBelow == fits(below + kLog10Of2) ? fitsBelow : fits(std::log10(x));
+    if (fitsBelow == fits(below + kLog10Of2)) return fitsBelow;
+    return fits(std::log10(std::ldexp(static_cast<Extended>(x.mantissa), x.exponent)));
 }
 
 /* Whether the fixed form of a real shows it without more digits than are sensible. */
-bool FixedFits(Extended value, int32 limit) {
-    if (value == 0) return limit >= 1;
-    if (!std::isfinite(value)) return limit >= kSpecialTextLength;
-    return PowerFits(std::fabs(value), limit - (value < 0));
+bool FixedFits(const RealParts& x, int32 limit) {
+    if (x.kind != RealKind::kFinite) return limit >= kSpecialTextLength;
+    if (x.mantissa == 0) return limit >= 1;
+    return PowerFits(x, limit - (x.negative ? 1 : 0));
 }
 
 bool FixedFits(const void* value, int16 type, int32 limit) {
-    if (!value) return FixedFits(Extended{0}, limit);
-    if (type == kNumDouble) return FixedFits(ReadAs<double>(value), limit);
+    if (!value) return limit >= 1; /* a zero */
     cmplxExt parts;
     ConvertNum(type, value, kNumComplexExtended, &parts);
-    return FixedFits(ToExtended(parts.re), limit) &&
-           (type < kNumComplexSingle || FixedFits(ToExtended(parts.im), limit));
+    return FixedFits(TakeApart(parts.re), limit) && (type < kNumComplexSingle || FixedFits(TakeApart(parts.im), limit));
 }
 
-int32 FixedCode(const FmtSpec& spec, const void* value, int16 type) {
-    if (!FixedFits(value, type, spec.width != 0 ? spec.width - 1 : kDefaultFixedLimit)) return ExponentialCode(spec);
+int32 FixedLimit(const FmtSpec& spec) {
+    return spec.width != 0 ? spec.width - 1 : kDefaultFixedLimit;
+}
+
+int32 FixedCode(const FmtSpec& spec) {
     return -std::min(spec.precision < 0 ? kDefaultDecimals : spec.precision, kMaxDecimals);
 }
 
@@ -131,7 +133,7 @@ void FmtRenderer::RenderNumber(FmtItem item, const FmtSpec& spec, FmtValue value
         shape.width = kAddressDigits;
     }
     if (spec.type != kFmtNoType) return RenderTyped(item, shape, value.pointer, spec.type);
-    if (item >= FmtItem::kExponential) return RenderTyped(item, shape, &value.real, kNumDouble);
+    if (item >= FmtItem::kExponential) return RenderReal(item, shape, value.real);
     RenderInteger(item, shape, value.integer);
 }
 
@@ -161,11 +163,23 @@ void FmtRenderer::RenderDecimalInPieces(const FmtSpec& spec, uint64 magnitude, b
     PutNumber(spec, text, length);
 }
 
-/* Reals, and numbers of any type that the format names. */
+void FmtRenderer::RenderReal(FmtItem item, const FmtSpec& spec, double value) {
+    const RealParts parts = TakeApart(value);
+    const bool fixed = item == FmtItem::kFixed && FixedFits(parts, FixedLimit(spec));
+    const int32 code = fixed ? FixedCode(spec) : ExponentialCode(spec);
+    char text[kScratchSize];
+    const int32 length =
+        tessel::RenderReal({parts, false, 0}, code, text, kScratchSize, static_cast<char>(decimalPoint_));
+    PutNumber(spec, text, static_cast<size_t>(length));
+}
+
+/* Numbers of a type that the format names. */
 void FmtRenderer::RenderTyped(FmtItem item, const FmtSpec& spec, const void* value, int16 type) {
-    const int32 code = item == FmtItem::kExponential ? ExponentialCode(spec)
-                       : item == FmtItem::kFixed     ? FixedCode(spec, value, type)
-                                                     : IntegerCode(item);
+    int32 code = IntegerCode(item);
+    if (item == FmtItem::kExponential) code = ExponentialCode(spec);
+    if (item == FmtItem::kFixed) {
+        code = FixedFits(value, type, FixedLimit(spec)) ? FixedCode(spec) : ExponentialCode(spec);
+    }
     const auto formatCode = static_cast<int16>(code);
     char text[kScratchSize];
     const int32 length = NumToAnyString(value, type, &formatCode, text, kScratchSize, decimalPoint_, nullptr);

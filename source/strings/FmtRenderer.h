@@ -67,6 +67,7 @@ private:
     void RenderNumber(FmtItem item, const FmtSpec& spec, FmtValue value);
     void RenderDecimalInPieces(const FmtSpec& spec, uint64 magnitude, bool negative);
     void RenderInteger(FmtItem item, const FmtSpec& spec, int64 value);
+    void RenderReal(FmtItem item, const FmtSpec& spec, double value);
     void RenderTyped(FmtItem item, const FmtSpec& spec, const void* value, int16 type);
     void RenderCharacter(const FmtSpec& spec, int32 value);
     void RenderText(const FmtSpec& spec, LStrView text);

@@ -36,7 +36,7 @@ public:
 
     /* False when the specifier is cut off by the end, or its position or type prefix is none of the language's. Whether
        there is such a conversion is not looked at. */
-    bool Read(FmtSpec& spec) {
+    [[gnu::always_inline]] bool Read(FmtSpec& spec) {
         bool digits = ReadFlagsAndWidth(spec);
         if (digits && !spec.left && Peek() == '$') {
             ++cursor_;

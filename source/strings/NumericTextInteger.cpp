@@ -92,8 +92,11 @@ int32 NumToIntString(const void* value, char* buffer, int32 size, int32 radix, b
     const int32 width = IntegerBits(type);
     if (isSigned && radix == 10) {
         const int64 number = width == 64 ? static_cast<int64>(bits) : static_cast<int32>(bits);
-        const auto magnitude = static_cast<uint64>(number);
-        return NumToStr(number < 0 ? 0 - magnitude : magnitude, number < 0, radix, buffer, size);
+        const uint64 magnitude = number < 0 ? 0 - static_cast<uint64>(number) : static_cast<uint64>(number);
+        if (size <= kLongestDecimal) return NumToStr(magnitude, number < 0, radix, buffer, size);
+        char* const end = WriteDecimal(buffer, magnitude, number < 0);
+        *end = 0;
+        return static_cast<int32>(end - buffer);
     }
     return NumToStr(bits & (~uint64{0} >> (64 - width)), false, radix, buffer, size);
 }

@@ -87,12 +87,34 @@ private:
         return true;
     }
 
-    // Takes digits while there is room for them.
+    // Takes digits while there is room for them, eight at once where there are as many.
     void KeepDigits() {
+        constexpr int32 kEight = 8;
+        uint32 eight = 0;
+        while (count_ <= kPackedDecimalDigits - kEight && end_ - at_ >= kEight && EightDigits(at_, eight)) {
+            highDigits_ = lowDigits_ >> 32;
+            lowDigits_ = lowDigits_ << 32 | eight;
+            at_ += kEight;
+            count_ += kEight;
+        }
         for (; at_ < end_ && IsDigit(*at_) && count_ < kPackedDecimalDigits; ++at_, ++count_) {
             highDigits_ = highDigits_ << 4 | lowDigits_ >> 60;
             lowDigits_ = lowDigits_ << 4 | static_cast<uint64>(*at_ - '0');
         }
+    }
+
+    // The digits at `text`, four bits each, the first one highest; false unless they are eight.
+    static bool EightDigits(const char* text, uint32& digits) {
+        constexpr uint64 kZeros = 0x3030303030303030;
+        uint64 bytes = 0;
+        std::memcpy(&bytes, text, sizeof bytes);
+        const uint64 values = bytes - kZeros;
+        if (((values | (bytes + 0x4646464646464646)) & 0x8080808080808080) != 0) return false;
+        uint64 packed = __builtin_bswap64(values);
+        packed = (packed | packed >> 4) & 0x00FF00FF00FF00FF;
+        packed = (packed | packed >> 8) & 0x0000FFFF0000FFFF;
+        digits = static_cast<uint32>(packed | packed >> 16);
+        return true;
     }
 
     bool Integer() {

@@ -174,6 +174,7 @@ int32 RenderReal(const RealSource& source, int32 k, char* buffer, int32 size, ch
 using namespace tessel;
 
 int32 PackedToString(const PackedDecimal* record, int16 formatCode, char* buffer, int32 size, uint8 decimalPoint) {
+    if (buffer == nullptr || size <= 0) return 0;
     RealText text;
     if (!ReadRecord(*record, text)) {
         ReportBadRecord(*record, formatCode > 0);

@@ -298,6 +298,7 @@ TEST(NumericTextRender, Records) {
     EXPECT_EQ(Packed(record, -1), "-1234567800.0");
     record.exponent = -4930;
     EXPECT_EQ(Packed(record, 3), "-0.00E+0") << "too small to show";
+    EXPECT_EQ(PackedToString(&record, 3, nullptr, 0, '.'), 0);
 }
 
 TEST(NumericTextRender, CorruptRecordsAreReported) {
