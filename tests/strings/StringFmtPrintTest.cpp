@@ -179,11 +179,13 @@ TEST(StringFmtPrint, AgreesWithTheCLibrary) {
     for (int i = 0; i < 20000; ++i) {
         const std::string before = std::string("plain, long enough text and ").substr(pick(20), pick(12));
         std::string specifier = pick(3) == 0 ? "-" : "";
-        const char conversion = "duxos"[pick(5)];
+        const char conversion = "duxosf"[pick(6)];
+        const bool isReal = conversion == 'f';
         if (conversion != 's' && pick(3) == 0) specifier += '0';
-        if (pick(2)) specifier += std::to_string(1 + pick(30));
+        if (pick(2)) specifier += std::to_string((isReal ? 13 : 1) + pick(30));  // reals that fit the width stay fixed
         if (conversion == 's' && pick(2)) specifier += "." + std::to_string(pick(12));
-        const bool wide = conversion != 's' && pick(2);
+        if (isReal && pick(2)) specifier += "." + std::to_string(pick(9));
+        const bool wide = conversion != 's' && !isReal && pick(2);
         if (wide) specifier += "ll";
         const std::string ours = before + "%" + specifier + conversion + "%%|%d";
         const std::string theirs = before + "%" + specifier + (conversion == 'x' ? 'X' : conversion) + "%%|%d";
@@ -201,6 +203,8 @@ TEST(StringFmtPrint, AgreesWithTheCLibrary) {
         };
         if (conversion == 's') {
             check(text);
+        } else if (isReal) {
+            check(static_cast<double>(value) / 0x1p31);
         } else if (wide) {
             check(value);
         } else {
