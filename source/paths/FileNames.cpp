@@ -68,6 +68,8 @@ MgErr MakeName(const PathRef& path, std::string& text, bool& shortcut) {
         if (text.size() >= kMaxDOSPathName) return kArgErr;
         shortcut = shortcut || IsShortcutName(name);
     }
+    // Behind a zero the system would not look, and take another item for the one that is meant.
+    if (text.find('\0') != std::string::npos) return kArgErr;
     return text.size() < kMaxDOSPathName ? kNoErr : kArgErr;
 }
 

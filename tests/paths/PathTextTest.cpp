@@ -231,6 +231,8 @@ TEST_F(PathText, NamesForTheSystem) {
     for (const PathRef& path : {Abs({}), Abs({"CC"}), Abs({"1"}), Rel({"C"}), PathRef(), Abs({"C", "con"}),
                                 Abs({"C", "lpt9", "x"}), Abs({"C", "a?b"}), Abs({"C", "x."}), Abs({".."})})
         EXPECT_EQ("1", made(path)) << Show(path);
+    for (const std::string& text : {std::string("C:\\dir\\a\0.txt", 13), std::string("\\\\s\0\\t\\x", 9)})
+        EXPECT_EQ("1", made(PathRef(text, PathRef::StringDisplay())));
     const auto ofLength = [](size_t length) { return Abs({"C", std::string(length - 3, 'x').c_str()}); };
     EXPECT_EQ(259u, made(ofLength(259)).size());
     EXPECT_EQ("1", made(ofLength(260)));
