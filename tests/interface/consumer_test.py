@@ -19,7 +19,7 @@ stage = f"{args.stage}-{os.getpid()}"
 try:
     prefix, tree = os.path.join(stage, "prefix"), os.path.join(stage, "build")
     run(args.cmake, "--install", args.build, "--prefix", prefix, stdout=subprocess.DEVNULL)
-    run(args.cmake, "-S", args.project, "-B", tree, f"-DCMAKE_PREFIX_PATH={os.path.abspath(prefix)}",
+    run(args.cmake, "-G", "Ninja", "-S", args.project, "-B", tree, f"-DCMAKE_PREFIX_PATH={os.path.abspath(prefix)}",
         f"-DCMAKE_CXX_COMPILER={args.cxx}")
     run(args.cmake, "--build", tree)
     answer = run(os.path.join(tree, "consumer"), capture_output=True, text=True).stdout
