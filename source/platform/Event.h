@@ -80,9 +80,6 @@ private:
     Watch* watches_ = nullptr; /* guarded by the one lock of all watches */
 };
 
-/* Signaled by the host when input for the thread that handles its messages has arrived. One for the process. */
-Event& MessageEvent() noexcept;
-
 }  // namespace tessel::platform
 
 #endif

@@ -27,6 +27,7 @@ struct ProcessorFacts {
     std::uint32_t packages; /* sockets of the machine, 1 when not known */
     std::uint64_t features; /* of the flags above */
     std::string model;      /* empty when not known */
+    std::string trouble;    /* why something is not known, for a report; mostly empty */
 };
 ProcessorFacts GetProcessorFacts();
 

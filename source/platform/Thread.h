@@ -43,7 +43,7 @@ bool ThreadExitCode(ThreadHandle thread, std::int32_t& code) noexcept;
 bool ThreadEnd(ThreadHandle thread, std::int32_t code) noexcept;
 
 /* Priorities on the scale of the host that the library was designed for: -15 idle, -2 to 2, 15 time critical. Where the
-   process may not raise a priority the number is refused (5), and the priority stays. */
+   process may not raise a priority the number is refused (5), and the priority stays. 6 for a thread that has ended. */
 bool ThreadSetPriority(ThreadHandle thread, std::int32_t priority) noexcept;
 bool ThreadGetPriority(ThreadHandle thread, std::int32_t& priority) noexcept;
 

@@ -3,6 +3,7 @@
 
 #include <memory>
 
+#include "platform/MessageEvent.h"
 #include "sync/HostEvent.h"
 
 namespace tessel {
@@ -27,7 +28,8 @@ int32 HostEvent::MsgWaitMultiple(PlatformEvent* other, bool pump, int32 millisec
     }
     if (pump) {
         messageIndex = count;
-        events[count++] = &platform::MessageEvent();
+        events[count++] = platform::OwnMessageEvent();
+        if (!events[messageIndex]) return kFailed;
     }
     int first = -1;
     platform::EventWait wait = platform::Event::WaitAny(events, static_cast<std::size_t>(count), milliseconds, first);

@@ -4,6 +4,8 @@
 
 #include <tessel/diagnostics/DebugStream.h>
 
+#include "platform/LastError.h"
+#include "platform/MessageEvent.h"
 #include "sync/HostEvent.h"
 #include "sync/PlainAllocation.h"
 #include "sync/Service.h"
@@ -145,8 +147,9 @@ int32 ThEventMsgWaitMultiple(ThEvent event, ThEvent second, int32 milliseconds, 
     return result == PlatformEvent::kSignaled && !messageArrived && !secondSignaled ? 1 : 0;
 }
 
-void ThEventMessageArrived(void) {
-    platform::MessageEvent().Set();
+MgErr ThEventMessageArrived(uint32 threadId) {
+    if (platform::SignalMessageEvent(threadId)) return kNoErr;
+    return platform::LastError() == platform::kErrorNotEnoughMemory ? kMemFullErr : kArgErr;
 }
 
 MgErr ThEventWaitAndPump(ThEvent event, ThEventPumpProc pump, int32 milliseconds, void* argument) {

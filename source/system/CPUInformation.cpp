@@ -37,7 +37,9 @@ private:
 
 class HostMachine final : public MachineDescription {
 public:
-    HostMachine() : facts_(platform::GetProcessorFacts()), features_(facts_) {}
+    HostMachine() : facts_(platform::GetProcessorFacts()), features_(facts_) {
+        if (!facts_.trouble.empty()) TESSEL_REPORT(kDebugWarning, 0x5D20B7E4u) << facts_.trouble;
+    }
     uint32 GetNumLogicalProcessors() const override { return facts_.logical; }
     uint32 GetNumCores() const override { return facts_.cores; }
     uint32 GetNumPackages() const override { return facts_.packages; }

@@ -16,6 +16,7 @@
 #include <tessel/sync/ThSleep.h>
 #include <tessel/time/Millisecs.h>
 
+#include "platform/Thread.h"
 #include "support/HandClock.h"
 #include "support/ReportRecorder.h"
 #include "support/malloc/FailingMalloc.h"
@@ -124,7 +125,16 @@ TEST_F(Sync, WaitsForSeveralThings) {
     EXPECT_EQ(1, ThEventMsgWaitMultiple(first, second, 1000, true));
     ThEventSignal(first);
     EXPECT_EQ(1, ThEventMsgWaitMultiple(first, first, 1000, false));
-    ThEventMessageArrived();
+    const uint32 self = platform::CurrentThreadId();
+    uint32 ended = 0;
+    std::thread([&] {
+        ended = platform::CurrentThreadId();
+        EXPECT_EQ(kNoErr, ThEventMessageArrived(ended));  // a message to another thread
+        EXPECT_EQ(kNoErr, ThEventMessageArrived(self));
+        EXPECT_EQ(0, ThEventMsgWaitMultiple(first, nullptr, -1, true));
+    }).join();
+    while (ThEventMessageArrived(ended) == kNoErr) std::this_thread::yield();  // until the host has let go of it
+    EXPECT_EQ(kArgErr, ThEventMessageArrived(ended));
     EXPECT_EQ(0, ThEventMsgWaitMultiple(first, nullptr, 0, false));
     EXPECT_EQ(0, ThEventMsgWaitMultiple(first, nullptr, -1, true));  // the message, or it would wait for ever
     std::thread signaler([&] { ThEventSignal(first); });

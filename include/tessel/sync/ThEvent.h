@@ -55,11 +55,14 @@ TESSEL_API MgErr ThEventWaitWithTimeout(ThEvent event, int32 milliseconds);
 TESSEL_API MgErr ThEventWait(ThEvent event);
 
 /* Waits for one of two events (the second may be null, or the first again) or, with pumpMessages, for a message to the
-   host. 1 only when the first event was signaled; 0 for the second, a message or a time-out. Null first event: 1. */
+   calling thread. 1 only when the first event was signaled; 0 for the second, a message or a time-out. Null first
+   event: 1. */
 TESSEL_API int32 ThEventMsgWaitMultiple(ThEvent event, ThEvent second, int32 milliseconds, bool pumpMessages);
 
-/* Tells those who wait with pumpMessages that a message has arrived. */
-TESSEL_API void ThEventMessageArrived(void);
+/* Tells a thread, by the host's number of it (platformId in its ThThread), that a message for it has arrived: its wait
+   with pumpMessages, the present or the next one, ends. Several before a wait count as one. kArgErr when there is no
+   such thread in the process. */
+TESSEL_API MgErr ThEventMessageArrived(uint32 threadId);
 
 /* Calls pump(argument) once. For a null event its result; else kMemFullErr: waiting while pumping is not available. */
 typedef MgErr (*ThEventPumpProc)(void* argument);

@@ -194,9 +194,4 @@ EventWait Event::WaitAny(Event* const* events, std::size_t count, std::int32_t m
     return first >= 0 ? EventWait::kTaken : slept;
 }
 
-Event& MessageEvent() noexcept {
-    static constinit Event event;
-    return event;
-}
-
 }  // namespace tessel::platform

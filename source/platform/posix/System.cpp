@@ -78,9 +78,10 @@ SystemVersion GetSystemVersion() {
 }
 
 ProcessorFacts GetProcessorFacts() {
-    ProcessorFacts facts{NumberOfProcessors(), 1, 1, Features(), {}};
+    ProcessorFacts facts{NumberOfProcessors(), 1, 1, Features(), {}, {}};
     std::string text, value, package;
-    ReadTextFile("/proc/cpuinfo", text);
+    if (!ReadTextFile("/proc/cpuinfo", text))
+        facts.trouble = "cannot read /proc/cpuinfo, error " + std::to_string(ErrorOfErrno(errno));
     std::set<std::string> packages, cores; /* a core's number counts within its package */
     ForEachLine(text, [&](std::string_view line) {
         if (facts.model.empty()) ValueOf(line, "model name", facts.model);

@@ -16,6 +16,7 @@
 #include "platform/Event.h"
 #include "platform/Mutex.h"
 #include "platform/posix/Errors.h"
+#include "platform/posix/Threads.h"
 
 namespace tessel::platform {
 
@@ -52,11 +53,11 @@ void Release(ThreadRecord* record) {
     delete record;
 }
 
-bool IsAlive(ThreadId id) {
-    return ::syscall(SYS_tgkill, ::getpid(), static_cast<pid_t>(id), 0) == 0 || errno != ESRCH;
-}
-
 }  // namespace
+
+bool IsThreadOfProcess(ThreadId thread) noexcept {
+    return ::syscall(SYS_tgkill, ::getpid(), static_cast<pid_t>(thread), 0) == 0;
+}
 
 ThreadId CurrentThreadId() noexcept {
     if (currentId == 0) {
@@ -190,7 +191,7 @@ ThreadHandle ThreadOpenCurrent() noexcept {
 
 bool ThreadRunning(ThreadHandle thread, bool& running) noexcept {
     if (!thread) return FailWith(kErrorInvalidHandle);
-    running = thread->started ? !thread->ended.load(std::memory_order_acquire) : IsAlive(thread->id);
+    running = thread->started ? !thread->ended.load(std::memory_order_acquire) : IsThreadOfProcess(thread->id);
     return true;
 }
 
@@ -206,7 +207,7 @@ namespace {
 /* Of a foreign thread the host tells no more than whether it is there. */
 bool AwaitForeign(const ThreadRecord& record, std::int32_t milliseconds) {
     std::uint32_t start = TickMilliseconds();
-    while (IsAlive(record.id)) {
+    while (IsThreadOfProcess(record.id)) {
         std::uint32_t passed = TickMilliseconds() - start;
         if (milliseconds >= 0 && passed >= static_cast<std::uint32_t>(milliseconds)) return FailWith(kErrorTimedOut);
         SleepMilliseconds(1);
@@ -251,10 +252,17 @@ struct PriorityRow {
 /* The documented priorities, and the host's: a lower one is more urgent there. */
 constexpr PriorityRow kPriorities[] = {{-15, 19}, {-2, 10}, {-1, 5}, {0, 0}, {1, -5}, {2, -10}, {15, -20}};
 
+/* The host names threads by number in these calls, and gives the number of one that has ended to the next, in whatever
+   process. */
+bool IsThere(ThreadHandle thread) {
+    bool running = false;
+    return ThreadRunning(thread, running) && running;
+}
+
 }  // namespace
 
 bool ThreadSetPriority(ThreadHandle thread, std::int32_t priority) noexcept {
-    if (!thread) return FailWith(kErrorInvalidHandle);
+    if (!IsThere(thread)) return FailWith(kErrorInvalidHandle);
     for (const PriorityRow& row : kPriorities) {
         if (row.priority == priority) return setpriority(PRIO_PROCESS, thread->id, row.nice) == 0 || FailErrno();
     }
@@ -262,7 +270,7 @@ bool ThreadSetPriority(ThreadHandle thread, std::int32_t priority) noexcept {
 }
 
 bool ThreadGetPriority(ThreadHandle thread, std::int32_t& priority) noexcept {
-    if (!thread) return FailWith(kErrorInvalidHandle);
+    if (!IsThere(thread)) return FailWith(kErrorInvalidHandle);
     errno = 0;
     int nice = getpriority(PRIO_PROCESS, thread->id);
     if (errno != 0) return FailErrno();
