@@ -153,6 +153,7 @@ MgErr ThEventMessageArrived(uint32 threadId) {
 }
 
 MgErr ThEventWaitAndPump(ThEvent event, ThEventPumpProc pump, int32 milliseconds, void* argument) {
+    const bool isEvent = IsEvent(event);
     MgErr pumped = pump ? pump(argument) : kNoErr;
-    return IsEvent(event) ? event->platformEvent->WaitAndPump(pump, argument, milliseconds) : pumped;
+    return isEvent ? event->platformEvent->WaitAndPump(pump, argument, milliseconds) : pumped;
 }
