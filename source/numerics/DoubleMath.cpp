@@ -52,15 +52,17 @@ Pair Sum(const Pair& a, const Pair& b) {
 
 Pair Quotient(const Pair& a, const Pair& b) {
     const double quotient = a.high / b.high;
+    const double inverse = 1 / b.high;  // for the rest, without waiting for it
     const Pair product = ExactProduct(quotient, b.high);
     const double rest = ((a.high - product.high) - product.low) + (a.low - quotient * b.low);
-    return {quotient, rest / b.high};
+    return {quotient, rest * inverse};
 }
 
 Pair SquareRoot(const Pair& x) {
     const double root = std::sqrt(x.high);
+    const double inverse = 0.5 / root;
     const Pair square = ExactProduct(root, root);
-    return {root, (((x.high - square.high) - square.low) + x.low) / (2 * root)};
+    return {root, (((x.high - square.high) - square.low) + x.low) * inverse};
 }
 
 Pair Square(double x) {
@@ -109,9 +111,10 @@ constexpr Pair kLn2InUnits = SplitAt(kLn2, kLogUnit);
 // What ln(1 + r) has beyond the high part of r; |r| is at most 1/128.
 double LogTail(const Pair& r) {
     const double h = r.high;
-    const double high = 1.0 / 6 - h * (1.0 / 7 - h * (1.0 / 8 - h * (1.0 / 9)));
-    const double series = 1.0 / 3 - h * (1.0 / 4 - h * (1.0 / 5 - h * high));
-    return r.low * (1 - h) + h * h * (h * series - 0.5);
+    const double hh = h * h;
+    const double high = (1.0 / 7 - h * (1.0 / 8)) + hh * (1.0 / 9);
+    const double series = (1.0 / 3 - h * (1.0 / 4)) + hh * ((1.0 / 5 - h * (1.0 / 6)) + hh * high);
+    return (r.low - r.low * h) + (h * hh * series - 0.5 * hh);
 }
 
 // ln(x + rest), x being positive and finite and rest far smaller.
