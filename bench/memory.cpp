@@ -53,6 +53,13 @@ void MallocAndFree(std::uint64_t operations) {
     }
 }
 
+// Registers only: what two threads of it gain is what the machine has to give.
+void CountUp(std::uint64_t operations) {
+    std::uint64_t sum = 0;
+    for (std::uint64_t i = 0; i < operations; ++i) asm volatile("" : "+r"(sum));
+    Keep(sum);
+}
+
 // Runs `operations` of the loop on each of two threads at once; the seconds from the start to the later end.
 double OnTwoThreads(const Loop& loop, std::uint64_t operations) {
     std::atomic<int> ready{0};
@@ -346,6 +353,9 @@ int RunAll() {
     table.Row("the same, 1,000,000 live handles", tracked["live1000000"] * 1e-9, "LeakSanitizer, same depth", sanitizer,
               1.0);
     table.Row("the same, 2 threads (time / 2)", tracked["two"] * 1e-9, "its own single thread", tracked["one"] * 1e-9,
+              1 / 1.7);
+    Scaling machine = MeasureScaling(CountUp);
+    table.Row("2 threads that share nothing, on this machine", machine.two, "their own single thread", machine.one,
               1 / 1.7);
 
     CompareSizes(table);

@@ -1,5 +1,8 @@
 #include "diagnostics/AllocRecords.h"
 
+#include <algorithm>
+#include <bit>
+
 #include "platform/Thread.h"
 
 namespace tessel {
@@ -65,7 +68,16 @@ bool AllocRecords::Grow(Shard& shard, TrackerFailure& failure) {
 AllocRecords::Insertion AllocRecords::Insert(uintptr_t address, const CallSite* site, uint64 number, uint32 size,
                                              AllocRecord& earlier, TrackerFailure& failure) {
     const Place place(address);
-    Shard& shard = ShardOf(place);
+    bool isMore = false;
+    const Insertion result =
+        InsertInto(ShardOf(place), place, {address, site, number, size, 0}, earlier, isMore, failure);
+    if (isMore) TakeRoom(size);
+    return result;
+}
+
+// `isMore`: it does not fit into the room of the shard.
+AllocRecords::Insertion AllocRecords::InsertInto(Shard& shard, Place place, const AllocRecord& record,
+                                                 AllocRecord& earlier, bool& isMore, TrackerFailure& failure) {
     ShardHolder hold(shard.lock);
     // At most three quarters are taken.
     if ((!shard.slots || 4 * uint64{shard.counts.live + 1} > 3 * (uint64{shard.mask} + 1)) && !Grow(shard, failure))
@@ -75,13 +87,46 @@ AllocRecords::Insertion AllocRecords::Insert(uintptr_t address, const CallSite* 
         earlier = *slot;
         return Insertion::kDuplicate;
     }
-    *slot = {address, site, number, size, 0};
+    *slot = record;
     ++shard.counts.made;
-    shard.counts.bytesMade += size;
-    shard.counts.bytes += size;
+    shard.counts.bytesMade += record.size;
+    shard.counts.bytes += record.size;
     ++shard.counts.live;
     ++shard.counts.unreported;
+    isMore = !shard.room.Take(record.size);
     return Insertion::kDone;
+}
+
+bool AllocRecords::Room::Take(uint32 size) {
+    if (records == 0 || bytes < size) return false;
+    --records;
+    bytes -= size;
+    return true;
+}
+
+void AllocRecords::GiveRoom(Shard& shard, uint32 size) {
+    ++shard.room.records;
+    shard.room.bytes += size;
+    const uint64 bit = uint64{1} << (&shard - shards_);
+    if (!(withRoom_.load(std::memory_order_relaxed) & bit)) withRoom_.fetch_or(bit, std::memory_order_relaxed);
+}
+
+// From all shards; what they do not have there has never been.
+void AllocRecords::TakeRoom(uint32 size) {
+    ShardHolder hold(mostLock_);
+    if (room_.Take(size)) return;
+    for (uint64 bits = withRoom_.exchange(0, std::memory_order_relaxed); bits != 0; bits &= bits - 1) {
+        Shard& shard = shards_[std::countr_zero(bits)];
+        ShardHolder holdShard(shard.lock);
+        room_.records += shard.room.records;
+        room_.bytes += shard.room.bytes;
+        shard.room = {};
+    }
+    const uint64 records = std::min<uint64>(room_.records, 1), bytes = std::min<uint64>(room_.bytes, size);
+    room_.records -= records;
+    room_.bytes -= bytes;
+    most_.records += 1 - records;
+    most_.bytes += size - bytes;
 }
 
 bool AllocRecords::Remove(uintptr_t address) {
@@ -94,6 +139,7 @@ bool AllocRecords::Remove(uintptr_t address) {
     --shard.counts.live;
     shard.counts.unreported -= !found->reported;
     shard.counts.bytes -= found->size;
+    GiveRoom(shard, found->size);
     // Those behind it move up where their place allows it, so that no search is cut short.
     auto hole = static_cast<uint32>(found - shard.slots);
     for (uint32 next = hole;;) {
@@ -128,6 +174,9 @@ AllocRecords::Counts AllocRecords::Count() {
         counts.live += shard.counts.live;
         counts.unreported += shard.counts.unreported;
     }
+    ShardHolder hold(mostLock_);
+    counts.mostLive = most_.records;
+    counts.mostBytes = most_.bytes;
     return counts;
 }
 
@@ -149,12 +198,13 @@ void AllocRecords::Clear() {
     }
 }
 
-size_t AllocRecords::CopyUnreported(AllocRecord* records, size_t capacity) {
+size_t AllocRecords::Copy(Which which, AllocRecord* records, size_t capacity) {
     size_t count = 0;
     for (Shard& shard : shards_) {
         ShardHolder hold(shard.lock);
         for (uint32 i = 0; shard.slots && i <= shard.mask && count < capacity; ++i)
-            if (shard.slots[i].address && !shard.slots[i].reported) records[count++] = shard.slots[i];
+            if (shard.slots[i].address && (which == Which::kAll || !shard.slots[i].reported))
+                records[count++] = shard.slots[i];
     }
     return count;
 }

@@ -49,6 +49,8 @@ public:
         uint64 made;  // ever, the dead included
         uint64 bytesMade;
         uint64 bytes;
+        uint64 mostLive;  // that ever lived at a time
+        uint64 mostBytes;
         uint32 live;
         uint32 unreported;
     };
@@ -56,26 +58,44 @@ public:
     void MarkAllReported();
     void Clear();
 
-    // Copies unreported records, at most `capacity`; returns how many.
-    size_t CopyUnreported(AllocRecord* records, size_t capacity);
+    // Copies records, all or the unreported, at most `capacity`; returns how many.
+    enum class Which { kAll, kUnreported };
+    size_t Copy(Which which, AllocRecord* records, size_t capacity);
 
 private:
-    static constexpr int kShardBits = 6;
+    static constexpr int kShardBits = 6;  // a bit for each shard fits into a word
 
+    // What can be added before there is more than ever. That of a shard is what was removed from it. So a thread that
+    // makes and releases in turn raises no total that others share, and still none is missed.
+    struct Room {
+        uint64 records = 0;
+        uint64 bytes = 0;
+        bool Take(uint32 size);
+    };
     struct alignas(64) Shard {
         SpinLock lock;    // guards the rest
         uint32 mask = 0;  // slots - 1
         AllocRecord* slots = nullptr;
         Counts counts{};
+        Room room;
     };
     struct Place;
 
     static AllocRecord* Look(const Shard& shard, Place place);
     bool Grow(Shard& shard, TrackerFailure& failure);
     Shard& ShardOf(Place place);
+    Insertion InsertInto(Shard& shard, Place place, const AllocRecord& record, AllocRecord& earlier, bool& isMore,
+                         TrackerFailure& failure);
+    void GiveRoom(Shard& shard, uint32 size);
+    void TakeRoom(uint32 size);
 
     TrackerHeap& heap_;
     Shard shards_[1 << kShardBits];
+    std::atomic<uint64> withRoom_{0};  // a bit for each shard that has room
+
+    SpinLock mostLock_;  // guards the rest; locks of shards are taken inside
+    Room most_;          // that ever lived at a time
+    Room room_;          // that of no shard
 };
 
 }  // namespace tessel

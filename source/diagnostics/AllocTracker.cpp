@@ -4,6 +4,7 @@
 #include <cstdarg>
 #include <cstdio>
 #include <cstdlib>
+#include <cstring>
 
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/diagnostics/StackChain.h>
@@ -127,10 +128,42 @@ void AllocTracker::Implementation::DumpAll(AllocDumper& dumper) {
     auto* const records = static_cast<AllocRecord*>(heap_.Allocate(capacity * sizeof(AllocRecord), failure));
     if (records) {
         CallSites::Reporting reporting(sites_);
-        WriteAll(dumper, records, records_.CopyUnreported(records, capacity));
+        WriteAll(dumper, records, records_.Copy(AllocRecords::Which::kUnreported, records, capacity));
         heap_.Release(records, failure);
     }
     if (failure != TrackerFailure::kNone) Deactivate(failure);
+}
+
+int32 AllocTracker::Implementation::GetSites(Site* sites, int32 capacity) {
+    if (IsIdle()) return 0;
+    TrackerFailure failure = TrackerFailure::kNone;
+    const size_t room = records_.Count().live;
+    auto* const records = static_cast<AllocRecord*>(heap_.Allocate(room * sizeof(AllocRecord), failure));
+    int32 count = 0;
+    if (records) {
+        count = CountSites(records, records_.Copy(AllocRecords::Which::kAll, records, room), sites, capacity);
+        heap_.Release(records, failure);
+    }
+    if (failure != TrackerFailure::kNone) Deactivate(failure);
+    return count;
+}
+
+int32 AllocTracker::Implementation::CountSites(AllocRecord* records, size_t count, Site* sites, int32 capacity) {
+    const auto order = [](const AllocRecord& a, const AllocRecord& b) {
+        const int files = std::strcmp(a.site->file, b.site->file);
+        return files != 0 ? files < 0 : a.site->line < b.site->line;
+    };
+    std::sort(records, records + count, order);
+    int32 found = 0;
+    for (size_t i = 0; i < count; ++found) {
+        Site site{records[i].site->file, records[i].site->line, 0, 0};
+        for (const AllocRecord& first = records[i]; i < count && !order(first, records[i]); ++i) {
+            ++site.live;
+            site.bytes += records[i].size;
+        }
+        if (found < capacity) sites[found] = site;
+    }
+    return found;
 }
 
 void AllocTracker::Implementation::WriteAll(AllocDumper& dumper, AllocRecord* records, size_t count) {
@@ -258,7 +291,11 @@ void AllocTracker::MarkAllReported() {
 AllocTracker::Totals AllocTracker::GetTotals() {
     if (!implementation_) return {};
     const auto counts = implementation_->Count();
-    return {counts.made, counts.bytesMade, counts.live, counts.bytes};
+    return {counts.made, counts.bytesMade, counts.live, counts.bytes, counts.mostLive, counts.mostBytes};
+}
+
+int32 AllocTracker::GetSites(Site* sites, int32 capacity) {
+    return implementation_ ? implementation_->GetSites(sites, capacity) : 0;
 }
 
 }  // namespace tessel

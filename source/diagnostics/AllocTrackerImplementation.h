@@ -22,6 +22,7 @@ public:
     void DumpAll(AllocDumper& dumper);
     void DumpOne(uintptr_t address, AllocDumper& dumper);
     bool IsTracked(uintptr_t address);
+    int32 GetSites(Site* sites, int32 capacity);
     void MarkAllReported() { records_.MarkAllReported(); }
 
 private:
@@ -31,6 +32,7 @@ private:
     void ReportDuplicate(const AllocRecord& earlier);
     void Deactivate(TrackerFailure failure);
     void WriteAll(AllocDumper& dumper, AllocRecord* records, size_t count);
+    static int32 CountSites(AllocRecord* records, size_t count, Site* sites, int32 capacity);
     void WriteRecord(AllocDumper& dumper, const AllocRecord& record);
 
     TrackerHeap heap_;

@@ -245,14 +245,21 @@ TEST(AllocTracking, CanBeTurnedOff) {
 TEST_F(AllocTrackerTest, AgreesWithAModel) {
     std::mt19937 random(7);
     std::map<uintptr_t, uint32> model;
+    uint64 live = 0, mostLive = 0, mostBytes = 0;
     for (int step = 0; step < 60000; ++step) {
         const uintptr_t address = 0x7f0000000000u % (uintptr_t(-1) / 2) + 16 * (random() % 4000);
         if (step % 20000 < 12000 ? random() % 3 != 0 : random() % 3 == 0) {
-            if (!model.count(address)) tracker.AddRecord(At(address), model[address] = random() % 1000, "f.cpp", step);
+            if (!model.count(address)) {
+                live += model[address] = random() % 1000;
+                tracker.AddRecord(At(address), model[address], "f.cpp", step);
+            }
         } else {
+            if (model.count(address)) live -= model[address];
             model.erase(address);
             tracker.RemoveRecord(At(address));
         }
+        mostLive = std::max<uint64>(mostLive, model.size());
+        mostBytes = std::max(mostBytes, live);
         ASSERT_EQ(model.count(address) != 0, tracker.IsTracked(At(address)));
     }
     uint64 bytes = 0;
@@ -262,6 +269,28 @@ TEST_F(AllocTrackerTest, AgreesWithAModel) {
     }
     EXPECT_EQ(static_cast<int32>(model.size()), tracker.CountLive());
     EXPECT_EQ(bytes, tracker.GetTotals().bytesLive);
+    EXPECT_EQ(mostLive, tracker.GetTotals().mostLive);
+    EXPECT_EQ(mostBytes, tracker.GetTotals().mostBytesLive);
+}
+
+TEST_F(AllocTrackerTest, TellsHowMuchEachLineHolds) {
+    const struct {
+        uintptr_t address;
+        const char* file;
+        int32 line;
+    } made[] = {{0x10, "b.cpp", 7}, {0x20, "a.cpp", 9}, {0x30, "b.cpp", 7}, {0x40, "b.cpp", 2}, {0x50, "a.cpp", 1}};
+    for (const auto& each : made) tracker.AddRecord(At(each.address), 100, each.file, each.line);
+    tracker.RemoveRecord(At(0x50));
+    tracker.MarkAllReported();
+    AllocTracker::Site sites[3] = {};
+    EXPECT_EQ(3, tracker.GetSites(sites, 2));
+    EXPECT_EQ(nullptr, sites[2].file);
+    EXPECT_EQ(3, tracker.GetSites(sites, 3));
+    std::string text;
+    for (const auto& site : sites)
+        text += std::string(site.file) + ':' + std::to_string(site.line) + ' ' + std::to_string(site.live) + ' ' +
+                std::to_string(site.bytes) + '\n';
+    EXPECT_EQ("a.cpp:9 1 100\nb.cpp:2 1 100\nb.cpp:7 2 200\n", text);
 }
 
 TEST_F(AllocTrackerTest, ThreadsMakeAndReleaseTogether) {
@@ -278,8 +307,12 @@ TEST_F(AllocTrackerTest, ThreadsMakeAndReleaseTogether) {
     tracker.DumpAll(&during);
     for (auto& thread : threads) thread.join();
     EXPECT_EQ(static_cast<int32>(kThreads), tracker.CountLive());
-    EXPECT_EQ(kThreads * kEach, tracker.GetTotals().made);
-    EXPECT_EQ(kThreads * kEach, tracker.GetTotals().bytesMade);
+    const auto totals = tracker.GetTotals();
+    EXPECT_EQ(kThreads * kEach, totals.made);
+    EXPECT_EQ(kThreads * kEach, totals.bytesMade);
+    EXPECT_GE(totals.mostLive, kEach);
+    EXPECT_LE(totals.mostLive, totals.made);
+    EXPECT_EQ(totals.mostLive, totals.mostBytesLive) << "each is one byte";
 }
 
 // ---- running out of memory ------------------------------------------------------------------------------------------

@@ -117,14 +117,27 @@ public:
     /// Leaves every record made until now out of later counts of unreported records, and out of dumps.
     virtual void MarkAllReported();
 
-    /// Records and bytes, ever and now.
+    /// Records and bytes: ever, now, and the most there were at a time.
     struct Totals {
         uint64 made;
         uint64 bytesMade;
         uint64 live;
         uint64 bytesLive;
+        uint64 mostLive;
+        uint64 mostBytesLive;
     };
     Totals GetTotals();
+
+    /// What lives of the objects made at one line. The file name is the tracker's.
+    struct Site {
+        const char* file;
+        int32 line;
+        uint32 live;
+        uint64 bytes;
+    };
+    /// Stores the sites of what lives now, ordered by file and line, at most `capacity`; returns how many there are. 0
+    /// also when memory runs out.
+    int32 GetSites(Site* sites, int32 capacity);
 
 private:
     class Implementation;
