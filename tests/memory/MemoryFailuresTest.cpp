@@ -1,6 +1,7 @@
 // What happens when memory runs out at any point, when threads meet, and when something is left.
 #include <gmock/gmock.h>
 
+#include <cstdlib>
 #include <cstring>
 #include <functional>
 #include <memory>
@@ -237,48 +238,128 @@ TEST(ScopedTracking, ReportsWhatIsLeft) {
     EXPECT_THAT(memory.reports.Texts(), IsEmpty());
 }
 
+// What a thread does with its own handles, tracked blocks and cookies of a jar that all share.
+class Worker {
+public:
+    Worker(uint32 seed, MagicCookieJar jar) : seed_(seed), jar_(jar) {}
+
+    // The number of results that were wrong.
+    int Run(uint32 rounds) {
+        for (uint32 i = 0; i < rounds; ++i) {
+            Slot& slot = slots_[(i * 7 + seed_) % kSlots];
+            if (slot.handle)
+                Empty(slot, i);
+            else
+                Fill(slot, i);
+            if (i % 500 == 0) {
+                uint32 words[3];
+                Expect(DSMemStatsSlow(words) == kNoErr && DSHeapCheck(0) == kNoErr);
+            }
+        }
+        for (Slot& slot : slots_)
+            if (slot.handle) Empty(slot, 1);
+        return wrong_;
+    }
+
+private:
+    static constexpr uint32 kSlots = 40;
+    struct Slot {
+        UHandle handle = nullptr;
+        uint8* block = nullptr;
+        MagicCookie cookie = 0;
+    };
+
+    void Fill(Slot& slot, uint32 i) {
+        slot.handle = DSNewHandle(i % 300 + 1);
+        **slot.handle = static_cast<uint8>(seed_);
+        DSDisposePtr(DSNewPtr(i % 100));
+        slot.block = static_cast<uint8*>(TrackedMalloc(i % 70 + 1));
+        *slot.block = static_cast<uint8>(i);
+        void* info = slot.block;
+        slot.cookie = MCNewCookie(jar_, &info);
+        Expect(slot.cookie != 0);
+    }
+    void Empty(Slot& slot, uint32 i) {
+        Expect(DSCheckHandle(slot.handle) == kNoErr && **slot.handle == static_cast<uint8>(seed_));
+        Expect(DSSetHandleSize(slot.handle, i % 500 + 1) == kNoErr && **slot.handle == static_cast<uint8>(seed_));
+        Expect(DSDisposeHandle(slot.handle) == kNoErr);
+        void* info = nullptr;
+        Expect(MCGetCookieInfo(jar_, slot.cookie, &info) == kNoErr && info == slot.block);
+        Expect(MCDisposeCookie(jar_, slot.cookie, nullptr) == kNoErr);
+        Expect(MCGetCookieInfo(jar_, slot.cookie, &info) == kArgErr);
+        TrackedFree(slot.block);
+        slot = Slot();
+    }
+    void Expect(bool right) { wrong_ += !right; }
+
+    uint32 seed_;
+    MagicCookieJar jar_;
+    Slot slots_[kSlots];
+    int wrong_ = 0;
+};
+
 // Counts and contents are exact while others create, resize, check and dispose, and walks go on.
+// TESSEL_TEST_MEMORY_ROUNDS: how often each thread does so (1,500).
 TEST(MemoryThreads, DoNotDisturbEachOther) {
-    constexpr uint32 kThreads = 8, kRounds = 1500, kHandles = 40;
+    constexpr uint32 kThreads = 8;
+    const char* wanted = std::getenv("TESSEL_TEST_MEMORY_ROUNDS");
+    const uint32 rounds = wanted ? static_cast<uint32>(std::atoi(wanted)) : 1500;
     test::StartedMemory memory;
     uint64 before = heap::TotalAllocated();
+    MagicCookieJar jar = MCNewJar();
     const uint32 zeros[4] = {};
     DSSetCounters(zeros);
     std::atomic<int> wrong{0};
-    auto work = [&](uint32 seed) {
-        UHandle handles[kHandles] = {};
-        for (uint32 i = 0; i < kRounds; ++i) {
-            UHandle& h = handles[(i * 7 + seed) % kHandles];
-            if (h) {
-                if (DSCheckHandle(h) != kNoErr || **h != static_cast<uint8>(seed)) ++wrong;
-                if (DSSetHandleSize(h, i % 500 + 1) != kNoErr || **h != static_cast<uint8>(seed)) ++wrong;
-                if (DSDisposeHandle(h) != kNoErr) ++wrong;
-                h = nullptr;
-            } else {
-                h = DSNewHandle(i % 300 + 1);
-                **h = static_cast<uint8>(seed);
-                DSDisposePtr(DSNewPtr(i % 100));
-            }
-            if (i % 500 == 0) {
-                uint32 words[3];
-                if (DSMemStatsSlow(words) != kNoErr || DSHeapCheck(0) != kNoErr) ++wrong;
-            }
-        }
-        for (UHandle h : handles) DSDisposeHandle(h);
-    };
     std::vector<std::thread> threads;
-    for (uint32 i = 0; i < kThreads; ++i) threads.emplace_back(work, i);
+    for (uint32 i = 0; i < kThreads; ++i) threads.emplace_back([&, i] { wrong += Worker(i, jar).Run(rounds); });
     for (std::thread& thread : threads) thread.join();
     EXPECT_EQ(0, wrong);
-    EXPECT_EQ(before, heap::TotalAllocated());
+    int32 cookies = -1;
+    EXPECT_EQ(kNoErr, MCJarSize(jar, &cookies));
+    EXPECT_EQ(0, cookies);
     uint32 counters[4];
     DSReadCounters(counters);
-    // Each of the slots a thread uses is filled and emptied in turn.
-    uint32 resizes = counters[2], creations = counters[0];
-    EXPECT_EQ(kThreads * kRounds, creations + resizes);
-    EXPECT_GE(counters[1], creations);  // and those of the checks
-    EXPECT_THAT(memory.reports.Texts(kDebugError), IsEmpty());
-    EXPECT_THAT(memory.reports.Texts(kDebugFatal), IsEmpty());
+    // Each handle is resized once, and each round fills a slot or empties one; then the rest is emptied.
+    EXPECT_EQ(counters[0], counters[2]);
+    EXPECT_GE(counters[0], kThreads * rounds / 2);
+    EXPECT_LE(counters[0], kThreads * rounds / 2 + kThreads * 40);
+    EXPECT_GE(counters[1], counters[0]);  // and those of the checks and the jar
+    MCDisposeJar(jar);
+    EXPECT_EQ(before, heap::TotalAllocated());
+    memory.Stop();
+    for (const char* none : {"Total Handle Leaks = 0.\n", "Total Pointer Leaks = 0.\n", "Total new/delete leaks = 0.\n",
+                             "Recovered 0 Handles for 0 bytes."})
+        EXPECT_TRUE(memory.reports.Has(kDebugInfo, none)) << none;
+    EXPECT_EQ(0u, memory.reports.CountAt(kDebugError) + memory.reports.CountAt(kDebugFatal));
+}
+
+// ---- misuse ---------------------------------------------------------------------------------------------------------
+
+TEST(StaleHandle, IsRefusedByEveryOperationAndItsTracesAreFound) {
+    test::StartedMemory memory;
+    UHandle next = DSNewHandle(8), stale = DSNewHandle(8);
+    void* foreign = &next;
+    DSDisposeHandle(next);
+    EXPECT_EQ(kNoErr, DSDisposeHandle(stale));
+    for (UHandle bad : {stale, static_cast<UHandle>(foreign)}) {
+        UHandle copy = nullptr;
+        EXPECT_EQ(kHandleErr, DSDisposeHandle(bad));
+        EXPECT_EQ(kHandleErr, DSSetHandleSize(bad, 20));
+        EXPECT_EQ(kHandleErr, DSCopyHandle(&copy, bad));
+        EXPECT_EQ(nullptr, copy);
+        EXPECT_EQ(kHandleErr, DSPtrAndHand("x", bad, 1));
+        EXPECT_EQ(kHandleErr, DSHandAndHand(bad, bad));
+        EXPECT_EQ(0u, DSGetHandleSize(bad));
+    }
+    memory.reports.Clear();
+    // A write through the stale handle goes into a free master pointer.
+    SetMemoryDebugger(true);
+    uint8 saved = **stale;
+    **stale = static_cast<uint8>(saved ^ 0x40);
+    EXPECT_EQ(kNoErr, DSHeapCheck(0));
+    **stale = saved;
+    SetMemoryDebugger(false);
+    EXPECT_THAT(memory.reports.Texts(kDebugFatal), ElementsAre("freemaster chain isn't NULL terminated!"));
 }
 
 // ---- block utilities ------------------------------------------------------------------------------------------------
