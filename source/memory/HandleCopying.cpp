@@ -23,6 +23,10 @@ void Copy(const void* from, UHandle to, uint32 at, uint32 size) {
     if (size != 0) std::memmove(*to + at, from, size);
 }
 
+}  // namespace
+
+namespace tessel {
+
 MgErr CopyHandle(UHandle* destination, UHandle source, const void* frame) {
     if (!destination) return kArgErr;
     if (!source) return DSDisposeHandleAndNull(destination);
@@ -62,27 +66,17 @@ MgErr SetHandleFromPtr(UHandle* h, const void* p, uint32 size, const void* frame
     return err;
 }
 
-}  // namespace
+}  // namespace tessel
 
-// The twins stand together here, so that a handle is known by who called either.
 MgErr DSCopyHandle(UHandle* destination, UHandle source) {
-    return CopyHandle(destination, source, TESSEL_THIS_FRAME);
-}
-MgErr AZCopyHandle(UHandle* destination, UHandle source) {
     return CopyHandle(destination, source, TESSEL_THIS_FRAME);
 }
 
 MgErr DSHandToHand(UHandle* h) {
     return HandToHand(h, TESSEL_THIS_FRAME);
 }
-MgErr AZHandToHand(UHandle* h) {
-    return HandToHand(h, TESSEL_THIS_FRAME);
-}
 
 MgErr DSPtrToHand(const void* p, UHandle* h, uint32 size) {
-    return PtrToHand(p, h, size, TESSEL_THIS_FRAME);
-}
-MgErr AZPtrToHand(const void* p, UHandle* h, uint32 size) {
     return PtrToHand(p, h, size, TESSEL_THIS_FRAME);
 }
 
@@ -93,9 +87,6 @@ MgErr DSPtrToXHand(const void* p, UHandle h, uint32 size) {
 }
 
 MgErr DSSetHandleFromPtr(UHandle* h, const void* p, uint32 size) {
-    return SetHandleFromPtr(h, p, size, TESSEL_THIS_FRAME);
-}
-MgErr AZSetHandleFromPtr(UHandle* h, const void* p, uint32 size) {
     return SetHandleFromPtr(h, p, size, TESSEL_THIS_FRAME);
 }
 

@@ -33,6 +33,11 @@ UPtr CreatePtr(uint32 size, bool clear, const void* frame);
 // For a null handle stored at `h`, else its size is set; reports under the operation's name.
 MgErr ResizeOrCreate(UHandle* h, uint32 size, bool clear, const char* operation, const void* frame);
 
+MgErr CopyHandle(UHandle* destination, UHandle source, const void* frame);
+MgErr HandToHand(UHandle* h, const void* frame);
+MgErr PtrToHand(const void* p, UHandle* h, uint32 size, const void* frame);
+MgErr SetHandleFromPtr(UHandle* h, const void* p, uint32 size, const void* frame);
+
 // Returns the error after reporting "Memory error 3 in DSDisposeHandle"; 0 is not reported.
 MgErr ReportMemoryError(MgErr err, const char* operation);
 

@@ -1,5 +1,5 @@
-// The second names: each does what the operation of the same ending does. Those that copy stand with their twins in
-// HandleCopying.cpp.
+// The second names: each does what the operation of the same ending does. Those that create do not call it, so that
+// leak reports begin with their own caller.
 #include "memory/Handles.h"
 
 using namespace tessel;
@@ -31,8 +31,20 @@ MgErr AZSetHandleSize(UHandle h, uint32 size) {
 MgErr AZSetHSzClr(UHandle h, uint32 size) {
     return DSSetHSzClr(h, size);
 }
+MgErr AZCopyHandle(UHandle* destination, UHandle source) {
+    return CopyHandle(destination, source, TESSEL_THIS_FRAME);
+}
+MgErr AZHandToHand(UHandle* h) {
+    return HandToHand(h, TESSEL_THIS_FRAME);
+}
+MgErr AZPtrToHand(const void* p, UHandle* h, uint32 size) {
+    return PtrToHand(p, h, size, TESSEL_THIS_FRAME);
+}
 MgErr AZPtrToXHand(const void* p, UHandle h, uint32 size) {
     return DSPtrToXHand(p, h, size);
+}
+MgErr AZSetHandleFromPtr(UHandle* h, const void* p, uint32 size) {
+    return SetHandleFromPtr(h, p, size, TESSEL_THIS_FRAME);
 }
 MgErr AZPtrAndHand(const void* p, UHandle h, uint32 size) {
     return DSPtrAndHand(p, h, size);
