@@ -8,7 +8,8 @@
 
    `/` serves as `\`. A name that begins with one separator lies on the drive of the current folder, any other name
    without a drive in the current folder. Names are matched exactly first, then without regard to case by listing the
-   folder, component by component; an exact match never costs a listing.
+   folder, component by component; an exact match never costs a listing. `.` and `..` in a name with a drive or a share
+   are taken out of the text, and a `..` at the root stays at the root.
 
    Functions that make texts may throw std::bad_alloc. Any thread. */
 #ifndef TESSEL_PLATFORM_DRIVETABLE_H

@@ -41,6 +41,15 @@ TEST(DriveTable, TextsOfNames) {
         {"T:a", "/mnt/x/a", 0}, /* the current folder lies elsewhere */
         {"\\\\server\\share\\a", "/net/server/share/a", 0},
         {"dir\\a", "dir/a", 0},
+        /* no name leads out of its drive or its share */
+        {"T:\\..\\..\\etc\\.\\a\\..\\..\\.b", "/mnt/x/.b", 0},
+        {"T:..\\a", "/mnt/x/a", 0},
+        {"T:/a//../..", "/mnt/x", 0},
+        {"T:\\...\\..a", "/mnt/x/.../..a", 0},
+        {"\\\\server\\share\\..\\..\\a", "/net/server/share/a", 0},
+        {"\\\\..\\share", nullptr, kErrorNetworkPathNotFound},
+        {"\\\\server\\..\\a", nullptr, kErrorNetworkPathNotFound},
+        {"..\\a", "../a", 0},
         {"Q:\\a", nullptr, kErrorPathNotFound},
         {"", nullptr, kErrorInvalidName},
         {"\\\\", nullptr, kErrorNetworkPathNotFound},

@@ -131,23 +131,48 @@ bool Normalize(std::string_view name, std::string& text) {
     return true;
 }
 
+/* A name from a root on, without its `.` and `..`. They are taken out of the text, as they are meant in such names: a
+   `..` at the root stays there, so that no name leads out of its drive, and one behind a link leads back to before it.
+ */
+std::string WithoutDots(std::string_view name) {
+    if (name.find("/.") == std::string_view::npos) return std::string(name);
+    std::string plain;
+    while (!name.empty()) {
+        name.remove_prefix(1); /* the separator */
+        std::string_view part = name.substr(0, name.find('/'));
+        name.remove_prefix(part.size());
+        if (part == "..")
+            plain.resize(plain.empty() ? 0 : plain.rfind('/'));
+        else if (part != "." && !part.empty())
+            (plain += '/') += part;
+    }
+    return plain;
+}
+
+/* `//server/share/dir`: the root is the share. */
 bool NetworkName(const Table& table, std::string_view text, std::string& native) {
-    if (table.network.empty() || text.size() < 3 || text[2] == '/') return FailWith(kErrorNetworkPathNotFound);
+    std::size_t shareAt = std::min(text.find('/', 2), text.size());
+    std::size_t restAt = shareAt < text.size() ? std::min(text.find('/', shareAt + 1), text.size()) : text.size();
+    std::string_view server = text.substr(1, shareAt - 1), share = text.substr(shareAt, restAt - shareAt);
+    bool named = server.size() > 1 && server != "/." && server != "/.." && share != "/." && share != "/..";
+    if (table.network.empty() || !named) return FailWith(kErrorNetworkPathNotFound);
     native = table.network;
-    native += text.substr(1);
+    (native += server) += share;
+    native += WithoutDots(text.substr(restAt));
     return true;
 }
 
 /* `rest` is what stands behind the drive: absolute on it, or relative to the current folder if that lies there. */
 bool DriveName(const Table& table, int index, std::string_view rest, std::string& native) {
     if (index < 0 || !table.present[index]) return FailWith(kErrorPathNotFound);
-    native = table.folder[index];
+    const std::string& root = table.folder[index];
+    std::string below(rest);
     if (rest.empty() || rest[0] != '/') {
         std::string current = NativeCurrentFolder();
-        if (IsAtOrUnder(current, native)) native = current == "/" ? "" : current;
-        if (!rest.empty()) native += '/';
+        below = IsAtOrUnder(current, root) && current != "/" ? current.substr(root.size()) : "";
+        if (!rest.empty()) (below += '/') += rest;
     }
-    native += rest;
+    native = root + WithoutDots(below);
     return true;
 }
 
