@@ -11,11 +11,11 @@ namespace {
 constexpr uint32 kFirstSlots = 16;
 constexpr int kSpinsBeforeYield = 64;
 
-struct ShardHolder {
-    explicit ShardHolder(SpinLock& lock) : lock_(lock) { lock_.Lock(); }
-    ~ShardHolder() { lock_.Unlock(); }
-    ShardHolder(const ShardHolder&) = delete;
-    ShardHolder& operator=(const ShardHolder&) = delete;
+struct SpinLockHolder {
+    explicit SpinLockHolder(SpinLock& lock) : lock_(lock) { lock_.Lock(); }
+    ~SpinLockHolder() { lock_.Unlock(); }
+    SpinLockHolder(const SpinLockHolder&) = delete;
+    SpinLockHolder& operator=(const SpinLockHolder&) = delete;
 
 private:
     SpinLock& lock_;
@@ -78,7 +78,7 @@ AllocRecords::Insertion AllocRecords::Insert(uintptr_t address, const CallSite* 
 // `isMore`: it does not fit into the room of the shard.
 AllocRecords::Insertion AllocRecords::InsertInto(Shard& shard, Place place, const AllocRecord& record,
                                                  AllocRecord& earlier, bool& isMore, TrackerFailure& failure) {
-    ShardHolder hold(shard.lock);
+    SpinLockHolder hold(shard.lock);
     // At most three quarters are taken.
     if ((!shard.slots || 4 * uint64{shard.counts.live + 1} > 3 * (uint64{shard.mask} + 1)) && !Grow(shard, failure))
         return Insertion::kFailed;
@@ -97,7 +97,7 @@ AllocRecords::Insertion AllocRecords::InsertInto(Shard& shard, Place place, cons
     return Insertion::kDone;
 }
 
-bool AllocRecords::Room::Take(uint32 size) {
+bool AllocRecords::Amount::Take(uint32 size) {
     if (records == 0 || bytes < size) return false;
     --records;
     bytes -= size;
@@ -113,11 +113,11 @@ void AllocRecords::GiveRoom(Shard& shard, uint32 size) {
 
 // From all shards; what they do not have there has never been.
 void AllocRecords::TakeRoom(uint32 size) {
-    ShardHolder hold(mostLock_);
+    SpinLockHolder hold(mostLock_);
     if (room_.Take(size)) return;
     for (uint64 bits = withRoom_.exchange(0, std::memory_order_relaxed); bits != 0; bits &= bits - 1) {
         Shard& shard = shards_[std::countr_zero(bits)];
-        ShardHolder holdShard(shard.lock);
+        SpinLockHolder holdShard(shard.lock);
         room_.records += shard.room.records;
         room_.bytes += shard.room.bytes;
         shard.room = {};
@@ -132,7 +132,7 @@ void AllocRecords::TakeRoom(uint32 size) {
 bool AllocRecords::Remove(uintptr_t address) {
     const Place place(address);
     Shard& shard = ShardOf(place);
-    ShardHolder hold(shard.lock);
+    SpinLockHolder hold(shard.lock);
     if (!shard.slots) return false;
     AllocRecord* const found = Look(shard, place);
     if (!found->address) return false;
@@ -158,7 +158,7 @@ bool AllocRecords::Remove(uintptr_t address) {
 bool AllocRecords::Find(uintptr_t address, AllocRecord& record) {
     const Place place(address);
     Shard& shard = ShardOf(place);
-    ShardHolder hold(shard.lock);
+    SpinLockHolder hold(shard.lock);
     if (!shard.slots) return false;
     record = *Look(shard, place);
     return record.address != 0;
@@ -167,22 +167,24 @@ bool AllocRecords::Find(uintptr_t address, AllocRecord& record) {
 AllocRecords::Counts AllocRecords::Count() {
     Counts counts{};
     for (Shard& shard : shards_) {
-        ShardHolder hold(shard.lock);
+        SpinLockHolder hold(shard.lock);
         counts.made += shard.counts.made;
         counts.bytesMade += shard.counts.bytesMade;
         counts.bytes += shard.counts.bytes;
         counts.live += shard.counts.live;
         counts.unreported += shard.counts.unreported;
     }
-    ShardHolder hold(mostLock_);
-    counts.mostLive = most_.records;
-    counts.mostBytes = most_.bytes;
     return counts;
+}
+
+AllocRecords::Amount AllocRecords::Most() {
+    SpinLockHolder hold(mostLock_);
+    return most_;
 }
 
 void AllocRecords::MarkAllReported() {
     for (Shard& shard : shards_) {
-        ShardHolder hold(shard.lock);
+        SpinLockHolder hold(shard.lock);
         for (uint32 i = 0; shard.slots && i <= shard.mask; ++i) shard.slots[i].reported = 1;
         shard.counts.unreported = 0;
     }
@@ -191,7 +193,7 @@ void AllocRecords::MarkAllReported() {
 void AllocRecords::Clear() {
     TrackerFailure ignored = TrackerFailure::kNone;
     for (Shard& shard : shards_) {
-        ShardHolder hold(shard.lock);
+        SpinLockHolder hold(shard.lock);
         heap_.Release(shard.slots, ignored);
         shard.slots = nullptr;
         shard.counts = {};
@@ -201,7 +203,7 @@ void AllocRecords::Clear() {
 size_t AllocRecords::Copy(Which which, AllocRecord* records, size_t capacity) {
     size_t count = 0;
     for (Shard& shard : shards_) {
-        ShardHolder hold(shard.lock);
+        SpinLockHolder hold(shard.lock);
         for (uint32 i = 0; shard.slots && i <= shard.mask && count < capacity; ++i)
             if (shard.slots[i].address && (which == Which::kAll || !shard.slots[i].reported))
                 records[count++] = shard.slots[i];

@@ -49,12 +49,17 @@ public:
         uint64 made;  // ever, the dead included
         uint64 bytesMade;
         uint64 bytes;
-        uint64 mostLive;  // that ever lived at a time
-        uint64 mostBytes;
         uint32 live;
         uint32 unreported;
     };
     Counts Count();  // of the shards one after the other
+
+    struct Amount {
+        uint64 records = 0;
+        uint64 bytes = 0;
+        bool Take(uint32 size);  // one record of that size; false, and nothing is taken, when it is more than there is
+    };
+    Amount Most();  // that ever lived at a time
     void MarkAllReported();
     void Clear();
 
@@ -65,19 +70,14 @@ public:
 private:
     static constexpr int kShardBits = 6;  // a bit for each shard fits into a word
 
-    // What can be added before there is more than ever. That of a shard is what was removed from it. So a thread that
-    // makes and releases in turn raises no total that others share, and still none is missed.
-    struct Room {
-        uint64 records = 0;
-        uint64 bytes = 0;
-        bool Take(uint32 size);
-    };
     struct alignas(64) Shard {
         SpinLock lock;    // guards the rest
         uint32 mask = 0;  // slots - 1
         AllocRecord* slots = nullptr;
         Counts counts{};
-        Room room;
+        // What can be added before there is more than ever: what was removed from it. So a thread that makes and
+        // releases in turn raises no total that others share, and still no peak is missed.
+        Amount room;
     };
     struct Place;
 
@@ -93,9 +93,9 @@ private:
     Shard shards_[1 << kShardBits];
     std::atomic<uint64> withRoom_{0};  // a bit for each shard that has room
 
-    SpinLock mostLock_;  // guards the rest; locks of shards are taken inside
-    Room most_;          // that ever lived at a time
-    Room room_;          // that of no shard
+    alignas(64) SpinLock mostLock_;  // guards the rest; locks of shards are taken inside
+    Amount most_;
+    Amount room_;  // that of no shard
 };
 
 }  // namespace tessel

@@ -291,7 +291,8 @@ void AllocTracker::MarkAllReported() {
 AllocTracker::Totals AllocTracker::GetTotals() {
     if (!implementation_) return {};
     const auto counts = implementation_->Count();
-    return {counts.made, counts.bytesMade, counts.live, counts.bytes, counts.mostLive, counts.mostBytes};
+    const auto most = implementation_->Most();
+    return {counts.made, counts.bytesMade, counts.live, counts.bytes, most.records, most.bytes};
 }
 
 int32 AllocTracker::GetSites(Site* sites, int32 capacity) {

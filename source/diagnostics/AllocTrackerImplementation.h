@@ -19,6 +19,7 @@ public:
     void Add(uintptr_t address, uint32 size, const char* file, int32 line, const StackFrame* frame);
     void Remove(uintptr_t address);
     AllocRecords::Counts Count() { return deactivated_ ? AllocRecords::Counts{} : records_.Count(); }
+    AllocRecords::Amount Most() { return records_.Most(); }
     void DumpAll(AllocDumper& dumper);
     void DumpOne(uintptr_t address, AllocDumper& dumper);
     bool IsTracked(uintptr_t address);
