@@ -139,19 +139,6 @@ void Free(void* block) {
         CallErrorCallback(Error::kDamagedBlock, block);
 }
 
-void* Resize(void* block, size_t size) {
-    if (size > kMostBytes || !MayAllocate(size)) return OutOfMemory();
-    if (StraightThrough()) return std::realloc(block, size);
-    Link* link = static_cast<Link*>(block) - 1;
-    if (!Remove(link)) {
-        CallErrorCallback(Error::kDamagedBlock, block);
-        return nullptr;
-    }
-    Link* resized = static_cast<Link*>(std::realloc(link, size + sizeof(Link)));
-    Enter(resized ? resized : link);
-    return resized ? resized + 1 : OutOfMemory();
-}
-
 void* Reallocate(void* block, size_t oldSize, size_t newSize) {
     if (!MayAllocate(newSize)) return nullptr;
     size_t more = newSize / 8;

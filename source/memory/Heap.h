@@ -28,7 +28,6 @@ void CallErrorCallback(Error error, const void* block);
 
 void* Allocate(size_t size);
 void Free(void* block);
-void* Resize(void* block, size_t size);  // in place or moving; null leaves the block as it is
 
 // ---- handle blocks: the caller keeps their size
 // ----------------------------------------------------------------------
