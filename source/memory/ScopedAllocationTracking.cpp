@@ -2,6 +2,7 @@
 
 #include <map>
 #include <new>
+#include <utility>
 
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/diagnostics/StackChain.h>
@@ -62,7 +63,8 @@ bool EndTracking(ScopedMap& left) {
 
 void StartScopedTracker() {
     record = new (std::nothrow) ScopedRecord;
-    if (record) ThMutexCreate(&record->mutex, "ScopedAllocationTracking");
+    if (record && ThMutexCreate(&record->mutex, "ScopedAllocationTracking") != kNoErr)
+        delete std::exchange(record, nullptr);
 }
 
 void StopScopedTracker() {
