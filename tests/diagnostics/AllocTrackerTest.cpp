@@ -173,14 +173,6 @@ TEST_F(AllocTrackerTest, TellsStacksApartThatDifferOnlyFarOut) {
     for (size_t i = 0; i < first[0].size(); ++i) EXPECT_EQ(i < 11, first[0][i] == first[1][i] && i < 11) << i;
 }
 
-TEST_F(AllocTrackerTest, NamesTheCallsInTheReport) {
-    Make(tracker, 0x10);
-    TextDumper dumper("things", true);
-    tracker.DumpOne(At(0x10), &dumper);
-    EXPECT_NE(std::string::npos, dumper.text.find(" - diagnostics_tests ")) << dumper.text;
-    EXPECT_NE(std::string::npos, dumper.text.find(" + 0x")) << dumper.text;
-}
-
 TEST_F(AllocTrackerTest, DuplicateIsReportedAndTheEarlierRecordStays) {
     tracker.AddRecord(At(0x10), 5, "first.cpp", 1);
     ReportRecorder recorder;

@@ -110,14 +110,20 @@ TEST(MemoryFull, IsToldByTrackedAllocation) {
     EXPECT_GT(runs, 3);
 }
 
+uint32 wantedAtStart;
+
 TEST(MemoryFull, PreventsTheStart) {
     uint64 before = heap::TotalAllocated();
+    SetMemFullProc([](uint32 size) { wantedAtStart = size; });
     for (int n = 1; n <= 5; ++n) {
+        wantedAtStart = 0;
         test::FailingAllocator failing(n);
         EXPECT_EQ(kMemFullErr, MemoryManagerStart());
+        EXPECT_EQ(10001 * sizeof(void*), wantedAtStart);  // a block of master pointers
         EXPECT_FALSE(GetMemoryManagerInitialized());
         EXPECT_EQ(before, heap::TotalAllocated());
     }
+    SetMemFullProc(nullptr);
 }
 
 TEST(TrackedAllocation, IsReportedWhenItLeaks) {

@@ -86,7 +86,8 @@ TESSEL_API MgErr DSPtrToXHand(const void* p, UHandle h, uint32 size);
 TESSEL_API MgErr DSSetHandleFromPtr(UHandle* h, const void* p, uint32 size);
 TESSEL_API MgErr DSSetHandleFromPtrNULLMeansEmpty(UHandle* h, const void* p, uint32 size);
 
-/* Appends bytes, or a whole handle, to a handle. The two handles may be the same. */
+/* Appends bytes, or a whole handle, to a handle. The two handles may be the same; the bytes at `p` must not be the
+   handle's own, which may move first. */
 TESSEL_API MgErr DSPtrAndHand(const void* p, UHandle h, uint32 size);
 TESSEL_API MgErr DSHandAndHand(UHandle source, UHandle destination);
 
