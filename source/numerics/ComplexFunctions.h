@@ -54,7 +54,7 @@ constexpr W kHalfPi = static_cast<W>(0xC90FDAA22168C235p-63L);
 /* ab - cd, keeping what cancellation would lose. */
 template <class W>
 W DifferenceOfProducts(W a, W b, W c, W d) {
-    constexpr W kCancelled = 16;
+    constexpr W kCancelled = 4;
     const W first = a * b;
     const W second = c * d;
     const W difference = first - second;

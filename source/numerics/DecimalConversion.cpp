@@ -286,7 +286,7 @@ RealParts TakeApart(const floatExt& x) {
             negative};
 }
 
-DecimalDigits RoundToDecimal(const RealParts& x, int32 precision) {
+DecimalDigits RoundToDecimal(RealParts x, int32 precision) {
     if (x.mantissa == 0) return {0, 0, 1};
     const int32 lead = DecimalExponent(x);
     const int32 unit = precision >= 1 ? lead - std::min(precision, kMaxSignificant) + 1

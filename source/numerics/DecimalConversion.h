@@ -36,7 +36,7 @@ struct DecimalDigits {
 
 /* A finite value rounded to `precision` significant digits (precision >= 1, at most 17 count) or to -precision decimals
    (at most 18 digits in all). Zero is one digit 0 with the exponent 0. */
-DecimalDigits RoundToDecimal(const RealParts& x, int32 precision);
+DecimalDigits RoundToDecimal(RealParts x, int32 precision);
 
 /* The positive extended real nearest to digits * 10^exponent. digits must be below 10^18. */
 RoundedExtended FromDecimal(uint64 digits, int32 exponent);

@@ -51,7 +51,7 @@ uint16 HostExceptions() {
     return status;
 }
 
-void Push(const Register& value) {
+void Push(Register value) {
     FloatingPointUnit& unit = tUnit;
     unit.top = (unit.top + kRegisters - 1) % kRegisters;
     if (unit.depth == kRegisters) {
@@ -104,7 +104,7 @@ struct NarrowFormat {
 
 // Rounds to nearest; where the value lies exactly between two of the narrower reals, the rest decides.
 template <class Real>
-Real Narrow(const Register& from) {
+Real Narrow(Register from) {
     using Format = NarrowFormat<Real>;
     const uint64 mantissa = from.mantissa;
     const int32 exponent = (from.signExponent & kExtendedExponentMask) - Format::kRebias;

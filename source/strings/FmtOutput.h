@@ -74,6 +74,11 @@ public:
     bool HasRoom() const { return used_ < limit_; }
     void Restart() { used_ = 0; }
 
+    /* Another output to the same place, and going on where that one is. Only the one word that changes is passed
+       between the two: a copy of all three is made by wider loads, which wait for the word that was just written. */
+    FmtOutput Twin() const { return FmtOutput(dst_, limit_); }
+    void Resume(const FmtOutput& twin) { used_ = twin.used_; }
+
     void Put(char byte) {
         if (!HasRoom()) return;
         if (dst_) dst_[used_] = byte;

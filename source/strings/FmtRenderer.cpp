@@ -67,7 +67,7 @@ int32 ExponentialCode(const FmtSpec& spec) {
 }
 
 /* |trunc(log10 |x|)| is at most `limit`. Mostly the power of two tells; x is finite and not 0. */
-bool PowerFits(const RealParts& x, int32 limit) {
+bool PowerFits(RealParts x, int32 limit) {
     constexpr double kLog10Of2 = 0.301029995663981195;
     const auto fits = [limit](auto power) { return std::abs(static_cast<int32>(power)) <= limit; };
     const double below = kLog10Of2 * (x.exponent + 63);
@@ -77,7 +77,7 @@ bool PowerFits(const RealParts& x, int32 limit) {
 }
 
 /* Whether the fixed form of a real shows it without more digits than are sensible. */
-bool FixedFits(const RealParts& x, int32 limit) {
+bool FixedFits(RealParts x, int32 limit) {
     if (x.kind != RealKind::kFinite) return limit >= kSpecialTextLength;
     if (x.mantissa == 0) return limit >= 1;
     return PowerFits(x, limit - (x.negative ? 1 : 0));

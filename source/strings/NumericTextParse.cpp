@@ -90,17 +90,25 @@ private:
     // Takes digits while there is room for them, eight at once where there are as many.
     void KeepDigits() {
         constexpr int32 kEight = 8;
+        const char* at = at_;
+        int32 count = count_;
+        uint64 low = lowDigits_;
+        uint64 high = highDigits_;
         uint32 eight = 0;
-        while (count_ <= kPackedDecimalDigits - kEight && end_ - at_ >= kEight && EightDigits(at_, eight)) {
-            highDigits_ = lowDigits_ >> 32;
-            lowDigits_ = lowDigits_ << 32 | eight;
-            at_ += kEight;
-            count_ += kEight;
+        while (count <= kPackedDecimalDigits - kEight && end_ - at >= kEight && EightDigits(at, eight)) {
+            high = low >> 32;
+            low = low << 32 | eight;
+            at += kEight;
+            count += kEight;
         }
-        for (; at_ < end_ && IsDigit(*at_) && count_ < kPackedDecimalDigits; ++at_, ++count_) {
-            highDigits_ = highDigits_ << 4 | lowDigits_ >> 60;
-            lowDigits_ = lowDigits_ << 4 | static_cast<uint64>(*at_ - '0');
+        for (; at < end_ && IsDigit(*at) && count < kPackedDecimalDigits; ++at, ++count) {
+            high = high << 4 | low >> 60;
+            low = low << 4 | static_cast<uint64>(*at - '0');
         }
+        at_ = at;
+        count_ = count;
+        lowDigits_ = low;
+        highDigits_ = high;
     }
 
     // The digits at `text`, four bits each, the first one highest; false unless they are eight.

@@ -54,7 +54,7 @@ void PutFixed(const RealText& text, int32 decimals, char decimalPoint, TextOut& 
     out.PutDigits(text.digits, whole, decimals - zeros);
 }
 
-RealText RoundToText(const RealParts& parts, int32 k) {
+RealText RoundToText(RealParts parts, int32 k) {
     RealText text;
     text.kind = parts.kind;
     text.negative = parts.negative;

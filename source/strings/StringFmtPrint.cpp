@@ -101,7 +101,7 @@ private:
    and output are kept in registers for what is most frequent: plain text and specifiers of one letter. */
 bool Formatter::Pass() {
     const char* p = start_;
-    FmtOutput output = output_;
+    FmtOutput output = output_.Twin();
     decimalPoint_ = g_decimalPoint;
     while (p < end_ && (output.HasRoom() || recording_)) {
         const char* special = byCharacters_ ? FindSpecialByCharacters(p, end_) : FindSpecial(p, end_);
@@ -113,16 +113,16 @@ bool Formatter::Pass() {
             continue;
         }
         cursor_ = p;
-        output_ = output;
+        output_.Resume(output);
         if (*p == '\\') {
             Escape();
         } else if (!Specifier()) {
             return false;
         }
         p = cursor_;
-        output = output_;
+        output.Resume(output_);
     }
-    output_ = output;
+    output_.Resume(output);
     return true;
 }
 

@@ -120,17 +120,29 @@ struct BinaryCase {
 
 TEST(RealMath, TwoOperandsInEveryPrecision) {
     const BinaryCase cases[] = {
-        {"add", ALL(RTfAdd), 1.5, 2, 3.5},       {"sub", ALL(RTfSub), 1.5, 2, -0.5},
-        {"mul", ALL(RTfMul), 1.5, -2, -3},       {"div", ALL(RTfDiv), 1.5, 0, kInf},
-        {"mod", ALL(RTfMod), -7, 3, 2},          {"mod", ALL(RTfMod), 7, -3, -2},
-        {"mod", ALL(RTfMod), 6, 3, 0},           {"mod", ALL(RTfMod), 6, 0, kNaN},
-        {"mod", ALL(RTfMod), 16777216, 3, 1},    {"logx", ALL(RTfLogx), 2, 8, 3},
-        {"logx", ALL(RTfLogx), 10, 1000, 3},     {"logx", ALL(RTfLogx), 10, 0, -kInf},
-        {"logx", ALL(RTfLogx), 10, -1, kNaN},    {"powx", ALL(RTfPowx), -2, 3, -8},
-        {"powx", ALL(RTfPowx), -2, 0.5, kNaN},   {"atan2", ALL(RTfAtan2), 1, 0, 0},
-        {"atan2", ALL(RTfAtan2), 1, -0.0, -0.0}, {"scale", ALL(RTfiScale), 3, 2.9, 12},
-        {"scale", ALL(RTfiScale), 3, -1.9, 1.5}, {"scale", ALL(RTfiScale), -3, 1e9, -kInf},
-        {"scale", ALL(RTfiScale), 3, -kInf, 0},  {"scale", ALL(RTfiScale), 3, kNaN, kNaN},
+        {"add", ALL(RTfAdd), 1.5, 2, 3.5},
+        {"sub", ALL(RTfSub), 1.5, 2, -0.5},
+        {"mul", ALL(RTfMul), 1.5, -2, -3},
+        {"div", ALL(RTfDiv), 1.5, 0, kInf},
+        {"mod", ALL(RTfMod), -7, 3, 2},
+        {"mod", ALL(RTfMod), 7, -3, -2},
+        {"mod", ALL(RTfMod), 6, 3, 0},
+        {"mod", ALL(RTfMod), 6, 0, kNaN},
+        {"mod", ALL(RTfMod), 5, kInf, kNaN},
+        {"mod", ALL(RTfMod), 16777216, 3, 1},
+        {"logx", ALL(RTfLogx), 2, 8, 3},
+        {"logx", ALL(RTfLogx), 10, 1000, 3},
+        {"logx", ALL(RTfLogx), 10, 0, -kInf},
+        {"logx", ALL(RTfLogx), 10, -1, kNaN},
+        {"powx", ALL(RTfPowx), -2, 3, -8},
+        {"powx", ALL(RTfPowx), -2, 0.5, kNaN},
+        {"atan2", ALL(RTfAtan2), 1, 0, 0},
+        {"atan2", ALL(RTfAtan2), 1, -0.0, -0.0},
+        {"scale", ALL(RTfiScale), 3, 2.9, 12},
+        {"scale", ALL(RTfiScale), 3, -1.9, 1.5},
+        {"scale", ALL(RTfiScale), -3, 1e9, -kInf},
+        {"scale", ALL(RTfiScale), 3, -kInf, 0},
+        {"scale", ALL(RTfiScale), 3, kNaN, kNaN},
     };
     for (const BinaryCase& c : cases) {
         const auto x = static_cast<float>(c.x);
@@ -194,6 +206,7 @@ TEST(RealMath, TwoResultsEitherOfWhichMayBeNull) {
         {RTfQRemD, 7, 3, 2, 1},
         {RTfQRemD, 7, -3, -3, -2},
         {RTfQRemD, 1, 0, kInf, kNaN},
+        {RTfQRemD, 5, kInf, 0, kNaN},  // as the formula has it
         {RTfMaxMinD, 1, 2, 2, 1},
         {RTfMaxMinD, 2, 1, 2, 1},
         {RTfMaxMinD, kNaN, 1, kNaN, kNaN},

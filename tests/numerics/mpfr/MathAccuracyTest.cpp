@@ -145,9 +145,11 @@ public:
             << " bits on x86-64 with the C library of the build. 0.50 is correct rounding. Made by\n"
                "`./dev accuracy`; members that are exact or round once by definition are left out.\n\n## Real\n\n";
         WriteRows(out, gRealRows);
-        out << "\n## Complex\n\nThe larger error of the two parts. A part below a thousandth of the magnitude (an "
-               "eighth "
-               "for extended), which comes\nabout by cancellation, is measured as if it were that large.\n\n";
+        out << "\n## Complex\n\nThe larger error of the two parts. A part below a thousandth of the magnitude, which "
+               "comes\nabout by "
+               "cancellation, is measured as if it were that large; an extended one, for which there is nothing\nwider "
+               "to compute in, in units of the magnitude. Powers lose as many digits as y ln x has before the\npoint, "
+               "and the arctangent of a quotient near i, where it has its pole, as the quotient loses there.\n\n";
         WriteRows(out, gComplexRows);
     }
 };
@@ -373,7 +375,7 @@ int ComplexAtan2(mpc_ptr result, mpc_srcptr x, mpc_srcptr y, mpc_rnd_t mode) {
 // The larger error of the two parts. There is nothing wider to compute extended values in, so that theirs is measured
 // against the magnitude.
 template <class T>
-constexpr unsigned long kSmallestPart = Format<T>::kBits < 64 ? 1000 : 8;
+constexpr unsigned long kSmallestPart = Format<T>::kBits < 64 ? 1000 : 1;
 
 template <class T>
 double Ulps(const typename Format<T>::Complex& computed, mpc_ptr exact) {
