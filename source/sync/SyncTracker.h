@@ -21,9 +21,10 @@ public:
         DumpLeakInfo(tracker, expected, name, fileName);
         DestroyAllocTracker(tracker);
     }
-    void Add(const void* object, uint32 size, const char* file, int32 line) {
+    // The call stack begins with the caller of the function whose frame is given.
+    void Add(const void* frame, const void* object, uint32 size, const char* file, int32 line) {
         if (AllocTracker* tracker = tracker_.load(std::memory_order_acquire))
-            tracker->AddRecord(object, size, file, line);
+            tracker->AddRecordFrom(frame, object, size, file, line);
     }
     void Remove(const void* object) {
         if (AllocTracker* tracker = tracker_.load(std::memory_order_acquire)) tracker->RemoveRecord(object);

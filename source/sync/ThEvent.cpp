@@ -53,7 +53,7 @@ void ReportLatency(PlatformEvent& event) {
         << " max=" << DbgFmtType<double>(Milliseconds(maximum), "%.5f");
 }
 
-MgErr CreateEvent(ThEvent* event, bool signaled, ThEventSignalProc customSignal) {
+MgErr CreateEvent(ThEvent* event, bool signaled, ThEventSignalProc customSignal, const void* frame) {
     if (!event) return kArgErr;
     *event = nullptr;
     std::unique_ptr<EventRecord> record(new (std::nothrow) EventRecord);
@@ -63,7 +63,7 @@ MgErr CreateEvent(ThEvent* event, bool signaled, ThEventSignalProc customSignal)
     record->customSignal = customSignal;
     if (!record->platformEvent) return kMemFullErr;
     *event = record.release();
-    eventTracker.Add(*event, sizeof(THEVENTREC), __FILE__, __LINE__);
+    eventTracker.Add(frame, *event, sizeof(THEVENTREC), __FILE__, __LINE__);
     return kNoErr;
 }
 
@@ -84,11 +84,11 @@ MgErr ThEventStop() {
 using namespace tessel;
 
 MgErr ThEventCreate(ThEvent* event, uint32, bool signaled) {
-    return CreateEvent(event, signaled, nullptr);
+    return CreateEvent(event, signaled, nullptr, __builtin_frame_address(0));
 }
 
 MgErr ThEventCreateWithCustomSignal(ThEvent* event, uint32, bool signaled, ThEventSignalProc customSignal) {
-    return CreateEvent(event, signaled, customSignal);
+    return CreateEvent(event, signaled, customSignal, __builtin_frame_address(0));
 }
 
 void ThEventDestroy(ThEvent event) {

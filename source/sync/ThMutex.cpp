@@ -18,7 +18,7 @@ SyncTracker mutexTracker;
 
 struct MutexRecord : THMUTEXREC, PlainAllocation {};
 
-MgErr CreateMutex(ThMutex* mutex) {
+MgErr CreateMutex(ThMutex* mutex, const void* frame) {
     if (!mutex) return kArgErr;
     *mutex = nullptr;
     std::unique_ptr<MutexRecord> record(new (std::nothrow) MutexRecord);
@@ -27,7 +27,7 @@ MgErr CreateMutex(ThMutex* mutex) {
     record->verifier = kThMutexVerifier;
     if (ThEventCreate(&record->event, 0, false) != kNoErr) return kMemFullErr;
     *mutex = record.release();
-    mutexTracker.Add(*mutex, sizeof(THMUTEXREC), __FILE__, __LINE__);
+    mutexTracker.Add(frame, *mutex, sizeof(THMUTEXREC), __FILE__, __LINE__);
     return kNoErr;
 }
 
@@ -65,7 +65,7 @@ MgErr ThMutexStop() {
 using namespace tessel;
 
 MgErr ThMutexCreate(ThMutex* mutex, CStr) {
-    return CreateMutex(mutex);
+    return CreateMutex(mutex, __builtin_frame_address(0));
 }
 
 void ThMutexDestroy(ThMutex mutex) {

@@ -163,7 +163,7 @@ void CloseHandle(ThThread thread) {
 // ---- the service ----------------------------------------------------------------------------------------------------
 
 MgErr ThThreadStart(ThreadPriorityReader configured) {
-    threadTracker = CreateAllocTrackerSpecifySkip(1);  // call stacks begin with the caller of ThThreadCreate
+    threadTracker = CreateAllocTracker();
     ClearTable();
     ownRecordKey = ThLocalStorageAllocateKey();
     BuildPriorityTable(configured);
@@ -199,7 +199,8 @@ MgErr ThThreadCreate(ThThread* thread, ThThreadProc procedure, void* argument, C
     ThThread record = *thread;
     record->procedure = procedure;
     record->argument = argument;
-    if (threadTracker) threadTracker->AddRecord(record, sizeof *record, __FILE__, __LINE__);
+    if (threadTracker)
+        threadTracker->AddRecordFrom(__builtin_frame_address(0), record, sizeof *record, __FILE__, __LINE__);
     return Conclude(StartThread(record), thread);
 }
 

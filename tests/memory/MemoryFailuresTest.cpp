@@ -1,6 +1,7 @@
 // What happens when memory runs out at any point, when threads meet, and when something is left.
 #include <gmock/gmock.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <cstring>
 #include <functional>
@@ -13,6 +14,8 @@
 #include <tessel/memory/MemoryUtil.h>
 #include <tessel/memory/ScopedAllocationTracking.h>
 #include <tessel/memory/TrackedMallocFree.h>
+#include <tessel/sync/ThEvent.h>
+#include <tessel/sync/ThMutex.h>
 
 #include "memory/Heap.h"
 #include "memory/Service.h"
@@ -148,7 +151,8 @@ TEST(TrackedAllocation, IsReportedWhenItLeaks) {
 }
 
 // Calls every operation that makes something; the frames of all lie in this function.
-__attribute__((noinline)) void MakeOneOfEach(std::vector<UHandle>& handles, std::vector<void*>& blocks) {
+__attribute__((noinline)) void MakeOneOfEach(std::vector<UHandle>& handles, std::vector<void*>& blocks,
+                                             ThMutex (&mutexes)[2], ThEvent (&events)[2]) {
     UHandle some = nullptr, copy = nullptr;
     for (auto make : {DSNewHandle, DSNewHClr, AZNewHandle, AZNewHClr}) handles.push_back(make(8));
     for (auto make : {DSNewAlignedHandle, DSNewAlignedHClr}) handles.push_back(make(8, 16, 0));
@@ -180,6 +184,9 @@ __attribute__((noinline)) void MakeOneOfEach(std::vector<UHandle>& handles, std:
     blocks.push_back(TrackedMalloc(8));
     blocks.push_back(TrackedNew(8));
     blocks.push_back(TrackedNewNoThrow(8));
+    for (ThMutex& mutex : mutexes) ThMutexCreate(&mutex, "");
+    ThEventCreate(&events[0], 0, false);
+    ThEventCreateWithCustomSignal(&events[1], 0, false, nullptr);
     asm volatile("");
 }
 
@@ -203,7 +210,9 @@ TEST(LeakReports, BeginWithTheCallerOfTheLibrary) {
     MemResetTracker();
     std::vector<UHandle> handles;
     std::vector<void*> blocks;
-    MakeOneOfEach(handles, blocks);
+    ThMutex mutexes[2];
+    ThEvent events[2];
+    MakeOneOfEach(handles, blocks, mutexes, events);
     MemDumpTracker();
     for (UHandle h : handles) EXPECT_EQ(kNoErr, DSDisposeHandle(h));
     for (size_t i = 0; i < 4; ++i) DSDisposePtr(blocks[i]);
@@ -212,7 +221,12 @@ TEST(LeakReports, BeginWithTheCallerOfTheLibrary) {
     EXPECT_EQ(std::vector<bool>(handles.size(), true), StacksThatBeginThere(drive.Get("ovHandleLeaks.txt")));
     EXPECT_EQ(std::vector<bool>(4, true), StacksThatBeginThere(drive.Get("ovPointerLeaks.txt")));
     EXPECT_EQ(std::vector<bool>(3, true), StacksThatBeginThere(drive.Get("ovnewdelleaks.txt")));
+    EXPECT_EQ(std::vector<bool>(2, true), StacksThatBeginThere(drive.Get("ovMutexLeaks.txt")));
+    const std::vector<bool> forEvents = StacksThatBeginThere(drive.Get("ovEventLeaks.txt"));
+    EXPECT_EQ(2, std::count(forEvents.begin(), forEvents.end(), true)) << "the others are those of the mutexes";
     for (size_t i = 4; i < blocks.size(); ++i) TrackedFree(blocks[i]);
+    for (ThMutex mutex : mutexes) ThMutexDestroy(mutex);
+    for (ThEvent event : events) ThEventDestroy(event);
 }
 
 TEST(ScopedTracking, ReportsWhatIsLeft) {
