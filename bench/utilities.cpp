@@ -30,6 +30,7 @@ int32_t MakeKey(std::mt19937& random, const std::string& shape, int32 i) {
     if (shape == "sorted") return i;
     if (shape == "reversed") return kCount - i;
     if (shape == "equal") return 7;
+    if (shape == "sorted but for the last 1,000" && i < kCount - 1000) return i * 10000;
     return static_cast<int32>(random() % 1000000000);
 }
 
@@ -62,7 +63,8 @@ void (*volatile hostSort)(void*, size_t, size_t, int (*)(const void*, const void
 void* (*volatile hostSearch)(const void*, const void*, size_t, size_t, int (*)(const void*, const void*)) = bsearch;
 
 template <class T>
-void CompareSorts(bench::Table& table, const std::string& what, const std::vector<T>& input, CompareProc compare) {
+void CompareSorts(bench::Table& table, const std::string& what, const std::vector<T>& input, CompareProc compare,
+                  double goal) {
     std::vector<T> work = input;
     auto timed = [&](auto sort) {
         return [&work, &input, sort] {
@@ -72,7 +74,7 @@ void CompareSorts(bench::Table& table, const std::string& what, const std::vecto
     };
     auto ours = timed([&] { QSort(work.data(), kCount, sizeof(T), compare); });
     auto theirs = timed([&] { hostSort(work.data(), kCount, sizeof(T), compare); });
-    table.CompareTimed("QSort of 100,000 " + what, ours, "qsort", theirs, 0.9);
+    table.CompareTimed("QSort of 100,000 " + what, ours, "qsort", theirs, goal);
 }
 
 void CompareSearches(bench::Table& table, CompareProc compare, const char* what) {
@@ -162,10 +164,14 @@ int main() {
         bench::Table table("utilities");
         for (const char* shape : {"random", "sorted", "reversed", "equal"}) {
             const std::vector<int32> numbers = Numbers(shape);
-            CompareSorts(table, std::string("int32, ") + shape, numbers, CompareNumbers);
-            CompareSorts(table, std::string("int32, CompareInt32s, ") + shape, numbers, CompareInt32s);
-            CompareSorts(table, std::string("24-byte records, ") + shape, Records(shape), CompareRecords);
+            CompareSorts(table, std::string("int32, ") + shape, numbers, CompareNumbers, 0.9);
+            CompareSorts(table, std::string("int32, CompareInt32s, ") + shape, numbers, CompareInt32s, 0.9);
+            CompareSorts(table, std::string("24-byte records, ") + shape, Records(shape), CompareRecords, 0.9);
         }
+        // A merge finds order where a partition by the middle of three cannot: to be watched, not to be won.
+        const char* shape = "sorted but for the last 1,000";
+        CompareSorts(table, std::string("int32, ") + shape, Numbers(shape), CompareNumbers, 2.5);
+        CompareSorts(table, std::string("24-byte records, ") + shape, Records(shape), CompareRecords, 2.5);
         CompareSearches(table, CompareNumbers, "a host's comparison");
         CompareSearches(table, CompareInt32s, "CompareInt32s");
         CompareRandom(table);
