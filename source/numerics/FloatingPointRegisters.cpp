@@ -13,7 +13,7 @@
 namespace tessel {
 namespace {
 
-constexpr int kRegisters = 8;
+constexpr uint32 kRegisters = 8;
 constexpr int kTopShift = 11;
 constexpr uint64 kQuietBit = uint64{1} << 62;
 constexpr RoundedExtended kNaN = {~uint64{0}, kExtendedExponentMask, 0};
@@ -25,8 +25,8 @@ using Register = RoundedExtended;
 // Registers are used from the last to the first, as a ring; `depth` of them are in use from `top` on.
 struct FloatingPointUnit {
     Register registers[kRegisters];
-    int32 top;
-    int32 depth;
+    uint32 top;
+    uint32 depth;
     uint16 status;
 };
 

@@ -94,7 +94,7 @@ public:
         if (dst_) FillFew(dst_ + used_, byte, n);
         used_ += n;
     }
-    void PutDecimal(uint64 magnitude, bool negative) {
+    [[gnu::always_inline]] void PutDecimal(uint64 magnitude, bool negative) {
         const size_t length = CountDecimalDigits(magnitude) + negative;
         char* place = Take(length);
         char text[kMaxDecimalDigits + 1];
