@@ -36,7 +36,7 @@ void MasterPointerSet::Insert(Table& table, uintptr_t block) {
 }
 
 bool MasterPointerSet::Grow() {
-    constexpr uint32 kFirstBits = 6;
+    constexpr uint32 kFirstBits = 8;
     Table* old = table_.load(std::memory_order_relaxed);
     Table* table = NewTable(old ? 32 - old->shift + 1 : kFirstBits, old);
     if (!table) return false;

@@ -53,8 +53,10 @@ public:
     void Clear();
 
 private:
-    static constexpr uint32 kStretchBits = sizeof(void*) == 8 ? 16 : 15;  // a block covers at most 3 stretches
-    static constexpr uint32 kMostStretches = 3;
+    // Short enough that few handles lie in a stretch that belongs to two blocks, where a lookup takes two steps.
+    static constexpr uint32 kStretchBits = sizeof(void*) == 8 ? 14 : 13;
+    static constexpr uint32 kMostStretches = 6;  // that a block covers
+    static_assert(sizeof(MasterPointerBlock) <= (kMostStretches - 1) << kStretchBits);
 
     struct Table {
         Table* older;
