@@ -56,6 +56,11 @@ size_t ThreadsOfProcess() {
     return static_cast<size_t>(std::distance(begin(tasks), end(tasks)));
 }
 
+/* The host lists a thread for a moment after its end. One that is left for good makes the test run out of time. */
+void AwaitThreads(size_t most) {
+    while (ThreadsOfProcess() > most) std::this_thread::yield();
+}
+
 // ---- identity and the table -----------------------------------------------------------------------------------------
 
 TEST_F(ThThreadTest, KnowsItsThreads) {
@@ -236,7 +241,7 @@ TEST_F(ThThreadTest, EndsAThreadThatIgnoresItsStopByForce) {
     ThThreadDestroy(thread);
     EXPECT_GE(LeapOverLongWaits::leapt, 10);
     EXPECT_THAT(reports_.Texts(), ElementsAre(text));
-    EXPECT_EQ(ThreadsOfProcess(), before);
+    AwaitThreads(before);
     thread = StartThread(nullptr);
     EXPECT_EQ(ThThreadGetIndex(thread), 1);
     ThThreadDestroy(thread);
@@ -251,7 +256,8 @@ TEST_F(ThThreadTest, MayDestroyItself) {
         ThThreadDestroy(ThThreadGetId());
         return ThThreadGetId() != nullptr;
     });
-    while (reports_.CountAt(kDebugError) == 0 || ThreadsOfProcess() != before) std::this_thread::yield();
+    while (reports_.CountAt(kDebugError) == 0) std::this_thread::yield();
+    AwaitThreads(before);
     EXPECT_THAT(reports_.Texts(kDebugError),
                 ElementsAre(testing::StartsWith("TerminateThread returns FALSE: why???, LastError = 5threadid = ")));
 }
