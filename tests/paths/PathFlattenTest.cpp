@@ -35,42 +35,26 @@ protected:
 };
 
 TEST_F(PathFlatten, BytesOfBothFormats) {
-    struct Row {
-        PathRef path;
-        std::string bytes;
+    const std::pair<PathRef, std::string> rows[] = {
+        {Abs({"C", "dir"}), "PTH0\0\0\0\12\0\0\0\2\1C\3dir"s},
+        {Rel({"..", "a"}), "PTH0\0\0\0\7\0\1\0\2\0\1a"s},
+        {Unc({"s"}), "PTH0\0\0\0\6\0\3\0\1\1s"s},
+        {PathRef(), "PTH0\0\0\0\4\0\2\0\0"s},
+        {Abs({}), "PTH0\0\0\0\4\0\0\0\0"s},
+        {Abs({"C", "\xC3\xA9"}), "PTH1\0\0\0\13abs \0\1C\0\2\xC3\xA9"s},
+        {Rel({"..", "\xC3\xA9"}), "PTH1\0\0\0\12rel \0\0\0\2\xC3\xA9"s},
     };
-    const Row rows[] = {
-        {Abs({"C", "dir"}),
-         "PTH0\0\0\0\x0A\0\0\0\x02\x01"s
-         "C\x03"
-         "dir"},
-        {Rel({"..", "a"}),
-         "PTH0\0\0\0\x07\0\x01\0\x02\0\x01"s
-         "a"},
-        {Unc({"s"}),
-         "PTH0\0\0\0\x06\0\x03\0\x01\x01"s
-         "s"},
-        {PathRef(), "PTH0\0\0\0\x04\0\x02\0\0"s},
-        {Abs({}), "PTH0\0\0\0\x04\0\0\0\0"s},
-        {Abs({"C", "\xC3\xA9"}),
-         "PTH1\0\0\0\x0B"
-         "abs \0\x01"
-         "C\0\x02\xC3\xA9"s},
-        {Rel({"..", "\xC3\xA9"}),
-         "PTH1\0\0\0\x0A"
-         "rel \0\0\0\x02\xC3\xA9"s},
-    };
-    for (const Row& row : rows) {
-        EXPECT_EQ(row.bytes, Flattened(row.path));
-        EXPECT_EQ(Show(row.path), Unflattened(row.bytes));
-        EXPECT_EQ(row.bytes.size(), row.path.FlattenedSize(row.bytes[3] == '0' ? PathRef::kPTH0 : PathRef::kPTH1));
+    for (const auto& [path, bytes] : rows) {
+        EXPECT_EQ(bytes, Flattened(path));
+        EXPECT_EQ(Show(path), Unflattened(bytes));
+        EXPECT_EQ(bytes.size(), path.FlattenedSize(bytes[3] == '0' ? PathRef::kPTH0 : PathRef::kPTH1));
     }
     char block[64];
     StaticOutputBuf buffer(block, sizeof block);
     uint32 size;
     EXPECT_EQ(kNoErr, Unc({"s"}).Flatten(&buffer, PathRef::kPTH1, &size, LittleEndianizer()));
-    EXPECT_EQ("PTH1\x07\0\0\0unc \x01\0s"s, std::string(block, size));
-    EXPECT_EQ("unc:s", Unflattened("PTH1\x07\0\0\0unc \x01\0s"s, LittleEndianizer()));
+    EXPECT_EQ("PTH1\7\0\0\0unc \1\0s"s, std::string(block, size));
+    EXPECT_EQ("unc:s", Unflattened("PTH1\7\0\0\0unc \1\0s"s, LittleEndianizer()));
     EXPECT_EQ(kUnsupportedErr,
               Abs({}).Flatten(&buffer, static_cast<PathRef::FlattenFormat>(2), &size, BigEndianizer()));
 }
@@ -105,93 +89,42 @@ TEST_F(PathFlatten, LongNamesAndTheSettingChooseTheFormat) {
 TEST_F(PathFlatten, NamesAreUtf8WhateverTheCodePage) {
     const PathRef badUtf8 = Abs({"C", "a\xFF\xC3"});  // as a disk may have it
     EXPECT_EQ(Show(badUtf8), Unflattened(Flattened(badUtf8)));
-    ASSERT_TRUE(platform::SetCodePage(1252));
-    const std::string bytes =
-        "PTH1\0\0\0\x0A"
-        "abs \0\x04"
-        "b\xC3\xA9"
-        "b"s;
-    EXPECT_EQ(bytes, Flattened(Abs({"b\xE9"
-                                    "b"})));
-    EXPECT_EQ(
-        "abs:b\xE9"
-        "b",
-        Unflattened(bytes));
-    ASSERT_TRUE(platform::SetCodePage(932));
-    const std::string kanji =
-        "PTH1\0\0\0\x09"
-        "abs \0\x03\xE8\xA1\xA8"s;  // U+8868
-    EXPECT_EQ(kanji, Flattened(Abs({"\x95\x5C"})));
-    EXPECT_EQ("abs:\x95\x5C", Unflattened(kanji));
+    const std::tuple<uint32, const char*, std::string> rows[] = {
+        {1252, "b\351b", "PTH1\0\0\0\12abs \0\4b\xC3\251b"s},
+        {932, "\x95\x5C", "PTH1\0\0\0\11abs \0\3\xE8\xA1\xA8"s},  // U+8868
+    };
+    for (const auto& [codePage, name, bytes] : rows) {
+        ASSERT_TRUE(platform::SetCodePage(codePage));
+        EXPECT_EQ(bytes, Flattened(Abs({name})));
+        EXPECT_EQ("abs:"s + name, Unflattened(bytes));
+    }
 }
 
 TEST_F(PathFlatten, DamagedBytes) {
-    struct Row {
-        std::string bytes;
-        const char* result;
-    };
-    const Row rows[] = {
+    const std::pair<std::string, const char*> rows[] = {
         {"", "74"},
         {"PTH0\0\0\0"s, "74"},
-        {"PTH2\0\0\0\x04\0\0\0\0"s, "74"},
-        {"PTH0\0\0\0\x03\0\0"s, "74"},
-        {"PTH0\0\0\0\x09\0\0\0\x01\x01"s
-         "C",
-         "74"},  // the body is cut
-        {"PTH0\xFF\xFF\xFF\xFF\0\0\0\x01\x01"s
-         "C",
-         "74"},
-        {"PTH0\0\0\0\x06\0\0\0\x01\x02"s
-         "CC",
-         "74"},  // the name runs past the body
-        {"PTH0\0\0\0\x06\0\0\0\x02\x01"s
-         "C\x01"
-         "D",
-         "74"},  // and so does the second name
-        {"PTH0\0\0\0\x08\0\0\0\x01\x01"s
-         "C\x01"
-         "D",
-         "abs:C"},  // bytes behind the last name
-        {"PTH0\0\0\0\x06\0\x09\0\x01\x01"s
-         "C",
-         "not"},  // an unknown type
-        {"PTH1\0\0\0\x04"
-         "ABS "s,
-         "1"},
-        {"PTH1\0\0\0\x02"
-         "abs "s,
-         "74"},
-        {"PTH1\0\0\0\x04"
-         "ab"s,
-         "74"},
-        {"PTH1\0\0\0\x06"
-         "abs \x80\0"s,
-         "74"},
-        {"PTH1\0\0\0\x07"
-         "abs \0\x02"
-         "ab"s,
-         "74"},  // the name runs past the body
-        {"PTH1\0\0\0\x05"
-         "abs \0\0"s,
-         "74"},
-        {"PTH1\x7F\xFF\xFF\xFF"
-         "abs \0\x01"
-         "a"s,
-         "74"},  // a body that is not there
-        {"PTH1\0\0\0\x07"
-         "!pth\0\x01"
-         "a"s,
-         "1"},
-        {"PTH1\0\0\0\x04"
-         "abs \0\x01"
-         "a"s,
-         "abs: +"},  // what follows is not ours
+        {"PTH2\0\0\0\4\0\0\0\0"s, "74"},
+        {"PTH0\0\0\0\3\0\0"s, "74"},
+        {"PTH0\0\0\0\11\0\0\0\1\1C"s, "74"},  // the body is cut
+        {"PTH0\xFF\xFF\xFF\xFF\0\0\0\1\1C"s, "74"},
+        {"PTH0\0\0\0\6\0\0\0\1\2CC"s, "74"},        // the name runs past the body
+        {"PTH0\0\0\0\6\0\0\0\2\1C\1D"s, "74"},      // and so does the second name
+        {"PTH0\0\0\0\10\0\0\0\1\1C\1D"s, "abs:C"},  // bytes behind the last name
+        {"PTH0\0\0\0\6\0\11\0\1\1C"s, "not"},       // an unknown type
+        {"PTH1\0\0\0\4ABS "s, "1"},
+        {"PTH1\0\0\0\2abs "s, "74"},
+        {"PTH1\0\0\0\4ab"s, "74"},
+        {"PTH1\0\0\0\6abs \x80\0"s, "74"},
+        {"PTH1\0\0\0\7abs \0\2ab"s, "74"},  // the name runs past the body
+        {"PTH1\0\0\0\5abs \0\0"s, "74"},
+        {"PTH1\x7F\xFF\xFF\377abs \0\1a"s, "74"},  // a body that is not there
+        {"PTH1\0\0\0\7!pth\0\1a"s, "1"},
+        {"PTH1\0\0\0\4abs \0\1a"s, "abs: +"},  // what follows is not ours
     };
-    for (const Row& row : rows) EXPECT_EQ(row.result, Unflattened(row.bytes)) << ::testing::PrintToString(row.bytes);
+    for (const auto& [bytes, result] : rows) EXPECT_EQ(result, Unflattened(bytes)) << ::testing::PrintToString(bytes);
     Path path = FEmptyPath(nullptr);
-    const auto* cut = reinterpret_cast<const uint8*>(
-        "PTH0\0\0\0\x06\0\x01\0\x01\x01"
-        "C");
+    const auto* cut = reinterpret_cast<const uint8*>("PTH0\0\0\0\6\0\1\0\1\1C");
     EXPECT_EQ(14, FUnFlattenPath2(cut, &path, 14));
     EXPECT_EQ("rel:C", Show(path));
     EXPECT_EQ(14, FUnFlattenPath2(cut, &path, 13));

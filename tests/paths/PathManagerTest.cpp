@@ -53,34 +53,20 @@ TEST_F(PathManagerFlat, Making) {
 }
 
 TEST_F(PathManagerFlat, Inspecting) {
-    struct Row {
-        Path path;
-        MgErr err;
-        int32 type;
-        bool isPath, isPathOrNot, isAbs, isEmpty, isCDUp;
-        int32 depth, count;
-    };
     PathRef bareAbs = Abs({});
-    const Row rows[] = {{nullptr, 1, 2, false, false, false, false, false, -1, 0},
-                        {&abs_, 0, 0, true, true, true, false, false, 2, 2},
-                        {&rel_, 0, 1, true, true, false, false, true, 2, 2},
-                        {&none_, 0, 2, false, true, false, false, false, -1, 0},
-                        {&bareUnc_, 1, 2, true, false, false, true, false, -1, 0},
-                        {&null_, 1, 2, true, false, false, true, false, -1, 0},
-                        {&bareAbs, 0, 0, true, true, true, true, false, 0, 0}};
-    for (const Row& row : rows) {
-        SCOPED_TRACE(Show(row.path));
+    // Error and type; path, path or not-a-path, absolute, empty, with a step up; depth and count; size in PathRefs.
+    const std::pair<Path, std::vector<int32>> rows[] = {
+        {nullptr, {1, 2, 0, 0, 0, 0, 0, -1, 0, 0}},   {&abs_, {0, 0, 1, 1, 1, 0, 0, 2, 2, 1}},
+        {&rel_, {0, 1, 1, 1, 0, 0, 1, 2, 2, 1}},      {&none_, {0, 2, 0, 1, 0, 0, 0, -1, 0, 1}},
+        {&bareUnc_, {1, 2, 1, 0, 0, 1, 0, -1, 0, 1}}, {&null_, {1, 2, 1, 0, 0, 1, 0, -1, 0, 1}},
+        {&bareAbs, {0, 0, 1, 1, 1, 1, 0, 0, 0, 1}}};
+    for (const auto& [path, expected] : rows) {
         int32 type = 99;
-        EXPECT_EQ(row.err, FGetPathType(row.path, &type));
-        EXPECT_EQ(row.type, type);
-        EXPECT_EQ(row.isPath, FIsAPath(row.path));
-        EXPECT_EQ(row.isPathOrNot, FIsAPathOrNotAPath(row.path));
-        EXPECT_EQ(row.isAbs, FIsAbsPath(row.path));
-        EXPECT_EQ(row.isEmpty, FIsEmptyPath(row.path));
-        EXPECT_EQ(row.isCDUp, FIsCDUp(row.path));
-        EXPECT_EQ(row.depth, FDepth(row.path));
-        EXPECT_EQ(row.count, PathCnt(row.path));
-        EXPECT_EQ(row.path ? sizeof(PathRef) : 0, PathSize(row.path));
+        const MgErr err = FGetPathType(path, &type);
+        EXPECT_EQ(expected, (std::vector<int32>{err, type, FIsAPath(path), FIsAPathOrNotAPath(path), FIsAbsPath(path),
+                                                FIsEmptyPath(path), FIsCDUp(path), FDepth(path), PathCnt(path),
+                                                static_cast<int32>(PathSize(path) / sizeof(PathRef))}))
+            << Show(path);
     }
     EXPECT_EQ(kPathUNC, PathType(&bareUnc_));
     EXPECT_TRUE(FIsAPathOfType(&bareUnc_, kPathUNC));
@@ -132,24 +118,18 @@ TEST_F(PathManagerFlat, Types) {
 TEST_F(PathManagerFlat, Comparing) {
     PathRef ab = Abs({"a", "b"}), AB = Abs({"A", "B"}), ac = Abs({"a", "c"}), xb = Abs({"x", "q", "b"});
     PathRef bare = Abs({});
-    EXPECT_TRUE(FPathEqual(&ab, &AB));
-    EXPECT_FALSE(FPathEqual(&ab, nullptr));
-    EXPECT_TRUE(FPathEqual(nullptr, nullptr));
-    EXPECT_EQ(1, FPathCmpExact(&ab, &AB));
-    EXPECT_EQ(-1, FPathCmpExact(nullptr, &ab));
-    EXPECT_EQ(1, FPathCmpExact(&ab, nullptr));
-    EXPECT_EQ(0, FPathCmpLexical(&ab, &AB));
-    EXPECT_EQ(1, FPathCmpLexical(nullptr, &ab));
-    EXPECT_EQ(0, FPathCmp(&ab, &AB));
-    EXPECT_EQ(2, FPathCmp(&ab, &ac));
-    EXPECT_EQ(2, FPathCmp(&ac, &ab));
-    EXPECT_EQ(-1, FPathCmp(&ab, &rel_));
-    EXPECT_EQ(-1, FPathCmp(&bare, &ab));
-    EXPECT_EQ(1, FPathCmp(&ab, &bare));
-    EXPECT_EQ(2, FPathMatchingTailCount(&AB, &xb));
-    EXPECT_EQ(0, FPathMatchingTailCount(&ab, &AB));
-    EXPECT_EQ(1, FPathMatchingTailCount(&ab, &ac));
-    EXPECT_EQ(-1, FPathMatchingTailCount(&ab, &rel_));
+    const struct {
+        Path a, b;
+        std::vector<int32> equalExactLexicalCmpTail;
+    } rows[] = {{&ab, &AB, {1, 1, 0, 0, 0}},        {&ab, &ac, {0, -2, -2, 2, 1}},
+                {&ac, &ab, {0, 2, 2, 2, 1}},        {&ab, &rel_, {0, -1, -1, -1, -1}},
+                {&bare, &ab, {0, -2, -2, -1, 1}},  {&ab, &bare, {0, 2, 2, 1, 1}},
+                {&AB, &xb, {0, -1, -1, 1, 2}},      {&ab, nullptr, {0, 1, -1, -1, -1}},
+                {nullptr, &ab, {0, -1, 1, -1, -1}}, {nullptr, nullptr, {1, 0, 0, 0, 0}}};
+    for (const auto& [a, b, expected] : rows)
+        EXPECT_EQ(expected, (std::vector<int32>{FPathEqual(a, b), FPathCmpExact(a, b), FPathCmpLexical(a, b),
+                                                FPathCmp(a, b), FPathMatchingTailCount(a, b)}))
+            << Show(a) << " " << Show(b);
     EXPECT_TRUE(FileNameEqual(PStrOf("Name"), PStrOf("nAME")));
     EXPECT_FALSE(FileNameEqual(PStrOf("Name"), PStrOf("Names")));
     EXPECT_TRUE(FileNameNEqual(PStrOf("Name1"), PStrOf("nAME2"), 4));

@@ -1,5 +1,6 @@
 // The bytes: what is written, what is accepted, and what is refused without a step outside.
-#include "platform/LastError.h"
+#include <gmock/gmock.h>
+
 #include "resources/ResourceTestSupport.h"
 
 namespace tessel::test {
@@ -13,12 +14,8 @@ protected:
     void Walk(const std::string& bytes, int32 mode) {
         RsrcFile file = 0;
         const MgErr opened = TryOpen(bytes, mode, &file);
-        if (opened) {
-            EXPECT_TRUE(opened == kMemFullErr || opened == kEOFErr || opened == kIOErr || opened == kNotResFileErr ||
-                        opened == kVersionErr)
-                << opened;
-            return;
-        }
+        EXPECT_THAT(opened, testing::AnyOf(kNoErr, kMemFullErr, kEOFErr, kIOErr, kNotResFileErr, kVersionErr));
+        if (opened) return;
         int32 types = 0;
         EXPECT_EQ(kNoErr, RCountTypes(file, &types));
         for (int32 t = 1; t <= types; ++t) WalkType(file, t);
@@ -30,12 +27,10 @@ protected:
         if (RGetMemFileHandle(file, &image) == kNoErr) {
             // What an update has written is good.
             const std::string updated = BytesOf(image);
-            EXPECT_EQ(kNoErr, OpenErr(mode == kROpenReadWrite ? updated : Fixture("plain.rsrc"), kROpenReadOnly));
-            RCloseFileForce(file);
-            DSDisposeHandle(image);
-        } else {
-            RCloseFileForce(file);
+            EXPECT_EQ(kNoErr, OpenErr(updated, kROpenReadOnly));
         }
+        RCloseFileForce(file);
+        DSDisposeHandle(image);
     }
     void WalkType(RsrcFile file, int32 index) {
         ResType type = 0;
@@ -75,10 +70,7 @@ TEST_F(FormatTest, EmptyAndOneResourceByteForByte) {
     EXPECT_EQ(header + data + map, started.drive.Get("f"));
 
     file = OpenDisk("f");
-    UHandle removed = nullptr;
-    ASSERT_EQ(kNoErr, RGet(file, kStr, -2, &removed));
-    ASSERT_EQ(kNoErr, RRemove(removed, file));
-    DSDisposeHandle(removed);
+    Remove(file, kStr, -2);
     ASSERT_EQ(kNoErr, RCloseFile(file));
     EXPECT_EQ(kEmpty, started.drive.Get("f"));
 }
@@ -164,21 +156,21 @@ TEST_F(FormatTest, DamagedMapsAreRefused) {
 TEST_F(FormatTest, DamagedDataFailOnlyTheirOwnResource) {
     const std::string plain = Fixture("plain.rsrc");
     const size_t firstEntry = 6116 + 52 + 4 + 12 * 5;
-    const auto get = [&](const std::string& bytes, int32 mode) {
-        const RsrcFile file = Open(bytes, mode);
-        const std::string damaged = Get(file, kStrList, 5), sound = Get(file, kStr, -1);
-        EXPECT_EQ("\x0bnegative id", sound);
-        EXPECT_EQ(kNoErr, RCloseFile(file));
-        return damaged;
+    const std::pair<std::string, const char*> rows[] = {
+        {WithWord(plain, firstEntry + 12, 6084 - 3), "error 4"},
+        {WithWord(plain, firstEntry + 12, 0xFFFFFFFE), "error 4"},
+        {WithWord(plain, 32, 6081), "error 4"},
+        {WithWord(plain, 32, 0xFFFFFFFC), "error 4"},
+        // The data section claims more than the file has.
+        {WithWord(WithWord(plain, 28, 0xFFFFFFFF), 32, 0xFFFFFF00), "error 4"},
+        {WithWord(WithWord(plain, 28, 0xFFFFFFFF), firstEntry + 12, 7000), "error 13"},
     };
     for (const int32 mode : {kROpenReadOnly, kROpenReadWrite}) {
-        EXPECT_EQ("error 4", get(WithWord(plain, firstEntry + 12, 6084 - 3), mode));
-        EXPECT_EQ("error 4", get(WithWord(plain, firstEntry + 12, 0xFFFFFFFE), mode));
-        EXPECT_EQ("error 4", get(WithWord(plain, 32, 6081), mode));
-        EXPECT_EQ("error 4", get(WithWord(plain, 32, 0xFFFFFFFC), mode));
-        // The data section claims more than the file has.
-        EXPECT_EQ("error 4", get(WithWord(WithWord(plain, 28, 0xFFFFFFFF), 32, 0xFFFFFF00), mode));
-        EXPECT_EQ("error 13", get(WithWord(WithWord(plain, 28, 0xFFFFFFFF), firstEntry + 12, 7000), mode));
+        for (const auto& [bytes, error] : rows) {
+            const RsrcFile damaged = Open(bytes, mode);
+            EXPECT_EQ(error, Get(damaged, kStrList, 5));
+            EXPECT_EQ("\x0bnegative id", Get(damaged, kStr, -1));
+        }
     }
     // An update does not begin what it cannot finish.
     const RsrcFile file = Open(WithWord(plain, 32, 6081));
@@ -200,14 +192,10 @@ TEST_F(FormatTest, EntriesThatOverlapAreSavedFromEachOther) {
     const size_t thirdEntry = bytes.size() - 20;
     bytes = WithWord(bytes, thirdEntry + 12, 12);  // the length word inside of resource 2
     const RsrcFile file = Open(bytes);
-    UHandle data = nullptr;
-    ASSERT_EQ(kNoErr, RGet(file, kData, 1, &data));
-    ASSERT_EQ(kNoErr, RRemove(data, file));
-    DSDisposeHandle(data);
+    Remove(file, kData, 1);
     EXPECT_EQ(kNoErr, RUpdateFile(file));
     EXPECT_EQ("\0\0\0\4abcd"s, Get(file, kData, 2));
     EXPECT_EQ("abcd", Get(file, kData, 3));
-    EXPECT_EQ(kNoErr, RCloseFile(file));
 }
 
 TEST_F(FormatTest, NoDamageLeadsOutside) {

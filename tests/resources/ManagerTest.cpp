@@ -1,4 +1,5 @@
 // Refnums, chains, handles, strings and paths, readers and writers.
+#include <gmock/gmock.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/resources/RFReadWrite.h>
@@ -25,11 +26,6 @@ std::string TextOf(const PathRef& path) {
 
 class ManagerTest : public ResourceTest {
 protected:
-    RsrcFile NewMemFile() {
-        RsrcFile file = 0;
-        EXPECT_EQ(kNoErr, RCreateMemFile(&file, kCreator, kType));
-        return file;
-    }
     std::string IDs(RsrcFile file, ResType type) {
         std::string ids;
         UHandle data = nullptr;
@@ -54,10 +50,7 @@ TEST_F(ManagerTest, ResourcesAreKeptByTypeAndAscendingID) {
     UHandle data = nullptr;
     ASSERT_EQ(kNoErr, RGetNamed(file, kData, Name("\2N5"), &data));
     EXPECT_EQ("5", BytesOf(data));
-    ASSERT_EQ(kNoErr, RGet(file, kData, 1, &data));
-    ASSERT_EQ(kNoErr, RRemove(data, file));
-    EXPECT_EQ("1", BytesOf(data));
-    DSDisposeHandle(data);
+    Remove(file, kData, 1);
     for (const char* name : {"\2n5", "\2n3", "\013n2147483647"}) {
         Str255 found;
         ASSERT_EQ(kNoErr, RGetNamed(file, kData, Name(name), &data));
@@ -82,15 +75,13 @@ TEST_F(ManagerTest, ResourcesAreKeptByTypeAndAscendingID) {
     EXPECT_EQ(0, exists);
     EXPECT_EQ(kNoErr, RIsLoaded(file, kStr, 3, &loaded));
     EXPECT_TRUE(loaded);
-    EXPECT_EQ(kNoErr, RCloseFile(file));
 }
 
 TEST_F(ManagerTest, ChangesAreKeptUntilTheyAreWritten) {
     const ReportRecorder reports;
     RsrcFile file = CreateDisk("f");
     ASSERT_EQ(kNoErr, Add(file, kData, 1, "one"));
-    UHandle data = nullptr;
-    ASSERT_EQ(kNoErr, RGet(file, kData, 1, &data));
+    UHandle data = Loaded(file, kData, 1);
     EXPECT_EQ(kArgErr, RRelease(data));
     EXPECT_EQ(kResNotFoundErr, RDetach(data));
     // Attributes are the caller's, but do not lose data.
@@ -116,7 +107,7 @@ TEST_F(ManagerTest, ChangesAreKeptUntilTheyAreWritten) {
     EXPECT_TRUE(reports.Has(kDebugWarning, "Releasing a non-resource"));
     EXPECT_EQ("on", Get(file, kData, 1));
 
-    ASSERT_EQ(kNoErr, RGet(file, kData, 1, &data));
+    data = Loaded(file, kData, 1);
     EXPECT_EQ(kNoErr, RDetach(data));
     ResFile* object = RsrcFileToRMapResFile(file);
     EXPECT_EQ(kNoErr, object->RReplacePtr("replaced", 8, kData, 1));
@@ -130,15 +121,11 @@ TEST_F(ManagerTest, ChangesAreKeptUntilTheyAreWritten) {
 
     file = OpenDisk("f", kROpenReadOnly);
     EXPECT_EQ("on", Get(file, kData, 1));
-    ASSERT_EQ(kNoErr, RGet(file, kData, 1, &data));
-    EXPECT_EQ(kPermissionErr, RChanged(data));
-    EXPECT_EQ(kPermissionErr, RSetAttrs(data, 0));
-    EXPECT_EQ(kPermissionErr, RRemove(data, file));
+    data = Loaded(file, kData, 1);
+    EXPECT_THAT((std::vector<MgErr>{RChanged(data), RSetAttrs(data, 0), RRemove(data, file), Add(file, kData, 2, "x"),
+                                    RSetFileAttrs(file, 0), RPreAllocFile(file, 1)}),
+                testing::Each(kPermissionErr));
     EXPECT_EQ("on", Get(file, kData, 1));
-    EXPECT_EQ(kPermissionErr, Add(file, kData, 2, "x"));
-    EXPECT_EQ(kPermissionErr, RSetFileAttrs(file, 0));
-    EXPECT_EQ(kPermissionErr, RPreAllocFile(file, 1));
-    EXPECT_EQ(kNoErr, RCloseFile(file));
     EXPECT_TRUE(reports.Has(kDebugWarning, "Tried to call RSetFileAttrs on a readonly file"));
     EXPECT_TRUE(reports.Has(kDebugWarning, "Tried to call RPreAllocFile on a readonly file"));
 }
@@ -146,8 +133,7 @@ TEST_F(ManagerTest, ChangesAreKeptUntilTheyAreWritten) {
 TEST_F(ManagerTest, ProtectedResourcesStay) {
     const RsrcFile file = NewMemFile(), other = NewMemFile();
     ASSERT_EQ(kNoErr, Add(file, kData, 1, "x"));
-    UHandle data = nullptr;
-    ASSERT_EQ(kNoErr, RGet(file, kData, 1, &data));
+    UHandle data = Loaded(file, kData, 1);
     EXPECT_EQ(kResNotFoundErr, RRemove(data, other));
     EXPECT_EQ(kNoErr, RSetAttrs(data, kRProtectedAttr));
     EXPECT_EQ(kResNotFoundErr, RRemove(data, file));
@@ -156,8 +142,6 @@ TEST_F(ManagerTest, ProtectedResourcesStay) {
     EXPECT_EQ(kNoErr, RRemove(data, file));
     EXPECT_EQ("error 15", Get(file, kData, 1));
     DSDisposeHandle(data);
-    EXPECT_EQ(kNoErr, RCloseFile(file));
-    EXPECT_EQ(kNoErr, RCloseFile(other));
 }
 
 TEST_F(ManagerTest, UnknownRefnumsAndHandlesReachNothing) {
@@ -169,32 +153,23 @@ TEST_F(ManagerTest, UnknownRefnumsAndHandlesReachNothing) {
     int32 number = 7;
     bool loaded = true;
     ConstPStr string = nullptr;
+    using Errors = std::vector<MgErr>;
     for (const RsrcFile refnum : {stale, RsrcFile{0}, RsrcFile{12345}}) {
-        EXPECT_EQ(kNotResFileErr, RGet(refnum, kData, 1, &image));
+        EXPECT_THAT((Errors{RGet(refnum, kData, 1, &image), RGetInd(refnum, kData, 1, &image),
+                            RGetNamed(refnum, kData, Name("\1n"), &image), RExists(refnum, kData, 1, &number),
+                            RAdd(data, refnum, kData, 1, nullptr), RCount(refnum, kData, &number),
+                            RCountTypes(refnum, &number), RGetFileAttrs(refnum, &attrs), RSetFileAttrs(refnum, 0),
+                            RUpdateFile(refnum), RCloseFile(refnum), RCloseFileForce(refnum), RUniqueID(refnum, kData),
+                            RGetIndStringPtr(refnum, &string, 1, 1, kStrList), RReleaseRsrcFileRefnum(refnum)}),
+                    testing::Each(kNotResFileErr));
         EXPECT_EQ(nullptr, image);
-        EXPECT_EQ(kNotResFileErr, RGetInd(refnum, kData, 1, &image));
-        EXPECT_EQ(kNotResFileErr, RGetNamed(refnum, kData, Name("\1n"), &image));
-        EXPECT_EQ(kNotResFileErr, RExists(refnum, kData, 1, &number));
-        EXPECT_EQ(kNotResFileErr, RAdd(data, refnum, kData, 1, nullptr));
-        EXPECT_EQ(kNotResFileErr, RCount(refnum, kData, &number));
-        EXPECT_EQ(kNotResFileErr, RCountTypes(refnum, &number));
-        EXPECT_EQ(kNotResFileErr, RGetFileAttrs(refnum, &attrs));
-        EXPECT_EQ(kNotResFileErr, RSetFileAttrs(refnum, 0));
-        EXPECT_EQ(kNotResFileErr, RUpdateFile(refnum));
-        EXPECT_EQ(kNotResFileErr, RCloseFile(refnum));
-        EXPECT_EQ(kNotResFileErr, RCloseFileForce(refnum));
-        EXPECT_EQ(kNotResFileErr, RUniqueID(refnum, kData));
-        EXPECT_EQ(kNotResFileErr, RGetIndStringPtr(refnum, &string, 1, 1, kStrList));
-        EXPECT_EQ(kNotResFileErr, RReleaseRsrcFileRefnum(refnum));
         EXPECT_EQ(kResNotFoundErr, RIsLoaded(refnum, kData, 1, &loaded));
-        EXPECT_EQ(kPermissionErr, RPreAllocFile(refnum, 1));
-        EXPECT_EQ(kPermissionErr, RGetUHandleOwnership(refnum, &image));
-        EXPECT_EQ(kPermissionErr, RGetMemFileHandle(refnum, &image));
+        EXPECT_THAT(
+            (Errors{RPreAllocFile(refnum, 1), RGetUHandleOwnership(refnum, &image), RGetMemFileHandle(refnum, &image)}),
+            testing::Each(kPermissionErr));
     }
-    EXPECT_EQ(kResNotFoundErr, RRemove(own, stale));
-    EXPECT_EQ(kResNotFoundErr, RDetach(own));
-    EXPECT_EQ(kResNotFoundErr, RChanged(own));
-    EXPECT_EQ(kResNotFoundErr, RGetInfo(own, nullptr, nullptr, nullptr));
+    EXPECT_THAT((Errors{RRemove(own, stale), RDetach(own), RChanged(own), RGetInfo(own, nullptr, nullptr, nullptr)}),
+                testing::Each(kResNotFoundErr));
     EXPECT_EQ(kArgErr, RGet(stale, kData, 1, nullptr));
 
     const RsrcFile file = NewMemFile();
@@ -245,8 +220,6 @@ TEST_F(ManagerTest, ChainsAreSearchedInOrder) {
     delete objects;
     EXPECT_EQ(kNoErr, RDestroyChain(chain));
     EXPECT_EQ("b2", Get(b, kData, 2));
-    EXPECT_EQ(kNoErr, RCloseFile(a));
-    EXPECT_EQ(kNoErr, RCloseFile(b));
 }
 
 TEST_F(ManagerTest, RefnumsEndWithTheirFile) {
@@ -278,8 +251,6 @@ TEST_F(ManagerTest, HandlesAreFoundAfterOthersWereUsed) {
     EXPECT_EQ(kResNotFoundErr, RChanged(own));
     EXPECT_EQ(16u, DSGetHandleSize(own));
     DSDisposeHandle(own);
-    EXPECT_EQ(kNoErr, RCloseFile(a));
-    EXPECT_EQ(kNoErr, RCloseFile(b));
 }
 
 TEST_F(ManagerTest, StringsAndPathsAreReadAndNeverBeyondTheirResource) {
@@ -348,7 +319,6 @@ TEST_F(ManagerTest, StringsAndPathsAreReadAndNeverBeyondTheirResource) {
     PathRef::DisposePath(read);
     EXPECT_EQ(kCorruptErr, RGetPath(odd, kStr, 1, &read));
     EXPECT_EQ(kArgErr, RGetStringStd(odd, nullptr, 1));
-    EXPECT_EQ(kNoErr, RCloseFile(odd));
 }
 
 TEST_F(ManagerTest, ImagesOfWholeFiles) {
@@ -402,7 +372,6 @@ TEST_F(ManagerTest, UniqueIDsAreNotTaken) {
     EXPECT_EQ(next + 1, RUniqueID(file, kStr));
     for (int32 id = next + 2; id < next + 10; ++id) ASSERT_EQ(kNoErr, Add(file, kData, id, "x"));
     EXPECT_EQ(next + 10, RUniqueID(file, kData));
-    EXPECT_EQ(kNoErr, RCloseFile(file));
 }
 
 TEST_F(ManagerTest, TypesDatesAndOpenFiles) {
@@ -461,7 +430,6 @@ TEST_F(ManagerTest, FilesThatTheHostHasInMemory) {
     Set_IsFileAlreadyInCache(nullptr);
     EXPECT_EQ(kType, type);
     EXPECT_EQ("\x0bnegative id", Get(file, kStr, -1));
-    EXPECT_EQ(kNoErr, RCloseFile(file));
 }
 
 TEST_F(ManagerTest, ReadersAndWriters) {
@@ -529,7 +497,6 @@ TEST_F(ManagerTest, ManyThreadsShareTheFiles) {
     int32 count = 0;
     EXPECT_EQ(kNoErr, RCount(file, kData, &count));
     EXPECT_EQ(4 * 30, count);
-    EXPECT_EQ(kNoErr, RCloseFile(file));
 }
 
 TEST_F(ManagerTest, FilesLeftOpenAreReportedAtTheStop) {

@@ -9,6 +9,7 @@
 #include <fstream>
 #include <iterator>
 #include <string>
+#include <vector>
 
 #include "support/StartedFiles.h"
 
@@ -60,7 +61,13 @@ inline ConstPStr Name(const std::string& pstr) {
 
 class ResourceTest : public testing::Test {
 protected:
-    // Opens bytes; the file is closed with the test.
+    // Files that a test leaves open are closed with it.
+    ~ResourceTest() override {
+        for (const RsrcFile file : opened_) {
+            const MgErr err = RCloseFile(file);
+            EXPECT_TRUE(err == kNoErr || err == kNotResFileErr) << err;
+        }
+    }
     MgErr TryOpen(const std::string& bytes, int32 mode, RsrcFile* file) {
         UHandle image = HandleOf(bytes);
         const MgErr err = ROpenUHandle(image, mode, file, nullptr, nullptr);
@@ -71,26 +78,31 @@ protected:
         RsrcFile file = 0;
         const MgErr err = TryOpen(bytes, mode, &file);
         EXPECT_EQ(err != kNoErr, file == 0);
-        if (!err) {
-            EXPECT_EQ(kNoErr, RCloseFile(file));
-        }
+        EXPECT_EQ(kNoErr, err ? kNoErr : RCloseFile(file));
         return err;
+    }
+    RsrcFile Opened(MgErr err, RsrcFile file) {
+        EXPECT_EQ(kNoErr, err);
+        return opened_.emplace_back(file);
     }
     RsrcFile Open(const std::string& bytes, int32 mode = kROpenReadWrite) {
         RsrcFile file = 0;
-        EXPECT_EQ(kNoErr, TryOpen(bytes, mode, &file));
-        return file;
+        const MgErr err = TryOpen(bytes, mode, &file);
+        return Opened(err, file);
     }
     RsrcFile OpenDisk(std::string_view name, int32 mode = kROpenReadWrite) {
-        PathRef path = started.On(name);
         RsrcFile file = 0;
-        EXPECT_EQ(kNoErr, ROpenFile(&path, mode, &file, nullptr, nullptr));
-        return file;
+        const MgErr err = ROpenFile(started.At(name), mode, &file, nullptr, nullptr);
+        return Opened(err, file);
     }
     RsrcFile CreateDisk(std::string_view name) {
-        PathRef path = started.On(name);
-        EXPECT_EQ(kNoErr, RCreateFile(&path, 1, kCreator, kType, 0));
+        EXPECT_EQ(kNoErr, RCreateFile(started.At(name), 1, kCreator, kType, 0));
         return OpenDisk(name);
+    }
+    RsrcFile NewMemFile() {
+        RsrcFile file = 0;
+        const MgErr err = RCreateMemFile(&file, kCreator, kType);
+        return Opened(err, file);
     }
     MgErr Add(RsrcFile file, ResType type, int32 id, const std::string& bytes, const std::string& name = "") {
         UHandle data = HandleOf(bytes);
@@ -99,13 +111,26 @@ protected:
         if (err) DSDisposeHandle(data);
         return err;
     }
+    UHandle Loaded(RsrcFile file, ResType type, int32 id) {
+        UHandle data = nullptr;
+        EXPECT_EQ(kNoErr, RGet(file, type, id, &data));
+        return data;
+    }
     std::string Get(RsrcFile file, ResType type, int32 id) {
         UHandle data = nullptr;
         const MgErr err = RGet(file, type, id, &data);
         return err ? "error " + std::to_string(err) : BytesOf(data);
     }
+    void Remove(RsrcFile file, ResType type, int32 id) {
+        UHandle data = Loaded(file, type, id);
+        ASSERT_EQ(kNoErr, RRemove(data, file));
+        DSDisposeHandle(data);
+    }
 
     StartedFiles started;
+
+private:
+    std::vector<RsrcFile> opened_;
 };
 
 }  // namespace tessel::test

