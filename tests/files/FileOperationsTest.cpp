@@ -20,31 +20,16 @@ constexpr uint32 kSecondsFrom1904To1970 = 2082844800u;
 class FileOperationsTest : public testing::Test {
 protected:
     MgErr Create(std::string_view name, int32 always, int32 mode = kFOpenReadWrite) {
-        PathRef path = started.On(name);
         File_t* file = nullptr;
-        const MgErr err = FGenericCreate(&file, &path, 0, mode, kFDenyNone, 0, always);
-        if (!err) {
-            EXPECT_EQ(kNoErr, FMWrite(file, 3, nullptr, "new"));
-            EXPECT_EQ(kNoErr, FMClose(file));
-        }
-        return err;
+        const MgErr err = FGenericCreate(&file, At(name), 0, mode, kFDenyNone, 0, always);
+        if (err) return err;
+        EXPECT_EQ(kNoErr, FMWrite(file, 3, nullptr, "new"));
+        return FMClose(file);
     }
-    int32 Exists(std::string_view name) {
-        PathRef path = started.On(name);
-        return FExists(&path);
-    }
-    template <class Operation, class... Names>
-    MgErr Do(Operation operation, Names... names) {
-        std::vector<PathRef> paths = {started.On(names)...};
-        if constexpr (sizeof...(names) == 1)
-            return operation(&paths[0]);
-        else
-            return operation(&paths[0], &paths[1]);
-    }
+    StartedFiles::Lasting At(std::string_view name) const { return started.At(name); }
     FInfo64Rec Info(std::string_view name) {
-        PathRef path = started.On(name);
         FInfo64Rec info;
-        EXPECT_EQ(kNoErr, FGetInfo64(&path, &info, kFInfoAll));
+        EXPECT_EQ(kNoErr, FGetInfo64(At(name), &info, kFInfoAll));
         return info;
     }
 
@@ -65,34 +50,34 @@ TEST_F(FileOperationsTest, CreatesNewFilesAndReplacesOnlyWhenAsked) {
 
 TEST_F(FileOperationsTest, CopiesAndMoves) {
     started.drive.Put("a", "data");
-    EXPECT_EQ(kNoErr, Do(FCopy, "a", "b"));
+    EXPECT_EQ(kNoErr, FCopy(At("a"), At("b")));
     EXPECT_EQ("data", started.drive.Get("b"));
     started.drive.Put("b", "kept");
-    EXPECT_EQ(kExistsErr, Do(FCopy, "a", "b"));
-    EXPECT_EQ(kExistsErr, Do(FMove, "a", "b"));
+    EXPECT_EQ(kExistsErr, FCopy(At("a"), At("b")));
+    EXPECT_EQ(kExistsErr, FMove(At("a"), At("b")));
     EXPECT_EQ("kept", started.drive.Get("b"));
-    EXPECT_EQ(kNoErr, Do(FMove, "a", "c"));
-    EXPECT_EQ(0, Exists("a"));
+    EXPECT_EQ(kNoErr, FMove(At("a"), At("c")));
+    EXPECT_EQ(0, FExists(At("a")));
 
     started.drive.Put("big", std::string(20000, 'x'));
-    EXPECT_EQ(kNoErr, Do(FMoveInto, "big", "b"));
+    EXPECT_EQ(kNoErr, FMoveInto(At("big"), At("b")));
     EXPECT_EQ(std::string(20000, 'x'), started.drive.Get("b"));
-    EXPECT_EQ(0, Exists("big"));
+    EXPECT_EQ(0, FExists(At("big")));
     const ReportRecorder reports;
-    EXPECT_EQ(kNotFoundErr, Do(FMoveInto, "c", "nothing"));
+    EXPECT_EQ(kNotFoundErr, FMoveInto(At("c"), At("nothing")));
     EXPECT_TRUE(reports.Has(kDebugWarning, "FCopyIntoWin32 got error 7"));
     EXPECT_EQ("data", started.drive.Get("c"));
 
-    PathRef volume = started.On("").Volume(), to = started.On("x");
-    EXPECT_EQ(kArgErr, FMove(&volume, &to));
-    EXPECT_EQ(kArgErr, FCopy(&volume, &to));
+    PathRef volume = started.On("").Volume();
+    EXPECT_EQ(kArgErr, FMove(&volume, At("x")));
+    EXPECT_EQ(kArgErr, FCopy(&volume, At("x")));
 }
 
 TEST_F(FileOperationsTest, MovingTheCurrentFolderGoesToItsParentFirst) {
     const auto before = std::filesystem::current_path();
-    ASSERT_EQ(kNoErr, Do(FNewDirHier, "one/two"));
+    ASSERT_EQ(kNoErr, FNewDirHier(At("one/two")));
     std::filesystem::current_path(started.drive.Native("one/two"));
-    EXPECT_EQ(kNoErr, Do(FMove, "one/two", "one/three"));
+    EXPECT_EQ(kNoErr, FMove(At("one/two"), At("one/three")));
     EXPECT_EQ(std::filesystem::canonical(started.drive.Native("one")), std::filesystem::current_path());
     Path here = nullptr;
     EXPECT_EQ(kNoErr, GetWorkingDir(&here));
@@ -102,19 +87,18 @@ TEST_F(FileOperationsTest, MovingTheCurrentFolderGoesToItsParentFirst) {
 }
 
 TEST_F(FileOperationsTest, FoldersAreMadeAndRemoved) {
-    EXPECT_EQ(kNoErr, Do(FNewDirHier, "a/b/c"));
-    EXPECT_EQ(kNoErr, Do(FNewDirHier, "a/b/c"));
-    EXPECT_EQ(2, Exists("a/b/c"));
+    EXPECT_EQ(kNoErr, FNewDirHier(At("a/b/c")));
+    EXPECT_EQ(kNoErr, FNewDirHier(At("a/b/c")));
+    EXPECT_EQ(2, FExists(At("a/b/c")));
     started.drive.Put("a/f", "");
-    EXPECT_EQ(1, Exists("A/F"));
-    EXPECT_EQ(kGenericErr, Do(FNewDirHier, "a/f"));
-    PathRef again = started.On("a/b");
-    EXPECT_EQ(kExistsErr, FNewDir(&again, 0));
-    EXPECT_EQ(kIOErr, Do(FRemove, "a"));
-    EXPECT_EQ(kNoErr, Do(FRemove, "a/b/c"));
-    EXPECT_EQ(kNoErr, Do(FRemove, "a/f"));
-    EXPECT_EQ(kNotFoundErr, Do(FRemove, "a/f"));
-    EXPECT_EQ(0, Exists("a/f"));
+    EXPECT_EQ(1, FExists(At("A/F")));
+    EXPECT_EQ(kGenericErr, FNewDirHier(At("a/f")));
+    EXPECT_EQ(kExistsErr, FNewDir(At("a/b"), 0));
+    EXPECT_EQ(kIOErr, FRemove(At("a")));
+    EXPECT_EQ(kNoErr, FRemove(At("a/b/c")));
+    EXPECT_EQ(kNoErr, FRemove(At("a/f")));
+    EXPECT_EQ(kNotFoundErr, FRemove(At("a/f")));
+    EXPECT_EQ(0, FExists(At("a/f")));
     PathRef volumes(PathRef::kAbsolute), relative("a", PathRef::StringDisplay());
     EXPECT_EQ(2, FExists(&volumes));
     EXPECT_EQ(0, FExists(&relative));
@@ -122,40 +106,33 @@ TEST_F(FileOperationsTest, FoldersAreMadeAndRemoved) {
 
 TEST_F(FileOperationsTest, InformationIsWhatTheSystemSays) {
     started.drive.Put("f.zzz", "12345");
-    ASSERT_EQ(kNoErr, Do(FNewDirHier, "d"));
+    ASSERT_EQ(kNoErr, FNewDirHier(At("d")));
     for (const char* name : {"d/1", "d/2", "d/3"}) started.drive.Put(name, "");
     struct stat native;
     ASSERT_EQ(0, stat(started.drive.Native("f.zzz").c_str(), &native));
 
     const FInfo64Rec file = Info("f.zzz");
-    EXPECT_EQ(0, std::memcmp(&file.type, "????", 4));
-    EXPECT_EQ(0, std::memcmp(&file.creator, "????", 4));
-    EXPECT_EQ(5, file.size);
-    EXPECT_EQ(0666, file.permissions);
-    EXPECT_EQ(0, file.folder);
+    const uint32 unknown = TESSEL_FOURCC('?', '?', '?', '?');
+    EXPECT_EQ(std::tuple(unknown, unknown, 5, 0666, 0),
+              std::tuple(file.type, file.creator, file.size, file.permissions, file.folder));
     const auto rounded = static_cast<uint32>(native.st_mtim.tv_sec + (native.st_mtim.tv_nsec >= 500000000));
     EXPECT_EQ(rounded + kSecondsFrom1904To1970, file.modificationDate);
 
     const FInfo64Rec folder = Info("d");
-    EXPECT_EQ(3, folder.size);
-    EXPECT_EQ(1, folder.folder);
-    EXPECT_EQ(0777, folder.permissions);
-
-    PathRef volumes(PathRef::kAbsolute), missing = started.On("missing");
+    EXPECT_EQ(std::tuple(3, 0777, 1), std::tuple(folder.size, folder.permissions, folder.folder));
+    PathRef volumes(PathRef::kAbsolute);
     FInfo64Rec info;
     EXPECT_EQ(kNoErr, FGetInfo64(&volumes, &info, kFInfoAll));
-    EXPECT_EQ(1, info.folder);
-    EXPECT_EQ(2, info.size);
-    EXPECT_EQ(kNotFoundErr, FGetInfo64(&missing, &info, kFInfoAll));
+    EXPECT_EQ(std::tuple(2, 1), std::tuple(info.size, info.folder));
+    EXPECT_EQ(kNotFoundErr, FGetInfo64(At("missing"), &info, kFInfoAll));
 }
 
 TEST_F(FileOperationsTest, ASizeThat32BitsCannotHoldIsReported) {
     started.drive.Put("f", "");
     ASSERT_EQ(0, truncate(started.drive.Native("f").c_str(), 3000000000));
-    PathRef path = started.On("f");
     FInfoRec info;
     const ReportRecorder reports;
-    EXPECT_EQ(kNoErr, FGetInfo(&path, &info));
+    EXPECT_EQ(kNoErr, FGetInfo(At("f"), &info));
     EXPECT_EQ(static_cast<int32>(3000000000u), info.size);
     EXPECT_TRUE(reports.Has(kDebugWarning, "Converting 64-bit to 32-bit, but size is too big! size=3000000000"));
 }
@@ -185,34 +162,30 @@ TEST_F(FileOperationsTest, DatesAndPermissionsAreSet) {
     info.folder = 1;
     EXPECT_EQ(kNoErr, FSetInfo64(&path, &info));
     EXPECT_EQ(0666, Info("f").permissions);
-    PathRef missing = started.On("missing");
     int32 permissions = 0644;
-    EXPECT_EQ(kNotFoundErr, FSetAccessRights(&missing, nullptr, nullptr, &permissions));
-    EXPECT_EQ(kNoErr, FSetAccessRights(&missing, nullptr, nullptr, nullptr));
+    EXPECT_EQ(kNotFoundErr, FSetAccessRights(At("missing"), nullptr, nullptr, &permissions));
+    EXPECT_EQ(kNoErr, FSetAccessRights(At("missing"), nullptr, nullptr, nullptr));
     int64 ticks = 0;
     EXPECT_EQ(95616288010000000, SecsToWin32FileTime(1, &ticks));
     EXPECT_EQ(95616288010000000, ticks);
 }
 
 TEST_F(FileOperationsTest, SpecialNames) {
-    started.drive.Put(".hidden", "");
-    started.drive.Put("x.LNK", "");
-    started.drive.Put(".lnk", "");
+    for (const char* name : {".hidden", "x.LNK", ".lnk"}) started.drive.Put(name, "");
+    const std::tuple<MgErr (*)(Path, int32*), const char*, int32> rows[] = {{FIsHiddenFile, ".hidden", 1},
+                                                                            {FIsHiddenFile, "x.LNK", 0},
+                                                                            {FIsShortcut, "x.LNK", 1},
+                                                                            {FIsShortcut, ".lnk", 0},
+                                                                            {FIsShortcut, "missing.lnk", 0}};
     int32 flag = 7;
-    const auto ask = [&](MgErr (*query)(Path, int32*), const char* name) {
-        PathRef path = started.On(name);
-        EXPECT_EQ(kNoErr, query(&path, &flag)) << name;
-        return flag;
-    };
-    EXPECT_EQ(1, ask(FIsHiddenFile, ".hidden"));
-    EXPECT_EQ(0, ask(FIsHiddenFile, "x.LNK"));
-    EXPECT_EQ(1, ask(FIsShortcut, "x.LNK"));
-    EXPECT_EQ(0, ask(FIsShortcut, ".lnk"));
-    EXPECT_EQ(0, ask(FIsShortcut, "missing.lnk"));
+    for (const auto& [query, name, expected] : rows) {
+        EXPECT_EQ(kNoErr, query(At(name), &flag)) << name;
+        EXPECT_EQ(expected, flag) << name;
+    }
     const ReportRecorder reports;
-    PathRef relative("a", PathRef::StringDisplay()), file = started.On("x.LNK");
+    PathRef relative("a", PathRef::StringDisplay());
     EXPECT_EQ(kArgErr, FIsHiddenFile(&relative, &flag));
-    EXPECT_EQ(kArgErr, FIsShortcut(&file, nullptr));
+    EXPECT_EQ(kArgErr, FIsShortcut(At("x.LNK"), nullptr));
     EXPECT_EQ((std::vector<std::string>{"FIsHiddenFile: relative path passed in!",
                                         "FIsShortcut: NULL isShortcut passed in!"}),
               reports.Texts());
@@ -224,20 +197,23 @@ TEST_F(FileOperationsTest, SpecialNames) {
 }
 
 TEST_F(FileOperationsTest, CaseIsCorrectedAndRemembered) {
-    ASSERT_EQ(kNoErr, Do(FNewDirHier, "Folder"));
+    ASSERT_EQ(kNoErr, FNewDirHier(At("Folder")));
     started.drive.Put("Folder/File.txt", "");
     PathRef path = started.On("fOLDER/fILE.TXT");
-    EXPECT_TRUE(path.GetCorrectedCase(100).Equals(started.On("Folder/File.txt"), PathRef::kExact));
+    const auto isCorrected = [&] {
+        return path.GetCorrectedCase(100).Equals(started.On("Folder/File.txt"), PathRef::kExact);
+    };
+    EXPECT_TRUE(isCorrected());
     std::filesystem::remove_all(started.drive.Native("Folder"));
-    EXPECT_TRUE(path.GetCorrectedCase(100).Equals(started.On("Folder/File.txt"), PathRef::kExact));
+    EXPECT_TRUE(isCorrected());
     path.FlushCache();
-    EXPECT_FALSE(path.GetCorrectedCase(100).Equals(started.On("Folder/File.txt"), PathRef::kExact));
+    EXPECT_FALSE(isCorrected());
 
     started.drive.Put("Mixed", "");
-    PathRef lower = started.On("mixed"), missing = started.On("none");
+    PathRef lower = started.On("mixed");
     EXPECT_EQ(kNoErr, Win32GetLongFileName(&lower));
     EXPECT_TRUE(lower.Equals(started.On("Mixed"), PathRef::kExact));
-    EXPECT_EQ(kNotFoundErr, Win32GetLongFileName(&missing));
+    EXPECT_EQ(kNotFoundErr, Win32GetLongFileName(At("none")));
 }
 
 TEST_F(FileOperationsTest, PathsAskTheDisk) {
@@ -295,13 +271,13 @@ TEST_F(FileOperationsTest, VolumesAndLists) {
     DSDisposeHandle(reinterpret_cast<UHandle>(names));
     DSDisposeHandle(kinds);
 
-    PathRef odd(PathRef::kAbsolute), file = started.On("f");
+    PathRef odd(PathRef::kAbsolute);
     odd.Append("CC");
     VolInfoRec info;
     EXPECT_EQ(kArgErr, FGetVolInfo(&odd, &info));
-    EXPECT_EQ(kNoErr, FGetVolInfo(&file, &info));
+    EXPECT_EQ(kNoErr, FGetVolInfo(At("f"), &info));
     Path volume = nullptr;
-    EXPECT_EQ(kNoErr, FMGetVolPath(&file, &volume));
+    EXPECT_EQ(kNoErr, FMGetVolPath(At("f"), &volume));
     EXPECT_TRUE(volume->Equals(started.On("").Volume(), PathRef::kExact));
     PathRef::DisposePath(volume);
 }

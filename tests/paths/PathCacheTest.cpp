@@ -1,8 +1,6 @@
 // Cached attributes; the start and stop of paths, and what they leave behind.
 #include <tessel/paths/PathCachedItem.h>
 
-#include <thread>
-
 #include "paths/PathRefAccess.h"
 #include "paths/PathTestSupport.h"
 #include "support/HandClock.h"
@@ -116,29 +114,6 @@ TEST_F(PathCache, TextsAreRemembered) {
     ASSERT_NE(nullptr, item);
     EXPECT_EQ("C:\\x", static_cast<const PathRef::CachedPathString*>(item)->Get());
     EXPECT_EQ(nullptr, path.GetCachedProxy("internal_unix", "CachedItem", PathRef::kSearchHere));
-}
-
-TEST_F(PathCache, ThreadsStoreFindAndFlush) {
-    const PathRef path = Abs({"C", "x"});
-    const auto work = [&] {
-        int living = 0;
-        for (int i = 0; i < 500; ++i) {
-            path.Cache("key", new PathRef::CachedPath(1000, Item::kDependsOnFile, Abs({"C", "y"})));
-            {
-                const PathRef::CacheLock lock;
-                if (const Item* item = path.GetCachedProxy("key", "CachedPath", PathRef::kSearchHere)) {
-                    ASSERT_EQ("abs:C/y", Show(static_cast<const PathRef::CachedPath*>(item)->Get()));
-                    ++living;
-                }
-            }
-            path.FlushCache();
-        }
-        EXPECT_LE(living, 500);
-    };
-    std::vector<std::thread> threads;
-    for (int i = 0; i < 8; ++i) threads.emplace_back(work);
-    for (std::thread& thread : threads) thread.join();
-    EXPECT_EQ(-1, Found(path, "key"));
 }
 
 // ---- start and stop -------------------------------------------------------------------------------------------------

@@ -1,5 +1,6 @@
 // The elements of paths, their names and their relations.
 #include <tessel/memory/MemoryManager.h>
+#include <tessel/paths/PathCachedItem.h>
 
 #include <thread>
 
@@ -11,21 +12,21 @@ namespace {
 
 using namespace test;
 using PathModel = PathTest;
+using Item = PathRef::CachedItem;
 
 TEST_F(PathModel, AppendingStepsUpWhereItCan) {
-    struct Row {
+    const struct {
         PathRef path;
         const char* shown;
-    };
-    const Row rows[] = {{Rel({"a", "..", "b"}), "rel:b"},
-                        {Rel({".."}), "rel:^"},
-                        {Rel({"..", "..", "a"}), "rel:^/^/a"},
-                        {Rel({"..", "..", "a", ""}), "rel:^/^"},
-                        {Rel({"a", ".", "b", ""}), "rel:a"},
-                        {Abs({"C", ".."}), "abs:"},
-                        {Abs({"C", "x"}).Append(Rel({"..", "..", "D"})), "abs:D"},
-                        {Rel({"a"}).Append(Rel({"..", "..", "b"})), "rel:^/b"}};
-    for (const Row& row : rows) EXPECT_EQ(row.shown, Show(row.path));
+    } rows[] = {{Rel({"a", "..", "b"}), "rel:b"},
+                {Rel({".."}), "rel:^"},
+                {Rel({"..", "..", "a"}), "rel:^/^/a"},
+                {Rel({"..", "..", "a", ""}), "rel:^/^"},
+                {Rel({"a", ".", "b", ""}), "rel:a"},
+                {Abs({"C", ".."}), "abs:"},
+                {Abs({"C", "x"}).Append(Rel({"..", "..", "D"})), "abs:D"},
+                {Rel({"a"}).Append(Rel({"..", "..", "b"})), "rel:^/b"}};
+    for (const auto& row : rows) EXPECT_EQ(row.shown, Show(row.path));
     EXPECT_EQ(2, Rel({"..", "..", "a"}).CountUpDir());
     EXPECT_EQ(kArgErr, CodeOf([] { PathRef(PathRef::kNullPath).Append("a"); }));
     EXPECT_EQ(kArgErr, CodeOf([] { PathRef().Append(".."); }));
@@ -72,11 +73,10 @@ TEST_F(PathModel, NamesByIndex) {
 
 TEST_F(PathModel, Comparison) {
     const PathRef notAPath;
-    struct Row {
+    const struct {
         PathRef a, b;
         int32 exact, ignoringCase;
-    };
-    const Row rows[] = {
+    } rows[] = {
         {Abs({"a"}), Abs({"a"}), 0, 0},
         {Abs({"a"}), Abs({"A"}), 1, 0},
         {Abs({"a", "b"}), Abs({"a", "c"}), -2, -2},
@@ -91,7 +91,7 @@ TEST_F(PathModel, Comparison) {
         {Abs({}), notAPath, -1, -1},
         {notAPath, notAPath, 0, 0},
     };
-    for (const Row& row : rows) {
+    for (const auto& row : rows) {
         EXPECT_EQ(row.exact, row.a.Compare(row.b, PathRef::kExact)) << Show(row.a) << " " << Show(row.b);
         EXPECT_EQ(row.ignoringCase, row.a.Compare(row.b, PathRef::kIgnoreCase)) << Show(row.a) << " " << Show(row.b);
     }
@@ -145,21 +145,20 @@ private:
 };
 
 TEST_F(PathModel, Splitting) {
-    struct Row {
+    const struct {
         const char* name;
         int32 action;
         PathRef::SplitDirection direction;
         bool split;
         const char *head, *tail;
-    };
-    const Row rows[] = {{"b", 3, PathRef::kFromFirst, true, "abs:a", "rel:b/c/b"},
-                        {"b", 2, PathRef::kFromFirst, true, "abs:a/b", "rel:c/b"},
-                        {"b", 1, PathRef::kFromFirst, true, "abs:a", "rel:c/b"},
-                        {"b", 1, PathRef::kFromLast, true, "abs:a/b/c", "rel:"},
-                        {"a", 3, PathRef::kFromFirst, true, "abs:", "rel:a/b/c/b"},
-                        {"b", 7, PathRef::kFromFirst, true, "abs:a", "rel:c/b"},
-                        {"x", 1, PathRef::kFromFirst, false, "not", "not"}};
-    for (const Row& row : rows) {
+    } rows[] = {{"b", 3, PathRef::kFromFirst, true, "abs:a", "rel:b/c/b"},
+                {"b", 2, PathRef::kFromFirst, true, "abs:a/b", "rel:c/b"},
+                {"b", 1, PathRef::kFromFirst, true, "abs:a", "rel:c/b"},
+                {"b", 1, PathRef::kFromLast, true, "abs:a/b/c", "rel:"},
+                {"a", 3, PathRef::kFromFirst, true, "abs:", "rel:a/b/c/b"},
+                {"b", 7, PathRef::kFromFirst, true, "abs:a", "rel:c/b"},
+                {"x", 1, PathRef::kFromFirst, false, "not", "not"}};
+    for (const auto& row : rows) {
         const PathRef path = Abs({"a", "b", "c", "b"});
         PathRef head, tail;
         EXPECT_EQ(row.split, path.SplitOn(AtName(row.name, row.action), &head, &tail, row.direction));
@@ -237,7 +236,8 @@ TEST_F(PathModel, Sanity) {
     EXPECT_EQ(2, reports_.Reports().back().level);
 }
 
-// Eight threads that make, copy and drop the same few paths: every element is made once and ends with its last user.
+// Eight threads make, copy, cache on, flush and drop the same few paths: an element is made once, ends with its last
+// user.
 TEST_F(PathModel, ThreadsShareElements) {
     const auto work = [](uint32 seed) {
         std::vector<PathRef> kept(16);
@@ -251,6 +251,13 @@ TEST_F(PathModel, ThreadsShareElements) {
             std::string text;
             ASSERT_EQ(kNoErr, copy.ConvertToString(&text, PathRef::StringUnix()));
             ASSERT_EQ(static_cast<size_t>(copy.ItemCount() * 2), text.size());
+            path.Cache("key", new PathRef::CachedPath(1000, Item::kDependsOnFile, Abs({"C", "y"})));
+            {
+                const PathRef::CacheLock lock;
+                const Item* item = path.GetCachedProxy("key", "CachedPath", PathRef::kSearchHere);
+                ASSERT_TRUE(!item || Show(static_cast<const PathRef::CachedPath*>(item)->Get()) == "abs:C/y");
+            }
+            path.FlushCache();
             kept[(seed >> 20) % kept.size()] = copy;
             ASSERT_TRUE(i % 64 != 0 || copy.IsSane(false));
         }

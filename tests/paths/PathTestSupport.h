@@ -63,6 +63,11 @@ inline std::string Show(Path path) {
     return path ? Show(*path) : "(null)";
 }
 
+// What a call has made, or its error.
+inline std::string Show(MgErr err, const PathRef& made) {
+    return err ? "error " + std::to_string(err) : Show(made);
+}
+
 template <class Body>
 MgErr CodeOf(Body body) {
     try {

