@@ -17,9 +17,8 @@ namespace {
 class FileManagerTest : public testing::Test {
 protected:
     File_t* Open(std::string_view name, int32 mode, int32 deny = kFDenyNone) {
-        PathRef path = started.On(name);
         File_t* file = nullptr;
-        EXPECT_EQ(kNoErr, FMOpen(&file, &path, mode, deny));
+        EXPECT_EQ(kNoErr, FMOpen(&file, started.At(name), mode, deny));
         return file;
     }
     MgErr TryOpen(const PathRef& path, int32 mode, int32 deny) {

@@ -224,21 +224,20 @@ TEST_F(FileOperationsTest, PathsAskTheDisk) {
     EXPECT_EQ(1u, folder.DirectoryItemCount());
     EXPECT_GE(folder.VolumeSize(), folder.VolumeFree());
     EXPECT_GT(folder.VolumeFree(), 0.0);
-    const auto thrown = [](auto call) {
+    const auto detailOfSize = [](PathRef& path, int32 kind) -> std::string {
         try {
-            call();
+            path.Size(static_cast<PathRef::SizeType>(kind));
         } catch (const OVExcept& error) {
             return std::to_string(error.Code()) + " " + error.Detail();
         }
-        return std::string();
+        return "";
     };
-    EXPECT_EQ("53 PathRef::Size: Only logical size is supported at the moment",
-              thrown([&] { file.Size(static_cast<PathRef::SizeType>(2)); }));
+    EXPECT_EQ("53 PathRef::Size: Only logical size is supported at the moment", detailOfSize(file, 2));
     EXPECT_EQ("1 PathRef::Size: Can't get the size of a folder, get DirectoryItemCount",
-              thrown([&] { folder.Size(PathRef::kLogicalSize); }));
+              detailOfSize(folder, PathRef::kLogicalSize));
     // What the host says about the file counts more than the disk.
     file.Cache(kPathFlavorKey, new CachedPathFlavor(60000, PathRef::CachedItem::kDependsOnFile, false, false));
-    EXPECT_EQ("7 PathRef::Size: Does not exist", thrown([&] { file.Size(PathRef::kLogicalSize); }));
+    EXPECT_EQ("7 PathRef::Size: Does not exist", detailOfSize(file, PathRef::kLogicalSize));
 
     PathRef copy = started.On("copy"), moved = started.On("moved"), temporary = folder;
     EXPECT_EQ(kNoErr, file.CopyFileTo(copy, PathRef::kDontResolve));

@@ -96,21 +96,18 @@ TEST_F(FoldersTest, ShortcutsAreFollowedAlongAName) {
 TEST_F(FoldersTest, TheRecycleBinTakesFiles) {
     Set("XDG_DATA_HOME", started.drive.Native("data"));
     started.drive.Put("f", "kept");
-    PathRef path = started.On("f");
-    EXPECT_EQ(kNoErr, FRemoveToRecycle(&path, 0));
-    EXPECT_EQ(0, FExists(&path));
+    EXPECT_EQ(kNoErr, FRemoveToRecycle(started.At("f"), 0));
+    EXPECT_EQ(0, FExists(started.At("f")));
     EXPECT_EQ("kept", started.drive.Get("data/Trash/files/f"));
-    EXPECT_EQ(kNotFoundErr, FRemoveToRecycle(&path, 1));
+    EXPECT_EQ(kNotFoundErr, FRemoveToRecycle(started.At("f"), 1));
 }
 
 TEST_F(FoldersTest, StandardFoldersByKind) {
     for (const char* variable : {"XDG_DATA_HOME", "XDG_CONFIG_HOME", "XDG_DATA_DIRS"}) Set(variable, "");
     EXPECT_EQ("T:\\home", Text(SystemDirs::GetUserHomeDir(true)));
     EXPECT_EQ("T:\\home\\Documents", Text(SystemDirs::GetUserDocumentsDir(true)));
-    EXPECT_EQ(2, [&] {
-        PathRef documents = SystemDirs::Get(kSystemDirUserDocuments, false);
-        return FExists(&documents);
-    }());
+    PathRef documents = SystemDirs::Get(kSystemDirUserDocuments, false);
+    EXPECT_EQ(2, FExists(&documents));
     EXPECT_EQ("T:\\home\\.local\\share", Text(SystemDirs::GetUserApplicationDataDir(true)));
     const int32 kSame[][2] = {{3, 4}, {7, 8}, {7, 13}, {9, 10}};
     for (const auto& pair : kSame)

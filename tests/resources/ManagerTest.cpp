@@ -95,6 +95,10 @@ TEST_F(ManagerTest, ChangesAreKeptUntilTheyAreWritten) {
     uint32 attrs = 0, size = 0;
     EXPECT_EQ(kNoErr, RGetAttrs(data, &attrs));
     EXPECT_EQ(0x40u, attrs);
+    EXPECT_EQ(kNoErr, RSetAttrs(data, kRProtectedAttr));
+    EXPECT_EQ(kResNotFoundErr, RRemove(data, file));
+    EXPECT_EQ(kNoErr, RSetAttrs(data, 0));
+    EXPECT_EQ(kResNotFoundErr, RRemove(data, NewMemFile()));  // another file's
     ASSERT_EQ(kNoErr, DSSetHandleSize(data, 2));
     EXPECT_EQ(kNoErr, RSize(data, &size));
     EXPECT_EQ(2u, size);
@@ -127,20 +131,6 @@ TEST_F(ManagerTest, ChangesAreKeptUntilTheyAreWritten) {
     EXPECT_EQ("on", Get(file, kData, 1));
     EXPECT_TRUE(reports.Has(kDebugWarning, "Tried to call RSetFileAttrs on a readonly file"));
     EXPECT_TRUE(reports.Has(kDebugWarning, "Tried to call RPreAllocFile on a readonly file"));
-}
-
-TEST_F(ManagerTest, ProtectedResourcesStay) {
-    const RsrcFile file = NewMemFile(), other = NewMemFile();
-    ASSERT_EQ(kNoErr, Add(file, kData, 1, "x"));
-    UHandle data = Loaded(file, kData, 1);
-    EXPECT_EQ(kResNotFoundErr, RRemove(data, other));
-    EXPECT_EQ(kNoErr, RSetAttrs(data, kRProtectedAttr));
-    EXPECT_EQ(kResNotFoundErr, RRemove(data, file));
-    EXPECT_EQ("x", Get(file, kData, 1));
-    EXPECT_EQ(kNoErr, RSetAttrs(data, 0));
-    EXPECT_EQ(kNoErr, RRemove(data, file));
-    EXPECT_EQ("error 15", Get(file, kData, 1));
-    DSDisposeHandle(data);
 }
 
 TEST_F(ManagerTest, UnknownRefnumsAndHandlesReachNothing) {

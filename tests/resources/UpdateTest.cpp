@@ -29,12 +29,8 @@ protected:
     }
     Model ContentsOf(RsrcFile file) {
         Model contents;
-        int32 count = 0;
-        EXPECT_EQ(kNoErr, RCount(file, kData, &count));
-        for (int32 i = 1; i <= count; ++i) {
-            UHandle data = nullptr;
-            int32 id = 0;
-            EXPECT_EQ(kNoErr, RGetInd(file, kData, i, &data));
+        UHandle data = nullptr;
+        for (int32 i = 1, id = 0; RGetInd(file, kData, i, &data) == kNoErr; ++i) {
             EXPECT_EQ(kNoErr, RGetInfo(data, &id, nullptr, nullptr));
             contents[id] = BytesOf(data);
         }

@@ -125,6 +125,12 @@ TEST_F(BinData, TheFirstErrorStays) {
     EXPECT_EQ("\0\0\x9"s, std::string(bytes, 3));
     reader.SetError(kArgErr);
     EXPECT_EQ(kCorruptErr, reader.GetError());
+    // An error that the buffer met elsewhere is the reader's too.
+    MemInputBuf shared("a", 1);
+    BinDataReader learns(&shared, BigEndianizer());
+    MgErr err;
+    shared.GetDataPointer(2, err);
+    EXPECT_EQ(kCorruptErr, learns.GetError());
     {
         StaticOutputBuf out(bytes, 1);
         BinDataWriter writer(&out, BigEndianizer());
@@ -135,15 +141,6 @@ TEST_F(BinData, TheFirstErrorStays) {
         EXPECT_EQ(kCorruptErr, writer.GetError());
     }
     EXPECT_TRUE(reports_.Has(0, "BinDataWriter finished with 74 error"));
-}
-
-// A reader that asks for its error learns of one that the buffer met elsewhere.
-TEST_F(BinData, TheErrorOfTheBufferIsAdopted) {
-    MemInputBuf in("a", 1);
-    BinDataReader reader(&in, BigEndianizer());
-    MgErr err;
-    in.GetDataPointer(2, err);
-    EXPECT_EQ(kCorruptErr, reader.GetError());
 }
 
 TEST_F(BinData, CountsOfStringsAreChecked) {

@@ -125,7 +125,8 @@ TEST_F(Buffers, FactoriesMakeObjectsThatTheLibraryFrees) {
     EXPECT_EQ(2u, std::unique_ptr<InputBuf>(CreateMemInputBuf("ab", 2))->GetSize());
     EXPECT_EQ(1u, std::unique_ptr<InputBuf>(CreateLStrInputBuf(text))->GetSize());
     char block[4];
-    for (OutputBuf* made : std::initializer_list<OutputBuf*>{CreatePreflightOutputBuf(), CreateStaticOutputBuf(block, 4), CreateLStrOutputBuf(4)}) {
+    for (OutputBuf* made : std::initializer_list<OutputBuf*>{CreatePreflightOutputBuf(),
+                                                             CreateStaticOutputBuf(block, 4), CreateLStrOutputBuf(4)}) {
         const std::unique_ptr<OutputBuf> output(made);
         output->GetDataPointer(4, err_);
         EXPECT_EQ(4u, output->GetBytesWritten());

@@ -14,21 +14,15 @@ namespace tessel::test {
 class StartedPaths {
 public:
     StartedPaths() {
-        EXPECT_EQ(kNoErr, ThEventStart());
-        EXPECT_EQ(kNoErr, ThMutexStart());
-        EXPECT_EQ(kNoErr, ProtectedAtomicOperationsStart());
-        EXPECT_EQ(kNoErr, MemoryManagerStart());
-        EXPECT_EQ(kNoErr, TrackedMallocFreeStart());
-        EXPECT_EQ(kNoErr, PathManagerStart());
+        for (auto start : {ThEventStart, ThMutexStart, ProtectedAtomicOperationsStart, MemoryManagerStart,
+                           TrackedMallocFreeStart, PathManagerStart})
+            EXPECT_EQ(kNoErr, start());
     }
     ~StartedPaths() {
         const ReportRecorder leaks;
-        PathManagerStop();
-        TrackedMallocFreeStop();
-        MemoryManagerStop();
-        ProtectedAtomicOperationsStop();
-        ThMutexStop();
-        ThEventStop();
+        for (auto stop : {PathManagerStop, TrackedMallocFreeStop, MemoryManagerStop, ProtectedAtomicOperationsStop,
+                          ThMutexStop, ThEventStop})
+            stop();
         EXPECT_EQ(0u, leaks.CountAt(kDebugError) + leaks.CountAt(kDebugWarning));
     }
     StartedPaths(const StartedPaths&) = delete;
