@@ -257,10 +257,19 @@ TEST_F(ManagerTest, StringsAndPathsAreReadAndNeverBeyondTheirResource) {
 
     std::string text;
     const auto indexed = [&](RsrcFile from, int32 id, int32 i) {
-        return Answer(RGetIndexStringStd(from, &text, id, i), text);
+        Str255 flat;
+        const MgErr err = RGetIndString(from, flat, id, i);
+        EXPECT_EQ(err, RGetIndexStringStd(from, &text, id, i));
+        EXPECT_TRUE(err || text == std::string(flat + 1, flat + 1 + flat[0]));
+        return Answer(err, text);
     };
     const auto longIndexed = [&](RsrcFile from, int32 id, int32 i) {
-        return Answer(RGetIndexLongStringStd(from, &text, id, i, kLong), text);
+        LStrHandle flat = nullptr;
+        const MgErr err = RGetIndLString(from, &flat, id, i, kLong);
+        EXPECT_EQ(err, RGetIndexLongStringStd(from, &text, id, i, kLong));
+        EXPECT_TRUE(err || text == std::string((*flat)->bytes, (*flat)->bytes + (*flat)->count));
+        if (flat) DSDisposeHandle(reinterpret_cast<UHandle>(flat));
+        return Answer(err, text);
     };
     const auto indexedPath = [&](RsrcFile from, int32 id, int32 i) {
         Path read = nullptr;

@@ -67,7 +67,7 @@ TEST_F(BinData, ValuesInTheOrderOfTheStream) {
          "\1\2\3\4", "\4\3\2\1"},
         {[](W& w) { return w.Write4Char(0x01020304); }, [](R& r) { return r.Read4Char() == 0x01020304; },  //
          "\4\3\2\1", "\4\3\2\1"},
-        {[](W& w) { return w.WriteI64(INT64_MIN + 1); }, [](R& r) { return r.ReadI64() == INT64_MIN + 1; },
+        {[](W& w) { return w.WriteU64(0x8000000000000001u); }, [](R& r) { return r.ReadI64() == INT64_MIN + 1; },
          "\x80\0\0\0\0\0\0\1"s, "\1\0\0\0\0\0\0\x80"s},
         {[](W& w) { return w.WriteF32(-1.5f); }, [](R& r) { return r.ReadF32() == -1.5f; },  //
          "\xBF\xC0\0\0"s, "\0\0\xC0\xBF"s},
