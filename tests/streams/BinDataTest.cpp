@@ -148,7 +148,8 @@ TEST_F(BinData, CountsOfStringsAreChecked) {
         {0, kNoErr},     {-1, kLengthErr}, {0x200001, kLengthErr}, {0x7FFFFFFF, kLengthErr}, {0x200000, kCorruptErr},
         {5, kCorruptErr}};
     for (const auto& [count, err] : rows) {
-        std::string stream = Written(LittleEndianizer(), [count = count](auto& w) { return w.WriteI32(count); }) + "abcd";
+        std::string stream =
+            Written(LittleEndianizer(), [count = count](auto& w) { return w.WriteI32(count); }) + "abcd";
         MemInputBuf in(stream.data(), static_cast<uint32>(stream.size()));
         BinDataReader reader(&in, LittleEndianizer());
         EXPECT_EQ(nullptr, reader.ReadLStr());
