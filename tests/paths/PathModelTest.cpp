@@ -231,10 +231,11 @@ TEST_F(PathModel, Sanity) {
     EXPECT_EQ(2, reports_.Reports().back().level);
 }
 
-// Eight threads make, copy, cache on, flush and drop the same few paths: an element is made once, ends with its last
-// user.
+// Eight threads make, copy and drop the same few paths, and cache on one: an element is made once, and ends with its
+// last user.
 TEST_F(PathModel, ThreadsShareElements) {
-    const auto work = [](uint32 seed) {
+    const PathRef shared = Rel({"shared"});
+    const auto work = [&](uint32 seed) {
         std::vector<PathRef> kept(16);
         for (int i = 0; i < 4000; ++i) {
             seed = seed * 1664525 + 1013904223;
@@ -246,13 +247,13 @@ TEST_F(PathModel, ThreadsShareElements) {
             std::string text;
             ASSERT_EQ(kNoErr, copy.ConvertToString(&text, PathRef::StringUnix()));
             ASSERT_EQ(static_cast<size_t>(copy.ItemCount() * 2), text.size());
-            path.Cache("key", new PathRef::CachedPath(1000, Item::kDependsOnFile, Abs({"C", "y"})));
+            shared.Cache("key", new PathRef::CachedPath(1000, Item::kDependsOnFile, Abs({"C", "y"})));
             {
                 const PathRef::CacheLock lock;
-                const Item* item = path.GetCachedProxy("key", "CachedPath", PathRef::kSearchHere);
+                const Item* item = shared.GetCachedProxy("key", "CachedPath", PathRef::kSearchHere);
                 ASSERT_TRUE(!item || Show(static_cast<const PathRef::CachedPath*>(item)->Get()) == "abs:C/y");
             }
-            path.FlushCache();
+            shared.FlushCache();
             kept[(seed >> 20) % kept.size()] = copy;
             ASSERT_TRUE(i % 64 != 0 || copy.IsSane(false));
         }

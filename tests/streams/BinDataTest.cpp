@@ -161,6 +161,7 @@ TEST_F(BinData, CountsOfStringsAreChecked) {
         stream.append(count, 'q');
         MemInputBuf in(stream.data(), static_cast<uint32>(stream.size()));
         LStrHandle text = BinDataReader(&in, BigEndianizer()).ReadLStr();
+        ASSERT_NE(nullptr, text) << count;
         ASSERT_EQ(count, static_cast<uint32>((*text)->count));
         EXPECT_EQ(0, std::memcmp((*text)->bytes, stream.data() + 4, count));
         DSDisposeHandle(reinterpret_cast<UHandle>(text));
