@@ -5,6 +5,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <memory>
 
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/diagnostics/StackChain.h>
@@ -310,12 +311,10 @@ AllocTrackerPtr CreateAllocTracker(void) {
 }
 
 AllocTrackerPtr CreateAllocTrackerSpecifySkip(int32 skip) {
-    auto* const tracker = new (std::nothrow) AllocTracker;
-    if (!tracker || !IsAllocTrackingOn()) return tracker;
+    std::unique_ptr<AllocTracker> tracker(new (std::nothrow) AllocTracker);
+    if (!tracker || !IsAllocTrackingOn()) return tracker.release();
     tracker->SetSkip(skip);
-    if (tracker->implementation_) return tracker;
-    delete tracker;
-    return nullptr;
+    return tracker->implementation_ ? tracker.release() : nullptr;
 }
 
 void DestroyAllocTracker(AllocTrackerPtr tracker) {

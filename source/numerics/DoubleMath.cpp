@@ -100,7 +100,8 @@ constexpr std::array<LogPoint, 129> kLogPoints = [] {
     std::array<LogPoint, 129> points{};
     for (size_t i = 0; i < points.size(); ++i) {
         const auto point = std::bit_cast<double>(kLowestZ + (uint64{i} << kPointShift));
-        const double inverse = static_cast<double>(static_cast<int64>(1 / point / kInverseUnit + 0.5)) * kInverseUnit;
+        const int64 units = (static_cast<int64>(2 / point / kInverseUnit) + 1) / 2;
+        const double inverse = static_cast<double>(units) * kInverseUnit;
         points[i] = {inverse, SplitAt(-LogSeries(inverse), kLogUnit)};
     }
     return points;

@@ -34,7 +34,7 @@ std::string ShortForm(const PathRef& path, const PathRef::MeasurementStyle& meas
     const std::string& name = LastNameOf(path);
     if (!measure.StringIsTooLong(name)) return name;
     for (size_t i = 0; i < name.size(); i = NextCharacter(name, i)) {
-        const std::string text = kEllipsis + name.substr(i);
+        std::string text = kEllipsis + name.substr(i);
         if (!measure.StringIsTooLong(text)) return text;
     }
     return std::string();

@@ -173,6 +173,7 @@ Token PathFormatReaderWin::NextToken(const Token& token) const {
 
 std::string PathFormatReaderWin::TokenText(const Token& token) const {
     if (!IsDrive(token)) return PathFormatReaderPlatformIndependent::TokenText(token);
+    // The drive as it stands. NOLINTNEXTLINE(bugprone-parent-virtual-call)
     if (token.end > 0) return PathFormatReader::TokenText(token);
     if (!IsSeparator(0)) TESSEL_THROW(kArgErr, "PathRef from string constructor");  // a colon without a drive
     return CurrentDrive();

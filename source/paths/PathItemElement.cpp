@@ -56,7 +56,7 @@ PathItemElement* PathItemElement::AtDepth(int32 depth) const {
 PathItemList::PathItemList(const PathItemElement* last) : count_(last ? last->Depth() : 0) {
     if (static_cast<size_t>(count_) > few_.size()) many_.resize(static_cast<size_t>(count_));
     items_ = many_.empty() ? few_.data() : many_.data();
-    for (int32 i = count_; i-- > 0; last = last->Parent()) items_[i] = last;
+    for (; last && last->Depth() > 0; last = last->Parent()) items_[last->Depth() - 1] = last;
 }
 
 // ---- children -------------------------------------------------------------------------------------------------------

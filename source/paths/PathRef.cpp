@@ -111,7 +111,7 @@ PathRef::PathRef(PathRef&& other) noexcept
 }
 
 PathRef& PathRef::operator=(const PathRef& other) {
-    Assign(other.mPathElement);
+    if (this != &other) Assign(other.mPathElement);
     return *this;
 }
 

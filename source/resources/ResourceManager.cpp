@@ -54,7 +54,7 @@ public:
     RsrcFile Add(Kind kind, ResChain* chain) {
         auto storage = std::make_unique<ResClassStorage>(kind, chain);
         const RsrcFile refnum = fJar.NewCookie(storage.get());
-        if (refnum) storage.release();
+        if (refnum) static_cast<void>(storage.release());
         return refnum;
     }
     ResClassStorage* Find(RsrcFile refnum) {

@@ -40,7 +40,7 @@ public:
         FmtValue value;
         if (type == FmtArgType::kPointer) {
             value.pointer = va_arg(list_, const void*);
-        } else if (type == FmtArgType::kInt64) {
+        } else if (type == FmtArgType::kInt64) {  // NOLINT(bugprone-branch-clone): the types that are fetched differ
             value.integer = va_arg(list_, long long);
         } else if (type == FmtArgType::kDouble) {
             value.real = va_arg(list_, double);

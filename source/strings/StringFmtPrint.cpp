@@ -296,12 +296,12 @@ MgErr LStrPrintf(LStrHandle dst, CStr format, ...) {
     va_end(args.list);
     if (MgErr err = DSSetHandleSize(AsHandle(dst), LStrSize(needed))) return err;
 
+    const LStrPtr text = *dst;
     va_start(args.list, format);
-    char* text = reinterpret_cast<char*>((*dst)->bytes);
-    const size_t written = Format(text, static_cast<int32>(needed), format, length, args);
+    text->count = static_cast<int32>(
+        Format(reinterpret_cast<char*>(text->bytes), static_cast<int32>(needed), format, length, args));
     va_end(args.list);
-    (*dst)->count = static_cast<int32>(written);
-    if (written == needed) return kNoErr;
+    if (static_cast<size_t>(text->count) == needed) return kNoErr;
     TESSEL_REPORT(kDebugFatal, 0x48A3D5F1u);
     return kGenericErr;
 }

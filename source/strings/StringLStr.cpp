@@ -166,7 +166,8 @@ MgErr LStrFromPtr(LStrHandle* handle, int32 length, const void* src) {
     if (!src || length == 0) return DSDisposeHandleAndNull(AsHandlePtr(handle));
     size_t offset = 0;
     if (*handle && OffsetInBlock(*handle, src, &offset)) {
-        Store(src, static_cast<size_t>(length), **handle);
+        if (MgErr err = SizeHandle(*handle, LStrSize(length), false)) return err;
+        Store(reinterpret_cast<const uint8*>(**handle) + offset, static_cast<size_t>(length), **handle);
         return SizeHandle(*handle, LStrSize(length), true);
     }
     if (MgErr err = DSSetHandleSizeOrNewHandle(AsHandlePtr(handle), LStrSize(length))) return err;

@@ -134,6 +134,9 @@ TEST(StringLStr, AppendsExactlyOrWithRoomLeft) {
     EXPECT_EQ(kNoErr, LStrAppendChar(text, 0));
     EXPECT_EQ(kNoErr, LStrPrependCStr(&text, reinterpret_cast<CStr>((*LStrHandle(text))->bytes + 1)));
     EXPECT_EQ(std::string("efgdefg\0", 8), text.Text());
+    EXPECT_EQ(kNoErr, LStrFromPtr(&text, 12, *LStrHandle(text)));  // all of its block, its count included
+    EXPECT_EQ("efgdefg", text.Text().substr(4, 7));
+    EXPECT_EQ(16u, text.Size());
 
     L made;
     EXPECT_EQ(kNoErr, LStrAppendPStr(&made, nullptr));

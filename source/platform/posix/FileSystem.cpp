@@ -311,7 +311,7 @@ bool ItemSetMode(const char* name, std::uint32_t mode) {
 }
 
 bool ItemSetReadOnly(const char* name, bool readOnly) {
-    ItemInfo info;
+    ItemInfo info{};
     if (!ItemGetInfo(name, info)) return false;
     if (info.readOnly == readOnly) return true;
     /* Writing comes back to those who may read, as far as new files would get it. */
