@@ -23,12 +23,15 @@ public:
     MgErr Uninit() override { return kNoErr; }
 
 private:
+    friend class SpareEvents;
+
     static int32 ResultOf(platform::EventWait wait) {
         if (wait == platform::EventWait::kTaken) return kSignaled;
         return wait == platform::EventWait::kTimedOut ? kTimedOut : kFailed;
     }
 
     platform::Event event_;
+    HostEvent* nextSpare_ = nullptr;
 };
 
 }  // namespace tessel

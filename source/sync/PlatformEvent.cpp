@@ -1,12 +1,41 @@
 #include <tessel/sync/PlatformEvent.h>
 #include <tessel/sync/PlatformEventTimer.h>
 
-#include <memory>
+#include <new>
+#include <utility>
 
 #include "platform/MessageEvent.h"
+#include "platform/Mutex.h"
 #include "sync/HostEvent.h"
 
 namespace tessel {
+
+/* Events that were destroyed, for the next to be made. Their memory stays that of an event for good: a signal releases
+   a waiter, who may destroy the event while the signaling thread still looks whom else to wake. When it finds another
+   event there, a thread that sleeps on that one looks up once for nothing. */
+class SpareEvents {
+public:
+    HostEvent* Take() {
+        platform::MutexHolder holder(mutex_);
+        HostEvent* event = first_;
+        if (event) first_ = std::exchange(event->nextSpare_, nullptr);
+        return event;
+    }
+    void Keep(HostEvent* event) {
+        platform::MutexHolder holder(mutex_);
+        event->nextSpare_ = std::exchange(first_, event);
+    }
+
+private:
+    platform::Mutex mutex_; /* guards the list; nothing is taken inside */
+    HostEvent* first_ = nullptr;
+};
+
+namespace {
+
+constinit SpareEvents spareEvents;
+
+}  // namespace
 
 PlatformEvent::~PlatformEvent() = default;
 
@@ -43,15 +72,19 @@ void HostEvent::GetLatencyStats(uint32* count, _HRTime* total, _HRTime* third, _
 }
 
 PlatformEvent* CreatePlatformEvent(bool signaled) {
-    std::unique_ptr<HostEvent> event(new (std::nothrow) HostEvent);
-    if (!event || event->Init(signaled) != kNoErr) return nullptr;
-    return event.release();
+    HostEvent* event = spareEvents.Take();
+    if (!event) event = new (std::nothrow) HostEvent;
+    if (event) event->Init(signaled);
+    return event;
 }
 
 MgErr DestroyPlatformEvent(PlatformEvent* event) {
     if (!event) return kNoErr;
     MgErr err = event->Uninit();
-    delete event;
+    if (auto* own = dynamic_cast<HostEvent*>(event))
+        spareEvents.Keep(own);
+    else
+        delete event;
     return err;
 }
 

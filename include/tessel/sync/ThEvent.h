@@ -41,7 +41,8 @@ TESSEL_API MgErr ThEventCreate(ThEvent* event, uint32 ignored, bool signaled);
 TESSEL_API MgErr ThEventCreateWithCustomSignal(ThEvent* event, uint32 ignored, bool signaled,
                                                ThEventSignalProc customSignal);
 
-/* An error report for null or a failing platform. */
+/* An error report for null or a failing platform. No thread may be waiting, or begin to use the event; one whose signal
+   has released the last waiter may still be on its way out. */
 TESSEL_API void ThEventDestroy(ThEvent event);
 
 /* 1 when a thread was waiting, else 0. Several signals before a wait count as one. Null: 0. */
