@@ -40,10 +40,7 @@ constinit SpareEvents spareEvents;
 PlatformEvent::~PlatformEvent() = default;
 
 MgErr HostEvent::Init(bool signaled) {
-    if (signaled)
-        event_.Set();
-    else
-        event_.Reset();
+    event_.Renew(signaled);
     return kNoErr;
 }
 

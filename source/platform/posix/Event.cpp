@@ -133,6 +133,16 @@ constinit Mutex watchMutex;
 
 }  // namespace
 
+void Event::Renew(bool signaled) noexcept {
+    MutexHolder holder(watchMutex);
+    watches_ = nullptr;
+    sleepers_.store(0, std::memory_order_seq_cst);
+    awake_.store(0, std::memory_order_relaxed);
+    habit_.store(kLong, std::memory_order_relaxed);
+    shortSleeps_.store(0, std::memory_order_relaxed);
+    signaled_.store(signaled ? 1 : 0, std::memory_order_seq_cst);
+}
+
 void Event::WakeWatches() noexcept {
     MutexHolder holder(watchMutex);
     for (Watch* watch = watches_; watch; watch = watch->next) {
