@@ -122,31 +122,33 @@ void AllocTracker::Implementation::Deactivate(TrackerFailure failure) {
 }
 
 // Writes from a copy, so that no lock is held while the dumper works.
-void AllocTracker::Implementation::DumpAll(AllocDumper& dumper) {
+// work(records, count) on a copy of the records.
+template <class Work>
+void AllocTracker::Implementation::WithRecords(AllocRecords::Which which, Work work) {
     if (IsIdle()) return;
     TrackerFailure failure = TrackerFailure::kNone;
-    const size_t capacity = records_.Count().unreported;
-    auto* const records = static_cast<AllocRecord*>(heap_.Allocate(capacity * sizeof(AllocRecord), failure));
+    const AllocRecords::Counts counts = records_.Count();
+    const size_t room = which == AllocRecords::Which::kAll ? counts.live : counts.unreported;
+    auto* const records = static_cast<AllocRecord*>(heap_.Allocate(room * sizeof(AllocRecord), failure));
     if (records) {
-        CallSites::Reporting reporting(sites_);
-        WriteAll(dumper, records, records_.Copy(AllocRecords::Which::kUnreported, records, capacity));
+        work(records, records_.Copy(which, records, room));
         heap_.Release(records, failure);
     }
     if (failure != TrackerFailure::kNone) Deactivate(failure);
 }
 
+void AllocTracker::Implementation::DumpAll(AllocDumper& dumper) {
+    WithRecords(AllocRecords::Which::kUnreported, [&](AllocRecord* records, size_t count) {
+        CallSites::Reporting reporting(sites_);
+        WriteAll(dumper, records, count);
+    });
+}
+
 int32 AllocTracker::Implementation::GetSites(Site* sites, int32 capacity) {
-    if (IsIdle()) return 0;
-    TrackerFailure failure = TrackerFailure::kNone;
-    const size_t room = records_.Count().live;
-    auto* const records = static_cast<AllocRecord*>(heap_.Allocate(room * sizeof(AllocRecord), failure));
-    int32 count = 0;
-    if (records) {
-        count = CountSites(records, records_.Copy(AllocRecords::Which::kAll, records, room), sites, capacity);
-        heap_.Release(records, failure);
-    }
-    if (failure != TrackerFailure::kNone) Deactivate(failure);
-    return count;
+    int32 found = 0;
+    WithRecords(AllocRecords::Which::kAll,
+                [&](AllocRecord* records, size_t count) { found = CountSites(records, count, sites, capacity); });
+    return found;
 }
 
 int32 AllocTracker::Implementation::CountSites(AllocRecord* records, size_t count, Site* sites, int32 capacity) {

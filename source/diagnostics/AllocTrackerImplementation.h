@@ -32,6 +32,8 @@ private:
     bool IsIdle() const { return deactivated_.load(std::memory_order_relaxed) || sites_.IsReporting(); }
     void ReportDuplicate(const AllocRecord& earlier);
     void Deactivate(TrackerFailure failure);
+    template <class Work>
+    void WithRecords(AllocRecords::Which which, Work work);
     void WriteAll(AllocDumper& dumper, AllocRecord* records, size_t count);
     static int32 CountSites(AllocRecord* records, size_t count, Site* sites, int32 capacity);
     void WriteRecord(AllocDumper& dumper, const AllocRecord& record);

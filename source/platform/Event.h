@@ -38,8 +38,8 @@ public:
         return true;
     }
 
-    /* As new, for another use of its memory: forgets also the waits of threads that were ended by force. No thread waits;
-       one whose signal released the last waiter may still be on its way out of Set. */
+    /* As new, for another use of its memory: forgets also the waits of threads that were ended by force. No thread
+       waits; one whose signal released the last waiter may still be on its way out of Set. */
     void Renew(bool signaled) noexcept;
 
     /* Not signaled from here on. True when it was. */
