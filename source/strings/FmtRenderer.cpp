@@ -7,6 +7,7 @@
 
 #include <cmath>
 
+#include "numerics/NumericAccess.h"
 #include "strings/NumericTextParts.h"
 #include "strings/PathText.h"
 
@@ -85,9 +86,9 @@ bool FixedFits(RealParts x, int32 limit) {
 
 bool FixedFits(const void* value, int16 type, int32 limit) {
     if (!value) return limit >= 1; /* a zero */
-    cmplxExt parts;
-    ConvertNum(type, value, kNumComplexExtended, &parts);
-    return FixedFits(TakeApart(parts.re), limit) && (type < kNumComplexSingle || FixedFits(TakeApart(parts.im), limit));
+    const ExtendedComplex parts = ReadNumber(type, value);
+    const auto fits = [limit](Extended part) { return FixedFits(TakeApart(FromExtended(part)), limit); };
+    return fits(parts.re) && (type < kNumComplexSingle || fits(parts.im));
 }
 
 int32 FixedLimit(const FmtSpec& spec) {
@@ -170,7 +171,7 @@ void FmtRenderer::RenderReal(FmtItem item, const FmtSpec& spec, double value) {
     char text[kScratchSize];
     const int32 length =
         tessel::RenderReal({parts, false, 0}, code, text, kScratchSize, static_cast<char>(decimalPoint_));
-    PutNumber(spec, text, static_cast<size_t>(length));
+    PutNumber(spec, text, static_cast<size_t>(Terminate(text, kScratchSize, length)));
 }
 
 /* Numbers of a type that the format names. */

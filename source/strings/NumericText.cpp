@@ -254,33 +254,26 @@ int32 RenderComplex(const ExtendedComplex& value, int32 code, char* buffer, int3
     const bool isPolar = Classify(code) == FormatClass::kPolar;
     ExtendedComplex parts = value;
     if (isPolar) {
-        parts = {std::hypot(value.re, value.im), std::atan2(value.im, value.re)};
+        const bool isZero = value.re == 0 && value.im == 0;  // whose parts' signs make no angle
+        parts = {std::hypot(value.re, value.im), isZero ? value.im : std::atan2(value.im, value.re)};
         code += kPolarOffset;
     }
     TextOut out(buffer, size);
+    const int32 unit = slot != nullptr ? *slot : 0;
     out.Skip(RenderPart(SourceOf(parts.re), code, buffer, size / 2, decimalPoint, slot));
     const int32 realExponent = slot != nullptr ? *slot : 0;
     out.Put(isPolar ? " arg " : " ");
     if (!isPolar && (!std::signbit(parts.im) || std::isnan(parts.im))) out.Put('+');
     const RealSource imaginary = SourceOf(parts.im);
     const auto room = static_cast<int32>(out.Room());
-    int32 length = RenderPart(imaginary, code, out.At(), room, decimalPoint, slot);
-    if (slot != nullptr && *slot != realExponent) {
+    int32 exponent = unit;
+    int32 length = RenderPart(imaginary, code, out.At(), room, decimalPoint, slot != nullptr ? &exponent : nullptr);
+    if (slot != nullptr && exponent != realExponent) {
         length = RenderPart(imaginary, code, out.At(), room, decimalPoint, nullptr);
     }
     out.Skip(length);
     if (!isPolar && out.Room() > 2) out.Put(" i");
     return out.Length();
-}
-
-// Terminates a rendering that has no terminator yet.
-int32 Terminate(char* buffer, int32 size, int32 length) {
-    if (length >= size) {
-        TESSEL_REPORT(kDebugFatal, 0xC95F3B60u) << "buffer overflow";
-        length = size - 1;
-    }
-    buffer[length] = 0;
-    return length;
 }
 
 [[gnu::noinline]] int32 RenderNull(int16 type, char* buffer, int32 size) {
@@ -305,6 +298,16 @@ int32 Terminate(char* buffer, int32 size, int32 length) {
 }
 
 }  // namespace
+
+int32 Terminate(char* buffer, int32 size, int32 length) {
+    if (length >= size) {
+        TESSEL_REPORT(kDebugFatal, 0xC95F3B60u) << "buffer overflow";
+        length = size - 1;
+    }
+    buffer[length] = 0;
+    return length;
+}
+
 }  // namespace tessel
 
 using namespace tessel;

@@ -378,7 +378,8 @@ template <class Text>
     const IntegerType type = IntegerTypeOf(typeCode, 64);
     if (type.bits == 64) return static_cast<int64>(ParseInteger<uint64>(text, type, radix, noSign));
     const auto value = ParseInteger<uint32>(text, type, radix, noSign);
-    return type.isSigned ? static_cast<int32>(value) : int64{value};
+    const bool hasSign = type.isSigned || type.bits < 32;  // negated, a narrow unsigned value is below 0
+    return hasSign ? static_cast<int32>(value) : int64{value};
 }
 
 }  // namespace

@@ -112,6 +112,9 @@ struct RealSource {
 int32 FormatReal(const RealText& text, int32 k, char* buffer, int32 size, char decimalPoint);
 int32 RenderReal(const RealSource& source, int32 k, char* buffer, int32 size, char decimalPoint);
 
+/* Terminates a rendering of that length; one that fills the buffer was cut, which is reported. Returns the length. */
+int32 Terminate(char* buffer, int32 size, int32 length);
+
 // ---- integers ----
 
 inline constexpr int32 kLongestDecimal = 20;  // of 64 bits, or of 63 and a sign

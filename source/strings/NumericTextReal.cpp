@@ -125,14 +125,23 @@ bool ReadRecord(const PackedDecimal& record, RealText& text) {
     if (text.kind != RealKind::kFinite) return true;
     bool good = true;
     uint64 digits = 0;
+    int32 count = 0;
     for (int32 i = std::min<int32>(record.mdigits, kPackedDecimalDigits - 1); i >= 0; --i) {
         const uint8 digit = Nibble(record, i);
         good = good && digit <= 9;
         digits = 10 * digits + digit;
+        if (digits != 0) ++count;
     }
-    text.digits.Set(digits, static_cast<int32>(CountDecimalDigits(digits)));
-    text.lead = digits == 0 ? 0 : record.exponent + text.digits.count - 1;
+    text.digits.Set(digits, std::max(count, int32{1}));
+    text.lead = digits == 0 ? 0 : record.exponent + count - 1;
     return good;
+}
+
+// The code that is used: what fixed notation does not show well becomes exponential.
+int32 CodeInUse(const RealText& text, int32 k, int32 size) {
+    k = std::max(k, -kMostDecimals);
+    if (k <= 0 && (text.lead - k > size - kFixedRoom || text.lead >= kFirstLeadNotFixed)) k = 1 - k;
+    return std::min(k, std::max(size - kExponentRoom, int32{0}));
 }
 
 void ReportBadRecord(const PackedDecimal& record, bool exponential) {
@@ -153,9 +162,7 @@ int32 FormatReal(const RealText& text, int32 k, char* buffer, int32 size, char d
         out.Put(SpecialText(text.kind));
         return out.Length();
     }
-    k = std::max(k, -kMostDecimals);
-    if (k <= 0 && (text.lead - k > size - kFixedRoom || text.lead >= kFirstLeadNotFixed)) k = 1 - k;
-    k = std::min(k, std::max(size - kExponentRoom, int32{0}));
+    k = CodeInUse(text, k, size);
     if (k >= 1) {
         PutExponential(text, k, decimalPoint, out);
     } else {
@@ -177,7 +184,7 @@ int32 PackedToString(const PackedDecimal* record, int16 formatCode, char* buffer
     if (buffer == nullptr || size <= 0) return 0;
     RealText text;
     if (!ReadRecord(*record, text)) {
-        ReportBadRecord(*record, formatCode > 0);
+        ReportBadRecord(*record, CodeInUse(text, formatCode, size) > 0);
         return 0;
     }
     return FormatReal(text, formatCode, buffer, size, static_cast<char>(decimalPoint));

@@ -5,6 +5,7 @@
 
 #include <bit>
 
+#include "numerics/NumericAccess.h"
 #include "platform/CodePage.h"
 #include "strings/DecimalPoint.h"
 #include "strings/FmtEngine.h"
@@ -191,7 +192,7 @@ bool Formatter::Convert(FmtSpec& spec) {
     if (item == FmtItem::kUnknown) return Unknown();
     if (spec.type == kFmtTypeFromArgument) {
         if (spec.position) return Unknown();
-        spec.type = static_cast<int16>(arguments_.Next(FmtArgType::kInt).integer);
+        spec.type = TypeOfCode(static_cast<int16>(arguments_.Next(FmtArgType::kInt).integer));
         if (spec.type < kNumInt8 || spec.type > kNumComplexExtended) return Unknown();
     }
     const FmtArgType type = FmtArgTypeOf(item, spec);

@@ -40,8 +40,12 @@ enum { kFloatFinite = 0, kFloatNegInfinity = 1, kFloatInfinity = 2, kFloatNaN = 
 TESSEL_BEGIN_C
 
 /* Renders the value in the given format, terminated, and returns its length. A null value renders "0" (a complex one
-   "0 + 0i"). `size` counts the terminator. With a `sharedExponent` (may be null) the engineering and SI suffix is left
-   out and its exponent stored there, for the caller to append. */
+   "0 + 0i"). `size` counts the terminator.
+
+   `sharedExponent` (may be null) is for engineering and SI notation. On entry it holds the power of ten that the value
+   is counted in, 0 for ones, or kNoSharedExponent. The suffix is left out, and its exponent is stored there for the
+   caller to append; where that is beyond -24 to 24 the suffix is written and 0 stored. Of a complex value it is the
+   real part's exponent; an imaginary part with another one carries its own suffix. */
 TESSEL_API int32 NumToAnyString(const void* value, int16 typeCode, const int16* formatCode, char* buffer, int32 size,
                                 uint8 decimalPoint, int32* sharedExponent);
 
