@@ -2,9 +2,10 @@
 #ifndef TESSEL_STRINGS_FMTENGINE_H
 #define TESSEL_STRINGS_FMTENGINE_H
 
-#include <tessel/base/Types.h>
+#include <tessel/base/MgErr.h>
 
 #include <cstdarg>
+#include <string>
 
 namespace tessel {
 
@@ -17,6 +18,22 @@ struct Formatted {
 
 /* As SPrintfv. */
 Formatted FormatText(char* dst, int32 size, const char* format, int32 formatLength, va_list args);
+
+/* A formatted text in storage of its own, so that the arguments may lie in the text that it is to replace or to extend.
+ */
+class FormattedText {
+public:
+    /* kMemFullErr when memory is short, kGenericErr when the arguments' texts changed meanwhile. */
+    MgErr Format(const char* format, size_t length, va_list args);
+
+    const char* Bytes() const { return long_.empty() ? short_ : long_.data(); }
+    size_t Length() const { return length_; }
+
+private:
+    char short_[512];
+    std::string long_; /* what is too long for that */
+    size_t length_ = 0;
+};
 
 }  // namespace tessel
 

@@ -16,11 +16,14 @@ UHandle* AsHandlePtr(T*** handle) {
     return reinterpret_cast<UHandle*>(handle);
 }
 
-/* Brings a handle to `needed` bytes: exactly, or only when it is smaller. */
+/* Brings a handle to `needed` bytes: exactly, or only when it is smaller. Where memory is too short to shrink it, it
+   stays as large as it is, so that only growing fails for want of memory. */
 template <class T>
 MgErr SizeHandle(T** handle, uint32 needed, bool exact) {
-    if (!exact && DSGetHandleSize(AsHandle(handle)) >= needed) return kNoErr;
-    return DSSetHandleSize(AsHandle(handle), needed);
+    const uint32 size = DSGetHandleSize(AsHandle(handle));
+    if (size >= needed && (!exact || size == needed)) return kNoErr;
+    const MgErr err = DSSetHandleSize(AsHandle(handle), needed);
+    return err == kMemFullErr && size > needed ? MgErr{kNoErr} : err;
 }
 
 /* Where a range stands in the content of a handle's block. */

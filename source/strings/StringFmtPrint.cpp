@@ -5,6 +5,7 @@
 
 #include <bit>
 
+#include "diagnostics/Guarded.h"
 #include "numerics/NumericAccess.h"
 #include "platform/CodePage.h"
 #include "strings/DecimalPoint.h"
@@ -242,6 +243,25 @@ Formatted tessel::FormatText(char* dst, int32 size, const char* format, int32 fo
     return result;
 }
 
+MgErr FormattedText::Format(const char* format, size_t length, va_list args) {
+    const auto run = [&](char* dst, size_t size) {
+        FmtArgumentList copy;
+        va_copy(copy.list, args);
+        const size_t reached = ::Format(dst, static_cast<int32>(size), format, length, copy);
+        va_end(copy.list);
+        return reached;
+    };
+    length_ = run(short_, sizeof short_);
+    if (length_ < sizeof short_) return kNoErr;
+    return Guarded([&]() -> MgErr {
+        const size_t needed = run(nullptr, 0);
+        if (needed > INT32_MAX - LStrSize(1)) return kMemFullErr;
+        long_.resize(needed + 1); /* one more, which shows that the text has grown */
+        length_ = run(long_.data(), needed + 1);
+        return length_ == needed ? kNoErr : kGenericErr;
+    });
+}
+
 int32 SPrintfv(char* dst, int32 size, const char* format, int32 formatLength, va_list args) {
     return FormatText(dst, size, format, formatLength, args).length;
 }
@@ -289,20 +309,16 @@ int32 PPrintfp(PStr dst, ConstPStr format, ...) {
 }
 
 MgErr LStrPrintf(LStrHandle dst, CStr format, ...) {
-    if (!dst) return kArgErr;
-    const size_t length = std::strlen(format);
-    FmtArgumentList args;
-    va_start(args.list, format);
-    const size_t needed = Format(nullptr, kFmtNoLimit, format, length, args);
-    va_end(args.list);
-    if (MgErr err = DSSetHandleSize(AsHandle(dst), LStrSize(needed))) return err;
-
-    const LStrPtr text = *dst;
-    va_start(args.list, format);
-    text->count = static_cast<int32>(
-        Format(reinterpret_cast<char*>(text->bytes), static_cast<int32>(needed), format, length, args));
-    va_end(args.list);
-    if (static_cast<size_t>(text->count) == needed) return kNoErr;
-    TESSEL_REPORT(kDebugFatal, 0x48A3D5F1u);
-    return kGenericErr;
+    if (!dst || !format) return kArgErr;
+    FormattedText text;
+    va_list args;
+    va_start(args, format);
+    MgErr err = text.Format(format, std::strlen(format), args);
+    va_end(args);
+    if (err == kGenericErr) TESSEL_REPORT(kDebugFatal, 0x48A3D5F1u);
+    if (!err) err = DSSetHandleSize(AsHandle(dst), LStrSize(text.Length()));
+    if (err) return err;
+    std::memcpy((*dst)->bytes, text.Bytes(), text.Length());
+    (*dst)->count = static_cast<int32>(text.Length());
+    return kNoErr;
 }

@@ -8,11 +8,13 @@
 #include <algorithm>
 #include <cstring>
 #include <string_view>
+#include <vector>
 
 #include "diagnostics/Guarded.h"
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"
 #include "strings/CPStrWalk.h"
+#include "strings/FmtEngine.h"
 #include "strings/HandleOps.h"
 #include "strings/LStrView.h"
 
@@ -52,9 +54,62 @@ bool IsTrimmed(uint8 byte) {
 MgErr ResizeLStr(LStrHandle* handle, int32 n) {
     if (n == 0) return DSDisposeHandleAndNull(AsHandlePtr(handle));
     if (static_cast<uint32>(n) > INT32_MAX - LStrSize(0)) return kMemFullErr;
-    if (MgErr err = DSSetHandleSizeOrNewHandle(AsHandlePtr(handle), LStrSize(n))) return err;
+    const MgErr err =
+        *handle ? SizeHandle(*handle, LStrSize(n), true) : DSSetHandleSizeOrNewHandle(AsHandlePtr(handle), LStrSize(n));
+    if (err) return err;
     (**handle)->count = n;
     return kNoErr;
+}
+
+std::string_view CharactersOf(const uint8* bytes, int32 length) {
+    return {reinterpret_cast<const char*>(bytes), static_cast<size_t>(length)};
+}
+
+/* Looks for a pattern in bytes that come one after the other (Knuth, Morris, Pratt). */
+class PatternMatcher {
+public:
+    explicit PatternMatcher(std::string_view pattern) : pattern_(pattern), border_(pattern.size() + 1) {
+        for (size_t i = 1; i < pattern.size(); ++i) {
+            Take(pattern[i]);
+            border_[i + 1] = matched_;
+        }
+        matched_ = 0;
+    }
+
+    /* Whether the pattern ends with this byte. */
+    bool Take(char byte) {
+        while (matched_ != 0 && (matched_ == pattern_.size() || pattern_[matched_] != byte))
+            matched_ = border_[matched_];
+        if (pattern_[matched_] == byte) ++matched_;
+        return matched_ == pattern_.size();
+    }
+
+    /* Goes on behind this text. */
+    void Restart(std::string_view text) {
+        matched_ = 0;
+        for (const char byte : text.substr(text.size() - std::min(text.size(), pattern_.size() - 1))) Take(byte);
+    }
+
+private:
+    std::string_view pattern_;
+    std::vector<size_t> border_; /* how long a beginning of the pattern its first i bytes end with */
+    size_t matched_ = 0;
+};
+
+/* Each occurrence that ends with a byte of the text is taken off the result and the replacement is put there. */
+int32 ReplaceEvery(std::string_view text, std::string_view find, std::string_view replacement, std::string& result) {
+    PatternMatcher matcher(find);
+    int32 found = 0;
+    for (const char byte : text) {
+        result += byte;
+        if (!matcher.Take(byte)) continue;
+        ++found;
+        result.resize(result.size() - find.size());
+        matcher.Restart(result);
+        result += replacement;
+        for (const char inserted : replacement) matcher.Take(inserted);
+    }
+    return found;
 }
 
 std::string NarrowText(const char16_t* text, int32 length) {
@@ -156,10 +211,9 @@ OVSubString::OVSubString(CPStrHandle list, int32 index) : OVSubString(nullptr, 0
 }
 
 OVSubString OVSubString::OnPStr(PStr buffer) {
-    OVSubString view(buffer + 1, std::min<int32>(buffer[0], kMaxTerminatedPStr), kPStrBuffer);
+    OVSubString view(buffer ? buffer + 1 : nullptr, buffer ? buffer[0] : 0, kPStrBuffer);
     view.pstr_ = buffer;
-    buffer[0] = static_cast<uint8>(view.length_);
-    buffer[1 + view.length_] = 0;
+    if (buffer) PStrTerminateIfPossible(buffer);
     return view;
 }
 
@@ -201,7 +255,7 @@ void OVSubString::MoveToStart(uint8* start) {
 }
 
 MgErr OVSubString::ResizePStr(int32 n) {
-    if (n > kMaxTerminatedPStr) return kArgErr;
+    if (n > kMaxTerminatedPStr || !pstr_) return kArgErr;
     MoveToStart(pstr_ + 1);
     pstr_[0] = static_cast<uint8>(n);
     bytes_[n] = 0;
@@ -217,10 +271,16 @@ MgErr OVSubString::ResizeBuffer(int32 n) {
     return kNoErr;
 }
 
+/* What grows grows first, and what shrinks shrinks last: a failure leaves the text as it was. */
 MgErr OVSubString::ResizeHandle(int32 n) {
-    if (*handle_) MoveToStart((**handle_)->bytes);
+    const auto stored = static_cast<int32>(LStrView(*handle_).length);
+    if (n < stored) MoveToStart((**handle_)->bytes);
     if (MgErr err = ResizeLStr(handle_, n)) return err;
-    bytes_ = *handle_ ? (**handle_)->bytes : nullptr;
+    if (*handle_) {
+        MoveToStart((**handle_)->bytes);
+    } else {
+        bytes_ = nullptr;
+    }
     length_ = n;
     return kNoErr;
 }
@@ -229,11 +289,12 @@ MgErr OVSubString::ResizeElement(int32 n) {
     CPStrHandle list = element_.list;
     if (n > kMaxPStr || !list || element_.index >= ElementCount(*list)) return kArgErr;
     PStr element = CPStrIndex(list, element_.index);
-    MoveToStart(element + 1);
-    const auto offset = static_cast<uint32>(bytes_ - *AsHandle(list));
-    const HandleRange text = {CPStrSize(*list), offset, element[0]};
+    const uint8 stored = element[0];
+    if (n < stored) MoveToStart(element + 1);
+    const auto offset = static_cast<uint32>(element + 1 - *AsHandle(list));
+    const HandleRange text = {CPStrSize(*list), offset, stored};
     if (MgErr err = ResizeRange(AsHandle(list), text, static_cast<uint32>(n), true)) return err;
-    bytes_ = *AsHandle(list) + offset;
+    MoveToStart(*AsHandle(list) + offset);
     bytes_[-1] = static_cast<uint8>(n);
     length_ = n;
     return kNoErr;
@@ -243,17 +304,26 @@ MgErr OVSubString::ResizeTemp(int32 n) {
     uint8* room = temp_->room;
     OVString& overflow = temp_->overflow;
     const bool wasInHandle = temp_->inHandle != 0;
-    MoveToStart(wasInHandle ? (*overflow.LHandle())->bytes : room);
-    const bool fits = n < static_cast<int32>(sizeof temp_->room);
-    if (fits && wasInHandle) {
-        std::memcpy(room, bytes_, static_cast<size_t>(std::min(n, length_)));
-        overflow.Resize(0);
-    } else if (!fits) {
-        if (MgErr err = overflow.Resize(n)) return err;
-        if (!wasInHandle) std::memcpy((*overflow.LHandle())->bytes, room, static_cast<size_t>(length_));
+    if (n < static_cast<int32>(sizeof temp_->room)) {
+        if (wasInHandle) {
+            std::memcpy(room, bytes_, static_cast<size_t>(std::min(n, length_)));
+            overflow.Resize(0);
+            skipped_ = 0;
+        }
+        temp_->inHandle = false;
+        MoveToStart(room);
+        length_ = n;
+        return kNoErr;
     }
-    temp_->inHandle = !fits;
-    bytes_ = fits ? room : (*overflow.LHandle())->bytes;
+    if (wasInHandle && n < overflow.Length()) MoveToStart((*overflow.LHandle())->bytes);
+    if (MgErr err = overflow.Resize(n)) return err;
+    uint8* start = (*overflow.LHandle())->bytes;
+    if (!wasInHandle) {
+        std::memcpy(start, bytes_, static_cast<size_t>(length_));
+        skipped_ = 0;
+    }
+    temp_->inHandle = true;
+    MoveToStart(start);
     length_ = n;
     return kNoErr;
 }
@@ -405,12 +475,14 @@ MgErr OVSubString::AppendBSTR(const char16_t* source, int32 length) {
 
 MgErr OVSubString::SearchReplace(const OVSubString& find, const OVSubString& replacement, int32* count) {
     int32 found = 0;
-    MgErr err = kNoErr;
-    for (int32 at = Search(find, 0); at >= 0 && !err; at = Search(find, at + replacement.length_ - find.length_ + 1)) {
-        ++found;
-        err = Replace(replacement, at, find.length_);
-    }
-    if (count) *count = found;
+    const MgErr err = Search(find, 0) < 0 ? kNoErr : Guarded([&]() -> MgErr {
+        std::string result;
+        found = ReplaceEvery(CharactersOf(bytes_, length_), CharactersOf(find.bytes_, find.length_),
+                             CharactersOf(replacement.bytes_, replacement.length_), result);
+        if (result.size() > INT32_MAX) return kArgErr;
+        return Replace(result.data(), static_cast<int32>(result.size()), 0, length_);
+    });
+    if (count) *count = err ? 0 : found;
     return err;
 }
 
@@ -504,7 +576,7 @@ void OVSubString::CopyToCStr(char* buffer, int32 size) const {
         return;
     }
     const auto n = static_cast<size_t>(std::min(length_, size - 1));
-    if (n != 0) std::memcpy(buffer, bytes_, n);
+    if (n != 0) std::memmove(buffer, bytes_, n);
     buffer[n] = 0;
 }
 
@@ -527,21 +599,18 @@ MgErr OVSubStringPrintf(OVSubString* string, bool append, CStr format, va_list a
         TESSEL_REPORT(kDebugError, 0x83E51D29u) << "Bad string ptr";
         return kArgErr;
     }
-    const int32 formatLength = LengthOf(format);
-    va_list countingArgs;
-    va_copy(countingArgs, args);
-    const int32 added = SPrintfv(nullptr, 0, format, formatLength, countingArgs);
-    va_end(countingArgs);
-
-    const int32 start = append ? string->length_ : 0;
-    if (added > INT32_MAX - start) return kArgErr;
-    if (MgErr err = string->Resize(start + added)) return err;
-    if (added == 0) return kNoErr;
-    if (SPrintfv(reinterpret_cast<char*>(string->bytes_) + start, added, format, formatLength, args) != added) {
+    FormattedText text;
+    MgErr err = text.Format(format, static_cast<size_t>(LengthOf(format)), args);
+    if (err == kGenericErr) {
         TESSEL_REPORT(kDebugError, 0x2CB470E8u) << "OVSubStringPrintf error";
         return kArgErr;
     }
-    return kNoErr;
+    const int32 start = append ? string->length_ : 0;
+    const auto added = static_cast<int32>(text.Length());
+    if (added > INT32_MAX - start) return kArgErr;
+    if (!err) err = string->Resize(start + added);
+    if (!err && added != 0) std::memcpy(string->bytes_ + start, text.Bytes(), text.Length());
+    return err;
 }
 
 MgErr OVString::Printf(CStr format, ...) {

@@ -60,8 +60,9 @@ TESSEL_API int32 SNPrintf(char* dst, int32 size, CStr format, ...);
 TESSEL_API int32 PPrintf(PStr dst, CStr format, ...);
 TESSEL_API int32 PPrintfp(PStr dst, ConstPStr format, ...);
 
-/* Into a handle, which is sized to the text. kArgErr for a null handle, the handle manager's error when it cannot grow.
- */
+/* Into a handle, which is sized to the text; the arguments may lie in it. kArgErr for a null handle or format, the
+   handle manager's error when it cannot grow, kGenericErr (reported) when another thread changed an argument's text
+   meanwhile. On failure the handle's text is as it was. */
 TESSEL_API MgErr LStrPrintf(LStrHandle dst, CStr format, ...);
 
 TESSEL_END_C

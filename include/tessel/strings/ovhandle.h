@@ -25,7 +25,7 @@ public:
 
     /* Grows or shrinks the field at `field`, which lies in the handle's block, moving everything after it; `field` then
        points at it in the block, which may have moved. New bytes are not set. kArgErr when the field does not lie in
-       the block. On failure nothing has changed. */
+       the block. On failure nothing has changed. Where memory is too short to shrink the block, it keeps its size. */
     MgErr ResizeField(uint8*& field, uint32 oldSize, uint32 newSize);
 
     /* Takes the handle over. One that is still held is reported (fatal) and replaced; it is not disposed of. */

@@ -45,7 +45,8 @@ public:
 /* A view of a run of bytes that knows where they live and can therefore edit them there. The storage kind (m_class):
 
       1  2  3  7   any text owned elsewhere: read-only
-      4            a PStr buffer of 256 bytes: up to 254, length byte and a terminating zero kept
+      4            a PStr buffer of 256 bytes: up to 254, length byte and a terminating zero kept; one that holds 255
+                   bytes is left as it is, and viewed whole, until it is edited
       5            a caller's buffer: up to capacity - 1, kept terminated
      10            an OVString or an LStr handle: any length
      11            an element of a CPStr handle: up to 255, the later elements moved
@@ -53,8 +54,8 @@ public:
 
    The storage must outlive the view. An edit makes other views of the same storage stale. Lengths and offsets are
    bytes; case is mapped with ToLower. An editing operation returns kArgErr, the text unchanged, when the text is
-   read-only or cannot hold the result, and the handle manager's error when memory is short. Texts put in may come from
-   the view itself. Used by one thread at a time. */
+   read-only or cannot hold the result, and the handle manager's error when memory is short. Texts put in, printed
+   or searched for may come from the view itself. Used by one thread at a time. */
 class TESSEL_API OVSubString {
 public:
     /* Read-only views; null is the empty text. */
@@ -108,9 +109,9 @@ public:
     MgErr AppendCStr(CStr source);
     MgErr AppendBSTR(const char16_t* source, int32 length);
 
-    /* Replaces every occurrence, counted in *count (may be null). The search resumes so that the next occurrence may
-       begin inside the end of what was just inserted; one that begins at the insertion's first byte is not seen. An
-       empty `find` replaces nothing. */
+    /* Replaces every occurrence, counted in *count (may be null). The next occurrence may begin before or inside of
+       what was just inserted, but ends behind it. An empty `find` replaces nothing. All or nothing: on failure the text
+       is as it was, and the count 0. */
     MgErr SearchReplace(const OVSubString& find, const OVSubString& replacement, int32* count);
 
     /* Narrows the view past spaces, tabs, CR and LF at both ends. The stored bytes stay until the view is resized,
