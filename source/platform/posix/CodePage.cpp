@@ -22,6 +22,7 @@ namespace tessel::platform {
 
 namespace {
 
+constexpr char32_t kFirstControl = 0x80;          /* of those beyond ASCII; there are 32 */
 constexpr std::uint32_t kCodePageGb18030 = 54936; /* the only one whose second byte tells the length */
 
 constexpr void FillAscii(CodePageTables& tables) {
@@ -44,6 +45,7 @@ constinit const CodePageTables utf8Tables = MakeUtf8Tables();
 /* A page other than UTF-8, and what the host's converter calls it. Never freed: earlier tables stay valid. */
 struct OtherPage : CodePageTables {
     char converterName[32];
+    std::uint32_t unused = 0; /* in a single-byte page: of the bytes 80 to 9F, those that are no character */
     OtherPage* next;
 };
 
@@ -208,6 +210,17 @@ void FillCaseMaps(CodePageTables& tables, Converter& toWide) {
     freelocale(locale);
 }
 
+/* The bytes 80 to 9F that the converter knows no character for. */
+std::uint32_t UnusedControls(Converter& toWide) {
+    std::uint32_t unused = 0;
+    for (unsigned i = 0; i < 32; ++i) {
+        char text = static_cast<char>(kFirstControl + i);
+        char32_t character = 0;
+        if (DecodeOne(toWide, &text, 1, character) != 0) unused |= 1u << i;
+    }
+    return unused;
+}
+
 /* A page for texts keeps ASCII where it is (some put a currency sign at the backslash, and a line over the tilde). */
 bool KeepsAscii(Converter& toWide) {
     for (unsigned byte = 0x20; byte < 0x7F; ++byte) {
@@ -228,7 +241,10 @@ std::unique_ptr<OtherPage> MakePage(std::uint32_t codePage) {
     std::memcpy(page->converterName, name.c_str(), name.size() + 1);
     FillAscii(*page);
     FillLengths(*page, toWide);
-    if (!page->multiByte) FillCaseMaps(*page, toWide);
+    if (!page->multiByte) {
+        FillCaseMaps(*page, toWide);
+        page->unused = UnusedControls(toWide);
+    }
     return page;
 }
 
@@ -443,10 +459,16 @@ ThreadConverters& Converters(const CodePageTables& page) {
     return converters;
 }
 
-/* Runs the converter over `in`. Where it stops at a character, skip(rest) says how many bytes to leave out, and
-   `instead` takes their place. True when it never stopped. */
-template <typename Skip>
-bool Convert(Converter& converter, std::string_view in, std::string& out, std::string_view instead, Skip skip) {
+/* What takes the place of a character at which the converter stopped. */
+struct Substitute {
+    std::size_t skipped; /* bytes */
+    bool same;           /* it is the same character */
+};
+
+/* Runs the converter over `in`. Where it stops at a character, substitute(rest, out) appends what takes its place. True
+   when no character was lost. */
+template <typename Substituter>
+bool Convert(Converter& converter, std::string_view in, std::string& out, Substituter substitute) {
     bool complete = converter.IsOpen();
     if (!complete) out.assign(in);
     const char* input = in.data();
@@ -459,13 +481,19 @@ bool Convert(Converter& converter, std::string_view in, std::string& out, std::s
         int error = converter.Run(input, inCount, output, room);
         out.append(buffer, sizeof buffer - room);
         if (error == 0 || error == E2BIG) continue;
-        std::size_t skipped = skip(std::string_view(input, inCount));
-        out.append(instead);
-        input += skipped;
-        inCount -= skipped;
-        complete = false;
+        Substitute substituted = substitute(std::string_view(input, inCount), out);
+        input += substituted.skipped;
+        inCount -= substituted.skipped;
+        if (!substituted.same) complete = false;
     }
     return complete;
+}
+
+/* The bytes from 80 to 9F that a single-byte page leaves unused are the controls of these numbers, both ways: on the
+   hosts that the pages come from they are, so that no text changes on its way to Unicode and back. */
+bool IsControl(const CodePageTables& page, char32_t character) {
+    if (character < kFirstControl || character >= kFirstControl + 32) return false;
+    return (static_cast<const OtherPage&>(page).unused >> (character - kFirstControl) & 1) != 0;
 }
 
 bool Converted(bool complete) {
@@ -479,8 +507,12 @@ bool ToUtf8(std::string_view text, std::string& utf8) {
     utf8.reserve(text.size());
     const CodePageTables& page = ActiveCodePage();
     if (page.utf8) return Converted(ForEachUtf8(text, [&](char32_t c) { AppendUtf8(utf8, c); }));
-    return Converted(Convert(*Converters(page).toUtf8, text, utf8, "\xEF\xBF\xBD",
-                             [](std::string_view rest) { return CharLength(rest.data(), rest.data() + rest.size()); }));
+    return Converted(Convert(*Converters(page).toUtf8, text, utf8, [&](std::string_view rest, std::string& out) {
+        std::uint8_t byte = static_cast<std::uint8_t>(rest[0]);
+        bool control = IsControl(page, byte);
+        AppendUtf8(out, control ? byte : kReplacementCharacter);
+        return Substitute{CharLength(rest.data(), rest.data() + rest.size()), control};
+    }));
 }
 
 bool FromUtf8(std::string_view utf8, std::string& text) {
@@ -490,10 +522,12 @@ bool FromUtf8(std::string_view utf8, std::string& text) {
     if (page.utf8) {
         return Converted(ForEachUtf8(utf8, [&](char32_t c) { AppendUtf8(text, c); }));
     }
-    return Converted(Convert(*Converters(page).fromUtf8, utf8, text, "?", [](std::string_view rest) {
-        char32_t character;
+    return Converted(Convert(*Converters(page).fromUtf8, utf8, text, [&](std::string_view rest, std::string& out) {
+        char32_t character = 0;
         std::size_t length = DecodeUtf8(rest.data(), rest.data() + rest.size(), character);
-        return length ? length : 1;
+        bool control = length != 0 && IsControl(page, character);
+        out += control ? static_cast<char>(character) : '?';
+        return Substitute{length ? length : 1, control};
     }));
 }
 
