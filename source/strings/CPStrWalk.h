@@ -19,6 +19,18 @@ inline ConstPStr ElementAt(const CPStr* list, int32 i) {
     return element;
 }
 
+/* How many of the elements that the count promises lie whole in a list of so many bytes. */
+inline int32 ElementsPresent(const CPStr* list, uint32 size) {
+    const auto* bytes = reinterpret_cast<const uint8*>(list);
+    uint64 offset = offsetof(CPStr, bytes);
+    int32 present = 0;
+    while (present < list->count && offset < size) {
+        offset += bytes[offset] + 1u;
+        if (offset <= size) ++present;
+    }
+    return present;
+}
+
 /* The first result of compare(element of a, element of b) over n elements that is not 0, or 0. */
 template <class Compare>
 int32 CompareElements(const CPStr* a, const CPStr* b, int32 n, Compare compare) {

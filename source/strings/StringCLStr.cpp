@@ -121,13 +121,18 @@ MgErr CLStrRemove(CLStrHandle list, int32 i) {
 void StdToCLStr(CLStrHandle list) {
     const uint32 size = list ? DSGetHandleSize(AsHandle(list)) : 0;
     uint64 offset = 0;
+    bool hasAll = false;
     if (size >= kEmptyListSize) {
         uint8* bytes = *AsHandle(list);
         StdToHost(bytes);
+        int32 present = 0;
         for (offset = kEmptyListSize; offset + sizeof(int32) <= size;) {
             const uint64 length = StdToHost(bytes + offset);
             offset += sizeof(int32) + (length + kAlignment - 1) / kAlignment * kAlignment;
+            if (offset <= size) ++present;
         }
+        hasAll = (*list)->count <= present;
+        if (!hasAll) (*list)->count = present;
     }
-    if (size == 0 || offset != size) TESSEL_REPORT(kDebugFatal, 0x8F3B62D0u);
+    if (!hasAll || offset != size) TESSEL_REPORT(kDebugFatal, 0x8F3B62D0u);
 }

@@ -29,6 +29,7 @@ uint32 CPStrSize(const CPStr* list) {
 }
 
 PStr CPStrIndex(CPStrHandle list, int32 i) {
+    if (!list) return nullptr;
     return const_cast<PStr>(ElementAt(*list, ClampToElement(*list, i)));
 }
 
@@ -97,7 +98,7 @@ MgErr CPStrReplace(CPStrHandle list, ConstPStr element, int32 index) {
 }
 
 int32 CPStrSearch(CPStrHandle list, ConstPStr key, CPStrMatchProc match) {
-    const int32 count = list ? ElementCount(*list) : 0;
+    const int32 count = list && match ? ElementCount(*list) : 0;
     ConstPStr element = count != 0 ? (*list)->bytes : nullptr;
     for (int32 i = 0; i < count; ++i, element += element[0] + 1) {
         if (match(key, element) == 0) return i;
@@ -106,6 +107,7 @@ int32 CPStrSearch(CPStrHandle list, ConstPStr key, CPStrMatchProc match) {
 }
 
 void StrPoundToCPStr(UHandle resource, CPStrPtr list) {
+    if (!list) return;
     int16 count = 0;
     const uint32 size = resource ? DSGetHandleSize(resource) : 0;
     if (size >= sizeof count) {
@@ -113,4 +115,9 @@ void StrPoundToCPStr(UHandle resource, CPStrPtr list) {
         std::memcpy(list->bytes, *resource + sizeof count, size - sizeof count);
     }
     list->count = count;
+    const uint32 bytes = kEmptyListSize + size - static_cast<uint32>(sizeof count);
+    if (count > 0) list->count = ElementsPresent(list, bytes);
+    if (list->count < count) {
+        TESSEL_REPORT(kDebugError, 0xA70D3C96u) << "String list of " << count << " ends after " << list->count;
+    }
 }

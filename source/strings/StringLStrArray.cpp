@@ -64,8 +64,9 @@ MgErr CPStrPtrToLStrArray(const CPStr* list, int32 n, LStrArrayHandle* array) {
 }
 
 MgErr LStrArrayToCPStrHandle(LStrArrayHandle array, int32 n, CPStrHandle* list) {
-    if (!list || n < 0 || n > ElementCount(array)) return kArgErr;
-    if (n == 0) return DSDisposeHandleAndNull(AsHandlePtr(list));
+    if (!list || n < 0) return kArgErr;
+    if (array && n > ElementCount(array)) return kArgErr;
+    if (!array || n == 0) return DSDisposeHandleAndNull(AsHandlePtr(list));
     size_t size = offsetof(CPStr, bytes);
     for (int32 i = 0; i < n; ++i) size += ClippedLength((*array)->element[i]) + size_t{1};
     if (size > INT32_MAX || DSSetHandleSizeOrNewHandle(AsHandlePtr(list), static_cast<uint32>(size))) {

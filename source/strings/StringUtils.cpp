@@ -445,12 +445,9 @@ MgErr ToLStrArrayHandleNoThrow(const std::vector<std::string>& source, LStrArray
     LStrArrayHandle made = nullptr;
     MgErr err = ReallocLStrArrayHandle(&made, static_cast<int32>(source.size()));
     if (!err) err = FillArray(made, source);
-    if (err) {
-        ReallocLStrArrayHandle(&made, 0);
-        return err;
-    }
-    *array = made;
-    return kNoErr;
+    ReallocLStrArrayHandle(err ? &made : array, 0);
+    if (!err) *array = made;
+    return err;
 }
 
 BSTR ToBSTR(const std::string& source) {

@@ -31,7 +31,8 @@ TESSEL_API MgErr CLStrInsertSort(CLStrHandle list, const LStr* element, bool all
 TESSEL_API MgErr CLStrRemove(CLStrHandle list, int32 i);
 
 /* Brings a list whose count and lengths stand most significant byte first into host order. A list that does not end
-   exactly at the handle's end is reported (fatal); no byte beyond the handle is touched. */
+   exactly at the handle's end, or has fewer elements than its count says, is reported (fatal); no byte beyond the
+   handle is touched, and the count is then that of the elements that lie in it whole. */
 TESSEL_API void StdToCLStr(CLStrHandle list);
 
 TESSEL_END_C

@@ -14,7 +14,7 @@ TESSEL_BEGIN_C
 TESSEL_API uint32 CPStrSize(const CPStr* list);
 
 /* Element i, with i brought into 0 ... count - 1; where the first one would be if there is none. The pointer lies in
-   the handle's block. The handle may not be null. */
+   the handle's block. Null for a null handle. */
 TESSEL_API PStr CPStrIndex(CPStrHandle list, int32 i);
 
 /* Compares element by element with PStrCmp, then the counts. */
@@ -40,11 +40,12 @@ TESSEL_API MgErr CPStrReplace(CPStrHandle list, ConstPStr element, int32 index);
 /* A comparison of a key with an element, for example PStrCmp or PStrCaseCmp; 0 means that they match. */
 typedef int32 (*CPStrMatchProc)(ConstPStr key, ConstPStr element);
 
-/* Index of the first element that matches, or -1. */
+/* Index of the first element that matches, or -1; -1 for a null list or comparison. */
 TESSEL_API int32 CPStrSearch(CPStrHandle list, ConstPStr key, CPStrMatchProc match);
 
 /* Converts the body of a string-list resource (an int16 count in host order, then PStrs) into a CPStr. list must take
-   the handle's size + 2 bytes. */
+   the handle's size + 2 bytes. Of a body that ends before its count does, the whole strings are counted, and it is
+   reported. A null list is left alone. */
 TESSEL_API void StrPoundToCPStr(UHandle resource, CPStrPtr list);
 
 TESSEL_END_C

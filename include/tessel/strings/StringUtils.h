@@ -78,7 +78,8 @@ TESSEL_API LStrHandle ToLStrHandle(const std::string& source);
 TESSEL_API LStrHandle ToLStrHandle(const std::string& source, LStrHandle* handle);
 TESSEL_API MgErr ToLStrHandleNoThrow(const std::string& source, LStrHandle* handle);
 
-/* A new array with a handle for each string; the caller owns it. On failure *array is unchanged. */
+/* Replaces *array by a new array with a handle for each string, which the caller owns; the old array, unless it is
+   null, is disposed of. On failure *array is unchanged. */
 TESSEL_API MgErr ToLStrArrayHandleNoThrow(const std::vector<std::string>& source, LStrArrayHandle* array);
 
 /* A new BSTR, which the caller frees with BSTRFree. */
