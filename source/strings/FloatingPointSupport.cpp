@@ -23,6 +23,7 @@ int32 Classify(const RealParts& x) {
 using namespace tessel;
 
 int32 ClassifyFloatNumber(const void* value, int16 typeCode) {
+    if (value == nullptr) return kFloatFinite;
     switch (TypeOfCode(typeCode)) {
         case kNumSingle:
             return Classify(TakeApart(double{ReadAs<float>(value)}));

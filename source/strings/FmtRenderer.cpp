@@ -228,11 +228,11 @@ void FmtRenderer::RenderPoint(uint32 point) {
 }
 
 void FmtRenderer::RenderRectangle(const int16* rectangle) {
-    for (int i = 0; i < 4; ++i) {
+    for (int i = 0; rectangle && i < 4; ++i) {
         PutWord(i == 0 ? "(" : ", ");
         PutShort(rectangle[i]);
     }
-    output_.Put(')');
+    if (rectangle) output_.Put(')');
 }
 
 }  // namespace tessel

@@ -315,6 +315,10 @@ using namespace tessel;
 int32 NumToAnyString(const void* value, int16 typeCode, const int16* formatCode, char* buffer, int32 size,
                      uint8 decimalPoint, int32* sharedExponent) {
     if (buffer == nullptr || size <= 0) return 0;
+    if (formatCode == nullptr) {
+        buffer[0] = 0;
+        return 0;
+    }
     const int16 type = TypeOfCode(typeCode);
     const int32 code = *formatCode;
     if (value == nullptr) return RenderNull(type, buffer, size);

@@ -80,6 +80,7 @@ int32 WriteExponent(int32 exponent, char* out) {
 using namespace tessel;
 
 int32 NumToIntString(const void* value, char* buffer, int32 size, int32 radix, bool isSigned, int16 typeCode) {
+    if (buffer == nullptr) return 0;
     int16 type = TypeOfCode(typeCode);
     uint32 converted = 0;
     if (value == nullptr || !IsIntegerType(type)) {

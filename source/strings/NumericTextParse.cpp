@@ -401,18 +401,21 @@ int64 StringToNumQ(CharacterSource& source, int32 length, int16 typeCode, int32 
 using namespace tessel;
 
 bool StringToPacked(const char* text, int32 length, PackedDecimal* record, uint8 decimalPoint) {
-    return RealParser(text, length, static_cast<char>(decimalPoint)).Parse(*record);
+    if (record == nullptr) return false;
+    return RealParser(text, text != nullptr ? length : 0, static_cast<char>(decimalPoint)).Parse(*record);
 }
 
 int32 StringToNum32(const char** cursor, int32 length, int16 typeCode, int32 radix, bool noSign) {
-    MemoryText text(*cursor, length);
+    if (cursor == nullptr) return 0;
+    MemoryText text(*cursor, *cursor != nullptr ? length : 0);
     const int32 value = Parse32(text, typeCode, radix, noSign);
     *cursor = text.At();
     return value;
 }
 
 int64 StringToNum64(const char** cursor, int32 length, int16 typeCode, int32 radix, bool noSign) {
-    MemoryText text(*cursor, length);
+    if (cursor == nullptr) return 0;
+    MemoryText text(*cursor, *cursor != nullptr ? length : 0);
     const int64 value = Parse64(text, typeCode, radix, noSign);
     *cursor = text.At();
     return value;

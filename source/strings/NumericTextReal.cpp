@@ -181,7 +181,7 @@ int32 RenderReal(const RealSource& source, int32 k, char* buffer, int32 size, ch
 using namespace tessel;
 
 int32 PackedToString(const PackedDecimal* record, int16 formatCode, char* buffer, int32 size, uint8 decimalPoint) {
-    if (buffer == nullptr || size <= 0) return 0;
+    if (record == nullptr || buffer == nullptr || size <= 0) return 0;
     RealText text;
     if (!ReadRecord(*record, text)) {
         ReportBadRecord(*record, CodeInUse(text, formatCode, size) > 0);
@@ -191,9 +191,9 @@ int32 PackedToString(const PackedDecimal* record, int16 formatCode, char* buffer
 }
 
 CStr NumSetNaNText(CStr text) {
-    return gNaNText.exchange(text);
+    return gNaNText.exchange(text != nullptr ? text : "NaN");
 }
 
 CStr NumSetInfText(CStr text) {
-    return gInfText.exchange(text);
+    return gInfText.exchange(text != nullptr ? text : "Inf");
 }

@@ -14,13 +14,17 @@ uint8 tessel::g_decimalPoint = '.';
 
 namespace {
 
+CStr TextOf(CStr s) {
+    return s ? s : "";
+}
+
 const uint8* Bytes(CStr s) {
     return reinterpret_cast<const uint8*>(s);
 }
 
 /* Bytes before the terminator, at most n. Reads no byte behind the terminator. */
 size_t LengthUpTo(CStr s, int32 n) {
-    if (n <= 0) return 0;
+    if (n <= 0 || !s) return 0;
     const void* terminator = std::memchr(s, 0, static_cast<size_t>(n));
     return terminator ? static_cast<size_t>(static_cast<CStr>(terminator) - s) : static_cast<size_t>(n);
 }
@@ -71,36 +75,40 @@ bool IsByte(int32 c) {
 // ---- length and copying ----
 
 int32 StrLen(CStr s) {
-    return static_cast<int32>(std::strlen(s));
+    return static_cast<int32>(std::strlen(TextOf(s)));
 }
 
 void StrCpy(char* dst, CStr src) {
-    std::memcpy(dst, src, std::strlen(src) + 1);
+    if (dst) std::memmove(dst, TextOf(src), std::strlen(TextOf(src)) + 1);
 }
 
 char* StrNCpy(char* dst, CStr src, int32 n) {
-    if (n <= 0) return dst;
+    if (n <= 0 || !dst) return dst;
     const size_t length = LengthUpTo(src, n);
-    std::memcpy(dst, src, length);
+    if (length != 0) std::memmove(dst, src, length);
     std::memset(dst + length, 0, static_cast<size_t>(n) - length);
     return dst;
 }
 
 int32 StrCat(char* dst, CStr src) {
+    if (!dst) return 0;
     const size_t dstLength = std::strlen(dst);
-    const size_t srcLength = std::strlen(src);
-    std::memcpy(dst + dstLength, src, srcLength + 1);
+    const size_t srcLength = std::strlen(TextOf(src));
+    std::memmove(dst + dstLength, TextOf(src), srcLength);
+    dst[dstLength + srcLength] = 0;
     return static_cast<int32>(dstLength + srcLength);
 }
 
 // ---- comparison ----
 
 int32 StrCmp(CStr a, CStr b) {
+    a = TextOf(a);
+    b = TextOf(b);
     return Compare(a, std::strlen(a), b, std::strlen(b));
 }
 
 bool StrEqual(CStr a, CStr b) {
-    return std::strcmp(a, b) == 0;
+    return std::strcmp(TextOf(a), TextOf(b)) == 0;
 }
 
 int32 StrNCmp(CStr a, CStr b, int32 n) {
@@ -112,6 +120,8 @@ bool StrNEqual(CStr a, CStr b, int32 n) {
 }
 
 int32 StrCaseCmp(CStr a, CStr b) {
+    a = TextOf(a);
+    b = TextOf(b);
     return CompareNoCase(a, std::strlen(a), b, std::strlen(b));
 }
 
@@ -127,17 +137,17 @@ bool StrNCaseEqual(CStr a, CStr b, int32 n) {
 
 char* StrChr(CStr s, int32 c) {
     const char sought = static_cast<char>(c);
-    return sought ? const_cast<char*>(std::strchr(s, sought)) : nullptr;
+    return sought && s ? const_cast<char*>(std::strchr(s, sought)) : nullptr;
 }
 
 char* StrRChr(CStr s, int32 c) {
     const char sought = static_cast<char>(c);
-    return sought ? const_cast<char*>(std::strrchr(s, sought)) : nullptr;
+    return sought && s ? const_cast<char*>(std::strrchr(s, sought)) : nullptr;
 }
 
 bool StrIStr(CStr s, CStr pattern) {
-    for (; *s; ++s) {
-        if (MatchesWithoutBlanks(s, pattern)) return true;
+    for (s = TextOf(s); *s; ++s) {
+        if (MatchesWithoutBlanks(s, TextOf(pattern))) return true;
     }
     return false;
 }
@@ -145,15 +155,15 @@ bool StrIStr(CStr s, CStr pattern) {
 // ---- case and stepping ----
 
 void StrToUpper(char* s, int32 len) {
-    if (len > 0) platform::UpperText(s, static_cast<size_t>(len));
+    if (len > 0 && s) platform::UpperText(s, static_cast<size_t>(len));
 }
 
 void StrToLower(char* s, int32 len) {
-    if (len > 0) platform::LowerText(s, static_cast<size_t>(len));
+    if (len > 0 && s) platform::LowerText(s, static_cast<size_t>(len));
 }
 
 int32 StrNextChar(CStr s, int32 index) {
-    return s[index] ? static_cast<int32>(platform::NextChar(s + index) - s) : index + 1;
+    return s && s[index] ? static_cast<int32>(platform::NextChar(s + index) - s) : index + 1;
 }
 
 int32 StrPrevChar(CStr s, int32 index) {
@@ -161,6 +171,7 @@ int32 StrPrevChar(CStr s, int32 index) {
         TESSEL_REPORT(kDebugWarning, 0x6B1D94C3u) << "Negative index into string in StrPrevChar";
         return 0;
     }
+    if (!s) return 0;
     return static_cast<int32>(platform::PrevChar(s, s + index) - s);
 }
 

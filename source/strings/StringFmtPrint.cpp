@@ -208,7 +208,16 @@ bool Formatter::Unknown() {
     return false;
 }
 
+size_t LengthOf(CStr format) {
+    return format ? std::strlen(format) : 0;
+}
+
+size_t LengthOf(ConstPStr format) {
+    return format ? format[0] : 0;
+}
+
 Formatted Run(char* dst, int32 size, const char* format, size_t length, FmtArgumentList& args) {
+    if (!format) length = 0;
     const int32 limit = !dst || size == kFmtNoLimit ? INT32_MAX : std::max(size, 0);
     return Formatter(FmtOutput(dst, static_cast<size_t>(limit)), format, length, args).Run();
 }
@@ -224,13 +233,14 @@ int32 FormatTerminated(char* dst, const char* format, size_t length, FmtArgument
 }
 
 int32 FormatPStr(PStr dst, const char* format, size_t length, FmtArgumentList& args) {
+    if (!dst) return 0;
     const size_t written = Format(reinterpret_cast<char*>(dst + 1), kMaxPStr, format, length, args);
     dst[0] = static_cast<uint8>(written);
     return dst[0];
 }
 
-const char* Chars(const uint8* bytes) {
-    return reinterpret_cast<const char*>(bytes);
+const char* Chars(ConstPStr text) {
+    return text ? reinterpret_cast<const char*>(text + 1) : nullptr;
 }
 
 }  // namespace
@@ -269,7 +279,7 @@ int32 SPrintfv(char* dst, int32 size, const char* format, int32 formatLength, va
 int32 SPrintf(char* dst, CStr format, ...) {
     FmtArgumentList args;
     va_start(args.list, format);
-    const int32 written = FormatTerminated(dst, format, std::strlen(format), args);
+    const int32 written = FormatTerminated(dst, format, LengthOf(format), args);
     va_end(args.list);
     return written;
 }
@@ -277,7 +287,7 @@ int32 SPrintf(char* dst, CStr format, ...) {
 int32 SPrintfp(char* dst, ConstPStr format, ...) {
     FmtArgumentList args;
     va_start(args.list, format);
-    const int32 written = FormatTerminated(dst, Chars(format + 1), format[0], args);
+    const int32 written = FormatTerminated(dst, Chars(format), LengthOf(format), args);
     va_end(args.list);
     return written;
 }
@@ -286,7 +296,7 @@ int32 SNPrintf(char* dst, int32 size, CStr format, ...) {
     if (dst && size <= 0) return 0;
     FmtArgumentList args;
     va_start(args.list, format);
-    const auto written = static_cast<int32>(Format(dst, size, format, std::strlen(format), args));
+    const auto written = static_cast<int32>(Format(dst, size, format, LengthOf(format), args));
     va_end(args.list);
     if (dst) dst[std::min(written, size - 1)] = 0;
     return written;
@@ -295,7 +305,7 @@ int32 SNPrintf(char* dst, int32 size, CStr format, ...) {
 int32 PPrintf(PStr dst, CStr format, ...) {
     FmtArgumentList args;
     va_start(args.list, format);
-    const int32 written = FormatPStr(dst, format, std::strlen(format), args);
+    const int32 written = FormatPStr(dst, format, LengthOf(format), args);
     va_end(args.list);
     return written;
 }
@@ -303,7 +313,7 @@ int32 PPrintf(PStr dst, CStr format, ...) {
 int32 PPrintfp(PStr dst, ConstPStr format, ...) {
     FmtArgumentList args;
     va_start(args.list, format);
-    const int32 written = FormatPStr(dst, Chars(format + 1), format[0], args);
+    const int32 written = FormatPStr(dst, Chars(format), LengthOf(format), args);
     va_end(args.list);
     return written;
 }
@@ -313,7 +323,7 @@ MgErr LStrPrintf(LStrHandle dst, CStr format, ...) {
     FormattedText text;
     va_list args;
     va_start(args, format);
-    MgErr err = text.Format(format, std::strlen(format), args);
+    MgErr err = text.Format(format, LengthOf(format), args);
     va_end(args);
     if (err == kGenericErr) TESSEL_REPORT(kDebugFatal, 0x48A3D5F1u);
     if (!err) err = DSSetHandleSize(AsHandle(dst), LStrSize(text.Length()));

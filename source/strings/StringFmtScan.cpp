@@ -35,8 +35,9 @@ uint8 EscapedByte(char c) {
 }  // namespace
 
 uint8 ScanForBackslash(CStr* cursor, CStr end) {
+    if (!cursor) return 0;
     CStr p = *cursor;
-    if (p >= end) return 0;
+    if (!p || p >= end) return 0;
     const char first = *p++;
     if (first != '\\' || p == end) {
         *cursor = p;
@@ -54,8 +55,9 @@ uint8 ScanForBackslash(CStr* cursor, CStr end) {
 }
 
 bool ScanForFormatDecPoint(CStr* cursor, CStr end, uint8* decimalPoint) {
+    if (!cursor || !decimalPoint) return false;
     CStr p = *cursor;
-    if (p >= end || *p == '[' || *p == '%') return false;
+    if (!p || p >= end || *p == '[' || *p == '%') return false;
     if (*p == ';') {
         *cursor = p + 1;
         *decimalPoint = StrGetDecimalPoint();

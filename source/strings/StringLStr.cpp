@@ -25,25 +25,30 @@ int32 CompareNoCase(LStrView a, LStrView b) {
     return CompareBytesNoCase(a.bytes, a.length, b.bytes, b.length);
 }
 
+LStrView ViewOf(ConstPStr text) {
+    return text ? LStrView(text + 1, text[0]) : LStrView(nullptr, 0);
+}
+
 bool Equal(LStrView a, LStrView b) {
     return a.length == b.length && (a.length == 0 || std::memcmp(a.bytes, b.bytes, a.length) == 0);
 }
 
 /* The order of two texts of which one is null: it is below every text that is not empty. */
-int32 CompareNull(const LStr* a, const LStr* b) {
-    return (LStrView(a).length != 0) - (LStrView(b).length != 0);
+int32 CompareNull(LStrView a, LStrView b) {
+    return (a.length != 0) - (b.length != 0);
 }
 
 int32 Store(const void* bytes, size_t length, LStrPtr dst) {
+    if (!dst) return 0;
     if (length != 0) std::memmove(dst->bytes, bytes, length);
     return dst->count = static_cast<int32>(length);
 }
 
 /* Copies as much as `size` takes with its terminator. */
 size_t CopyTerminated(LStrView src, char* dst, uint32 size) {
-    if (size == 0) return 0;
+    if (size == 0 || !dst) return 0;
     const size_t length = std::min<size_t>(src.length, size - 1);
-    if (length != 0) std::memcpy(dst, src.bytes, length);
+    if (length != 0) std::memmove(dst, src.bytes, length);
     dst[length] = 0;
     return length;
 }
@@ -105,19 +110,21 @@ bool LHStrEqual(LStrHandle a, LStrHandle b) {
 }
 
 int32 PtrLenStrCmp(const void* a, int32 aLength, const void* b, int32 bLength) {
-    return Compare({a, aLength}, {b, bLength});
+    const LStrView first(a, aLength), second(b, bLength);
+    return a && b ? Compare(first, second) : CompareNull(first, second);
 }
 
 int32 PtrLenStrCaseCmp(const void* a, int32 aLength, const void* b, int32 bLength) {
-    return CompareNoCase({a, aLength}, {b, bLength});
+    const LStrView first(a, aLength), second(b, bLength);
+    return a && b ? CompareNoCase(first, second) : CompareNull(first, second);
 }
 
 int32 PLStrCmp(ConstPStr a, const LStr* b) {
-    return Compare({a + 1, a[0]}, b);
+    return Compare(ViewOf(a), b);
 }
 
 int32 PLStrCaseCmp(ConstPStr a, const LStr* b) {
-    return CompareNoCase({a + 1, a[0]}, b);
+    return CompareNoCase(ViewOf(a), b);
 }
 
 // ---- into and out of the caller's buffers ----
@@ -143,20 +150,23 @@ int32 LToCStrNUnchecked(const LStr* src, char* dst, uint32 size) {
 }
 
 MgErr LToCStrNChecked(const LStr* src, char* dst, uint32 size, int32* length) {
+    if (length) *length = 0;
+    if (!dst && size != 0) return kArgErr;
     const size_t copied = CopyTerminated(src, dst, size);
     if (length) *length = static_cast<int32>(copied);
     return copied != 0 && std::memchr(dst, 0, copied) ? kEmbeddedZeroErr : kNoErr;
 }
 
 int32 LToPStr(const LStr* src, PStr dst) {
+    if (!dst) return 0;
     const LStrView text(src);
     if (text.length > kMaxPStr) {
         TESSEL_REPORT(kDebugWarning, 0xD04A6B39u)
             << "LStr truncated when converting to PStr. Original LStr length=" << src->count;
     }
-    dst[0] = static_cast<uint8>(std::min(text.length, kMaxPStr));
-    if (dst[0] != 0) std::memcpy(dst + 1, text.bytes, dst[0]);
-    return dst[0];
+    const size_t length = std::min(text.length, kMaxPStr);
+    if (length != 0) std::memmove(dst + 1, text.bytes, length);
+    return dst[0] = static_cast<uint8>(length);
 }
 
 // ---- into handles ----

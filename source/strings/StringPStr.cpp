@@ -14,6 +14,20 @@ namespace {
 
 constexpr size_t kMaxPStr = 255;
 
+constexpr uint8 kEmpty[1] = {0};
+
+ConstPStr TextOf(ConstPStr s) {
+    return s ? s : kEmpty;
+}
+
+CStr TextOf(CStr s) {
+    return s ? s : "";
+}
+
+ConstPStr Pointee(const ConstPStr* s) {
+    return s ? *s : nullptr;
+}
+
 char* Chars(uint8* bytes) {
     return reinterpret_cast<char*>(bytes);
 }
@@ -56,12 +70,13 @@ bool ReplaceAll(ConstPStr src, CStr find, CStr replacement, PStrBuilder& result,
 // ---- copying ----
 
 PStr PStrCpy(PStr dst, ConstPStr src) {
-    std::memmove(dst, src, src[0] + size_t{1});
+    if (dst) std::memmove(dst, TextOf(src), TextOf(src)[0] + size_t{1});
     return dst;
 }
 
 PStr PStrNCpy(PStr dst, ConstPStr src, int32 n) {
-    if (n <= 0) return dst;
+    if (n <= 0 || !dst) return dst;
+    src = TextOf(src);
     const int32 copied = std::min(n, src[0] + 1);
     std::memmove(dst, src, static_cast<size_t>(copied));
     dst[0] = static_cast<uint8>(copied - 1);
@@ -69,6 +84,8 @@ PStr PStrNCpy(PStr dst, ConstPStr src, int32 n) {
 }
 
 int32 PStrCat(PStr dst, ConstPStr src) {
+    if (!dst) return 0;
+    src = TextOf(src);
     const size_t added = std::min<size_t>(src[0], kMaxPStr - dst[0]);
     std::memmove(dst + 1 + dst[0], src + 1, added);
     dst[0] = static_cast<uint8>(dst[0] + added);
@@ -88,6 +105,8 @@ PStr PStrDup(ConstPStr s) {
 }
 
 int32 PToCStr(ConstPStr src, char* dst) {
+    if (!dst) return 0;
+    src = TextOf(src);
     const size_t length = src[0];
     std::memmove(dst, src + 1, length);
     dst[length] = 0;
@@ -95,18 +114,21 @@ int32 PToCStr(ConstPStr src, char* dst) {
 }
 
 int32 CToPStr(CStr src, PStr dst) {
-    const size_t length = std::min(std::strlen(src), kMaxPStr);
-    std::memmove(dst + 1, src, length);
+    if (!dst) return 0;
+    const size_t length = std::min(std::strlen(TextOf(src)), kMaxPStr);
+    std::memmove(dst + 1, TextOf(src), length);
     dst[0] = static_cast<uint8>(length);
     return dst[0];
 }
 
 int32 PStrNullTerminate(PStr s) {
+    if (!s) return 0;
     s[s[0] == kMaxPStr ? kMaxPStr : s[0] + size_t{1}] = 0;
     return s[0];
 }
 
 int32 PStrTerminateIfPossible(PStr s) {
+    if (!s) return 0;
     if (s[0] < kMaxPStr) s[s[0] + 1] = 0;
     return s[0];
 }
@@ -114,41 +136,49 @@ int32 PStrTerminateIfPossible(PStr s) {
 // ---- comparison ----
 
 int32 PStrCmp(ConstPStr a, ConstPStr b) {
+    a = TextOf(a);
+    b = TextOf(b);
     return a == b ? 0 : CompareBytes(a + 1, a[0], b + 1, b[0]);
 }
 
 int32 PStrCaseCmp(ConstPStr a, ConstPStr b) {
+    a = TextOf(a);
+    b = TextOf(b);
     return a == b ? 0 : CompareBytesNoCase(a + 1, a[0], b + 1, b[0]);
 }
 
 bool PStrEqual(ConstPStr a, ConstPStr b) {
+    a = TextOf(a);
+    b = TextOf(b);
     return a == b || std::memcmp(a, b, a[0] == b[0] ? a[0] + size_t{1} : 1) == 0;
 }
 
 bool PStrCaseEqual(ConstPStr a, ConstPStr b) {
+    a = TextOf(a);
+    b = TextOf(b);
     return a[0] == b[0] && PStrCaseCmp(a, b) == 0;
 }
 
 int32 PPStrCmp(const ConstPStr* a, const ConstPStr* b) {
-    return PStrCmp(*a, *b);
+    return PStrCmp(Pointee(a), Pointee(b));
 }
 
 int32 PPStrCaseCmp(const ConstPStr* a, const ConstPStr* b) {
-    return PStrCaseCmp(*a, *b);
+    return PStrCaseCmp(Pointee(a), Pointee(b));
 }
 
 bool PPStrEqual(const ConstPStr* a, const ConstPStr* b) {
-    return PStrEqual(*a, *b);
+    return PStrEqual(Pointee(a), Pointee(b));
 }
 
 bool PPStrCaseEqual(const ConstPStr* a, const ConstPStr* b) {
-    return PStrCaseEqual(*a, *b);
+    return PStrCaseEqual(Pointee(a), Pointee(b));
 }
 
 // ---- searching and splitting ----
 
 int32 PStrInPStr(ConstPStr s, int32 start, ConstPStr pattern) {
-    if (start < 0 || pattern[0] == 0) return -1;
+    if (start < 0 || !s || TextOf(pattern)[0] == 0) return -1;
     for (int32 at = start; at <= s[0] - pattern[0]; ++at) {
         if (FirstDifferenceNoCase(s + 1 + at, pattern + 1, pattern[0]) == pattern[0]) return at + pattern[0];
     }
@@ -156,6 +186,8 @@ int32 PStrInPStr(ConstPStr s, int32 start, ConstPStr pattern) {
 }
 
 bool PStrEndsWith(ConstPStr s, CStr suffix) {
+    s = TextOf(s);
+    suffix = TextOf(suffix);
     const size_t length = std::strlen(suffix);
     if (length > s[0]) return false;
     const uint8* tail = s + 1 + s[0] - length;
@@ -165,6 +197,8 @@ bool PStrEndsWith(ConstPStr s, CStr suffix) {
 }
 
 bool PStrSplitAtChar(ConstPStr s, uint8 c, PStr left, PStr right) {
+    if (!left || !right) return false;
+    s = TextOf(s);
     const size_t length = s[0];
     size_t leftLength = 0;
     size_t at = 1;
@@ -184,9 +218,10 @@ bool PStrSplitAtChar(ConstPStr s, uint8 c, PStr left, PStr right) {
 }
 
 bool PStrFindReplace(PStr dst, ConstPStr src, CStr find, CStr replacement) {
+    if (!dst) return false;
     PStrBuilder result;
     bool found = false;
-    if (!ReplaceAll(src, find, replacement, result, found)) {
+    if (!ReplaceAll(TextOf(src), TextOf(find), TextOf(replacement), result, found)) {
         dst[0] = 0;
         return false;
     }

@@ -15,7 +15,8 @@
        -63 to 0     fixed: -code decimals
 
    Any other code is reported (warning) and used as exponential when positive, else as fixed. Text that does not fit is
-   cut and reported. Nothing here fails. Any thread. */
+   cut and reported. Nothing here fails: a null text is the empty text, and with any other null pointer that is not
+   spoken of there is no result (0, false, an empty text). Any thread. */
 #ifndef TESSEL_STRINGS_NUMERICTEXT_H
 #define TESSEL_STRINGS_NUMERICTEXT_H
 
@@ -73,8 +74,8 @@ TESSEL_API int64 StringToNum64(const char** cursor, int32 length, int16 typeCode
 /* Which kind of value a single, double or extended real is (kFloat...). Other types are finite. */
 TESSEL_API int32 ClassifyFloatNumber(const void* value, int16 typeCode);
 
-/* Replace the texts of a NaN ("NaN") and of an infinity ("Inf") for the whole process and return the previous ones. The
-   text is not copied. To be called while no other thread renders. */
+/* Replace the texts of a NaN ("NaN") and of an infinity ("Inf") for the whole process and return the previous ones;
+   null restores those. The text is not copied. To be called while no other thread renders. */
 TESSEL_API CStr NumSetNaNText(CStr text);
 TESSEL_API CStr NumSetInfText(CStr text);
 

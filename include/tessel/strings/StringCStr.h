@@ -1,8 +1,9 @@
 /* Zero-terminated text (CStr), characters, and the process-wide decimal point.
 
    Bytes are compared unsigned. Case is mapped a byte at a time with the tables of the active code page. Lengths and
-   indices are bytes. No destination is checked for room: it must take the result and its terminator. Text pointers may
-   not be null. All functions may be called from any thread on distinct data. */
+   indices are bytes. No destination is checked for room: it must take the result and its terminator, and may overlap
+   what is copied. A null text is the empty text; into a null destination nothing is written. All functions may be
+   called from any thread on distinct data. */
 #ifndef TESSEL_STRINGS_STRINGCSTR_H
 #define TESSEL_STRINGS_STRINGCSTR_H
 

@@ -26,7 +26,8 @@
    one. A backslash in the format is an escape (strings/StringFmtScan.h), and "\n" so written gives CR LF.
 
    A specifier that is not of this language is reported (fatal) and ends the output there. Arguments must match the
-   specifiers in number and type. All functions may be called from any thread. */
+   specifiers in number and type; of text arguments and rectangles, null prints nothing. A null format is the empty one.
+   Where the text goes to a buffer, the arguments may not lie in it. All functions may be called from any thread. */
 #ifndef TESSEL_STRINGS_STRINGFMTPRINT_H
 #define TESSEL_STRINGS_STRINGFMTPRINT_H
 
@@ -48,7 +49,7 @@ TESSEL_BEGIN_C
    is not looked at, the bytes that would be. */
 TESSEL_API int32 SPrintfv(char* dst, int32 size, const char* format, int32 formatLength, va_list args);
 
-/* Without a limit; dst is terminated. Return the length. */
+/* Without a limit; dst is terminated. Return the length, which is all that they do with a null dst. */
 TESSEL_API int32 SPrintf(char* dst, CStr format, ...);
 TESSEL_API int32 SPrintfp(char* dst, ConstPStr format, ...);
 
@@ -56,7 +57,7 @@ TESSEL_API int32 SPrintfp(char* dst, ConstPStr format, ...);
    most `size`: a result equal to size means that the text was cut. With a null dst the full length. */
 TESSEL_API int32 SNPrintf(char* dst, int32 size, CStr format, ...);
 
-/* Into a PStr of at most 255 bytes; dst must take 256. Return the length. */
+/* Into a PStr of at most 255 bytes; dst must take 256. Return the length; 0 with a null dst. */
 TESSEL_API int32 PPrintf(PStr dst, CStr format, ...);
 TESSEL_API int32 PPrintfp(PStr dst, ConstPStr format, ...);
 

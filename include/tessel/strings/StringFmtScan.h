@@ -1,6 +1,7 @@
 /* The scanners that the format language is made of.
 
-   Both read at *cursor, never at or beyond end, and move *cursor past what they took. Any thread. */
+   Both read at *cursor, never at or beyond end, and move *cursor past what they took. With null pointers they take
+   nothing. Any thread. */
 #ifndef TESSEL_STRINGS_STRINGFMTSCAN_H
 #define TESSEL_STRINGS_STRINGFMTSCAN_H
 
@@ -8,7 +9,7 @@
 
 TESSEL_BEGIN_C
 
-/* Reads one character that may be escaped, and returns it. *cursor must be before end.
+/* Reads one character that may be escaped, and returns it; 0 at the end.
      \ and one or two of 0-9 A-F   that byte          \n 10   \r 13   \t 9   \f 12   \b 8   \s space
      \ and anything else           that byte          \ at the end is itself
    Lower-case letters are not hexadecimal digits here. */

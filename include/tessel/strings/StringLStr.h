@@ -1,8 +1,9 @@
 /* Counted text (LStr), usually held in a handle.
 
-   A null LStr pointer or handle counts as the empty text wherever text is read. Bytes are compared unsigned; case is
-   mapped a byte at a time with the tables of the active code page. Texts appended may not lie in the handle appended
-   to. All functions may be called from any thread on distinct data. */
+   A null LStr, PStr, CStr or handle counts as the empty text wherever text is read; with a null destination nothing is
+   written and the length is 0. Bytes are compared unsigned; case is
+   mapped a byte at a time with the tables of the active code page. Texts appended or inserted may lie in the handle
+   that they are put into. All functions may be called from any thread on distinct data. */
 #ifndef TESSEL_STRINGS_STRINGLSTR_H
 #define TESSEL_STRINGS_STRINGLSTR_H
 
@@ -34,7 +35,7 @@ TESSEL_API int32 PLStrCaseCmp(ConstPStr a, const LStr* b);
 /* ---- into and out of the caller's buffers: all return the length
  * ----------------------------------------------------- */
 
-/* dst must take LStrSize(length) bytes. A null source gives the empty text. */
+/* dst must take LStrSize(length) bytes. */
 TESSEL_API int32 CToLStr(CStr src, LStrPtr dst);
 TESSEL_API int32 PToLStr(ConstPStr src, LStrPtr dst);
 
@@ -46,7 +47,7 @@ TESSEL_API int32 LToCStrN(const LStr* src, char* dst, uint32 size);
 TESSEL_API int32 LToCStrNUnchecked(const LStr* src, char* dst, uint32 size);
 
 /* As LToCStrN, with the length stored in *length (may be null). kEmbeddedZeroErr when a byte copied is 0, so that the
-   text would seem to end early. */
+   text would seem to end early; kArgErr for a null dst. */
 TESSEL_API MgErr LToCStrNChecked(const LStr* src, char* dst, uint32 size, int32* length);
 
 /* dst must take 256 bytes. A longer text is cut at 255 and reported. */

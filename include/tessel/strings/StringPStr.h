@@ -1,7 +1,8 @@
 /* Text with a length byte (PStr): 0 to 255 bytes. A buffer that takes any PStr is 256 bytes (Str255).
 
-   Bytes are compared unsigned; case is mapped a byte at a time with the tables of the active code page. PStr pointers
-   may not be null unless it is said. All functions may be called from any thread on distinct data. */
+   Bytes are compared unsigned; case is mapped a byte at a time with the tables of the active code page. A null text
+   is the empty text; into a null destination nothing is written, and the result is 0. All functions may be called from
+   any thread on distinct data. */
 #ifndef TESSEL_STRINGS_STRINGPSTR_H
 #define TESSEL_STRINGS_STRINGPSTR_H
 
