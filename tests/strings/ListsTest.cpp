@@ -115,6 +115,11 @@ TEST(StringCPStr, ComparesAndSearches) {
     uint8 room[9];
     StrPoundToCPStr(resource, reinterpret_cast<CPStrPtr>(room));
     EXPECT_EQ(Bytes({2, 0, 0, 0, 1, 'x', 2, 'y', 'z'}), std::string(room, room + 9));
+    ReportRecorder reports;
+    **resource = 3;  // more than there are
+    StrPoundToCPStr(resource, reinterpret_cast<CPStrPtr>(room));
+    EXPECT_EQ(2, reinterpret_cast<CPStrPtr>(room)->count);
+    EXPECT_TRUE(reports.Has(kDebugError, "String list of 3 ends after 2"));
     DSDisposeHandle(resource);
 }
 
@@ -178,6 +183,11 @@ TEST(StringCLStr, ConvertsTheByteOrder) {
         StdToCLStr(reinterpret_cast<CLStrHandle>(list));
         EXPECT_EQ(Texts{""}, reports.Texts(kDebugFatal)) << size;
     }
+    ASSERT_EQ(kNoErr, DSSetHandleFromPtr(&list, stored.data(), 12));  // one element of two
+    reports.Clear();
+    StdToCLStr(reinterpret_cast<CLStrHandle>(list));
+    EXPECT_EQ(Texts{""}, reports.Texts(kDebugFatal));
+    EXPECT_EQ(1, (*reinterpret_cast<CLStrHandle>(list))->count);
     DSDisposeHandle(list);
 
     EXPECT_EQ(nullptr, CLStrIndex(nullptr, 0));
@@ -206,7 +216,7 @@ TEST(StringLStrArray, ConvertsToAndFromAList) {
     ASSERT_EQ(kNoErr, LStrArrayToCPStrHandle(array, 1, &back));
     EXPECT_EQ(Bytes({1, 0, 0, 0, 3, 'o', 'n', 'e'}), BlockOf(back));
     EXPECT_EQ(kArgErr, LStrArrayToCPStrHandle(array, 6, &back));
-    EXPECT_EQ(kNoErr, LStrArrayToCPStrHandle(nullptr, 0, &back));
+    EXPECT_EQ(kNoErr, LStrArrayToCPStrHandle(nullptr, 3, &back));
     EXPECT_EQ(nullptr, back);
 
     ASSERT_EQ(kNoErr, CPStrPtrToLStrArray(*list, 2, &array));  // the old array is released

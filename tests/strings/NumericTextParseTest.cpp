@@ -162,6 +162,7 @@ constexpr IntegerCase kIntegerCases[] = {
     {"ffffffff", kNumInt32, 16, -1, 8},
     {"1ffffffff", kNumInt32, 16, 0x7FFFFFFF, 9},
     {"-1", kNumInt16, 16, -1, 2},
+    {"-F", kNumUInt8, 16, -15, 2},
     {"-5", kNumUInt8, 10, 0, 2},
     {"-5", kNumUInt8, 10, 0, 0, true},
     {"  42 ", kNumUInt8, 10, 42, 4},
@@ -198,6 +199,8 @@ TEST(NumericTextParse, IntegersOf64Bits) {
         {"1FFFFFFFFFFFFFFFE", kNumInt64, 16, 0x7FFFFFFFFFFFFFFF},
         {"FFFFFFFF", kNumUInt32, 16, 0xFFFFFFFF},
         {"-7", kNumInt8, 10, static_cast<uint64>(-7)},
+        {"-F", kNumUInt8, 16, static_cast<uint64>(-15)},
+        {"-1FFFF", kNumUInt16, 16, static_cast<uint64>(-0xFFFF)},
     };
     for (const auto& c : cases) {
         const char* cursor = c.text.data();

@@ -234,6 +234,19 @@ TEST(NumericTextRender, SharedExponentTakesTheSuffix) {
     EXPECT_EQ(slot, 0);
     slot = kNoSharedExponent;
     EXPECT_EQ(Text(12346.0, 102, kSize, &slot), "12.35E+3") << "as if there were no slot, and no SI prefix";
+    const struct {
+        cmplx128 value;
+        int32 unit;
+        CStr text;
+        int32 exponent;
+    } kComplex[] = {{{1500, 2500}, 0, "1.50 +2.50 i", 3},
+                    {{1500, 2.5}, 0, "1.50 +2.50E+0 i", 3},
+                    {{1.5, -2.5}, 6, "1.50 -2.50 i", 6}};
+    for (const auto& c : kComplex) {
+        slot = c.unit;
+        EXPECT_EQ(Text(c.value, 133, kSize, &slot), c.text);
+        EXPECT_EQ(slot, c.exponent) << c.text;
+    }
 }
 
 // ---- complex values and odd codes ----
@@ -244,6 +257,7 @@ TEST(NumericTextRender, ComplexValues) {
     EXPECT_EQ(Text(cmplx128{0, NAN}, -1), "0.0 +NaN i");
     EXPECT_EQ(Text(cmplx128{0, -INFINITY}, -1), "0.0 -Inf i");
     EXPECT_EQ(Text(cmplx128{3, 4}, -102), "5.00 arg 0.93");
+    EXPECT_EQ(Text(cmplx128{-0.0, 0}, -102), "0.00 arg 0.00");
     EXPECT_EQ(Text(cmplx128{3000, 0.004}, 101), "3.0k +4.0m i");
     char buffer[16];
     const int16 format = 64;
@@ -310,6 +324,9 @@ TEST(NumericTextRender, CorruptRecordsAreReported) {
                                         "bad pdr, exp fmt"}));
     Packed(record, -3);
     EXPECT_TRUE(reports.Has(4, "bad pdr, dec fmt"));
+    reports.Clear();
+    Packed({{0x1A, 0x02}, 0, 306, 2}, -3);
+    EXPECT_EQ(reports.Texts(4), std::vector<std::string>{"bad pdr, exp fmt"}) << "too large for the fixed form";
 }
 
 TEST(NumericTextRender, SpecialTextsCanBeReplaced) {

@@ -1,8 +1,10 @@
 #include <tessel/strings/StringCPStr.h>
+#include <tessel/strings/StringFmtPrint.h>
 #include <tessel/strings/ovhandle.h>
 #include <tessel/strings/ovstring.h>
 
 #include <cstring>
+#include <random>
 
 #include "strings/Support.h"
 #include "support/ReportRecorder.h"
@@ -82,10 +84,14 @@ void CheckEdits(OVSubString view, Stored stored) {
     EXPECT_EQ("0 one 2 three!one", stored());
     EXPECT_EQ(kNoErr, view.AssignCStr(" \t trimmed \r\n"));
     view.TrimWhitespace();
+    EXPECT_NE(kNoErr, view.Resize(INT32_MAX));
     EXPECT_EQ("trimmed", TextOf(view));
     EXPECT_EQ(" \t trimmed \r\n", stored());
     EXPECT_EQ(kNoErr, view.AppendPrintf(" %d", 7));
     EXPECT_EQ("trimmed 7", stored());
+    const FmtBytes own = {view.Bytes() + 7, 2};
+    EXPECT_EQ(kNoErr, view.AppendPrintf("%h%h,", &own, &own));
+    EXPECT_EQ("trimmed 7 7 7,", stored());
     EXPECT_EQ(kNoErr, view.AssignPStr(P("p")));
     EXPECT_EQ(kNoErr, view.AppendBSTR(u"\u20ACuro", 2));
     EXPECT_EQ("p\xE2\x82\xACu", stored());
@@ -131,6 +137,9 @@ TEST(OVSubString, RefusesWhatDoesNotFit) {
     OVSubString pstr = OVSubString::OnPStr(p);
     EXPECT_EQ(kNoErr, pstr.Resize(254));
     EXPECT_EQ(kArgErr, pstr.Resize(255));
+    P full(std::string(255, 'x'));
+    EXPECT_EQ(std::string(255, 'x'), TextOf(OVSubString::OnPStr(full)));
+    EXPECT_EQ(std::string(255, 'x'), full.Text());
 
     CPStrHandle list = nullptr;
     ASSERT_EQ(kNoErr, CPStrSetToNEmptyStrings(&list, 1));
@@ -212,23 +221,45 @@ TEST(OVSubString, Searches) {
     EXPECT_EQ(-1, text.SearchCStr("one", 100));
 }
 
-TEST(OVSubString, SearchReplaceResumesInsideWhatItInserted) {
-    const struct {
-        CStr text, find, replacement, result;
-        int32 count;
-    } kCases[] = {{"aaa", "a", "bb", "bbbbbb", 3}, {"aaaa", "aa", "a", "a", 3}, {"abcabc", "abc", "", "", 2},
-                  {"abc", "x", "y", "abc", 0},     {"abc", "", "y", "abc", 0},  {"aXa", "a", "aa", "aaXaa", 2}};
-    for (const auto& c : kCases) {
-        OVTempString text;
-        ASSERT_EQ(kNoErr, text.AssignCStr(c.text));
+TEST(OVSubString, SearchReplaceMayUseItsOwnText) {
+    OVString own;
+    ASSERT_EQ(kNoErr, own.Assign("XaX", 3));
+    OVSubString view(&own);
+    EXPECT_EQ(kNoErr, view.SearchReplace({view.Bytes(), 1}, {view.Bytes() + 1, 2}, nullptr));
+    EXPECT_EQ("aXaaX", TextOf(view));
+    char small[5] = "abab";
+    int32 count = -1;
+    EXPECT_EQ(kArgErr, OVSubString(5, small).SearchReplace("a", "xx", &count));
+    EXPECT_STREQ("abab", small);
+    EXPECT_EQ(0, count);
+}
+
+// Replacing one occurrence after the other, as it is described.
+TEST(OVSubString, SearchReplaceAgreesWithSingleEdits) {
+    std::mt19937 random(5);
+    const auto text = [&](size_t longest) {
+        std::string made(random() % (longest + 1), 'a');
+        for (char& c : made) c = static_cast<char>('a' + random() % 2);
+        return made;
+    };
+    for (int i = 0; i < 20000; ++i) {
+        const std::string before = text(40), find = text(4), replacement = text(4).substr(0, find.size() + 1);
+        std::string expected = before;
+        int32 found = 0;
+        size_t at = find.empty() ? std::string::npos : expected.find(find);
+        while (at != std::string::npos && found < 100) {
+            ++found;
+            expected.replace(at, find.size(), replacement);
+            const size_t behind = at + replacement.size() + 1;
+            at = expected.find(find, behind > find.size() ? behind - find.size() : 0);
+        }
+        OVTempString edited;
+        ASSERT_EQ(kNoErr, edited.AssignCStr(before.c_str()));
         int32 count = -1;
-        EXPECT_EQ(kNoErr, text.SearchReplace(c.find, c.replacement, &count));
-        EXPECT_EQ(c.result, TextOf(text));
-        EXPECT_EQ(c.count, count) << c.text;
+        ASSERT_EQ(kNoErr, edited.SearchReplace(find.c_str(), replacement.c_str(), &count));
+        ASSERT_EQ(expected, TextOf(edited)) << before << ' ' << find << ' ' << replacement;
+        ASSERT_EQ(found, count);
     }
-    char small[4] = "aba";
-    EXPECT_EQ(kArgErr, OVSubString(4, small).SearchReplace("a", "xx", nullptr));
-    EXPECT_STREQ("aba", small);
 }
 
 }  // namespace

@@ -68,7 +68,9 @@ TEST(StringCStr, CopiesAndPads) {
     EXPECT_STREQ("xy", text);
     EXPECT_EQ(5, StrCat(text, "cde"));
     EXPECT_STREQ("xycde", text);
-    StrCpy(text, "");
+    StrCpy(text, text + 1);
+    EXPECT_STREQ("ycde", text);
+    StrCpy(text, nullptr);
     EXPECT_EQ(0, StrLen(text));
 }
 

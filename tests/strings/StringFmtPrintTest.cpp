@@ -1,6 +1,8 @@
 #include <tessel/strings/StringFmtPrint.h>
 
 #include <tessel/base/NumericTypes.h>
+#include <tessel/numerics/NumericSupport.h>
+#include <tessel/strings/NumericText.h>
 #include <tessel/strings/StringCStr.h>
 
 #include <cstdio>
@@ -93,7 +95,10 @@ TEST(StringFmtPrint, PrintsNumbersOfNamedTypes) {
     EXPECT_EQ("1234 -9223372036854775808 -9223372036854775808", F("%{uW}x %{iQd %{iQ}d", &word, &large, &large));
     EXPECT_EQ("1.50|  1.5", F("%.2{fS}f|%5.1{fS}f", &single, &single));
     EXPECT_EQ("1.5 -2.0 i", F("%.1{cD}f", &complex));
-    EXPECT_EQ("-1 1.5", F("%{*}d %.1{*}f", kNumInt8, &small, kNumSingle, &single));
+    EXPECT_EQ("-1 1.5", F("%{*}d %.1{*}f", kNumInt8 + 16, &small, kNumSingle, &single));  // the low four bits count
+    const uint8 size = SetFxSize(16);  // the library's own values stay as large as they are
+    EXPECT_EQ("1.5 1.5 -2.0 i", F("%.1{fS}f %.1{cD}f", &single, &complex));
+    SetFxSize(size);
 }
 
 TEST(StringFmtPrint, TakesPositionalParameters) {
@@ -250,6 +255,33 @@ TEST(StringFmtPrint, FillsPStrsAndHandles) {
     EXPECT_EQ(kNoErr, LStrPrintf(text, ""));
     EXPECT_EQ(4u, text.Size());
     EXPECT_EQ(kArgErr, LStrPrintf(nullptr, "x"));
+
+    const std::string long300(300, 'n');
+    CStr nan = NumSetNaNText(long300.c_str());
+    ReportRecorder reports;
+    EXPECT_EQ(long300.substr(45), F("%f", static_cast<double>(NAN)));
+    EXPECT_TRUE(reports.Has(kDebugFatal, "buffer overflow"));
+    NumSetNaNText(nan);
+}
+
+std::string g_growing;
+
+TEST(StringFmtPrint, PrintsATextIntoItself) {
+    L text("abc");
+    EXPECT_EQ(kNoErr, LStrPrintf(text, "<%H>", LStrHandle(text)));
+    EXPECT_EQ("<abc>", text.Text());
+    EXPECT_EQ(kNoErr, LStrPrintf(text, "%-600H|%P", LStrHandle(text), *text));  // too long to be kept aside at first
+    EXPECT_EQ("<abc>" + std::string(595, ' ') + "|<abc>", text.Text());
+
+    // A text that grows between the measuring and the writing of a long one: when it is reported what is wrong in
+    // between.
+    g_growing.reserve(10);
+    g_growing = "x";
+    const auto grow = [](CStr, int32, CStr, int32, uint32, CStr) { g_growing += "x"; };
+    const auto before = DebugOutputSetHandler(grow);
+    EXPECT_EQ(kGenericErr, LStrPrintf(text, "%600d%s%y", 1, g_growing.c_str()));
+    DebugOutputSetHandler(before);
+    EXPECT_EQ(606u, text.Text().size());
 }
 
 TEST(StringFmtPrint, StartsWithTheProcessWideDecimalPoint) {

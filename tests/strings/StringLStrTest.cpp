@@ -22,6 +22,7 @@ TEST(StringLStr, ComparesWithNullAsEmpty) {
                   {nullptr, nullptr, 0, 0},
                   {nullptr, "a", -1, -1},
                   {"abc", nullptr, 1, 1},
+                  {nullptr, "abc", -1, -1},
                   {"ab", "abc", -1, -1},
                   {"abcde", "ab", 3, 3},
                   {"ABC", "abd", 'A' - 'a', -1},
@@ -40,9 +41,11 @@ TEST(StringLStr, ComparesWithNullAsEmpty) {
         EXPECT_EQ(c.exact, LStrCmp(c.a ? a : nullptr, c.b ? b : nullptr)) << (c.a ? c.a : "null");
         EXPECT_EQ(c.noCase, LStrCaseCmp(c.a ? a : nullptr, c.b ? b : nullptr)) << (c.a ? c.a : "null");
         EXPECT_EQ(c.exact == 0, LStrEqual(c.a ? a : nullptr, c.b ? b : nullptr));
+        const uint8* aBytes = c.a ? a->bytes : nullptr;
+        const uint8* bBytes = c.b ? b->bytes : nullptr;
+        EXPECT_EQ(c.exact, PtrLenStrCmp(aBytes, a->count, bBytes, b->count));
+        EXPECT_EQ(c.noCase, PtrLenStrCaseCmp(aBytes, a->count, bBytes, b->count));
         if (!c.a || !c.b) continue;
-        EXPECT_EQ(c.exact, PtrLenStrCmp(a->bytes, a->count, b->bytes, b->count));
-        EXPECT_EQ(c.noCase, PtrLenStrCaseCmp(a->bytes, a->count, b->bytes, b->count));
         P pa(c.a);
         P pb(c.b);
         ConstPStr aText = pa;

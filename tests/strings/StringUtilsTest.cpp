@@ -70,6 +70,7 @@ TEST(StringUtils, HasFormsThatDoNotThrow) {
     EXPECT_EQ(kArgErr, AppendNoThrow(static_cast<std::string*>(nullptr), "x"));
 
     LStrArrayHandle array = nullptr;
+    EXPECT_EQ(kNoErr, ToLStrArrayHandleNoThrow({"replaced", "and disposed of"}, &array));
     EXPECT_EQ(kNoErr, ToLStrArrayHandleNoThrow({"one", "", "three"}, &array));
     ASSERT_EQ(3, (*array)->elementCount);
     EXPECT_EQ("three", test::TextOf(*(*array)->element[2]));
