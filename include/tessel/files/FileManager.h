@@ -99,8 +99,10 @@ TESSEL_BEGIN_C
 /* ---- open files ---------------------------------------------------------------------------------------------------
    A null file gives kArgErr everywhere. A file has one position; callers that share it must take turns. */
 
-/* Opens an existing file. A file that someone else holds is tried again twice, 50 ms apart, before kFileInUseErr.
-   kArgErr: an unknown mode, a volume, or a path that is not absolute. *file is null on failure. Close with FMClose. */
+/* Opens an existing file, without waiting for what is no file: a folder, a pipe or a socket is refused at once
+   (kPermissionErr, or kIOErr from the system). A file that someone else holds is tried again twice, 50 ms apart, before
+   kFileInUseErr. kArgErr: an unknown mode, a volume, or a path that is not absolute. *file is null on failure. Close
+   with FMClose. */
 TESSEL_API MgErr FMOpen(File_t** file, Path path, int32 openMode, int32 denyMode);
 TESSEL_API MgErr FMClose(File_t* file);
 
