@@ -3,9 +3,11 @@
    Sections: open files · position and size · formatted writing · errors · creating, copying, moving, removing ·
    queries and changes · volumes · names and locations · names of the host system.
 
-   Every path must be absolute; a relative or null one gives kArgErr unless a function says otherwise. Failures of the
-   system come back as Win32ToOVFileErr maps them. Functions that change a file drop what the path has cached about it.
-   Any thread; no lock is held except where noted. */
+   Every path must be absolute; a relative or null one gives kArgErr unless a function says otherwise. The name of an
+   item, drive and folders included, has at most 259 bytes; a longer one gives kArgErr. Shortcuts (.lnk) along a path
+   are followed where they are named with their extension. Failures of the system come back as Win32ToOVFileErr maps
+   them. Functions that change a file drop what the path has cached about it. Any thread; no lock is held except where
+   noted. */
 #ifndef TESSEL_FILES_FILEMANAGER_H
 #define TESSEL_FILES_FILEMANAGER_H
 
