@@ -274,6 +274,14 @@ int Append(const Words& words) {
     return 0;
 }
 
+// Whether as many strings as the list counts lie in it.
+MgErr CheckStringList(const OpenRsrc& file, const Entry& entry) {
+    if (entry.bytes.size() < 2) return kEOFErr;
+    const auto count = static_cast<uint8>(entry.bytes[0]) << 8 | static_cast<uint8>(entry.bytes[1]);
+    ConstPStr last = nullptr;
+    return count ? RGetIndStringPtr(file.get(), &last, entry.id, count, entry.type) : kNoErr;
+}
+
 int CheckFile(const Words& words) {
     const std::string name = Arguments(words, {}, {}).Expect({"FILE"})[0];
     const OpenRsrc file(name, kROpenReadOnly);
@@ -288,6 +296,11 @@ int CheckFile(const Words& words) {
             return;
         }
         const Entry entry = Describe(data, name);
+        const MgErr listErr = type == kStringListType ? CheckStringList(file, entry) : kNoErr;
+        if (listErr) {
+            std::fprintf(stderr, "tessel: %s %d: %s (%d)\n", place.c_str(), entry.id, MgErrMeaning(listErr), listErr);
+            ++damaged;
+        }
         const auto last = lastID.find(type);
         if (last != lastID.end() && last->second == entry.id) {
             std::fprintf(stderr, "tessel: %s %d: %s (%d)\n", place.c_str(), entry.id, MgErrMeaning(kResIDExistsErr),

@@ -62,10 +62,9 @@ Path FResolvePath(Path out, Path path) {
     return GuardedOr<Path>(nullptr, [&]() -> Path {
         if (!path) return nullptr;
         if (FDepth(path) == 0) return FEmptyPath(out);
-        char name[kPlatformNameSize];
-        if (MakeDOSPathName(path, name, 0)) return nullptr;
-        Win32ResolveAllShortCuts(name);
-        return NameToPath(name, &out) ? nullptr : out;
+        PlatformName name;
+        if (name.Make(path, true)) return nullptr;
+        return NameToPath(name.Text(), &out) ? nullptr : out;
     });
 }
 

@@ -8,6 +8,7 @@
 #include <tessel/strings/StringPStr.h>
 
 #include <algorithm>
+#include <cstddef>
 #include <cstring>
 #include <limits>
 #include <string>
@@ -66,8 +67,21 @@ struct NamedEntry {
 };
 using NamedEntries = std::vector<NamedEntry, TrackedAllocator<NamedEntry>>;
 
+// Whether the handle holds as many names as the list says.
+bool NamesLieInside(CPStrHandle names) {
+    const UHandle bytes = reinterpret_cast<UHandle>(names);
+    const uint64 size = DSGetHandleSize(bytes);
+    uint64 at = offsetof(CPStr, bytes);
+    if (size < at || (*names)->count < 0) return false;
+    for (int32 left = (*names)->count; left > 0; --left) {
+        if (at >= size) return false;
+        at += (*bytes)[at] + 1u;
+    }
+    return at <= size;
+}
+
 NamedEntries TakeApart(CPStrPtr names, const VolKindRec* entries) {
-    NamedEntries all(static_cast<size_t>(std::max<int32>(names->count, 0)));
+    NamedEntries all(static_cast<size_t>(names->count));
     const uint8* next = names->bytes;
     for (size_t i = 0; i < all.size(); ++i) {
         std::memcpy(all[i].name, next, next[0] + 1u);
@@ -153,9 +167,11 @@ MgErr FMGetVolPath(Path path, Path* volume) {
 MgErr LSort(CPStrHandle names, UHandle entries) {
     if (!names) return kArgErr;
     return Guarded([&]() -> MgErr {
+        if (!NamesLieInside(names)) return kArgErr;
+        const auto count = static_cast<uint64>((*names)->count);
+        if (entries && DSGetHandleSize(entries) < count * sizeof(VolKindRec)) return kArgErr;
         auto* records = entries ? reinterpret_cast<VolKindRec*>(*entries) : nullptr;
         NamedEntries all = TakeApart(*names, records);
-        if (records && DSGetHandleSize(entries) < all.size() * sizeof(VolKindRec)) return kArgErr;
         std::stable_sort(all.begin(), all.end(),
                          [](const NamedEntry& a, const NamedEntry& b) { return PStrCaseCmp(a.name, b.name) < 0; });
         PutTogether(all, *names, records);

@@ -55,6 +55,10 @@ bool FileSize(FileHandle file, std::int64_t& size);
 /* Cuts or extends (with zero bytes); the position stays. */
 bool FileSetSize(FileHandle file, std::int64_t size);
 
+/* Makes the file `size` bytes long at least, with room on the device for all of them. Its size stays as it is on
+   failure, and where the file system cannot promise room. */
+bool FileReserve(FileHandle file, std::int64_t size);
+
 /* Puts what was written onto the device. */
 bool FileFlush(FileHandle file);
 

@@ -22,8 +22,8 @@ struct ItemInfo {
     std::int64_t created, accessed, modified; /* 100 ns since 1601-01-01 00:00:00 UTC */
 };
 
-/* Follows the host's symbolic links; one that leads nowhere is described itself. 2, or 3 when a folder on the way is
-   missing. */
+/* Follows the host's symbolic links; one whose end cannot be reached is described itself. 2, or 3 when a folder on the
+   way is missing. */
 bool ItemGetInfo(const char* name, ItemInfo& info);
 bool FileGetInfo(FileHandle file, ItemInfo& info);
 

@@ -2,6 +2,8 @@
 
 #include <tessel/diagnostics/DebugStream.h>
 
+#include "resources/ResFileLock.h"
+
 namespace tessel {
 
 namespace {
@@ -54,7 +56,7 @@ private:
 class NullResource final : public Resource {
 public:
     MgErr RRelease() override {
-        TESSEL_REPORT(kDebugWarning, 0x3AC86D14u) << "Releasing a non-resource";
+        ReportUnlocked([] { TESSEL_REPORT(kDebugWarning, 0x3AC86D14u) << "Releasing a non-resource"; });
         return kResNotFoundErr;
     }
     MgErr RChanged() override { return kResNotFoundErr; }

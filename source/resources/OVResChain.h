@@ -12,21 +12,29 @@
 
 namespace tessel {
 
-// The first result that is not kResNotFoundErr counts. The files are the chain's only if it `owns` them.
+// The first result that is not kResNotFoundErr counts. The files are the chain's only if it `owns` them. A file that is
+// closed leaves every chain.
 class OVResChain final : public ResChain, public TrackedObject {
 public:
     using Files = std::vector<ResFile*, TrackedAllocator<ResFile*>>;
 
-    OVResChain(Files files, bool owns) : fFiles(std::move(files)), fOwns(owns) {}
+    OVResChain(Files files, bool owns);
+    ~OVResChain() override;
+    OVResChain(const OVResChain&) = delete;
+    OVResChain& operator=(const OVResChain&) = delete;
+
+    // Takes a file out of all chains. The lock is held.
+    static void Forget(const ResChain* file);
 
     MgErr RCloseFile() override {
         ResFileLock lock;
-        for (ResFile* file : fFiles) {
+        Files files;
+        files.swap(fFiles);
+        for (ResFile* file : files) {
             if (!fOwns) break;
             file->RCloseFile();
             delete file;
         }
-        fFiles.clear();
         return kNoErr;
     }
     MgErr RGet(ResType type, int32 id, Resource** resource) override {
@@ -65,6 +73,8 @@ private:
         return kResNotFoundErr;
     }
 
+    static OVResChain* gFirst;  // of all chains
+    OVResChain* fNext;
     Files fFiles;
     bool fOwns;
 };

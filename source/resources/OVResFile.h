@@ -105,7 +105,7 @@ private:
     class Updating;  // an update
 
     // opening and closing
-    MgErr OpenSource();
+    MgErr OpenSource(bool sorts);
     MgErr ReadMap(const RsrcHeader& header, uint64 base);
     void Dispose();
 
@@ -125,7 +125,7 @@ private:
     bool IsReadOnly() const { return (fMap.Head()->fileAttrs & kRFileReadOnly) != 0; }
 
     MgErr AddHandle(UHandle data, ResType type, int32 id, ConstPStr name);
-    MgErr ReplaceWith(UHandle copy, ResType type, RsrcList* entry);
+    MgErr ReplaceWith(const void* bytes, uint32 size, ResType type, RsrcList* entry);
     OVResource* OwnResource(Resource* resource) const;
 
     // what the resources ask their file

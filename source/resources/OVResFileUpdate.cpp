@@ -100,8 +100,10 @@ private:
         Positions positions;
         map_.CollectEntries(&positions);
         if (static_cast<int64>(positions.size()) != map_.ReferenceCount()) {
-            TESSEL_REPORT(kDebugError, 0x5CE02A97u)
-                << "OVResFile::RUpdateFile. Resource map rsrc count wrong. Possible memory corruption.";
+            ReportUnlocked([] {
+                TESSEL_REPORT(kDebugError, 0x5CE02A97u)
+                    << "OVResFile::RUpdateFile. Resource map rsrc count wrong. Possible memory corruption.";
+            });
             return kArgErr;
         }
         entries_.reserve(positions.size());
@@ -264,7 +266,7 @@ MgErr OVResFile::UpdateMap(uint64 dataLength) {
     // The map is converted in a copy: the one in memory keeps its numbers and its loaded resources.
     Block bytes(fMap.Size());
     if (!bytes.get()) {
-        TESSEL_REPORT(kDebugError, 0x174DB8E3u) << "Could not allocate temp handle storage.";
+        ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x174DB8E3u) << "Could not allocate temp handle storage."; });
         return kMemFullErr;
     }
     fMap.SetLayout(static_cast<uint32>(dataLength));
@@ -301,7 +303,8 @@ MgErr OVResFile::MeasureLoaded(const Positions& positions, uint64* dataLength) c
     return kNoErr;
 }
 
-// A file made in memory takes on the places that its data have in the image; one that has a source keeps its own.
+// A file made in memory takes on the places that its data have in the image, but its resources stay unwritten: there is
+// nothing to load them from. A file that has a source keeps its own map.
 MgErr OVResFile::BuildImage(UHandle* image) {
     Positions positions;
     fMap.CollectEntries(&positions);
@@ -317,9 +320,6 @@ MgErr OVResFile::BuildImage(UHandle* image) {
     *image = DSNewHandle(static_cast<uint32>(size));
     if (!*image) return kMemFullErr;
     LayOut(fIO ? &copy : &fMap, positions, static_cast<uint32>(dataLength), **image);
-    for (OVResource* resource : fLoaded) {
-        if (!fIO && resource) resource->fUnwritten = false;
-    }
     return kNoErr;
 }
 

@@ -10,6 +10,9 @@
 #include <cstring>
 #include <limits>
 
+#include "files/FileSupport.h"
+#include "resources/ResFileLock.h"
+
 namespace tessel {
 
 namespace {
@@ -68,12 +71,12 @@ void OVResfileIO::UseMemory(const void* data, uint32 size) {
 MgErr OVResfileIO::Prepare() {
     if (fFromCacheHook) return kNoErr;
     if (InMemory() && fFile) {
-        TESSEL_REPORT(kDebugError, 0x2E57A1D3u) << "Cannot memory map the resource file";
+        ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x2E57A1D3u) << "Cannot memory map the resource file"; });
         return kArgErr;
     }
     if (!fFile) return kNoErr;
     if (const MgErr err = FMSeek64(fFile, 0, kFSeekStart)) {
-        TESSEL_REPORT(kDebugError, 0x60C3F85Bu) << "cannot seek to start of resource file";
+        ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x60C3F85Bu) << "cannot seek to start of resource file"; });
         return err;
     }
     uint64 size = 0;
@@ -178,7 +181,13 @@ MgErr OVResfileIO::SetSize(uint32 size) {
 }
 
 MgErr OVResfileIO::Reserve(uint32 size) {
-    return fHandle && size > fLength ? SetSize(size) : kNoErr;
+    uint64 end = 0;
+    if (const MgErr err = Size(&end)) return err;
+    if (size <= end) return kNoErr;
+    if (fHandle) return SetSize(size);
+    fPosition = kUnknownPosition;
+    fAheadLength = 0;
+    return platform::FileReserve(HandleOf(fFile), static_cast<int64>(size)) ? kNoErr : Win32ToOVFileErr();
 }
 
 MgErr OVResfileIO::Extend(uint32 count) {

@@ -33,7 +33,7 @@ public:
     MgErr Write(uint64 position, const void* data, uint32 count);
     MgErr Size(uint64* size);
     MgErr SetSize(uint32 size);
-    // Makes room for `size` bytes in a memory handle; nothing for a file on disk.
+    // Makes room for `size` bytes, so that writing them cannot fail for lack of it. Nothing changes on failure.
     MgErr Reserve(uint32 size);
     // Appends `count` zero bytes. Nothing stays of them on failure.
     MgErr Extend(uint32 count);

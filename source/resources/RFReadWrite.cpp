@@ -77,7 +77,7 @@ MgErr FindPath(Bytes* list, int32 index) {
     for (int32 k = 1;; ++k) {
         if (list->size < 8) return kEOFErr;
         if (std::memcmp(list->data, kPathTag, sizeof kPathTag) != 0) {
-            TESSEL_REPORT(kDebugWarning, 0x4981AE5Cu) << "This doesn't contain a path resource";
+            ReportUnlocked([] { TESSEL_REPORT(kDebugWarning, 0x4981AE5Cu) << "This doesn't contain a path resource"; });
             return kResNotFoundErr;
         }
         const uint64 length = uint64{8} + Big32(list->data + 4);
@@ -94,6 +94,14 @@ MgErr ReadPath(const Bytes& flattened, Path* path) {
     if (flattened.size > INT32_MAX) return kCorruptErr;
     const auto length = static_cast<int32>(flattened.size);
     return FUnFlattenPath2(flattened.data, path, length) > length ? kCorruptErr : kNoErr;
+}
+
+// All bytes of a resource.
+MgErr FindBytes(RFReader& reader, ResType type, int32 id, Bytes* bytes) {
+    uint32 size = 0;
+    const MgErr err = reader.PtrToResDataInternal(type, id, &bytes->data, &size);
+    bytes->size = size;
+    return err;
 }
 
 MgErr AssignText(const Bytes& text, std::string* out) {
@@ -378,45 +386,43 @@ RFReadWrite* CreateRFReadWrite() {
 
 MgErr RGetStringStd(RsrcFile refnum, std::string* text, int32 id) {
     if (!text) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return ReadLocked(refnum, [&](RFReader& reader) -> MgErr {
         Str255 string;
-        if (const MgErr err = RFReader(refnum).GetPStr(id, string)) return err;
+        if (const MgErr err = reader.GetPStr(id, string)) return err;
         return AssignText({string + 1, string[0]}, text);
     });
 }
 
 MgErr RGetIndexStringStd(RsrcFile refnum, std::string* text, int32 id, int32 index) {
     if (!text) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return ReadLocked(refnum, [&](RFReader& reader) -> MgErr {
         Str255 string;
-        if (const MgErr err = RFReader(refnum).GetIndString(string, id, index)) return err;
+        if (const MgErr err = reader.GetIndString(string, id, index)) return err;
         return AssignText({string + 1, string[0]}, text);
     });
 }
 
 MgErr RGetIndexLongStringStd(RsrcFile refnum, std::string* text, int32 id, int32 index, ResType type) {
     if (!text) return kArgErr;
-    LStrHandle string = nullptr;
-    if (const MgErr err = RFReader(refnum).GetIndLString(&string, id, index, type)) return err;
-    const MgErr err = Guarded([&] {
-        return AssignText({(*string)->bytes, static_cast<uint64>((*string)->count)}, text);
+    return ReadLocked(refnum, [&](RFReader& reader) -> MgErr {
+        Bytes list;
+        if (const MgErr err = FindBytes(reader, type, id, &list)) return err;
+        if (const MgErr err = FindLongString(&list, index)) return err;
+        return AssignText(list, text);
     });
-    DSDisposeHandle(reinterpret_cast<UHandle>(string));
-    return err;
 }
 
 MgErr RGetLongStringStd(RsrcFile refnum, std::string* text, int32 id) {
     if (!text) return kArgErr;
-    return Guarded([&]() -> MgErr {
-        ResFileLock lock;
-        const uint8* data = nullptr;
-        uint32 size = 0;
-        if (const MgErr err = RFReader(refnum).PtrToResDataInternal(kStringType, id, &data, &size)) return err;
+    return ReadLocked(refnum, [&](RFReader& reader) -> MgErr {
+        Bytes data;
+        if (const MgErr err = FindBytes(reader, kStringType, id, &data)) return err;
         int32 count = 0;
-        if (size < sizeof count) return kEOFErr;
-        std::memcpy(&count, data, sizeof count);
-        if (count < 0 || static_cast<uint32>(count) > size - sizeof count) return kEOFErr;
-        return AssignText({data + sizeof count, static_cast<uint64>(count)}, text);
+        if (data.size < sizeof count) return kEOFErr;
+        std::memcpy(&count, data.data, sizeof count);
+        data.Skip(sizeof count);
+        if (count < 0 || static_cast<uint64>(count) > data.size) return kEOFErr;
+        return AssignText({data.data, static_cast<uint64>(count)}, text);
     });
 }
 

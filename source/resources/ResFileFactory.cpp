@@ -86,6 +86,7 @@ MgErr ResFileFactory::InitResourceMgr() {
 }
 
 MgErr ResFileFactory::UninitResourceMgr() {
+    OwnedHandles::Free();
     ResFileLock::Destroy();
     return kNoErr;
 }
@@ -109,7 +110,6 @@ MgErr ResFileFactory::RGetFileType(Path path, _FMFileType* type, _FMFileCreator*
 }
 
 MgErr ResFileFactory::RSetFileType(Path path, _FMFileType type, _FMFileCreator creator) {
-    ResFileLock lock;
     OVResfileIO io;
     if (const MgErr err = io.OpenPath(path, false, kFDenyWrite)) return err;
     const MgErr err = SetTypeIn(io, type, creator);
@@ -221,7 +221,6 @@ using namespace tessel;
 MgErr RGetFileHeader(Path path, RFileHeader* out) {
     if (!out) return kArgErr;
     *out = {};
-    ResFileLock lock;
     OVResfileIO io;
     if (const MgErr err = io.OpenPath(path, true, kFDenyNone)) return err;
     RsrcHeader header;

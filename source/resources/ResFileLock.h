@@ -8,7 +8,7 @@ namespace tessel {
 
 // Holds the lock for a scope. A thread that holds it already may take it again, so that an operation can be made of
 // others. Guards the files with their maps and lookup caches, the handle cache, and the counter of unique IDs. The
-// path, memory and cookie locks may be taken inside.
+// path, memory and cookie locks may be taken inside. The host is not called inside: see ReportUnlocked.
 class ResFileLock {
 public:
     ResFileLock();
@@ -19,6 +19,10 @@ public:
     static MgErr Create();
     static void Destroy();
 };
+
+// Runs `report`, which makes a report: at once, or when this thread holds the lock, as soon as it has let go. What is
+// reported several times until then is reported once.
+void ReportUnlocked(void (*report)());
 
 }  // namespace tessel
 

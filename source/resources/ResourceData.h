@@ -23,21 +23,30 @@ public:
     virtual bool ContainsHandle(UHandle handle) const = 0;
 };
 
-// Owns a handle.
+// The handles that are the data of resources, so that none becomes the data of two. The lock is held.
+class OwnedHandles {
+public:
+    // kArgErr: it is one already. kMemFullErr.
+    static MgErr Add(UHandle handle);
+    static void Remove(UHandle handle);
+    static void Free();
+};
+
+// Owns a handle, once it has adopted one.
 class DSHandleResource final : public ResourceData {
 public:
-    explicit DSHandleResource(UHandle handle) : fHandle(handle) {}
     ~DSHandleResource() override;
 
-    void Adopt(UHandle handle) { fHandle = handle; }
-    void DetachHandle() override { fHandle = nullptr; }
+    // On failure the handle stays the caller's.
+    MgErr Adopt(UHandle handle);
+    void DetachHandle() override;
     uint32 GetSize() const override;
     const uint8* GetData() const override { return fHandle ? *fHandle : nullptr; }
     UHandle GetSharedDSHandle() override { return fHandle; }
     bool ContainsHandle(UHandle handle) const override { return handle && handle == fHandle; }
 
 private:
-    UHandle fHandle;
+    UHandle fHandle = nullptr;
 };
 
 // Points into memory of its file, and copies it into a handle when one is asked for.

@@ -12,6 +12,7 @@
 
 #include "diagnostics/Guarded.h"
 #include "resources/NullObjects.h"
+#include "resources/OVResChain.h"
 #include "resources/Refnums.h"
 #include "resources/ResFileLock.h"
 #include "resources/Service.h"
@@ -137,12 +138,12 @@ MgErr ShareHandle(Resource* resource, UHandle* data) {
     return kNoErr;
 }
 
-// Runs `open`, which makes a file, and gives the file a refnum.
+// Runs `open`, which makes a file, and gives the file a refnum. The lock is not held meanwhile: the host's file system
+// may take its time.
 template <class Open>
 MgErr OpenWithRefnum(RsrcFile* refnum, Open open) {
     if (!refnum) return kArgErr;
     *refnum = 0;
-    ResFileLock lock;
     ResFile* file = nullptr;
     if (const MgErr err = open(&file)) return err;
     *refnum = NewRefnum(Kind::kFile, file);
@@ -178,6 +179,7 @@ void EmptyHandleCache() {
 }
 
 void ForgetRefnumsOf(const ResChain* chain) {
+    OVResChain::Forget(chain);
     if (!gResFileMap) return;
     gResFileMap->ForEach([&](RsrcFile refnum, const ResClassStorage* storage) {
         if (storage->chain == chain) gResFileMap->Remove(refnum);
@@ -432,15 +434,15 @@ MgErr RSize(UHandle data, uint32* size) {
 // ---- strings and paths ----------------------------------------------------------------------------------------------
 
 MgErr RGetString(RsrcFile refnum, int32 id, UHandle* data) {
-    return Guarded([&] { return RFReader(refnum).GetString(id, data); });
+    return ReadLocked(refnum, [&](RFReader& reader) { return reader.GetString(id, data); });
 }
 
 MgErr RGetPStr(RsrcFile refnum, int32 id, PStr string) {
-    return Guarded([&] { return RFReader(refnum).GetPStr(id, string); });
+    return ReadLocked(refnum, [&](RFReader& reader) { return reader.GetPStr(id, string); });
 }
 
 MgErr RGetIndString(RsrcFile refnum, PStr string, int32 id, int32 index) {
-    return Guarded([&] { return RFReader(refnum).GetIndString(string, id, index); });
+    return ReadLocked(refnum, [&](RFReader& reader) { return reader.GetIndString(string, id, index); });
 }
 
 MgErr RGetIndStringPtr(RsrcFile refnum, ConstPStr* string, int32 id, int32 index, ResType type) {
@@ -449,15 +451,15 @@ MgErr RGetIndStringPtr(RsrcFile refnum, ConstPStr* string, int32 id, int32 index
 }
 
 MgErr RGetIndLString(RsrcFile refnum, LStrHandle* string, int32 id, int32 index, ResType type) {
-    return Guarded([&] { return RFReader(refnum).GetIndLString(string, id, index, type); });
+    return ReadLocked(refnum, [&](RFReader& reader) { return reader.GetIndLString(string, id, index, type); });
 }
 
 MgErr RGetPath(RsrcFile refnum, ResType type, int32 id, Path* path) {
-    return Guarded([&] { return RFReader(refnum).GetPath(type, id, path); });
+    return ReadLocked(refnum, [&](RFReader& reader) { return reader.GetPath(type, id, path); });
 }
 
 MgErr RGetIndPath(RsrcFile refnum, Path* path, int32 id, int32 index) {
-    return Guarded([&] { return RFReader(refnum).GetIndPath(path, id, index); });
+    return ReadLocked(refnum, [&](RFReader& reader) { return reader.GetIndPath(path, id, index); });
 }
 
 // ---- chains ---------------------------------------------------------------------------------------------------------
@@ -471,14 +473,16 @@ MgErr RChain(RsrcFile* refnum, int32 count, const RsrcFile* files) {
         std::vector<ResFile*, TrackedAllocator<ResFile*>> open;
         for (int32 i = 0; i < count; ++i) {
             ResFile* file = RsrcFileToRMapResFile(files[i]);
-            if (file == NULLResFile())
-                TESSEL_REPORT(kDebugWarning, 0x52E9D7C4u) << "RChain called with RsrcFile that is not in map.";
-            else
-                open.push_back(file);
+            if (file == NULLResFile()) {
+                ReportUnlocked([] {
+                    TESSEL_REPORT(kDebugWarning, 0x52E9D7C4u) << "RChain called with RsrcFile that is not in map.";
+                });
+                return kNotResFileErr;
+            }
+            open.push_back(file);
         }
         ResChain* chain = nullptr;
-        if (const MgErr err = ResFileFactory::RChain(&chain, static_cast<int32>(open.size()), open.data(), false))
-            return err;
+        if (const MgErr err = ResFileFactory::RChain(&chain, count, open.data(), false)) return err;
         *refnum = NewRefnum(Kind::kChain, chain);
         if (!*refnum) delete chain;
         return *refnum ? kNoErr : kMemFullErr;

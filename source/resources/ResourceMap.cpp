@@ -1,6 +1,7 @@
 #include "resources/ResourceMap.h"
 
 #include <tessel/memory/MemoryManager.h>
+#include <tessel/resources/ResourceManager.h>
 
 #include <algorithm>
 #include <cstring>
@@ -15,7 +16,7 @@ uint32 NameSize(ConstPStr name) {
 }
 
 RsrcList NewEntry(int32 id, int32 name) {
-    return {id, name, 0x02, 0, 0};
+    return {id, name, kRChangedAttr, 0, 0};
 }
 
 bool LessID(const RsrcList& a, const RsrcList& b) {

@@ -11,6 +11,7 @@
 #include <new>
 
 #include "diagnostics/Guarded.h"
+#include "resources/OVResChain.h"
 #include "resources/OVResFile.h"
 #include "resources/Refnums.h"
 #include "resources/ResFileLock.h"
@@ -73,14 +74,17 @@ void ResCache::Set(const OVResource* resource, ResType type, uint32 position) {
 
 bool ResCache::FindRL(const OVResource* resource, const ResourceMap& map, ResType* type, RsrcList** entry) const {
     if (!type || !entry) {
-        TESSEL_REPORT(kDebugError, 0x4D2B86F1u) << "ResCache::FindRL, outType or outRLEntry are NULL";
+        ReportUnlocked(
+            [] { TESSEL_REPORT(kDebugError, 0x4D2B86F1u) << "ResCache::FindRL, outType or outRLEntry are NULL"; });
         return false;
     }
     if (fPosition == kNothing || fResource != resource) return false;
     *type = fType;
     *entry = map.EntryAt(fPosition);
     if ((*entry)->loaded == 0)
-        TESSEL_REPORT(kDebugError, 0x7A90C35Eu) << "ResCache::FindRL, Error in cache logic. Hit on stale entry.";
+        ReportUnlocked([] {
+            TESSEL_REPORT(kDebugError, 0x7A90C35Eu) << "ResCache::FindRL, Error in cache logic. Hit on stale entry.";
+        });
     return true;
 }
 
@@ -88,19 +92,26 @@ bool ResCache::FindRL(const OVResource* resource, const ResourceMap& map, ResTyp
 
 OVResFile::~OVResFile() {
     ResFileLock lock;
+    const bool lost = fOpen && fIO && fIO->CanWrite() && (fMap.Head()->fileAttrs & kRFileChanged);
+    if (lost) {
+        ReportUnlocked([] {
+            TESSEL_REPORT(kDebugError, 0x3D94B7E6u) << "A resource file goes with changes that are not written!";
+        });
+    }
     Dispose();
 }
 
 MgErr OVResFile::Open(OVResfileIO* io, _FMFileType* type, _FMFileCreator* creator) {
+    const bool sorts = !MGGetIsRunTime(nullptr);  // asks the host, so without the lock
     ResFileLock lock;
     if (!io) {
-        TESSEL_REPORT(kDebugError, 0x15E8B64Cu) << "fileIO object is NULL";
+        ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x15E8B64Cu) << "fileIO object is NULL"; });
         return kArgErr;
     }
     std::unique_ptr<OVResfileIO> source(io);
     if (fOpen) return kGenericErr;
     fIO = std::move(source);
-    if (const MgErr err = Guarded([&] { return OpenSource(); })) {
+    if (const MgErr err = Guarded([&] { return OpenSource(sorts); })) {
         Dispose();
         return err;
     }
@@ -110,7 +121,7 @@ MgErr OVResFile::Open(OVResfileIO* io, _FMFileType* type, _FMFileCreator* creato
     return kNoErr;
 }
 
-MgErr OVResFile::OpenSource() {
+MgErr OVResFile::OpenSource(bool sorts) {
     if (const MgErr err = fIO->Prepare()) return err;
     RsrcHeader header;
     if (const MgErr err = ReadRsrcHeader(*fIO, &header, &fBase)) return err;
@@ -118,7 +129,7 @@ MgErr OVResFile::OpenSource() {
     RsrcMap* head = fMap.Head();
     head->fileAttrs = fIO->IsReadOnly() ? kRFileReadOnly : 0;
     if (head->header.version == kOldestRsrcVersion) std::memcpy(head->header.eol, kRsrcEol, sizeof kRsrcEol);
-    if (!MGGetIsRunTime(nullptr)) fMap.Sort();
+    if (sorts) fMap.Sort();
     head->header.version = kRsrcVersion;
     return kNoErr;
 }
@@ -155,6 +166,7 @@ MgErr OVResFile::RCloseFile() {
 }
 
 void OVResFile::Dispose() {
+    OVResChain::Forget(this);
     for (OVResource* resource : fLoaded) delete resource;
     fLoaded.clear();
     fFreeSlots.clear();
@@ -190,9 +202,14 @@ MgErr OVResFile::LoadData(const RsrcList& entry, std::unique_ptr<ResourceData>* 
         *data = std::make_unique<MappedResource>(place, length);
         return kNoErr;
     }
+    auto loaded = std::make_unique<DSHandleResource>();
     UHandle handle = DSNewHandle(length);
     if (!handle) return kMemFullErr;
-    *data = std::make_unique<DSHandleResource>(handle);
+    if (const MgErr err = loaded->Adopt(handle)) {
+        DSDisposeHandle(handle);
+        return err;
+    }
+    *data = std::move(loaded);
     return fIO->Read(start, *handle, length);
 }
 
@@ -411,7 +428,7 @@ int32 OVResFile::RUniqueID(ResType type) {
 MgErr OVResFile::RGetModDate(Path path, uint32* date, int32* readOnly) {
     ResFileLock lock;
     if (!date) {
-        TESSEL_REPORT(kDebugError, 0x39F7D01Au) << "OVResFile::RGetModDate modDate is NULL";
+        ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x39F7D01Au) << "OVResFile::RGetModDate modDate is NULL"; });
         return kArgErr;
     }
     if (!fOpen) return kNotResFileErr;
@@ -432,25 +449,28 @@ MgErr OVResFile::RSetFileAttrs(uint32 attrs) {
     ResFileLock lock;
     if (!fOpen) return kNotResFileErr;
     if (IsReadOnly()) {
-        TESSEL_REPORT(kDebugWarning, 0x0B74E9A2u) << "Tried to call RSetFileAttrs on a readonly file";
+        ReportUnlocked(
+            [] { TESSEL_REPORT(kDebugWarning, 0x0B74E9A2u) << "Tried to call RSetFileAttrs on a readonly file"; });
         return kPermissionErr;
     }
     fMap.Head()->fileAttrs = attrs;
     return kNoErr;
 }
 
-// The file takes the handle at the very end, so that it stays the caller's on failure.
+// The handle stays the caller's on failure.
 MgErr OVResFile::AddHandle(UHandle data, ResType type, int32 id, ConstPStr name) {
-    auto holder = std::make_unique<DSHandleResource>(nullptr);
+    auto holder = std::make_unique<DSHandleResource>();
     DSHandleResource* held = holder.get();
     auto resource = std::make_unique<OVResource>(this, std::move(holder));
     if (const MgErr err = Attach(resource.get())) return err;
     uint32 position = 0;
-    if (const MgErr err = fMap.Insert(type, id, name, &position)) {
+    MgErr err = held->Adopt(data);
+    if (!err) err = fMap.Insert(type, id, name, &position);
+    if (err) {
+        held->DetachHandle();
         Forget(resource.get());
         return err;
     }
-    held->Adopt(data);
     resource->fUnwritten = true;
     fMap.EntryAt(position)->loaded = resource->fSlot;
     fCache.Set(resource.release(), type, position);
@@ -463,7 +483,7 @@ MgErr OVResFile::RAdd(UHandle data, ResType type, int32 id, ConstPStr name) {
     if (!fOpen) return kNotResFileErr;
     if (!data) return kResIDExistsErr;
     if (const MgErr err = DSCheckHandle(data)) {
-        TESSEL_REPORT(kDebugError, 0x56A3C7D8u) << "RAdd of non-DS Handle";
+        ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x56A3C7D8u) << "RAdd of non-DS Handle"; });
         return err;
     }
     if (IsReadOnly()) return kPermissionErr;
@@ -481,9 +501,15 @@ MgErr OVResFile::RAddPtr(const void* data, uint32 size, ResType type, int32 id, 
     return err;
 }
 
-// What the entry's resource held is replaced by `copy`, which is used up. The handle of loaded data stays the same.
-MgErr OVResFile::ReplaceWith(UHandle copy, ResType type, RsrcList* entry) {
-    auto data = std::make_unique<DSHandleResource>(copy);
+// What the entry's resource held is replaced by a copy. The handle of loaded data stays the same.
+MgErr OVResFile::ReplaceWith(const void* bytes, uint32 size, ResType type, RsrcList* entry) {
+    auto data = std::make_unique<DSHandleResource>();
+    UHandle copy = nullptr;
+    if (const MgErr err = DSPtrToHand(bytes, &copy, size)) return err;
+    if (const MgErr err = data->Adopt(copy)) {
+        DSDisposeHandle(copy);
+        return err;
+    }
     OVResource* loaded = LoadedAt(*entry);
     if (!loaded) {
         auto resource = std::make_unique<OVResource>(this, std::move(data));
@@ -504,9 +530,8 @@ MgErr OVResFile::RReplacePtr(const void* data, uint32 size, ResType type, int32 
     if (!fOpen) return kNotResFileErr;
     if (IsReadOnly()) return kPermissionErr;
     RsrcList* entry = fMap.FindEntry(type, id);
-    UHandle copy = nullptr;
-    if (!data || !entry || DSPtrToHand(data, &copy, size)) return kResIDExistsErr;
-    return Guarded([&] { return ReplaceWith(copy, type, entry); }) ? kResIDExistsErr : kNoErr;
+    if (!data || !entry) return kResIDExistsErr;
+    return Guarded([&] { return ReplaceWith(data, size, type, entry); }) ? kResIDExistsErr : kNoErr;
 }
 
 MgErr OVResFile::RReplaceDSHandle(UHandle data, ResType type, int32 id) {
@@ -546,7 +571,8 @@ MgErr OVResFile::RPreAllocFile(uint32 size) {
     ResFileLock lock;
     if (!fOpen) return kNotResFileErr;
     if (IsReadOnly()) {
-        TESSEL_REPORT(kDebugWarning, 0x6F14B02Du) << "Tried to call RPreAllocFile on a readonly file";
+        ReportUnlocked(
+            [] { TESSEL_REPORT(kDebugWarning, 0x6F14B02Du) << "Tried to call RPreAllocFile on a readonly file"; });
         return kPermissionErr;
     }
     return fIO ? fIO->Extend(size) : kPermissionErr;
@@ -568,7 +594,7 @@ MgErr OVResFile::Release(OVResource* resource) {
     RsrcList* entry = nullptr;
     if (const MgErr err = FindRL(resource, &type, &entry)) return err;
     if (IsChanged(*entry)) {
-        TESSEL_REPORT(kDebugWarning, 0x28D5E16Au) << "!!! Tried to release a changed resource";
+        ReportUnlocked([] { TESSEL_REPORT(kDebugWarning, 0x28D5E16Au) << "!!! Tried to release a changed resource"; });
         return kArgErr;
     }
     entry->loaded = 0;
@@ -593,7 +619,7 @@ MgErr OVResFile::Detach(OVResource* resource) {
     RsrcList* entry = nullptr;
     if (const MgErr err = FindRL(resource, &type, &entry)) return err;
     if (IsChanged(*entry)) {
-        TESSEL_REPORT(kDebugWarning, 0x43BC97F0u) << "!!! Tried to detach a changed resource";
+        ReportUnlocked([] { TESSEL_REPORT(kDebugWarning, 0x43BC97F0u) << "!!! Tried to detach a changed resource"; });
         return kResNotFoundErr;
     }
     entry->loaded = 0;
@@ -634,6 +660,7 @@ MgErr OVResFile::GetAttrs(const OVResource* resource, uint32* attrs) {
 OVResource::~OVResource() {
     ResFileLock lock;
     EmptyHandleCache();
+    fData.reset();
 }
 
 MgErr OVResource::RRelease() {

@@ -1,3 +1,4 @@
+#include <sys/stat.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/paths/PathRef.h>
 
@@ -65,6 +66,10 @@ TEST_F(FileManagerTest, OpeningRefusesWhatItCannotOpen) {
     EXPECT_EQ(kArgErr, TryOpen(started.On("a?b"), kFOpenRead, kFDenyNone));
     EXPECT_EQ(kNotFoundErr, TryOpen(started.On("missing"), kFOpenRead, kFDenyNone));
     EXPECT_EQ(kArgErr, FMClose(nullptr));
+    // Nor does it wait for the other end of a pipe.
+    ASSERT_EQ(0, mkfifo(started.drive.Native("pipe").c_str(), 0600));
+    for (const int32 mode : {kFOpenReadWrite, kFOpenRead})
+        EXPECT_EQ(kPermissionErr, TryOpen(started.On("pipe"), mode, kFDenyNone));
 }
 
 TEST_F(FileManagerTest, AFileHeldByOthersIsTriedThreeTimes) {
@@ -158,6 +163,7 @@ TEST_F(FileManagerTest, RangesAreLockedFromTheirBase) {
     EXPECT_EQ(kPermissionErr, FLockOrUnlockRange(two, kFSeekEnd, -4, 1, 1));
     EXPECT_EQ(kNoErr, FLockOrUnlockRange(one, kFSeekStart, 5, 2, 0));
     EXPECT_EQ(kNoErr, FLockOrUnlockRange(two, kFSeekEnd, -4, 1, 1));
+    EXPECT_EQ(kArgErr, FLockOrUnlockRange(one, kFSeekStart, 4, 1, 0));  // the other's
     EXPECT_EQ(kArgErr, FLockOrUnlockRange(one, 0, 0, 1, 1));
     EXPECT_EQ(kArgErr, FLockOrUnlockRange(one, kFSeekStart, 100, 1, 0));
     FMClose(one);

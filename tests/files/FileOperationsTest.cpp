@@ -99,6 +99,9 @@ TEST_F(FileOperationsTest, FoldersAreMadeAndRemoved) {
     EXPECT_EQ(kNoErr, FRemove(At("a/f")));
     EXPECT_EQ(kNotFoundErr, FRemove(At("a/f")));
     EXPECT_EQ(0, FExists(At("a/f")));
+    std::filesystem::create_symlink("itself", started.drive.Native("itself"));
+    EXPECT_EQ(kNoErr, FRemove(At("itself")));
+    EXPECT_EQ(0, FExists(At("itself")));
     PathRef volumes(PathRef::kAbsolute), relative("a", PathRef::StringDisplay());
     EXPECT_EQ(2, FExists(&volumes));
     EXPECT_EQ(0, FExists(&relative));
@@ -264,6 +267,10 @@ TEST_F(FileOperationsTest, VolumesAndLists) {
         ASSERT_EQ(kNoErr, CPStrInsert(names, reinterpret_cast<ConstPStr>(kUnsorted[i]), static_cast<int32>(i)));
         reinterpret_cast<VolKindRec*>(*kinds)[i] = {i, i};
     }
+    ASSERT_EQ(kNoErr, DSSetHandleSize(kinds, 3 * sizeof(VolKindRec) - 1));
+    EXPECT_EQ(kArgErr, LSort(names, kinds));
+    ASSERT_EQ(kNoErr, DSSetHandleSize(kinds, 3 * sizeof(VolKindRec)));
+    reinterpret_cast<VolKindRec*>(*kinds)[2] = {2, 2};
     EXPECT_EQ(kNoErr, LSort(names, kinds));
     EXPECT_EQ(0, std::memcmp((*names)->bytes, "\2AA\1b\1C", 7));
     EXPECT_EQ(1u, reinterpret_cast<VolKindRec*>(*kinds)[0].flags);

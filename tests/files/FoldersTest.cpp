@@ -87,6 +87,11 @@ TEST_F(FoldersTest, ShortcutsAreFollowedAlongAName) {
     PathRef resolved;
     EXPECT_EQ(&resolved, FResolvePath(&resolved, &path));
     EXPECT_EQ("T:\\real\\deep\\f.txt", Text(resolved));
+    // Without its extension a shortcut is not meant.
+    PathRef bare = started.On("link/deep");
+    EXPECT_EQ(0, FExists(&bare));
+    EXPECT_EQ(&resolved, FResolvePath(&resolved, &bare));
+    EXPECT_EQ("T:\\link\\deep", Text(resolved));
     PathRef link = started.On("LINK.lnk");
     EXPECT_TRUE(link.IsAShortcut());
     EXPECT_EQ(kNoErr, FRemove(&link));

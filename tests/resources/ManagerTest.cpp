@@ -99,6 +99,7 @@ TEST_F(ManagerTest, ChangesAreKeptUntilTheyAreWritten) {
     EXPECT_EQ(kResNotFoundErr, RRemove(data, file));
     EXPECT_EQ(kNoErr, RSetAttrs(data, 0));
     EXPECT_EQ(kResNotFoundErr, RRemove(data, NewMemFile()));  // another file's
+    for (const RsrcFile taker : {file, NewMemFile()}) EXPECT_EQ(kArgErr, RAdd(data, taker, kData, 7, nullptr));
     ASSERT_EQ(kNoErr, DSSetHandleSize(data, 2));
     EXPECT_EQ(kNoErr, RSize(data, &size));
     EXPECT_EQ(2u, size);
@@ -177,9 +178,10 @@ TEST_F(ManagerTest, ChainsAreSearchedInOrder) {
     ASSERT_EQ(kNoErr, Add(b, kData, 2, "b2", "two"));
     const ReportRecorder reports;
     RsrcFile chain = 0, nested = 0;
-    const RsrcFile files[] = {a, 99, b};
-    ASSERT_EQ(kNoErr, RChain(&chain, 3, files));
+    const RsrcFile files[] = {a, b, 99};
+    EXPECT_EQ(kNotResFileErr, RChain(&chain, 3, files));
     EXPECT_TRUE(reports.Has(kDebugWarning, "RChain called with RsrcFile that is not in map."));
+    ASSERT_EQ(kNoErr, RChain(&chain, 2, files));
     EXPECT_EQ("a1", Get(chain, kData, 1));
     EXPECT_EQ("b2", Get(chain, kData, 2));
     EXPECT_EQ("error 15", Get(chain, kData, 3));
@@ -194,20 +196,39 @@ TEST_F(ManagerTest, ChainsAreSearchedInOrder) {
     EXPECT_EQ("error 15", Get(nested, kData, 1));
     EXPECT_EQ(kNoErr, RDestroyChain(nested));
 
-    // A file that answers with another error stops the search.
-    RFReadWrite closed;
-    ASSERT_EQ(kNoErr, closed.CreateMemoryResourceFile(kCreator, kType));
-    ResFile* const both[] = {closed.LowLevelResFile(), RsrcFileToRMapResFile(b)};
+    // A file that answers with another error stops the search; one that is closed leaves.
+    ResFile* const both[] = {RsrcFileToRMapResFile(a), RsrcFileToRMapResFile(0), RsrcFileToRMapResFile(b)};
     ResChain* objects = nullptr;
     Resource* resource = nullptr;
-    ASSERT_EQ(kNoErr, ResFileFactory::RChain(&objects, 2, both, false));
-    EXPECT_EQ(kNoErr, objects->RGet(kData, 2, &resource));
-    ASSERT_EQ(kNoErr, both[0]->RCloseFile());
+    ASSERT_EQ(kNoErr, ResFileFactory::RChain(&objects, 3, both, false));
+    EXPECT_EQ(kNoErr, objects->RGet(kData, 1, &resource));
     EXPECT_EQ(kNotResFileErr, objects->RGet(kData, 2, &resource));
+    ASSERT_EQ(kNoErr, RCloseFile(a));
+    EXPECT_EQ(kNotResFileErr, objects->RGet(kData, 1, &resource));
+    EXPECT_EQ("b1", Get(chain, kData, 1));
     EXPECT_EQ(kArgErr, objects->RGet(kData, 2, nullptr));
     delete objects;
     EXPECT_EQ(kNoErr, RDestroyChain(chain));
     EXPECT_EQ("b2", Get(b, kData, 2));
+}
+
+// A handler that waits for a thread which needs the lock.
+void WorkElsewhere(CStr, int32, CStr, int32, uint32, CStr) {
+    std::thread([] {
+        int32 types = 0;
+        EXPECT_EQ(kNotResFileErr, RCountTypes(0, &types));
+    }).join();
+}
+
+TEST_F(ManagerTest, ReportsAreMadeWithoutTheLock) {
+    const RsrcFile file = Open(Fixture("plain.rsrc"), kROpenReadOnly), unlisted = 99;
+    RsrcFile chain = 0;
+    const DebugOutputHandler before = DebugOutputSetHandler(WorkElsewhere);
+    EXPECT_EQ(kPermissionErr, RSetFileAttrs(file, 0));
+    EXPECT_EQ(kArgErr, RGetModDate(nullptr, file, nullptr, nullptr));
+    EXPECT_EQ(kNotResFileErr, RChain(&chain, 1, &unlisted));
+    EXPECT_EQ(kResNotFoundErr, RRelease(nullptr));
+    DebugOutputSetHandler(before);
 }
 
 TEST_F(ManagerTest, RefnumsEndWithTheirFile) {
@@ -323,6 +344,7 @@ TEST_F(ManagerTest, ImagesOfWholeFiles) {
     ASSERT_EQ(kNoErr, Add(disk, kData, 2, "two", "name"));
     ASSERT_EQ(kNoErr, RCloseFile(disk));
     EXPECT_EQ(started.drive.Get("f"), BytesOf(image));
+    EXPECT_EQ(kArgErr, RRelease(Loaded(made, kData, 1)));  // it could not be loaded again
     EXPECT_EQ(kNoErr, RCloseFile(made));
 
     // A file over that handle grows with what is added, and gives the handle back.

@@ -3,6 +3,8 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <tessel/resources/RFReadWrite.h>
+
 #include <cerrno>
 #include <map>
 
@@ -96,6 +98,17 @@ TEST_F(UpdateTest, AnUpdateThatFailsKeepsTheFileOpenUnlessForced) {
     EXPECT_EQ(kNotResFileErr, RUpdateFile(file));
     EXPECT_EQ(before, started.drive.Get("f"));
 
+    // Without room for the whole update nothing of it is begun, and who loses changes hears of it.
+    const ReportRecorder reports;
+    {
+        const FailingPlatform full("fallocate", 1, ENOSPC, 1000);
+        RFReadWrite writer;
+        ASSERT_EQ(kNoErr, writer.OpenPath(started.At("f"), kROpenReadWrite, nullptr, nullptr));
+        ASSERT_EQ(kNoErr, writer.AddFromPtr(before.data(), 9000, kData, 9, nullptr));
+        EXPECT_EQ(kDiskFullErr, writer.UpdateFile());
+    }
+    EXPECT_TRUE(reports.Has(kDebugError, "A resource file goes with changes that are not written!"));
+    EXPECT_EQ(before, started.drive.Get("f"));
     file = OpenDisk("f");
     const auto size = started.drive.Get("f").size();
     {

@@ -117,6 +117,14 @@ class Fixtures(unittest.TestCase):
                 self.assertEqual(len(lines), 1 + len(expected["resources"]))
                 self.run_ok("check", DATA / name)
 
+    def test_check_counts_the_strings_of_a_list(self):
+        with tempfile.TemporaryDirectory() as folder:
+            file = pathlib.Path(folder) / "f.rsrc"
+            for identifier, count in enumerate((b"\xff\x01", b"\x00\x02", b"\x00"), 1):
+                self.run_ok("create", file, "--replace")
+                self.run_ok("add", file, "STR#", identifier, stdin=count + (b"\x01x" if len(count) == 2 else b""))
+                self.refused(4, "check", file)
+
     def test_reading_one(self):
         plain = DATA / "plain.rsrc"
         for entry in parse(plain.read_bytes())[1]:

@@ -3,9 +3,11 @@
    Sections: open files · position and size · formatted writing · errors · creating, copying, moving, removing ·
    queries and changes · volumes · names and locations · names of the host system.
 
-   Every path must be absolute; a relative or null one gives kArgErr unless a function says otherwise. Failures of the
-   system come back as Win32ToOVFileErr maps them. Functions that change a file drop what the path has cached about it.
-   Any thread; no lock is held except where noted. */
+   Every path must be absolute; a relative or null one gives kArgErr unless a function says otherwise. The name of an
+   item, drive and folders included, has at most 259 bytes; a longer one gives kArgErr. Shortcuts (.lnk) along a path
+   are followed where they are named with their extension. Failures of the system come back as Win32ToOVFileErr maps
+   them. Functions that change a file drop what the path has cached about it. Any thread; no lock is held except where
+   noted. */
 #ifndef TESSEL_FILES_FILEMANAGER_H
 #define TESSEL_FILES_FILEMANAGER_H
 
@@ -99,8 +101,10 @@ TESSEL_BEGIN_C
 /* ---- open files ---------------------------------------------------------------------------------------------------
    A null file gives kArgErr everywhere. A file has one position; callers that share it must take turns. */
 
-/* Opens an existing file. A file that someone else holds is tried again twice, 50 ms apart, before kFileInUseErr.
-   kArgErr: an unknown mode, a volume, or a path that is not absolute. *file is null on failure. Close with FMClose. */
+/* Opens an existing file, without waiting for what is no file: a folder, a pipe or a socket is refused at once
+   (kPermissionErr, or kIOErr from the system). A file that someone else holds is tried again twice, 50 ms apart, before
+   kFileInUseErr. kArgErr: an unknown mode, a volume, or a path that is not absolute. *file is null on failure. Close
+   with FMClose. */
 TESSEL_API MgErr FMOpen(File_t** file, Path path, int32 openMode, int32 denyMode);
 TESSEL_API MgErr FMClose(File_t* file);
 

@@ -4,7 +4,9 @@
 
    A refnum stands for an open file or a chain of open files; 0 is never one. An unknown or stale refnum gives
    kNotResFileErr, an unknown handle kResNotFoundErr. Functions marked (file) take only refnums of files, not of chains.
-   Names are PStrs; a null or empty one is none. Any thread; all resource files of the process share one lock. */
+   Names are PStrs; a null or empty one is none. The name of a file on disk has at most 259 bytes, drive and folders
+   included (kArgErr beyond). Any thread; all resource files of the process share one lock, which is not held while a
+   file on disk is found and opened, nor while a report is made. */
 #ifndef TESSEL_RESOURCES_RESOURCEMANAGER_H
 #define TESSEL_RESOURCES_RESOURCEMANAGER_H
 
@@ -82,10 +84,12 @@ TESSEL_API MgErr RCreateMemFile(RsrcFile* refnum, _FMFileCreator creator, _FMFil
 /* Writes pending changes and closes. When that fails the file stays open. (A chain: RDestroyChain.) */
 TESSEL_API MgErr RCloseFile(RsrcFile refnum);
 
-/* The same, but when the changes cannot be written they are given up. The result is that of the first try. */
+/* The same, but when the changes cannot be written they are given up, and the file on disk stays as the try left it:
+   untouched when the disk is too full for the whole update, else in part rewritten. The result is that of the try. */
 TESSEL_API MgErr RCloseFileForce(RsrcFile refnum);
 
-/* (file) Writes pending changes and packs the file. On failure they stay pending, and the next update tries again. */
+/* (file) Writes pending changes and packs the file. On failure they stay pending, and the next update tries again.
+   kDiskFullErr before anything is overwritten when there is no room for the whole update. */
 TESSEL_API MgErr RUpdateFile(RsrcFile refnum);
 
 /* (file) Takes back the handle given to ROpenUHandle; it must outlive the file, which goes on using it. kGenericErr:
@@ -93,7 +97,8 @@ TESSEL_API MgErr RUpdateFile(RsrcFile refnum);
 TESSEL_API MgErr RGetUHandleOwnership(RsrcFile refnum, UHandle* image);
 
 /* (file) The image of the whole file. Over ROpenUHandle it is that handle itself; else a new one, for which all
-   resources must be loaded (kArgErr). The caller owns it. */
+   resources must be loaded (kArgErr). The caller owns it. A file made in memory stays the only one to have its data:
+   they cannot be released or detached. */
 TESSEL_API MgErr RGetMemFileHandle(RsrcFile refnum, UHandle* image);
 
 /* (file) Grows the file by `size` bytes ahead of writing. */
@@ -135,7 +140,8 @@ TESSEL_API MgErr RGetNamed(RsrcFile refnum, ResType type, ConstPStr name, UHandl
 TESSEL_API MgErr RExists(RsrcFile refnum, ResType type, int32 id, int32* exists);
 TESSEL_API MgErr RIsLoaded(RsrcFile refnum, ResType type, int32 id, bool* loaded);
 
-/* (file) Adds a resource; on success the file owns the handle. kResIDExistsErr: the ID is taken, or no handle. */
+/* (file) Adds a resource; on success the file owns the handle. kResIDExistsErr: the ID is taken, or `data`
+   is null. kArgErr: the handle is the data of a resource already, of this file or another. */
 TESSEL_API MgErr RAdd(UHandle data, RsrcFile refnum, ResType type, int32 id, ConstPStr name);
 
 /* (file) Removes the resource whose data this handle is. The caller owns the handle from then on. */
@@ -189,8 +195,8 @@ TESSEL_API MgErr RGetIndPath(RsrcFile refnum, Path* path, int32 id, int32 index)
 /* ---- chains -------------------------------------------------------------------------------------------------------
  */
 
-/* A chain of open files, searched in this order; they stay the caller's. An entry that is no open file is reported and
-   left out. */
+/* A chain of open files, searched in this order; they stay the caller's. One that is closed leaves the chain. An entry
+   that is no open file is reported, and there is no chain: kNotResFileErr. */
 TESSEL_API MgErr RChain(RsrcFile* refnum, int32 count, const RsrcFile* files);
 
 /* Ends a chain; its files stay open. */

@@ -106,7 +106,7 @@ bool ShareAllows(int descriptor, std::uint32_t access, std::uint32_t deny, bool 
 int OpenRetrying(const char* native, int flags) {
     int descriptor;
     do {
-        descriptor = systemCalls.open(native, flags | O_CLOEXEC | O_NOCTTY, 0666);
+        descriptor = systemCalls.open(native, flags | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, 0666);
     } while (descriptor < 0 && errno == EINTR);
     return descriptor;
 }
@@ -121,9 +121,19 @@ int OpenDescriptor(const char* native, std::uint32_t access, int flags, bool& re
     return OpenRetrying(native, O_WRONLY | flags);
 }
 
-bool IsFolder(int descriptor) {
+/* Opening never waits, but the later reads and writes of a device do, as those of a file. */
+bool MakeWaiting(int descriptor) {
+    int flags = fcntl(descriptor, F_GETFL);
+    return flags >= 0 && fcntl(descriptor, F_SETFL, flags & ~O_NONBLOCK) == 0;
+}
+
+/* Folders, pipes and sockets have no bytes at positions. A device may be opened. */
+bool CheckKind(int descriptor) {
     struct statx status;
-    return systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_TYPE, &status) == 0 && S_ISDIR(status.stx_mode);
+    if (systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_TYPE, &status) != 0) return FailErrno();
+    if (S_ISREG(status.stx_mode)) return true;
+    if (S_ISDIR(status.stx_mode) || S_ISFIFO(status.stx_mode)) return FailWith(kErrorAccessDenied);
+    return MakeWaiting(descriptor) || FailErrno();
 }
 
 bool Truncate(int descriptor, std::int64_t size) {
@@ -136,9 +146,9 @@ bool Truncate(int descriptor, std::int64_t size) {
 
 /* What has to hold of a descriptor before it is handed out. */
 bool Admit(int descriptor, std::uint32_t access, std::uint32_t deny, bool readable, bool empty) {
-    if (access == kRead && IsFolder(descriptor)) return FailWith(kErrorAccessDenied);
+    if (!CheckKind(descriptor)) return false;
     if (!ShareAllows(descriptor, access, deny, readable)) return FailWith(kErrorSharingViolation);
-    if (empty && !Truncate(descriptor, 0) && errno != EINVAL) return FailErrno(); /* EINVAL: a device, a pipe */
+    if (empty && !Truncate(descriptor, 0) && errno != EINVAL) return FailErrno(); /* EINVAL: a device */
     return true;
 }
 
@@ -239,6 +249,20 @@ bool FileSetSize(FileHandle file, std::int64_t size) {
     return Truncate(DescriptorOf(file), size) || FailErrno();
 }
 
+bool FileReserve(FileHandle file, std::int64_t size) {
+    if (!HasAccess(file, kWrite)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
+    std::int64_t before = 0;
+    if (!FileSize(file, before)) return false;
+    int result;
+    do {
+        result = systemCalls.fallocate(DescriptorOf(file), 0, 0, static_cast<off_t>(size));
+    } while (result != 0 && errno == EINTR);
+    if (result == 0 || errno == EOPNOTSUPP || errno == ENOSYS || errno == ENODEV) return true;
+    ErrorNumber reason = ErrorOfErrno(errno);
+    Truncate(DescriptorOf(file), before); /* a part may have been had */
+    return FailWith(reason);
+}
+
 bool FileFlush(FileHandle file) {
     int result;
     do {
@@ -316,7 +340,8 @@ bool FileUnlock(FileHandle file, std::int64_t offset, std::int64_t count) {
     int other = OpenRetrying(self, O_RDONLY);
     bool locked = other < 0 || HeldByOther(other, offset, count);
     if (other >= 0) systemCalls.close(other);
-    if (!locked) return FailWith(kErrorNotLocked);
+    /* What another handle holds is not this one's to unlock. */
+    if (!locked || HeldByOther(DescriptorOf(file), offset, count)) return FailWith(kErrorNotLocked);
     struct flock range;
     return LockBytes(DescriptorOf(file), F_OFD_SETLK, F_UNLCK, offset, count, range) == 0 || FailErrno();
 }

@@ -10,6 +10,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <memory>
+#include <new>
 
 #include "platform/posix/FileHandles.h"
 #include "platform/posix/NativeNames.h"
@@ -34,10 +35,11 @@ void FillInfo(const struct statx& status, ItemInfo& info) {
 
 namespace {
 
-/* A link that leads nowhere is described itself, so that it can be seen and deleted. */
+/* A link whose end cannot be reached (it leads nowhere, in a circle, into a closed folder) is described itself, so that
+   it can be seen and deleted. */
 bool GetStatus(const std::string& native, unsigned mask, struct statx& status) {
     if (systemCalls.statx(AT_FDCWD, native.c_str(), 0, mask, &status) == 0) return true;
-    return errno == ENOENT && systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, mask, &status) == 0;
+    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, mask, &status) == 0;
 }
 
 void TakeCreated(const unsigned char (&bytes)[8], ssize_t count, ItemInfo& info) {
@@ -256,7 +258,8 @@ private:
 
 bool CopyThroughBuffer(FileHandle from, FileHandle to) {
     constexpr std::size_t kBufferSize = 128 * 1024;
-    std::unique_ptr<char[]> buffer(new char[kBufferSize]);
+    std::unique_ptr<char[]> buffer(new (std::nothrow) char[kBufferSize]);
+    if (!buffer) return FailWith(kErrorNotEnoughMemory);
     std::size_t count = 0, written = 0;
     do {
         if (!FileRead(from, buffer.get(), kBufferSize, count) || !FileWrite(to, buffer.get(), count, written))

@@ -50,6 +50,7 @@ constinit SystemCalls systemCalls = {
     .write = ::write,
     .lseek = ::lseek,
     .ftruncate = ::ftruncate,
+    .fallocate = ::fallocate,
     .fsync = ::fsync,
     .lock = Lock,
     .mmap = ::mmap,

@@ -23,6 +23,7 @@ namespace tessel::platform {
     X(ssize_t, write, (int file, const void* data, std::size_t count))                                             \
     X(off_t, lseek, (int file, off_t offset, int from))                                                            \
     X(int, ftruncate, (int file, off_t size))                                                                      \
+    X(int, fallocate, (int file, int mode, off_t offset, off_t size))                                              \
     X(int, fsync, (int file))                                                                                      \
     X(int, lock, (int file, int command, struct flock* range))                                                     \
     X(void*, mmap, (void* address, std::size_t size, int protection, int flags, int file, off_t offset))           \
