@@ -118,15 +118,17 @@ int32 MSWinGetModulePath(MGModuleHandle module, char* buffer, int32 size) try {
 }
 
 void MSWinGetModuleLocation(MGModuleHandle module, char* out) {
+    if (!out) return;
     const ModuleName name(module);
     CopyView(name.HasFolder() ? name.Folder() : std::string_view(), out);
 }
 
 void MSWinGetModuleFileName(MGModuleHandle module, char* out) {
-    CopyView(ModuleName(module).Name(), out);
+    if (out) CopyView(ModuleName(module).Name(), out);
 }
 
 void MSWinGetModuleModDate(MGModuleHandle module, char* out) try {
+    if (!out) return;
     out[0] = 0;
     int64 time;
     if (LastWritten(module, time)) WriteDate(time, out);

@@ -65,19 +65,18 @@ bool AllocRecords::Grow(Shard& shard, TrackerFailure& failure) {
     return true;
 }
 
-AllocRecords::Insertion AllocRecords::Insert(uintptr_t address, const CallSite* site, uint64 number, uint32 size,
-                                             AllocRecord& earlier, TrackerFailure& failure) {
+AllocRecords::Insertion AllocRecords::Insert(uintptr_t address, const CallSite* site, uint32 size, AllocRecord& earlier,
+                                             TrackerFailure& failure) {
     const Place place(address);
     bool isMore = false;
-    const Insertion result =
-        InsertInto(ShardOf(place), place, {address, site, number, size, 0}, earlier, isMore, failure);
+    const Insertion result = InsertInto(ShardOf(place), place, {address, site, 0, size, 0}, earlier, isMore, failure);
     if (isMore) TakeRoom(size);
     return result;
 }
 
 // `isMore`: it does not fit into the room of the shard.
-AllocRecords::Insertion AllocRecords::InsertInto(Shard& shard, Place place, const AllocRecord& record,
-                                                 AllocRecord& earlier, bool& isMore, TrackerFailure& failure) {
+AllocRecords::Insertion AllocRecords::InsertInto(Shard& shard, Place place, AllocRecord record, AllocRecord& earlier,
+                                                 bool& isMore, TrackerFailure& failure) {
     SpinLockHolder hold(shard.lock);
     // At most three quarters are taken.
     if ((!shard.slots || 4 * uint64{shard.counts.live + 1} > 3 * (uint64{shard.mask} + 1)) && !Grow(shard, failure))
@@ -87,8 +86,10 @@ AllocRecords::Insertion AllocRecords::InsertInto(Shard& shard, Place place, cons
         earlier = *slot;
         return Insertion::kDuplicate;
     }
+    // Only what is kept has a number, so that there are no gaps; the one word that all threads share costs less than
+    // numbers in another order would.
+    record.number = made_.fetch_add(1, std::memory_order_relaxed) + 1;
     *slot = record;
-    ++shard.counts.made;
     shard.counts.bytesMade += record.size;
     shard.counts.bytes += record.size;
     ++shard.counts.live;
@@ -168,12 +169,12 @@ AllocRecords::Counts AllocRecords::Count() {
     Counts counts{};
     for (Shard& shard : shards_) {
         SpinLockHolder hold(shard.lock);
-        counts.made += shard.counts.made;
         counts.bytesMade += shard.counts.bytesMade;
         counts.bytes += shard.counts.bytes;
         counts.live += shard.counts.live;
         counts.unreported += shard.counts.unreported;
     }
+    counts.made = made_.load(std::memory_order_relaxed);
     return counts;
 }
 

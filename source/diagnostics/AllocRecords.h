@@ -15,7 +15,7 @@ namespace tessel {
 struct AllocRecord {
     uintptr_t address;     // 0: no record
     const CallSite* site;  // where it was made, the stack of its creation included
-    uint64 number;         // the how-manieth object of its tracker it is
+    uint64 number;         // the how-manieth object of its tracker it is, from 1
     uint32 size;
     uint32 reported;
 };
@@ -40,13 +40,13 @@ public:
     enum class Insertion { kDone, kDuplicate, kFailed };
     // Of a duplicate the earlier record is copied into `earlier`; with kFailed the new one is not kept. `failure` may
     // be set in any case.
-    Insertion Insert(uintptr_t address, const CallSite* site, uint64 number, uint32 size, AllocRecord& earlier,
+    Insertion Insert(uintptr_t address, const CallSite* site, uint32 size, AllocRecord& earlier,
                      TrackerFailure& failure);
     bool Remove(uintptr_t address);
     bool Find(uintptr_t address, AllocRecord& record);
 
     struct Counts {
-        uint64 made;  // ever, the dead included
+        uint64 made;  // ever, the dead included; of all shards together
         uint64 bytesMade;
         uint64 bytes;
         uint32 live;
@@ -84,7 +84,7 @@ private:
     static AllocRecord* Look(const Shard& shard, Place place);
     bool Grow(Shard& shard, TrackerFailure& failure);
     Shard& ShardOf(Place place);
-    Insertion InsertInto(Shard& shard, Place place, const AllocRecord& record, AllocRecord& earlier, bool& isMore,
+    Insertion InsertInto(Shard& shard, Place place, AllocRecord record, AllocRecord& earlier, bool& isMore,
                          TrackerFailure& failure);
     void GiveRoom(Shard& shard, uint32 size);
     void TakeRoom(uint32 size);
@@ -93,6 +93,7 @@ private:
     Shard shards_[1 << kShardBits];
     std::atomic<uint64> withRoom_{0};  // a bit for each shard that has room
 
+    alignas(64) std::atomic<uint64> made_{0};
     alignas(64) SpinLock mostLock_;  // guards the rest; locks of shards are taken inside
     Amount most_;
     Amount room_;  // that of no shard

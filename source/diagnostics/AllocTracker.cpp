@@ -88,10 +88,9 @@ void AllocTracker::Implementation::Add(uintptr_t address, uint32 size, const cha
                                        const StackFrame* frame) {
     if (deactivated_.load(std::memory_order_relaxed)) return;
     TrackerFailure failure = TrackerFailure::kNone;
-    uint64 number;
-    if (const CallSite* site = sites_.Enter(file, line, frame, number, failure)) {
+    if (const CallSite* site = sites_.Enter(file, line, frame, failure)) {
         AllocRecord earlier;
-        if (records_.Insert(address, site, number, size, earlier, failure) == AllocRecords::Insertion::kDuplicate)
+        if (records_.Insert(address, site, size, earlier, failure) == AllocRecords::Insertion::kDuplicate)
             ReportDuplicate(earlier);
     }
     if (failure != TrackerFailure::kNone) Deactivate(failure);

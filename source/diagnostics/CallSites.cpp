@@ -6,6 +6,7 @@
 #include <cstring>
 #include <utility>
 
+#include "platform/Module.h"
 #include "platform/Thread.h"
 
 namespace tessel {
@@ -16,8 +17,6 @@ constexpr size_t kChunkSize = 16 * 1024;
 constexpr int32 kMostSkipRemembered = 8;
 constexpr int32 kMostFrames = CallStack::kCapacity + kMostSkipRemembered;
 constexpr int kWalksRemembered = 16;
-constexpr int kNumberRanges = 8;
-constexpr uint32 kMostNumbersAtOnce = 64;
 
 std::atomic<uint64> theNextSerial{1};
 
@@ -46,19 +45,11 @@ struct RememberedWalk {
     StackFrame frames[kMostFrames];
 };
 
-struct NumberRange {
-    uint64 serial;
-    uint64 next;
-    uint64 end;
-    uint32 size;
-};
-
 namespace {
 
 // What a thread remembers. All its own, so that no lock is needed.
 struct ThreadMemory {
     const CallSites* reporting;
-    NumberRange numbers[kNumberRanges];
     RememberedWalk walks[kWalksRemembered];
 };
 
@@ -121,6 +112,14 @@ __attribute__((no_sanitize("address"), no_sanitize("thread"))) int32 CopyFrames(
     return depth;
 }
 
+// How many frames there are before the chain leads astray: into code without frame pointers, which keeps anything in
+// the register. What stands in a frame of its making is code by chance only. The innermost one is true in any case.
+int32 WithoutGarbage(const StackFrame* frames, int32 depth) {
+    for (int32 i = 1; i < depth; ++i)
+        if (!platform::IsInModule(frames[i].returnAddress)) return i;
+    return depth;
+}
+
 }  // namespace
 
 struct CallSites::Key {
@@ -152,29 +151,15 @@ void CallSites::SetSkip(int32 skip) {
     skip_ = skip;
 }
 
-const CallSite* CallSites::Enter(const char* file, int32 line, const StackFrame* frame, uint64& number,
-                                 TrackerFailure& failure) {
+const CallSite* CallSites::Enter(const char* file, int32 line, const StackFrame* frame, TrackerFailure& failure) {
     ThreadMemory* const memory = MemoryOfThread();
-    if (!memory) {
-        number = numbers_.fetch_add(1, std::memory_order_relaxed);
-        return Walk(file, line, frame, nullptr, failure);
-    }
+    if (!memory) return Walk(file, line, frame, nullptr, failure);
     if (memory->reporting == this) return nullptr;
-    NumberRange& range = memory->numbers[serial_ % kNumberRanges];
-    if (range.serial != serial_ || range.next == range.end) TakeNumbers(range);
-    number = range.next++;
     RememberedWalk& walk = WalkFrom(*memory, frame, serial_);
     if (walk.first == frame && walk.serial == serial_ && walk.file == file && walk.line == line &&
         walk.skip == skip_.load(std::memory_order_relaxed) && IsSameWalk(walk))
         return walk.site;
     return Walk(file, line, frame, &walk, failure);
-}
-
-__attribute__((noinline)) void CallSites::TakeNumbers(NumberRange& range) {
-    if (range.serial != serial_) range = {serial_, 0, 0, 1};
-    range.next = numbers_.fetch_add(range.size, std::memory_order_relaxed);
-    range.end = range.next + range.size;
-    range.size = std::min(2 * range.size, kMostNumbersAtOnce);
 }
 
 // Remembers the walk when asked to.
@@ -184,17 +169,19 @@ const CallSite* CallSites::Walk(const char* file, int32 line, const StackFrame* 
     const int32 skip = skip_.load(std::memory_order_relaxed);
     int32 depth, first;
     if (skip <= kMostSkipRemembered) {
-        depth = CopyFrames(frame, frames, CallStack::kCapacity + skip);
+        depth = WithoutGarbage(frames, CopyFrames(frame, frames, CallStack::kCapacity + skip));
         first = std::min(skip, depth);
     } else {
         const void* addresses[CallStack::kCapacity];
         depth = WalkCallStack(addresses, CallStack::kCapacity, frame, frame->returnAddress, skip);
         for (int32 i = 0; i < depth; ++i) frames[i] = {nullptr, addresses[i]};
+        depth = WithoutGarbage(frames, depth);
         first = 0;
     }
     const Key key(file, line, frames + first, depth - first);
     const CallSite* site = Find(key);
     if (!site) site = Add(key, failure);
+    if (!site && failure == TrackerFailure::kNone) site = Add(Key(file, line, frames, 1), failure);
     if (site && remembered && skip <= kMostSkipRemembered) {
         *remembered = {serial_, file, line, depth, skip, frame, site, {}};
         std::copy_n(frames, depth, remembered->frames);
@@ -214,6 +201,7 @@ const CallSite* CallSites::Find(const Key& key) const {
 const CallSite* CallSites::Add(const Key& key, TrackerFailure& failure) {
     platform::MutexHolder hold(mutex_);
     if (const CallSite* site = Find(key)) return site;
+    if (count_ >= kMostStacks && key.count > 1) return nullptr;
     if (!MakeRoom(failure)) return nullptr;
     const size_t stackSize = static_cast<size_t>(key.count) * sizeof key.addresses[0];
     auto* const site = static_cast<CallSite*>(AllocateSmall(offsetof(CallSite, addresses) + stackSize, failure));
@@ -232,6 +220,11 @@ const CallSite* CallSites::Add(const Key& key, TrackerFailure& failure) {
     table.slots[slot & table.mask].store(site, std::memory_order_release);
     ++count_;
     return site;
+}
+
+uint32 CallSites::Count() const {
+    platform::MutexHolder hold(mutex_);
+    return count_;
 }
 
 // Keeps half of the slots free. Readers may still be in the table that is replaced, so it stays until the end; together

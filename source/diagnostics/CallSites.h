@@ -26,7 +26,6 @@ struct CallSite {
 };
 
 struct RememberedWalk;
-struct NumberRange;
 
 class CallSites {
 public:
@@ -37,14 +36,15 @@ public:
 
     void SetSkip(int32 skip);
 
-    // For a new object: where the calling thread makes it (its innermost frame is given), and the next of the tracker's
-    // numbers, from 1. Null while the thread reports for this tracker, and, with `failure` set, when memory runs out.
-    // No lock, unless the site is new. Any thread.
+    // Where the calling thread makes a new object; its innermost frame is given. Null while the thread reports for this
+    // tracker, and, with `failure` set, when memory runs out. No lock, unless the site is new. Any thread.
     //
-    // A thread that takes many numbers takes several at a time, so that threads do not hold each other up: numbers are
-    // unique, and rise within a thread.
-    const CallSite* Enter(const char* file, int32 line, const StackFrame* frame, uint64& number,
-                          TrackerFailure& failure);
+    // The calls of a host without frame pointers are lost behind its innermost one: what stands in their place is
+    // mostly told by its not being code, and kMostStacks bounds what is not. Beyond that many, new sites hold the
+    // innermost call only, and there are no more of these than there are calls in the code.
+    const CallSite* Enter(const char* file, int32 line, const StackFrame* frame, TrackerFailure& failure);
+    static constexpr uint32 kMostStacks = 1 << 16;
+    uint32 Count() const;
 
     // The tracker that the calling thread is reporting for: whatever it makes meanwhile is not tracked.
     class Reporting {
@@ -66,7 +66,6 @@ private:
     };
     struct Key;
 
-    void TakeNumbers(NumberRange& range);
     const CallSite* Walk(const char* file, int32 line, const StackFrame* frame, RememberedWalk* remembered,
                          TrackerFailure& failure);
     const CallSite* Find(const Key& key) const;
@@ -80,12 +79,10 @@ private:
     std::atomic<int32> skip_;
     std::atomic<Table*> table_{nullptr};
 
-    platform::Mutex mutex_;  // guards what follows, and changes of the table
+    mutable platform::Mutex mutex_;  // guards what follows, and changes of the table
     uint32 count_ = 0;
     char* small_ = nullptr;  // the unused rest of the newest chunk
     size_t smallLeft_ = 0;
-
-    alignas(64) std::atomic<uint64> numbers_{1};
 };
 
 }  // namespace tessel

@@ -41,7 +41,8 @@ void DefaultHandler(CStr file, int32 line, int32 level, uint32 siteCode, CStr te
         char message[kMessageSize + 1];  // and the end of the line
         std::snprintf(message, kMessageSize, "ERR %lx: %s(%d): %s", static_cast<unsigned long>(siteCode), file, line,
                       text);
-        std::strcat(message, "\n");
+        const size_t length = std::strlen(message);
+        if (message[length - 1] != '\n') std::strcpy(message + length, "\n");
         DebugOutputCoreBreak(message);
     }
     if (level == kDebugFatal) DebugOutputCoreDie();
@@ -93,11 +94,12 @@ DebugOutputHandler DebugOutputGetHandler(void) {
     return theHandler.load();
 }
 
-// A handler that reports, which calls the handler again, would never end: what is nested too deep is dropped.
+// A handler that reports, which calls the handler again, would never end: what is nested too deep takes the default
+// behaviour, which reports nothing.
 void DebugOutputCallHandler(CStr file, int32 line, CStr identifier, int32 level, uint32 siteCode, CStr text) {
-    if (theNestedReports == kMostNestedReports) return;
     NestedReport nested;
-    if (DebugOutputHandler handler = theHandler.load(std::memory_order_acquire))
+    DebugOutputHandler handler = theHandler.load(std::memory_order_acquire);
+    if (handler && theNestedReports <= kMostNestedReports)
         handler(OrEmpty(file), line, OrEmpty(identifier), level, siteCode, OrEmpty(text));
     else
         DefaultHandler(OrEmpty(file), line, level, siteCode, OrEmpty(text));

@@ -10,6 +10,7 @@
 
 #include "diagnostics/Guarded.h"
 #include "platform/File.h"
+#include "platform/LastError.h"
 #include "platform/MemoryRead.h"
 
 namespace tessel {
@@ -27,10 +28,13 @@ std::unique_ptr<FileLoc> LocationOf(const char* fileName) {
                      [&] { return std::unique_ptr<FileLoc>(CreateFileLoc(FileLoc::kTempFolder, fileName, false)); });
 }
 
-platform::FileHandle OpenForWriting(const char* name) {
-    return GuardedOr(platform::kNoFile, [&] {
-        return platform::FileOpen(name, platform::kWrite, platform::kWrite, platform::Disposition::kCreateAlways);
-    });
+platform::FileHandle CreateFile(const char* name) {
+    const platform::FileHandle file =
+        GuardedOr(platform::kNoFile, [&] { return platform::FileCreatePrivate(name, platform::kWrite); });
+    if (file == platform::kNoFile)
+        TESSEL_REPORT(kDebugWarning, 0x53B7E21Du) << "Cannot write " << name << ": error " << platform::LastError()
+                                                  << ". The name may be taken by another user's file.";
+    return file;
 }
 
 }  // namespace
@@ -80,12 +84,13 @@ void LeakDumper::DumpLeaks(AllocTracker& tracker) {
     if (const auto location = LocationOf(fileName_)) {
         TESSEL_REPORT(kDebugInfo, 0x1D9A7C03u)
             << location->PathText() << "(1) : " << count << ' ' << name_ << " (" << expected_ << " expected)";
-        file_ = OpenForWriting(location->PathText());
+        file_ = CreateFile(location->PathText());
         if (file_ != platform::kNoFile) tracker.DumpAll(this);
         CloseFile();
+        if (isCut_) TESSEL_REPORT(kDebugWarning, 0xA90C4F76u) << location->PathText() << " could not be written whole";
     }
     TESSEL_REPORT(kDebugError, 0x48E5B09Cu)
-        << "We got " << count - expected_ << " more " << name_ << " than we see from a basic launch and quit.\n";
+        << "We got " << int64{count} - expected_ << " more " << name_ << " than we see from a basic launch and quit.\n";
 }
 
 // Texts are small and many, so they are gathered.
@@ -98,14 +103,14 @@ void LeakDumper::WriteToFile(const char* text) {
 
 void LeakDumper::FlushFile() {
     size_t written;
-    platform::FileWrite(file_, buffer_, buffered_, written);  // nothing more can be done about a failure here
+    isCut_ = isCut_ || !platform::FileWrite(file_, buffer_, buffered_, written);
     buffered_ = 0;
 }
 
 void LeakDumper::CloseFile() {
     if (file_ == platform::kNoFile) return;
     FlushFile();
-    platform::FileClose(file_);
+    isCut_ = !platform::FileClose(file_) || isCut_;
     file_ = platform::kNoFile;
 }
 

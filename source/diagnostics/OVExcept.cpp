@@ -14,13 +14,29 @@
 #include "diagnostics/Guarded.h"
 
 namespace tessel {
+namespace {
+
+constexpr size_t kMostShown = 80;  // leaves room for any detail
+
+// The whole name, or as many of its last folders as can be shown.
+const char* ShortName(const char* file) {
+    if (!file) return "";
+    const size_t length = std::strlen(file);
+    if (length <= kMostShown) return file;
+    const char* const end = file + length - kMostShown;
+    const char* const cut = std::strpbrk(end, "/\\");
+    return cut ? cut + 1 : end;
+}
+
+}  // namespace
 
 OVExcept::OVExcept(MgErr code, const char* detail, const char* file, int32 line) noexcept : code_(code), line_(line) {
     std::snprintf(detail_, sizeof detail_, "%s", detail ? detail : "");
     const size_t length = file ? std::strlen(file) : 0;
     const size_t kept = std::min(length, sizeof file_ - 1);
     std::snprintf(file_, sizeof file_, "%s", file ? file + (length - kept) : "");
-    std::snprintf(what_, sizeof what_, "OVExcept. Err=%d, File=%s, Line=%d, Detail='%s'", code_, file_, line_, detail_);
+    std::snprintf(what_, sizeof what_, "OVExcept. Err=%d, File=%s, Line=%d, Detail='%s'", code_, ShortName(file), line_,
+                  detail_);
     stack_.count = WalkCallStack(stack_.addresses, CallStack::kCapacity, __builtin_frame_address(0),
                                  __builtin_return_address(0), 0);
 }

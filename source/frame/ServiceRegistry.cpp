@@ -16,9 +16,11 @@ constexpr int32 kFirstDependencies = 4;
 constexpr int32 kMostDependencies = 1024;
 constexpr size_t kNameSize = 128;
 
-// Every service that some registry started and has not stopped. Never destroyed: a host may stop at its very end.
-std::set<IServiceObject*>& RunningServices() {
-    static auto& services = *new std::set<IServiceObject*>;
+// Every service that some registry started and has not stopped, once for each such registry. Never destroyed: a host
+// may stop at its very end.
+using ServiceSet = std::multiset<IServiceObject*>;
+ServiceSet& RunningServices() {
+    static auto& services = *new ServiceSet;
     return services;
 }
 
@@ -157,15 +159,15 @@ MgErr ServiceRegistry::InitServices() {
 }
 
 MgErr ServiceRegistry::Start(ServiceRegistryItem& item) {
-    RunningServices().insert(item.service);  // before it runs, since memory may run out
+    ServiceSet entry{item.service};  // before it runs, since memory may run out
     item.startBegin = MilliSecs();
-    item.startResult = item.service->Init();
+    item.startResult = Guarded([&] { return item.service->Init(); });
     item.startEnd = MilliSecs();
     if (item.startResult == kNoErr) {
+        RunningServices().merge(entry);
         ++startedCount_;
         return kNoErr;
     }
-    RunningServices().erase(item.service);
     TESSEL_REPORT(kDebugInfo, 0x4F36D8B1u)
         << "ServiceRegistry: Service " << item.service->GetName() << " init failed with error " << item.startResult;
     return item.startResult;
@@ -190,10 +192,10 @@ MgErr ServiceRegistry::Stop(ServiceRegistryItem& item) {
     char name[kNameSize];  // the stop may destroy the service
     std::snprintf(name, sizeof name, "%s", item.service->GetName());
     item.stopBegin = MilliSecs();
-    item.stopResult = item.service->Uninit();
+    item.stopResult = Guarded([&] { return item.service->Uninit(); });
     item.stopEnd = MilliSecs();
     if (item.stopResult == kNoErr)
-        RunningServices().erase(item.service);
+        RunningServices().erase(RunningServices().find(item.service));
     else
         TESSEL_REPORT(kDebugInfo, 0x2E8B5C76u)
             << "ServiceRegistry: Service " << name << " uninit failed with error " << item.stopResult;

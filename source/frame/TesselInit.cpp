@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "frame/CoreServices.h"
+#include "frame/Environment.h"
 #include "frame/ServiceRegistry.h"
 
 namespace tessel {
@@ -41,12 +42,16 @@ MgErr InitTesselBase(void) {
     std::copy(std::begin(core), std::end(core), services);
     if (std::find(std::begin(core), std::end(core), nullptr) != std::end(core)) return kMemFullErr;
     theBaseRegistry = CreateServiceRegistry(services);
-    return theBaseRegistry ? theBaseRegistry->InitServices() : kMemFullErr;
+    if (!theBaseRegistry) return kMemFullErr;
+    const MgErr err = theBaseRegistry->InitServices();
+    ReportUnknownSettings();
+    return err;
 }
 
 // A service that failed to start keeps its error until it is let go: then the next start finds a new one.
 MgErr UninitTesselBase(void) {
     if (!theBaseRegistry) return kNoErr;
+    UninitTesselAppSupport();  // which stands on the base
     if (IServiceObject* failed = static_cast<ServiceRegistry*>(theBaseRegistry)->Failed()) failed->Uninit();
     theBaseRegistry->UninitServices();
     theBaseRegistry->Release();

@@ -7,6 +7,7 @@
 #include "memory/HandleBlock.h"
 #include "memory/MasterPointers.h"
 #include "memory/MemorySettings.h"
+#include "platform/MemoryRead.h"
 
 namespace tessel {
 namespace {
@@ -60,12 +61,19 @@ void UntrackPointer(const void* p) {
     if (AllocTracker* tracker = Get(pointerTracker)) tracker->RemoveRecord(p);
 }
 
-// The size recorded is that at creation; the handle knows its own.
+// The size recorded is that at creation; the handle knows its own. The handle may be damaged, and other threads may
+// dispose of it meanwhile, so that its header is believed only when it can be read and the slot still leads to it.
 void HandleLeakDumper::DumpItemContents(const void* handle, uint32) {
     UHandle h = static_cast<UHandle>(const_cast<void*>(handle));
-    if (!masterPointers.Contains(h) || !IsLiveContent(SlotContent(h))) return;
-    FormatToOutput("Master Pointer: 0x%s\n", AddressText(*h).Text());
-    LeakDumper::DumpItemContents(*h, HandleLayout().SizeOf(*h));
+    if (!masterPointers.Contains(h)) return;
+    const uintptr_t content = SlotContent(h);
+    if (!IsLiveContent(content)) return;
+    const auto* const data = reinterpret_cast<const void*>(content);
+    HandleHeader header;
+    const bool isRead = platform::ReadMemory(HandleLayout().HeaderOf(data), &header, sizeof header) == sizeof header;
+    if (SlotContent(h) != content) return;
+    FormatToOutput("Master Pointer: 0x%s\n", AddressText(data).Text());
+    LeakDumper::DumpItemContents(data, isRead ? header.size : 0);
 }
 
 }  // namespace tessel

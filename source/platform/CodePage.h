@@ -16,6 +16,10 @@
 
 namespace tessel::platform {
 
+/* Whether TESSEL_CODEPAGE may have this value: the number or the name of a code page that the host knows. Throws
+   std::bad_alloc. */
+bool IsCodePageSetting(const char* value);
+
 constexpr std::uint32_t kCodePageUtf8 = 65001;
 
 /* One code page. `length` is how many bytes a character takes that begins with this byte (1 for a byte that begins

@@ -36,6 +36,10 @@ enum class Disposition {
    very call created may stay when another opener came between). A folder gives 5. */
 FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, Disposition disposition);
 
+/* Creates a file afresh that only this user may read or write. What of this user's has the name goes first: a link
+   itself, never what it leads to. 5, and nothing is touched, when it is another user's, or a folder. */
+FileHandle FileCreatePrivate(const char* name, std::uint32_t access);
+
 bool FileClose(FileHandle file);
 
 /* Move up to `count` bytes at the position, and the position with them. `actual` is set in every case. Reading ends

@@ -37,6 +37,10 @@ struct AddressEntry {
 /* Whose code (or data) lies at an address. False when no module holds it. */
 bool DescribeAddress(const void* address, AddressEntry& entry);
 
+/* Whether a module that is loaded covers the address. No lock, no system call, no allocation, where the host can tell
+   so; elsewhere always true. */
+bool IsInModule(const void* address) noexcept;
+
 /* Loads a library for run-time use. `name` is a plain file name (searched for as the host does) or a full name. Null
    with 126 when it cannot be loaded. A symbol that is not there gives null with 127. */
 using LibraryHandle = void*;

@@ -23,12 +23,14 @@ TEST(OVExcept, SaysWhatWhereAndWhy) {
 }
 
 TEST(OVExcept, LongTextsAreCut) {
+    const OVExcept deep(1, nullptr, ("/" + std::string(70, 'f') + "/paths/text/Name.cpp").c_str(), 1);
+    EXPECT_STREQ("OVExcept. Err=1, File=paths/text/Name.cpp, Line=1, Detail=''", deep.what()) << "whole folders";
     const std::string detail(127, 'd');
     const std::string tail = "0123456789012345678901234567.cpp";  // 32 characters
     const OVExcept e(1, (detail + "xx").c_str(), ("/very/long/" + tail).c_str(), 1);
     EXPECT_EQ(detail, e.Detail());
     EXPECT_EQ(tail.substr(1), e.File());
-    EXPECT_EQ("OVExcept. Err=1, File=" + tail.substr(1) + ", Line=1, Detail='" + detail + "'", e.what());
+    EXPECT_EQ("OVExcept. Err=1, File=/very/long/" + tail + ", Line=1, Detail='" + detail + "'", e.what());
 }
 
 // Not inlined, so that each call has a frame.

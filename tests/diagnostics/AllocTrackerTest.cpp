@@ -302,6 +302,11 @@ TEST_F(AllocTrackerTest, ThreadsMakeAndReleaseTogether) {
     const auto totals = tracker.GetTotals();
     EXPECT_EQ(kThreads * kEach, totals.made);
     EXPECT_EQ(kThreads * kEach, totals.bytesMade);
+    TextDumper after;
+    tracker.AddRecord(At(8), 1, "f.cpp", 1);
+    tracker.DumpOne(At(8), &after);
+    EXPECT_NE(std::string::npos, after.text.find(' ' + std::to_string(kThreads * kEach + 1) + " "))
+        << "no number was lost";
     EXPECT_GE(totals.mostLive, kEach);
     EXPECT_LE(totals.mostLive, totals.made);
     EXPECT_EQ(totals.mostLive, totals.mostBytesLive) << "each is one byte";

@@ -48,13 +48,18 @@ TEST_F(DumpLeakInfoTest, MoreThanExpectedAreWrittenToTheFile) {
     const std::string big(300, 'b');
     tracker->AddRecord(object, sizeof object, "maker.cpp", 77);
     tracker->AddRecord(big.data(), 300, "maker.cpp", 78);
-    drive.Put("leaks.txt", "what was there before");
+    drive.Put("target.txt", "what was there before");
+    std::filesystem::create_symlink(drive.Native("target.txt"), drive.Native("leaks.txt"));
     DumpLeakInfo(tracker, 1, "Thing Leaks", "leaks.txt");
     const Texts infos = recorder.Texts(kDebugInfo);
     ASSERT_EQ(1u, infos.size());
     EXPECT_TRUE(infos[0].ends_with("\\leaks.txt(1) : 2 Thing Leaks (1 expected)")) << infos[0];
     EXPECT_EQ(Texts{"We got 1 more Thing Leaks than we see from a basic launch and quit.\n"},
               recorder.Texts(kDebugError));
+    const auto status = std::filesystem::symlink_status(drive.Native("leaks.txt"));
+    EXPECT_EQ(std::filesystem::file_type::regular, status.type()) << "the link is gone, and not followed";
+    EXPECT_EQ(std::filesystem::perms(0600), status.permissions());
+    EXPECT_EQ("what was there before", drive.Get("target.txt"));
     const std::string text = drive.Get("leaks.txt");
     EXPECT_EQ(0u, text.find("****************************************\n** List of currently allocated Thing Leaks"));
     EXPECT_NE(std::string::npos, text.find("File maker.cpp      ; Line 77    # "));
@@ -92,6 +97,10 @@ TEST_F(DumpLeakInfoTest, WithoutAFileTheSummaryStays) {
     EXPECT_EQ(Texts(3, "We got 1 more Thing Leaks than we see from a basic launch and quit.\n"),
               recorder.Texts(kDebugError));
     EXPECT_EQ(1u, recorder.CountAt(kDebugInfo)) << "the one whose location is good";
+    EXPECT_EQ(1u, recorder.CountAt(kDebugWarning)) << "and which could not be created";
+    DumpLeakInfo(tracker, INT32_MIN, "Thing Leaks", nullptr);
+    EXPECT_TRUE(
+        recorder.Has(kDebugError, "We got 2147483649 more Thing Leaks than we see from a basic launch and quit.\n"));
 }
 
 std::string Failure(int32 code, const char* name, bool addTxt) {

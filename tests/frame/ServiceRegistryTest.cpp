@@ -2,6 +2,7 @@
 #include <tessel/frame/ServiceRegistry.h>
 
 #include <memory>
+#include <new>
 #include <string>
 #include <vector>
 
@@ -20,6 +21,7 @@ public:
     explicit Service(const char* name, std::vector<IServiceObject*> needs = {}) : name_(name), needs_(needs) {}
     MgErr Init() override {
         theLog += std::string("+") + name_ + ' ';
+        if (initResult == kThrows) throw std::bad_alloc();
         return initResult;
     }
     MgErr Uninit() override {
@@ -32,6 +34,7 @@ public:
     }
     void Needs(IServiceObject* service) { needs_.push_back(service); }
 
+    static constexpr MgErr kThrows = -99;
     MgErr initResult = kNoErr;
     MgErr uninitResult = kNoErr;
 
@@ -159,11 +162,24 @@ TEST_F(ServiceRegistryTest, ADependencyMayRunInAnotherRegistry) {
     EXPECT_EQ(kNoErr, upper->InitServices());
     EXPECT_EQ("+C +F +B ", theLog);
     upper->UninitServices();
+
+    const Registry other = MakeRegistry({&c});
+    c.initResult = Service::kThrows;
+    EXPECT_EQ(kMemFullErr, other->InitServices());
+    EXPECT_TRUE(recorder.Has(kDebugInfo, "ServiceRegistry: Service C init failed with error 2"));
+    c.initResult = kNoErr;
+    other->InitServices();
+    other->UninitServices();
+    EXPECT_EQ(kNoErr, upper->InitServices());
+    EXPECT_EQ("+C +F +B -B -F +C +C -C +F +B ", theLog) << "C runs while one registry runs it";
+    upper->UninitServices();
+
     lower->UninitServices();
     recorder.Clear();
+    theLog.clear();
     EXPECT_EQ(kNoErr, upper->InitServices());
     EXPECT_EQ(missing, recorder.Texts(kDebugFatal));
-    EXPECT_EQ("+C +F +B -B -F -C ", theLog);
+    EXPECT_EQ("", theLog);
 }
 
 TEST_F(ServiceRegistryTest, ACycleDropsTheRegistrationsButStartsTheOthers) {

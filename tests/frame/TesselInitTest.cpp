@@ -4,6 +4,7 @@
 #include <tessel/memory/MemoryManager.h>
 
 #include <algorithm>
+#include <array>
 #include <filesystem>
 #include <fstream>
 #include <map>
@@ -72,6 +73,38 @@ TEST_F(TesselInitTest, OutOfTurnNothingHappens) {
     EXPECT_EQ(kNoErr, UninitTesselAppSupport());
     EXPECT_EQ(kNoErr, UninitTesselBase());
     EXPECT_EQ(0u, recorder.Count());
+}
+
+TEST_F(TesselInitTest, TheBaseStopsWhatStandsOnIt) {
+    for (int round = 0; round < 2; ++round) {
+        EXPECT_EQ(kNoErr, InitTesselBase());
+        EXPECT_EQ(kNoErr, InitTesselAppSupport());
+        EXPECT_EQ(kNoErr, UninitTesselBase());
+        EXPECT_EQ(kNoErr, UninitTesselAppSupport()) << "nothing is left to stop";
+    }
+    EXPECT_EQ(0u, recorder.CountAt(kDebugError));
+}
+
+TEST_F(TesselInitTest, SettingsThatAreNotUnderstoodAreReported) {
+    for (const auto& [variable, good, bad] :
+         std::vector<std::array<const char*, 3>>{{"OVGuardBytes", "off", "on"},
+                                                 {"OVGuardBytes_Ptr", "alloc", "Check"},
+                                                 {"OVHandleCheck", "resize", "3"},
+                                                 {"OV_ALLOC_TRACKER", "", "OFF"},
+                                                 {"OV_USE_MALLOC", "0", "yes"},
+                                                 {"TESSEL_DRIVES", "C=/;;t=/tmp", "C=/;TT=/tmp"},
+                                                 {"TESSEL_UNC", "/srv", "srv"},
+                                                 {"TESSEL_CODEPAGE", "cp932", "klingon"},
+                                                 {"TESSEL_REGISTRY", "/tmp", "registry"}}) {
+        for (const char* value : {good, bad}) {
+            recorder.Clear();
+            setenv(variable, value, 1);
+            { test::StartedLibrary library; }
+            unsetenv(variable);
+            const Texts expected = {std::string(variable) + '=' + value + " is not understood; the default holds."};
+            EXPECT_EQ(value == good ? Texts() : expected, recorder.Texts(kDebugWarning));
+        }
+    }
 }
 
 TEST_F(TesselInitTest, AHandleLeftBehindIsReported) {

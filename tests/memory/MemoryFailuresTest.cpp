@@ -1,7 +1,9 @@
 // What happens when memory runs out at any point, when threads meet, and when something is left.
 #include <gmock/gmock.h>
+#include <malloc.h>
 
 #include <algorithm>
+#include <atomic>
 #include <cstdlib>
 #include <cstring>
 #include <functional>
@@ -24,6 +26,11 @@
 #include "support/StartedMemory.h"
 
 namespace tessel {
+
+namespace test {
+void MakeAndDisposeWithoutFrames(unsigned rounds);
+}
+
 namespace {
 
 using ::testing::Contains;
@@ -201,6 +208,41 @@ std::vector<bool> StacksThatBeginThere(const std::string& report) {
         results.push_back(address > begin && address < begin + 16384);
     }
     return results;
+}
+
+TEST(LeakReports, BearDamagedHandlesAndThoseThatGoMeanwhile) {
+    test::ScratchDrive drive;
+    setenv("TMPDIR", drive.Native().c_str(), 1);
+    test::StartedMemory memory;
+    UHandle const h = DSNewHandle(8);
+    const UPtr data = *h;
+    for (uintptr_t bad : {uintptr_t{2}, uintptr_t{0x1000}, ~uintptr_t{1}}) {
+        *h = reinterpret_cast<UPtr>(bad);
+        MemDumpTracker();
+        EXPECT_NE(std::string::npos, drive.Get("ovHandleLeaks.txt").find("\nMemory Contents: \n"));
+    }
+    *h = data;
+    std::atomic<bool> done{false};
+    std::thread maker([&] {
+        for (int round = 0; round < 40; ++round) {
+            UHandle handles[64];
+            for (UHandle& each : handles) each = DSNewHandle(1 << 20);
+            for (UHandle each : handles) DSDisposeHandle(each);
+        }
+        done = true;
+    });
+    while (!done) MemDumpTracker();
+    maker.join();
+    EXPECT_EQ(kNoErr, DSDisposeHandle(h));
+    unsetenv("TMPDIR");
+}
+
+TEST(LeakReports, CallsWithoutFramesTakeNoMemory) {
+    test::StartedMemory memory;
+    test::MakeAndDisposeWithoutFrames(1000);
+    const size_t before = mallinfo2().uordblks;
+    test::MakeAndDisposeWithoutFrames(100000);
+    EXPECT_LT(mallinfo2().uordblks, before + (64 << 10));
 }
 
 TEST(LeakReports, BeginWithTheCallerOfTheLibrary) {

@@ -28,7 +28,8 @@ public:
     int32 Line() const noexcept { return line_; }
     const CallStack& Stack() const noexcept { return stack_; }
 
-    /// "OVExcept. Err=<code>, File=<file>, Line=<line>, Detail='<detail>'", cut at 255 bytes.
+    /// "OVExcept. Err=<code>, File=<file>, Line=<line>, Detail='<detail>'", cut at 255 bytes. Of a file name of more
+    /// than 80 bytes it shows the last folders.
     const char* what() const noexcept override { return what_; }
 
 private:

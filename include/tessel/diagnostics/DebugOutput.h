@@ -19,14 +19,15 @@ typedef int32 _DebugOutputLevel;
 
 /* Takes a report: source file and line of the reporting site, its identifier (the function's name), the level, the
    site's own constant, and the text. The texts live for the duration of the call. It may be called by several threads
-   at once, and may itself lead to further reports. */
+   at once, and may itself lead to further reports: eight deep, beyond that they get the default behaviour. It must not
+   throw: reports are made where nothing may be thrown, so that an exception can end the process (std::terminate). */
 typedef void (*DebugOutputHandler)(CStr file, int32 line, CStr identifier, int32 level, uint32 siteCode, CStr text);
 
 TESSEL_BEGIN_C
 
 /* Installs the process-wide handler and returns it; null selects the default behaviour: the report is counted, one of
-   level 3 or 4 is sent to the debugger as "ERR <site code>: <file>(<line>): <text>", and level 4 ends the process.
-   May be called at any time, before the library is started too. */
+   level 3 or 4 is sent to the debugger as a line "ERR <site code>: <file>(<line>): <text>", and level 4 ends the
+   process. May be called at any time, before the library is started too. */
 TESSEL_API DebugOutputHandler DebugOutputSetHandler(DebugOutputHandler handler);
 
 /* The handler installed; null when there is none. */

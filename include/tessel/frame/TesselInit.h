@@ -12,7 +12,8 @@ TESSEL_BEGIN_C
    the service that failed. Once until undone. */
 TESSEL_API MgErr InitTesselBase(void);
 
-/* Stops them in the reverse order, with the leak reports. Always 0. */
+/* Stops them in the reverse order, with the leak reports; application support first when it is still started. Always 0.
+ */
 TESSEL_API MgErr UninitTesselBase(void);
 
 /* Starts configuration, threads and resources. Does nothing before InitTesselBase, and when they are started. Always 0.

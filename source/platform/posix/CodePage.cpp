@@ -297,6 +297,12 @@ const CodePageTables& LoadCodePage() noexcept {
 
 }  // namespace detail
 
+bool IsCodePageSetting(const char* value) {
+    const std::uint32_t number = CodePageNumber(value);
+    MutexHolder holder(pagesMutex);
+    return number && FindPage(number);
+}
+
 bool SetCodePage(std::uint32_t codePage) {
     MutexHolder holder(pagesMutex);
     const CodePageTables* tables = FindPage(codePage);

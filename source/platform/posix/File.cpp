@@ -103,10 +103,10 @@ bool ShareAllows(int descriptor, std::uint32_t access, std::uint32_t deny, bool 
 
 // ---- opening --------------------------------------------------------------------------------------------------------
 
-int OpenRetrying(const char* native, int flags) {
+int OpenRetrying(const char* native, int flags, mode_t mode = 0666) {
     int descriptor;
     do {
-        descriptor = systemCalls.open(native, flags | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, 0666);
+        descriptor = systemCalls.open(native, flags | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, mode);
     } while (descriptor < 0 && errno == EINTR);
     return descriptor;
 }
@@ -152,6 +152,15 @@ bool Admit(int descriptor, std::uint32_t access, std::uint32_t deny, bool readab
     return true;
 }
 
+/* Removes what has the name, when it is this user's and no folder. True also when there is nothing. */
+bool RemoveOwn(const char* native) {
+    struct statx status;
+    if (systemCalls.statx(AT_FDCWD, native, AT_SYMLINK_NOFOLLOW, STATX_TYPE | STATX_UID, &status) != 0)
+        return errno == ENOENT || FailErrno();
+    if (S_ISDIR(status.stx_mode) || status.stx_uid != ::geteuid()) return FailWith(kErrorAccessDenied);
+    return systemCalls.unlink(native) == 0 || errno == ENOENT || FailErrno();
+}
+
 }  // namespace
 
 FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, Disposition disposition) {
@@ -184,6 +193,18 @@ FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, 
     if (descriptor < 0) return kNoFile;
     if (Admit(descriptor, access, deny, readable, empties)) return HandleOf(descriptor, access);
     systemCalls.close(descriptor);
+    return kNoFile;
+}
+
+FileHandle FileCreatePrivate(const char* name, std::uint32_t access) {
+    std::string native;
+    if (!NameToNativeText(name, native)) return kNoFile;
+    MatchOnDisk(native);
+    if (!RemoveOwn(native.c_str())) return kNoFile;
+    /* Whoever puts something there in between is refused, a link too. */
+    const int descriptor = OpenRetrying(native.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
+    if (descriptor >= 0) return HandleOf(descriptor, access);
+    FailWith(errno == EEXIST ? kErrorAccessDenied : ErrorOfErrno(errno));
     return kNoFile;
 }
 

@@ -118,6 +118,15 @@ bool DescribeAddress(const void* address, AddressEntry& entry) {
     return true;
 }
 
+bool IsInModule(const void* address) noexcept {
+#ifdef DLFO_STRUCT_HAS_EH_DBASE /* a C library that has _dl_find_object */
+    dl_find_object object;
+    return _dl_find_object(const_cast<void*>(address), &object) == 0;
+#else
+    return address != nullptr;
+#endif
+}
+
 LibraryHandle LibraryLoad(const char* name) {
     std::string file = name;
     bool plain = file.find_first_of("\\/:") == std::string::npos;
