@@ -148,6 +148,7 @@ TEST_F(PathText, FlatReading) {
     EXPECT_EQ("rel:x", Show(path));
     EXPECT_EQ("abs:", read(FTextToPath(nullptr, 5, &path)));
     EXPECT_EQ(kArgErr, FTextToPath("a", 1, nullptr));
+    EXPECT_EQ(kArgErr, FTextToPath("a", -1, &path));
     EXPECT_EQ("abs:C/y", read(ConvertPlatformIndependentTextToPath(&path, "/C/y")));
     EXPECT_EQ("abs:", read(FStringToPath(nullptr, &path)));
     EXPECT_EQ(0u, reports_.Count());
@@ -213,7 +214,10 @@ TEST_F(PathText, NamesForTheSystem) {
     for (const PathRef& path : {Abs({}), Abs({"CC"}), Abs({"1"}), Rel({"C"}), PathRef(), Abs({"C", "con"}),
                                 Abs({"C", "lpt9", "x"}), Abs({"C", "a?b"}), Abs({"C", "x."}), Abs({".."})})
         EXPECT_EQ("1", made(path)) << Show(path);
-    for (const std::string& text : {std::string("C:\\dir\\a\0.txt", 13), std::string("\\\\s\0\\t\\x", 9)})
+    for (const std::string& text :
+         {std::string("C:\\dir\\a\0.txt", 13), std::string("\\\\s\0\\t\\x", 9),
+          std::string("\\\\s\\h\\..\\..\\etc\\passwd"), std::string("\\\\s\\h\\..\\x"), std::string("\\\\..\\h\\x"),
+          std::string("\\\\s\\..\\x"), std::string("\\\\s\\h?\\x")})
         EXPECT_EQ("1", made(PathRef(text, PathRef::StringDisplay())));
     const auto ofLength = [](size_t length) { return Abs({"C", std::string(length - 3, 'x').c_str()}); };
     EXPECT_EQ(259u, made(ofLength(259)).size());
