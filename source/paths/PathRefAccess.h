@@ -24,7 +24,8 @@ struct PathRefAccess {
         return path;
     }
 
-    // Appends names of a path from the given one on, as they are. Raises `detail` when memory is short.
+    // Appends names of a path from the given one on; an up-directory element steps up. Raises `detail` when memory is
+    // short.
     static void AppendNames(PathRef& path, const PathItemList& names, int32 first, const char* detail);
 };
 

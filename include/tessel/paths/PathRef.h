@@ -164,7 +164,8 @@ public:
     PathRef GetInCommonWith(const PathRef& other, ComparePolicy policy) const; /* the longest common leading part */
     PathRef GetRelativePathFromThisToThat(const PathRef& that, ComparePolicy policy) const;
 
-    /* When this path starts with `from`, puts `to` in the place of that part. */
+    /* When this path starts with `from`, puts `to` in the place of that part. Up-directory elements that follow it
+       remove names of `to`. */
     bool Rebase(const PathRef& from, const PathRef& to, ComparePolicy policy);
 
     /* Splits where the criteria say. Either part may be null. False: nowhere, and the parts become not-a-path. */
