@@ -10,6 +10,7 @@
 #include "diagnostics/Guarded.h"
 #include "paths/PathItemStorage.h"
 #include "paths/PathRefAccess.h"
+#include "paths/PathSteps.h"
 #include "paths/Service.h"
 
 namespace tessel {
@@ -23,6 +24,9 @@ constexpr BaseName kBaseNames[] = {{PathRef::kAbsolute, "[absolute]"},
                                    {PathRef::kRelative, "[relative]"},
                                    {PathRef::kUNC, "[unc]"},
                                    {PathRef::kNullPath, "[NULL]"}};
+
+static_assert(kSeparatorNotFound == PathRef::StringType::npos,
+              "kSeparatorNotFoundConstantDoNotUse is not the same as PathRef::StringType::npos");
 
 std::atomic<bool> gStarted{false};
 std::atomic<AllocTracker*> gPathTracker{nullptr};

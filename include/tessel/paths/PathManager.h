@@ -128,7 +128,8 @@ TESSEL_API MgErr FVolName(Path path, Path result);
 TESSEL_API int32 FFlattenPath(Path path, uint8* bytes);
 
 /* Reads a flattened path and returns its size. The second form never reads beyond `length` bytes; use it for what comes
-   from outside. The null path gives null. On failure 0, or length + 1, and *path is unchanged. */
+   from outside. The null path gives null. On failure 0, or length + 1, and *path is unchanged. A length of INT32_MAX
+   counts as one less, so that length + 1 is a number. */
 TESSEL_API int32 FUnFlattenPath(const uint8* bytes, Path* path);
 TESSEL_API int32 FUnFlattenPath2(const uint8* bytes, Path* path, int32 length);
 
