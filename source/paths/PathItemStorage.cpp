@@ -260,13 +260,9 @@ void PathItemStorage::Stop() {
 // ---- slots ----------------------------------------------------------------------------------------------------------
 
 PathItemElement* PathItemStorage::Allocate() {
-    PathItemElement* element = nullptr;
-    {
-        ThMutexHolder lock(gStorageMutex);
-        element = ClaimAnySlot();
-        if (!element && NewBlock()) element = ClaimSlot(*gCurrentBlock);
-    }
-    if (!element) TESSEL_REPORT(kDebugError, 0x5E0B77D9u) << "Out of memory!";
+    ThMutexHolder lock(gStorageMutex);
+    PathItemElement* element = ClaimAnySlot();
+    if (!element && NewBlock()) element = ClaimSlot(*gCurrentBlock);
     return element;
 }
 

@@ -10,6 +10,9 @@ namespace tessel {
 
 struct PathRefAccess {
     static PathItemElement* Element(const PathRef& path) { return path.mPathElement; }
+    // What GetCachedProxy finds, held so that it stays while it is used. No lock is held while items are asked.
+    static SharedCachedItem CachedItem(const PathRef& path, const char* key, const char* className,
+                                       PathRef::SearchDirection direction, PathItemElement** foundAt = nullptr);
     static std::string& TextCache(PathRef& path) { return path.TextCache(); }
 
     // A path to an element that is retained for it already, or that it has to retain.

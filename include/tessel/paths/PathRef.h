@@ -219,7 +219,9 @@ public:
     bool IsSpecial() const; /* false */
     void ResolveShortcuts(ResolveMethod method);
     PathRef GetLongNames() const;
-    PathRef GetCorrectedCase(double seconds) const; /* each name as the disk has it; remembered for so long */
+    /* Each name as the disk has it; remembered for so long. Raises 1 for a path of more than 259 bytes, or with a name
+       that no file can have. */
+    PathRef GetCorrectedCase(double seconds) const;
     MgErr MakeWriteable(WriteableDepth depth) const;
     MgErr RemoveFile(ResolveAction action);
     MgErr CopyFileTo(const PathRef& to, ResolveAction action) const;
