@@ -135,9 +135,9 @@ MgErr PathManagerStop() {
     });
 }
 
-void TrackPathObject(const void* object, size_t size) {
+void TrackPathObject(const void* frame, const void* object, size_t size) {
     if (AllocTracker* tracker = gPathTracker.load(std::memory_order_acquire))
-        tracker->AddRecord(object, static_cast<uint32>(size), __FILE__, __LINE__);
+        tracker->AddRecordFrom(frame, object, static_cast<uint32>(size), __FILE__, __LINE__);
 }
 
 void UntrackPathObject(const void* object) {

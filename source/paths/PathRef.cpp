@@ -159,13 +159,13 @@ void PathRef::DisposePath(Path& path) {
 
 void* PathRef::operator new(size_t size) {
     void* address = TrackedNew(size);
-    TrackPathObject(address, size);
+    TrackPathObject(__builtin_frame_address(0), address, size);
     return address;
 }
 
 void* PathRef::operator new(size_t size, const std::nothrow_t&) noexcept {
     void* address = TrackedNewNoThrow(size);
-    if (address) TrackPathObject(address, size);
+    if (address) TrackPathObject(__builtin_frame_address(0), address, size);
     return address;
 }
 

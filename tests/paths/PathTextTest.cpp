@@ -105,13 +105,15 @@ TEST_F(PathText, Read) {
         EXPECT_EQ(shown, Read(text, ("pathref_" + std::string(format)).c_str())) << format << " " << text;
     EXPECT_EQ(1, PathRef("a/b", PathRef::StringDisplay()).ItemCount());
     EXPECT_EQ(2, PathRef("a/b", PathRef::StringPlatformAgnostic()).ItemCount());
-    try {
-        PathRef("", PathRef::StringCommandLine());
-        FAIL();
-    } catch (const OVExcept& e) {
-        EXPECT_EQ(kArgErr, e.Code());
-        EXPECT_STREQ("Empty command line strings cannot be converted to Path", e.Detail());
-    }
+    const auto detail = [](const char* text, const char* format) {
+        try {
+            return Show(PathRef(text, format));
+        } catch (const OVExcept& e) {
+            return std::string(e.Detail());
+        }
+    };
+    EXPECT_EQ("Empty command line strings cannot be converted to Path", detail("", PathRef::StringCommandLine()));
+    EXPECT_EQ("PathRef from string constructor: unknown format \"C:\\x\"", detail("pathref_unix", "C:\\x"));
 }
 
 // 0x5C is the second byte of many characters in the Japanese code page, and a backslash alone.

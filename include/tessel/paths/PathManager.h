@@ -4,6 +4,9 @@
    takes one, and says what it does with it. An out-parameter `Path` is changed in place, a `Path*` is made when it is
    null. Any thread; one Path is changed by one thread at a time.
 
+   A path can hold any number of names; the functions that ask the disk answer kArgErr for one of more than 259 bytes
+   as display text.
+
    A name is a PStr in the active code page. Appending ".." or the empty name removes the last name; where there is none
    to remove, it adds an up-directory element, which counts as a name and is empty. Appending "." changes nothing. */
 #ifndef TESSEL_PATHS_PATHMANAGER_H

@@ -9,6 +9,9 @@
    A name is bytes in the active code page. Appending ".." or the empty name removes the last name; where there is none
    to remove, it becomes an up-directory element, an element with an empty name. Appending "." changes nothing.
 
+   A path can hold any number of names. The system takes paths of at most 259 bytes as display text: what asks the disk
+   answers 1 for a longer one.
+
    Failures raise OVExcept unless a member returns MgErr. A PathRef may be read (const members, copying) by many
    threads, and changed by one at a time, as an int. Usable between start and stop of the library. */
 #ifndef TESSEL_PATHS_PATHREF_H
@@ -87,8 +90,8 @@ public:
     explicit PathRef(const char* standardLocationName);
     MgErr AssignToName(const char* name) const;
 
-    /* Reads text in a format (the String... names below). Raises 53 for an unknown format, 1 for text that gives no
-       valid path. */
+    /* Reads text in a format (the String... names below). Raises 53 for an unknown format, which it names, 1 for text
+       that gives no valid path. */
     PathRef(const StringType& text, const char* format);
 
     /* Reads a flattened path, "PTH0" or "PTH1", in the byte order of the Endianizer. Raises the buffer's error, or 74
