@@ -137,7 +137,8 @@ TESSEL_API int32 FUnFlattenPath(const uint8* bytes, Path* path);
 TESSEL_API int32 FUnFlattenPath2(const uint8* bytes, Path* path, int32 length);
 
 /* ---- texts for what has no text ------------------------------------------------------------------------------------
-   Buffers of 256 bytes, copied. Empty until set; to be set during start-up. PathRef has a pair of its own. */
+   Buffers of 256 bytes, copied; null gets nothing, and sets the empty text. Empty until set; to be set during start-up.
+   PathRef has a pair of its own. */
 TESSEL_API void FGetNotAPathString(PStr text);
 TESSEL_API void FSetNotAPathString(ConstPStr text);
 TESSEL_API void FGetPathTooLongString(PStr text);
