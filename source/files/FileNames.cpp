@@ -177,6 +177,7 @@ MgErr NativeToPath(CStr native, Path* path) {
     return Guarded([&]() -> MgErr {
         std::string absolute, name;
         if (!AbsoluteNative(native, &absolute)) return Win32ToOVFileErr();
+        if (absolute.find('\\') != std::string::npos) return kArgErr;  // would read as a separator
         if (!platform::NativeToName(absolute, name)) return Win32ToOVFileErr();
         return NameToPath(name, path);
     });

@@ -6,10 +6,13 @@
 #include <tessel/paths/PathCachedItem.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
+#include <tessel/paths/PathTextFormat.h>
 
 #include <memory>
+#include <vector>
 
 #include "files/FileSupport.h"
+#include "paths/PathRefAccess.h"
 #include "platform/FileSystem.h"
 #include "platform/System.h"
 
@@ -28,10 +31,10 @@ Path Flat(const PathRef& path) {
 
 // Whether the host has cached that this item, or a folder that it would be in, does not exist.
 bool IsKnownToBeMissing(const PathRef& path) {
-    const PathRef::CacheLock lock;
     for (const auto direction : {PathRef::kSearchHere, PathRef::kSearchUp}) {
-        const auto* flavor = static_cast<const CachedPathFlavor*>(
-            path.GetCachedProxy(kPathFlavorKey, CachedPathFlavor::ClassName(), direction));
+        const SharedCachedItem item =
+            PathRefAccess::CachedItem(path, kPathFlavorKey, CachedPathFlavor::ClassName(), direction);
+        const auto* flavor = static_cast<const CachedPathFlavor*>(item.get());
         if (flavor) return !flavor->IsFile() && !flavor->IsFolder();
     }
     return false;
@@ -54,25 +57,40 @@ PathRef Resolved(const PathRef& path) {
 
 // The corrected path that was cached, if any.
 bool FindCorrectedCase(const PathRef& path, PathRef* corrected) {
-    const PathRef::CacheLock lock;
     const auto direction = PathRef::kSearchHere;
-    if (path.GetCachedProxy(kCaseIsCorrectKey, PathRef::CachedBool::ClassName(), direction)) {
+    if (PathRefAccess::CachedItem(path, kCaseIsCorrectKey, PathRef::CachedBool::ClassName(), direction)) {
         *corrected = path;
         return true;
     }
-    const auto* cached = static_cast<const PathRef::CachedPath*>(
-        path.GetCachedProxy(kCorrectedCaseKey, PathRef::CachedPath::ClassName(), direction));
-    if (cached) *corrected = cached->Get();
+    const SharedCachedItem cached =
+        PathRefAccess::CachedItem(path, kCorrectedCaseKey, PathRef::CachedPath::ClassName(), direction);
+    if (cached) *corrected = static_cast<const PathRef::CachedPath*>(cached.get())->Get();
     return cached != nullptr;
 }
 
+// Negative and NaN count as 0, and what is too long as the longest lifetime.
+uint32 Milliseconds(double seconds) {
+    const double milliseconds = seconds * 1000.0;
+    if (!(milliseconds > 0)) return 0;
+    return milliseconds < INT32_MAX ? static_cast<uint32>(milliseconds) : uint32{INT32_MAX};
+}
+
 void CacheCorrectedCase(const PathRef& path, const PathRef& corrected, double seconds) {
-    const auto lifetime = static_cast<uint32>(seconds * 1000.0);
+    const auto lifetime = Milliseconds(seconds);
     const auto relation = PathRef::CachedItem::kDependsOnFile;
     if (corrected.Equals(path, PathRef::kExact))
         path.Cache(kCaseIsCorrectKey, new PathRef::CachedBool(lifetime, relation, true));
     else
         path.Cache(kCorrectedCaseKey, new PathRef::CachedPath(lifetime, relation, corrected));
+}
+
+// Whether the system has room for a name of the path: each name takes at least one byte of it.
+bool CanBeAsked(const PathRef& path) {
+    char name[kMaxDOSPathName];
+    if (!path.StartsWith(PathRef::kRelative)) return MakeDOSPathName(Flat(path), name, 0) == kNoErr;
+    std::string text;
+    return path.ItemCount() < kMaxDOSPathName && !path.ConvertToString(&text, PathRef::StringCommandLine()) &&
+           text.size() < kMaxDOSPathName;
 }
 
 // The last name as the folder lists it; an item that is not there keeps the name it was given.
@@ -173,12 +191,22 @@ PathRef PathRef::GetLongNames() const {
 }
 
 PathRef PathRef::GetCorrectedCase(double seconds) const {
-    PathRef corrected;
     if (!IsValid() || ItemCount() == 0) return *this;
-    if (FindCorrectedCase(*this, &corrected)) return corrected;
-    corrected = GetParentDirectory().GetCorrectedCase(seconds);
-    corrected.Append(ListedName(*this));
-    CacheCorrectedCase(*this, corrected, seconds);
+    if (!CanBeAsked(*this)) TESSEL_THROW(kArgErr, "Unable to get DOS Path");
+    // Up to what is known already, and down again.
+    PathRef corrected;
+    std::vector<PathRef> unknown;
+    for (PathRef path(*this); !FindCorrectedCase(path, &corrected); path = path.GetParentDirectory()) {
+        if (path.ItemCount() == 0) {
+            corrected = path;
+            break;
+        }
+        unknown.push_back(path);
+    }
+    for (; !unknown.empty(); unknown.pop_back()) {
+        corrected.Append(ListedName(unknown.back()));
+        CacheCorrectedCase(unknown.back(), corrected, seconds);
+    }
     return corrected;
 }
 

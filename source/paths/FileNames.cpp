@@ -4,6 +4,7 @@
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathTextFormat.h>
 
+#include <algorithm>
 #include <cstring>
 
 #include "diagnostics/Guarded.h"
@@ -48,10 +49,23 @@ bool IsShortcutName(std::string_view name) {
            EqualIgnoringCase(name.substr(name.size() - kShortcutSuffix.size()), kShortcutSuffix);
 }
 
+// Whether the name is two backslashes, a server and a share, which may be empty. Without them, or with steps up in
+// their place, the text would name an item of this machine.
+bool IsServerAndShare(std::string_view name) {
+    if (name.substr(0, 2) != "\\\\") return false;
+    for (size_t begin = 2, end; begin < name.size(); begin = end + 1) {
+        end = std::min(FindCharacter(name, '\\', begin), name.size());
+        const std::string_view part = name.substr(begin, end - begin);
+        const bool onlyDots = part.find_first_not_of('.') == std::string_view::npos;
+        if (onlyDots || (CheckFileName(part, nullptr) & kFileNameBadChar)) return false;
+    }
+    return name.size() > 2;
+}
+
 // The drive with its colon, or the server and share. False when there can be no such volume.
 bool AppendVolume(std::string& text, const PathRef& path, const std::string& name) {
     text = name;
-    if (!path.StartsWith(PathRef::kAbsolute)) return true;
+    if (!path.StartsWith(PathRef::kAbsolute)) return IsServerAndShare(name);
     text += ':';
     return name.size() == 1 && IsAsciiLetter(name[0]);
 }

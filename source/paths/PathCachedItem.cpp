@@ -3,18 +3,30 @@
 
 #include <tessel/time/Millisecs.h>
 
+#include <algorithm>
 #include <cstring>
-#include <new>
+#include <utility>
 
 #include "diagnostics/Guarded.h"
 #include "paths/PathRefAccess.h"
 
 namespace tessel {
 
+namespace {
+
+// Expiry is found by comparing ticks that wrap, which tells no more than this apart.
+constexpr uint32 kLongestLifetime = INT32_MAX;
+
+uint32 ExpiryAfter(uint32 lifetime) {
+    return MilliSecs() + std::min(lifetime, kLongestLifetime);
+}
+
+}  // namespace
+
 // ---- CachedItem -----------------------------------------------------------------------------------------------------
 
 PathRef::CachedItem::CachedItem(uint32 lifetime, RelationToMetaData relation)
-    : expiry_(MilliSecs() + lifetime), invalidate_(relation == kDependsOnFile) {
+    : expiry_(ExpiryAfter(lifetime)), invalidate_(relation == kDependsOnFile) {
 }
 
 PathRef::CachedItem::~CachedItem() = default;
@@ -36,7 +48,7 @@ bool PathRef::CachedItem::Invalidate() const {
 }
 
 void PathRef::CachedItem::Reset(uint32 lifetime) {
-    expiry_ = MilliSecs() + lifetime;
+    expiry_ = ExpiryAfter(lifetime);
 }
 
 uint32 PathRef::CachedItem::Size() const {
@@ -149,105 +161,141 @@ void PathRef::CachedPath::ResetPath(uint32 lifetime, const PathRef& value) {
 
 namespace {
 
-// The item of that key and class on one element, unless it has expired. With the path mutex held.
-PathRef::CachedItem* FindItem(PathItemElement& element, const char* key, const char* className) {
+SharedCachedItem ItemOn(PathItemElement& element, const char* key) {
+    PathLock lock;
     if (!element.Cache()) return nullptr;
     const auto found = element.Cache()->items.find(std::string_view(key));
-    if (found == element.Cache()->items.end()) return nullptr;
-    PathRef::CachedItem* item = found->second.get();
-    return !item->Expired() && item->IsA(className) ? item : nullptr;
+    return found == element.Cache()->items.end() ? nullptr : found->second;
 }
 
-PathItemElement* FindUp(PathItemElement* element, const char* key, const char* className) {
-    while (element && !FindItem(*element, key, className)) element = element->Parent();
-    return element;
-}
+struct FoundItem {
+    PathItemElement* element;
+    SharedCachedItem item;
+};
+using FoundItems = std::vector<FoundItem, TrackedAllocator<FoundItem>>;
 
-PathItemElement* FindDown(PathItemElement* element, const char* key, const char* className) {
+// The items under the key on an element and all below it.
+FoundItems ItemsBelow(PathItemElement* element, const char* key) {
+    FoundItems items;
     std::vector<PathItemElement*, TrackedAllocator<PathItemElement*>> waiting{element};
+    PathLock lock;
     while (!waiting.empty()) {
         element = waiting.back();
         waiting.pop_back();
-        if (FindItem(*element, key, className)) return element;
+        if (SharedCachedItem item = ItemOn(*element, key)) items.push_back({element, std::move(item)});
         for (int32 i = element->ChildCount(); i-- > 0;) waiting.push_back(element->ChildAt(i));
     }
-    return nullptr;
+    return items;
 }
 
-PathItemElement* FindAround(PathItemElement* element, const char* key, const char* className,
-                            PathRef::SearchDirection direction) {
-    if (direction == PathRef::kSearchUp) return FindUp(element, key, className);
-    if (direction == PathRef::kSearchDown) return FindDown(element, key, className);
-    return FindItem(*element, key, className) ? element : nullptr;
+bool IsWanted(const SharedCachedItem& item, const char* className) {
+    return item && !item->Expired() && item->IsA(className);
+}
+
+FoundItem FindItem(PathItemElement* element, const char* key, const char* className,
+                   PathRef::SearchDirection direction) {
+    if (direction == PathRef::kSearchDown) {
+        for (FoundItem& found : ItemsBelow(element, key))
+            if (IsWanted(found.item, className)) return std::move(found);
+        return {};
+    }
+    for (; element; element = direction == PathRef::kSearchUp ? element->Parent() : nullptr) {
+        SharedCachedItem item = ItemOn(*element, key);
+        if (IsWanted(item, className)) return {element, std::move(item)};
+    }
+    return {};
 }
 
 // Stores the item and gives back the one that was there.
-std::unique_ptr<PathRef::CachedItem> Exchange(PathItemElement& element, const char* key,
-                                              std::unique_ptr<PathRef::CachedItem> item) {
+SharedCachedItem Exchange(PathItemElement& element, const char* key, const SharedCachedItem& item) {
+    auto made = std::make_unique<PathItemCache>();
+    made->items.try_emplace(key, item);
     PathLock lock;
-    if (!element.Cache()) element.Cache() = std::make_unique<PathItemCache>();
-    PathItemCache::Map& items = element.Cache()->items;
-    PathRef::CachedItem* stored = item.get();
-    auto [position, inserted] = items.try_emplace(key, nullptr);
-    position->second.swap(item);
-    stored->Attached();
-    return item;
+    std::unique_ptr<PathItemCache>& cache = element.Cache();
+    if (!cache) {
+        cache.swap(made);
+        return nullptr;
+    }
+    const auto inserted = cache->items.insert(made->items.extract(made->items.begin()));
+    return inserted.inserted ? nullptr : std::exchange(inserted.position->second, item);
 }
 
-std::unique_ptr<PathRef::CachedItem> Remove(PathItemElement& element, const char* key) {
+SharedCachedItem Remove(PathItemElement& element, const char* key) {
     PathLock lock;
     if (!element.Cache()) return nullptr;
     PathItemCache::Map& items = element.Cache()->items;
     const auto found = items.find(std::string_view(key));
     if (found == items.end()) return nullptr;
-    std::unique_ptr<PathRef::CachedItem> item = std::move(found->second);
+    SharedCachedItem item = std::move(found->second);
     items.erase(found);
     if (items.empty()) element.Cache().reset();
     return item;
 }
 
+// Takes an item off its element; nothing happens when another stands there by now.
+void RemoveThis(PathItemElement& element, const std::string& key, const SharedCachedItem& item) {
+    PathLock lock;
+    if (!element.Cache()) return;
+    PathItemCache::Map& items = element.Cache()->items;
+    const auto found = items.find(key);
+    if (found == items.end() || found->second != item) return;
+    items.erase(found);
+    if (items.empty()) element.Cache().reset();
+}
+
 }  // namespace
 
+SharedCachedItem PathRefAccess::CachedItem(const PathRef& path, const char* key, const char* className,
+                                           PathRef::SearchDirection direction, PathItemElement** foundAt) {
+    if (foundAt) *foundAt = nullptr;
+    if (!path.mPathElement || !key || !className) return nullptr;
+    FoundItem found = FindItem(path.mPathElement, key, className, direction);
+    if (foundAt) *foundAt = found.element;
+    return std::move(found.item);
+}
+
 MgErr PathRef::Cache(const char* key, CachedItem* item) const {
-    std::unique_ptr<CachedItem> owned(item);  // what it is swapped for is deleted without the lock
+    std::unique_ptr<CachedItem> owned(item);
     if (!mPathElement || !key) return kArgErr;
     return Guarded([&]() -> MgErr {
-        owned = owned ? Exchange(*mPathElement, key, std::move(owned)) : Remove(*mPathElement, key);
+        SharedCachedItem previous;  // deleted without the lock
+        if (!owned) {
+            previous = Remove(*mPathElement, key);
+            return kNoErr;
+        }
+        const SharedCachedItem stored(std::move(owned));
+        previous = Exchange(*mPathElement, key, stored);
+        stored->Attached();
         return kNoErr;
     });
 }
 
 PathRef::CachedItem* PathRef::GetCachedProxy(const char* key, const char* className, SearchDirection direction,
                                              PathItemElement** foundAt) const {
-    if (foundAt) *foundAt = nullptr;
-    if (!mPathElement || !key || !className) return nullptr;
-    PathLock lock;
-    PathItemElement* element = FindAround(mPathElement, key, className, direction);
-    CachedItem* item = element ? FindItem(*element, key, className) : nullptr;
-    if (foundAt && item) *foundAt = element;
-    return item;
+    return GuardedOr<CachedItem*>(
+        nullptr, [&] { return PathRefAccess::CachedItem(*this, key, className, direction, foundAt).get(); });
 }
 
 uint32 PathRef::FlushCache() const {
     if (!mPathElement) return 0;
-    uint32 bytes = 0;
-    PathItemCache removed;  // destroyed without the lock: the items are the host's
+    std::unique_ptr<PathItemCache> everything;
+    PathItemCache::Map items;  // as they were: what they answer is asked without the lock
     {
         PathLock lock;
         mPathElement->GiveBackUnusedRoom();
         std::unique_ptr<PathItemCache>& cache = mPathElement->Cache();
         if (!cache) return 0;
-        PathItemCache::Map& items = cache->items;
-        for (auto position = items.begin(); position != items.end();) {
-            const auto next = std::next(position);
-            const CachedItem& item = *position->second;
-            if (item.Invalidate() || item.Expired()) {
-                bytes += item.Size();
-                removed.items.insert(items.extract(position));
-            }
-            position = next;
-        }
-        if (items.empty()) cache.reset();
+        const MgErr err = Guarded([&]() -> MgErr {
+            items = cache->items;
+            return kNoErr;
+        });
+        if (err) everything.swap(cache);  // without memory to ask, all go: a cache may forget
+    }
+    uint32 bytes = 0;
+    for (const auto& [key, item] : items) {
+        if (!item->Invalidate() && !item->Expired()) continue;
+        bytes += item->Size();
+        RemoveThis(*mPathElement, key, item);
     }
     return bytes;
 }

@@ -298,6 +298,7 @@ int32 FUnFlattenPath(const uint8* bytes, Path* path) {
 }
 
 int32 FUnFlattenPath2(const uint8* bytes, Path* path, int32 length) {
+    length = std::min(length, INT32_MAX - 1);  // leaves a value for failure
     MemInputBuf buffer(bytes, static_cast<uint32>(std::max(length, 0)));
     if (tessel::FUnFlattenPath2(&buffer, path, BigEndianizer())) return length + 1;
     return static_cast<int32>(buffer.GetBytesRead());

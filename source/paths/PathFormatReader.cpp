@@ -235,7 +235,9 @@ PathRef ReadText(const std::string& text, const char* format) {
     if (is(PathRef::StringUnix())) return PathFormatReaderUnix(text).Read();
     if (is(PathRef::StringPlatformIndependent())) return PathFormatReaderPlatformIndependent(text).Read();
     if (is(PathRef::StringPlatformAgnostic())) return ReadByGuessing(text);
-    TESSEL_THROW(kUnsupportedErr, "PathRef from string constructor");
+    std::string detail =
+        "PathRef from string constructor: unknown format \"" + std::string(format, strnlen(format, 64));
+    throw OVExcept(kUnsupportedErr, (detail + "\"").c_str(), __FILE__, __LINE__);
 }
 
 }  // namespace

@@ -76,6 +76,12 @@ PathItemElement::Children::iterator PathItemElement::FindChild(const std::string
 }
 
 PathItemElement* PathItemElement::Child(const std::string& name) {
+    PathItemElement* child = FindOrMakeChild(name);
+    if (!child) TESSEL_REPORT(kDebugError, 0x5E0B77D9u) << "Out of memory!";
+    return child;
+}
+
+PathItemElement* PathItemElement::FindOrMakeChild(const std::string& name) {
     const int32 hash = StringUtils::Hash(name, false);
     PathLock lock;
     bool found;
@@ -113,36 +119,57 @@ void PathItemElement::Release() {
         if (retains_.compare_exchange_weak(retains, retains - 1, std::memory_order_release, std::memory_order_relaxed))
             return;
     }
-    PathItemCacheList caches;
-    PathLock lock;
-    PathItemElement* element = this;
-    while (element) {
-        const int32 left = element->retains_.fetch_sub(1, std::memory_order_acq_rel) - 1;
-        if (left < 0) element->ReportOverRelease();
-        if (left != 0) return;
-        element = element->End(caches);
-    }
+    for (PathItemElement* element = this; element;) element = element->ReleaseOnce();
 }
 
-// Takes an element that nobody retains out of the tree. Its parent loses a retain: the caller's to give up.
-PathItemElement* PathItemElement::End(PathItemCacheList& caches) {
-    caches.Add(cache_);
-    PathItemElement* parent = parent_;
-    if (parent) {
-        bool found;
-        const auto position = parent->FindChild(name_, hash_, found);
-        if (found) parent->children_.erase(position);
+// What an element leaves behind, given back without the lock.
+struct PathItemElement::Remains {
+    std::string name;
+    Children children;
+    std::unique_ptr<PathItemCache> cache;
+};
+
+namespace {
+
+void ReportOverRelease(const PathItemElement* element, const std::string& name, int32 count) {
+    TESSEL_REPORT(kDebugError, 0x3C5A9E10u) << "name= " << name;
+    TESSEL_REPORT(kDebugError, 0x3C5A9E11u) << "element= " << DbgFmtPtr(element);
+    TESSEL_REPORT(kDebugError, 0x3C5A9E12u) << "count= " << count;
+    TESSEL_REPORT(kDebugError, 0x3C5A9E13u) << "Release of PathItemElement, but we did not have enough retains";
+}
+
+}  // namespace
+
+PathItemElement* PathItemElement::ReleaseOnce() {
+    Remains remains;
+    PathItemElement* parent = nullptr;
+    int32 left;
+    {
+        PathLock lock;
+        left = retains_.fetch_sub(1, std::memory_order_acq_rel) - 1;
+        if (left > 0) return nullptr;
+        if (left == 0) {
+            parent = parent_;
+            End(remains);
+        } else {
+            retains_.fetch_add(1, std::memory_order_relaxed);
+        }
     }
-    Vacate();
+    if (left < 0) ReportOverRelease(this, name_, left);
     return parent;
 }
 
-void PathItemElement::ReportOverRelease() {
-    const int32 count = retains_.fetch_add(1, std::memory_order_relaxed);
-    TESSEL_REPORT(kDebugError, 0x3C5A9E10u) << "name= " << name_;
-    TESSEL_REPORT(kDebugError, 0x3C5A9E11u) << "element= " << DbgFmtPtr(this);
-    TESSEL_REPORT(kDebugError, 0x3C5A9E12u) << "count= " << count;
-    TESSEL_REPORT(kDebugError, 0x3C5A9E13u) << "Release of PathItemElement, but we did not have enough retains";
+// Takes an element that nobody retains out of the tree.
+void PathItemElement::End(Remains& remains) {
+    if (parent_) {
+        bool found;
+        const auto position = parent_->FindChild(name_, hash_, found);
+        if (found) parent_->children_.erase(position);
+    }
+    remains.name.swap(name_);
+    remains.children.swap(children_);
+    remains.cache.swap(cache_);
+    Vacate();
 }
 
 void PathItemElement::GiveBackUnusedRoom() {

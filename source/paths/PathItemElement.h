@@ -32,10 +32,13 @@ public:
     static ThMutex Mutex();
 };
 
+// Cached items are the host's: they are asked and destroyed without the path mutex, held by a reference meanwhile.
+using SharedCachedItem = std::shared_ptr<PathRef::CachedItem>;
+
 // What is cached on one element.
 struct PathItemCache : TrackedObject {
-    using Map = std::map<std::string, std::unique_ptr<PathRef::CachedItem>, std::less<>,
-                         TrackedAllocator<std::pair<const std::string, std::unique_ptr<PathRef::CachedItem>>>>;
+    using Map = std::map<std::string, SharedCachedItem, std::less<>,
+                         TrackedAllocator<std::pair<const std::string, SharedCachedItem>>>;
     Map items;
     std::unique_ptr<PathItemCache> next;
 };
@@ -79,7 +82,7 @@ public:
     void Retain() { retains_.fetch_add(1, std::memory_order_relaxed); }
     void Release();
 
-    // The child of that name, made if there is none, and retained for the caller. Null when memory is short.
+    // The child of that name, made if there is none, and retained for the caller. Null (reported) when memory is short.
     PathItemElement* Child(const std::string& name);
 
     // ---- with the path mutex held ----
@@ -110,11 +113,14 @@ private:
     using Children = std::vector<ChildEntry, TrackedAllocator<ChildEntry>>;
 
     Children::iterator FindChild(const std::string& name, int32 hash, bool& found);
+    PathItemElement* FindOrMakeChild(const std::string& name);
     PathItemElement* MakeChild(const std::string& name, int32 hash, Children::iterator position);
-    PathItemElement* End(PathItemCacheList& caches);
+    struct Remains;
+    void End(Remains& remains);
     // The element that follows this one and those below it in the tree of `top`; null at its end.
     PathItemElement* NextBelow(const PathItemElement* top);
-    void ReportOverRelease();
+    // Gives up one retain. The parent loses one too, the caller's to give up, when that ended the element.
+    PathItemElement* ReleaseOnce();
 
     std::string name_;
     PathItemElement* parent_ = nullptr;

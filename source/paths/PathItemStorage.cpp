@@ -50,11 +50,17 @@ public:
         return true;
     }
 
+    // A removed entry that no other stands behind is empty again, and so are those before it: who looks for a block
+    // ends there either way.
     void Remove(const Block* block) {
         Table* table = table_.load(std::memory_order_relaxed);
+        const auto entry = [&](size_t at) -> std::atomic<const Block*>& { return table->entries[at & table->mask]; };
         size_t i = Hash(block);
-        while (table->entries[i & table->mask].load(std::memory_order_relaxed) != block) ++i;
-        table->entries[i & table->mask].store(Removed(), std::memory_order_relaxed);
+        while (entry(i).load(std::memory_order_relaxed) != block) ++i;
+        entry(i).store(Removed(), std::memory_order_relaxed);
+        if (entry(i + 1).load(std::memory_order_relaxed)) return;
+        for (; entry(i).load(std::memory_order_relaxed) == Removed(); --i, --table->used)
+            entry(i).store(nullptr, std::memory_order_relaxed);
     }
 
     // No other thread may be reading.
@@ -71,7 +77,7 @@ public:
 private:
     struct Table {
         size_t mask;
-        size_t used;  // entries that were ever filled
+        size_t used;  // entries that are not empty
         std::atomic<const Block*>* entries;
         Table* previous;
     };
@@ -254,13 +260,9 @@ void PathItemStorage::Stop() {
 // ---- slots ----------------------------------------------------------------------------------------------------------
 
 PathItemElement* PathItemStorage::Allocate() {
-    PathItemElement* element = nullptr;
-    {
-        ThMutexHolder lock(gStorageMutex);
-        element = ClaimAnySlot();
-        if (!element && NewBlock()) element = ClaimSlot(*gCurrentBlock);
-    }
-    if (!element) TESSEL_REPORT(kDebugError, 0x5E0B77D9u) << "Out of memory!";
+    ThMutexHolder lock(gStorageMutex);
+    PathItemElement* element = ClaimAnySlot();
+    if (!element && NewBlock()) element = ClaimSlot(*gCurrentBlock);
     return element;
 }
 

@@ -16,7 +16,7 @@ public:
     // Frees the blocks. One that holds live elements is reported, and kept for those who still point there.
     static void Stop();
 
-    // A claimed slot, or null (reported) when there is no memory.
+    // A claimed slot, or null when there is no memory.
     static PathItemElement* Allocate();
     static void SlotVacated(const PathItemElement* element);
 

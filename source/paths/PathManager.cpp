@@ -379,17 +379,23 @@ MgErr FVolName(Path path, Path result) {
 // ---- texts for what has no text -------------------------------------------------------------------------------------
 
 void FGetNotAPathString(PStr text) {
-    PStrCpy(text, gNotAPathText);
+    if (text) PStrCpy(text, gNotAPathText);
 }
 
 void FSetNotAPathString(ConstPStr text) {
-    PStrCpy(gNotAPathText, text);
+    if (text)
+        PStrCpy(gNotAPathText, text);
+    else
+        gNotAPathText[0] = 0;
 }
 
 void FGetPathTooLongString(PStr text) {
-    PStrCpy(text, gPathTooLongText);
+    if (text) PStrCpy(text, gPathTooLongText);
 }
 
 void FSetPathTooLongString(ConstPStr text) {
-    PStrCpy(gPathTooLongText, text);
+    if (text)
+        PStrCpy(gPathTooLongText, text);
+    else
+        gPathTooLongText[0] = 0;
 }

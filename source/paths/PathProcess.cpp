@@ -10,6 +10,7 @@
 #include "diagnostics/Guarded.h"
 #include "paths/PathItemStorage.h"
 #include "paths/PathRefAccess.h"
+#include "paths/PathSteps.h"
 #include "paths/Service.h"
 
 namespace tessel {
@@ -23,6 +24,9 @@ constexpr BaseName kBaseNames[] = {{PathRef::kAbsolute, "[absolute]"},
                                    {PathRef::kRelative, "[relative]"},
                                    {PathRef::kUNC, "[unc]"},
                                    {PathRef::kNullPath, "[NULL]"}};
+
+static_assert(kSeparatorNotFound == PathRef::StringType::npos,
+              "kSeparatorNotFoundConstantDoNotUse is not the same as PathRef::StringType::npos");
 
 std::atomic<bool> gStarted{false};
 std::atomic<AllocTracker*> gPathTracker{nullptr};
@@ -131,9 +135,9 @@ MgErr PathManagerStop() {
     });
 }
 
-void TrackPathObject(const void* object, size_t size) {
+void TrackPathObject(const void* frame, const void* object, size_t size) {
     if (AllocTracker* tracker = gPathTracker.load(std::memory_order_acquire))
-        tracker->AddRecord(object, static_cast<uint32>(size), __FILE__, __LINE__);
+        tracker->AddRecordFrom(frame, object, static_cast<uint32>(size), __FILE__, __LINE__);
 }
 
 void UntrackPathObject(const void* object) {

@@ -7,7 +7,8 @@
 namespace tessel {
 
 // The tracker of path objects on the heap. Both do nothing while the path manager is stopped.
-void TrackPathObject(const void* object, size_t size);
+// The call stack of a record begins with the caller of the function whose frame is given.
+void TrackPathObject(const void* frame, const void* object, size_t size);
 void UntrackPathObject(const void* object);
 
 // Set by PathRef::Setting("utf8"): every path is flattened as "PTH1".

@@ -69,10 +69,10 @@ void ReportElementFault(PathItemElement::Fault fault, int32 parentDepth, int32 d
 // Checks the elements from the last one up. What is wrong is reported without the lock.
 bool ElementsAreSane(PathItemElement* element) {
     PathItemElement::Fault fault = PathItemElement::Fault::kNone;
-    int32 steps = 0, depth = 0, parentDepth = 0;
+    int32 depth = 0, parentDepth = 0;
     {
         PathLock lock;
-        for (; element && steps < kDeepestCheck; element = element->Parent(), ++steps) {
+        for (int32 steps = 0; element && steps < kDeepestCheck; element = element->Parent(), ++steps) {
             fault = element->Check();
             if (fault == PathItemElement::Fault::kNone) continue;
             depth = element->Depth();
@@ -84,7 +84,7 @@ bool ElementsAreSane(PathItemElement* element) {
         ReportElementFault(fault, parentDepth, depth);
         return false;
     }
-    if (steps == kDeepestCheck)
+    if (element)
         TESSEL_REPORT(kDebugWarning, 0x52CE0F35u) << "Stopped sanity check because of very deep path. This could "
                                                      "represent a recursive linkage of the elements.";
     return true;
@@ -159,13 +159,13 @@ void PathRef::DisposePath(Path& path) {
 
 void* PathRef::operator new(size_t size) {
     void* address = TrackedNew(size);
-    TrackPathObject(address, size);
+    TrackPathObject(__builtin_frame_address(0), address, size);
     return address;
 }
 
 void* PathRef::operator new(size_t size, const std::nothrow_t&) noexcept {
     void* address = TrackedNewNoThrow(size);
-    if (address) TrackPathObject(address, size);
+    if (address) TrackPathObject(__builtin_frame_address(0), address, size);
     return address;
 }
 
@@ -278,6 +278,10 @@ void PathRef::Replace(int32 index, const char* name) {
 
 void PathRefAccess::AppendNames(PathRef& path, const PathItemList& names, int32 first, const char* detail) {
     for (int32 i = first; i < names.Count(); ++i) {
+        if (names[i].IsUpDir()) {
+            path.AppendUpDir();
+            continue;
+        }
         PathItemElement* child = path.mPathElement->Child(names[i].Name());
         if (!child) TESSEL_THROW(kMemFullErr, detail);
         path.TakeOver(child);

@@ -10,6 +10,9 @@ namespace tessel {
 
 struct PathRefAccess {
     static PathItemElement* Element(const PathRef& path) { return path.mPathElement; }
+    // What GetCachedProxy finds, held so that it stays while it is used. No lock is held while items are asked.
+    static SharedCachedItem CachedItem(const PathRef& path, const char* key, const char* className,
+                                       PathRef::SearchDirection direction, PathItemElement** foundAt = nullptr);
     static std::string& TextCache(PathRef& path) { return path.TextCache(); }
 
     // A path to an element that is retained for it already, or that it has to retain.
@@ -24,7 +27,8 @@ struct PathRefAccess {
         return path;
     }
 
-    // Appends names of a path from the given one on, as they are. Raises `detail` when memory is short.
+    // Appends names of a path from the given one on; an up-directory element steps up. Raises `detail` when memory is
+    // short.
     static void AppendNames(PathRef& path, const PathItemList& names, int32 first, const char* detail);
 };
 

@@ -9,6 +9,9 @@
 
 namespace tessel {
 
+// What FindCharacter gives when there is none, which is passed on to the members of strings.
+constexpr size_t kSeparatorNotFound = std::string_view::npos;
+
 // The position after the character at `position`, which is inside the text. Byte by byte while paths are not started.
 inline size_t NextCharacter(std::string_view text, size_t position) {
     if (!StepsByCharacters()) return position + 1;
@@ -18,7 +21,7 @@ inline size_t NextCharacter(std::string_view text, size_t position) {
 // The first occurrence of a single-byte character at `position` or later, or npos.
 inline size_t FindCharacter(std::string_view text, char wanted, size_t position = 0) {
     while (position < text.size() && text[position] != wanted) position = NextCharacter(text, position);
-    return position < text.size() ? position : std::string_view::npos;
+    return position < text.size() ? position : kSeparatorNotFound;
 }
 
 }  // namespace tessel

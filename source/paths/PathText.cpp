@@ -75,8 +75,8 @@ using namespace tessel;
 // ---- reading --------------------------------------------------------------------------------------------------------
 
 MgErr FTextToPath(const char* text, int32 length, Path* path) {
-    const size_t size = text && length > 0 ? static_cast<size_t>(length) : 0;
-    return ReadText(std::string_view(text, size), PathRef::StringDisplay(), path);
+    if (length < 0) return kArgErr;
+    return ReadText(std::string_view(text, text ? static_cast<size_t>(length) : 0), PathRef::StringDisplay(), path);
 }
 
 MgErr FStringToPath(LStrHandle text, Path* path) {

@@ -38,10 +38,9 @@ const TextFormat* FindFormat(const char* name) {
 }
 
 bool ReadCachedText(const PathRef& path, const TextFormat& format, std::string& text) {
-    PathLock lock;
-    const PathRef::CachedItem* item =
-        path.GetCachedProxy(format.cacheKey, PathRef::CachedPathString::ClassName(), PathRef::kSearchHere);
-    if (item) text = static_cast<const PathRef::CachedPathString*>(item)->Get();
+    const SharedCachedItem item =
+        PathRefAccess::CachedItem(path, format.cacheKey, PathRef::CachedPathString::ClassName(), PathRef::kSearchHere);
+    if (item) text = static_cast<const PathRef::CachedPathString*>(item.get())->Get();
     return item != nullptr;
 }
 

@@ -5,6 +5,7 @@
 
 #include <cstring>
 
+#include "diagnostics/Guarded.h"
 #include "streams/Padding.h"
 
 namespace tessel {
@@ -137,7 +138,17 @@ void BinDataReader::ReadPStr(PStr out, uint32 align) {
 void BinDataReader::ReadPStrAsNarrow(std::string& out, uint32 align) {
     Str255 text;
     BinDataReader::ReadPStr(text, align);
-    out.assign(reinterpret_cast<const char*>(text + 1), text[0]);
+    Store(out, text + 1, text[0]);
+}
+
+// Readers throw nothing: memory that is short becomes their error.
+void BinDataReader::Store(std::string& out, const uint8* bytes, uint32 count) {
+    out.clear();
+    if (!bytes) return;
+    SetError(Guarded([&]() -> MgErr {
+        out.assign(reinterpret_cast<const char*>(bytes), count);
+        return kNoErr;
+    }));
 }
 
 // Reads the count of an LStr and checks that it can be true. False for an empty string, and on an error.
@@ -169,10 +180,7 @@ LStrHandle BinDataReader::ReadLStr() {
 void BinDataReader::ReadLStrAsNarrow(std::string& out) {
     uint32 count;
     const uint8* bytes = TakeLStrCount(count) ? Take(count) : nullptr;
-    if (bytes)
-        out.assign(reinterpret_cast<const char*>(bytes), count);
-    else
-        out.clear();
+    Store(out, bytes, count);
 }
 
 }  // namespace tessel

@@ -145,18 +145,19 @@ const Endianizer* LittleEndianizer() {
 using namespace tessel;
 
 void SwapBW(void* value16) {
-    Store(Swapped(Load<uint16>(value16)), value16);
+    if (value16) Store(Swapped(Load<uint16>(value16)), value16);
 }
 
 void SwapWL(void* value32) {
+    if (!value32) return;
     const uint32 value = Load<uint32>(value32);
     Store((value << 16) | (value >> 16), value32);
 }
 
 void RevBL(void* value32) {
-    Store(Swapped(Load<uint32>(value32)), value32);
+    if (value32) Store(Swapped(Load<uint32>(value32)), value32);
 }
 
 void RevBQ(void* value64) {
-    Store(Swapped(Load<uint64>(value64)), value64);
+    if (value64) Store(Swapped(Load<uint64>(value64)), value64);
 }

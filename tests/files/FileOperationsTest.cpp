@@ -6,6 +6,7 @@
 #include <tessel/strings/StringCPStr.h>
 #include <unistd.h>
 
+#include <cmath>
 #include <cstring>
 #include <filesystem>
 #include <string>
@@ -211,6 +212,11 @@ TEST_F(FileOperationsTest, CaseIsCorrectedAndRemembered) {
     EXPECT_TRUE(isCorrected());
     path.FlushCache();
     EXPECT_FALSE(isCorrected());
+    PathRef deep(PathRef::kAbsolute);
+    for (int i = 0; i < 100000; ++i) deep.Append("x");  // more than any stack of calls
+    EXPECT_THROW(deep.GetCorrectedCase(100), OVExcept);
+    for (double seconds : {-1.0, 1e300, static_cast<double>(NAN)})
+        EXPECT_TRUE(path.GetCorrectedCase(seconds).Equals(path, PathRef::kIgnoreCase));
 
     started.drive.Put("Mixed", "");
     PathRef lower = started.On("mixed");
@@ -302,6 +308,7 @@ TEST_F(FileOperationsTest, NamesOfTheHostAndBack) {
     Path program = nullptr;
     const auto before = std::filesystem::current_path();
     EXPECT_EQ(kArgErr, NativeToPath("", &program));
+    EXPECT_EQ(kArgErr, NativeToPath("/tmp/a\\b", &program));
     std::filesystem::current_path(started.drive.Native());
     EXPECT_EQ(kNoErr, NativeToPath("Some File", &program));
     EXPECT_TRUE(program->Equals(started.On("Some File"), PathRef::kExact));

@@ -1,6 +1,8 @@
 // Cached attributes; the start and stop of paths, and what they leave behind.
 #include <tessel/paths/PathCachedItem.h>
 
+#include <thread>
+
 #include "paths/PathRefAccess.h"
 #include "paths/PathTestSupport.h"
 #include "support/HandClock.h"
@@ -101,6 +103,49 @@ TEST_F(PathCache, ExpiryAndFlushing) {
     item.ResetBool(10, false);
     EXPECT_FALSE(item.Expired() || item.Get() || item.Invalidate());
     EXPECT_EQ(0u, item.Rotten());
+}
+
+// Asks another thread for a path in everything that it does, which hangs where the lock is held.
+class WaitingItem final : public Item {
+public:
+    WaitingItem(uint32& calls) : CachedItem(1000, kDependsOnFile), calls_(calls) {}
+    ~WaitingItem() override { Wait(1); }
+    bool IsA(const char* name) const override { return Wait(2) && CachedItem::IsA(name); }
+    bool Expired() const override { return Wait(4) && CachedItem::Expired(); }
+    bool Invalidate() const override { return Wait(8) && CachedItem::Invalidate(); }
+    uint32 Size() const override { return Wait(16) ? 5 : 0; }
+    void Attached() override { Wait(32); }
+
+private:
+    bool Wait(uint32 call) const {
+        std::thread([] { Abs({"C", "other"}).FlushCache(); }).join();
+        calls_ |= call;
+        return true;
+    }
+    uint32& calls_;
+};
+
+TEST_F(PathCache, ItemsAreAskedWithoutALock) {
+    uint32 calls = 0;
+    const PathRef path = Abs({"C", "x"});
+    for (const char* key : {"replaced", "replaced", "flushed"}) path.Cache(key, new WaitingItem(calls));
+    for (const auto direction : {PathRef::kSearchHere, PathRef::kSearchUp, PathRef::kSearchDown})
+        EXPECT_NE(nullptr, path.GetCachedProxy("flushed", "CachedItem", direction));
+    EXPECT_EQ(10u, path.FlushCache());
+    EXPECT_EQ(63u, calls);
+    Abs({"C", "y"}).Cache("key", new WaitingItem(calls = 0));
+    EXPECT_EQ(33u, calls);
+}
+
+TEST_F(PathCache, LifetimesAreAtMostHalfTheClock) {
+    for (uint32 lifetime : {0x7FFFFFFFu, 0x80000000u, 0xFFFFFFFFu}) {
+        PathRef::CachedBool item(lifetime, Item::kIndependent, true);
+        EXPECT_FALSE(item.Expired());
+        clock_.Advance(0x7FFFFFFE);
+        EXPECT_FALSE(item.Expired());
+        clock_.Advance(1);
+        EXPECT_TRUE(item.Expired());
+    }
 }
 
 // The text of a path is remembered on its element, and outlives a flush.

@@ -125,6 +125,12 @@ TEST_F(PathModel, Rebase) {
     EXPECT_EQ("abs:a/b/c", Show(path));
     EXPECT_TRUE(path.Rebase(Abs({"A"}), Unc({"s", "t"}), PathRef::kIgnoreCase));
     EXPECT_EQ("unc:s/t/b/c", Show(path));
+    path = Rel({"..", "..", "c"});  // what steps up behind a name removes it
+    EXPECT_TRUE(path.Rebase(Rel({".."}), Abs({"C", "x", "y"}), PathRef::kExact));
+    EXPECT_EQ("abs:C/x/c", Show(path));
+    path = Rel({"..", "..", "c"});
+    path.Replace(0, "x");
+    EXPECT_EQ("rel:c", Show(path));
 }
 
 class AtName final : public PathRef::SplitCriteria {
@@ -226,8 +232,10 @@ TEST_F(PathModel, Sanity) {
     EXPECT_TRUE(reports_.Has(3, "mPathElement not in storage"));
     std::memset(static_cast<void*>(&wild), 0, sizeof wild);
     PathRef deep = Rel({});
-    for (int i = 0; i < 600; ++i) deep.Append("x");
+    while (deep.ItemCount() < 511) deep.Append("x");
     EXPECT_TRUE(deep.IsSane(false));
+    EXPECT_EQ(0u, reports_.CountAt(2));
+    EXPECT_TRUE(deep.Append("x").IsSane(false));
     EXPECT_EQ(2, reports_.Reports().back().level);
 }
 

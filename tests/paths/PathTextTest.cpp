@@ -105,13 +105,15 @@ TEST_F(PathText, Read) {
         EXPECT_EQ(shown, Read(text, ("pathref_" + std::string(format)).c_str())) << format << " " << text;
     EXPECT_EQ(1, PathRef("a/b", PathRef::StringDisplay()).ItemCount());
     EXPECT_EQ(2, PathRef("a/b", PathRef::StringPlatformAgnostic()).ItemCount());
-    try {
-        PathRef("", PathRef::StringCommandLine());
-        FAIL();
-    } catch (const OVExcept& e) {
-        EXPECT_EQ(kArgErr, e.Code());
-        EXPECT_STREQ("Empty command line strings cannot be converted to Path", e.Detail());
-    }
+    const auto detail = [](const char* text, const char* format) {
+        try {
+            return Show(PathRef(text, format));
+        } catch (const OVExcept& e) {
+            return std::string(e.Detail());
+        }
+    };
+    EXPECT_EQ("Empty command line strings cannot be converted to Path", detail("", PathRef::StringCommandLine()));
+    EXPECT_EQ("PathRef from string constructor: unknown format \"C:\\x\"", detail("pathref_unix", "C:\\x"));
 }
 
 // 0x5C is the second byte of many characters in the Japanese code page, and a backslash alone.
@@ -148,6 +150,7 @@ TEST_F(PathText, FlatReading) {
     EXPECT_EQ("rel:x", Show(path));
     EXPECT_EQ("abs:", read(FTextToPath(nullptr, 5, &path)));
     EXPECT_EQ(kArgErr, FTextToPath("a", 1, nullptr));
+    EXPECT_EQ(kArgErr, FTextToPath("a", -1, &path));
     EXPECT_EQ("abs:C/y", read(ConvertPlatformIndependentTextToPath(&path, "/C/y")));
     EXPECT_EQ("abs:", read(FStringToPath(nullptr, &path)));
     EXPECT_EQ(0u, reports_.Count());
@@ -213,7 +216,10 @@ TEST_F(PathText, NamesForTheSystem) {
     for (const PathRef& path : {Abs({}), Abs({"CC"}), Abs({"1"}), Rel({"C"}), PathRef(), Abs({"C", "con"}),
                                 Abs({"C", "lpt9", "x"}), Abs({"C", "a?b"}), Abs({"C", "x."}), Abs({".."})})
         EXPECT_EQ("1", made(path)) << Show(path);
-    for (const std::string& text : {std::string("C:\\dir\\a\0.txt", 13), std::string("\\\\s\0\\t\\x", 9)})
+    for (const std::string& text :
+         {std::string("C:\\dir\\a\0.txt", 13), std::string("\\\\s\0\\t\\x", 9),
+          std::string("\\\\s\\h\\..\\..\\etc\\passwd"), std::string("\\\\s\\h\\..\\x"), std::string("\\\\..\\h\\x"),
+          std::string("\\\\s\\..\\x"), std::string("\\\\s\\h?\\x")})
         EXPECT_EQ("1", made(PathRef(text, PathRef::StringDisplay())));
     const auto ofLength = [](size_t length) { return Abs({"C", std::string(length - 3, 'x').c_str()}); };
     EXPECT_EQ(259u, made(ofLength(259)).size());

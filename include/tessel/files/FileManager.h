@@ -289,7 +289,7 @@ TESSEL_API int32 PStrStripRezExt(PStr name, _FMFileType type);
    The library names files as `C:\dir\file`; these two translate from and to names as the host system has them. */
 
 /* The path of a name like "/home/u/a.rsrc"; a relative one starts at the current directory. *path is made when it is
-   null. kNotFoundErr: no drive holds it. */
+   null. kNotFoundErr: no drive holds it. kArgErr: a name on the way holds a backslash, which a path cannot say. */
 TESSEL_API MgErr NativeToPath(CStr native, Path* path);
 
 /* The host's name of a path, terminated. kArgErr: it does not fit `size` bytes, or the path has none. */

@@ -1,6 +1,8 @@
 /* What a path can have cached about itself (PathRef::Cache): an item with a lifetime, and items that hold a value.
 
-   A host derives its own from PathRef::CachedItem. Lifetimes are milliseconds, below 2^31. */
+   A host derives its own from PathRef::CachedItem. Lifetimes are milliseconds; 2^31 - 1 is the
+   longest, and longer ones become it. The library calls an item, and deletes it, with no lock of its own held, on any
+   thread. */
 #ifndef TESSEL_PATHS_PATHCACHEDITEM_H
 #define TESSEL_PATHS_PATHCACHEDITEM_H
 
@@ -27,7 +29,7 @@ public:
     virtual void Reset(uint32 lifetime);
     virtual uint32 Size() const;   /* bytes of memory */
     virtual uint32 Rotten() const; /* milliseconds since it expired; 0 before */
-    virtual void Attached();       /* called when the item has been stored, with the cache locked */
+    virtual void Attached();       /* called when the item has been stored */
 
     CachedItem(const CachedItem&) = delete;
     CachedItem& operator=(const CachedItem&) = delete;

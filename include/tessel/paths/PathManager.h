@@ -4,6 +4,9 @@
    takes one, and says what it does with it. An out-parameter `Path` is changed in place, a `Path*` is made when it is
    null. Any thread; one Path is changed by one thread at a time.
 
+   A path can hold any number of names; the functions that ask the disk answer kArgErr for one of more than 259 bytes
+   as display text.
+
    A name is a PStr in the active code page. Appending ".." or the empty name removes the last name; where there is none
    to remove, it adds an up-directory element, which counts as a name and is empty. Appending "." changes nothing. */
 #ifndef TESSEL_PATHS_PATHMANAGER_H
@@ -128,12 +131,14 @@ TESSEL_API MgErr FVolName(Path path, Path result);
 TESSEL_API int32 FFlattenPath(Path path, uint8* bytes);
 
 /* Reads a flattened path and returns its size. The second form never reads beyond `length` bytes; use it for what comes
-   from outside. The null path gives null. On failure 0, or length + 1, and *path is unchanged. */
+   from outside. The null path gives null. On failure 0, or length + 1, and *path is unchanged. A length of INT32_MAX
+   counts as one less, so that length + 1 is a number. */
 TESSEL_API int32 FUnFlattenPath(const uint8* bytes, Path* path);
 TESSEL_API int32 FUnFlattenPath2(const uint8* bytes, Path* path, int32 length);
 
 /* ---- texts for what has no text ------------------------------------------------------------------------------------
-   Buffers of 256 bytes, copied. Empty until set; to be set during start-up. PathRef has a pair of its own. */
+   Buffers of 256 bytes, copied; null gets nothing, and sets the empty text. Empty until set; to be set during start-up.
+   PathRef has a pair of its own. */
 TESSEL_API void FGetNotAPathString(PStr text);
 TESSEL_API void FSetNotAPathString(ConstPStr text);
 TESSEL_API void FGetPathTooLongString(PStr text);

@@ -9,6 +9,9 @@
    A name is bytes in the active code page. Appending ".." or the empty name removes the last name; where there is none
    to remove, it becomes an up-directory element, an element with an empty name. Appending "." changes nothing.
 
+   A path can hold any number of names. The system takes paths of at most 259 bytes as display text: what asks the disk
+   answers 1 for a longer one.
+
    Failures raise OVExcept unless a member returns MgErr. A PathRef may be read (const members, copying) by many
    threads, and changed by one at a time, as an int. Usable between start and stop of the library. */
 #ifndef TESSEL_PATHS_PATHREF_H
@@ -87,8 +90,8 @@ public:
     explicit PathRef(const char* standardLocationName);
     MgErr AssignToName(const char* name) const;
 
-    /* Reads text in a format (the String... names below). Raises 53 for an unknown format, 1 for text that gives no
-       valid path. */
+    /* Reads text in a format (the String... names below). Raises 53 for an unknown format, which it names, 1 for text
+       that gives no valid path. */
     PathRef(const StringType& text, const char* format);
 
     /* Reads a flattened path, "PTH0" or "PTH1", in the byte order of the Endianizer. Raises the buffer's error, or 74
@@ -164,7 +167,8 @@ public:
     PathRef GetInCommonWith(const PathRef& other, ComparePolicy policy) const; /* the longest common leading part */
     PathRef GetRelativePathFromThisToThat(const PathRef& that, ComparePolicy policy) const;
 
-    /* When this path starts with `from`, puts `to` in the place of that part. */
+    /* When this path starts with `from`, puts `to` in the place of that part. Up-directory elements that follow it
+       remove names of `to`. */
     bool Rebase(const PathRef& from, const PathRef& to, ComparePolicy policy);
 
     /* Splits where the criteria say. Either part may be null. False: nowhere, and the parts become not-a-path. */
@@ -218,7 +222,9 @@ public:
     bool IsSpecial() const; /* false */
     void ResolveShortcuts(ResolveMethod method);
     PathRef GetLongNames() const;
-    PathRef GetCorrectedCase(double seconds) const; /* each name as the disk has it; remembered for so long */
+    /* Each name as the disk has it; remembered for so long. Raises 1 for a path of more than 259 bytes, or with a name
+       that no file can have. */
+    PathRef GetCorrectedCase(double seconds) const;
     MgErr MakeWriteable(WriteableDepth depth) const;
     MgErr RemoveFile(ResolveAction action);
     MgErr CopyFileTo(const PathRef& to, ResolveAction action) const;

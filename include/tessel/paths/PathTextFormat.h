@@ -24,7 +24,12 @@ TESSEL_BEGIN_C
 /* ---- reading: *path is made when it is null, and unchanged on failure ----------------------------------------------
  */
 
-/* Display text. kArgErr when it gives no valid path. */
+/* Display text of `length` bytes; null and the empty text give the empty absolute path. kArgErr when it gives no valid
+   path, and for a negative length.
+
+   Display text has backslashes: C:\dir\file, \\server\share\file, dir\file. A "/" is no separator: "/usr/share" reads
+   as a relative path of that one name, which no file can have. Names of this host go through NativeToPath, text of
+   unknown kind through PathRef with StringPlatformAgnostic. */
 TESSEL_API MgErr FTextToPath(const char* text, int32 length, Path* path);
 TESSEL_API MgErr FStringToPath(LStrHandle text, Path* path);
 TESSEL_API MgErr FFileSystemStringToPath(LStrHandle text, Path* path);
@@ -61,7 +66,7 @@ TESSEL_API MgErr ConvertPlatformIndependentTextToPath(Path* path, CStr text);
 
 /* The name under which the system is asked for a file. `name` takes kMaxDOSPathName bytes. With `resolve` not 0 each
    shortcut (.lnk) on the way is replaced by its target. kArgErr: not absolute, no names, a name that no file can have,
-   or too long. */
+   no server in front of a UNC path (its steps up led past it), or more than 259 bytes. */
 TESSEL_API MgErr MakeDOSPathName(Path path, char* name, int32 resolve);
 
 /* Whether a file can have the name: 0, or kFileName... flags. `bad` (may be null) receives the offending characters,

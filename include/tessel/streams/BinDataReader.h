@@ -64,6 +64,7 @@ public:
 private:
     const uint8* Take(uint32 n);
     bool TakeLStrCount(uint32& count);
+    void Store(std::string& out, const uint8* bytes, uint32 count);
 
     const Endianizer* endianizer_;
     MgErr error_ = kNoErr;
