@@ -9,6 +9,8 @@
 
 #include "numerics/DoubleMath.h"
 #include "numerics/Extended.h"
+#include "numerics/NumericAccess.h"
+#include "numerics/TwoParts.h"
 
 namespace tessel::real {
 
@@ -68,9 +70,29 @@ T Logn(T x) {
     return x > 0 ? std::log(x) : LogOutside(x);
 }
 
+/* log10(m 2^e) = log10(m) + e log10(2), which is exact at the powers of ten where the library's own is not. */
+inline Extended ExtendedLog10(Extended x) {
+    constexpr TwoParts<Extended> kLog10Of2 = {0x9A209A84FBCFp-49L, 0xF7988F8959AC0B7Dp-113L};  // high times e is exact
+    constexpr Extended kRootOfHalf = 0.70710678118654752440L;
+    if (!std::isfinite(x)) return x;
+    int exponent = 0;
+    Extended mantissa = std::frexp(x, &exponent);
+    if (mantissa < kRootOfHalf) {
+        mantissa *= 2;
+        --exponent;
+    }
+    const auto power = static_cast<Extended>(exponent);
+    return power * kLog10Of2.high + (power * kLog10Of2.low + std::log10(mantissa));
+}
+
 template <class T>
 T Log10(T x) {
-    return x > 0 ? Careful(x, precise::Log10, [](auto wide) { return std::log10(wide); }) : LogOutside(x);
+    if (!(x > 0)) return LogOutside(x);
+    if constexpr (std::is_same_v<T, Extended>) {
+        return ExtendedLog10(x);
+    } else {
+        return Careful(x, precise::Log10, [](double wide) { return std::log10(wide); });
+    }
 }
 
 template <class T>
@@ -201,10 +223,11 @@ T Neg(T x) {
     return -x;
 }
 
-/* Halves to even. */
+/* Halves to even, whatever direction the host's unit rounds in; a zero is positive. */
 template <class T>
 T Round(T x) {
-    return std::nearbyint(x);
+    constexpr T kAllWhole = 1 / std::numeric_limits<T>::epsilon();
+    return std::fabs(x) < kAllWhole ? static_cast<T>(NearestInteger(x)) : x;
 }
 
 template <class T>
@@ -213,12 +236,13 @@ T Sign(T x) {
     return x > 0 ? T{1} : x < 0 ? T{-1} : T{0};
 }
 
-/* x - floor(x / y) y, without the rounding of the quotient where that is finite. */
+/* x - floor(x / y) y, without the rounding of the quotient where that is finite; a zero is positive. */
 template <class T>
 T Mod(T x, T y) {
     if (!std::isfinite(x) || !std::isfinite(y)) return x - std::floor(x / y) * y;
     const T remainder = std::fmod(x, y);
-    return remainder != 0 && (remainder < 0) != (y < 0) ? remainder + y : remainder;
+    if (remainder == 0) return 0;
+    return (remainder < 0) != (y < 0) ? remainder + y : remainder;
 }
 
 template <class T>
@@ -232,7 +256,8 @@ QuotientAndRemainder<T> QRem(T x, T y) {
     const T quotient = std::floor(x / y);
     if (!std::isfinite(x) || !std::isfinite(y) || y == 0) return {quotient, x - y * quotient};
     const T remainder = Mod(x, y);
-    return {std::isinf(quotient) ? quotient : std::nearbyint((x - remainder) / y), remainder};
+    if (std::isinf(quotient) || x == 0) return {quotient, remainder};
+    return {Round((x - remainder) / y), remainder};
 }
 
 template <class T>
