@@ -178,7 +178,11 @@ Pair PowerOfSteps(int64 n) {
     return {power.high * scale, power.low * scale};
 }
 
-// sinh(x) and cosh(x), each times two; 0.5 <= x < 700.
+constexpr double kHyperbolicEnd = 700;
+constexpr double kHyperbolicLimit = 712;  // above it both are infinite
+
+// sinh(x) and cosh(x), each times two, and from kHyperbolicEnd on times 2^-kLowered; 0.5 <= x < kHyperbolicLimit.
+constexpr int64 kLowered = 64;
 struct Hyperbolic {
     Pair sine;
     Pair cosine;
@@ -188,8 +192,10 @@ Hyperbolic TwiceSinhCosh(double x) {
     constexpr double kRounder = 0x1.8p52;
     const double steps = (x * (1 / (kStep.high + kStep.low)) + kRounder) - kRounder;
     const double r = (x - steps * kStep.high) - steps * kStep.low;
-    const Pair up = PowerOfSteps(static_cast<int64>(steps));
-    const Pair down = PowerOfSteps(-static_cast<int64>(steps));
+    const bool isFar = x >= kHyperbolicEnd;  // e^x may leave the range, and e^-x is lost beside it
+    const auto n = static_cast<int64>(steps);
+    const Pair up = PowerOfSteps(isFar ? n - kLowered * kSteps : n);
+    const Pair down = isFar ? Pair{0, 0} : PowerOfSteps(-n);
     const double rr = r * r;
     const double sine = r + r * rr * (1.0 / 6 + rr * (1.0 / 120));
     const double cosineLess1 = rr * (0.5 + rr * (1.0 / 24 + rr * (1.0 / 720)));
@@ -212,7 +218,6 @@ double CoshLess1(double x) {
 }
 
 constexpr double kSeriesEnd = 0.5;
-constexpr double kHyperbolicEnd = 700;
 
 // ---- angles --------------------------------------------------------------------------------------------------------
 
@@ -308,8 +313,31 @@ double Log10(double x) {
 double Sinh(double x) {
     const double size = std::fabs(x);
     if (size < kSeriesEnd) return x + SinhTail(x);
-    if (!(size < kHyperbolicEnd)) return std::sinh(x);
-    return std::copysign(Rounded(TwiceSinhCosh(size).sine) / 2, x);
+    if (!(size < kHyperbolicLimit)) return std::sinh(x);
+    const double twice = Rounded(TwiceSinhCosh(size).sine);
+    return std::copysign(size < kHyperbolicEnd ? twice / 2 : twice * PowerOfTwo(kLowered - 1), x);
+}
+
+// The library's is as good but where the power leaves the range before the result does.
+double Cosh(double x) {
+    const double size = std::fabs(x);
+    if (!(size >= kHyperbolicEnd && size < kHyperbolicLimit)) return std::cosh(x);
+    return Rounded(TwiceSinhCosh(size).cosine) * PowerOfTwo(kLowered - 1);
+}
+
+// The library reduces large angles with too few digits for those near a multiple of a right angle.
+constexpr double kLibraryAngle = 0x1p26;
+
+double Sin(double x) {
+    return std::fabs(x) < kLibraryAngle ? std::sin(x) : static_cast<double>(std::sin(static_cast<Extended>(x)));
+}
+
+double Cos(double x) {
+    return std::fabs(x) < kLibraryAngle ? std::cos(x) : static_cast<double>(std::cos(static_cast<Extended>(x)));
+}
+
+double Tan(double x) {
+    return std::fabs(x) < kLibraryAngle ? std::tan(x) : static_cast<double>(std::tan(static_cast<Extended>(x)));
 }
 
 double Tanh(double x) {

@@ -146,6 +146,25 @@ MantissaAndExponent<T> GetMantExp(T x) {
 
 // ---- trigonometry --------------------------------------------------------------------------------------------------
 
+/* Only doubles need more than the library gives. */
+template <class T>
+T Sin(T x) {
+    if constexpr (std::is_same_v<T, double>) return precise::Sin(x);
+    return std::sin(x);
+}
+
+template <class T>
+T Cos(T x) {
+    if constexpr (std::is_same_v<T, double>) return precise::Cos(x);
+    return std::cos(x);
+}
+
+template <class T>
+T Tan(T x) {
+    if constexpr (std::is_same_v<T, double>) return precise::Tan(x);
+    return std::tan(x);
+}
+
 template <class T>
 T Sec(T x) {
     return Careful(x, precise::Sec, [](auto wide) { return 1 / std::cos(wide); });
@@ -179,6 +198,12 @@ T Atan2(T x, T y) {
 template <class T>
 T Sinh(T x) {
     return Careful(x, precise::Sinh, [](auto wide) { return std::sinh(wide); });
+}
+
+template <class T>
+T Cosh(T x) {
+    if constexpr (std::is_same_v<T, double>) return precise::Cosh(x);
+    return std::cosh(x);
 }
 
 template <class T>
