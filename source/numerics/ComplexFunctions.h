@@ -98,6 +98,13 @@ int Exponent(const Complex<W>& z) {
     return std::ilogb(std::fmax(std::fabs(z.real()), std::fabs(z.imag())));
 }
 
+template <class W>
+constexpr W PowerOf2(int exponent) {
+    W power = 1;
+    for (; exponent > 0; --exponent) power *= 2;
+    return power;
+}
+
 /* ab - cd as a value times 2^exponent, so that no product of finite factors leaves the range. */
 template <class W>
 W ScaledDifferenceOfProducts(W a, W b, W c, W d, int& exponent) {
@@ -111,7 +118,8 @@ W ScaledDifferenceOfProducts(W a, W b, W c, W d, int& exponent) {
     const int first = takeApart(a) + takeApart(b);
     const int second = takeApart(c) + takeApart(d);
     exponent = onlySecond ? second : onlyFirst ? first : std::max(first, second);
-    return DifferenceOfProducts(std::scalbn(a, first - exponent), b, std::scalbn(c, second - exponent), d);
+    return DifferenceOfProducts(std::scalbn(a, std::min(first - exponent, 0)), b,
+                                std::scalbn(c, std::min(second - exponent, 0)), d);
 }
 
 /* The textbook quotient of any finite operands, y not being 0. */
@@ -134,7 +142,9 @@ Complex<W> Divide(const Complex<W>& x, const Complex<W>& y) {
     if (!IsFinite(x) || !IsFinite(y) || IsZero(x) || IsZero(y)) return TextbookQuotient(x, y);
     const auto isSafe = [](W part) {
         constexpr int kSafe = std::numeric_limits<W>::max_exponent / 4;
-        return part == 0 || std::abs(std::ilogb(part)) < kSafe;
+        constexpr W kLarge = PowerOf2<W>(kSafe);
+        const W size = std::fabs(part);
+        return size == 0 || (size < kLarge && size > 1 / kLarge);
     };
     const bool safe = isSafe(x.real()) && isSafe(x.imag()) && isSafe(y.real()) && isSafe(y.imag());
     return safe ? TextbookQuotient(x, y) : ScaledQuotient(x, y);

@@ -202,8 +202,7 @@ T Sinh(T x) {
 
 template <class T>
 T Cosh(T x) {
-    if constexpr (std::is_same_v<T, double>) return precise::Cosh(x);
-    return std::cosh(x);
+    return Careful(x, precise::Cosh, [](auto wide) { return std::cosh(wide); });
 }
 
 template <class T>
