@@ -10,14 +10,15 @@
 
 namespace tessel {
 
-/* The nearest integer, halves to even, whatever direction the host's unit rounds in; |x| is below 2^63. */
+/* The nearest integer, halves to even, whatever direction the host's unit rounds in; |x| is below 2^63. What rounds up
+   to 2^63 wraps around, to the bits of the unsigned value. */
 template <class Real>
 int64 NearestInteger(Real x) {
     constexpr Real kHalf = 0.5;
     const auto whole = static_cast<int64>(x);
     const Real rest = std::fabs(x - static_cast<Real>(whole));  // exact
     const bool stays = rest < kHalf || (rest == kHalf && whole % 2 == 0);
-    return stays ? whole : x < 0 ? whole - 1 : whole + 1;
+    return stays ? whole : static_cast<int64>(static_cast<uint64>(whole) + (x < 0 ? ~uint64{0} : 1));
 }
 
 /* The same for an integer type: what lies outside the range saturates, a NaN gives the maximum. */
