@@ -247,11 +247,15 @@ T Neg(T x) {
     return -x;
 }
 
-/* Halves to even, whatever direction the host's unit rounds in; a zero is positive. */
+/* Halves to even, whatever direction the host's unit rounds in; a zero is positive. From 2^63 on there are only
+   integers, no operand having more than 64 digits. */
 template <class T>
 T Round(T x) {
-    constexpr T kAllWhole = 1 / std::numeric_limits<T>::epsilon();
-    return std::fabs(x) < kAllWhole ? static_cast<T>(NearestInteger(x)) : x;
+    constexpr T kAllWhole = 0x1p63;
+    const T size = std::fabs(x);
+    if (!(size < kAllWhole)) return x;
+    const auto whole = static_cast<T>(static_cast<uint64>(NearestInteger(size)));
+    return x < 0 && whole != 0 ? -whole : whole;
 }
 
 template <class T>

@@ -428,6 +428,9 @@ TEST(ComplexMath, ExtendedQuotientsStayInRange) {
     cmplxExt less1{};
     RTcExpm1X(&large, &less1);
     EXPECT_NEAR(static_cast<double>(ToExtended(less1.re) / ToExtended(result.re)), 1, 1e-15);
+    floatExt half = FromExtended(-9223372036854775807.5L);
+    RTfRoundX(&half, &half);
+    EXPECT_EQ(ToExtended(half), -0x1p63L);
     floatExt log = FromExtended(1000);
     RTfLog10X(&log, &log);
     EXPECT_EQ(ToExtended(log), 3);
