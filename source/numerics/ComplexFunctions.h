@@ -9,6 +9,7 @@
 #include <type_traits>
 
 #include "numerics/RealFunctions.h"
+#include "numerics/Turns.h"
 #include "numerics/TwoParts.h"
 
 namespace tessel::cmplx {
@@ -97,15 +98,56 @@ int Exponent(const Complex<W>& z) {
     return std::ilogb(std::fmax(std::fabs(z.real()), std::fabs(z.imag())));
 }
 
-/* The textbook quotient; finite operands are brought near 1 where squares or products would leave the range. */
+template <class W>
+constexpr W PowerOf2(int exponent) {
+    W power = 1;
+    for (; exponent > 0; --exponent) power *= 2;
+    return power;
+}
+
+/* ab - cd as a value times 2^exponent, so that no product of finite factors leaves the range. */
+template <class W>
+W ScaledDifferenceOfProducts(W a, W b, W c, W d, int& exponent) {
+    const bool onlySecond = a == 0 || b == 0;
+    const bool onlyFirst = c == 0 || d == 0;
+    const auto takeApart = [](W& x) {
+        int power = 0;
+        x = std::frexp(x, &power);
+        return power;
+    };
+    const int first = takeApart(a) + takeApart(b);
+    const int second = takeApart(c) + takeApart(d);
+    exponent = onlySecond ? second : onlyFirst ? first : std::max(first, second);
+    return DifferenceOfProducts(std::scalbn(a, std::min(first - exponent, 0)), b,
+                                std::scalbn(c, std::min(second - exponent, 0)), d);
+}
+
+/* The textbook quotient of any finite operands, y not being 0. */
+template <class W>
+Complex<W> ScaledQuotient(const Complex<W>& x, const Complex<W>& y) {
+    const int power = Exponent(y);
+    const Complex<W> near = ScaleByPowerOf2(y, -power);
+    const W divisor = near.real() * near.real() + near.imag() * near.imag();
+    const auto part = [&](W a, W b, W c, W d) {
+        int exponent = 0;
+        const W dividend = ScaledDifferenceOfProducts(a, b, c, d, exponent);
+        return std::scalbn(dividend / divisor, exponent - 2 * power);
+    };
+    return {part(x.real(), y.real(), -x.imag(), y.imag()), part(x.imag(), y.real(), x.real(), y.imag())};
+}
+
+/* The textbook quotient; finite operands are scaled where squares or products would leave the range. */
 template <class W>
 Complex<W> Divide(const Complex<W>& x, const Complex<W>& y) {
-    constexpr int kSafe = std::numeric_limits<W>::max_exponent / 4;
     if (!IsFinite(x) || !IsFinite(y) || IsZero(x) || IsZero(y)) return TextbookQuotient(x, y);
-    const int xPower = Exponent(x);
-    const int yPower = Exponent(y);
-    if (std::abs(xPower) < kSafe && std::abs(yPower) < kSafe) return TextbookQuotient(x, y);
-    return ScaleByPowerOf2(TextbookQuotient(ScaleByPowerOf2(x, -xPower), ScaleByPowerOf2(y, -yPower)), xPower - yPower);
+    const auto isSafe = [](W part) {
+        constexpr int kSafe = std::numeric_limits<W>::max_exponent / 4;
+        constexpr W kLarge = PowerOf2<W>(kSafe);
+        const W size = std::fabs(part);
+        return size == 0 || (size < kLarge && size > 1 / kLarge);
+    };
+    const bool safe = isSafe(x.real()) && isSafe(x.imag()) && isSafe(y.real()) && isSafe(y.imag());
+    return safe ? TextbookQuotient(x, y) : ScaledQuotient(x, y);
 }
 
 /* 1 / z: infinite for a zero, zero for an infinity. */
@@ -176,9 +218,23 @@ Complex<W> Log2(const Complex<W>& z) {
     return {log.real() * kLog2E<W>, log.imag() * kLog2E<W>};
 }
 
+/* ln z / ln base; two real logarithms give the real quotient, and one infinite logarithm an infinite or zero result in
+   the direction of the quotient. */
 template <class W>
 Complex<W> Logx(const Complex<W>& base, const Complex<W>& z) {
-    return Divide(std::log(z), std::log(base));
+    const auto log = [](const Complex<W>& x) { return IsZero(x) ? Complex<W>(-real::kInfinity<W>) : std::log(x); };
+    const Complex<W> dividend = log(z);
+    const Complex<W> divisor = log(base);
+    if (dividend.imag() == 0 && divisor.imag() == 0) return {dividend.real() / divisor.real(), 0};
+    const bool infiniteDividend = std::isinf(dividend.real());
+    const bool infiniteDivisor = std::isinf(divisor.real());
+    if (infiniteDividend == infiniteDivisor) return Divide(dividend, divisor);
+    const auto direction = [](const Complex<W>& x) { return Complex<W>(std::copysign(W{1}, x.real())); };
+    const Complex<W> quotient =
+        infiniteDividend ? Divide(direction(dividend), divisor) : Divide(dividend, direction(divisor));
+    const W size = infiniteDividend ? real::kInfinity<W> : W{0};
+    const auto part = [size](W x) { return x == 0 ? x : x * size; };
+    return {part(quotient.real()), part(quotient.imag())};
 }
 
 /* |1 + z|^2 - 1 = 2x + x^2 + y^2, without losing bits where the terms cancel. */
@@ -206,6 +262,16 @@ Complex<W> Lognp1(const Complex<W>& z) {
 
 // ---- powers --------------------------------------------------------------------------------------------------------
 
+/* power(x) times (a + bi), where power is an exponential function and |a|, |b| at most 1: a part may be in range though
+   the power itself is not. */
+template <class W, class Power>
+Complex<W> ScaledByPower(Power power, W x, W a, W b) {
+    const W whole = power(x);
+    if (std::isfinite(whole)) return {whole * a, whole * b};
+    const W half = power(x / 2);
+    return {half * a * half, half * b * half};
+}
+
 /* e^z - 1 = (e^x - 1) cos y - 2 sin^2(y/2) + i e^x sin y */
 template <class W>
 Complex<W> Expm1(const Complex<W>& z) {
@@ -213,42 +279,75 @@ Complex<W> Expm1(const Complex<W>& z) {
     const W y = z.imag();
     if (y == 0) return {std::expm1(x), y};
     if (!IsFinite(z)) return std::exp(z) - Complex<W>(1);
+    const W exp = std::exp(x);
+    if (std::isinf(exp)) {
+        return ScaledByPower([](W power) { return std::exp(power); }, x, std::cos(y), std::sin(y));
+    }
     const W halfSine = std::sin(y / 2);
-    return {std::expm1(x) * std::cos(y) - 2 * halfSine * halfSine, std::exp(x) * std::sin(y)};
+    return {std::expm1(x) * std::cos(y) - 2 * halfSine * halfSine, exp * std::sin(y)};
 }
 
-/* b^z for a positive real base: b^x at the angle y ln b. */
+/* An angle as cosine and sine. */
 template <class W>
-Complex<W> PowerOfBase(W magnitude, W y, const TwoParts<W>& lnBase) {
-    if (y == 0) return {magnitude, y};
+Complex<W> Turned(const ReducedAngle& angle) {
+    const W cosine = std::cos(static_cast<W>(angle.rest));
+    const W sine = std::sin(static_cast<W>(angle.rest));
+    switch (angle.quarters) {
+        case 0:
+            return {cosine, sine};
+        case 1:
+            return {-sine, cosine};
+        case 2:
+            return {-cosine, -sine};
+        default:
+            return {sine, -cosine};
+    }
+}
+
+/* b^iy as cosine and sine of the angle y ln b. */
+template <class W>
+Complex<W> Turn(W y, const TwoParts<W>& lnBase, ReducedAngle (*reduce)(Extended)) {
+    constexpr W kLarge = 256;  // up to here two parts of the angle are enough
+    if (std::fabs(y) > kLarge) return Turned<W>(reduce(y));
     const TwoParts<W> angle = ExactProduct(y, lnBase.high);
     const W rest = angle.low + y * lnBase.low;
     const W cosine = std::cos(angle.high);
     const W sine = std::sin(angle.high);
-    return {magnitude * (cosine - rest * sine), magnitude * (sine + rest * cosine)};
+    return {cosine - rest * sine, sine + rest * cosine};
 }
 
 template <class W>
 Complex<W> Pow10(const Complex<W>& z) {
     if (!IsFinite(z)) return std::exp(Complex<W>(z.real() * kLn10<W>.high, z.imag() * kLn10<W>.high));
-    return PowerOfBase(real::Pow10(z.real()), z.imag(), kLn10<W>);
+    const auto power = [](W x) { return real::Pow10(x); };
+    if (z.imag() == 0) return {power(z.real()), z.imag()};
+    const Complex<W> turn = Turn(z.imag(), kLn10<W>, AngleOfPowerOf10);
+    return ScaledByPower(power, z.real(), turn.real(), turn.imag());
 }
 
 template <class W>
 Complex<W> Pow2(const Complex<W>& z) {
     if (!IsFinite(z)) return std::exp(Complex<W>(z.real() * kLn2<W>.high, z.imag() * kLn2<W>.high));
-    return PowerOfBase(std::exp2(z.real()), z.imag(), kLn2<W>);
+    const auto power = [](W x) { return std::exp2(x); };
+    if (z.imag() == 0) return {power(z.real()), z.imag()};
+    const Complex<W> turn = Turn(z.imag(), kLn2<W>, AngleOfPowerOf2);
+    return ScaledByPower(power, z.real(), turn.real(), turn.imag());
 }
 
-/* z to a whole power by repeated squaring. */
+/* z to a whole power by repeated squaring, with z brought near 1 where a product on the way could leave the range. */
 template <class W>
 Complex<W> WholePower(Complex<W> z, int power) {
+    const int size = std::abs(power);
+    const int exponent = Exponent(z);
+    const bool scaled = (std::abs(exponent) + 2) * size >= std::numeric_limits<W>::max_exponent;
+    if (scaled) z = ScaleByPowerOf2(z, -exponent);
     Complex<W> result(1);
-    for (int left = std::abs(power); left != 0; left /= 2) {
+    for (int left = size; left != 0; left /= 2) {
         if (left % 2 != 0) result = Multiply(result, z);
-        z = Multiply(z, z);
+        if (left > 1) z = Multiply(z, z);
     }
-    return power < 0 ? Recip(result) : result;
+    if (power < 0) result = Recip(result);
+    return scaled ? ScaleByPowerOf2(result, exponent * power) : result;
 }
 
 template <class W>
@@ -269,8 +368,8 @@ Complex<W> Powx(const Complex<W>& x, const Complex<W>& y) {
     if (!IsFinite(x) || !IsFinite(y)) return std::exp(Multiply(y, std::log(x)));
     if (isWhole && std::fabs(y.real()) <= kLargestWhole) return WholePower(x, static_cast<int>(y.real()));
     const Complex<W> log = std::log(x);
-    const W magnitude = std::exp(y.real() * log.real() - y.imag() * log.imag());
-    return ToRectangular(Complex<W>(magnitude, y.imag() * log.real() + y.real() * log.imag()));
+    const W angle = y.imag() * log.real() + y.real() * log.imag();
+    return std::exp(Complex<W>(y.real() * log.real() - y.imag() * log.imag(), angle));
 }
 
 // ---- trigonometry --------------------------------------------------------------------------------------------------
@@ -290,9 +389,17 @@ Complex<W> Cot(const Complex<W>& z) {
     return Recip(std::tan(z));
 }
 
+/* sin z / z. Far from the real axis the sine is e^|y| / 2 times (sin x, +-cos x), and out of range before the quotient.
+ */
 template <class W>
 Complex<W> Sinc(const Complex<W>& z) {
-    return IsZero(z) ? Complex<W>(1) : Divide(std::sin(z), z);
+    constexpr W kFar = 100;
+    if (IsZero(z)) return 1;
+    const W x = z.real();
+    const W y = std::fabs(z.imag());
+    if (!IsFinite(z) || y < kFar) return Divide(std::sin(z), z);
+    const Complex<W> turn = Divide(Complex<W>(std::sin(x) / 2, z.imag() < 0 ? -std::cos(x) / 2 : std::cos(x) / 2), z);
+    return ScaledByPower([](W power) { return std::exp(power); }, y, turn.real(), turn.imag());
 }
 
 /* The arctangent of y / x. */

@@ -178,18 +178,25 @@ Pair PowerOfSteps(int64 n) {
     return {power.high * scale, power.low * scale};
 }
 
-// sinh(x) and cosh(x), each times two; 0.5 <= x < 700.
+constexpr double kHyperbolicEnd = 700;
+constexpr double kHyperbolicLimit = 712;  // above it both are infinite
+
+// sinh(x) and cosh(x), each times two; 0.5 <= x < kHyperbolicEnd. Far ones, from there to kHyperbolicLimit, where e^x
+// may leave the range and e^-x is lost beside it, also times 2^-kLowered.
+constexpr int64 kLowered = 64;
 struct Hyperbolic {
     Pair sine;
     Pair cosine;
 };
 
+template <bool kFar>
 Hyperbolic TwiceSinhCosh(double x) {
     constexpr double kRounder = 0x1.8p52;
     const double steps = (x * (1 / (kStep.high + kStep.low)) + kRounder) - kRounder;
     const double r = (x - steps * kStep.high) - steps * kStep.low;
-    const Pair up = PowerOfSteps(static_cast<int64>(steps));
-    const Pair down = PowerOfSteps(-static_cast<int64>(steps));
+    const auto n = static_cast<int64>(steps);
+    const Pair up = PowerOfSteps(kFar ? n - kLowered * kSteps : n);
+    const Pair down = kFar ? Pair{0, 0} : PowerOfSteps(-n);
     const double rr = r * r;
     const double sine = r + r * rr * (1.0 / 6 + rr * (1.0 / 120));
     const double cosineLess1 = rr * (0.5 + rr * (1.0 / 24 + rr * (1.0 / 720)));
@@ -212,7 +219,6 @@ double CoshLess1(double x) {
 }
 
 constexpr double kSeriesEnd = 0.5;
-constexpr double kHyperbolicEnd = 700;
 
 // ---- angles --------------------------------------------------------------------------------------------------------
 
@@ -308,8 +314,31 @@ double Log10(double x) {
 double Sinh(double x) {
     const double size = std::fabs(x);
     if (size < kSeriesEnd) return x + SinhTail(x);
-    if (!(size < kHyperbolicEnd)) return std::sinh(x);
-    return std::copysign(Rounded(TwiceSinhCosh(size).sine) / 2, x);
+    if (!(size < kHyperbolicLimit)) return std::sinh(x);
+    if (size < kHyperbolicEnd) return std::copysign(Rounded(TwiceSinhCosh<false>(size).sine) / 2, x);
+    return std::copysign(Rounded(TwiceSinhCosh<true>(size).sine) * PowerOfTwo(kLowered - 1), x);
+}
+
+// The library's is as good but where the power leaves the range before the result does.
+double Cosh(double x) {
+    const double size = std::fabs(x);
+    if (!(size >= kHyperbolicEnd && size < kHyperbolicLimit)) return std::cosh(x);
+    return Rounded(TwiceSinhCosh<true>(size).cosine) * PowerOfTwo(kLowered - 1);
+}
+
+// The library reduces large angles with too few digits for those near a multiple of a right angle.
+constexpr double kLibraryAngle = 0x1p26;
+
+double Sin(double x) {
+    return std::fabs(x) < kLibraryAngle ? std::sin(x) : static_cast<double>(std::sin(static_cast<Extended>(x)));
+}
+
+double Cos(double x) {
+    return std::fabs(x) < kLibraryAngle ? std::cos(x) : static_cast<double>(std::cos(static_cast<Extended>(x)));
+}
+
+double Tan(double x) {
+    return std::fabs(x) < kLibraryAngle ? std::tan(x) : static_cast<double>(std::tan(static_cast<Extended>(x)));
 }
 
 double Tanh(double x) {
@@ -320,7 +349,7 @@ double Tanh(double x) {
         return Rounded(Quotient(ExactSumOrdered(x, SinhTail(x)), ExactSumOrdered(1.0, CoshLess1(x))));
     }
     if (!(size < kOneFrom)) return std::tanh(x);
-    const Hyperbolic both = TwiceSinhCosh(size);
+    const Hyperbolic both = TwiceSinhCosh<false>(size);
     return std::copysign(Rounded(Quotient(both.sine, both.cosine)), x);
 }
 

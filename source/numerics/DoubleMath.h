@@ -6,7 +6,11 @@
 namespace tessel::precise {
 
 double Log10(double x);
+double Sin(double x);
+double Cos(double x);
+double Tan(double x);
 double Sinh(double x);
+double Cosh(double x);
 double Tanh(double x);
 double Asinh(double x);
 double Acosh(double x);

@@ -2,6 +2,7 @@
 
 #include <bit>
 #include <cfenv>
+#include <cmath>
 #include <limits>
 #include <type_traits>
 
@@ -75,13 +76,25 @@ Register Pop() {
     return top;
 }
 
+// The denormal bit, when a value that is loaded or stored is one.
+void NoteDenormal(bool isDenormal) {
+    if (isDenormal) tUnit.status |= kFPStatDenormal;
+}
+
+bool IsDenormal(const floatExt& x) {
+    return (x.signExponent & kExtendedExponentMask) == 0 && x.mantissa != 0;
+}
+
 // A double's bits as those of an extended real.
 Register Widen(double x) {
     constexpr int32 kSpecial = 0x7FF;
     constexpr int32 kRebias = kExtendedBias - 1023;
     const auto bits = std::bit_cast<uint64>(x);
     const auto exponent = static_cast<int32>(bits >> 52 & kSpecial);
-    if (exponent == 0 || exponent == kSpecial) return Unpack(FromExtended(x));
+    if (exponent == 0 || exponent == kSpecial) {
+        NoteDenormal(std::fpclassify(x) == FP_SUBNORMAL);
+        return Unpack(FromExtended(x));
+    }
     const auto sign = static_cast<uint32>(bits >> 48) & kExtendedSign;
     return {kExtendedIntegerBit | bits << 11, sign | static_cast<uint32>(exponent + kRebias), 0};
 }
@@ -100,28 +113,76 @@ struct NarrowFormat {
     static constexpr int32 kLargestExponent = 2 * std::numeric_limits<Real>::max_exponent - 2;
     static constexpr int32 kFractionBits = std::numeric_limits<Real>::digits - 1;
     static constexpr int32 kSignBit = 8 * sizeof(Real) - 1;
+    static constexpr uint64 kSmallestNormal = uint64{1} << kFractionBits;
+    static constexpr uint64 kInfinity = static_cast<uint64>(kLargestExponent + 1) << kFractionBits;
 };
 
-// Rounds to nearest; where the value lies exactly between two of the narrower reals, the rest decides.
+// A magnitude cut down to a narrower real's bits, and how what was cut off compares with half a unit of them.
+enum class Cut { kNothing, kBelowHalf, kHalf, kAboveHalf };
+struct CutMagnitude {
+    uint64 bits;
+    Cut cut;
+};
+
 template <class Real>
-Real Narrow(Register from) {
+CutMagnitude CutDown(const Register& from) {
     using Format = NarrowFormat<Real>;
-    const uint64 mantissa = from.mantissa;
     const int32 exponent = (from.signExponent & kExtendedExponentMask) - Format::kRebias;
+    if (exponent > Format::kLargestExponent) return {Format::kInfinity - 1, Cut::kAboveHalf};
+    const int32 outward = (from.signExponent & kExtendedSign) != 0 ? -from.rest : from.rest;
     const int32 dropped = Format::kDropped + (exponent < 1 ? 1 - exponent : 0);
-    if (mantissa >> 63 == 0 || dropped > 63 || exponent >= Format::kLargestExponent) {
+    if (dropped > 64) return {0, from.mantissa == 0 && outward == 0 ? Cut::kNothing : Cut::kBelowHalf};
+    const uint64 half = uint64{1} << (dropped - 1);
+    const uint64 tail = from.mantissa & (half | (half - 1));
+    const uint64 kept = dropped == 64 ? 0 : from.mantissa >> dropped;
+    // The integer bit adds one to the exponent.
+    const uint64 bits = (static_cast<uint64>(exponent < 1 ? 0 : exponent - 1) << Format::kFractionBits) + kept;
+    if (tail == 0) {
+        if (outward < 0) return {bits - 1, Cut::kAboveHalf};
+        return {bits, outward > 0 ? Cut::kBelowHalf : Cut::kNothing};
+    }
+    if (tail != half) return {bits, tail > half ? Cut::kAboveHalf : Cut::kBelowHalf};
+    return {bits, outward == 0 ? Cut::kHalf : outward > 0 ? Cut::kAboveHalf : Cut::kBelowHalf};
+}
+
+// Whether a magnitude of which something was cut off is rounded up, in the direction in force.
+bool RoundsOutward(const CutMagnitude& x, bool negative) {
+    switch (std::fegetround()) {
+        case FE_TONEAREST:
+            return x.cut == Cut::kAboveHalf || (x.cut == Cut::kHalf && (x.bits & 1) != 0);
+        case FE_UPWARD:
+            return !negative;
+        case FE_DOWNWARD:
+            return negative;
+        default:
+            return false;
+    }
+}
+
+// Rounds once, whatever rounding made the register's value: its rest takes part.
+template <class Real>
+Real Narrow(const Register& from) {
+    using Format = NarrowFormat<Real>;
+    const uint32 exponent = from.signExponent & kExtendedExponentMask;
+    if (exponent == kExtendedExponentMask || (exponent != 0 && from.mantissa >> 63 == 0)) {
         return static_cast<Real>(ToExtended(Pack(from)));
     }
-    const uint64 half = uint64{1} << (dropped - 1);
-    const uint64 tail = mantissa & (2 * half - 1);
-    const uint64 kept = mantissa >> dropped;
-    const int32 outward = (from.signExponent & kExtendedSign) != 0 ? -from.rest : from.rest;
-    const bool up = tail > half || (tail == half && (outward > 0 || (outward == 0 && (kept & 1) != 0)));
-    // The integer bit adds one to the exponent, and so does a carry out of the mantissa.
-    const auto below = static_cast<uint64>(exponent < 1 ? 0 : exponent - 1);
-    const uint64 magnitude = (below << Format::kFractionBits) + kept + (up ? 1 : 0);
-    const uint64 sign = static_cast<uint64>(from.signExponent >> 15) << Format::kSignBit;
-    return std::bit_cast<Real>(static_cast<typename Format::Bits>(sign | magnitude));
+    const bool negative = (from.signExponent & kExtendedSign) != 0;
+    const CutMagnitude magnitude = CutDown<Real>(from);
+    uint64 bits = magnitude.bits;
+    uint16 status = 0;
+    if (magnitude.cut != Cut::kNothing) {
+        bits += RoundsOutward(magnitude, negative) ? 1 : 0;
+        status = kFPStatInexact;
+        if (bits < Format::kSmallestNormal) status |= kFPStatUnderflow;
+        if (bits == Format::kInfinity || static_cast<int32>(exponent) > Format::kRebias + Format::kLargestExponent) {
+            status |= kFPStatOverflow;
+        }
+    }
+    if (bits != 0 && bits < Format::kSmallestNormal) status |= kFPStatDenormal;
+    tUnit.status |= status;
+    const uint64 sign = static_cast<uint64>(negative) << Format::kSignBit;
+    return std::bit_cast<Real>(static_cast<typename Format::Bits>(sign | bits));
 }
 
 template <class Real>
@@ -150,6 +211,23 @@ void PopInto(int16 type, void* value) {
         default:
             return WriteNumber(type, {PopRegister(), 0}, value);
     }
+}
+
+// A part of a value of `type`, as it was read.
+void LoadPart(int16 type, Extended part) {
+    switch (type) {
+        case kNumSingle:
+        case kNumComplexSingle:
+            NoteDenormal(std::fpclassify(static_cast<float>(part)) == FP_SUBNORMAL);
+            break;
+        case kNumDouble:
+        case kNumComplexDouble:
+            NoteDenormal(std::fpclassify(static_cast<double>(part)) == FP_SUBNORMAL);
+            break;
+        default:
+            NoteDenormal(IsDenormal(FromExtended(part)));
+    }
+    PushRegister(part);
 }
 
 void StoreDecimal(const RealParts& x, int32 digits, PackedDecimal& record) {
@@ -230,6 +308,7 @@ FP_LOAD_INTEGER(UInt32, uint32)
 FP_LOAD_INTEGER(UInt64, uint64)
 
 void FPLoadFlt32(const float* value) {
+    NoteDenormal(std::fpclassify(*value) == FP_SUBNORMAL);
     PushRegister(*value);
 }
 
@@ -238,6 +317,7 @@ void FPLoadFlt64(const double* value) {
 }
 
 void FPLoadExt(const floatExt* value) {
+    NoteDenormal(IsDenormal(*value));
     Push(Unpack(*value));
 }
 
@@ -260,8 +340,8 @@ void NumToFPR(int16 code, const void* value) {
     const int32 numberClass = NumClass(type);
     if (numberClass == kNumClassNone) return;
     const ExtendedComplex number = ReadNumber(type, value);
-    if (numberClass == kNumClassComplex) PushRegister(number.im);
-    PushRegister(number.re);
+    if (numberClass == kNumClassComplex) LoadPart(type, number.im);
+    LoadPart(type, number.re);
 }
 
 void FPPush(void) {
@@ -301,6 +381,7 @@ void FPStoreFlt64(double* value) {
 
 void FPStoreExt(floatExt* value) {
     *value = Pack(Pop());
+    NoteDenormal(IsDenormal(*value));
 }
 
 void FPStorePDR(int32 digits, PackedDecimal* record) {

@@ -10,18 +10,29 @@
 
 namespace tessel {
 
-/* The nearest integer, halves to even; what lies outside the range saturates, a NaN gives the maximum. */
+/* The nearest integer, halves to even, whatever direction the host's unit rounds in; |x| is below 2^63. What rounds up
+   to 2^63 wraps around, to the bits of the unsigned value. */
+template <class Real>
+int64 NearestInteger(Real x) {
+    constexpr Real kHalf = 0.5;
+    const auto whole = static_cast<int64>(x);
+    const Real rest = std::fabs(x - static_cast<Real>(whole));  // exact
+    const bool stays = rest < kHalf || (rest == kHalf && whole % 2 == 0);
+    return stays ? whole : static_cast<int64>(static_cast<uint64>(whole) + (x < 0 ? ~uint64{0} : 1));
+}
+
+/* The same for an integer type: what lies outside the range saturates, a NaN gives the maximum. */
 template <class Int, class Real>
 Int SaturatedRound(Real x) {
     constexpr Int kMax = std::numeric_limits<Int>::max();
     constexpr Int kMin = std::numeric_limits<Int>::min();
+    constexpr Real kTwoTo63 = 0x1p63;
     if (!(x < static_cast<Real>(kMax))) return kMax;
     if (x <= static_cast<Real>(kMin)) return kMin;
     if constexpr (std::is_same_v<Int, uint64>) {
-        return static_cast<uint64>(std::nearbyint(x));
-    } else {
-        return static_cast<Int>(std::llrint(x));
+        if (x >= kTwoTo63) return static_cast<uint64>(NearestInteger(x - kTwoTo63)) + (uint64{1} << 63);
     }
+    return static_cast<Int>(NearestInteger(x));
 }
 
 template <class T>

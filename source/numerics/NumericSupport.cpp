@@ -12,7 +12,7 @@ namespace {
 constexpr int kTypes = 16;
 
 // By type code. The sizes of the extended types can be set.
-uint8 gNumSizes[kTypes] = {0, 1, 2, 4, 8, 1, 2, 4, 8, 4, 8, 10, 8, 16, 20, 0};
+int32 gNumSizes[kTypes] = {0, 1, 2, 4, 8, 1, 2, 4, 8, 4, 8, 10, 8, 16, 20, 0};
 
 constexpr uint8 kNumClasses[kTypes] = {
     kNumClassNone,     kNumClassSigned,   kNumClassSigned,   kNumClassSigned, kNumClassSigned, kNumClassUnsigned,
@@ -24,7 +24,7 @@ constexpr int16 kFirstCode = 1;
 constexpr int16 kLastCode = 30;
 
 bool IsNumericCode(int16 code) {
-    return code >= kFirstCode && code <= kLastCode;
+    return code >= kFirstCode && code <= kLastCode && kNumClasses[TypeOfCode(code)] != kNumClassNone;
 }
 
 const void* ImaginaryExtended(const void* value) {
@@ -134,9 +134,9 @@ int32 NumClass(int16 code) {
 }
 
 uint8 SetFxSize(uint8 size) {
-    const uint8 previous = gNumSizes[kNumExtended];
+    const auto previous = static_cast<uint8>(gNumSizes[kNumExtended]);
     gNumSizes[kNumExtended] = size;
-    gNumSizes[kNumComplexExtended] = static_cast<uint8>(2 * size);
+    gNumSizes[kNumComplexExtended] = 2 * size;
     return previous;
 }
 

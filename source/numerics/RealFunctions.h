@@ -9,6 +9,8 @@
 
 #include "numerics/DoubleMath.h"
 #include "numerics/Extended.h"
+#include "numerics/NumericAccess.h"
+#include "numerics/TwoParts.h"
 
 namespace tessel::real {
 
@@ -68,9 +70,29 @@ T Logn(T x) {
     return x > 0 ? std::log(x) : LogOutside(x);
 }
 
+/* log10(m 2^e) = log10(m) + e log10(2), which is exact at the powers of ten where the library's own is not. */
+inline Extended ExtendedLog10(Extended x) {
+    constexpr TwoParts<Extended> kLog10Of2 = {0x9A209A84FBCFp-49L, 0xF7988F8959AC0B7Dp-113L};  // high times e is exact
+    constexpr Extended kRootOfHalf = 0.70710678118654752440L;
+    if (!std::isfinite(x)) return x;
+    int exponent = 0;
+    Extended mantissa = std::frexp(x, &exponent);
+    if (mantissa < kRootOfHalf) {
+        mantissa *= 2;
+        --exponent;
+    }
+    const auto power = static_cast<Extended>(exponent);
+    return power * kLog10Of2.high + (power * kLog10Of2.low + std::log10(mantissa));
+}
+
 template <class T>
 T Log10(T x) {
-    return x > 0 ? Careful(x, precise::Log10, [](auto wide) { return std::log10(wide); }) : LogOutside(x);
+    if (!(x > 0)) return LogOutside(x);
+    if constexpr (std::is_same_v<T, Extended>) {
+        return ExtendedLog10(x);
+    } else {
+        return Careful(x, precise::Log10, [](double wide) { return std::log10(wide); });
+    }
 }
 
 template <class T>
@@ -124,6 +146,25 @@ MantissaAndExponent<T> GetMantExp(T x) {
 
 // ---- trigonometry --------------------------------------------------------------------------------------------------
 
+/* Only doubles need more than the library gives. */
+template <class T>
+T Sin(T x) {
+    if constexpr (std::is_same_v<T, double>) return precise::Sin(x);
+    return std::sin(x);
+}
+
+template <class T>
+T Cos(T x) {
+    if constexpr (std::is_same_v<T, double>) return precise::Cos(x);
+    return std::cos(x);
+}
+
+template <class T>
+T Tan(T x) {
+    if constexpr (std::is_same_v<T, double>) return precise::Tan(x);
+    return std::tan(x);
+}
+
 template <class T>
 T Sec(T x) {
     return Careful(x, precise::Sec, [](auto wide) { return 1 / std::cos(wide); });
@@ -157,6 +198,11 @@ T Atan2(T x, T y) {
 template <class T>
 T Sinh(T x) {
     return Careful(x, precise::Sinh, [](auto wide) { return std::sinh(wide); });
+}
+
+template <class T>
+T Cosh(T x) {
+    return Careful(x, precise::Cosh, [](auto wide) { return std::cosh(wide); });
 }
 
 template <class T>
@@ -201,10 +247,15 @@ T Neg(T x) {
     return -x;
 }
 
-/* Halves to even. */
+/* Halves to even, whatever direction the host's unit rounds in; a zero is positive. From 2^63 on there are only
+   integers, no operand having more than 64 digits. */
 template <class T>
 T Round(T x) {
-    return std::nearbyint(x);
+    constexpr T kAllWhole = 0x1p63;
+    const T size = std::fabs(x);
+    if (!(size < kAllWhole)) return x;
+    const auto whole = static_cast<T>(static_cast<uint64>(NearestInteger(size)));
+    return x < 0 && whole != 0 ? -whole : whole;
 }
 
 template <class T>
@@ -213,12 +264,13 @@ T Sign(T x) {
     return x > 0 ? T{1} : x < 0 ? T{-1} : T{0};
 }
 
-/* x - floor(x / y) y, without the rounding of the quotient where that is finite. */
+/* x - floor(x / y) y, without the rounding of the quotient where that is finite; a zero is positive. */
 template <class T>
 T Mod(T x, T y) {
     if (!std::isfinite(x) || !std::isfinite(y)) return x - std::floor(x / y) * y;
     const T remainder = std::fmod(x, y);
-    return remainder != 0 && (remainder < 0) != (y < 0) ? remainder + y : remainder;
+    if (remainder == 0) return 0;
+    return (remainder < 0) != (y < 0) ? remainder + y : remainder;
 }
 
 template <class T>
@@ -232,7 +284,8 @@ QuotientAndRemainder<T> QRem(T x, T y) {
     const T quotient = std::floor(x / y);
     if (!std::isfinite(x) || !std::isfinite(y) || y == 0) return {quotient, x - y * quotient};
     const T remainder = Mod(x, y);
-    return {std::isinf(quotient) ? quotient : std::nearbyint((x - remainder) / y), remainder};
+    if (std::isinf(quotient) || x == 0) return {quotient, remainder};
+    return {Round((x - remainder) / y), remainder};
 }
 
 template <class T>

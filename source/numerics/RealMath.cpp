@@ -146,9 +146,9 @@ REAL_BINARY(RTfPowx, std::pow)
 
 // ---- trigonometry ----
 
-REAL_UNARY(RTfSin, std::sin)
-REAL_UNARY(RTfCos, std::cos)
-REAL_UNARY(RTfTan, std::tan)
+REAL_UNARY(RTfSin, real::Sin)
+REAL_UNARY(RTfCos, real::Cos)
+REAL_UNARY(RTfTan, real::Tan)
 REAL_UNARY(RTfSec, real::Sec)
 REAL_UNARY(RTfCsc, real::Csc)
 REAL_UNARY(RTfCot, real::Cot)
@@ -158,7 +158,7 @@ REAL_UNARY(RTfAcos, std::acos)
 REAL_UNARY(RTfAtan, std::atan)
 REAL_BINARY(RTfAtan2, real::Atan2)
 REAL_UNARY(RTfSinh, real::Sinh)
-REAL_UNARY(RTfCosh, std::cosh)
+REAL_UNARY(RTfCosh, real::Cosh)
 REAL_UNARY(RTfTanh, real::Tanh)
 REAL_UNARY(RTfAsinh, real::Asinh)
 REAL_UNARY(RTfAcosh, real::Acosh)
@@ -184,13 +184,13 @@ void RTfGetMantExpX(const floatExt* x, floatExt* mantissa, floatExt* exponent) {
 
 void RTfSinCosS(const float* x, float* sine, float* cosine) {
     const float angle = *x;
-    if (sine != nullptr) *sine = std::sin(angle);
-    if (cosine != nullptr) *cosine = std::cos(angle);
+    if (sine != nullptr) *sine = real::Sin(angle);
+    if (cosine != nullptr) *cosine = real::Cos(angle);
 }
 void RTfSinCosD(const double* x, double* sine, double* cosine) {
     const double angle = *x;
-    if (sine != nullptr) *sine = std::sin(angle);
-    if (cosine != nullptr) *cosine = std::cos(angle);
+    if (sine != nullptr) *sine = real::Sin(angle);
+    if (cosine != nullptr) *cosine = real::Cos(angle);
 }
 void RTfSinCosX(const floatExt* x, floatExt* sine, floatExt* cosine) {
     const Extended angle = ToExtended(*x);

@@ -2,8 +2,10 @@
 #include <gtest/gtest.h>
 #include <tessel/numerics/FloatingPointConstants.h>
 #include <tessel/numerics/NumericSupport.h>
+#include <tessel/numerics/RealMath.h>
 #include <tessel/numerics/RoundingUtil.h>
 
+#include <cfenv>
 #include <cmath>
 #include <cstring>
 #include <limits>
@@ -42,7 +44,9 @@ TEST(NumericSupport, ExtendedSizeIsSettable) {
     ConvertNum(kNumComplexDouble, &z, kNumComplexExtended, padded);
     EXPECT_EQ(std::memcmp(padded, &packed.re, 10), 0);
     EXPECT_EQ(std::memcmp(padded + 12, &packed.im, 10), 0);
-    EXPECT_EQ(SetFxSize(10), 12);
+    EXPECT_EQ(SetFxSize(128), 12);
+    EXPECT_EQ(NumSize(14), 256);
+    EXPECT_EQ(SetFxSize(10), 128);
 }
 
 TEST(NumericSupport, SmallHelpers) {
@@ -141,7 +145,13 @@ TEST(ConvertNum, DoublesSaturateAndRoundHalvesToEven) {
         values.push_back(
             std::ldexp(static_cast<double>(static_cast<int64>(random())), -static_cast<int>(random() % 70)));
     }
+    std::vector<std::pair<int, double>> cases;  // whatever direction the host rounds in
     for (const double x : values) {
+        for (const int direction : {FE_TONEAREST, FE_UPWARD, FE_DOWNWARD, FE_TOWARDZERO})
+            cases.emplace_back(direction, x);
+    }
+    for (const auto& [direction, x] : cases) {
+        std::fesetround(direction);
         ExpectNearest<int8>(x, Float64ToInt8, kNumInt8);
         ExpectNearest<int16>(x, Float64ToInt16, kNumInt16);
         ExpectNearest<int32>(x, Float64ToInt32, kNumInt32);
@@ -154,7 +164,12 @@ TEST(ConvertNum, DoublesSaturateAndRoundHalvesToEven) {
         EXPECT_EQ(RndToNearestI64(x), Nearest<int64>(x)) << x;
         EXPECT_EQ(RndToNearestU32(x), Nearest<uint32>(x)) << x;
         EXPECT_EQ(RndToNearestU64(x), Nearest<uint64>(x)) << x;
+        double rounded = 0;
+        RTfRoundD(&x, &rounded);
+        const bool isSmall = std::fabs(x) < 0x1p62;
+        EXPECT_EQ(isSmall ? rounded : 0, isSmall ? static_cast<double>(Nearest<int64>(x)) : 0) << x;
     }
+    std::fesetround(FE_TONEAREST);
 }
 
 TEST(ConvertNum, ExtendedValuesNearTheLimits) {
@@ -211,12 +226,13 @@ TEST(ConvertNum, BadArgumentsAreReportedAndStoreNothing) {
     ReportRecorder reports;
     int32 value = 7;
     ConvertNum(0, &value, kNumInt32, &value);
-    ConvertNum(kNumInt32, &value, 31, &value);
+    for (const int16 none : {15, 16, 31}) ConvertNum(kNumInt32, &value, none, &value);
+    ConvertNum(15, &value, kNumInt32, &value);
     ConvertNum(kNumInt32, nullptr, kNumInt32, &value);
     ConvertNum(kNumInt32, &value, kNumInt32, nullptr);
     const std::string codes = "ConvertNum called with non-numeric";
     const std::string data = "ConvertNum called with Empty Data";
-    EXPECT_EQ(reports.Texts(4), (std::vector<std::string>{codes, codes, data, data}));
+    EXPECT_EQ(reports.Texts(4), (std::vector<std::string>{codes, codes, codes, codes, codes, data, data}));
     EXPECT_EQ(value, 7);
 }
 

@@ -120,29 +120,18 @@ struct BinaryCase {
 
 TEST(RealMath, TwoOperandsInEveryPrecision) {
     const BinaryCase cases[] = {
-        {"add", ALL(RTfAdd), 1.5, 2, 3.5},
-        {"sub", ALL(RTfSub), 1.5, 2, -0.5},
-        {"mul", ALL(RTfMul), 1.5, -2, -3},
-        {"div", ALL(RTfDiv), 1.5, 0, kInf},
-        {"mod", ALL(RTfMod), -7, 3, 2},
-        {"mod", ALL(RTfMod), 7, -3, -2},
-        {"mod", ALL(RTfMod), 6, 3, 0},
-        {"mod", ALL(RTfMod), 6, 0, kNaN},
-        {"mod", ALL(RTfMod), 5, kInf, kNaN},
-        {"mod", ALL(RTfMod), 16777216, 3, 1},
-        {"logx", ALL(RTfLogx), 2, 8, 3},
-        {"logx", ALL(RTfLogx), 10, 1000, 3},
-        {"logx", ALL(RTfLogx), 10, 0, -kInf},
-        {"logx", ALL(RTfLogx), 10, -1, kNaN},
-        {"powx", ALL(RTfPowx), -2, 3, -8},
-        {"powx", ALL(RTfPowx), -2, 0.5, kNaN},
-        {"atan2", ALL(RTfAtan2), 1, 0, 0},
-        {"atan2", ALL(RTfAtan2), 1, -0.0, -0.0},
-        {"scale", ALL(RTfiScale), 3, 2.9, 12},
-        {"scale", ALL(RTfiScale), 3, -1.9, 1.5},
-        {"scale", ALL(RTfiScale), -3, 1e9, -kInf},
-        {"scale", ALL(RTfiScale), 3, -kInf, 0},
-        {"scale", ALL(RTfiScale), 3, kNaN, kNaN},
+        {"add", ALL(RTfAdd), 1.5, 2, 3.5},       {"sub", ALL(RTfSub), 1.5, 2, -0.5},
+        {"mul", ALL(RTfMul), 1.5, -2, -3},       {"div", ALL(RTfDiv), 1.5, 0, kInf},
+        {"mod", ALL(RTfMod), -7, 3, 2},          {"mod", ALL(RTfMod), 7, -3, -2},
+        {"mod", ALL(RTfMod), 6, -3, 0.0},        {"mod", ALL(RTfMod), -6, 3, 0.0},
+        {"mod", ALL(RTfMod), 6, 0, kNaN},        {"mod", ALL(RTfMod), 5, kInf, kNaN},
+        {"mod", ALL(RTfMod), 16777216, 3, 1},    {"logx", ALL(RTfLogx), 2, 8, 3},
+        {"logx", ALL(RTfLogx), 10, 1000, 3},     {"logx", ALL(RTfLogx), 10, 0, -kInf},
+        {"logx", ALL(RTfLogx), 10, -1, kNaN},    {"powx", ALL(RTfPowx), -2, 3, -8},
+        {"powx", ALL(RTfPowx), -2, 0.5, kNaN},   {"atan2", ALL(RTfAtan2), 1, 0, 0},
+        {"atan2", ALL(RTfAtan2), 1, -0.0, -0.0}, {"scale", ALL(RTfiScale), 3, 2.9, 12},
+        {"scale", ALL(RTfiScale), 3, -1.9, 1.5}, {"scale", ALL(RTfiScale), -3, 1e9, -kInf},
+        {"scale", ALL(RTfiScale), 3, -kInf, 0},  {"scale", ALL(RTfiScale), 3, kNaN, kNaN},
     };
     for (const BinaryCase& c : cases) {
         const auto x = static_cast<float>(c.x);
@@ -203,7 +192,8 @@ TEST(RealMath, TwoResultsEitherOfWhichMayBeNull) {
         double x, y, first, second;
     } cases[] = {
         {RTfQRemD, -7, 3, -3, 2},
-        {RTfQRemD, 7, 3, 2, 1},
+        {RTfQRemD, -6, 3, -2, 0.0},
+        {RTfQRemD, -0.0, 3, -0.0, 0.0},
         {RTfQRemD, 7, -3, -3, -2},
         {RTfQRemD, 1, 0, kInf, kNaN},
         {RTfQRemD, 5, kInf, 0, kNaN},  // as the formula has it
@@ -329,6 +319,7 @@ TEST(ComplexMath, EdgesAndBranchCuts) {
         {"cot", RTcCotD, {0, 1000}, {0, -1}},
         {"sec", RTcSecD, {0, 0}, {1, 0}},
         {"sinc", RTcSincD, {0, 0}, {1, 0}},
+        {"sinc", RTcSincD, {1, 12000}, {kInf, -kInf}},
         {"asin", RTcAsinD, {0, 0}, {0, 0}},
         {"acos", RTcAcosD, {1, 0.0}, {0, -0.0}},
         {"atanh", RTcAtanhD, {1, 0}, {kInf, 0}},
@@ -367,7 +358,12 @@ TEST(ComplexMath, TwoOperands) {
         {"powx", RTcPowxD, {0, 0}, {-2, 0}, {kInf, 0}},
         {"powx", RTcPowxD, {-8, 0}, {3, 0}, {-512, 0}},
         {"powx", RTcPowxD, {1, 1}, {-4, 0}, {-0.25, -0.0}},
+        {"powx", RTcPowxD, {1e300, 1e299}, {-40, 0}, {-0.0, 0.0}},
+        {"powx", RTcPowxD, {1e300, 1e299}, {40, 0}, {-kInf, -kInf}},
         {"logx", RTcLogxD, {2, 0}, {8, 0}, {3, 0}},
+        {"logx", RTcLogxD, {2, 0}, {0, 0}, {-kInf, 0}},
+        {"logx", RTcLogxD, {0, 0}, {2, 0}, {-0.0, 0}},
+        {"logx", RTcLogxD, {0, 2}, {0, 0}, {-kInf, kInf}},
         {"atan2", RTcAtan2D, {1, 0}, {1, 0}, {kPi / 4, 0}},
         {"atan2", RTcAtan2D, {0, 0}, {-5, 0}, {-kPi / 2, 0}},
     };
@@ -422,6 +418,22 @@ TEST(ComplexMath, ExtendedQuotientsStayInRange) {
     EXPECT_EQ(ToExtended(result.re), 1);
     RTcSignX(&x, &result);
     EXPECT_EQ(ToExtended(result.im), -0.8L);
+    const cmplxExt apart = {FromExtended(0x1p9000L), FromExtended(0x1p-9000L)};
+    const cmplxExt one = {FromExtended(1), FromExtended(0)};
+    RTcDivX(&apart, &one, &result);
+    EXPECT_EQ(ToExtended(result.re), 0x1p9000L);
+    EXPECT_EQ(ToExtended(result.im), 0x1p-9000L);
+    const cmplxExt large = {FromExtended(11356.6L), FromExtended(1.5707L)};
+    RTcExpX(&large, &result);
+    cmplxExt less1{};
+    RTcExpm1X(&large, &less1);
+    EXPECT_NEAR(static_cast<double>(ToExtended(less1.re) / ToExtended(result.re)), 1, 1e-15);
+    floatExt half = FromExtended(-9223372036854775807.5L);
+    RTfRoundX(&half, &half);
+    EXPECT_EQ(ToExtended(half), -0x1p63L);
+    floatExt log = FromExtended(1000);
+    RTfLog10X(&log, &log);
+    EXPECT_EQ(ToExtended(log), 3);
 }
 
 // ---- integers ----

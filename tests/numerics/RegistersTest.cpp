@@ -29,6 +29,12 @@ Extended Pop() {
     return ToExtended(value);
 }
 
+void FPInitKeepingDirection() {
+    const int direction = std::fegetround();
+    FPInit();
+    std::fesetround(direction);
+}
+
 class Registers : public testing::Test {
 protected:
     void SetUp() override { FPInit(); }
@@ -200,46 +206,88 @@ TEST_F(Registers, SpecialDecimalRecords) {
     EXPECT_TRUE(std::isnan(Pop()));
 }
 
-TEST_F(Registers, ExtendedValuesComeBackFromText) {
+constexpr int kDirections[] = {FE_TONEAREST, FE_UPWARD, FE_DOWNWARD, FE_TOWARDZERO};
+
+// The host's text conversion rounds once, in the direction in force.
+void ExpectStoredAsText(const PackedDecimal& record) {
+    char text[64] = {record.sign != 0 ? '-' : '+'};
+    char* at = text + 1;
+    for (int digit = 17; digit >= 0; --digit) {
+        *at++ = static_cast<char>('0' + (record.mantissa[digit / 2] >> (digit % 2 * 4) & 15));
+    }
+    std::snprintf(at, 16, "e%d", record.exponent);
+    FPLoadPDR(&record);
+    EXPECT_EQ(Pop(), std::strtold(text, nullptr)) << text;
+    for (const int direction : kDirections) {
+        if (record.exponent > 4900) break;  // infinite already as an extended value
+        std::fesetround(direction);
+        double value = 0;
+        float single = 0;
+        FPLoadPDR(&record);
+        FPStoreFlt64(&value);
+        FPLoadPDR(&record);
+        FPRToNum(kNumSingle, &single);
+        EXPECT_EQ(value, std::strtod(text, nullptr)) << text << ", direction " << direction;
+        EXPECT_EQ(single, std::strtof(text, nullptr)) << text << ", direction " << direction;
+    }
+    std::fesetround(FE_TONEAREST);
+}
+
+// The extended values nearest to the first lie halfway between two doubles, or at one, on the other side of it than the
+// decimals: rounding twice goes wrong.
+TEST_F(Registers, DecimalsAreRoundedOnce) {
+    PackedDecimal record = {{0x93, 0x70, 0x13, 0x01, 0x16, 0x86, 0x32, 0x52, 0x55}, 0, 6, 17};
+    ExpectStoredAsText(record);
+    record.sign = 0x80;
+    ExpectStoredAsText(record);
+    ExpectStoredAsText({{0x97, 0x82, 0x14, 0x00, 0x32, 0x75, 0x57, 0x43, 0x29}, 0, -19, 17});
+    ExpectStoredAsText({{0x39, 0x79, 0x60, 0x09, 0x52, 0x18, 0x93, 0x71, 0x10}, 0, 291, 17});  // the largest exponent
     std::mt19937_64 random(41);
     for (int i = 0; i < 5000; ++i) {
-        PackedDecimal record{};
         for (uint8& byte : record.mantissa) byte = static_cast<uint8>(random() % 10 << 4 | random() % 10);
-        record.mdigits = 17;
-        record.exponent = static_cast<int16>(static_cast<int>(random() % 9900) - 4960);
-        char text[64];
-        char* at = text;
-        for (int digit = 17; digit >= 0; --digit) {
-            *at++ = static_cast<char>('0' + (record.mantissa[digit / 2] >> (digit % 2 * 4) & 15));
-        }
-        std::snprintf(at, 16, "e%d", record.exponent);
-        FPLoadPDR(&record);
-        ASSERT_EQ(Pop(), std::strtold(text, nullptr)) << text;
+        record.sign = random() % 2 != 0 ? 0x80 : 0;
+        const int range = i % 2 != 0 ? 9900 : 700;
+        record.exponent = static_cast<int16>(static_cast<int>(random() % range) - range / 2 - 10);
+        ExpectStoredAsText(record);
     }
 }
 
-// The extended values nearest to these lie halfway between two doubles, on the other side of it than the decimals:
-// rounding twice goes wrong.
-TEST_F(Registers, LoadAndStoreRoundOnce) {
-    const struct {
-        PackedDecimal record;
-        double nearest;
-    } cases[] = {
-        {{{0x93, 0x70, 0x13, 0x01, 0x16, 0x86, 0x32, 0x52, 0x55}, 0, 6, 17}, 0x1.d64cef5951d2bp+78},
-        {{{0x93, 0x70, 0x13, 0x01, 0x16, 0x86, 0x32, 0x52, 0x55}, 0x80, 6, 17}, -0x1.d64cef5951d2bp+78},
-        {{{0x97, 0x82, 0x14, 0x00, 0x32, 0x75, 0x57, 0x43, 0x29}, 0, -19, 17}, 0x1.e24697153d51bp-6},
-    };
-    for (const auto& c : cases) {
-        double value = 0;
-        FPLoadPDR(&c.record);
-        FPStoreFlt64(&value);
-        EXPECT_EQ(value, c.nearest);
-        FPLoadPDR(&c.record);
-        FPRToNum(kNumDouble, &value);
-        EXPECT_EQ(value, c.nearest);
-        FPLoadPDR(&c.record);
-        EXPECT_NE(static_cast<double>(Pop()), c.nearest) << "the case shows nothing";
+// ---- narrow stores ----
+
+template <class Real>
+void ExpectStoredAsTheHost(Extended x, void (*store)(Real*)) {
+    constexpr int kFlags = FE_INEXACT | FE_UNDERFLOW | FE_OVERFLOW;
+    FPInitKeepingDirection();
+    Push(x);
+    Real stored = 0;
+    store(&stored);
+    const int status = CheckFPStat();
+    std::feclearexcept(FE_ALL_EXCEPT);
+    const volatile Real host = static_cast<Real>(x);
+    const int raised = std::fetestexcept(kFlags);
+    EXPECT_EQ(stored, host) << x;
+    EXPECT_EQ((status & kFPStatInexact) != 0, (raised & FE_INEXACT) != 0) << x;
+    EXPECT_EQ((status & kFPStatUnderflow) != 0, (raised & FE_UNDERFLOW) != 0) << x;
+    EXPECT_EQ((status & kFPStatOverflow) != 0, (raised & FE_OVERFLOW) != 0) << x;
+    EXPECT_EQ((status & kFPStatDenormal) != 0, std::fpclassify(stored) == FP_SUBNORMAL) << x;
+}
+
+TEST_F(Registers, NarrowStoresRoundAsTheHost) {
+    std::mt19937_64 random(42);
+    for (int i = 0; i < 20000; ++i) {
+        std::fesetround(kDirections[i % 4]);
+        const uint64 mask = random() % 2 != 0 ? ~uint64{0} : ~uint64{0} << random() % 64;  // ties and exact values
+        const auto mantissa = static_cast<Extended>((random() | uint64{1} << 63) & mask);
+        const Extended sign = random() % 2 != 0 ? 1 : -1;
+        const int exponent = static_cast<int>(random() % 64);
+        for (const int end : {1024 - 32, -1022 - 62}) {
+            ExpectStoredAsTheHost<double>(sign * std::scalbn(mantissa, end + exponent - 63), FPStoreFlt64);
+        }
+        for (const int end : {128 - 32, -126 - 33}) {
+            ExpectStoredAsTheHost<float>(sign * std::scalbn(mantissa, end + exponent - 63), FPStoreFlt32);
+        }
     }
+    std::fesetround(FE_TONEAREST);
 }
 
 // ---- operations ----

@@ -1,8 +1,9 @@
 /* Complex arithmetic and mathematics on single, double and extended operands (the final S, D or X of a name).
 
-   Passing follows <tessel/numerics/RealMath.h>: by pointer, a result may be stored over an operand, a result of a
-   member that has two may be null. Functions of several branches give the principal value, continuous from above on
-   cuts along the real axis where the imaginary part is +0 and from below where it is -0. Nothing fails. Any thread. */
+   Passing follows <tessel/numerics/RealMath.h>: by pointer, a result may be stored over an operand, a result may be
+   null where there are two; other pointers must not be null and are not checked. Functions of several branches give the
+   principal value, continuous from above on cuts along the real axis where the imaginary part is +0 and from below
+   where it is -0. Nothing fails. Any thread. */
 #ifndef TESSEL_NUMERICS_COMPLEXMATH_H
 #define TESSEL_NUMERICS_COMPLEXMATH_H
 
@@ -146,7 +147,7 @@ TESSEL_API void RTcLognp1S(const cmplx64* x, cmplx64* result);
 TESSEL_API void RTcLognp1D(const cmplx128* x, cmplx128* result);
 TESSEL_API void RTcLognp1X(const cmplxExt* x, cmplxExt* result);
 
-/* ln x / ln base */
+/* ln x / ln base; of two real logarithms the real quotient, so that a base or x of 0 gives what RTfLogx does. */
 TESSEL_API void RTcLogxS(const cmplx64* base, const cmplx64* x, cmplx64* result);
 TESSEL_API void RTcLogxD(const cmplx128* base, const cmplx128* x, cmplx128* result);
 TESSEL_API void RTcLogxX(const cmplxExt* base, const cmplxExt* x, cmplxExt* result);

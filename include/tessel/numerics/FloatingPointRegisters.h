@@ -6,7 +6,8 @@
    imaginary part; where two complex values or results lie on the stack, the first named is below unless said otherwise.
 
    A push on a full stack and a pop from an empty one give a quiet NaN and set the stack-fault and invalid bits of
-   CheckFPStat. Nothing else fails: results follow the rules for NaN and infinities. Any thread; each has its own stack.
+   CheckFPStat. Nothing else fails: results follow the rules for NaN and infinities. Pointers must not be null and are
+   not checked. How values are rounded is said in <tessel/numerics/RoundingUtil.h>. Any thread; each has its own stack.
  */
 #ifndef TESSEL_NUMERICS_FLOATINGPOINTREGISTERS_H
 #define TESSEL_NUMERICS_FLOATINGPOINTREGISTERS_H
@@ -17,11 +18,11 @@
 /* Bits of CheckFPStat. Bits 11 to 13 hold the number of the top register, 0 when the stack is empty. */
 enum {
     kFPStatInvalid = 0x01,
-    kFPStatDenormal = 0x02,
+    kFPStatDenormal = 0x02, /* a denormal real was loaded, or stored */
     kFPStatZeroDivide = 0x04,
     kFPStatOverflow = 0x08,
-    kFPStatUnderflow = 0x10,
-    kFPStatInexact = 0x20,
+    kFPStatUnderflow = 0x10, /* a result below the smallest normal value was rounded */
+    kFPStatInexact = 0x20,   /* a result was rounded */
     kFPStatStackFault = 0x40,
     kFPStatStackOverflow = 0x200, /* with a stack fault: a push on a full stack, otherwise a pop from an empty one */
 };
@@ -80,6 +81,8 @@ TESSEL_API void FPStoreUInt8(uint8* value);
 TESSEL_API void FPStoreUInt16(uint16* value);
 TESSEL_API void FPStoreUInt32(uint32* value);
 TESSEL_API void FPStoreUInt64(uint64* value);
+
+/* A narrower real is rounded in the direction in force. */
 TESSEL_API void FPStoreFlt32(float* value);
 TESSEL_API void FPStoreFlt64(double* value);
 TESSEL_API void FPStoreExt(floatExt* value);

@@ -24,15 +24,16 @@ TESSEL_API int32 NumClass(int16 code);
 
 /* Sets the size of an extended real to `size` bytes (10 at first) and that of an extended complex to twice that, and
    returns the previous size. For hosts that pad extended values to 12 or 16 bytes: the functions that take a type code
-   then find the imaginary part `size` bytes after the real part. The typed functions keep to floatExt and cmplxExt.
-   Process-wide; to be called while no other thread converts. */
+   then find the imaginary part `size` bytes after the real part. A size below 10 makes the parts overlap. The typed
+   functions keep to floatExt and cmplxExt. Process-wide; to be called while no other thread converts. */
 TESSEL_API uint8 SetFxSize(uint8 size);
 
 /* Converts the value at `source` to another numeric type. Integer to integer keeps the low bytes (wraps around). All
-   else goes through an extended real: into an integer it saturates (a NaN stores the maximum) and rounds halves to
-   even, into a narrower real it rounds to nearest. A real has an imaginary part of 0; of a complex value a real
-   destination gets the real part. A code outside 1-30 or a null pointer is reported (fatal), and nothing is stored. Any
-   thread. */
+   else goes through an extended real: into an integer it saturates (a NaN stores the maximum) and rounds to the
+   nearest, halves to even, into a narrower real it rounds in the direction in force (the rule is in
+   <tessel/numerics/RoundingUtil.h>). A real has an imaginary part of 0; of a complex value a real destination gets the
+   real part. A code outside 1-30, one that names no type (15 and 16) or a null pointer is reported (fatal), and nothing
+   is stored. Any thread. */
 TESSEL_API void ConvertNum(int16 sourceCode, const void* source, int16 destinationCode, void* destination);
 
 TESSEL_API int32 Min(int32 a, int32 b);

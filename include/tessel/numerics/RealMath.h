@@ -1,9 +1,10 @@
 /* Real arithmetic and mathematics on single, double and extended operands (the final S, D or X of a name).
 
    Operands and results are passed by pointer, so that a caller can use any member in the same way. A result may be
-   stored over an operand. Pointers must not be null, except those to the results of a member that has two: a null one
-   is not stored. Nothing fails: a NaN operand gives a NaN, a result without a value is a NaN or an infinity. Any
-   thread. */
+   stored over an operand. Pointers must not be null and are not checked, except those to the results of a member that
+   has two: a null one is not stored. Nothing fails: a NaN operand gives a NaN (but x to the power 0 and 1 to any power
+   are 1), a result without a value is a NaN or an infinity. How results are rounded is said in
+   <tessel/numerics/RoundingUtil.h>. Any thread. */
 #ifndef TESSEL_NUMERICS_REALMATH_H
 #define TESSEL_NUMERICS_REALMATH_H
 
@@ -33,7 +34,7 @@ TESSEL_API void RTfDivS(const float* x, const float* y, float* result);
 TESSEL_API void RTfDivD(const double* x, const double* y, double* result);
 TESSEL_API void RTfDivX(const floatExt* x, const floatExt* y, floatExt* result);
 
-/* x - floor(x / y) y, the remainder that has the sign of y: RTfModD of -7 and 3 is 2. */
+/* x - floor(x / y) y, the remainder that has the sign of y, or +0: RTfModD of -7 and 3 is 2. */
 TESSEL_API void RTfModS(const float* x, const float* y, float* result);
 TESSEL_API void RTfModD(const double* x, const double* y, double* result);
 TESSEL_API void RTfModX(const floatExt* x, const floatExt* y, floatExt* result);
@@ -44,7 +45,7 @@ TESSEL_API void RTfRemS(const float* x, const float* y, float* result);
 TESSEL_API void RTfRemD(const double* x, const double* y, double* result);
 TESSEL_API void RTfRemX(const floatExt* x, const floatExt* y, floatExt* result);
 
-/* floor(x / y), and x - y times that. */
+/* floor(x / y), and x - y times that (as RTfMod). */
 TESSEL_API void RTfQRemS(const float* x, const float* y, float* quotient, float* remainder);
 TESSEL_API void RTfQRemD(const double* x, const double* y, double* quotient, double* remainder);
 TESSEL_API void RTfQRemX(const floatExt* x, const floatExt* y, floatExt* quotient, floatExt* remainder);
@@ -89,7 +90,7 @@ TESSEL_API void RTfSignS(const float* x, float* result);
 TESSEL_API void RTfSignD(const double* x, double* result);
 TESSEL_API void RTfSignX(const floatExt* x, floatExt* result);
 
-/* Nearest integer, halves to even. */
+/* Nearest integer, halves to even; a zero is +0. */
 TESSEL_API void RTfRoundS(const float* x, float* result);
 TESSEL_API void RTfRoundD(const double* x, double* result);
 TESSEL_API void RTfRoundX(const floatExt* x, floatExt* result);
