@@ -12,11 +12,10 @@ namespace {
 
 constexpr char kResizeOrNew[] = "DSSetHandleSizeOrNewHandle";
 
-// Enlarges a handle by `size` bytes; *end = where they begin.
+// Enlarges a handle by `size` bytes; *end = where they begin. What no handle can hold fails as any resize does.
 MgErr Append(UHandle h, uint32 size, uint32* end) {
     *end = IsGoodHandle(h, kChangeProves) ? DSGetHandleSize(h) : 0;
-    if (size > UINT32_MAX - *end) return ReportMemoryError(kMemFullErr, "DSSetHandleSize");
-    return DSSetHandleSize(h, *end + size);
+    return DSSetHandleSize(h, size > UINT32_MAX - *end ? UINT32_MAX : *end + size);
 }
 
 void Copy(const void* from, UHandle to, uint32 at, uint32 size) {
@@ -123,13 +122,15 @@ MgErr DSSwapHandles(UHandle a, UHandle b) {
 }
 
 UHandle DSRecoverHandle(const void* data) {
-    bool damaged = data && ChecksGuards(GuardKind::kHandle) && !CheckGuards(data, GuardKind::kHandle);
-    UHandle h = data && !damaged ? masterPointers.Find(data) : nullptr;
-    if (damaged)
-        TESSEL_REPORT(kDebugFatal, 0x3AE06C94u);
-    else if (!h)
+    // Only what is a handle's data has a handle's header to find the guards by.
+    UHandle h = data ? masterPointers.Find(data) : nullptr;
+    if (!h) {
         TESSEL_REPORT(kDebugFatal, 0x57F4B12Du) << "Pointer passed to BRecoverHandle not linked to master pointer!";
-    return h;
+        return nullptr;
+    }
+    if (!ChecksGuards(GuardKind::kHandle) || CheckGuards(data, GuardKind::kHandle)) return h;
+    TESSEL_REPORT(kDebugFatal, 0x3AE06C94u);
+    return nullptr;
 }
 
 // ---- lock and purge states: there are none, only the handle is checked ----------------------------------------------

@@ -217,7 +217,7 @@ TEST(MemoryChecks, FindPlantedDamage) {
     UPtr link = *MasterPointersTest::FreeHead();
     for (int32 bad : {-1, count - 1, count + 1}) {
         MasterPointersTest::FreeCount() = bad;
-        DSHeapCheck(0);
+        EXPECT_EQ(kCorruptErr, DSHeapCheck(0));
     }
     MasterPointersTest::FreeCount() = count;
     *MasterPointersTest::FreeHead() = reinterpret_cast<UPtr>(uintptr_t{0x41414141});

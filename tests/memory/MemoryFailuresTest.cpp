@@ -376,7 +376,7 @@ TEST(StaleHandle, IsRefusedByEveryOperationAndItsTracesAreFound) {
     SetMemoryDebugger(true);
     uint8 saved = **stale;
     **stale = static_cast<uint8>(saved ^ 0x40);
-    EXPECT_EQ(kNoErr, DSHeapCheck(0));
+    EXPECT_EQ(kCorruptErr, DSHeapCheck(0));
     **stale = saved;
     SetMemoryDebugger(false);
     EXPECT_THAT(memory.reports.Texts(kDebugFatal), ElementsAre("freemaster chain isn't NULL terminated!"));

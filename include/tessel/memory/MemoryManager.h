@@ -40,7 +40,8 @@ TESSEL_API MgErr DSDisposeHandle(UHandle h);
 /* Frees *h and stores null there. A null address or a null handle is fine. */
 TESSEL_API MgErr DSDisposeHandleAndNull(UHandle* h);
 
-/* Frees a pointer block. kArgErr for null, kHandleErr when its guard bytes are damaged. */
+/* Frees a pointer block. kArgErr for null; kHandleErr, and nothing is freed, when its guard bytes are damaged or the
+   heap sees that it is no block (most blocks that were disposed of before). */
 TESSEL_API MgErr DSDisposePtr(void* p);
 
 /* ---- Size ---------------------------------------------------------------------------------------------------------
@@ -111,8 +112,9 @@ TESSEL_API MgErr DSCheckPtr(const void* p);
 TESSEL_API int32 DSCheckHandleGuardBytes(UHandle h);
 TESSEL_API int32 DSCheckPtrGuardBytes(const void* p);
 
-/* Checks the free master pointers, the heap and the master-pointer blocks; kCorruptErr when the count of blocks is
-   wrong. `report`: also reports statistics. Returns at once when a check is running. */
+/* Checks the free master pointers, the heap and the master-pointer blocks; kCorruptErr when a chain of free master
+   pointers (looked at with memory debugging on) is damaged or the count of blocks is wrong. `report`: also reports
+   statistics. Returns at once when a check is running. */
 TESSEL_API MgErr DSHeapCheck(int32 report);
 
 /* Twelve words of which only totalAllocated is filled. All totals stop at 0xFFFFFFFF. */
@@ -122,7 +124,8 @@ typedef struct MemStatRec {
     uint32 reserved4[8];
 } MemStatRec;
 
-/* Checks as DSHeapCheck does; fills the record, which may be null. */
+/* Checks as DSHeapCheck does; fills the record, which may be null. With OV_USE_MALLOC=1 in the environment pointer
+   blocks come straight from malloc: totalAllocated, and the walk of DSMemStatsSlow, count handles only. */
 TESSEL_API MgErr DSMemStats(MemStatRec* stats);
 
 /* The same with an address (or null) for each word: out0 to out7, out10 and out11 get the words of their number, out8
