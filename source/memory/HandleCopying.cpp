@@ -18,6 +18,10 @@ MgErr Append(UHandle h, uint32 size, uint32* end) {
     return DSSetHandleSize(h, size > UINT32_MAX - *end ? UINT32_MAX : *end + size);
 }
 
+bool IsNoData(const void* p, uint32 size) {
+    return !p && size != 0;
+}
+
 void Copy(const void* from, UHandle to, uint32 at, uint32 size) {
     if (size != 0) std::memmove(*to + at, from, size);
 }
@@ -53,6 +57,8 @@ MgErr HandToHand(UHandle* h, const void* frame) {
 
 MgErr PtrToHand(const void* p, UHandle* h, uint32 size, const void* frame) {
     if (!h) return kArgErr;
+    *h = nullptr;
+    if (IsNoData(p, size)) return kArgErr;
     *h = CreateHandle(size, false, frame);
     if (!*h) return kMemFullErr;
     Copy(p, *h, 0, size);
@@ -60,6 +66,7 @@ MgErr PtrToHand(const void* p, UHandle* h, uint32 size, const void* frame) {
 }
 
 MgErr SetHandleFromPtr(UHandle* h, const void* p, uint32 size, const void* frame) {
+    if (IsNoData(p, size)) return kArgErr;
     MgErr err = ResizeOrCreate(h, size, false, kResizeOrNew, frame);
     if (err == kNoErr) Copy(p, *h, 0, size);
     return err;
@@ -80,6 +87,7 @@ MgErr DSPtrToHand(const void* p, UHandle* h, uint32 size) {
 }
 
 MgErr DSPtrToXHand(const void* p, UHandle h, uint32 size) {
+    if (IsNoData(p, size)) return kArgErr;
     MgErr err = DSSetHandleSize(h, size);
     if (err == kNoErr) Copy(p, h, 0, size);
     return err;
@@ -94,6 +102,7 @@ MgErr DSSetHandleFromPtrNULLMeansEmpty(UHandle* h, const void* p, uint32 size) {
 }
 
 MgErr DSPtrAndHand(const void* p, UHandle h, uint32 size) {
+    if (IsNoData(p, size)) return kArgErr;
     uint32 end;
     MgErr err = Append(h, size, &end);
     if (err == kNoErr) Copy(p, h, end, size);

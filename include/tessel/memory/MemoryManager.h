@@ -67,7 +67,8 @@ TESSEL_API MgErr DSSetHSzOrNewHClr(UHandle* h, uint32 size);
 TESSEL_API MgErr DataSetHandleSizeOrNewHandle(UHandle* h, uint32 size);
 TESSEL_API MgErr DataSetHSzOrNewHClr(UHandle* h, uint32 size);
 
-/* ---- Copying ------------------------------------------------------------------------------------------------------
+/* ---- Copying: null bytes are kArgErr unless their number is 0
+ * ------------------------------------------------------------------------------------------------------
  */
 
 /* Makes *destination a copy of `source`, creating or resizing it. A null source disposes of *destination and stores
