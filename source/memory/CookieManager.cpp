@@ -8,7 +8,6 @@
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/memory/MemoryUtil.h>
-#include <tessel/sync/ThAtomic.h>
 #include <tessel/sync/ThMutex.h>
 #include <tessel/time/Millisecs.h>
 
@@ -102,8 +101,8 @@ uint32 NextGeneration(JarRecord& record) {
 }
 
 MagicCookie MakeCookie(JarRecord& record, const void* info) {
-    uint32 index = record.freeHead;
-    CookieEntry* entry = index < PouchTree::kIndices ? record.tree->FindOrMake(index) : nullptr;
+    const uint32 index = record.freeHead;
+    CookieEntry* entry = index < PouchTree::kIndices ? record.tree->Find(index) : nullptr;
     if (!entry) return 0;
     record.freeHead = static_cast<uint32>(entry->Link());
     int32 live = record.liveCount + 1;
@@ -112,10 +111,45 @@ MagicCookie MakeCookie(JarRecord& record, const void* info) {
     // The generation last: from then on the cookie is valid to those who look without the mutex.
     uint32 generation = NextGeneration(record);
     StoreInfo(record, entry, info);
-    entry->SetRights(record.rightsMode ? 1 : 0);
+    entry->SetRights(CookieEntry::RightsOf(generation, record.rightsMode ? 1 : 0));
     entry->SetLink(CookieEntry::kInUse);
     entry->SetGeneration(generation);
     return CookieOf(generation, index);
+}
+
+// A block for the tree, made without the mutex.
+struct SpareBlock {
+    void* block = nullptr;
+    uint32 size = 0;
+
+    SpareBlock() = default;
+    ~SpareBlock() {
+        if (block) DSDisposePtr(block);
+    }
+    SpareBlock(const SpareBlock&) = delete;
+    SpareBlock& operator=(const SpareBlock&) = delete;
+
+    bool Renew(uint32 wanted) {
+        if (block) DSDisposePtr(block);
+        size = wanted;
+        block = DSNewPClr(wanted);
+        return block != nullptr;
+    }
+};
+
+// Makes the cookie; 0 with *missing = 0 when it cannot be made, and with the size of the block that the tree wants
+// first when the spare one is none or of another size.
+MagicCookie TryNewCookie(JarRecord& record, const void* info, SpareBlock& spare, uint32* missing) {
+    ThMutexHolder hold(record.mutex);
+    *missing = 0;
+    if (record.freeHead >= PouchTree::kIndices) return 0;
+    while ((*missing = record.tree->SizeMissing(record.freeHead)) != 0) {
+        if (!spare.block || spare.size != *missing) return 0;
+        *missing = 0;
+        if (!record.tree->Add(record.freeHead, spare.block)) return 0;
+        spare.block = nullptr;
+    }
+    return MakeCookie(record, info);
 }
 
 // The generation first: nobody may take what follows for the cookie's.
@@ -169,21 +203,26 @@ void ReportDisposal(MagicCookieJar jar) {
 // ---- rights
 // -----------------------------------------------------------------------------------------------------------
 
-// Changes a positive rights count by `change`, and returns what it was; 0 when it is not positive.
-int32 ChangeRights(CookieEntry* entry, int32 change) {
+// Changes the positive rights count of the cookie with that generation by `change`, and returns what it was; 0 when
+// there is no such cookie any more, its count is not positive or it can take no more.
+uint32 ChangeRights(CookieEntry* entry, uint32 generation, int32 change) {
     for (;;) {
-        int32 rights = entry->Rights();
-        if (rights <= 0) return 0;
-        if (ThSwapIfSame(&entry->rights, rights + change, rights)) return rights;
+        uint32 rights = entry->Rights();
+        uint32 count = rights & CookieEntry::kMostRights;
+        if (rights >> CookieEntry::kRightsBits != generation || count == 0) return 0;
+        if (change > 0 && count == CookieEntry::kMostRights) return 0;
+        if (entry->SwapRights(rights, rights + static_cast<uint32>(change))) return count;
     }
 }
 
-// Lowers the count of whatever cookie the entry now has, which ends with it.
-int32 ReleaseEntry(JarRecord& record, CookieEntry* entry, uint32 index) {
-    int32 before = ChangeRights(entry, -1);
+// Lowers the count, and ends the cookie with it, unless somebody else has ended it meanwhile.
+uint32 ReleaseEntry(JarRecord& record, CookieEntry* entry, MagicCookie cookie) {
+    const uint32 generation = GenerationOf(cookie);
+    uint32 before = ChangeRights(entry, generation, -1);
     if (before == 1) {
         ThMutexHolder hold(record.mutex);
-        if (entry->Link() < 0 && entry->Rights() == 0) EndCookie(record, entry, index);
+        if (IsValid(entry, cookie) && entry->Rights() == CookieEntry::RightsOf(generation, 0))
+            EndCookie(record, entry, IndexOf(cookie));
     }
     return before;
 }
@@ -196,11 +235,7 @@ void CopyInfoOut(JarRecord& record, CookieEntry* entry, void* infoOut) {
 
 bool AcquireRights(JarRecord& record, MagicCookie cookie, void* infoOut) {
     CookieEntry* entry = record.rightsMode ? Find(record, cookie) : nullptr;
-    if (!entry || ChangeRights(entry, 1) == 0) return false;
-    if (!IsValid(entry, cookie)) {  // it ended meanwhile: the count raised is another cookie's
-        ReleaseEntry(record, entry, IndexOf(cookie));
-        return false;
-    }
+    if (!entry || ChangeRights(entry, GenerationOf(cookie), 1) == 0) return false;
     CopyInfoOut(record, entry, infoOut);
     return true;
 }
@@ -235,12 +270,16 @@ MgErr MCJarSize(MagicCookieJar jar, int32* count) {
 
 MagicCookie MCNewCookie(MagicCookieJar jar, const void* info) {
     if (!jar) return 0;
-    JarRecord& record = Record(jar);
-    ThMutexHolder hold(record.mutex);
-    return MakeCookie(record, info);
+    // Memory is asked for without the mutex: the host's procedures may use the jar.
+    SpareBlock spare;
+    for (uint32 missing = 0;;) {
+        MagicCookie cookie = TryNewCookie(Record(jar), info, spare, &missing);
+        if (missing == 0 || !spare.Renew(missing)) return cookie;
+    }
 }
 
 MgErr MCDisposeCookie(MagicCookieJar jar, MagicCookie cookie, void* infoOut) {
+    if (!jar) return kArgErr;
     JarRecord& record = Record(jar);
     ThMutexHolder hold(record.mutex);
     CookieEntry* entry = Find(record, cookie);
@@ -251,6 +290,7 @@ MgErr MCDisposeCookie(MagicCookieJar jar, MagicCookie cookie, void* infoOut) {
 }
 
 MgErr MCSetCookieInfo(MagicCookieJar jar, MagicCookie cookie, const void* info) {
+    if (!jar) return kArgErr;
     JarRecord& record = Record(jar);
     ThMutexHolder hold(record.mutex);
     CookieEntry* entry = Find(record, cookie);
@@ -317,7 +357,7 @@ void CollectCookies(const JarRecord& record, uint32* list) {
 
 // The list is resized without the mutex, since that may call the host: again when cookies were made meanwhile.
 MgErr MCGetCookieList(MagicCookieJar jar, UHandle* list) {
-    if (!list) return kArgErr;
+    if (!jar || !list) return kArgErr;
     JarRecord& record = Record(jar);
     uint32 room = LiveCount(record), live;
     for (;; room = live) {
@@ -358,7 +398,7 @@ bool HasInfo(const JarRecord& record, MagicCookie cookie, const void* info) {
 
 MagicCookie MCGetCookieForInfo(MagicCookieJar jar, const void* info) {
     UHandle list = nullptr;
-    if (MCGetCookieList(jar, &list) != kNoErr) return 0;
+    if (!info || MCGetCookieList(jar, &list) != kNoErr) return 0;
     const uint32* words = reinterpret_cast<const uint32*>(*list);
     const uint32* end = words + 1 + words[0];
     const uint32* found = std::find_if(words + 1, end, [&](MagicCookie c) { return HasInfo(Record(jar), c, info); });
@@ -450,7 +490,7 @@ MagicCookie BaseCookieJar::GetCookieForInfo(const void* info) {
 
 int32 BaseCookieJar::AcquireCookieRights(const MagicCookie& cookie, void* infoOut) {
     if (fJar && AcquireRights(Record(fJar), cookie, infoOut)) return 1;
-    if (infoOut) std::memset(infoOut, 0, fJar ? std::min(Record(fJar).infoSize, kWord) : kWord);
+    if (fJar && infoOut) std::memset(infoOut, 0, std::min(Record(fJar).infoSize, kWord));
     return 0;
 }
 
@@ -458,7 +498,7 @@ int32 BaseCookieJar::ReleaseCookieRights(const MagicCookie& cookie) {
     if (!fJar || !Record(fJar).rightsMode) return 0;
     JarRecord& record = Record(fJar);
     CookieEntry* entry = Find(record, cookie);
-    return entry ? ReleaseEntry(record, entry, IndexOf(cookie)) : 0;
+    return entry ? static_cast<int32>(ReleaseEntry(record, entry, cookie)) : 0;
 }
 
 MgErr BaseCookieJar::GetNumCookies(int32* count) {

@@ -58,6 +58,10 @@ void WriteGuards(void* data, size_t size) {
     std::memcpy(static_cast<char*>(data) + size, kGuardPattern, kGuardSize);
 }
 
+bool LeadingGuardIsIntact(const void* data) {
+    return IsGuard(static_cast<const char*>(data) - kGuardSize);
+}
+
 bool CheckGuards(const void* data, GuardKind kind) {
     if (!data) {
         TESSEL_REPORT(kDebugError, 0x2DC5417Eu) << "NULL ptr passed to CheckGuards";

@@ -41,6 +41,9 @@ inline uint32* GuardedPtrSize(const void* data) {
 
 void WriteGuards(void* data, size_t size);
 
+// Whether the guard in front of the data is intact; nobody is told.
+bool LeadingGuardIsIntact(const void* data);
+
 // True when both guards of a block are intact; else the guard-failure procedure has been called.
 bool CheckGuards(const void* data, GuardKind kind);
 

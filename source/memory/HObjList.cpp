@@ -39,8 +39,7 @@ int32 Pin(int32 pos, int32 last) {
 MgErr Grow(UHandle list, int32 count) {
     uint32 size = DSGetHandleSize(list);
     if (size >= static_cast<uint32>(count) * kValue + 2 * kValue) return kNoErr;
-    if (size > UINT32_MAX - kGranule) return kMemFullErr;
-    return DSSetHSzClr(list, RoundDown(size + kGranule));
+    return DSSetHSzClr(list, size > UINT32_MAX - kGranule ? UINT32_MAX : RoundDown(size + kGranule));
 }
 
 }  // namespace

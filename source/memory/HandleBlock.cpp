@@ -32,6 +32,13 @@ bool HandleLayout::IsPlaced(UPtr data) const {
     return std::has_single_bit(alignment.alignment) && PlaceData(BlockOf(data), alignment) == data;
 }
 
+bool HandleLayout::IsSound(UPtr data) const {
+    if (room_ != 0 && WritesGuards(GuardKind::kHandle) && !LeadingGuardIsIntact(data)) return false;
+    if (!IsPlaced(data)) return false;
+    const uint32 bytes = BlockSize(SizeOf(data), AlignmentOf(data));
+    return bytes != 0 && bytes <= platform::AllocatedSize(BlockOf(data));
+}
+
 UPtr NewGuardedBlock(size_t size, GuardKind kind) {
     bool guarded = GuardRoom(kind) != 0;
     size_t room = guarded ? kPtrHeader + kGuardSize : 0;
@@ -45,8 +52,8 @@ UPtr NewGuardedBlock(size_t size, GuardKind kind) {
     return data;
 }
 
-void DisposeGuardedBlock(void* data, GuardKind kind) {
-    heap::Free(static_cast<UPtr>(data) - (GuardRoom(kind) != 0 ? kPtrHeader : 0));
+bool DisposeGuardedBlock(void* data, GuardKind kind) {
+    return heap::Free(static_cast<UPtr>(data) - (GuardRoom(kind) != 0 ? kPtrHeader : 0));
 }
 
 }  // namespace tessel

@@ -84,6 +84,10 @@ public:
     // Whether the header leads back to a block in which the data would be placed there.
     bool IsPlaced(UPtr data) const;
 
+    // Whether the header may be trusted: no guard in front of the data is damaged, it leads to the block, and what it
+    // says fits in there.
+    bool IsSound(UPtr data) const;
+
     // Where the data goes in a heap block.
     UPtr PlaceData(void* block, Alignment alignment) const {
         uintptr_t data = reinterpret_cast<uintptr_t>(block) + HeaderRoom();
@@ -112,13 +116,14 @@ private:
 
 // A plain block with guards as the kind's option word says; null when there is no memory.
 UPtr NewGuardedBlock(size_t size, GuardKind kind);
-void DisposeGuardedBlock(void* data, GuardKind kind);
+// False when the heap says that it is no block; then nothing is freed.
+bool DisposeGuardedBlock(void* data, GuardKind kind);
 
 inline UPtr NewPtrBlock(size_t size) {
     return NewGuardedBlock(size, GuardKind::kPointer);
 }
-inline void DisposePtrBlock(void* data) {
-    DisposeGuardedBlock(data, GuardKind::kPointer);
+inline bool DisposePtrBlock(void* data) {
+    return DisposeGuardedBlock(data, GuardKind::kPointer);
 }
 
 }  // namespace tessel

@@ -12,11 +12,14 @@ namespace {
 
 constexpr char kResizeOrNew[] = "DSSetHandleSizeOrNewHandle";
 
-// Enlarges a handle by `size` bytes; *end = where they begin.
+// Enlarges a handle by `size` bytes; *end = where they begin. What no handle can hold fails as any resize does.
 MgErr Append(UHandle h, uint32 size, uint32* end) {
     *end = IsGoodHandle(h, kChangeProves) ? DSGetHandleSize(h) : 0;
-    if (size > UINT32_MAX - *end) return ReportMemoryError(kMemFullErr, "DSSetHandleSize");
-    return DSSetHandleSize(h, *end + size);
+    return DSSetHandleSize(h, size > UINT32_MAX - *end ? UINT32_MAX : *end + size);
+}
+
+bool IsNoData(const void* p, uint32 size) {
+    return !p && size != 0;
 }
 
 void Copy(const void* from, UHandle to, uint32 at, uint32 size) {
@@ -54,6 +57,8 @@ MgErr HandToHand(UHandle* h, const void* frame) {
 
 MgErr PtrToHand(const void* p, UHandle* h, uint32 size, const void* frame) {
     if (!h) return kArgErr;
+    *h = nullptr;
+    if (IsNoData(p, size)) return kArgErr;
     *h = CreateHandle(size, false, frame);
     if (!*h) return kMemFullErr;
     Copy(p, *h, 0, size);
@@ -61,6 +66,7 @@ MgErr PtrToHand(const void* p, UHandle* h, uint32 size, const void* frame) {
 }
 
 MgErr SetHandleFromPtr(UHandle* h, const void* p, uint32 size, const void* frame) {
+    if (IsNoData(p, size)) return kArgErr;
     MgErr err = ResizeOrCreate(h, size, false, kResizeOrNew, frame);
     if (err == kNoErr) Copy(p, *h, 0, size);
     return err;
@@ -81,6 +87,7 @@ MgErr DSPtrToHand(const void* p, UHandle* h, uint32 size) {
 }
 
 MgErr DSPtrToXHand(const void* p, UHandle h, uint32 size) {
+    if (IsNoData(p, size)) return kArgErr;
     MgErr err = DSSetHandleSize(h, size);
     if (err == kNoErr) Copy(p, h, 0, size);
     return err;
@@ -95,6 +102,7 @@ MgErr DSSetHandleFromPtrNULLMeansEmpty(UHandle* h, const void* p, uint32 size) {
 }
 
 MgErr DSPtrAndHand(const void* p, UHandle h, uint32 size) {
+    if (IsNoData(p, size)) return kArgErr;
     uint32 end;
     MgErr err = Append(h, size, &end);
     if (err == kNoErr) Copy(p, h, end, size);
@@ -123,13 +131,15 @@ MgErr DSSwapHandles(UHandle a, UHandle b) {
 }
 
 UHandle DSRecoverHandle(const void* data) {
-    bool damaged = data && ChecksGuards(GuardKind::kHandle) && !CheckGuards(data, GuardKind::kHandle);
-    UHandle h = data && !damaged ? masterPointers.Find(data) : nullptr;
-    if (damaged)
-        TESSEL_REPORT(kDebugFatal, 0x3AE06C94u);
-    else if (!h)
+    // Only what is a handle's data has a handle's header to find the guards by.
+    UHandle h = data ? masterPointers.Find(data) : nullptr;
+    if (!h) {
         TESSEL_REPORT(kDebugFatal, 0x57F4B12Du) << "Pointer passed to BRecoverHandle not linked to master pointer!";
-    return h;
+        return nullptr;
+    }
+    if (!ChecksGuards(GuardKind::kHandle) || CheckGuards(data, GuardKind::kHandle)) return h;
+    TESSEL_REPORT(kDebugFatal, 0x3AE06C94u);
+    return nullptr;
 }
 
 // ---- lock and purge states: there are none, only the handle is checked ----------------------------------------------

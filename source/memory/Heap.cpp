@@ -129,14 +129,19 @@ void* Allocate(size_t size) {
     return link + 1;
 }
 
-void Free(void* block) {
-    if (StraightThrough()) return std::free(block);
-    if (!block) return;
+bool Free(void* block) {
+    if (!block) return true;
+    if (StraightThrough()) {
+        std::free(block);
+        return true;
+    }
     Link* link = static_cast<Link*>(block) - 1;
-    if (Remove(link))
-        std::free(link);
-    else
+    if (!Remove(link)) {
         CallErrorCallback(Error::kDamagedBlock, block);
+        return false;
+    }
+    std::free(link);
+    return true;
 }
 
 void* Reallocate(void* block, size_t oldSize, size_t newSize) {

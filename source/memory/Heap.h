@@ -27,7 +27,8 @@ void CallErrorCallback(Error error, const void* block);
 // --------------------------------------------
 
 void* Allocate(size_t size);
-void Free(void* block);
+// False when the block is damaged or none: the error callback has been called, and nothing is freed.
+bool Free(void* block);
 
 // ---- handle blocks: the caller keeps their size
 // ----------------------------------------------------------------------

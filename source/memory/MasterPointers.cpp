@@ -83,7 +83,7 @@ MgErr MasterPointers::Start() {
 }
 
 void MasterPointers::Stop() {
-    ThreadMemory::ForgetSlots();
+    ThreadMemory::ForgetHandles();
     set_.Clear();
     while (blocks_) DisposePtrBlock(std::exchange(blocks_, blocks_->next));
     freeHead_ = nullptr;

@@ -16,9 +16,10 @@ uint32 Saturated(uint64 value) {
 }
 
 MgErr CheckConsistency(bool report) {
-    if (MemoryDebugging()) masterPointers.CheckChains(ThreadMemory::Mine());
+    bool chainsAreSound = !MemoryDebugging() || masterPointers.CheckChains(ThreadMemory::Mine());
     heap::Check();
     MgErr err = masterPointers.CheckBlocks();
+    if (!chainsAreSound) err = kCorruptErr;
     if (report) {
         TESSEL_REPORT(kDebugInfo, 0x73A9D1E5u) << "Free: totFreeSize " << 0 << ", maxFreeSize " << 0;
         TESSEL_REPORT(kDebugInfo, 0x28E4C06Bu) << "Allocated to OV: totAllocSize " << heap::TotalAllocated();
@@ -68,7 +69,8 @@ int32 DSCheckHandleGuardBytes(UHandle h) {
         TESSEL_REPORT(kDebugError, 0x1D58B0E4u) << "NULL handle passed to DSCheckHandleGuardBytes";
         return 0;
     }
-    return !WritesGuards(GuardKind::kHandle) || CheckGuards(*h, GuardKind::kHandle) ? 1 : 0;
+    if (!WritesGuards(GuardKind::kHandle)) return 1;
+    return IsLiveHandle(h, kAlwaysProve) && CheckGuards(*h, GuardKind::kHandle) ? 1 : 0;
 }
 
 int32 DSCheckPtrGuardBytes(const void* p) {

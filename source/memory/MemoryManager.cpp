@@ -324,8 +324,7 @@ MgErr DSDisposePtr(void* p) {
     if (ChecksGuards(GuardKind::kPointer) && !CheckGuards(p, GuardKind::kPointer))
         return ReportMemoryError(kHandleErr, "DSDisposePtr");
     if (detours & kScopeTracked) ScopeRemove(p);
-    DisposePtrBlock(p);
-    return kNoErr;
+    return ReportMemoryError(DisposePtrBlock(p) ? kNoErr : kHandleErr, "DSDisposePtr");
 }
 
 uint32 DSGetHandleSize(UHandle h) {

@@ -21,25 +21,27 @@ void PassOnHeapError(heap::Error error, const void* block) {
     if (error != heap::Error::kOutOfMemory && previousCallback) previousCallback(error, block);
 }
 
-// Names the blocks of all handles to a walk over the heap. What the header says must fit into the block.
+// Names the blocks of all handles to a walk over the heap.
 bool NameHandleBlocks(void* context, heap::Visitor visitor) {
     HandleLayout layout;
     return masterPointers.ForEachLive([&](UHandle h) {
-        if (!layout.IsPlaced(*h)) return false;
-        void* block = layout.BlockOf(*h);
+        if (!layout.IsSound(*h)) return false;
         uint32 bytes = layout.BlockSize(layout.SizeOf(*h), layout.AlignmentOf(*h));
-        return bytes != 0 && bytes <= platform::AllocatedSize(block) && visitor(context, block, bytes);
+        return visitor(context, layout.BlockOf(*h), bytes);
     });
 }
 
-// Reports and frees every handle that is left.
+// Reports and frees every handle that is left. One whose header is destroyed has a size that nobody knows, and keeps
+// its block: to free it would be to follow the header.
 void RecoverHandles() {
     uint32 count = 0;
     uint64 bytes = 0;
     masterPointers.ForEachLeft([&](UHandle h) {
-        uint32 size = HandleLayout().SizeOf(*h);
+        const bool sound = HandleLayout().IsSound(*h);
+        uint32 size = sound ? HandleLayout().SizeOf(*h) : 0;
         TESSEL_REPORT(kDebugInfo, 0x66B5D82Cu) << "handle " << DbgFmtPtr(h) << ", size " << size << " still allocated.";
         UntrackHandle(h);
+        if (!sound) return heap::CallErrorCallback(heap::Error::kDamagedBlock, *h);
         FreeHandle(h);
         ++count;
         bytes += size;

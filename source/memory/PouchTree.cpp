@@ -19,17 +19,15 @@ PouchTree::~PouchTree() {
         TrackedFree(std::exchange(directory, directory->older));
 }
 
-// A pouch whose entries are threaded to each other, the last to the first of the next pouch. It is entered into the
-// directory last: from then on it is found. Only a damaged free list asks for another than the next.
-void* PouchTree::MakePouch(uint32 base) {
-    if (base / kSlots[3] != directory_.load()->count || !MakeRoomInDirectory()) return nullptr;
-    void* pouch = DSNewPClr(kSlots[3] * entrySize_);
-    if (!pouch) return nullptr;
+// Threads the entries to each other, the last to the first of the next pouch. The pouch is entered into the directory
+// last: from then on it is found. Only a damaged free list asks for another than the next.
+bool PouchTree::AddPouch(uint32 base, void* pouch) {
+    if (base / kSlots[3] != directory_.load()->count || !MakeRoomInDirectory()) return false;
     for (uint32 i = 0; i < kSlots[3]; ++i) EntryIn(pouch, i)->link = static_cast<int32>(base + i + 1);
     Directory* directory = directory_.load(std::memory_order_relaxed);
     directory->pouches[base / kSlots[3]] = pouch;
     directory->count.store(base / kSlots[3] + 1, std::memory_order_release);
-    return pouch;
+    return true;
 }
 
 bool PouchTree::MakeRoomInDirectory() {
@@ -45,26 +43,33 @@ bool PouchTree::MakeRoomInDirectory() {
     return true;
 }
 
-CookieEntry* PouchTree::FindOrMake(uint32 index) {
+void** PouchTree::EmptyPlace(uint32 index, int* level) {
     void** place = &root_;
-    for (int level = 0;; ++level) {
-        void* node = *place;
-        if (!node) {
-            node = level < 3 ? DSNewPClr(kSlots[level] * static_cast<uint32>(sizeof(void*)))
-                             : MakePouch(index & ~(kSlots[3] - 1));
-            if (!node) return nullptr;
-            __atomic_store_n(place, node, __ATOMIC_RELEASE);
-        }
-        if (level == 3) return EntryIn(node, index % kSlots[3]);
-        place = static_cast<void**>(node) + (index >> kShifts[level]) % kSlots[level];
+    for (*level = 0; *place; ++*level) {
+        if (*level == 3) return nullptr;
+        place = static_cast<void**>(*place) + (index >> kShifts[*level]) % kSlots[*level];
     }
+    return place;
+}
+
+uint32 PouchTree::SizeMissing(uint32 index) {
+    int level;
+    return EmptyPlace(index, &level) ? NodeSize(level) : 0;
+}
+
+bool PouchTree::Add(uint32 index, void* block) {
+    int level;
+    void** place = EmptyPlace(index, &level);
+    if (!place || (level == 3 && !AddPouch(index & ~(kSlots[3] - 1), block))) return false;
+    __atomic_store_n(place, block, __ATOMIC_RELEASE);
+    return true;
 }
 
 PouchTree::Size PouchTree::Measure() const {
     Size size{0, 0, 0};
     auto measure = [&](void*, int level, uint32) {
         ++(level < 3 ? size.arrays : size.pouches);
-        size.bytes += kSlots[level] * (level < 3 ? static_cast<uint32>(sizeof(void*)) : entrySize_);
+        size.bytes += NodeSize(level);
         return true;
     };
     VisitNodes(root_, 0, 0, measure);

@@ -22,17 +22,25 @@ namespace tessel {
 struct alignas(void*) CookieEntry {
     uint32 generation;  // 0 while free
     int32 link;         // kInUse, else the index of the next free entry
-    int32 rights;       // used in jars with rights
+    uint32 rights;      // the count (0 in jars without rights) with the generation that it belongs to: see RightsOf
 
     static constexpr int32 kInUse = -1;
+    static constexpr uint32 kRightsBits = 20;
+    static constexpr uint32 kMostRights = (1u << kRightsBits) - 1;
+
+    // Count and generation change as one word: a count is never changed for another cookie than the one meant.
+    static uint32 RightsOf(uint32 generation, uint32 count) { return generation << kRightsBits | count; }
 
     uint8* Info() { return reinterpret_cast<uint8*>(this + 1); }
     uint32 Generation() const { return __atomic_load_n(&generation, __ATOMIC_ACQUIRE); }
     int32 Link() const { return __atomic_load_n(&link, __ATOMIC_ACQUIRE); }
-    int32 Rights() const { return __atomic_load_n(&rights, __ATOMIC_ACQUIRE); }
+    uint32 Rights() const { return __atomic_load_n(&rights, __ATOMIC_ACQUIRE); }
     void SetGeneration(uint32 value) { __atomic_store_n(&generation, value, __ATOMIC_RELEASE); }
     void SetLink(int32 value) { __atomic_store_n(&link, value, __ATOMIC_RELEASE); }
-    void SetRights(int32 value) { __atomic_store_n(&rights, value, __ATOMIC_RELEASE); }
+    void SetRights(uint32 value) { __atomic_store_n(&rights, value, __ATOMIC_RELEASE); }
+    bool SwapRights(uint32 expected, uint32 value) {
+        return __atomic_compare_exchange_n(&rights, &expected, value, false, __ATOMIC_ACQ_REL, __ATOMIC_RELAXED);
+    }
 };
 
 class PouchTree : public TrackedObject {
@@ -54,8 +62,11 @@ public:
         if (pouch >= directory->count.load(std::memory_order_acquire)) return nullptr;
         return EntryIn(directory->pouches[pouch], index % kSlots[3]);
     }
-    // Makes what is missing; null when there is no memory. Callers serialise.
-    CookieEntry* FindOrMake(uint32 index);
+    // The bytes of the first array or pouch that is missing on the way to the entry of an index; 0: none. Callers
+    // serialise, also with Add.
+    uint32 SizeMissing(uint32 index);
+    // Puts there a cleared pointer block of that size, which belongs to the tree from then on. False: not taken.
+    bool Add(uint32 index, void* block);
 
     // Visits the entries in use by index until the visitor returns false. Callers serialise.
     template <class Visitor>
@@ -88,7 +99,12 @@ private:
     CookieEntry* EntryIn(void* pouch, uint32 i) const {
         return reinterpret_cast<CookieEntry*>(static_cast<uint8*>(pouch) + size_t{entrySize_} * i);
     }
-    void* MakePouch(uint32 base);
+    bool AddPouch(uint32 base, void* pouch);
+    uint32 NodeSize(int level) const {
+        return kSlots[level] * (level < 3 ? static_cast<uint32>(sizeof(void*)) : entrySize_);
+    }
+    // The first empty place on the way to an entry, and its level; null when there is none.
+    void** EmptyPlace(uint32 index, int* level);
     bool MakeRoomInDirectory();
 
     // Visits the arrays and pouches below (and with) a node depth first, each after what hangs on it, by index:

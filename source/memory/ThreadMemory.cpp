@@ -81,8 +81,10 @@ MemoryTotals ThreadMemory::Totals() {
     return totals;
 }
 
-void ThreadMemory::ForgetSlots() {
+void ThreadMemory::ForgetHandles() {
+    const int64 bytes = Totals().bytes;
     platform::MutexHolder hold(threadsMutex);
+    shared.bytes.AddShared(-bytes);
     for (ThreadMemory* thread = threads; thread; thread = thread->next_) thread->slots = thread->reserve = SlotChain();
 }
 

@@ -63,8 +63,9 @@ public:
     }
     static MemoryTotals Totals();
 
-    // Forgets the free master pointers of every thread. No other thread may be using handles.
-    static void ForgetSlots();
+    // Forgets the free master pointers of every thread, and the bytes of handle blocks: none is the manager's any more.
+    // No other thread may be using handles.
+    static void ForgetHandles();
 
     MemoryCounters counters;
     // Two chains of a few slots each: full ones are exchanged with the shared chain in one piece.

@@ -75,6 +75,9 @@ TEST_F(Cookies, AreRefusedOnceTheyAreStale) {
     EXPECT_EQ(0u, MCGetCookieForInfo(jar, &other));
     EXPECT_EQ(0u, MCNewCookie(nullptr, &info));
     EXPECT_EQ(kArgErr, MCJarSize(nullptr, nullptr));
+    EXPECT_EQ(kArgErr, MCDisposeCookie(nullptr, third, nullptr));
+    EXPECT_EQ(kArgErr, MCSetCookieInfo(nullptr, third, &info));
+    EXPECT_EQ(0u, MCGetCookieForInfo(nullptr, &info) + MCGetCookieForInfo(jar, nullptr));
     EXPECT_EQ(kNoErr, MCDisposeJar(jar));
     EXPECT_EQ(kNoErr, MCDisposeJar(nullptr));
     EXPECT_TRUE(memory.reports.Has(kDebugInfo, "Disposing jar with 2 cookies remaining"));
@@ -140,6 +143,10 @@ TEST_F(Cookies, CarryRights) {
     CookieJar<int*> jar;
     int* out = &target;
     EXPECT_EQ(0, jar.AcquireCookieRights(0x100000, &out));
+    EXPECT_EQ(nullptr, out);
+    int32 narrow[2] = {5, 6};  // without a jar nobody knows how long an info is
+    EXPECT_EQ(0, jar.BaseCookieJar::AcquireCookieRights(0x100000, narrow));
+    EXPECT_EQ(6, narrow[1]);
     ASSERT_EQ(kNoErr, jar.Init(1));
     MagicCookie cookie = jar.NewCookie(&target);
     EXPECT_EQ(1, jar.AcquireCookieRights(cookie, &out));
@@ -188,6 +195,30 @@ TEST_F(Cookies, FillLists) {
     jar.Uninit();
     EXPECT_EQ(kNoErr, jar.GetCookieList(&list));
     EXPECT_EQ(0u, list.GetCookie(0));
+}
+
+// A cookie lives until its maker ends it, however many take rights in the one that had its slot before.
+TEST_F(Cookies, AreNotEndedByThoseWhoComeTooLate) {
+    constexpr int kLate = 3, kRounds = 60000;
+    CookieJar<int*> jar;
+    ASSERT_EQ(kNoErr, jar.Init(1));
+    std::atomic<MagicCookie> offered{0};
+    std::atomic<bool> done{false};
+    auto comeLate = [&] {
+        while (!done)
+            if (MagicCookie cookie = offered; jar.AcquireCookieRights(cookie, nullptr)) jar.ReleaseCookieRights(cookie);
+    };
+    std::vector<std::thread> threads;
+    for (int i = 0; i < kLate; ++i) threads.emplace_back(comeLate);
+    int lost = 0;
+    for (int i = 0; i < kRounds; ++i) {
+        offered = jar.NewCookie(nullptr);
+        lost += jar.DisposeCookie(offered) != kNoErr;
+    }
+    done = true;
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_EQ(0, lost);
+    jar.Uninit();
 }
 
 // Threads make, look up and end cookies; one holds rights while another gives them back. Every object is ended once.

@@ -192,6 +192,10 @@ TEST_F(Handles, AreCopiedAndAppended) {
     EXPECT_EQ("source andsource", Content(copy));
     EXPECT_EQ(kNoErr, DSHandAndHand(source, source));
     EXPECT_EQ("sourcesource", Content(source));
+    EXPECT_EQ(kArgErr, DSPtrAndHand(nullptr, source, 1));
+    EXPECT_EQ(kArgErr, DSPtrToXHand(nullptr, source, 1));
+    EXPECT_EQ(kArgErr, DSSetHandleFromPtr(&source, nullptr, 1));
+    EXPECT_EQ("sourcesource", Content(source));
     UHandle other = source;
     EXPECT_EQ(kNoErr, DSHandToHand(&other));
     EXPECT_NE(source, other);
@@ -230,12 +234,14 @@ TEST_F(Handles, AreTracedAndTellWhenMemoryIsFull) {
     DSSetHandleSize(h, 12);
     DSSetHandleSize(h, 12);
     DSSetHandleSize(h, 0xFFFFFFFE);
+    EXPECT_EQ(kMemFullErr, DSPtrAndHand("", h, 0xFFFFFFFD));
     EXPECT_EQ(nullptr, DSNewHandle(0xFFFFFFFF));
     DSDisposeHandle(h);
     SetMemEventTraceProc(nullptr);
     CallSetMemFullProc(5);
     EXPECT_THAT(calls, ElementsAre("0 0 h 10 0", "1 0 h 12 10", "1 0 h 12 12", "full 4294967294", "1 2 h 4294967294 12",
-                                   "full 4294967295", "0 2 null 4294967295 0", "2 0 h 12 0", "full 5"));
+                                   "full 4294967295", "1 2 h 4294967295 12", "full 4294967295", "0 2 null 4294967295 0",
+                                   "2 0 h 12 0", "full 5"));
     memory.Stop();
     EXPECT_EQ(nullptr, SetMemFullProc(nullptr));  // the stop removed it
 }

@@ -1,5 +1,7 @@
 #include <gmock/gmock.h>
 
+#include <algorithm>
+#include <cstdlib>
 #include <cstring>
 #include <map>
 #include <string>
@@ -139,8 +141,21 @@ TEST(GuardBytes, ShowWhatWasOverwritten) {
                 ElementsAre("NULL handle passed to DSCheckHandleGuardBytes", "NULL ptr passed to CheckGuards",
                             StartsWith("Memory corruption detected:  buffer overrun at pointer 0x"),
                             StartsWith("Memory corruption detected:  buffer underrun at pointer 0x")));
+    EXPECT_EQ(nullptr, DSRecoverHandle(p));  // no handle's header lies in front of it
     EXPECT_EQ(kNoErr, DSDisposeHandle(h));
+    EXPECT_EQ(0, DSCheckHandleGuardBytes(h));
     EXPECT_EQ(kNoErr, DSDisposePtr(p));
+
+    UHandle ruined = DSNewHandle(16);
+    DSSetHandleSize(DSNewHandle(5), 7);
+    UPtr block = *ruined - 16;
+    std::memset(block, 0x44, 16);  // header and leading guard
+    EXPECT_EQ(kHandleErr, DSDisposeHandle(ruined));
+    SetDetour(kHandlesTracked, false);
+    memory.Stop();
+    std::free(block);  // the library left it alone
+    EXPECT_TRUE(memory.reports.Has(kDebugError, "The heap is corrupt"));
+    EXPECT_TRUE(memory.reports.Has(kDebugInfo, "Recovered 1 Handles for 7 bytes."));
 }
 
 uint32 Total() {
@@ -217,7 +232,7 @@ TEST(MemoryChecks, FindPlantedDamage) {
     UPtr link = *MasterPointersTest::FreeHead();
     for (int32 bad : {-1, count - 1, count + 1}) {
         MasterPointersTest::FreeCount() = bad;
-        DSHeapCheck(0);
+        EXPECT_EQ(kCorruptErr, DSHeapCheck(0));
     }
     MasterPointersTest::FreeCount() = count;
     *MasterPointersTest::FreeHead() = reinterpret_cast<UPtr>(uintptr_t{0x41414141});
@@ -248,7 +263,11 @@ TEST(MemoryChecks, FindDamagedBlocks) {
         EXPECT_THAT(memory.reports.Texts(kDebugError), ElementsAre("The heap is corrupt", "The heap is corrupt"));
         EXPECT_TRUE(heap::Check());
     }
-    DSDisposePtr(p);
+    std::memset(saved, 0xEE, sizeof saved);
+    std::swap_ranges(saved, saved + 16, p - 16);  // as if it were freed memory
+    EXPECT_EQ(kHandleErr, DSDisposePtr(p));
+    std::swap_ranges(saved, saved + 16, p - 16);
+    EXPECT_EQ(kNoErr, DSDisposePtr(p));
     DSDisposeHandle(aligned);
     DSDisposeHandle(h);
 }

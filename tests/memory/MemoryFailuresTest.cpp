@@ -101,6 +101,24 @@ TEST(MemoryFull, LeavesJarsAsTheyWere) {
     EXPECT_GT(runs, 9);
 }
 
+MagicCookieJar fullJar;
+std::vector<MagicCookie> inFullJar;
+
+// Memory is asked for by whoever wants a cookie, and the host may make room in the jar itself.
+TEST(MemoryFull, IsToldWithoutTheLockOfTheJar) {
+    test::StartedMemory memory;
+    fullJar = MCNewJar();
+    for (int i = 0; i < 64; ++i) inFullJar.push_back(MCNewCookie(fullJar, nullptr));
+    SetMemFullProc([](uint32) {
+        EXPECT_EQ(kNoErr, MCDisposeCookie(fullJar, inFullJar.back(), nullptr));
+        inFullJar.pop_back();
+    });
+    test::FailingAllocator failing(1);
+    EXPECT_EQ(0u, MCNewCookie(fullJar, nullptr));
+    EXPECT_EQ(63u, inFullJar.size());
+    MCDisposeJar(fullJar);
+}
+
 struct TrackedThing : TrackedObject {
     int value = 5;
 };
@@ -418,7 +436,7 @@ TEST(StaleHandle, IsRefusedByEveryOperationAndItsTracesAreFound) {
     SetMemoryDebugger(true);
     uint8 saved = **stale;
     **stale = static_cast<uint8>(saved ^ 0x40);
-    EXPECT_EQ(kNoErr, DSHeapCheck(0));
+    EXPECT_EQ(kCorruptErr, DSHeapCheck(0));
     **stale = saved;
     SetMemoryDebugger(false);
     EXPECT_THAT(memory.reports.Texts(kDebugFatal), ElementsAre("freemaster chain isn't NULL terminated!"));

@@ -29,14 +29,14 @@ TESSEL_API MgErr MCDisposeJar(MagicCookieJar jar);
 /* *count = cookies alive. kArgErr when either argument is null. */
 TESSEL_API MgErr MCJarSize(MagicCookieJar jar, int32* count);
 
-/* A new cookie for a copy of the record at `info`; 0 for a null jar, no memory or a full jar. */
+/* A new cookie for a copy of the record at `info` (null: zeros); 0 for a null jar, no memory or a full jar. */
 TESSEL_API MagicCookie MCNewCookie(MagicCookieJar jar, const void* info);
 
 /* Ends the cookie; its record is copied to infoOut unless that is null. kArgErr when it is no cookie of the jar.
-   Like MCSetCookieInfo, MCGetCookieList and MCGetCookieForInfo: the jar must not be null. */
+   Like MCSetCookieInfo and MCGetCookieList: kArgErr for a null jar. */
 TESSEL_API MgErr MCDisposeCookie(MagicCookieJar jar, MagicCookie cookie, void* infoOut);
 
-/* Replaces the record. kArgErr when it is no cookie of the jar. */
+/* Replaces the record; null stores zeros. kArgErr when it is no cookie of the jar. */
 TESSEL_API MgErr MCSetCookieInfo(MagicCookieJar jar, MagicCookie cookie, const void* info);
 
 /* Copies the record out. kArgErr for a null jar or what is no cookie; infoOut is then untouched, except that a pointer
@@ -52,7 +52,8 @@ TESSEL_API MgErr MCGetCookieList(MagicCookieJar jar, UHandle* list);
 /* False for a null jar. */
 TESSEL_API bool MCIsACookie(MagicCookieJar jar, MagicCookie cookie);
 
-/* The first live cookie, by slot index, whose record has the bytes of `info`; 0 when there is none. */
+/* The first live cookie, by slot index, whose record has the bytes of `info`; 0 when there is none, and for
+   a null argument. */
 TESSEL_API MagicCookie MCGetCookieForInfo(MagicCookieJar jar, const void* info);
 
 TESSEL_END_C
@@ -105,8 +106,9 @@ public:
     MgErr GetCookieList(CookieList* list);
     MagicCookie GetCookieForInfo(const void* info);
 
-    /* Raises the count and copies the record out: 1. A cookie that has ended, or a jar without rights: 0, and the first
-       pointer-wide word of infoOut is 0. */
+    /* Raises the count, to 1,048,575 at most, and copies the record out: 1. A cookie that has ended, a count that can
+       take no more or a jar without rights: 0, and the first bytes of infoOut, those of a pointer or of an info that is
+       shorter, are 0. Without a jar the length of an info is not known, and infoOut is left alone. */
     int32 AcquireCookieRights(const MagicCookie& cookie, void* infoOut);
     /* Lowers the count and returns what it was: 1 when the cookie has ended now. 0: nothing to release. */
     int32 ReleaseCookieRights(const MagicCookie& cookie);
@@ -133,6 +135,7 @@ public:
     MgErr GetCookieInfo(const MagicCookie& cookie, T* infoOut) { return BaseCookieJar::GetCookieInfo(cookie, infoOut); }
     MagicCookie GetCookieForInfo(T info) { return BaseCookieJar::GetCookieForInfo(&info); }
     int32 AcquireCookieRights(const MagicCookie& cookie, T* infoOut) {
+        if (infoOut) *infoOut = nullptr;
         return BaseCookieJar::AcquireCookieRights(cookie, infoOut);
     }
 };

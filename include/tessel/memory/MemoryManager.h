@@ -40,7 +40,8 @@ TESSEL_API MgErr DSDisposeHandle(UHandle h);
 /* Frees *h and stores null there. A null address or a null handle is fine. */
 TESSEL_API MgErr DSDisposeHandleAndNull(UHandle* h);
 
-/* Frees a pointer block. kArgErr for null, kHandleErr when its guard bytes are damaged. */
+/* Frees a pointer block. kArgErr for null; kHandleErr, and nothing is freed, when its guard bytes are damaged or the
+   heap sees that it is no block (most blocks that were disposed of before). */
 TESSEL_API MgErr DSDisposePtr(void* p);
 
 /* ---- Size ---------------------------------------------------------------------------------------------------------
@@ -66,7 +67,8 @@ TESSEL_API MgErr DSSetHSzOrNewHClr(UHandle* h, uint32 size);
 TESSEL_API MgErr DataSetHandleSizeOrNewHandle(UHandle* h, uint32 size);
 TESSEL_API MgErr DataSetHSzOrNewHClr(UHandle* h, uint32 size);
 
-/* ---- Copying ------------------------------------------------------------------------------------------------------
+/* ---- Copying: null bytes are kArgErr unless their number is 0
+ * ------------------------------------------------------------------------------------------------------
  */
 
 /* Makes *destination a copy of `source`, creating or resizing it. A null source disposes of *destination and stores
@@ -111,8 +113,9 @@ TESSEL_API MgErr DSCheckPtr(const void* p);
 TESSEL_API int32 DSCheckHandleGuardBytes(UHandle h);
 TESSEL_API int32 DSCheckPtrGuardBytes(const void* p);
 
-/* Checks the free master pointers, the heap and the master-pointer blocks; kCorruptErr when the count of blocks is
-   wrong. `report`: also reports statistics. Returns at once when a check is running. */
+/* Checks the free master pointers, the heap and the master-pointer blocks; kCorruptErr when a chain of free master
+   pointers (looked at with memory debugging on) is damaged or the count of blocks is wrong. `report`: also reports
+   statistics. Returns at once when a check is running. */
 TESSEL_API MgErr DSHeapCheck(int32 report);
 
 /* Twelve words of which only totalAllocated is filled. All totals stop at 0xFFFFFFFF. */
@@ -122,7 +125,8 @@ typedef struct MemStatRec {
     uint32 reserved4[8];
 } MemStatRec;
 
-/* Checks as DSHeapCheck does; fills the record, which may be null. */
+/* Checks as DSHeapCheck does; fills the record, which may be null. With OV_USE_MALLOC=1 in the environment pointer
+   blocks come straight from malloc: totalAllocated, and the walk of DSMemStatsSlow, count handles only. */
 TESSEL_API MgErr DSMemStats(MemStatRec* stats);
 
 /* The same with an address (or null) for each word: out0 to out7, out10 and out11 get the words of their number, out8

@@ -1,4 +1,5 @@
-/* Operations on plain blocks of bytes. No checks; any thread; before start and after stop too. */
+/* Operations on plain blocks of bytes. No checks: null is good only for count 0. Any thread; before start and after
+ * stop too. */
 #ifndef TESSEL_MEMORY_MEMORYUTIL_H
 #define TESSEL_MEMORY_MEMORYUTIL_H
 
