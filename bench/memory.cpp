@@ -195,14 +195,15 @@ private:
     std::unordered_map<std::uint32_t, void*> map_;
 };
 
-constexpr std::uint32_t kGrowStep = 16;
+// Grows to 1 MiB by steps of so many bytes.
 constexpr std::uint32_t kGrowTo = 1 << 20;
 
+template <std::uint32_t step>
 double GrowHandle() {
     return bench::Seconds(
         [](std::uint64_t) {
-            UHandle handle = DSNewHandle(kGrowStep);
-            for (std::uint32_t size = 2 * kGrowStep; size <= kGrowTo; size += kGrowStep) {
+            UHandle handle = DSNewHandle(step);
+            for (std::uint32_t size = 2 * step; size <= kGrowTo; size += step) {
                 DSSetHandleSize(handle, size);
                 (*handle)[size - 1] = 1;
             }
@@ -211,11 +212,12 @@ double GrowHandle() {
         1);
 }
 
+template <std::uint32_t step>
 double GrowBlock() {
     return bench::Seconds(
         [](std::uint64_t) {
-            auto* block = static_cast<unsigned char*>(std::malloc(kGrowStep));
-            for (std::uint32_t size = 2 * kGrowStep; size <= kGrowTo; size += kGrowStep) {
+            auto* block = static_cast<unsigned char*>(std::malloc(step));
+            for (std::uint32_t size = 2 * step; size <= kGrowTo; size += step) {
                 block = static_cast<unsigned char*>(std::realloc(block, size));
                 block[size - 1] = 1;
             }
@@ -359,7 +361,9 @@ int RunAll() {
               1 / 1.7);
 
     CompareSizes(table);
-    table.CompareTimed("grow a handle 16 B to 1 MiB by 16 bytes", GrowHandle, "realloc", GrowBlock, 1.3);
+    table.CompareTimed("grow a handle 16 B to 1 MiB by 16 bytes", GrowHandle<16>, "realloc", GrowBlock<16>, 1.3);
+    table.CompareTimed("grow a handle to 1 MiB by 4 bytes", GrowHandle<4>, "realloc", GrowBlock<4>, 20);
+    table.CompareTimed("grow a handle to 1 MiB by 1 byte", GrowHandle<1>, "realloc", GrowBlock<1>, 20);
     table.Compare("level-0 report to a handler, three values", Report, "snprintf", PrintIntoBuffer, 1.0);
     table.Count("kept per live 64-byte handle, tracking off", Ask(folder + "/bench_memory kept")["kept"],
                 "bytes beyond the 64", 32);

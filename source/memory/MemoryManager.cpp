@@ -200,11 +200,24 @@ TESSEL_NOT_INLINE MgErr ResizeFailed(uint32 bytes) {
     return kMemFullErr;
 }
 
-TESSEL_ALWAYS_INLINE MgErr ResizeChecked(ThreadMemory* mine, UHandle h, uint32 size, Alignment alignment, bool clear,
-                                         HandleLayout layout, uint32 oldSize) {
+// Who says how the data are to be aligned.
+enum class AlignedBy { kCaller, kSize };
+
+// The alignment chosen by size changes its offset from one size to the next. Large data that change by little keep the
+// one that they have: growing them a byte at a time would move all of them at every other step.
+TESSEL_ALWAYS_INLINE bool KeepsOffset(const Resizing& r) {
+    constexpr uint32 kLeastSize = 4096, kLeastChange = 256;  // the change as a part of the size
+    const uint32 change = r.newSize > r.oldSize ? r.newSize - r.oldSize : r.oldSize - r.newSize;
+    return r.oldSize >= kLeastSize && change < r.oldSize / kLeastChange &&
+           r.newAlignment.alignment == r.oldAlignment.alignment;
+}
+
+TESSEL_ALWAYS_INLINE MgErr ResizeChecked(ThreadMemory* mine, UHandle h, uint32 size, Alignment alignment, AlignedBy by,
+                                         bool clear, HandleLayout layout, uint32 oldSize) {
     Resizing r{layout, mine, h, size, oldSize, alignment, layout.AlignmentOf(*h), 0, 0};
     if (r.newSize == r.oldSize && r.newAlignment == r.oldAlignment) return kNoErr;
-    r.newBytes = layout.BlockSize(size, alignment);
+    if (by == AlignedBy::kSize && KeepsOffset(r)) r.newAlignment = r.oldAlignment;
+    r.newBytes = layout.BlockSize(size, r.newAlignment);
     if (TESSEL_UNLIKELY(r.newBytes == 0)) return ResizeFailed(size);
     r.oldBytes = layout.BlockSize(r.oldSize, r.oldAlignment);
     UPtr data = ResizeData(r);
@@ -223,13 +236,13 @@ TESSEL_NOT_INLINE MgErr AfterResize(MgErr err, UHandle h, uint32 size, uint32 ol
     return ReportMemoryError(err, operation);
 }
 
-MgErr Resize(UHandle h, uint32 size, Alignment alignment, bool clear, const char* operation) {
+MgErr Resize(UHandle h, uint32 size, Alignment alignment, AlignedBy by, bool clear, const char* operation) {
     ThreadMemory* mine = ThreadMemory::Mine();
     ThreadMemory::Count(mine, &MemoryCounters::resizes, 1u);
     if (TESSEL_UNLIKELY(!IsGoodHandle(h, kChangeProves))) return ReportBadHandle(operation);
     HandleLayout layout;
     uint32 oldSize = layout.SizeOf(*h);
-    MgErr err = ResizeChecked(mine, h, size, alignment, clear, layout, oldSize);
+    MgErr err = ResizeChecked(mine, h, size, alignment, by, clear, layout, oldSize);
     if (TESSEL_UNLIKELY(err != kNoErr || (Detours() & kHandlesTraced)))
         return AfterResize(err, h, size, oldSize, operation);
     return kNoErr;
@@ -261,7 +274,7 @@ UPtr CreatePtr(uint32 size, bool clear, const void* frame) {
 
 MgErr ResizeOrCreate(UHandle* h, uint32 size, bool clear, const char* operation, const void* frame) {
     if (!h) return kArgErr;
-    if (*h) return Resize(*h, size, AlignmentForSize(size), clear, operation);
+    if (*h) return Resize(*h, size, AlignmentForSize(size), AlignedBy::kSize, clear, operation);
     *h = CreateHandle(size, clear, frame);
     return *h ? kNoErr : kMemFullErr;
 }
@@ -336,19 +349,19 @@ uint32 DSGetHandleSize(UHandle h) {
 }
 
 MgErr DSSetHandleSize(UHandle h, uint32 size) {
-    return Resize(h, size, AlignmentForSize(size), false, "DSSetHandleSize");
+    return Resize(h, size, AlignmentForSize(size), AlignedBy::kSize, false, "DSSetHandleSize");
 }
 
 MgErr DSSetHSzClr(UHandle h, uint32 size) {
-    return Resize(h, size, AlignmentForSize(size), true, "DSSetHSzClr");
+    return Resize(h, size, AlignmentForSize(size), AlignedBy::kSize, true, "DSSetHSzClr");
 }
 
 MgErr DSSetAlignedHandleSize(UHandle h, uint32 size, uint32 alignment, uint32 offset) {
-    return Resize(h, size, AlignmentFor(alignment, offset), false, "DSSetAlignedHandleSize");
+    return Resize(h, size, AlignmentFor(alignment, offset), AlignedBy::kCaller, false, "DSSetAlignedHandleSize");
 }
 
 MgErr DSSetAlignedHSzClr(UHandle h, uint32 size, uint32 alignment, uint32 offset) {
-    return Resize(h, size, AlignmentFor(alignment, offset), true, "DSSetAlignedHSzClr");
+    return Resize(h, size, AlignmentFor(alignment, offset), AlignedBy::kCaller, true, "DSSetAlignedHSzClr");
 }
 
 MgErr DSSetHandleSizeOrNewHandle(UHandle* h, uint32 size) {

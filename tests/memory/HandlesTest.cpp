@@ -48,6 +48,25 @@ TEST_F(Handles, AreAlignedByTheirSize) {
     }
 }
 
+// A step that is large for the size places the data by the size; small steps rarely move them.
+TEST_F(Handles, GrowInSmallStepsWithoutMovingEachTime) {
+    UHandle h = DSNewHandle(4096);
+    uint32 moves = 0;
+    for (uint32 size = 4097; size <= 300000; ++size) {
+        const UPtr before = *h;
+        ASSERT_EQ(kNoErr, DSSetHandleSize(h, size));
+        (*h)[size - 1] = static_cast<uint8>(size * 7);
+        moves += *h != before;
+    }
+    EXPECT_LT(moves, 10000u);
+    for (uint32 i = 4096; i < 300000; ++i) ASSERT_EQ(static_cast<uint8>((i + 1) * 7), (*h)[i]) << i;
+    for (uint32 size : {400004u, 300001u, 310008u}) {
+        ASSERT_EQ(kNoErr, DSSetHandleSize(h, size));
+        EXPECT_TRUE(IsAligned(h, 16, size & 4 ? 4 : size & 1 ? 0 : 8)) << size;
+    }
+    EXPECT_EQ(kNoErr, DSDisposeHandle(h));
+}
+
 TEST_F(Handles, KeepTheirBytesAndAlignmentThroughResizes) {
     std::mt19937 random(1);
     const uint32 sizes[] = {0, 3, 17, 100, 1000, 5000, 70000, 300000};

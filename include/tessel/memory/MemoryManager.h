@@ -51,7 +51,8 @@ TESSEL_API MgErr DSDisposePtr(void* p);
 TESSEL_API uint32 DSGetHandleSize(UHandle h);
 
 /* Resizes, keeping the first min(old, new) bytes; the data may move. Clr: bytes beyond the old size are zero.
-   The alignment is chosen by the new size (DSNewHandle). */
+   The alignment is chosen by the new size (DSNewHandle); data of 4 KiB and more that change by less than a 256th of
+   their size keep the offset that they have, so that growing in small steps does not move them each time. */
 TESSEL_API MgErr DSSetHandleSize(UHandle h, uint32 size);
 TESSEL_API MgErr DSSetHSzClr(UHandle h, uint32 size);
 
