@@ -34,10 +34,12 @@ bool ThreadRunning(ThreadHandle thread, bool& running) noexcept;
 /* True when the thread has ended; false with 1460 after so many milliseconds (negative: waits for ever). */
 bool ThreadJoin(ThreadHandle thread, std::int32_t milliseconds) noexcept;
 
-/* The procedure's result, or what ThreadEnd set. 259 while it runs. */
+/* The procedure's result, or what ThreadEnd set; 0 of one that left through the host (pthread_exit). 259 while it
+   runs. */
 bool ThreadExitCode(ThreadHandle thread, std::int32_t& code) noexcept;
 
-/* Ends a thread by force, wherever it is: nothing of it is cleaned up, locks it holds stay held. Only for a thread that
+/* Ends a thread by force, wherever it is: nothing of it is cleaned up, locks it holds stay held, its stack and its
+   thread-local values stay in memory. Only for a thread that
    this seam started, and not the calling one (5 otherwise; 50 where the host cannot). Returns when it has ended; 1460
    when it did not within a second, because it refuses. */
 bool ThreadEnd(ThreadHandle thread, std::int32_t code) noexcept;

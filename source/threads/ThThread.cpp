@@ -80,11 +80,12 @@ void AwaitCompleteRecord(ThThread thread) {
 int32 RunThread(void* argument) {
     ThThread thread = static_cast<ThThread>(argument);
     AwaitCompleteRecord(thread);
-    SetOwnRecord(thread);
+    struct Identity {
+        explicit Identity(ThThread own) { SetOwnRecord(own); }
+        ~Identity() { SetOwnRecord(nullptr); }
+    } identity(thread);
     FPInit();
-    int32 exitCode = thread->procedure ? thread->procedure(thread->argument) : 0;
-    SetOwnRecord(nullptr);
-    return exitCode;
+    return thread->procedure ? thread->procedure(thread->argument) : 0;
 }
 
 enum class Outcome { kMade, kTableFull, kRefused };
@@ -130,26 +131,29 @@ MgErr Conclude(Outcome outcome, ThThread* thread) {
 
 constexpr int32 kPatience = 10000;  // milliseconds that a thread has to end by itself
 
-void EndByForce(ThThread thread) {
+bool EndByForce(ThThread thread) {
     TESSEL_REPORT(kDebugInfo, 0x5F8310BAu) << "Terminating thread " << thread->platformId;
-    if (platform::ThreadEnd(HandleOf(thread), 0)) return;
+    if (platform::ThreadEnd(HandleOf(thread), 0)) return true;
     TESSEL_REPORT(kDebugError, 0x22B7F6E3u)
         << "TerminateThread returns FALSE: why???, LastError = " << platform::LastError()
         << "threadid = " << thread->platformId;
+    return false;
 }
 
-// Waits for a thread started here, and ends it if it does not. The calling thread would wait for itself in vain.
-void EndStarted(ThThread thread) {
+// Waits for a thread started here, and ends it if it does not. The calling thread would wait for itself in vain. True
+// when no other thread uses the record any more.
+bool EndStarted(ThThread thread) {
     platform::ThreadHandle handle = HandleOf(thread);
     bool running = false;
     if (!platform::ThreadRunning(handle, running)) {
         TESSEL_REPORT(kDebugInfo, 0x4D91A7C8u)
             << "GetExitCodeThread returns FALSE, LastError = " << DbgFmtHex(platform::LastError());
         TESSEL_REPORT(kDebugError, 0x0B6E5D32u) << "Terminate thread failed";
-        return;
+        return true;
     }
     const bool isCaller = thread->platformId == platform::CurrentThreadId();
-    if (running && (isCaller || !platform::ThreadJoin(handle, kPatience))) EndByForce(thread);
+    if (!running || (!isCaller && platform::ThreadJoin(handle, kPatience))) return true;
+    return EndByForce(thread) || isCaller;
 }
 
 void CloseHandle(ThThread thread) {
@@ -241,8 +245,9 @@ void ThThreadDestroy(ThThread thread) {
         TESSEL_REPORT(kDebugInfo, 0x37A4C90Fu) << "WARNING: Destroying PseudoThread from another thread";
     Untrack(thread);
     if (!RemoveFromTable(thread)) TESSEL_REPORT(kDebugError, 0x7E52B841u) << "disposing thread out of range";
-    if (!thread->adopted) EndStarted(thread);
+    const bool ended = thread->adopted || EndStarted(thread);
     CloseHandle(thread);
+    if (!ended) return;  // the thread goes on with its record
     *thread = {};
     if (thread != &startUpRecord) DSDisposePtr(thread);
 }

@@ -4,6 +4,8 @@
 #include <errno.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <pthread.h>
+#include <sys/resource.h>
 
 #include <atomic>
 #include <cstdlib>
@@ -229,24 +231,53 @@ TEST_F(ThThreadTest, EndsAThreadThatIgnoresItsStopByForce) {
 #endif
     const size_t before = ThreadsOfProcess();
     LeapOverLongWaits leap;
-    std::atomic<bool> running{false};
+    static thread_local int leftBehind = 0;
+    static std::atomic<bool> running;
+    running = false;
+    ThEvent event = nullptr;
+    ThEventCreate(&event, 0, false);
     ThThread thread = StartThread(
-        [](void* flag) -> int32 {
-            *static_cast<std::atomic<bool>*>(flag) = true;
-            for (;;) std::this_thread::sleep_for(std::chrono::hours(1));
+        [](void* waited) -> int32 {
+            running = true;
+            leftBehind = 1;
+            ThEventMsgWaitMultiple(static_cast<ThEvent>(waited), nullptr, -1, true);
+            return 0;
         },
-        &running);
+        event);
     while (!running) std::this_thread::yield();
     const std::string text = "Terminating thread " + std::to_string(thread->platformId);
     ThThreadDestroy(thread);
     EXPECT_GE(LeapOverLongWaits::leapt, 10);
     EXPECT_THAT(reports_.Texts(), ElementsAre(text));
     AwaitThreads(before);
-    thread = StartThread(nullptr);
-    EXPECT_EQ(ThThreadGetIndex(thread), 1);
-    ThThreadDestroy(thread);
+    EXPECT_EQ(ThEventSignal(event), 1);  // it writes to a watch that lies on the dead thread's stack
+    for (int i = 0; i < 8; ++i) {
+        bool fresh = false;
+        thread = StartThread(
+            [](void* own) -> int32 {
+                *static_cast<bool*>(own) = !leftBehind && ThThreadGetIndex(nullptr) == 1;
+                return 0;
+            },
+            &fresh);
+        while (ThThreadActive(thread)) std::this_thread::yield();
+        ThThreadDestroy(thread);
+        EXPECT_TRUE(fresh);
+    }
+    ThEventDestroy(event);
     tessel::ThThreadStop();
     EXPECT_TRUE(reports_.Has(kDebugInfo, "Total Thread Leaks = 0.\n"));
+}
+
+TEST_F(ThThreadTest, MayLeaveThroughTheHost) {
+    static std::atomic<int> seen;
+    seen = 0;
+    ThThread thread = StartThread([](void*) -> int32 {
+        seen = ThThreadGetIndex(nullptr);
+        pthread_exit(nullptr);
+    });
+    while (seen == 0) std::this_thread::yield();
+    ThThreadDestroy(thread);
+    EXPECT_THAT(reports_.Texts(), IsEmpty());
 }
 
 TEST_F(ThThreadTest, MayDestroyItself) {
@@ -305,6 +336,7 @@ TEST_F(ThThreadTest, ReportsItsPriorityTable) {
 std::vector<int32> levelsSet;
 
 TEST_F(ThThreadTest, SetsPrioritiesAndTellsTheHost) {
+    if (::getpriority(PRIO_PROCESS, 0) != 0) GTEST_SKIP() << "the process itself does not have the priority 0";
     static ThThread thread;
     ThThreadPrioritySetProc note = [](ThThread set, ThPlatformThread, uint32 id, int32 level) {
         EXPECT_TRUE(set == thread && id == thread->platformId);

@@ -62,7 +62,10 @@ TESSEL_API int32 AssimilateStartUpThread(void);
 TESSEL_API bool IsStartUpThread(void);
 
 /* Ends a record. A thread started here that still runs is waited for, 10 seconds at most, and then ended by force:
-   what it holds stays held. Nothing for null; an error report, and nothing else, for a bad record. */
+   what it holds stays held, and its stack and its record's memory are lost for good when it refuses to end. A thread
+   that destroys its own record goes on without identity, with an error report (it cannot be ended by itself), and ends
+   when its procedure returns. A thread may leave through the host (pthread_exit); its exit code is 0 then. Nothing for
+   null; an error report, and nothing else, for a bad record. */
 TESSEL_API void ThThreadDestroy(ThThread thread);
 
 /* ---- identity ------------------------------------------------------------------------------------------------------

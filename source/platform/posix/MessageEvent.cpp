@@ -1,9 +1,16 @@
 #include "platform/MessageEvent.h"
 
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
 #include <new>
 
 #include "platform/Mutex.h"
 #include "platform/posix/Errors.h"
+#include "platform/posix/SystemCalls.h"
 #include "platform/posix/Threads.h"
 
 namespace tessel::platform {
@@ -12,9 +19,26 @@ namespace {
 
 struct Source {
     ThreadId thread;
+    std::uint64_t start; /* of the thread: its number may be given to another */
     Source* next;
     Event event;
 };
+
+/* When the thread began, in the host's ticks; 0 when it does not tell. */
+std::uint64_t StartOf(ThreadId thread) {
+    char name[48], text[512];
+    std::snprintf(name, sizeof name, "/proc/self/task/%u/stat", static_cast<unsigned>(thread));
+    int file = systemCalls.open(name, O_RDONLY | O_CLOEXEC, 0);
+    if (file < 0) return 0;
+    ssize_t got = systemCalls.read(file, text, sizeof text - 1);
+    systemCalls.close(file);
+    if (got <= 0) return 0;
+    text[got] = 0;
+    constexpr int kStateField = 3, kStartField = 22; /* the name before them, in brackets, may hold anything */
+    const char* at = std::strrchr(text, ')');
+    for (int field = kStateField - 1; at && field < kStartField; ++field) at = std::strchr(at + 1, ' ');
+    return at ? std::strtoull(at, nullptr, 10) : 0;
+}
 
 constinit Mutex sourcesMutex; /* guards the list; nothing is taken inside but what an event takes */
 constinit Source* sources = nullptr;
@@ -26,28 +50,38 @@ Source** Find(ThreadId thread) {
     return link;
 }
 
+/* An earlier thread of that number may have left one that was signaled and never asked for. */
 Source* FindOrMake(ThreadId thread) {
     Source** link = Find(thread);
-    if (!*link) *link = new (std::nothrow) Source{thread, nullptr, Event()};
+    std::uint64_t start = StartOf(thread);
+    if (!*link) *link = new (std::nothrow) Source{thread, start, nullptr, Event()};
+    if (*link && (*link)->start != start) {
+        (*link)->event.Renew(false);
+        (*link)->start = start;
+    }
     return *link;
 }
 
-/* Takes the calling thread's source out when the thread ends. That of one that is ended by force stays, for the next
-   thread of that number. */
+/* Takes the calling thread's source out when the thread ends. */
 struct Owner {
     Source* source = nullptr;
     ~Owner() {
-        if (!source) return;
-        MutexHolder holder(sourcesMutex);
-        Source** link = Find(source->thread);
-        *link = source->next;
-        delete source;
+        if (source) ForgetMessageEvent(source->thread);
     }
 };
 
 thread_local Owner own;
 
 }  // namespace
+
+void ForgetMessageEvent(ThreadId thread) noexcept {
+    MutexHolder holder(sourcesMutex);
+    Source** link = Find(thread);
+    if (Source* source = *link) {
+        *link = source->next;
+        delete source;
+    }
+}
 
 Event* OwnMessageEvent() noexcept {
     if (!own.source) {

@@ -25,10 +25,11 @@ struct ThreadRecord {
     std::atomic<int> references{1};
     std::atomic<ThreadId> id{0};
     std::atomic<bool> ended{false};
-    std::atomic<bool> forced{false}; /* by ThreadEnd: the thread's own reference is still there */
+    std::atomic<bool> forced{false};    /* ended by ThreadEnd */
+    std::atomic<bool> abandoned{false}; /* forced, and its own reference given back */
     std::atomic<std::int32_t> exitCode{0};
     bool started = false; /* by this seam */
-    bool joined = false;  /* guarded by joinMutex */
+    bool joined = false;  /* nothing of it runs any more; guarded by joinMutex */
     pthread_t thread{};
     ThreadProcedure procedure = nullptr;
     void* argument = nullptr;
@@ -49,7 +50,7 @@ constinit thread_local ThreadId currentId = 0;
 
 void Release(ThreadRecord* record) {
     if (record->references.fetch_sub(1, std::memory_order_acq_rel) != 1) return;
-    if (record->started && !record->joined) pthread_detach(record->thread);
+    if (record->started && !record->joined && !record->forced) pthread_detach(record->thread);
     delete record;
 }
 
@@ -74,7 +75,11 @@ ThreadId CurrentThreadId() noexcept {
 namespace {
 
 /* The host's own cancellation unwinds the thread's stack, and a frame on the way that lets no exception out would end
-   the process. So the thread is sent a signal, on which it leaves without looking back. */
+   the process. So the thread is sent a signal, on which it leaves without looking back.
+
+   Nothing of such a thread was cleaned up: its thread-local values still stand in its memory, and others may hold
+   pointers to its stack. So the host is never asked to join or detach it: the memory stays the dead thread's for good,
+   and no other thread begins with what it left. */
 int EndSignal() {
     return SIGRTMAX - 3;
 }
@@ -132,7 +137,11 @@ bool ThreadEnd(ThreadHandle thread, std::int32_t code) noexcept {
         if (error != 0 && error != ESRCH) return FailWith(ErrorOfErrno(error));
     }
     if (!ThreadJoin(thread, kPatience)) return false;
-    if (thread->forced.exchange(false)) Release(thread); /* what the thread itself can no longer give back */
+    /* What the thread itself can no longer do. */
+    if (thread->forced && !thread->abandoned.exchange(true)) {
+        ForgetMessageEvent(thread->id);
+        Release(thread);
+    }
     return true;
 }
 
@@ -146,10 +155,17 @@ void* RunThread(void* context) {
     AdmitEndSignal();
     record->id.store(CurrentThreadId(), std::memory_order_release);
     record->idKnown.Set();
-    std::int32_t code = record->procedure(record->argument);
-    currentRecord = nullptr;
-    MarkEnded(*record, code);
-    Release(record);
+    /* Also when the host's own way out of a thread unwinds it. */
+    struct AtEnd {
+        ThreadRecord* record;
+        std::int32_t code;
+        ~AtEnd() {
+            currentRecord = nullptr;
+            MarkEnded(*record, code);
+            Release(record);
+        }
+    } end{record, 0};
+    end.code = record->procedure(record->argument);
     return nullptr;
 }
 
@@ -227,10 +243,12 @@ bool ThreadJoin(ThreadHandle thread, std::int32_t milliseconds) noexcept {
         thread->over.Set();
     }
     MutexHolder holder(thread->joinMutex);
-    if (!thread->joined && thread != currentRecord) {
+    if (thread->joined || thread == currentRecord) return true;
+    if (thread->forced)
+        AwaitForeign(*thread, -1); /* it is on its last steps */
+    else
         pthread_join(thread->thread, nullptr);
-        thread->joined = true;
-    }
+    thread->joined = true;
     return true;
 }
 

@@ -9,6 +9,9 @@ namespace tessel::platform {
 /* Whether a thread of that number runs in this process. */
 bool IsThreadOfProcess(ThreadId thread) noexcept;
 
+/* Drops the message event of a thread that was ended by force. */
+void ForgetMessageEvent(ThreadId thread) noexcept;
+
 }  // namespace tessel::platform
 
 #endif
