@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <climits>
+#include <cmath>
 #include <cstring>
 #include <random>
 #include <string>
@@ -180,6 +181,31 @@ TEST(QSort, TakesTheStepsDescribed) {
     EXPECT_EQ(CompareUIntPtrTs(&least, &most), -1);
     EXPECT_EQ(CompareUIntPtrTs(&most, &least), 1);
     EXPECT_EQ(CompareUIntPtrTs(&most, &most), 0);
+}
+
+/* Chooses its answers as it goes (McIlroy's adversary): a record has no value yet until it must have one. */
+TEST(QSort, HasNoBadCase) {
+    static constexpr int32 kCount = 32000, kGas = kCount;
+    struct Adversary {
+        std::vector<int32> values = std::vector<int32>(kCount, kGas), records;
+        int32 solid = 0, candidate = 0;
+        int64 calls = 0;
+    } adversary;
+    for (int32 i = 0; i < kCount; ++i) adversary.records.push_back(i);
+    auto compare = [](const void* a, const void* b, void* context) -> int32 {
+        Adversary& self = *static_cast<Adversary*>(context);
+        const int32 left = *static_cast<const int32*>(a), right = *static_cast<const int32*>(b);
+        ++self.calls;
+        if (self.values[left] == kGas && self.values[right] == kGas)
+            self.values[left == self.candidate ? left : right] = self.solid++;
+        if (self.values[left] == kGas) self.candidate = left;
+        if (self.values[right] == kGas) self.candidate = right;
+        return self.values[left] - self.values[right];
+    };
+    QSortEx(adversary.records.data(), kCount, sizeof(int32), compare, &adversary);
+    EXPECT_LE(adversary.calls, 3.1 * kCount * std::log2(kCount));
+    for (int32 i = 1; i < kCount; ++i)
+        ASSERT_LE(adversary.values[adversary.records[i - 1]], adversary.values[adversary.records[i]]);
 }
 
 TEST(BinSearch, FindsOrTellsWhereToInsert) {

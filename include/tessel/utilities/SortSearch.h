@@ -2,7 +2,8 @@
 
    A comparison returns a negative number, 0 or a positive one as its first argument stands before, with or behind its
    second. `context` is handed through to it. Whatever a comparison answers, sorting ends and stays within the array.
-   Sizes are bytes. Nothing allocates; an exception of the comparison's passes through. Any thread on its own array. */
+   Sizes are bytes. A null array or comparison counts as no records; a key may be null. Nothing allocates; an exception
+   of the comparison's passes through. Any thread on its own array. */
 #ifndef TESSEL_UTILITIES_SORTSEARCH_H
 #define TESSEL_UTILITIES_SORTSEARCH_H
 
@@ -13,7 +14,8 @@ typedef int32 (*CompareProcEx)(const void* a, const void* b, void* context);
 
 TESSEL_BEGIN_C
 
-/* Sorts `count` records (quicksort, not stable; equal records and sorted arrays are no bad case). */
+/* Sorts `count` records (quicksort, not stable; equal records and sorted arrays are no bad case, and whatever the
+   comparison answers the time is in proportion to n log n). */
 TESSEL_API void QSort(void* base, int32 count, int32 recordSize, CompareProc compare);
 TESSEL_API void QSortEx(void* base, int32 count, int32 recordSize, CompareProcEx compare, void* context);
 
