@@ -1,5 +1,6 @@
 #include <tessel/time/BMTime.h>
 
+#include <algorithm>
 #include <cstring>
 
 #include "platform/Clock.h"
@@ -109,7 +110,9 @@ double ATime128::getSeconds() const {
 }
 
 double ATime128::getFraction() const {
-    return static_cast<double>(fFraction >> 11) * (kTwoToMinus64 * 2048);  // 53 bits: stays below 1
+    // A double holds 53 bits: what would round up to 1 stays below it.
+    constexpr double kBelowOne = 1.0 - 0x1p-53;
+    return std::min(static_cast<double>(fFraction) * kTwoToMinus64, kBelowOne);
 }
 
 ATime128 ATime128::operator+(const ATime128& other) const {

@@ -113,6 +113,7 @@ TEST(ATime128, HoldsSecondsAndFraction) {
     EXPECT_EQ(0.5, half.getFraction());
     EXPECT_EQ(-0.5, half.ToDouble());
     EXPECT_LT(ATime128(0, UINT64_MAX).getFraction(), 1.0);
+    EXPECT_EQ(0x1p-64, ATime128(0, 1).getFraction());
     t.SetInt64Seconds(0x0102030405060708);
     t.SetUInt64Fraction(0x1112131415161718);
     uint32 words[4];
