@@ -26,7 +26,7 @@ class HostFeatures final : public CPUFeatures {
 public:
     explicit HostFeatures(const platform::ProcessorFacts& facts)
         : flags_((facts.features & platform::kCompareExchange8) ? kCompareExchange8 : 0),
-          threadsPerCore_(static_cast<uint8>(std::clamp<uint32>(facts.logical / std::max(facts.cores, 1u), 1, 255))) {}
+          threadsPerCore_(static_cast<uint8>(std::clamp<uint32>(facts.threadsPerCore, 1, 255))) {}
     uint64 GetFlags() const override { return flags_; }
     uint8 GetThreadsPerCore() const override { return threadsPerCore_; }
 

@@ -7,6 +7,7 @@
 #    include <cpuid.h>
 #endif
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <set>
@@ -69,27 +70,30 @@ SystemVersion GetSystemVersion() {
     if (::uname(&host) == 0) {
         version.family = host.sysname;
         version.version = host.release;
-        version.build = host.version;
         std::sscanf(host.release, "%u.%u.%u", &version.major, &version.minor, &version.patch);
     }
+    version.build = std::to_string(version.patch);
     version.name = DistributionName();
     if (version.name.empty()) version.name = version.family + " " + version.version;
     return version;
 }
 
 ProcessorFacts GetProcessorFacts() {
-    ProcessorFacts facts{NumberOfProcessors(), 1, 1, Features(), {}, {}};
+    ProcessorFacts facts{NumberOfProcessors(), 1, 1, 1, Features(), {}, {}};
     std::string text, value, package;
     if (!ReadTextFile("/proc/cpuinfo", text))
         facts.trouble = "cannot read /proc/cpuinfo, error " + std::to_string(ErrorOfErrno(errno));
     std::set<std::string> packages, cores; /* a core's number counts within its package */
+    std::uint32_t processors = 0;
     ForEachLine(text, [&](std::string_view line) {
+        if (ValueOf(line, "processor", value)) ++processors;
         if (facts.model.empty()) ValueOf(line, "model name", facts.model);
         if (ValueOf(line, "physical id", package)) packages.insert(package);
         if (ValueOf(line, "core id", value)) cores.insert(package + "/" + value);
     });
     if (!packages.empty()) facts.packages = static_cast<std::uint32_t>(packages.size());
     if (!cores.empty()) facts.cores = static_cast<std::uint32_t>(cores.size());
+    facts.threadsPerCore = std::max(1u, std::max(processors, facts.logical) / facts.cores);
     return facts;
 }
 
