@@ -2,6 +2,8 @@
 
 #include <initializer_list>
 
+#include <tessel/memory/MemoryManager.h>
+
 void InitEventLoggingMgr() {
 }
 void UnInitEventLoggingMgr() {
@@ -31,6 +33,6 @@ int32 EventLoggingEnumLogEntry(uint32, uint32* threadID, uint32* event, uint32* 
     for (uint32* output : {threadID, event, value, timeHigh, timeLow}) {
         if (output) *output = 0;
     }
-    if (text) (*text)->count = 0;
+    if (text && DSGetHandleSize(reinterpret_cast<UHandle>(text)) >= sizeof(int32)) (*text)->count = 0;
     return 0;
 }

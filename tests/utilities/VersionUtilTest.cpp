@@ -1,3 +1,4 @@
+#include <tessel/memory/MemoryManager.h>
 #include <tessel/utilities/VersionUtil.h>
 #include <tessel/utilities/pheventlog.h>
 
@@ -5,6 +6,8 @@
 
 #include <cstring>
 #include <string>
+
+#include "support/StartedLibrary.h"
 
 namespace {
 
@@ -49,11 +52,16 @@ TEST(EventLog, ReadsAsEmpty) {
     EventLoggingLogUserEvent(1, 2);
     EventLoggingLogUserBuffer(1, "x", 1);
     uint32 words[5] = {1, 2, 3, 4, 5};
-    LStr text = {1, {'x'}};
-    LStrPtr master = &text;
-    EXPECT_EQ(EventLoggingEnumLogEntry(0, &words[0], &words[1], &words[2], &words[3], &words[4], &master), 0);
+    tessel::test::StartedLibrary library;
+    UHandle text = DSNewHClr(5), tiny = DSNewHandle(0);
+    LStrHandle string = reinterpret_cast<LStrHandle>(text);
+    (*string)->count = 1;
+    EXPECT_EQ(EventLoggingEnumLogEntry(0, &words[0], &words[1], &words[2], &words[3], &words[4], string), 0);
+    EXPECT_EQ(EventLoggingEnumLogEntry(0, nullptr, nullptr, nullptr, nullptr, nullptr, (LStrHandle)tiny), 0);
     for (uint32 word : words) EXPECT_EQ(word, 0u);
-    EXPECT_EQ(text.count, 0);
+    EXPECT_EQ((*string)->count, 0);
+    DSDisposeHandle(text);
+    DSDisposeHandle(tiny);
     EXPECT_EQ(EventLoggingEnumLogEntry(0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), 0);
     uint32 flags = 1, mask = 1;
     EventLoggingGetFlags(&flags, nullptr);
