@@ -82,7 +82,8 @@ TEST(RandomGen, WithoutMemoryForItsLockItFails) {
         EXPECT_TRUE(err == kNoErr || err == kMemFullErr);
         UninitRandomGen();
     });
-    EXPECT_EQ(failures, 3);  // the mutex, its event and that of the platform
+    // The mutex and its event; that of the platform may be one that is spare.
+    EXPECT_TRUE(failures == 2 || failures == 3) << failures;
 }
 
 constexpr OVGuidType kSample = {0x00112233, 0x4455, 0x6677, {0x88, 0x99, 0xAA, 0xBB, 0xCC, 0xDD, 0xEE, 0xFF}};
