@@ -89,7 +89,6 @@ private:
     MgErr Missing();
 
     bool ReadValue(CStr name, uint32& type);
-    MgErr OpenWith(RegistryKeyHandle handle, CStr path, IWinRegistryKey** key);
     MgErr DeleteAllSubKeys();
     platform::ErrorNumber CollectSubKeys(std::vector<std::string>& names) const;
 

@@ -14,7 +14,7 @@
 namespace tessel {
 namespace {
 
-constexpr int32 kExpectedEvents = 1;  // what a start and stop leaves behind
+constexpr int32 kExpectedEvents = 1;  // left over without a report; a start and stop leaves none
 SyncTracker eventTracker;
 
 struct EventRecord : THEVENTREC, PlainAllocation {};

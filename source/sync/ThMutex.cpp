@@ -13,7 +13,7 @@ namespace tessel {
 namespace {
 
 constexpr int32 kFree = -1;
-constexpr int32 kExpectedMutexes = 1;  // what a start and stop leaves behind
+constexpr int32 kExpectedMutexes = 1;  // left over without a report; a start and stop leaves none
 SyncTracker mutexTracker;
 
 struct MutexRecord : THMUTEXREC, PlainAllocation {};
