@@ -33,7 +33,7 @@ constexpr std::uint32_t kRegistryView64 = 0x100;
 
 struct RegistryKey;
 
-/* Opens a root. Always there. Close it like any other. */
+/* Opens a root, which is always there. 123 where TESSEL_REGISTRY is no absolute name. Close it like any other. */
 ErrorNumber RegistryOpenRoot(RegistryRoot root, std::uint32_t view, RegistryKey*& key);
 
 /* `path` is relative to `parent`: names with `\` between them; empty opens the parent again. 2 when it is missing, 5

@@ -289,12 +289,12 @@ static_assert(kRegistryViewOf64Bit == platform::kRegistryView64);
 platform::Mutex rootsMutex;                 // guards the making of roots; nothing is taken inside
 IWinRegistryKey* rootKeys[kRoots][2] = {};  // by root and view, for the life of the process
 
-// Null when there is no memory.
-IWinRegistryKey* MakeRoot(platform::RegistryRoot root, CStr name, uint32 view) try {
+// Null when there is no memory. Without a store it has no handle, so that every key of it is missing.
+IWinRegistryKey* MakeRoot(platform::RegistryRoot root, CStr name, uint32 view, ErrorNumber& error) try {
     platform::RegistryKey* opened = nullptr;
-    ErrorNumber error = platform::RegistryOpenRoot(root, view, opened);
+    error = platform::RegistryOpenRoot(root, view, opened);
     RegistryKeyHandle handle(opened);
-    return error == platform::kErrorSuccess ? new WinRegistryKey(std::move(handle), name) : nullptr;
+    return new WinRegistryKey(std::move(handle), name);
 } catch (const std::bad_alloc&) {
     return nullptr;
 }
@@ -306,9 +306,17 @@ IWinRegistryKey* RootKey(platform::RegistryRoot root, uint32 view) {
             << "Requested unknown registry view " << view << " for key " << kRootNames[index];
         return nullptr;
     }
-    platform::MutexHolder holder(rootsMutex);
-    IWinRegistryKey*& key = rootKeys[index][view == kRegistryViewOf64Bit];
-    if (!key) key = MakeRoot(root, kRootNames[index], view);
+    ErrorNumber error = platform::kErrorSuccess;
+    IWinRegistryKey* key = nullptr;
+    {
+        platform::MutexHolder holder(rootsMutex);
+        IWinRegistryKey*& known = rootKeys[index][view == kRegistryViewOf64Bit];
+        if (!known) known = MakeRoot(root, kRootNames[index], view, error);
+        key = known;
+    }
+    if (error != platform::kErrorSuccess)
+        TESSEL_REPORT(kDebugError, 0x6C41F7A3u)
+            << "TESSEL_REGISTRY is not the absolute name of a folder: " << kRootNames[index] << " has no keys";
     return key;
 }
 

@@ -2,6 +2,7 @@
 
 #include <new>
 
+#include "platform/CodePage.h"
 #include "registry/WinRegistryObjects.h"
 
 namespace tessel {
@@ -44,12 +45,23 @@ bool WinRegistryEnumeration<Interface, Element>::MoveNext() {
 template class WinRegistryEnumeration<IWinRegistryKeyEnumeration, IWinRegistryKey>;
 template class WinRegistryEnumeration<IWinRegistryValueEnumeration, IWinRegistryValue>;
 
+namespace {
+
+size_t Characters(const std::string& text) {
+    size_t count = 0;
+    const char* const end = text.data() + text.size();
+    for (const char* at = text.data(); at < end; at += platform::CharLength(at, end)) ++count;
+    return count;
+}
+
+}  // namespace
+
 ErrorNumber WinRegistryKeyEnumeration::Take(uint32 index) {
-    constexpr size_t kLongestName = 255;
+    constexpr size_t kLongestName = 255;  // characters
     std::string name;
     ErrorNumber error = platform::RegistryEnumerateKey(parent_.get(), index, name);
     if (error != platform::kErrorSuccess) return error;
-    if (name.size() > kLongestName) return platform::kErrorMoreData;
+    if (Characters(name) > kLongestName) return platform::kErrorMoreData;
     platform::RegistryKey* opened = nullptr;
     error = platform::RegistryOpen(parent_.get(), name.c_str(), false, opened);
     RegistryKeyHandle handle(opened);

@@ -45,6 +45,13 @@ protected:
     RegistryKey* root_ = nullptr;
 };
 
+TEST_F(Registry, NeedsAnAbsoluteFolder) {
+    setenv("TESSEL_REGISTRY", "relative/store", 1);
+    RegistryKey* key = nullptr;
+    EXPECT_EQ(kErrorInvalidName, RegistryOpenRoot(RegistryRoot::kUsers, kRegistryDefaultView, key));
+    EXPECT_EQ(nullptr, key);
+}
+
 TEST_F(Registry, KeysIgnoreCaseAndKeepIt) {
     EXPECT_EQ(kErrorFileNotFound, TryOpen("Software"));
     RegistryClose(Create("Software\\Maker\\Größe"));
@@ -188,7 +195,25 @@ TEST_F(Registry, NamesMayBeLongAndFilesLeftBehind) {
     FailingPlatform failing("open", 2, EEXIST, 3); /* the first call is for the lock */
     EXPECT_EQ(kErrorSuccess, RegistrySetValue(key, name.c_str(), 1, "x", 1));
     EXPECT_EQ(5, failing.Calls());
-    EXPECT_EQ(kErrorNameTooLong, RegistrySetValue(key, (name + name).c_str(), 1, "x", 1));
+    EXPECT_EQ(kErrorSuccess, RegistryDeleteValue(key, name.c_str()));
+    std::uint32_t type = 0;
+    std::string data, found;
+    for (const std::string& each : {std::string(255, '/'), std::string(300, '%'), name + "\xC3\xA4" + name}) {
+        EXPECT_EQ(kErrorFileNotFound, RegistryQueryValue(key, each.c_str(), type, data));
+        EXPECT_EQ(kErrorSuccess, RegistrySetValue(key, each.c_str(), 7, "data\n", 5));
+        EXPECT_EQ(kErrorSuccess, RegistryQueryValue(key, each.c_str(), type, data));
+        EXPECT_TRUE(type == 7 && data == "data\n");
+        EXPECT_EQ(kErrorSuccess, RegistryEnumerateValue(key, 0, found));
+        EXPECT_EQ(each, found);
+        EXPECT_EQ(kErrorSuccess, RegistryDeleteValue(key, each.c_str()));
+        RegistryClose(Create(("Key\\" + each + "\\Sub").c_str()));
+        EXPECT_EQ(kErrorSuccess, RegistryEnumerateKey(key, 0, found));
+        EXPECT_EQ(each, found);
+        EXPECT_EQ(kErrorSuccess, RegistryDelete(key, (each + "\\sub").c_str()));
+        EXPECT_EQ(kErrorSuccess, RegistryDelete(key, each.c_str()));
+    }
+    EXPECT_EQ(kErrorSuccess, RegistrySetValue(key, (name + "\xC3\xA4" + name).c_str(), 1, "x", 1));
+    EXPECT_EQ(kErrorSuccess, RegistryQueryValue(key, (std::string(250, 'N') + "\xC3\x84" + name).c_str(), type, data));
     RegistryClose(key);
 }
 

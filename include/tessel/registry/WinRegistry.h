@@ -10,6 +10,9 @@
    for no value. A null or empty value name is the key's unnamed value. The uint8 forms take the same names and texts as
    bytes.
 
+   TESSEL_REGISTRY names the folder that holds all, by an absolute name. With a relative one there is no registry: it is
+   reported when a root is first asked for, and every operation fails with 6.
+
    A key is for one thread at a time, and may be released before what was made from it. The roots may be used by any
    thread to open and create keys. */
 #ifndef TESSEL_REGISTRY_WINREGISTRY_H
@@ -135,7 +138,7 @@ public:
     virtual MgErr SetSubKeyDefaultValue(CStr subKey, const uint8* text) = 0;
     virtual MgErr SetSubKeyDefaultValue(CStr subKey, CStr text) = 0;
 
-    /// Stores raw data of any type. Null data: nothing, when the size is 0.
+    /// Stores raw data of any type, at most 64 MiB of it (87 for more). Null data: nothing, when the size is 0.
     virtual MgErr SetValue(const uint8* name, uint32 type, const void* data, uint32 size) = 0;
     virtual MgErr SetValue(CStr name, uint32 type, const void* data, uint32 size) = 0;
 

@@ -225,15 +225,6 @@ char32_t UpperOf(char32_t character) {
     return locale ? static_cast<char32_t>(towupper_l(character, locale)) : character;
 }
 
-/* One character of UTF-8, or one byte that is none, marked so that it equals only itself. */
-char32_t TakeUpper(std::string_view& text) {
-    char32_t character = 0;
-    std::size_t length = DecodeUtf8(text.data(), text.data() + text.size(), character);
-    if (length == 0) character = 0x80000000u | static_cast<unsigned char>(text[0]);
-    text.remove_prefix(length ? length : 1);
-    return length ? UpperOf(character) : character;
-}
-
 bool Exists(const std::string& native) {
     struct statx status;
     return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0;
@@ -258,6 +249,15 @@ bool FindInFolder(const std::string& folder, std::string_view name, std::string&
         if (EqualNames(name, entry->d_name) && (found.empty() || found > entry->d_name)) found = entry->d_name;
     }
     return !found.empty();
+}
+
+/* One character of UTF-8, or one byte that is none, marked so that it equals only itself. */
+char32_t TakeUpper(std::string_view& text) noexcept {
+    char32_t character = 0;
+    std::size_t length = DecodeUtf8(text.data(), text.data() + text.size(), character);
+    if (length == 0) character = 0x80000000u | static_cast<unsigned char>(text[0]);
+    text.remove_prefix(length ? length : 1);
+    return length ? UpperOf(character) : character;
 }
 
 bool EqualNames(std::string_view a, std::string_view b) noexcept {

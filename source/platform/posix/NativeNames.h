@@ -30,6 +30,9 @@ bool FindInFolder(const std::string& folder, std::string_view name, std::string&
 /* Equal but for case, of two names in UTF-8. */
 bool EqualNames(std::string_view a, std::string_view b) noexcept;
 
+/* Takes the first character off a name in UTF-8 (not empty), in upper case. A byte that is none equals only itself. */
+char32_t TakeUpper(std::string_view& text) noexcept;
+
 /* A name on the disk as the library sees it: in the code page, with `?` for what a name cannot hold. */
 std::string NameFromDisk(std::string_view diskName);
 

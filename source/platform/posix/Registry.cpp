@@ -27,8 +27,12 @@
    begin with a dot belong to the store: its lock, and values being written. The 64-bit view is a store of its own in
    the folder `.view64`.
 
-   A value's file holds `REG `, the type in decimal digits, a line feed, and the raw data. What a folder holds
-   otherwise, links to other folders too, is none of the registry's and goes with its key. */
+   A name too long for the host is `%~` and a hash of the name without regard to case; the name itself is in the file
+   `.name` of the key's folder, or in the value's file before the data.
+
+   A value's file holds `REG `, the type in decimal digits, a line feed, and the raw data; behind the type of one with a
+   long name stand a blank and the length of the name. What a folder holds otherwise, links to other folders too, is
+   none of the registry's and goes with its key. */
 
 namespace tessel::platform {
 
@@ -82,24 +86,67 @@ std::string ForDisk(const char* name) {
     return utf8;
 }
 
-std::string FromDisk(std::string_view diskName) {
-    std::string text = Unescaped(diskName);
+std::string FromDisk(const std::string& text) {
     if (ActiveCodePage().utf8) return text;
     std::string name;
     FromUtf8(text, name);
     return name;
 }
 
-std::string ValueFileName(const char* name) {
-    return kValueMark + Escaped(ForDisk(name));
+constexpr std::string_view kHashed = "%~"; /* no escaped byte begins so */
+constexpr const char* kNameFile = "/.name";
+
+bool IsHashed(std::string_view diskName) {
+    return diskName.substr(0, kHashed.size()) == kHashed;
 }
 
-std::vector<std::string> PathParts(const char* path) {
-    std::vector<std::string> parts;
+/* 128 bits of a name without regard to case: two never meet by chance. */
+std::string HashText(std::string_view name) {
+    constexpr std::uint64_t kPrime = 0x100000001B3u;
+    std::uint64_t first = 0xCBF29CE484222325u, second = 0x9E3779B97F4A7C15u;
+    while (!name.empty()) {
+        const char32_t character = TakeUpper(name);
+        first = (first ^ character) * kPrime;
+        second = (second + character) * kPrime;
+        second ^= second >> 29;
+    }
+    char text[33];
+    std::snprintf(text, sizeof text, "%016llx%016llx", static_cast<unsigned long long>(first),
+                  static_cast<unsigned long long>(second));
+    return text;
+}
+
+/* The name on the disk of a key or, behind the mark, of a value; without the mark. */
+std::string DiskNameOf(std::string_view name) {
+    constexpr std::size_t kLongest = 255 - sizeof kValueMark;
+    std::string escaped = Escaped(name);
+    return escaped.size() <= kLongest ? escaped : std::string(kHashed) + HashText(name);
+}
+
+/* The name of a key that was written by earlier versions fills the last byte too. */
+std::string KeyDiskNameOf(std::string_view name) {
+    std::string escaped = Escaped(name);
+    return escaped.size() <= 255 ? escaped : DiskNameOf(name);
+}
+
+std::string ValueFileName(const char* name) {
+    return kValueMark + DiskNameOf(ForDisk(name));
+}
+
+struct KeyName {
+    std::string name, disk; /* both in UTF-8 */
+};
+
+std::vector<KeyName> PathParts(const char* path) {
+    std::vector<KeyName> parts;
     std::string text = ForDisk(path);
     for (std::size_t start = 0; start <= text.size();) {
         std::size_t end = std::min(text.find('\\', start), text.size());
-        if (end > start) parts.push_back(Escaped(std::string_view(text).substr(start, end - start)));
+        if (end > start) {
+            std::string name = text.substr(start, end - start);
+            std::string disk = KeyDiskNameOf(name);
+            parts.push_back({std::move(name), std::move(disk)});
+        }
         start = end + 1;
     }
     return parts;
@@ -107,9 +154,11 @@ std::vector<std::string> PathParts(const char* path) {
 
 // ---- the store ------------------------------------------------------------------------------------------------------
 
+/* Empty when the setting names none: a relative one would lie elsewhere for every process. */
 std::string StoreFolder() {
     const char* setting = std::getenv("TESSEL_REGISTRY");
-    return setting && *setting == '/' ? setting : XdgFolder("XDG_CONFIG_HOME", ".config") + "/tessel/registry";
+    if (setting && *setting) return *setting == '/' ? setting : "";
+    return XdgFolder("XDG_CONFIG_HOME", ".config") + "/tessel/registry";
 }
 
 /* Held by whoever changes the store, in whatever process: so no two make one name in two spellings, and no key goes
@@ -160,8 +209,19 @@ std::string ItemIn(const std::string& folder, const std::string& diskName) {
 
 std::string KeyFolder(const RegistryKey* parent, const char* path) {
     std::string folder = parent->folder;
-    for (const std::string& part : PathParts(path)) folder = ItemIn(folder, part);
+    for (const KeyName& part : PathParts(path)) folder = ItemIn(folder, part.disk);
     return folder;
+}
+
+/* Writes the long names of a key that was just made, and of those above it. */
+bool KeepNames(const RegistryKey* parent, const char* path) {
+    std::string folder = parent->folder;
+    for (const KeyName& part : PathParts(path)) {
+        folder = ItemIn(folder, part.disk);
+        if (IsHashed(part.disk) && !Exists(folder + kNameFile) && !ReplaceFile(folder + kNameFile, part.name))
+            return false;
+    }
+    return true;
 }
 
 enum class Kind { kKey, kValue, kOther };
@@ -203,6 +263,7 @@ ErrorNumber RegistryOpenRoot(RegistryRoot root, std::uint32_t view, RegistryKey*
     key = nullptr;
     if (view != kRegistryDefaultView && view != kRegistryView64) return kErrorInvalidParameter;
     std::string store = StoreFolder();
+    if (store.empty()) return kErrorInvalidName;
     std::string folder = store + (view == kRegistryView64 ? "/.view64/" : "/") + kNames[static_cast<int>(root)];
     key = new RegistryKey{std::move(store), std::move(folder), true, true, {}};
     return kErrorSuccess;
@@ -229,6 +290,7 @@ ErrorNumber RegistryCreate(const RegistryKey* parent, const char* path, Registry
     std::string folder = KeyFolder(parent, path);
     if (!MakeFolders(folder)) return ErrnoNumber();
     if (!IsFolder(folder)) return kErrorAccessDenied;
+    if (!KeepNames(parent, path)) return ErrnoNumber();
     const bool root = parent->root && folder == parent->folder;
     key = new RegistryKey{parent->store, std::move(folder), root, true, {}};
     return kErrorSuccess;
@@ -269,13 +331,48 @@ ErrorNumber RegistryCounts(const RegistryKey* key, std::uint32_t& subKeys, std::
 
 namespace {
 
+constexpr std::string_view kValueHeader = "REG ";
+constexpr std::size_t kLongestHeader = kValueHeader.size() + 22; /* two numbers, the blank and the line feed */
+
+/* Of a value's file: what stands where. `length` is that of the name before the data. */
+struct ValueHeader {
+    std::uint32_t type = 0;
+    std::size_t size = 0, length = 0;
+};
+
+bool ParseHeader(const std::string& text, bool hashed, ValueHeader& header) {
+    if (text.compare(0, kValueHeader.size(), kValueHeader) != 0) return false;
+    const char* const end = text.data() + text.size();
+    std::from_chars_result number = std::from_chars(text.data() + kValueHeader.size(), end, header.type);
+    if (number.ec == std::errc() && hashed && number.ptr != end && *number.ptr == ' ')
+        number = std::from_chars(number.ptr + 1, end, header.length);
+    if (number.ec != std::errc() || number.ptr == end || *number.ptr != '\n') return false;
+    header.size = static_cast<std::size_t>(number.ptr + 1 - text.data());
+    return header.length <= text.size() - header.size;
+}
+
+/* The name of what stands in a key's folder, in UTF-8. False when it cannot be read: then it is none of ours. */
+bool NameOfItem(const std::string& folder, std::string_view item, Kind kind, std::string& name) {
+    constexpr std::size_t kMost = 1024 * 1024;
+    const std::string_view disk = item.substr(kind == Kind::kValue ? 1 : 0);
+    name = Unescaped(disk);
+    if (!IsHashed(disk)) return true;
+    const std::string native = folder + "/" + std::string(item);
+    if (kind == Kind::kKey) return ReadTextFile((native + kNameFile).c_str(), name, kMost);
+    ValueHeader header;
+    if (!ReadTextFile(native.c_str(), name, kMost) || !ParseHeader(name, true, header)) return false;
+    name = name.substr(header.size, header.length);
+    return true;
+}
+
 /* The first index lists the folder, the others read on in that listing. */
 ErrorNumber Enumerate(const RegistryKey* key, Kind kind, std::uint32_t index, std::string& name) {
     if (!key) return kErrorInvalidHandle;
     if (index == 0) {
         key->listing.clear();
         ErrorNumber number = VisitKey(key, [&](std::string_view item, Kind itemKind) {
-            if (itemKind == kind) key->listing.push_back(FromDisk(item.substr(kind == Kind::kValue ? 1 : 0)));
+            std::string found;
+            if (itemKind == kind && NameOfItem(key->folder, item, kind, found)) key->listing.push_back(FromDisk(found));
         });
         if (number != kErrorSuccess) return number;
         std::sort(key->listing.begin(), key->listing.end());
@@ -299,13 +396,12 @@ ErrorNumber RegistryEnumerateValue(const RegistryKey* key, std::uint32_t index, 
 
 namespace {
 
-constexpr std::string_view kValueHeader = "REG ";
-constexpr std::size_t kLongestHeader = kValueHeader.size() + 11; /* ten digits and the line feed */
+constexpr std::size_t kLongestName = 1024 * 1024; /* bytes of a value's name before its data */
 
 /* As the name is spelled first: a name that fits costs no look at the folder. False with errno. No more is read than
    a value may have, and a byte: a damaged store must not take all memory. */
 bool ReadValueFile(const std::string& folder, const std::string& diskName, std::string& text) {
-    constexpr std::size_t kMost = kLongestHeader + kLargestRegistryValue + 1;
+    constexpr std::size_t kMost = kLongestHeader + kLongestName + kLargestRegistryValue + 1;
     std::string found;
     if (ReadTextFile((folder + "/" + diskName).c_str(), text, kMost)) return true;
     if (errno != ENOENT) return false;
@@ -314,13 +410,11 @@ bool ReadValueFile(const std::string& folder, const std::string& diskName, std::
     return false;
 }
 
-bool ParseValue(std::string& text, std::uint32_t& type) {
-    if (text.compare(0, kValueHeader.size(), kValueHeader) != 0) return false;
-    const char* start = text.data() + kValueHeader.size();
-    const char* end = text.data() + text.size();
-    std::from_chars_result number = std::from_chars(start, end, type);
-    if (number.ec != std::errc() || number.ptr == end || *number.ptr != '\n') return false;
-    text.erase(0, static_cast<std::size_t>(number.ptr + 1 - text.data()));
+bool ParseValue(std::string& text, bool hashed, std::uint32_t& type) {
+    ValueHeader header;
+    if (!ParseHeader(text, hashed, header)) return false;
+    type = header.type;
+    text.erase(0, header.size + header.length);
     return text.size() <= kLargestRegistryValue;
 }
 
@@ -328,8 +422,9 @@ bool ParseValue(std::string& text, std::uint32_t& type) {
 
 ErrorNumber RegistryQueryValue(const RegistryKey* key, const char* name, std::uint32_t& type, std::string& data) {
     if (!key) return kErrorInvalidHandle;
-    if (!ReadValueFile(key->folder, ValueFileName(name), data)) return ErrnoNumber();
-    return ParseValue(data, type) ? kErrorSuccess : kErrorRegistryCorrupt;
+    const std::string file = ValueFileName(name);
+    if (!ReadValueFile(key->folder, file, data)) return ErrnoNumber();
+    return ParseValue(data, IsHashed(std::string_view(file).substr(1)), type) ? kErrorSuccess : kErrorRegistryCorrupt;
 }
 
 ErrorNumber RegistrySetValue(const RegistryKey* key, const char* name, std::uint32_t type, const void* data,
@@ -337,13 +432,16 @@ ErrorNumber RegistrySetValue(const RegistryKey* key, const char* name, std::uint
     if (!key) return kErrorInvalidHandle;
     if (!key->write) return kErrorAccessDenied;
     if ((!data && size != 0) || size > kLargestRegistryValue) return kErrorInvalidParameter;
+    const std::string file = ValueFileName(name), utf8 = ForDisk(name);
+    const bool hashed = IsHashed(std::string_view(file).substr(1));
+    if (hashed && utf8.size() > kLongestName) return kErrorInvalidParameter;
     std::string text(kValueHeader);
-    text += std::to_string(type) + "\n";
+    text += std::to_string(type) + (hashed ? " " + std::to_string(utf8.size()) + "\n" + utf8 : "\n");
     if (size != 0) text.append(static_cast<const char*>(data), size);
     StoreLock lock(key->store);
     if (ErrorNumber gone = CheckThere(key)) return gone;
     if (key->root && !MakeFolders(key->folder)) return ErrnoNumber();
-    return ReplaceFile(ItemIn(key->folder, ValueFileName(name)), text) ? kErrorSuccess : ErrnoNumber();
+    return ReplaceFile(ItemIn(key->folder, file), text) ? kErrorSuccess : ErrnoNumber();
 }
 
 ErrorNumber RegistryDeleteValue(const RegistryKey* key, const char* name) {
