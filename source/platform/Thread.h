@@ -17,7 +17,8 @@ using ThreadHandle = ThreadRecord*;
 
 using ThreadProcedure = std::int32_t (*)(void* argument);
 
-/* Starts a thread on `procedure` with the host's usual stack. Its result is the exit code. */
+/* Starts a thread on `procedure` with the host's usual stack, and the priority that the process was started with
+   (its maker's, where that is lower and the host does not let it be raised). Its result is the exit code. */
 ThreadHandle ThreadStart(ThreadProcedure procedure, void* argument, ThreadId& id) noexcept;
 
 /* A handle for the calling thread, whoever started it. */

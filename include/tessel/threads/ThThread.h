@@ -48,7 +48,9 @@ TESSEL_BEGIN_C
 /* ---- making and ending --------------------------------------------------------------------------------------------
  */
 
-/* Starts a thread on `procedure` (null: it ends at once). *thread is set before it runs. The name is not used.
+/* Starts a thread on `procedure` (null: it ends at once). *thread is set before it runs. The name is not used. It has
+   the priority that the process was started with; where its maker's is lower and the host does not let it be raised,
+   its maker's.
    kMemFullErr, and null in *thread, when there is no memory, the host refuses or the table is full. */
 TESSEL_API MgErr ThThreadCreate(ThThread* thread, ThThreadProc procedure, void* argument, CStr name);
 
@@ -90,7 +92,10 @@ TESSEL_API void ThGetPlatformThread(ThThread thread, ThPlatformThread** handle, 
 /* ---- priority ------------------------------------------------------------------------------------------------------
  */
 
-/* Sets a level; a negative one is reported and counts as normal, one of 5 or more is reported and changes nothing.
+/* The levels stand for priorities of the host, whatever that of the process: where one was started at a low priority
+   and may not raise it, normal is refused and reported, and a new thread's level may be lower than normal.
+
+   Sets a level; a negative one is reported and counts as normal, one of 5 or more is reported and changes nothing.
    Always kNoErr; a host that refuses is reported. */
 TESSEL_API MgErr ThThreadSetPriority(ThThread thread, int32 level);
 

@@ -149,10 +149,19 @@ bool ThreadEnd(ThreadHandle thread, std::int32_t code) noexcept {
 
 namespace {
 
+/* As the process was started with it. */
+const int processNice = ::getpriority(PRIO_PROCESS, 0);
+
+/* The host hands a maker's priority on to the threads it makes. Where it may not be raised again it stays. */
+void TakeProcessPriority() {
+    if (::getpriority(PRIO_PROCESS, 0) != processNice) ::setpriority(PRIO_PROCESS, 0, processNice);
+}
+
 void* RunThread(void* context) {
     ThreadRecord* record = static_cast<ThreadRecord*>(context);
     currentRecord = record;
     AdmitEndSignal();
+    TakeProcessPriority();
     record->id.store(CurrentThreadId(), std::memory_order_release);
     record->idKnown.Set();
     /* Also when the host's own way out of a thread unwinds it. */
