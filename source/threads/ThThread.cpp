@@ -295,6 +295,7 @@ void ThGetPlatformThread(ThThread thread, ThPlatformThread** handle, uint32** id
 // ---- the calling thread and the machine -----------------------------------------------------------------------------
 
 void ThGetThreadTime(_HRTime* time) {
+    if (!time) return;
     const platform::ProcessorTime used = platform::ThreadTimes();
     const uint64 total = used.kernel + used.user;
     time->high = static_cast<uint32>(total >> 32);

@@ -111,7 +111,7 @@ void ThThreadGetNativePriorityInfo(int32* background, int32* normal, int32* high
 }
 
 void ThThreadGetPrioInfo(uint8 out[kNumThPriorities]) {
-    std::memcpy(out, distinct, sizeof distinct);
+    if (out) std::memcpy(out, distinct, sizeof distinct);
 }
 
 MgErr ThSetThreadPrioritySetProc(ThThreadPrioritySetProc procedure) {

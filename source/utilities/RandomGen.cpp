@@ -57,6 +57,7 @@ MgErr UninitRandomGen() {
 }
 
 void RandomGen(double* out) {
+    if (!out) return;
     Seeds seeds;
     {
         tessel::ThMutexHolder holder(gRandomMutex);
@@ -66,6 +67,7 @@ void RandomGen(double* out) {
 }
 
 void RandomGenWithState(double* out, int32 state[3]) {
+    if (!out || !state) return;
     Seeds seeds = Next({{state[0], state[1], state[2]}});
     for (int i = 0; i < 3; ++i) state[i] = seeds.s[i];
     *out = Number(seeds);
@@ -73,6 +75,7 @@ void RandomGenWithState(double* out, int32 state[3]) {
 
 void RandomGenInitState(int32 state[3]) {
     constexpr double kRange = 30000;
+    if (!state) return;
     double number;
     RandomGen(&number);
     Seeds seeds = SeedsFrom(static_cast<int32>(number * kRange));

@@ -146,6 +146,9 @@ private:
 }  // namespace
 
 void NewCommandLineArgsFromSingleLine(CStr line, char* first, int32* count, char*** args) {
+    if (count) *count = 0;
+    if (args) *args = nullptr;
+    if (!count || !args) return;
     if (!line) line = "";
     size_t total = 1;
     for (Words words(line); words.Next();) ++total;

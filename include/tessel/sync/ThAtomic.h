@@ -1,4 +1,4 @@
-/* Atomic operations on words. All are full barriers. Any thread. */
+/* Atomic operations on words. All are full barriers. Any thread. Addresses are not checked for null. */
 #ifndef TESSEL_SYNC_THATOMIC_H
 #define TESSEL_SYNC_THATOMIC_H
 

@@ -28,7 +28,7 @@ TESSEL_API MgErr ThMutexCreate(ThMutex* mutex, CStr name);
 /* Nothing for null; an error report for a wrong verifier. No thread may hold it. */
 TESSEL_API void ThMutexDestroy(ThMutex mutex);
 
-/* What the inline operations do when another thread holds the mutex, or sleeps for it. */
+/* What the inline operations do when another thread holds the mutex, or sleeps for it. Not for null. */
 TESSEL_API void ThMutexAcquireHeld(ThMutex mutex);
 TESSEL_API void ThMutexWakeNext(ThMutex mutex);
 

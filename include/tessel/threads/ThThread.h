@@ -107,7 +107,8 @@ TESSEL_API int32 ThThreadGetPriority(ThThread thread);
 TESSEL_API void ThThreadGetNativePriorityInfo(int32* background, int32* normal, int32* high, int32* veryHigh,
                                               int32* timeCritical);
 
-/* Whether each level differs from the one below (the first: from the one above); normal always does. */
+/* Whether each level differs from the one below (the first: from the one above); normal always does.
+   Nothing for null. */
 TESSEL_API void ThThreadGetPrioInfo(uint8 distinct[kNumThPriorities]);
 
 /* Called, outside all locks, on the thread that set a priority, after it did. */
@@ -122,7 +123,7 @@ TESSEL_API MgErr ThClearThreadPrioritySetProc(ThThreadPrioritySetProc procedure)
 /* ---- the calling thread and the machine ----------------------------------------------------------------------------
  */
 
-/* Processor time that the calling thread has used, in 100 ns. */
+/* Processor time that the calling thread has used, in 100 ns. Nothing for null. */
 TESSEL_API void ThGetThreadTime(_HRTime* time);
 
 /* Bytes of stack left: not limited here, always 0x7FFFFFFF. */

@@ -2,7 +2,8 @@
 
    The clock mode is decided once by the operating system (OpSystemFeatureFlags::kIsNTOS). In process-time mode the
    count is the processor time that the process has used, in 100 ns; in tick mode it is milliseconds, the high word
-   counting the wraps of the tick (up to 255, when read at least once a wrap). Any thread. */
+   counting the wraps of the tick (up to 255, when read at least once a wrap). Any thread. Pointers are
+   not checked for null. */
 #ifndef TESSEL_TIME_HRTIME_H
 #define TESSEL_TIME_HRTIME_H
 

@@ -1,5 +1,5 @@
 /* Pseudo-random numbers: doubles in [0, 1), the same stream from the same seeds on every host (Wichmann-Hill, AS 183;
-   the period is about 7e12). Not for secrets. */
+   the period is about 7e12). Not for secrets. Nothing is done, and no number drawn, for a null pointer. */
 #ifndef TESSEL_UTILITIES_RANDOMGEN_H
 #define TESSEL_UTILITIES_RANDOMGEN_H
 

@@ -2,7 +2,8 @@
 
    A comparison returns a negative number, 0 or a positive one as its first argument stands before, with or behind its
    second. `context` is handed through to it. Whatever a comparison answers, sorting ends and stays within the array.
-   Sizes are bytes. A null array or comparison counts as no records; a key may be null. Nothing allocates; an exception
+   Sizes are bytes. A null array or comparison counts as no records; a null key goes to
+   the comparison as it is. Nothing allocates; an exception
    of the comparison's passes through. Any thread on its own array. */
 #ifndef TESSEL_UTILITIES_SORTSEARCH_H
 #define TESSEL_UTILITIES_SORTSEARCH_H
@@ -32,7 +33,7 @@ TESSEL_API int32 BinSearchEx(const void* base, int32 count, int32 recordSize, co
                              void* context);
 
 /* Comparisons to hand in: of int16, of int32 (right only while the difference of any two fits in an int32), and of
-   unsigned numbers as wide as a pointer. */
+   unsigned numbers as wide as a pointer. Not for null. */
 TESSEL_API int32 CompareInt16s(const void* a, const void* b);
 TESSEL_API int32 CompareInt32s(const void* a, const void* b);
 TESSEL_API int32 CompareUIntPtrTs(const void* a, const void* b);

@@ -36,8 +36,8 @@ TESSEL_API CStr GetPrefsPath(void);
 
 /* Arguments from one line of text: `first`, then the words of the line. Blanks and tabs separate words; a word that
    begins with a double quote goes on, without it, to the next double quote or the end of the line. The caller owns
-   *args (not `first`) and frees it with the other function; null and a count of 0 when there is no memory. A null line
-   is empty. */
+   *args (not `first`) and frees it with the other function; null and a count of 0 when there is no memory, and
+   nothing is made where one of the outputs is null. A null line is empty. */
 TESSEL_API void NewCommandLineArgsFromSingleLine(CStr line, char* first, int32* count, char*** args);
 TESSEL_API void DeleteCommandLineArgsFromSingleLine(int32 count, char** args); /* null is fine */
 
