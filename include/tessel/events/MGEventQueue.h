@@ -30,9 +30,7 @@ public:
         };
         // Given the pair that waits. Any other answer is as kKeepQueued.
         virtual int32 Decide(MGEventTarget* target, MGEvent* queued) = 0;
-
-    protected:
-        ~DuplicatePostedEventPolicy() = default;
+        virtual ~DuplicatePostedEventPolicy() = default;
     };
 
     // The policy of who gives none.
@@ -46,9 +44,7 @@ public:
     class TESSEL_API EventFilter {
     public:
         virtual int32 Check(MGEventTarget* target, MGEvent* event) = 0;
-
-    protected:
-        ~EventFilter() = default;
+        virtual ~EventFilter() = default;
     };
 
     using PurgePredicate = bool (*)(MGEventTarget* target, MGEvent* event, void* argument);
