@@ -102,13 +102,13 @@ MgErr OccurrenceManagerStart(bool hardWaitTimeCritical) {
 MgErr OccurrenceManagerStop() {
     ReportLeftOver();
     OccurrenceThreadStop();
-    gTimedHdlrMutex.Destroy();
-    gTimerOccMutex.Destroy();
-    gOccMutex.Destroy();
     FreeLeftOver(gHandlers);
     FreeLeftOver(gOccurrences);
     ForgetTimes();
     ResetThreadGroups();
+    gTimedHdlrMutex.Destroy();
+    gTimerOccMutex.Destroy();
+    gOccMutex.Destroy();
     gHandlers.Uninit();
     gOccurrences.Uninit();
     AsyncAreaStop();

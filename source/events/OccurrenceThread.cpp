@@ -125,6 +125,8 @@ void Unschedule(Occ& occurrence) {
 }
 
 void ForgetTimes() {
+    OccurrenceLockHolder timer(gTimerOccMutex);
+    OccurrenceLockHolder timed(gTimedHdlrMutex);
     gSchedule.Forget();
     gTimedHandlers.Forget();
 }

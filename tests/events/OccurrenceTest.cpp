@@ -4,6 +4,7 @@
 #include <array>
 #include <chrono>
 #include <mutex>
+#include <optional>
 #include <random>
 
 #include "EventsTestSupport.h"
@@ -98,11 +99,15 @@ TEST_F(OccurrenceTest, ReportsNullCallbacksAndDamagedLists) {
     EXPECT_EQ(kNoErr, CancelOnOccur(h));
     EXPECT_TRUE(reports.Has(kDebugInfo, "Handler marked as FIRED not on fired list!!"));
 
-    OnOccurrenceWithTimeout(h, true, 0);  // and nobody has the handler's refnum any more
-    gHandlers.DisposeCookie(h);
-    Await([&] { return reports.Has(kDebugInfo, "Bad occhandler in timeout list") || !record.timeout.IsListed(); });
+    TimeList::Entry nobodys(12345);
+    {
+        OccurrenceLockHolder timed(gTimedHdlrMutex);
+        gTimedHandlers.Insert(nobodys, MilliSecs(), MilliSecs(), TimeList::Among::kBeforeEquals);
+    }
+    OccurAtTime(o, MilliSecs() + 1000000);  // wakes the thread
+    Await([&] { return reports.Has(kDebugInfo, "Bad occhandler in timeout list"); });
+    DeallocOccurHdlr(h);
     DeallocOccur(o);
-    FreeOccurrenceRecord(&record);
 }
 
 // ---- groups ---------------------------------------------------------------------------------------------------------
@@ -171,7 +176,9 @@ TEST_F(OccurrenceTest, SetsWhatIsScheduledInOrder) {
         ran.push_back(static_cast<const char*>(name));
         ++count;
     };
-    HandClock clock(4294967296 - 5);  // the millisecond clock is about to wrap
+    OccurrenceManagerService()->Uninit();            // nobody reads the clock while it is exchanged
+    std::optional<HandClock> clock(4294967296 - 5);  // the millisecond clock is about to wrap
+    OccurrenceManagerService()->Init();
     const uint32 now = MilliSecs();
     const char* names[] = {"a", "b", "c", "d", "e"};
     std::vector<Occurrence> occurrences;
@@ -194,9 +201,9 @@ TEST_F(OccurrenceTest, SetsWhatIsScheduledInOrder) {
     OccurAtTime(occurrences[3], now + 2);
     OccurAtTime(occurrences[4], now + 1);
     CancelOccurAtTime(occurrences[4]);
-    clock.Advance(11);
+    clock->Advance(11);
     Await([&] { return count == 5; });
-    clock.Advance(1);
+    clock->Advance(1);
     Await([&] { return count == 6; });
     EXPECT_TRUE(HandlerTimedOut(timed));
     // Of one occurrence, the handler bound first runs first.
@@ -224,6 +231,9 @@ TEST_F(OccurrenceTest, SetsWhatIsScheduledInOrder) {
     DeallocOccurHdlr(dropped);
     DeallocOccurHdlr(timed);
     for (int i = 0; i < 4; ++i) DeallocOccur(occurrences[static_cast<size_t>(i)]);
+    OccurrenceManagerService()->Uninit();
+    clock.reset();
+    OccurrenceManagerService()->Init();
 }
 
 TEST_F(OccurrenceTest, ReportsATimedEventThatItCannotUse) {
