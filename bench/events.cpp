@@ -68,7 +68,7 @@ void CompareSetting(bench::Table& table) {
 std::atomic<std::uint64_t> arrived{0};
 
 void AwaitArrival(std::uint64_t count) {
-    while (arrived.load(std::memory_order_acquire) < count) ThPause(1);
+    while (arrived.load(std::memory_order_acquire) < count) std::this_thread::yield();
 }
 
 // A thread that checks its group whenever it is told.

@@ -10,6 +10,7 @@
 #include "events/Occurrences.h"
 #include "events/ThTmoEvent.h"
 #include "events/ThreadGroups.h"
+#include "platform/Thread.h"
 
 namespace tessel {
 
@@ -102,6 +103,7 @@ void ServeWhatIsDue() {
 
 int32 RunOccurrenceThread(void*) {
     ThThreadSetPriority(occurrenceThread, threadPriority);
+    platform::WakeOnTime();
     while (!mustStop) {
         ThTmoEventWait(*timedEvent);
         if (!mustStop) ServeWhatIsDue();
