@@ -12,7 +12,9 @@ target_compile_options(tessel_compile_options INTERFACE
 target_compile_definitions(tessel_compile_options INTERFACE _FILE_OFFSET_BITS=64 _TIME_BITS=64)
 if(CMAKE_CXX_COMPILER_ID STREQUAL "Clang")
   # x87 constants and long double in C++ headers are fine; clang is stricter about what it calls an extension.
-  target_compile_options(tessel_compile_options INTERFACE -Wno-gnu-zero-variadic-macro-arguments)
+  # It also proves who holds which of the locks that are annotated, and their order.
+  target_compile_options(tessel_compile_options INTERFACE -Wno-gnu-zero-variadic-macro-arguments
+    $<$<COMPILE_LANGUAGE:CXX>:-Wthread-safety;-Wthread-safety-beta>)
 endif()
 
 if(CMAKE_SIZEOF_VOID_P EQUAL 4 AND CMAKE_SYSTEM_PROCESSOR MATCHES "^(x86_64|amd64|AMD64|i[3-6]86)$")

@@ -17,6 +17,12 @@
 #include <tessel/diagnostics/DumpLeakInfo.h>
 #include <tessel/diagnostics/FileLoc.h>
 #include <tessel/diagnostics/StackChain.h>
+#include <tessel/events/MGEvent.h>
+#include <tessel/events/MGEventQueue.h>
+#include <tessel/events/MGEventTarget.h>
+#include <tessel/events/MGEvtQPurge.h>
+#include <tessel/events/MGUnknown.h>
+#include <tessel/events/OccurrenceManager.h>
 #include <tessel/files/AppPath.h>
 #include <tessel/files/CachedPathFlavor.h>
 #include <tessel/files/FileManager.h>

@@ -3,6 +3,7 @@
 
 #include "diagnostics/Guarded.h"
 #include "diagnostics/Service.h"
+#include "events/Service.h"
 #include "files/Service.h"
 #include "memory/Service.h"
 #include "numerics/Service.h"
@@ -134,8 +135,8 @@ struct HardWaitBehavior_Service final : CoreService<HardWaitBehavior_Service> {
 struct OccurrenceManager_Service final : CoreService<OccurrenceManager_Service> {
     static constexpr char kName[] = "OccurrenceManager";
     static constexpr Accessor kDependencies[] = {HardWaitBehaviorService, ThMutexService, ThThreadService};
-    static MgErr Start() { return kNoErr; }
-    static MgErr Stop() { return kNoErr; }
+    static MgErr Start() { return OccurrenceManagerStart(); }
+    static MgErr Stop() { return OccurrenceManagerStop(); }
 };
 
 }  // namespace

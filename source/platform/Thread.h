@@ -62,6 +62,9 @@ std::uint32_t NumberOfProcessors() noexcept;
 /* Gives the processor to another thread. */
 void YieldThread() noexcept;
 
+/* From now on the calling thread's waits end as soon after their time as the host can: for who serves time-outs. */
+void WakeOnTime() noexcept;
+
 /* The processor's hint that this is a spin loop. */
 inline void SpinPause() noexcept {
 #if defined(__x86_64__) || defined(__i386__)

@@ -21,6 +21,7 @@ namespace {
 
 // Written under gCreateThread. Entry 0 is looked at without it.
 std::atomic<ThThread> table[kMaxThThreads];
+std::atomic<uint32> endings[kMaxThThreads];
 
 AllocTrackerPtr threadTracker = nullptr;                 // of the threads started here
 std::atomic<uint32> ownRecordKey{kThNoLocalStorageKey};  // the slot of the calling thread's record
@@ -52,6 +53,7 @@ bool EnterIntoTable(ThThread thread) {
 bool RemoveFromTable(ThThread thread) {
     ThMutexHolder holder(gCreateThread);
     if (thread->index < 0 || thread->index >= kMaxThThreads || table[thread->index] != thread) return false;
+    endings[thread->index].fetch_add(1, std::memory_order_relaxed);
     table[thread->index] = nullptr;
     return true;
 }
@@ -163,6 +165,10 @@ void CloseHandle(ThThread thread) {
 }
 
 }  // namespace
+
+uint32 ThreadEndings(int32 index) {
+    return endings[index].load(std::memory_order_relaxed);
+}
 
 // ---- the service ----------------------------------------------------------------------------------------------------
 

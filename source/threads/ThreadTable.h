@@ -22,6 +22,9 @@ inline platform::ThreadHandle HandleOf(ThThread thread) {
     return static_cast<platform::ThreadHandle>(thread->platformThread);
 }
 
+// How many threads that had this place in the table are gone.
+uint32 ThreadEndings(int32 index);
+
 // Sets the priorities of the levels, from the defaults and what is configured, and reports them.
 void BuildPriorityTable(ThreadPriorityReader configured);
 
