@@ -1,5 +1,5 @@
 // Occurrences and event queues.
-#include <glib.h>
+#include "support/Compare.h"
 #include <tessel/tessel.h>
 
 #include <QCoreApplication>
@@ -9,11 +9,10 @@
 #include <atomic>
 #include <boost/signals2.hpp>
 #include <chrono>
+#include <glib.h>
 #include <random>
 #include <thread>
 #include <vector>
-
-#include "support/Compare.h"
 
 namespace {
 

@@ -1,10 +1,9 @@
 // The real members of the math family beside the libm calls under them, and the sums.
+#include "support/Compare.h"
 #include <tessel/tessel.h>
 
 #include <cmath>
 #include <vector>
-
-#include "support/Compare.h"
 
 namespace {
 

@@ -1,7 +1,7 @@
 // Handles, tracking, cookies and reports. Tracking is decided when the library starts, so the program runs itself for
 // the figures with tracking on (`bench_memory tracked`), and for the memory kept, which wants a fresh process (`kept`).
+#include "support/Compare.h"
 #include <tessel/tessel.h>
-#include <unistd.h>
 
 #include <atomic>
 #include <cstdlib>
@@ -12,9 +12,8 @@
 #include <semaphore>
 #include <string>
 #include <thread>
+#include <unistd.h>
 #include <unordered_map>
-
-#include "support/Compare.h"
 
 namespace {
 
@@ -256,7 +255,7 @@ double MemoryKept() {
         }
         return static_cast<double>(pages) * static_cast<double>(sysconf(_SC_PAGESIZE));
     };
-    std::vector<UHandle> handles(kMany, reinterpret_cast<UHandle>(1)); /* its pages are there before */
+    std::vector<UHandle> handles(kMany, reinterpret_cast<UHandle>(1));  // its pages are there before
     CreateAndDisposeDeep(kFew);
     double before = resident();
     for (UHandle& handle : handles) handle = DSNewHandle(64);
@@ -340,7 +339,7 @@ int RunAll() {
     setenv("OV_ALLOC_TRACKER", "off", 1);
     Library library;
     std::binary_semaphore end(0);
-    std::thread second([&] { end.acquire(); }); /* so that nobody takes a single-threaded short cut */
+    std::thread second([&] { end.acquire(); });  // so that nobody takes a single-threaded short cut
 
     bench::Table table("memory");
     table.Compare("create + dispose a 64-byte handle, tracking off", CreateAndDispose, "malloc + free", MallocAndFree,

@@ -1,16 +1,15 @@
 // Mutexes, events and the clock.
-#include <semaphore.h>
+#include "support/Compare.h"
 #include <tessel/tessel.h>
-#include <time.h>
 
 #include <atomic>
 #include <chrono>
 #include <condition_variable>
 #include <mutex>
+#include <semaphore.h>
 #include <semaphore>
 #include <thread>
-
-#include "support/Compare.h"
+#include <time.h>
 
 namespace {
 
@@ -188,7 +187,7 @@ void CompareClock(bench::Table& table) {
 int main() {
     if (InitTesselBase() != kNoErr) return 1;
     std::binary_semaphore end(0);
-    std::thread second([&] { end.acquire(); }); /* so that nobody takes a single-threaded short cut */
+    std::thread second([&] { end.acquire(); });  // so that nobody takes a single-threaded short cut
     {
         bench::Table table("sync");
         CompareMutexes(table);

@@ -1,6 +1,5 @@
 // Printing, numbers to text and back, strings.
-#include <fmt/format.h>
-#include <strings.h>
+#include "support/Compare.h"
 #include <tessel/tessel.h>
 
 #include <charconv>
@@ -8,11 +7,11 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <fmt/format.h>
 #include <random>
 #include <string>
+#include <strings.h>
 #include <vector>
-
-#include "support/Compare.h"
 
 namespace {
 
@@ -35,7 +34,7 @@ Loop Each(F f) {
 struct Formatting {
     const char* what;
     Loop ours, printf, fmt;
-    double printfGoal, fmtGoal; /* 0: not compared */
+    double printfGoal, fmtGoal;  // 0: not compared
 };
 
 std::vector<double> RandomDoubles() {

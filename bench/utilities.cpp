@@ -1,19 +1,18 @@
 // Sorting, searching, random numbers and the registry.
-#include <fcntl.h>
+#include "support/Compare.h"
 #include <tessel/tessel.h>
-#include <unistd.h>
 
 #include <cstdlib>
 #include <cstring>
+#include <fcntl.h>
 #include <filesystem>
 #include <mutex>
 #include <random>
 #include <semaphore>
 #include <string>
 #include <thread>
+#include <unistd.h>
 #include <vector>
-
-#include "support/Compare.h"
 
 namespace {
 
@@ -98,7 +97,7 @@ void CompareSearches(bench::Table& table, CompareProc compare, const char* what)
 
 void CompareRandom(bench::Table& table) {
     std::binary_semaphore end(0);
-    std::thread second([&] { end.acquire(); }); /* so that std::mutex takes no single-threaded short cut */
+    std::thread second([&] { end.acquire(); });  // so that std::mutex takes no single-threaded short cut
     InitRandomGen();
     std::minstd_rand generator(1);
     std::mutex mutex;

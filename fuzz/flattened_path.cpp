@@ -2,6 +2,7 @@
 // flattened and read again.
 //
 // Input: a byte for the code page and the setting, then the bytes.
+#include "platform/CodePage.h"
 #include <tessel/diagnostics/DebugOutput.h>
 #include <tessel/frame/TesselInit.h>
 #include <tessel/paths/PathManager.h>
@@ -10,8 +11,6 @@
 #include <cstdlib>
 #include <cstring>
 #include <memory>
-
-#include "platform/CodePage.h"
 
 namespace {
 

@@ -2,7 +2,7 @@
 //
 // Input: a byte for the size, a byte for the code page, then the format. Every argument is the address of one object
 // that is good for every conversion that takes an address; an integer conversion takes the address as a number.
-#include <sys/mman.h>
+#include "platform/CodePage.h"
 #include <tessel/diagnostics/DebugOutput.h>
 #include <tessel/strings/StringFmtPrint.h>
 
@@ -10,8 +10,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <string>
-
-#include "platform/CodePage.h"
+#include <sys/mman.h>
 
 static_assert(sizeof(void*) == 8, "the object's first word is an address whose lower half is a count");
 

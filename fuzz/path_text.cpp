@@ -2,6 +2,7 @@
 // system is longer than its buffer.
 //
 // Input: a byte for the code page and the format, then the text.
+#include "platform/CodePage.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/DebugOutput.h>
 #include <tessel/frame/TesselInit.h>
@@ -13,8 +14,6 @@
 #include <memory>
 #include <optional>
 #include <string>
-
-#include "platform/CodePage.h"
 
 using tessel::PathRef;
 

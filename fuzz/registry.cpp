@@ -1,5 +1,6 @@
 // Any bytes stand in the store where a value is: what the key answers agrees with the file, and what it answered can be
 // stored again. The same bytes are also the file that names the user's folders.
+#include "platform/Shell.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/registry/WinRegistry.h>
 
@@ -10,8 +11,6 @@
 #include <fstream>
 #include <optional>
 #include <string>
-
-#include "platform/Shell.h"
 
 namespace {
 

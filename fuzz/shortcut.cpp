@@ -1,10 +1,10 @@
 // Any bytes are read as a shortcut file. Cutting a file short may take its target away, never make the reader fail.
+#include "platform/Shell.h"
+
 #include <cstdint>
 #include <cstdlib>
 #include <string>
 #include <string_view>
-
-#include "platform/Shell.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     const std::string_view bytes(reinterpret_cast<const char*>(data), size);

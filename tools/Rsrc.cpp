@@ -1,11 +1,11 @@
 #include "Rsrc.h"
 
+#include "Json.h"
+#include "Support.h"
+
 #include <algorithm>
 #include <cstdio>
 #include <map>
-
-#include "Json.h"
-#include "Support.h"
 
 namespace tool {
 

@@ -1,11 +1,11 @@
 // The command `tessel`: what the library does with files, from the command line.
+#include "Rsrc.h"
+#include "Support.h"
+
 #include <cstdio>
 #include <exception>
 #include <string>
 #include <vector>
-
-#include "Rsrc.h"
-#include "Support.h"
 
 namespace {
 

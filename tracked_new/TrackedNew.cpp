@@ -1,8 +1,8 @@
 // The global operators new and delete over TrackedMalloc and TrackedFree. Those for types of larger alignment than any
 // plain type stay the standard library's.
-#include <new>
-
 #include <tessel/memory/TrackedMallocFree.h>
+
+#include <new>
 
 void* operator new(size_t size) {
     return tessel::TrackedNew(size);

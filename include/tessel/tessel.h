@@ -1,4 +1,4 @@
-/* The whole interface, for C11 and for C++17. */
+// The whole interface, for C11 and for C++17.
 #ifndef TESSEL_TESSEL_H
 #define TESSEL_TESSEL_H
 

@@ -1,3 +1,7 @@
+#include "platform/CodePage.h"
+#include "platform/Debugger.h"
+#include "platform/FileSystem.h"
+#include "platform/Module.h"
 #include <tessel/base/MGModule.h>
 
 #include <algorithm>
@@ -8,11 +12,6 @@
 #include <new>
 #include <string>
 #include <string_view>
-
-#include "platform/CodePage.h"
-#include "platform/Debugger.h"
-#include "platform/FileSystem.h"
-#include "platform/Module.h"
 
 namespace tessel {
 namespace {

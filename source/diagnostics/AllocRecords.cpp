@@ -1,9 +1,9 @@
 #include "diagnostics/AllocRecords.h"
 
+#include "platform/Thread.h"
+
 #include <algorithm>
 #include <bit>
-
-#include "platform/Thread.h"
 
 namespace tessel {
 namespace {

@@ -3,12 +3,11 @@
 #ifndef TESSEL_SOURCE_DIAGNOSTICS_ALLOCRECORDS_H
 #define TESSEL_SOURCE_DIAGNOSTICS_ALLOCRECORDS_H
 
+#include "diagnostics/CallSites.h"
+#include "diagnostics/TrackerHeap.h"
 #include <tessel/base/Types.h>
 
 #include <atomic>
-
-#include "diagnostics/CallSites.h"
-#include "diagnostics/TrackerHeap.h"
 
 namespace tessel {
 

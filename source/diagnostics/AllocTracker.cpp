@@ -1,4 +1,9 @@
+#include "diagnostics/AllocTrackerImplementation.h"
+#include "diagnostics/AllocTracking.h"
+#include "diagnostics/NumberText.h"
 #include <tessel/diagnostics/AllocTracker.h>
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/diagnostics/StackChain.h>
 
 #include <algorithm>
 #include <cstdarg>
@@ -6,13 +11,6 @@
 #include <cstdlib>
 #include <cstring>
 #include <memory>
-
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/diagnostics/StackChain.h>
-
-#include "diagnostics/AllocTrackerImplementation.h"
-#include "diagnostics/AllocTracking.h"
-#include "diagnostics/NumberText.h"
 
 namespace tessel {
 namespace {

@@ -2,11 +2,10 @@
 #ifndef TESSEL_SOURCE_DIAGNOSTICS_ALLOCTRACKERIMPLEMENTATION_H
 #define TESSEL_SOURCE_DIAGNOSTICS_ALLOCTRACKERIMPLEMENTATION_H
 
-#include <tessel/diagnostics/AllocTracker.h>
-
 #include "diagnostics/AllocRecords.h"
 #include "diagnostics/CallSites.h"
 #include "diagnostics/TrackerHeap.h"
+#include <tessel/diagnostics/AllocTracker.h>
 
 namespace tessel {
 

@@ -1,12 +1,12 @@
 #include "diagnostics/AllocTracking.h"
 
+#include "diagnostics/Guarded.h"
+#include "platform/Process.h"
+
 #include <algorithm>
 #include <atomic>
 #include <cstring>
 #include <string>
-
-#include "diagnostics/Guarded.h"
-#include "platform/Process.h"
 
 namespace tessel {
 namespace {

@@ -1,13 +1,13 @@
 #include "diagnostics/CallSites.h"
 
+#include "platform/Module.h"
+#include "platform/Thread.h"
+
 #include <algorithm>
 #include <array>
 #include <cstdlib>
 #include <cstring>
 #include <utility>
-
-#include "platform/Module.h"
-#include "platform/Thread.h"
 
 namespace tessel {
 namespace {

@@ -6,12 +6,11 @@
 #ifndef TESSEL_SOURCE_DIAGNOSTICS_CALLSITES_H
 #define TESSEL_SOURCE_DIAGNOSTICS_CALLSITES_H
 
+#include "diagnostics/CallStackWalk.h"
+#include "diagnostics/TrackerHeap.h"
 #include <tessel/base/OVExcept.h>
 
 #include <atomic>
-
-#include "diagnostics/CallStackWalk.h"
-#include "diagnostics/TrackerHeap.h"
 
 namespace tessel {
 

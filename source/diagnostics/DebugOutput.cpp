@@ -1,15 +1,13 @@
-#include <tessel/diagnostics/DebugOutput.h>
-
-#include <atomic>
-#include <cstdio>
-#include <cstring>
-
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "diagnostics/NumberText.h"
 #include "platform/Debugger.h"
 #include "platform/MemoryRead.h"
 #include "platform/Process.h"
+#include <tessel/diagnostics/DebugOutput.h>
+#include <tessel/diagnostics/DebugStream.h>
+
+#include <atomic>
+#include <cstdio>
+#include <cstring>
 
 namespace tessel {
 namespace {

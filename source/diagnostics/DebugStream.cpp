@@ -1,13 +1,12 @@
+#include "diagnostics/NumberText.h"
+#include "diagnostics/Service.h"
+#include "platform/Thread.h"
 #include <tessel/diagnostics/DebugStream.h>
 
 #include <algorithm>
 #include <atomic>
 #include <charconv>
 #include <cstdlib>
-
-#include "diagnostics/NumberText.h"
-#include "diagnostics/Service.h"
-#include "platform/Thread.h"
 
 namespace tessel {
 namespace {

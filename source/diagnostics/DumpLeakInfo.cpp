@@ -1,17 +1,15 @@
+#include "diagnostics/Guarded.h"
+#include "platform/File.h"
+#include "platform/LastError.h"
+#include "platform/MemoryRead.h"
+#include <tessel/diagnostics/DebugStream.h>
 #include <tessel/diagnostics/DumpLeakInfo.h>
+#include <tessel/diagnostics/FileLoc.h>
 
 #include <cstdarg>
 #include <cstdio>
 #include <cstring>
 #include <memory>
-
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/diagnostics/FileLoc.h>
-
-#include "diagnostics/Guarded.h"
-#include "platform/File.h"
-#include "platform/LastError.h"
-#include "platform/MemoryRead.h"
 
 namespace tessel {
 namespace {

@@ -1,13 +1,11 @@
+#include "platform/FileSystem.h"
+#include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/FileLoc.h>
 
 #include <cstring>
 #include <memory>
 #include <new>
 #include <string>
-
-#include <tessel/base/OVExcept.h>
-
-#include "platform/FileSystem.h"
 
 namespace tessel {
 namespace {

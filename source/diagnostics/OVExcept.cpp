@@ -1,17 +1,15 @@
 // Here rather than in base, because an exception records its call stack.
+#include "diagnostics/CallStackWalk.h"
+#include "diagnostics/Guarded.h"
 #include <tessel/base/OVExcept.h>
+#include <tessel/diagnostics/DebugStream.h>
 
 #include <algorithm>
 #include <cstdio>
 #include <cstring>
+#include <cxxabi.h>
 #include <new>
 #include <typeinfo>
-
-#include <cxxabi.h>
-#include <tessel/diagnostics/DebugStream.h>
-
-#include "diagnostics/CallStackWalk.h"
-#include "diagnostics/Guarded.h"
 
 namespace tessel {
 namespace {

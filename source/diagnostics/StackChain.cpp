@@ -1,12 +1,11 @@
+#include "diagnostics/CallStackWalk.h"
+#include "platform/Module.h"
+#include "platform/Thread.h"
 #include <tessel/diagnostics/StackChain.h>
 
 #include <algorithm>
 #include <cstdio>
 #include <exception>
-
-#include "diagnostics/CallStackWalk.h"
-#include "platform/Module.h"
-#include "platform/Thread.h"
 
 namespace tessel {
 namespace {

@@ -4,9 +4,9 @@
 #ifndef TESSEL_SOURCE_DIAGNOSTICS_TRACKERHEAP_H
 #define TESSEL_SOURCE_DIAGNOSTICS_TRACKERHEAP_H
 
-#include <cstddef>
-
 #include "platform/Mutex.h"
+
+#include <cstddef>
 
 namespace tessel {
 

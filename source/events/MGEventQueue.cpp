@@ -1,3 +1,5 @@
+#include "diagnostics/Guarded.h"
+#include "events/MGEventQueueImpl.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/events/MGEventQueue.h>
 #include <tessel/time/Millisecs.h>
@@ -6,9 +8,6 @@
 #include <iterator>
 #include <new>
 #include <utility>
-
-#include "diagnostics/Guarded.h"
-#include "events/MGEventQueueImpl.h"
 
 namespace tessel {
 

@@ -1,9 +1,8 @@
-#include <tessel/events/OccurrenceManager.h>
-#include <tessel/time/Millisecs.h>
-
 #include "events/OccurrenceThread.h"
 #include "events/Occurrences.h"
 #include "events/ThreadGroups.h"
+#include <tessel/events/OccurrenceManager.h>
+#include <tessel/time/Millisecs.h>
 
 namespace tessel {
 

@@ -1,13 +1,11 @@
-#include <tessel/events/OccurrenceManager.h>
-
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/memory/MemoryManager.h>
-
 #include "events/AsyncArea.h"
 #include "events/OccurrenceThread.h"
 #include "events/Occurrences.h"
 #include "events/Service.h"
 #include "events/ThreadGroups.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/events/OccurrenceManager.h>
+#include <tessel/memory/MemoryManager.h>
 
 namespace tessel {
 

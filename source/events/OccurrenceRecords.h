@@ -3,9 +3,8 @@
 #ifndef TESSEL_SOURCE_EVENTS_OCCURRENCERECORDS_H
 #define TESSEL_SOURCE_EVENTS_OCCURRENCERECORDS_H
 
-#include <tessel/events/OccurrenceManager.h>
-
 #include "events/TimeList.h"
+#include <tessel/events/OccurrenceManager.h>
 
 namespace tessel {
 

@@ -1,16 +1,15 @@
 #include "events/OccurrenceThread.h"
 
+#include "events/Occurrences.h"
+#include "events/ThTmoEvent.h"
+#include "events/ThreadGroups.h"
+#include "platform/Thread.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/sync/ThSleep.h>
 #include <tessel/threads/ThThread.h>
 #include <tessel/time/Millisecs.h>
 
 #include <atomic>
-
-#include "events/Occurrences.h"
-#include "events/ThTmoEvent.h"
-#include "events/ThreadGroups.h"
-#include "platform/Thread.h"
 
 namespace tessel {
 

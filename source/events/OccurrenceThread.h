@@ -2,10 +2,9 @@
 #ifndef TESSEL_SOURCE_EVENTS_OCCURRENCETHREAD_H
 #define TESSEL_SOURCE_EVENTS_OCCURRENCETHREAD_H
 
-#include <tessel/base/MgErr.h>
-
 #include "events/OccurrenceLocks.h"
 #include "events/OccurrenceRecords.h"
+#include <tessel/base/MgErr.h>
 
 namespace tessel {
 

@@ -2,15 +2,14 @@
 #ifndef TESSEL_SOURCE_EVENTS_OCCURRENCES_H
 #define TESSEL_SOURCE_EVENTS_OCCURRENCES_H
 
+#include "diagnostics/Guarded.h"
+#include "events/OccurrenceLocks.h"
+#include "events/OccurrenceRecords.h"
 #include <tessel/events/OccurrenceManager.h>
 #include <tessel/memory/CookieManager.h>
 #include <tessel/memory/MemoryManager.h>
 
 #include <new>
-
-#include "diagnostics/Guarded.h"
-#include "events/OccurrenceLocks.h"
-#include "events/OccurrenceRecords.h"
 
 namespace tessel {
 

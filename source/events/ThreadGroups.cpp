@@ -1,10 +1,10 @@
 #include "events/ThreadGroups.h"
 
-#include <atomic>
-
 #include "events/AsyncArea.h"
 #include "events/Occurrences.h"
 #include "threads/ThreadTable.h"
+
+#include <atomic>
 
 namespace tessel {
 

@@ -2,10 +2,9 @@
 #ifndef TESSEL_SOURCE_EVENTS_THREADGROUPS_H
 #define TESSEL_SOURCE_EVENTS_THREADGROUPS_H
 
-#include <tessel/events/OccurrenceManager.h>
-
 #include "events/OccurrenceLocks.h"
 #include "events/OccurrenceRecords.h"
+#include <tessel/events/OccurrenceManager.h>
 
 namespace tessel {
 

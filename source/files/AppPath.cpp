@@ -1,16 +1,14 @@
-#include <tessel/files/AppPath.h>
-
+#include "diagnostics/Guarded.h"
+#include "files/FileSupport.h"
 #include <tessel/base/MGAppInterface.h>
 #include <tessel/base/MGModule.h>
 #include <tessel/diagnostics/DebugStream.h>
+#include <tessel/files/AppPath.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/paths/PathRef.h>
 
 #include <mutex>
 #include <string>
-
-#include "diagnostics/Guarded.h"
-#include "files/FileSupport.h"
 
 namespace tessel {
 

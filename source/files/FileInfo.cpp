@@ -1,4 +1,10 @@
 // What is known about a file or folder, and changing it.
+#include "diagnostics/Guarded.h"
+#include "files/FileSupport.h"
+#include "platform/CodePage.h"
+#include "platform/DriveTable.h"
+#include "platform/FileSystem.h"
+#include "platform/LastError.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/memory/MemoryManager.h>
@@ -8,13 +14,6 @@
 #include <algorithm>
 #include <limits>
 #include <string>
-
-#include "diagnostics/Guarded.h"
-#include "files/FileSupport.h"
-#include "platform/CodePage.h"
-#include "platform/DriveTable.h"
-#include "platform/FileSystem.h"
-#include "platform/LastError.h"
 
 namespace tessel {
 

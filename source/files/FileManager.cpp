@@ -1,4 +1,10 @@
 // Open files: access, reading and writing, position and size, and the service.
+#include "diagnostics/Guarded.h"
+#include "files/FileSupport.h"
+#include "files/Service.h"
+#include "platform/Clock.h"
+#include "platform/LastError.h"
+#include "strings/FmtEngine.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/memory/MemoryManager.h>
@@ -8,13 +14,6 @@
 #include <tessel/sync/ThMutex.h>
 
 #include <cstring>
-
-#include "diagnostics/Guarded.h"
-#include "files/FileSupport.h"
-#include "files/Service.h"
-#include "platform/Clock.h"
-#include "platform/LastError.h"
-#include "strings/FmtEngine.h"
 
 namespace tessel {
 

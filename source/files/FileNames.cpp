@@ -1,4 +1,8 @@
 // Names and locations: resolved and long names, well-known folders, extensions, names of the host system.
+#include "diagnostics/Guarded.h"
+#include "files/FileSupport.h"
+#include "platform/DriveTable.h"
+#include "platform/FileSystem.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/AppPath.h>
 #include <tessel/files/FileManager.h>
@@ -11,11 +15,6 @@
 #include <algorithm>
 #include <cstring>
 #include <string>
-
-#include "diagnostics/Guarded.h"
-#include "files/FileSupport.h"
-#include "platform/DriveTable.h"
-#include "platform/FileSystem.h"
 
 namespace tessel {
 

@@ -1,15 +1,14 @@
 // Files and folders as whole objects: creating, copying, moving, removing.
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/files/FileManager.h>
-#include <tessel/paths/PathManager.h>
-#include <tessel/paths/PathRef.h>
-#include <tessel/paths/PathTextFormat.h>
-
 #include "diagnostics/Guarded.h"
 #include "files/FileSupport.h"
 #include "platform/FileSystem.h"
 #include "platform/LastError.h"
 #include "platform/Shell.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/files/FileManager.h>
+#include <tessel/paths/PathManager.h>
+#include <tessel/paths/PathRef.h>
+#include <tessel/paths/PathTextFormat.h>
 
 namespace tessel {
 

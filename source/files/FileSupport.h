@@ -2,13 +2,12 @@
 #ifndef TESSEL_SOURCE_FILES_FILESUPPORT_H
 #define TESSEL_SOURCE_FILES_FILESUPPORT_H
 
+#include "platform/File.h"
 #include <tessel/base/MgErr.h>
 #include <tessel/base/StringTypes.h>
 
 #include <functional>
 #include <string>
-
-#include "platform/File.h"
 
 namespace tessel {
 

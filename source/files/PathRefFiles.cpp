@@ -1,4 +1,8 @@
 // The members of PathRef that ask the disk.
+#include "files/FileSupport.h"
+#include "paths/PathRefAccess.h"
+#include "platform/FileSystem.h"
+#include "platform/System.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/CachedPathFlavor.h>
@@ -10,11 +14,6 @@
 
 #include <memory>
 #include <vector>
-
-#include "files/FileSupport.h"
-#include "paths/PathRefAccess.h"
-#include "platform/FileSystem.h"
-#include "platform/System.h"
 
 namespace tessel {
 

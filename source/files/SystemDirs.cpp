@@ -1,15 +1,13 @@
-#include <tessel/files/SystemDirs.h>
-
-#include <tessel/base/OVExcept.h>
-#include <tessel/files/FileManager.h>
-
-#include <cstdio>
-#include <string>
-
 #include "files/FileSupport.h"
 #include "platform/FileSystem.h"
 #include "platform/LastError.h"
 #include "platform/Shell.h"
+#include <tessel/base/OVExcept.h>
+#include <tessel/files/FileManager.h>
+#include <tessel/files/SystemDirs.h>
+
+#include <cstdio>
+#include <string>
 
 namespace tessel {
 
@@ -18,10 +16,12 @@ namespace {
 using platform::ShellFolder;
 
 constexpr ShellFolder kShellFolders[] = {
-    ShellFolder::kProfile,         ShellFolder::kDesktop,       ShellFolder::kDocuments,
-    ShellFolder::kLocalAppData,    ShellFolder::kLocalAppData,  ShellFolder::kProfile /* not asked: temporary */,
-    ShellFolder::kCommonDocuments, ShellFolder::kCommonAppData, ShellFolder::kCommonAppData,
-    ShellFolder::kSystem,          ShellFolder::kSystem,        ShellFolder::kProgramFiles,
+    ShellFolder::kProfile,         ShellFolder::kDesktop,
+    ShellFolder::kDocuments,       ShellFolder::kLocalAppData,
+    ShellFolder::kLocalAppData,    ShellFolder::kProfile,  // the last is not asked: temporary
+    ShellFolder::kCommonDocuments, ShellFolder::kCommonAppData,
+    ShellFolder::kCommonAppData,   ShellFolder::kSystem,
+    ShellFolder::kSystem,          ShellFolder::kProgramFiles,
     ShellFolder::kWindows,         ShellFolder::kCommonAppData};
 
 [[noreturn]] void ThrowSystemCall(const char* call) {

@@ -1,4 +1,8 @@
 // Volumes: which there are, and how much they hold.
+#include "diagnostics/Guarded.h"
+#include "files/FileSupport.h"
+#include "platform/DriveTable.h"
+#include "platform/FileSystem.h"
 #include <tessel/files/FileManager.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/memory/TrackedMallocFree.h>
@@ -13,11 +17,6 @@
 #include <limits>
 #include <string>
 #include <vector>
-
-#include "diagnostics/Guarded.h"
-#include "files/FileSupport.h"
-#include "platform/DriveTable.h"
-#include "platform/FileSystem.h"
 
 namespace tessel {
 

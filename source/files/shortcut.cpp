@@ -1,15 +1,14 @@
 // Following shortcuts in the name of a file.
-#include <tessel/files/shortcut.h>
-
-#include <cstring>
-#include <string>
-
 #include "diagnostics/Guarded.h"
 #include "files/FileSupport.h"
 #include "paths/ShortcutResolver.h"
 #include "platform/CodePage.h"
 #include "platform/FileSystem.h"
 #include "platform/Shell.h"
+#include <tessel/files/shortcut.h>
+
+#include <cstring>
+#include <string>
 
 namespace tessel {
 

@@ -1,14 +1,13 @@
 #include "frame/Environment.h"
 
-#include <algorithm>
-#include <string_view>
-#include <vector>
-
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "diagnostics/Guarded.h"
 #include "platform/CodePage.h"
 #include "platform/Process.h"
+#include <tessel/diagnostics/DebugStream.h>
+
+#include <algorithm>
+#include <string_view>
+#include <vector>
 
 namespace tessel {
 namespace {

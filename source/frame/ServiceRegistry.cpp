@@ -1,13 +1,12 @@
 #include "frame/ServiceRegistry.h"
 
-#include <algorithm>
-#include <cstdio>
-#include <set>
-
+#include "diagnostics/Guarded.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/time/Millisecs.h>
 
-#include "diagnostics/Guarded.h"
+#include <algorithm>
+#include <cstdio>
+#include <set>
 
 namespace tessel {
 namespace {

@@ -1,12 +1,11 @@
+#include "frame/CoreServices.h"
+#include "frame/Environment.h"
+#include "frame/ServiceRegistry.h"
 #include <tessel/frame/TesselInit.h>
 
 #include <algorithm>
 #include <iterator>
 #include <utility>
-
-#include "frame/CoreServices.h"
-#include "frame/Environment.h"
-#include "frame/ServiceRegistry.h"
 
 namespace tessel {
 namespace {

@@ -1,17 +1,15 @@
-#include <tessel/memory/CookieManager.h>
-
-#include <algorithm>
-#include <atomic>
-#include <cstring>
-#include <new>
-
+#include "memory/PouchTree.h"
 #include <tessel/diagnostics/DebugStream.h>
+#include <tessel/memory/CookieManager.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/memory/MemoryUtil.h>
 #include <tessel/sync/ThMutex.h>
 #include <tessel/time/Millisecs.h>
 
-#include "memory/PouchTree.h"
+#include <algorithm>
+#include <atomic>
+#include <cstring>
+#include <new>
 
 namespace tessel {
 namespace {
@@ -91,8 +89,7 @@ void LoadInfo(const JarRecord& record, CookieEntry* entry, void* infoOut) {
     }
 }
 
-// ---- making and ending cookies, under the mutex
-// -------------------------------------------------------------------------
+// ---- making and ending cookies, under the mutex ---------------------------------------------------------------------
 
 uint32 NextGeneration(JarRecord& record) {
     uint32 generation = record.serial++;
@@ -162,8 +159,7 @@ void EndCookie(JarRecord& record, CookieEntry* entry, uint32 index) {
     entry->SetRights(0);
 }
 
-// ---- making and ending jars
-// -------------------------------------------------------------------------------------------
+// ---- making and ending jars -----------------------------------------------------------------------------------------
 
 // False leaves a half-made jar.
 bool FillJar(MagicCookieJar jar, uint32 infoSize, int32 rightsMode) {
@@ -200,8 +196,7 @@ void ReportDisposal(MagicCookieJar jar) {
         << "; nTreeNodes=" << tree.arrays << "; nPouches=" << tree.pouches << "; size=" << size << "; total=" << total;
 }
 
-// ---- rights
-// -----------------------------------------------------------------------------------------------------------
+// ---- rights ---------------------------------------------------------------------------------------------------------
 
 // Changes the positive rights count of the cookie with that generation by `change`, and returns what it was; 0 when
 // there is no such cookie any more, its count is not positive or it can take no more.
@@ -407,8 +402,7 @@ MagicCookie MCGetCookieForInfo(MagicCookieJar jar, const void* info) {
     return cookie;
 }
 
-// ---- the classes
-// ------------------------------------------------------------------------------------------------------
+// ---- the classes ----------------------------------------------------------------------------------------------------
 
 namespace tessel {
 

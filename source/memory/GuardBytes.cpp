@@ -1,11 +1,10 @@
 #include "memory/GuardBytes.h"
 
-#include <cstring>
-
+#include "memory/HandleBlock.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
 
-#include "memory/HandleBlock.h"
+#include <cstring>
 
 namespace tessel {
 

@@ -2,9 +2,9 @@
 #ifndef TESSEL_SOURCE_MEMORY_GUARDBYTES_H
 #define TESSEL_SOURCE_MEMORY_GUARDBYTES_H
 
-#include <atomic>
-
 #include <tessel/base/Types.h>
+
+#include <atomic>
 
 namespace tessel {
 

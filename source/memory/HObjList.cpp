@@ -1,10 +1,9 @@
+#include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/HObjList.h>
+#include <tessel/memory/MemoryManager.h>
 
 #include <algorithm>
 #include <cstring>
-
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/memory/MemoryManager.h>
 
 namespace {
 

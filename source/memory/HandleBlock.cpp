@@ -1,9 +1,9 @@
 #include "memory/HandleBlock.h"
 
+#include "memory/Heap.h"
+
 #include <algorithm>
 #include <bit>
-
-#include "memory/Heap.h"
 
 namespace tessel {
 namespace {

@@ -8,9 +8,8 @@
 #ifndef TESSEL_SOURCE_MEMORY_HANDLEBLOCK_H
 #define TESSEL_SOURCE_MEMORY_HANDLEBLOCK_H
 
-#include <tessel/base/Types.h>
-
 #include "memory/GuardBytes.h"
+#include <tessel/base/Types.h>
 
 namespace tessel {
 
@@ -111,8 +110,7 @@ private:
     uint32 room_;
 };
 
-// ---- pointer blocks without their tracking
-// ------------------------------------------------------------------------------
+// ---- pointer blocks without their tracking --------------------------------------------------------------------------
 
 // A plain block with guards as the kind's option word says; null when there is no memory.
 UPtr NewGuardedBlock(size_t size, GuardKind kind);

@@ -1,10 +1,9 @@
 // Copying and appending, and the other operations that are made of the basic ones.
-#include <cstring>
-#include <utility>
-
+#include "memory/Handles.h"
 #include <tessel/diagnostics/DebugStream.h>
 
-#include "memory/Handles.h"
+#include <cstring>
+#include <utility>
 
 using namespace tessel;
 

@@ -2,11 +2,10 @@
 #ifndef TESSEL_SOURCE_MEMORY_HANDLES_H
 #define TESSEL_SOURCE_MEMORY_HANDLES_H
 
-#include <tessel/memory/MemoryManager.h>
-
 #include "memory/GuardBytes.h"
 #include "memory/MasterPointers.h"
 #include "memory/MemorySettings.h"
+#include <tessel/memory/MemoryManager.h>
 
 namespace tessel {
 

@@ -1,12 +1,11 @@
 #include "memory/Heap.h"
 
-#include <cstring>
-
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "memory/MemorySettings.h"
 #include "platform/Mutex.h"
 #include "platform/Process.h"
+#include <tessel/diagnostics/DebugStream.h>
+
+#include <cstring>
 
 namespace tessel::heap {
 namespace {

@@ -6,13 +6,12 @@
 #ifndef TESSEL_SOURCE_MEMORY_HEAP_H
 #define TESSEL_SOURCE_MEMORY_HEAP_H
 
-#include <atomic>
-#include <cstdlib>
-
-#include <tessel/base/Types.h>
-
 #include "memory/ThreadMemory.h"
 #include "platform/Allocator.h"
+#include <tessel/base/Types.h>
+
+#include <atomic>
+#include <cstdlib>
 
 namespace tessel::heap {
 
@@ -23,15 +22,13 @@ using ErrorCallback = void (*)(Error error, const void* block);  // block may be
 ErrorCallback SetErrorCallback(ErrorCallback callback);
 void CallErrorCallback(Error error, const void* block);
 
-// ---- plain blocks: aligned for any plain type; null when there is no memory
-// --------------------------------------------
+// ---- plain blocks: aligned for any plain type; null when there is no memory -----------------------------------------
 
 void* Allocate(size_t size);
 // False when the block is damaged or none: the error callback has been called, and nothing is freed.
 bool Free(void* block);
 
-// ---- handle blocks: the caller keeps their size
-// ----------------------------------------------------------------------
+// ---- handle blocks: the caller keeps their size ---------------------------------------------------------------------
 
 // Asked before every allocation; the answer false makes it fail. Null, as it starts: all may succeed. For tests.
 using AllocationFilter = bool (*)(size_t size);
@@ -70,8 +67,7 @@ inline void* ResizeHandleBlock(ThreadMemory* mine, void* block, size_t oldSize, 
     return resized;
 }
 
-// ---- all blocks
-// --------------------------------------------------------------------------------------------------------
+// ---- all blocks -----------------------------------------------------------------------------------------------------
 
 // Sees a block; false ends the walk.
 using Visitor = bool (*)(void* context, const void* block, size_t size);

@@ -1,13 +1,12 @@
 #include "memory/MasterPointers.h"
 
-#include <cstdlib>
-#include <utility>
-
+#include "memory/HandleBlock.h"
+#include "memory/Heap.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
 
-#include "memory/HandleBlock.h"
-#include "memory/Heap.h"
+#include <cstdlib>
+#include <utility>
 
 namespace tessel {
 

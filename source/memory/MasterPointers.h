@@ -5,13 +5,12 @@
 #ifndef TESSEL_SOURCE_MEMORY_MASTERPOINTERS_H
 #define TESSEL_SOURCE_MEMORY_MASTERPOINTERS_H
 
-#include <atomic>
-
+#include "memory/ThreadMemory.h"
 #include <tessel/base/MgErr.h>
 #include <tessel/base/Types.h>
 #include <tessel/sync/ThMutex.h>
 
-#include "memory/ThreadMemory.h"
+#include <atomic>
 
 namespace tessel {
 

@@ -1,12 +1,11 @@
 // Checks and statistics.
+#include "memory/Handles.h"
+#include "memory/Heap.h"
+#include <tessel/diagnostics/DebugStream.h>
+
 #include <algorithm>
 #include <atomic>
 #include <mutex>
-
-#include <tessel/diagnostics/DebugStream.h>
-
-#include "memory/Handles.h"
-#include "memory/Heap.h"
 
 namespace tessel {
 namespace {

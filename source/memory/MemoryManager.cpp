@@ -1,14 +1,12 @@
-#include <tessel/memory/MemoryManager.h>
-
-#include <algorithm>
-#include <cstring>
-
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "memory/HandleBlock.h"
 #include "memory/Handles.h"
 #include "memory/Heap.h"
 #include "memory/Trackers.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/memory/MemoryManager.h>
+
+#include <algorithm>
+#include <cstring>
 
 #define TESSEL_ALWAYS_INLINE inline __attribute__((always_inline))
 #define TESSEL_NOT_INLINE __attribute__((noinline))

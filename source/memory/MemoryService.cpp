@@ -1,14 +1,13 @@
 // Start and stop of the memory manager.
-#include <atomic>
-
-#include <tessel/base/MGPlacementNew.h>
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "memory/HandleBlock.h"
 #include "memory/Handles.h"
 #include "memory/Heap.h"
 #include "memory/Service.h"
 #include "memory/Trackers.h"
+#include <tessel/base/MGPlacementNew.h>
+#include <tessel/diagnostics/DebugStream.h>
+
+#include <atomic>
 
 namespace tessel {
 namespace {

@@ -1,14 +1,13 @@
 #include "memory/MemorySettings.h"
 
-#include <algorithm>
-#include <cstring>
-#include <mutex>
-
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "memory/GuardBytes.h"
 #include "memory/Heap.h"
 #include "platform/Process.h"
+#include <tessel/diagnostics/DebugStream.h>
+
+#include <algorithm>
+#include <cstring>
+#include <mutex>
 
 namespace tessel {
 

@@ -2,9 +2,9 @@
 #ifndef TESSEL_SOURCE_MEMORY_MEMORYSETTINGS_H
 #define TESSEL_SOURCE_MEMORY_MEMORYSETTINGS_H
 
-#include <atomic>
-
 #include <tessel/memory/MemoryManager.h>
+
+#include <atomic>
 
 namespace tessel {
 

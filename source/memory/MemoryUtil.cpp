@@ -1,10 +1,9 @@
+#include <tessel/memory/MemoryManager.h>
 #include <tessel/memory/MemoryUtil.h>
 
 #include <algorithm>
 #include <atomic>
 #include <cstring>
-
-#include <tessel/memory/MemoryManager.h>
 
 namespace {
 

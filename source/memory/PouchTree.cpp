@@ -1,11 +1,11 @@
 #include "memory/PouchTree.h"
 
+#include <tessel/memory/MemoryManager.h>
+
 #include <algorithm>
 #include <cstddef>
 #include <new>
 #include <utility>
-
-#include <tessel/memory/MemoryManager.h>
 
 namespace tessel {
 

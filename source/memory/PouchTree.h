@@ -10,11 +10,10 @@
 #ifndef TESSEL_SOURCE_MEMORY_POUCHTREE_H
 #define TESSEL_SOURCE_MEMORY_POUCHTREE_H
 
+#include <tessel/base/Types.h>
 #include <tessel/memory/TrackedMallocFree.h>
 
 #include <atomic>
-
-#include <tessel/base/Types.h>
 
 namespace tessel {
 

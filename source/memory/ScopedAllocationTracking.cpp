@@ -1,17 +1,15 @@
-#include <tessel/memory/ScopedAllocationTracking.h>
-
-#include <map>
-#include <new>
-#include <utility>
-
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/diagnostics/StackChain.h>
-#include <tessel/sync/ThMutex.h>
-
 #include "diagnostics/CallStackWalk.h"
 #include "diagnostics/Guarded.h"
 #include "memory/MemorySettings.h"
 #include "memory/Trackers.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/diagnostics/StackChain.h>
+#include <tessel/memory/ScopedAllocationTracking.h>
+#include <tessel/sync/ThMutex.h>
+
+#include <map>
+#include <new>
+#include <utility>
 
 namespace tessel {
 namespace {

@@ -1,12 +1,12 @@
 #include "memory/ThreadMemory.h"
 
-#include <cstdlib>
-#include <new>
-
 #include "memory/MasterPointers.h"
 #include "platform/Mutex.h"
 #include "platform/Thread.h"
 #include "platform/ThreadFence.h"
+
+#include <cstdlib>
+#include <new>
 
 namespace tessel {
 namespace {

@@ -3,9 +3,9 @@
 #ifndef TESSEL_SOURCE_MEMORY_THREADMEMORY_H
 #define TESSEL_SOURCE_MEMORY_THREADMEMORY_H
 
-#include <atomic>
-
 #include <tessel/base/Types.h>
+
+#include <atomic>
 
 namespace tessel {
 

@@ -1,13 +1,11 @@
+#include "memory/HandleBlock.h"
+#include "memory/MemorySettings.h"
+#include "memory/Service.h"
+#include <tessel/diagnostics/DumpLeakInfo.h>
 #include <tessel/memory/TrackedMallocFree.h>
 
 #include <algorithm>
 #include <atomic>
-
-#include <tessel/diagnostics/DumpLeakInfo.h>
-
-#include "memory/HandleBlock.h"
-#include "memory/MemorySettings.h"
-#include "memory/Service.h"
 
 namespace tessel {
 namespace {

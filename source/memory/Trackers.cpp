@@ -1,13 +1,13 @@
 #include "memory/Trackers.h"
 
-#include <atomic>
-
 #include "diagnostics/AllocTracking.h"
 #include "diagnostics/NumberText.h"
 #include "memory/HandleBlock.h"
 #include "memory/MasterPointers.h"
 #include "memory/MemorySettings.h"
 #include "platform/MemoryRead.h"
+
+#include <atomic>
 
 namespace tessel {
 namespace {

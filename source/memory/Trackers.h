@@ -3,7 +3,6 @@
 #define TESSEL_SOURCE_MEMORY_TRACKERS_H
 
 #include <tessel/diagnostics/DumpLeakInfo.h>
-
 #include <tessel/memory/MemoryManager.h>
 
 namespace tessel {
@@ -25,8 +24,7 @@ public:
     void DumpItemContents(const void* handle, uint32 size) override;
 };
 
-// ---- scoped tracking (ScopedAllocationTracking.cpp)
-// ---------------------------------------------------------------------
+// ---- scoped tracking (ScopedAllocationTracking.cpp) -----------------------------------------------------------------
 
 void StartScopedTracker();  // makes the record; tracking is not on
 void StopScopedTracker();

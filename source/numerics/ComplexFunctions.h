@@ -1,16 +1,16 @@
-/* The complex functions of the math family. W is double or the extended real; the members for singles and doubles
-   compute in the next wider one, which has room for the intermediate values and rounds the result once. */
+// The complex functions of the math family. W is double or the extended real; the members for singles and doubles
+// compute in the next wider one, which has room for the intermediate values and rounds the result once.
 #pragma once
+
+#include "numerics/RealFunctions.h"
+#include "numerics/Turns.h"
+#include "numerics/TwoParts.h"
 
 #include <algorithm>
 #include <cmath>
 #include <complex>
 #include <limits>
 #include <type_traits>
-
-#include "numerics/RealFunctions.h"
-#include "numerics/Turns.h"
-#include "numerics/TwoParts.h"
 
 namespace tessel::cmplx {
 
@@ -32,7 +32,7 @@ bool IsZero(const Complex<W>& z) {
     return z.real() == 0 && z.imag() == 0;
 }
 
-/* Constants in two parts, for arguments that must not lose their last bits. */
+// Constants in two parts, for arguments that must not lose their last bits.
 template <class W>
 constexpr TwoParts<W> kLn10 = {0x935D8DDDAAA8AC17p-62L, -0xAD494EA3E967AEB9p-129L};
 template <>
@@ -50,9 +50,9 @@ constexpr W kLog2E = static_cast<W>(0xB8AA3B295C17F0BCp-63L);
 template <class W>
 constexpr W kHalfPi = static_cast<W>(0xC90FDAA22168C235p-63L);
 
-// ---- exact steps ---------------------------------------------------------------------------------------------------
+// ---- exact steps ----------------------------------------------------------------------------------------------------
 
-/* ab - cd, keeping what cancellation would lose. */
+// ab - cd, keeping what cancellation would lose.
 template <class W>
 W DifferenceOfProducts(W a, W b, W c, W d) {
     constexpr W kCancelled = 4;
@@ -64,9 +64,9 @@ W DifferenceOfProducts(W a, W b, W c, W d) {
     return std::isfinite(rest) ? difference + rest : difference;
 }
 
-// ---- arithmetic ----------------------------------------------------------------------------------------------------
+// ---- arithmetic -----------------------------------------------------------------------------------------------------
 
-/* (ac - bd) + (ad + bc) i */
+// (ac - bd) + (ad + bc) i
 template <class W>
 Complex<W> Multiply(const Complex<W>& x, const Complex<W>& y) {
     const W a = x.real();
@@ -82,7 +82,7 @@ Complex<W> ScaleByPowerOf2(const Complex<W>& z, int power) {
     return {std::scalbn(z.real(), power), std::scalbn(z.imag(), power)};
 }
 
-/* ((ac + bd) + (bc - ad) i) / (cc + dd) */
+// ((ac + bd) + (bc - ad) i) / (cc + dd)
 template <class W>
 Complex<W> TextbookQuotient(const Complex<W>& x, const Complex<W>& y) {
     const W a = x.real();
@@ -105,7 +105,7 @@ constexpr W PowerOf2(int exponent) {
     return power;
 }
 
-/* ab - cd as a value times 2^exponent, so that no product of finite factors leaves the range. */
+// ab - cd as a value times 2^exponent, so that no product of finite factors leaves the range.
 template <class W>
 W ScaledDifferenceOfProducts(W a, W b, W c, W d, int& exponent) {
     const bool onlySecond = a == 0 || b == 0;
@@ -122,7 +122,7 @@ W ScaledDifferenceOfProducts(W a, W b, W c, W d, int& exponent) {
                                 std::scalbn(c, std::min(second - exponent, 0)), d);
 }
 
-/* The textbook quotient of any finite operands, y not being 0. */
+// The textbook quotient of any finite operands, y not being 0.
 template <class W>
 Complex<W> ScaledQuotient(const Complex<W>& x, const Complex<W>& y) {
     const int power = Exponent(y);
@@ -136,7 +136,7 @@ Complex<W> ScaledQuotient(const Complex<W>& x, const Complex<W>& y) {
     return {part(x.real(), y.real(), -x.imag(), y.imag()), part(x.imag(), y.real(), x.real(), y.imag())};
 }
 
-/* The textbook quotient; finite operands are scaled where squares or products would leave the range. */
+// The textbook quotient; finite operands are scaled where squares or products would leave the range.
 template <class W>
 Complex<W> Divide(const Complex<W>& x, const Complex<W>& y) {
     if (!IsFinite(x) || !IsFinite(y) || IsZero(x) || IsZero(y)) return TextbookQuotient(x, y);
@@ -150,7 +150,7 @@ Complex<W> Divide(const Complex<W>& x, const Complex<W>& y) {
     return safe ? TextbookQuotient(x, y) : ScaledQuotient(x, y);
 }
 
-/* 1 / z: infinite for a zero, zero for an infinity. */
+// 1 / z: infinite for a zero, zero for an infinity.
 template <class W>
 Complex<W> Recip(const Complex<W>& z) {
     if (IsZero(z)) return {std::copysign(real::kInfinity<W>, z.real()), -z.imag()};
@@ -160,7 +160,7 @@ Complex<W> Recip(const Complex<W>& z) {
     return Divide(Complex<W>(1), z);
 }
 
-/* z brought to magnitude 1; an infinite part outweighs a finite one. */
+// z brought to magnitude 1; an infinite part outweighs a finite one.
 template <class W>
 Complex<W> Sign(const Complex<W>& z) {
     if (IsNaN(z) || IsZero(z)) return z;
@@ -173,7 +173,7 @@ Complex<W> Sign(const Complex<W>& z) {
     return {scaled.real() / magnitude, scaled.imag() / magnitude};
 }
 
-// ---- forms ---------------------------------------------------------------------------------------------------------
+// ---- forms ----------------------------------------------------------------------------------------------------------
 
 template <class W>
 W Magnitude(const Complex<W>& z) {
@@ -190,7 +190,7 @@ Complex<W> ToPolar(const Complex<W>& z) {
     return IsZero(z) ? z : Complex<W>(Magnitude(z), Angle(z));
 }
 
-/* Of magnitude and angle. */
+// Of magnitude and angle.
 template <class W>
 Complex<W> ToRectangular(const Complex<W>& polar) {
     const W magnitude = polar.real();
@@ -199,7 +199,7 @@ Complex<W> ToRectangular(const Complex<W>& polar) {
     return {magnitude * std::cos(angle), magnitude * std::sin(angle)};
 }
 
-// ---- logarithms ----------------------------------------------------------------------------------------------------
+// ---- logarithms -----------------------------------------------------------------------------------------------------
 
 template <class W>
 Complex<W> Logn(const Complex<W>& z) {
@@ -218,8 +218,8 @@ Complex<W> Log2(const Complex<W>& z) {
     return {log.real() * kLog2E<W>, log.imag() * kLog2E<W>};
 }
 
-/* ln z / ln base; two real logarithms give the real quotient, and one infinite logarithm an infinite or zero result in
-   the direction of the quotient. */
+// ln z / ln base; two real logarithms give the real quotient, and one infinite logarithm an infinite or zero result in
+// the direction of the quotient.
 template <class W>
 Complex<W> Logx(const Complex<W>& base, const Complex<W>& z) {
     const auto log = [](const Complex<W>& x) { return IsZero(x) ? Complex<W>(-real::kInfinity<W>) : std::log(x); };
@@ -237,7 +237,7 @@ Complex<W> Logx(const Complex<W>& base, const Complex<W>& z) {
     return {part(quotient.real()), part(quotient.imag())};
 }
 
-/* |1 + z|^2 - 1 = 2x + x^2 + y^2, without losing bits where the terms cancel. */
+// |1 + z|^2 - 1 = 2x + x^2 + y^2, without losing bits where the terms cancel.
 template <class W>
 W SquareOfOnePlusLessOne(W x, W y) {
     const TwoParts<W> xx = ExactProduct(x, x);
@@ -247,7 +247,7 @@ W SquareOfOnePlusLessOne(W x, W y) {
     return second.high + (first.low + second.low + xx.low + yy.low);
 }
 
-/* ln(1 + z), by |1 + z|^2 where that is not near 0 nor large. */
+// ln(1 + z), by |1 + z|^2 where that is not near 0 nor large.
 template <class W>
 Complex<W> Lognp1(const Complex<W>& z) {
     constexpr W kNear = 2;
@@ -260,10 +260,10 @@ Complex<W> Lognp1(const Complex<W>& z) {
     return std::log(Complex<W>(1 + x, y));
 }
 
-// ---- powers --------------------------------------------------------------------------------------------------------
+// ---- powers ---------------------------------------------------------------------------------------------------------
 
-/* power(x) times (a + bi), where power is an exponential function and |a|, |b| at most 1: a part may be in range though
-   the power itself is not. */
+// power(x) times (a + bi), where power is an exponential function and |a|, |b| at most 1: a part may be in range though
+// the power itself is not.
 template <class W, class Power>
 Complex<W> ScaledByPower(Power power, W x, W a, W b) {
     const W whole = power(x);
@@ -272,7 +272,7 @@ Complex<W> ScaledByPower(Power power, W x, W a, W b) {
     return {half * a * half, half * b * half};
 }
 
-/* e^z - 1 = (e^x - 1) cos y - 2 sin^2(y/2) + i e^x sin y */
+// e^z - 1 = (e^x - 1) cos y - 2 sin^2(y/2) + i e^x sin y
 template <class W>
 Complex<W> Expm1(const Complex<W>& z) {
     const W x = z.real();
@@ -287,7 +287,7 @@ Complex<W> Expm1(const Complex<W>& z) {
     return {std::expm1(x) * std::cos(y) - 2 * halfSine * halfSine, exp * std::sin(y)};
 }
 
-/* An angle as cosine and sine. */
+// An angle as cosine and sine.
 template <class W>
 Complex<W> Turned(const ReducedAngle& angle) {
     const W cosine = std::cos(static_cast<W>(angle.rest));
@@ -304,7 +304,7 @@ Complex<W> Turned(const ReducedAngle& angle) {
     }
 }
 
-/* b^iy as cosine and sine of the angle y ln b. */
+// b^iy as cosine and sine of the angle y ln b.
 template <class W>
 Complex<W> Turn(W y, const TwoParts<W>& lnBase, ReducedAngle (*reduce)(Extended)) {
     constexpr W kLarge = 256;  // up to here two parts of the angle are enough
@@ -334,7 +334,7 @@ Complex<W> Pow2(const Complex<W>& z) {
     return ScaledByPower(power, z.real(), turn.real(), turn.imag());
 }
 
-/* z to a whole power by repeated squaring, with z brought near 1 where a product on the way could leave the range. */
+// z to a whole power by repeated squaring, with z brought near 1 where a product on the way could leave the range.
 template <class W>
 Complex<W> WholePower(Complex<W> z, int power) {
     const int size = std::abs(power);
@@ -357,7 +357,7 @@ Complex<W> PowerOfZero(const Complex<W>& power) {
     return {real::NaN<W>(), real::NaN<W>()};
 }
 
-/* x to the power y. Whole powers are products, all others e^(y ln x). */
+// x to the power y. Whole powers are products, all others e^(y ln x).
 template <class W>
 Complex<W> Powx(const Complex<W>& x, const Complex<W>& y) {
     constexpr W kLargestWhole = 64;
@@ -372,7 +372,7 @@ Complex<W> Powx(const Complex<W>& x, const Complex<W>& y) {
     return std::exp(Complex<W>(y.real() * log.real() - y.imag() * log.imag(), angle));
 }
 
-// ---- trigonometry --------------------------------------------------------------------------------------------------
+// ---- trigonometry ---------------------------------------------------------------------------------------------------
 
 template <class W>
 Complex<W> Sec(const Complex<W>& z) {
@@ -389,8 +389,7 @@ Complex<W> Cot(const Complex<W>& z) {
     return Recip(std::tan(z));
 }
 
-/* sin z / z. Far from the real axis the sine is e^|y| / 2 times (sin x, +-cos x), and out of range before the quotient.
- */
+// sin z / z. Far from the real axis the sine is e^|y| / 2 times (sin x, +-cos x), and out of range before the quotient.
 template <class W>
 Complex<W> Sinc(const Complex<W>& z) {
     constexpr W kFar = 100;
@@ -402,7 +401,7 @@ Complex<W> Sinc(const Complex<W>& z) {
     return ScaledByPower([](W power) { return std::exp(power); }, y, turn.real(), turn.imag());
 }
 
-/* The arctangent of y / x. */
+// The arctangent of y / x.
 template <class W>
 Complex<W> Atan2(const Complex<W>& x, const Complex<W>& y) {
     if (!IsZero(x)) return std::atan(Divide(y, x));

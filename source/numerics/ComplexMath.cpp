@@ -1,7 +1,6 @@
 // Every member comes in three precisions; the tables below give, a line each, the function that all three compute.
-#include <tessel/numerics/ComplexMath.h>
-
 #include "numerics/ComplexFunctions.h"
+#include <tessel/numerics/ComplexMath.h>
 
 namespace tessel {
 namespace {
@@ -135,7 +134,7 @@ using namespace tessel;
 #define COMPLEX_TEST(NAME, CONDITION) ALL_PRECISIONS(TEST_MEMBER, NAME, CONDITION)
 #define COMPLEX_COMPARISON(NAME, OPERATOR) ALL_PRECISIONS(COMPARISON_MEMBER, NAME, OPERATOR)
 
-// ---- arithmetic and rounding ----
+// ---- arithmetic and rounding ----------------------------------------------------------------------------------------
 
 #define OPERATOR_MEMBER(P, REAL, COMPLEX, NAME, OPERATOR)               \
     void NAME##P(const COMPLEX* x, const COMPLEX* y, COMPLEX* result) { \
@@ -162,7 +161,7 @@ COMPLEX_PARTS(RTcFloor, std::floor(x), std::floor(y))
     }
 ALL_PRECISIONS(SCALE_MEMBER, RTciScale)
 
-// ---- forms ----
+// ---- forms ----------------------------------------------------------------------------------------------------------
 
 #define MAGNITUDE_MEMBER(P, REAL, COMPLEX, NAME)   \
     void NAME##P(const COMPLEX* x, REAL* result) { \
@@ -194,7 +193,7 @@ ALL_PRECISIONS(FROM_POLAR_MEMBER, RTfcRThToC)
 ALL_PRECISIONS(TO_PARTS_MEMBER, RTcfCToReIm)
 ALL_PRECISIONS(FROM_PARTS_MEMBER, RTfcReImToC)
 
-// ---- logarithms and powers ----
+// ---- logarithms and powers ------------------------------------------------------------------------------------------
 
 COMPLEX_UNARY(RTcLogn, cmplx::Logn)
 COMPLEX_UNARY(RTcLog10, cmplx::Log10)
@@ -207,7 +206,7 @@ COMPLEX_UNARY(RTcPow10, cmplx::Pow10)
 COMPLEX_UNARY(RTcPow2, cmplx::Pow2)
 COMPLEX_BINARY(RTcPowx, cmplx::Powx)
 
-// ---- trigonometry ----
+// ---- trigonometry ---------------------------------------------------------------------------------------------------
 
 #define SINCOS_MEMBER(P, REAL, COMPLEX, NAME)                        \
     void NAME##P(const COMPLEX* x, COMPLEX* sine, COMPLEX* cosine) { \
@@ -232,7 +231,7 @@ COMPLEX_UNARY(RTcAsinh, std::asinh)
 COMPLEX_UNARY(RTcAcosh, std::acosh)
 COMPLEX_UNARY(RTcAtanh, std::atanh)
 
-// ---- predicates ----
+// ---- predicates -----------------------------------------------------------------------------------------------------
 
 COMPLEX_TEST(RTcIsNan, std::isnan(x) || std::isnan(y))
 COMPLEX_TEST(RTcEQ0, x == 0 && y == 0)

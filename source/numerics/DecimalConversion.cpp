@@ -1,9 +1,9 @@
 #include "numerics/DecimalConversion.h"
 
+#include "numerics/WideArithmetic.h"
+
 #include <algorithm>
 #include <array>
-
-#include "numerics/WideArithmetic.h"
 
 namespace tessel {
 namespace {
@@ -11,7 +11,7 @@ namespace {
 constexpr int32 kMaxSignificant = 17;
 constexpr int32 kLowestBitPosition = 64;
 
-// ---- powers of ten -------------------------------------------------------------------------------------------------
+// ---- powers of ten --------------------------------------------------------------------------------------------------
 
 // The powers of ten a double needs, in 128 bits each; those beyond are products of them.
 constexpr int kTablePower = 348;
@@ -95,7 +95,7 @@ Uint128 NormalizedProduct(const Uint128& a, const Uint128& b) {
     return {kPowerTable[kTablePower + n], FloorLog2OfPower(n) - 127, error};
 }
 
-// ---- exact comparison ----------------------------------------------------------------------------------------------
+// ---- exact comparison -----------------------------------------------------------------------------------------------
 
 // The widest operand is 64 bits times 5^4970 (11,540 bits).
 using Exact = BigUnsigned<400>;
@@ -121,7 +121,7 @@ using Exact = BigUnsigned<400>;
     return left.Compare(right);
 }
 
-// ---- scaled mantissas ----------------------------------------------------------------------------------------------
+// ---- scaled mantissas -----------------------------------------------------------------------------------------------
 
 // A 64-bit mantissa times a power of ten: (high, middle, low) * 2^exponent, at most error * 2^64 less than the truth.
 struct Scaled {
@@ -161,7 +161,7 @@ bool RoundsUp(int comparedWithHalf, uint64 kept) {
     return comparedWithHalf > 0 || (comparedWithHalf == 0 && (kept & 1) != 0);
 }
 
-// ---- binary to decimal ---------------------------------------------------------------------------------------------
+// ---- binary to decimal ----------------------------------------------------------------------------------------------
 
 // floor(log10(x))
 int32 DecimalExponent(const RealParts& x) {
@@ -191,7 +191,7 @@ uint64 RoundScaled(const RealParts& x, int32 power) {
     return RoundsUp(compared, kept) ? kept + 1 : kept;
 }
 
-// ---- decimal to binary ---------------------------------------------------------------------------------------------
+// ---- decimal to binary ----------------------------------------------------------------------------------------------
 
 constexpr int32 kInfiniteExponent = kExtendedExponentMask;
 
@@ -212,7 +212,7 @@ RoundedExtended Exact64(uint64 mantissa, int32 exponent) {
     return {mantissa << zeros, static_cast<uint32>(exponent - zeros + 63 + kExtendedBias), 0};
 }
 
-// ---- records -------------------------------------------------------------------------------------------------------
+// ---- records --------------------------------------------------------------------------------------------------------
 
 // Eight digits, two a byte.
 uint32 PackEight(uint32 value) {

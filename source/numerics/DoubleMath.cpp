@@ -1,12 +1,12 @@
 #include "numerics/DoubleMath.h"
 
+#include "numerics/Extended.h"
+#include "numerics/TwoParts.h"
+
 #include <array>
 #include <bit>
 #include <cmath>
 #include <limits>
-
-#include "numerics/Extended.h"
-#include "numerics/TwoParts.h"
 
 namespace tessel {
 namespace {
@@ -73,7 +73,7 @@ double Rounded(const Pair& x) {
     return x.high + x.low;
 }
 
-// ---- logarithms ----------------------------------------------------------------------------------------------------
+// ---- logarithms -----------------------------------------------------------------------------------------------------
 
 // x is 2^k z with z around 1, and z lies near one of 129 points, 1 among them. With a short number near the inverse of
 // that point, z times it is 1 + r exactly; the logarithm is that of 2^k, that of the inverse and that of 1 + r.
@@ -152,7 +152,7 @@ Pair Log1p(const Pair& x) {
     return Log(sum.high, sum.low + x.low);
 }
 
-// ---- exponential functions -----------------------------------------------------------------------------------------
+// ---- exponential functions ------------------------------------------------------------------------------------------
 
 // x is n (ln 2) / 128 + r.
 constexpr int kSteps = 128;
@@ -220,7 +220,7 @@ double CoshLess1(double x) {
 
 constexpr double kSeriesEnd = 0.5;
 
-// ---- angles --------------------------------------------------------------------------------------------------------
+// ---- angles ---------------------------------------------------------------------------------------------------------
 
 // x is n pi / 64 + r. The three parts of pi / 64 are so short that n times the first two is exact.
 constexpr int kAngles = 128;  // of the full circle

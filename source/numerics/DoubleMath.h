@@ -1,6 +1,6 @@
-/* Functions of doubles for which the C library is off by more than one unit in the last place, and quotients of two
-   functions: computed in two parts and rounded once, so that hardly more than half a unit is lost. All doubles are
-   arguments, with the results of the C library where there is no finite one. */
+// Functions of doubles for which the C library is off by more than one unit in the last place, and quotients of two
+// functions: computed in two parts and rounded once, so that hardly more than half a unit is lost. All doubles are
+// arguments, with the results of the C library where there is no finite one.
 #pragma once
 
 namespace tessel::precise {

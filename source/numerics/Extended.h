@@ -1,12 +1,12 @@
-/* The extended real as something to compute with: the host's long double where that is the 80-bit type. */
+// The extended real as something to compute with: the host's long double where that is the 80-bit type.
 #pragma once
+
+#include <tessel/base/NumericTypes.h>
 
 #include <cfloat>
 #include <cmath>
 #include <cstring>
 #include <limits>
-
-#include <tessel/base/NumericTypes.h>
 
 namespace tessel {
 
@@ -17,8 +17,8 @@ inline constexpr uint16 kExtendedExponentMask = 0x7FFF;
 inline constexpr int kExtendedBias = 16383;
 inline constexpr uint64 kExtendedIntegerBit = uint64{1} << 63;
 
-/* An extended real that came about by rounding, as it is kept in registers: `rest` tells on which side of it the exact
-   value lies (-1 below, 1 above, 0 when they are equal), for those who round once more. */
+// An extended real that came about by rounding, as it is kept in registers: `rest` tells on which side of it the exact
+// value lies (-1 below, 1 above, 0 when they are equal), for those who round once more.
 struct RoundedExtended {
     uint64 mantissa;
     uint32 signExponent;

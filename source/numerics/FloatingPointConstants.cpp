@@ -1,8 +1,7 @@
+#include "numerics/Service.h"
 #include <tessel/numerics/FloatingPointConstants.h>
 
 #include <bit>
-
-#include "numerics/Service.h"
 
 namespace tessel {
 namespace {

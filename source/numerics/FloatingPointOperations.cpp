@@ -1,11 +1,10 @@
 // Operations of the register layer: on the stack, and from memory to memory.
-#include <cstddef>
-
-#include <tessel/numerics/FloatingPointRegisters.h>
-
 #include "numerics/ComplexFunctions.h"
 #include "numerics/RealFunctions.h"
 #include "numerics/Registers.h"
+#include <tessel/numerics/FloatingPointRegisters.h>
+
+#include <cstddef>
 
 namespace tessel {
 namespace {
@@ -64,7 +63,7 @@ Complex Load(const cmplxExt& z) {
 
 using namespace tessel;
 
-// ---- on the stack ----
+// ---- on the stack ---------------------------------------------------------------------------------------------------
 
 #define REAL_UNARY(NAME, FUNCTION)             \
     void NAME(void) {                          \
@@ -157,7 +156,7 @@ void ComplexSincos(void) {
     PushValue(std::sin(z));
 }
 
-// ---- from memory to memory ----
+// ---- from memory to memory ------------------------------------------------------------------------------------------
 
 #define TYPED_UNARY(NAME32, NAME64, NAMEEXT, FUNCTION)                      \
     void NAME32(const float* x, float* result) {                            \
@@ -208,7 +207,7 @@ TYPED_BINARY(FPowerX32, FPowerX64, FPowerXExt, std::pow)
 TYPED_COMPLEX(FComplexRToP32, FComplexRToP64, FComplexRToPExt, cmplx::ToPolar)
 TYPED_COMPLEX(FComplexPToR32, FComplexPToR64, FComplexPToRExt, cmplx::ToRectangular)
 
-// ---- sums ----
+// ---- sums -----------------------------------------------------------------------------------------------------------
 
 void Sum1DSingleArray(const float* first, int32 stride, int32 count, float* result) {
     *result = static_cast<float>(Sum(first, stride, count));

@@ -1,15 +1,13 @@
+#include "numerics/DecimalConversion.h"
+#include "numerics/Registers.h"
 #include <tessel/numerics/FloatingPointRegisters.h>
+#include <tessel/numerics/NumericSupport.h>
 
 #include <bit>
 #include <cfenv>
 #include <cmath>
 #include <limits>
 #include <type_traits>
-
-#include <tessel/numerics/NumericSupport.h>
-
-#include "numerics/DecimalConversion.h"
-#include "numerics/Registers.h"
 
 namespace tessel {
 namespace {
@@ -270,7 +268,7 @@ ExtendedComplex PopComplex() {
 
 using namespace tessel;
 
-// ---- state ----
+// ---- state ----------------------------------------------------------------------------------------------------------
 
 void FPInit(void) {
     tUnit = FloatingPointUnit{};
@@ -291,7 +289,7 @@ uint16 CheckFPStat(void) {
     return static_cast<uint16>(tUnit.status | HostExceptions() | tUnit.top << kTopShift);
 }
 
-// ---- loads ----
+// ---- loads ----------------------------------------------------------------------------------------------------------
 
 #define FP_LOAD_INTEGER(NAME, TYPE)                  \
     void FPLoad##NAME(const TYPE* value) {           \
@@ -355,7 +353,7 @@ void FPPop(void) {
     Pop();
 }
 
-// ---- stores ----
+// ---- stores ---------------------------------------------------------------------------------------------------------
 
 #define FP_STORE_INTEGER(NAME, TYPE)                  \
     void FPStore##NAME(TYPE* value) {                 \

@@ -1,17 +1,17 @@
-/* Reading and writing values of any numeric type in memory, whatever their alignment. */
+// Reading and writing values of any numeric type in memory, whatever their alignment.
 #pragma once
+
+#include "numerics/Extended.h"
 
 #include <cmath>
 #include <cstring>
 #include <limits>
 #include <type_traits>
 
-#include "numerics/Extended.h"
-
 namespace tessel {
 
-/* The nearest integer, halves to even, whatever direction the host's unit rounds in; |x| is below 2^63. What rounds up
-   to 2^63 wraps around, to the bits of the unsigned value. */
+// The nearest integer, halves to even, whatever direction the host's unit rounds in; |x| is below 2^63. What rounds up
+// to 2^63 wraps around, to the bits of the unsigned value.
 template <class Real>
 int64 NearestInteger(Real x) {
     constexpr Real kHalf = 0.5;
@@ -21,7 +21,7 @@ int64 NearestInteger(Real x) {
     return stays ? whole : static_cast<int64>(static_cast<uint64>(whole) + (x < 0 ? ~uint64{0} : 1));
 }
 
-/* The same for an integer type: what lies outside the range saturates, a NaN gives the maximum. */
+// The same for an integer type: what lies outside the range saturates, a NaN gives the maximum.
 template <class Int, class Real>
 Int SaturatedRound(Real x) {
     constexpr Int kMax = std::numeric_limits<Int>::max();
@@ -47,12 +47,12 @@ void WriteAs(void* destination, T value) {
     std::memcpy(destination, &value, sizeof value);
 }
 
-/* The low four bits of a type code select the type. */
+// The low four bits of a type code select the type.
 inline int16 TypeOfCode(int16 code) {
     return static_cast<int16>(code & 15);
 }
 
-/* The integer types are 1 to 4 (signed) and 5 to 8 (unsigned), by width. */
+// The integer types are 1 to 4 (signed) and 5 to 8 (unsigned), by width.
 inline bool IsIntegerType(int16 type) {
     return type >= kNumInt8 && type <= kNumUInt64;
 }
@@ -63,7 +63,7 @@ inline int32 IntegerBits(int16 type) {
     return 8 << ((type - kNumInt8) & 3);
 }
 
-/* The bits of an integer, sign- or zero-extended; 0 for a type that is not an integer. */
+// The bits of an integer, sign- or zero-extended; 0 for a type that is not an integer.
 inline uint64 ReadInteger(int16 type, const void* source) {
     switch (type) {
         case kNumInt8:
@@ -86,17 +86,17 @@ inline uint64 ReadInteger(int16 type, const void* source) {
     }
 }
 
-/* Writes the low bytes. */
+// Writes the low bytes.
 void WriteInteger(int16 type, uint64 value, void* destination);
 
-/* The value of an integer or real, or one part of a complex value. */
+// The value of an integer or real, or one part of a complex value.
 struct ExtendedComplex {
     Extended re;
     Extended im;
 };
 ExtendedComplex ReadNumber(int16 type, const void* source);
 
-/* Writes by the store rules: integers saturate, narrower reals round. Types that are not complex take the real part. */
+// Writes by the store rules: integers saturate, narrower reals round. Types that are not complex take the real part.
 void WriteNumber(int16 type, const ExtendedComplex& value, void* destination);
 
 }  // namespace tessel

@@ -1,10 +1,8 @@
+#include "numerics/NumericAccess.h"
+#include <tessel/diagnostics/DebugStream.h>
 #include <tessel/numerics/NumericSupport.h>
 
 #include <algorithm>
-
-#include <tessel/diagnostics/DebugStream.h>
-
-#include "numerics/NumericAccess.h"
 
 namespace tessel {
 namespace {

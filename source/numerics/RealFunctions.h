@@ -1,23 +1,23 @@
-/* The real functions of the math family, for float, double and the extended real. What the standard library has in the
-   same form is used from there directly. */
+// The real functions of the math family, for float, double and the extended real. What the standard library has in the
+// same form is used from there directly.
 #pragma once
-
-#include <bit>
-#include <cmath>
-#include <limits>
-#include <type_traits>
 
 #include "numerics/DoubleMath.h"
 #include "numerics/Extended.h"
 #include "numerics/NumericAccess.h"
 #include "numerics/TwoParts.h"
 
+#include <bit>
+#include <cmath>
+#include <limits>
+#include <type_traits>
+
 namespace tessel::real {
 
 template <class T>
 constexpr T kInfinity = std::numeric_limits<T>::infinity();
 
-/* The NaN of a precision: all bits set in a single or double, the sign clear in an extended real. */
+// The NaN of a precision: all bits set in a single or double, the sign clear in an extended real.
 template <class T>
 T NaN() {
     if constexpr (std::is_same_v<T, float>) {
@@ -29,7 +29,7 @@ T NaN() {
     }
 }
 
-/* The precision in which functions made of several steps are computed, so that the result is rounded once. */
+// The precision in which functions made of several steps are computed, so that the result is rounded once.
 template <class T>
 using Wider = std::conditional_t<std::is_same_v<T, float>, double, Extended>;
 
@@ -45,7 +45,7 @@ inline Extended Widen(Extended x) {
     return x;
 }
 
-/* Singles go through double, doubles have a function of their own, and the extended reals take the library's. */
+// Singles go through double, doubles have a function of their own, and the extended reals take the library's.
 template <class T, class OfDouble, class Function>
 T Careful(T x, OfDouble ofDouble, Function function) {
     if constexpr (std::is_same_v<T, float>) {
@@ -57,9 +57,9 @@ T Careful(T x, OfDouble ofDouble, Function function) {
     }
 }
 
-// ---- logarithms ----------------------------------------------------------------------------------------------------
+// ---- logarithms -----------------------------------------------------------------------------------------------------
 
-/* What a logarithm is where it has no value: -infinity at 0, else (negative or NaN) a NaN. */
+// What a logarithm is where it has no value: -infinity at 0, else (negative or NaN) a NaN.
 template <class T>
 T LogOutside(T distanceFromPole) {
     return distanceFromPole == 0 ? -kInfinity<T> : NaN<T>();
@@ -70,7 +70,7 @@ T Logn(T x) {
     return x > 0 ? std::log(x) : LogOutside(x);
 }
 
-/* log10(m 2^e) = log10(m) + e log10(2), which is exact at the powers of ten where the library's own is not. */
+// log10(m 2^e) = log10(m) + e log10(2), which is exact at the powers of ten where the library's own is not.
 inline Extended ExtendedLog10(Extended x) {
     constexpr TwoParts<Extended> kLog10Of2 = {0x9A209A84FBCFp-49L, 0xF7988F8959AC0B7Dp-113L};  // high times e is exact
     constexpr Extended kRootOfHalf = 0.70710678118654752440L;
@@ -111,14 +111,14 @@ T Logx(T base, T x) {
     return std::isnan(quotient) ? NaN<T>() : static_cast<T>(quotient);
 }
 
-// ---- powers --------------------------------------------------------------------------------------------------------
+// ---- powers ---------------------------------------------------------------------------------------------------------
 
 template <class T>
 T Pow10(T x) {
     return std::pow(T{10}, x);
 }
 
-/* x times 2 to the power trunc(n). */
+// x times 2 to the power trunc(n).
 template <class T>
 T Scale(T x, T n) {
     constexpr T kFarthest = 40000;  // moves any value out of range
@@ -144,9 +144,9 @@ MantissaAndExponent<T> GetMantExp(T x) {
     return {2 * half, static_cast<T>(exponent - 1)};
 }
 
-// ---- trigonometry --------------------------------------------------------------------------------------------------
+// ---- trigonometry ---------------------------------------------------------------------------------------------------
 
-/* Only doubles need more than the library gives. */
+// Only doubles need more than the library gives.
 template <class T>
 T Sin(T x) {
     if constexpr (std::is_same_v<T, double>) return precise::Sin(x);
@@ -185,7 +185,7 @@ T Sinc(T x) {
     return x == 0 ? T{1} : Careful(x, precise::Sinc, [](auto wide) { return std::sin(wide) / wide; });
 }
 
-/* Angle of the point (x, y). */
+// Angle of the point (x, y).
 template <class T>
 T Atan2(T x, T y) {
     if constexpr (std::is_same_v<T, float>) {
@@ -225,7 +225,7 @@ T Atanh(T x) {
     return Careful(x, precise::Atanh, [](auto wide) { return std::atanh(wide); });
 }
 
-// ---- arithmetic ----------------------------------------------------------------------------------------------------
+// ---- arithmetic -----------------------------------------------------------------------------------------------------
 
 template <class T>
 T Recip(T x) {
@@ -247,8 +247,8 @@ T Neg(T x) {
     return -x;
 }
 
-/* Halves to even, whatever direction the host's unit rounds in; a zero is positive. From 2^63 on there are only
-   integers, no operand having more than 64 digits. */
+// Halves to even, whatever direction the host's unit rounds in; a zero is positive. From 2^63 on there are only
+// integers, no operand having more than 64 digits.
 template <class T>
 T Round(T x) {
     constexpr T kAllWhole = 0x1p63;
@@ -264,7 +264,7 @@ T Sign(T x) {
     return x > 0 ? T{1} : x < 0 ? T{-1} : T{0};
 }
 
-/* x - floor(x / y) y, without the rounding of the quotient where that is finite; a zero is positive. */
+// x - floor(x / y) y, without the rounding of the quotient where that is finite; a zero is positive.
 template <class T>
 T Mod(T x, T y) {
     if (!std::isfinite(x) || !std::isfinite(y)) return x - std::floor(x / y) * y;

@@ -1,9 +1,7 @@
 // Every member comes in three precisions; the tables below give, a line each, the function that all three compute.
-#include <tessel/numerics/RealMath.h>
-
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "numerics/RealFunctions.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/numerics/RealMath.h>
 
 namespace tessel {
 namespace {
@@ -101,7 +99,7 @@ using namespace tessel;
         return ToExtended(*x) OPERATOR ToExtended(*y) ? 1 : 0; \
     }
 
-// ---- arithmetic and rounding ----
+// ---- arithmetic and rounding ----------------------------------------------------------------------------------------
 
 REAL_OPERATOR(RTfAdd, +)
 REAL_OPERATOR(RTfSub, -)
@@ -128,7 +126,7 @@ void RTfRemX(const floatExt*, const floatExt*, floatExt* result) {
     *result = FromExtended(real::NaN<Extended>());
 }
 
-// ---- logarithms ----
+// ---- logarithms -----------------------------------------------------------------------------------------------------
 
 REAL_UNARY(RTfLogn, real::Logn)
 REAL_UNARY(RTfLog10, real::Log10)
@@ -136,7 +134,7 @@ REAL_UNARY(RTfLog2, real::Log2)
 REAL_UNARY(RTfLognp1, real::Lognp1)
 REAL_BINARY(RTfLogx, real::Logx)
 
-// ---- powers ----
+// ---- powers ---------------------------------------------------------------------------------------------------------
 
 REAL_UNARY(RTfExp, std::exp)
 REAL_UNARY(RTfExpm1, std::expm1)
@@ -144,7 +142,7 @@ REAL_UNARY(RTfPow10, real::Pow10)
 REAL_UNARY(RTfPow2, std::exp2)
 REAL_BINARY(RTfPowx, std::pow)
 
-// ---- trigonometry ----
+// ---- trigonometry ---------------------------------------------------------------------------------------------------
 
 REAL_UNARY(RTfSin, real::Sin)
 REAL_UNARY(RTfCos, real::Cos)
@@ -164,7 +162,7 @@ REAL_UNARY(RTfAsinh, real::Asinh)
 REAL_UNARY(RTfAcosh, real::Acosh)
 REAL_UNARY(RTfAtanh, real::Atanh)
 
-// ---- one operand, two results ----
+// ---- one operand, two results ---------------------------------------------------------------------------------------
 
 void RTfGetMantExpS(const float* x, float* mantissa, float* exponent) {
     const auto both = real::GetMantExp(*x);
@@ -198,7 +196,7 @@ void RTfSinCosX(const floatExt* x, floatExt* sine, floatExt* cosine) {
     if (cosine != nullptr) *cosine = FromExtended(std::cos(angle));
 }
 
-// ---- predicates ----
+// ---- predicates -----------------------------------------------------------------------------------------------------
 
 REAL_TEST(RTfIsNan, std::isnan(x))
 REAL_TEST(RTfEQ0, x == 0)

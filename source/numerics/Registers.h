@@ -1,4 +1,4 @@
-/* The calling thread's register stack. */
+// The calling thread's register stack.
 #pragma once
 
 #include "numerics/NumericAccess.h"
@@ -7,10 +7,10 @@ namespace tessel {
 
 void PushRegister(Extended value);
 
-/* Pops the top value; a NaN from an empty stack. */
+// Pops the top value; a NaN from an empty stack.
 Extended PopRegister();
 
-/* A complex value lies with its real part on top. */
+// A complex value lies with its real part on top.
 void PushComplex(const ExtendedComplex& value);
 ExtendedComplex PopComplex();
 

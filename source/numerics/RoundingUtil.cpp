@@ -1,6 +1,5 @@
-#include <tessel/numerics/RoundingUtil.h>
-
 #include "numerics/NumericAccess.h"
+#include <tessel/numerics/RoundingUtil.h>
 
 using namespace tessel;
 

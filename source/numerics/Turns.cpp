@@ -1,9 +1,9 @@
 #include "numerics/Turns.h"
 
+#include "numerics/WideArithmetic.h"
+
 #include <array>
 #include <bit>
-
-#include "numerics/WideArithmetic.h"
 
 namespace tessel {
 namespace {

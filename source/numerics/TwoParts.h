@@ -1,9 +1,9 @@
-/* Values in two parts: the sum of both counts, with about twice the digits of one. */
+// Values in two parts: the sum of both counts, with about twice the digits of one.
 #pragma once
 
-#include <limits>
-
 #include <tessel/base/Types.h>
+
+#include <limits>
 
 namespace tessel {
 
@@ -13,7 +13,7 @@ struct TwoParts {
     W low;
 };
 
-/* The sum a + b and what rounding took from it. */
+// The sum a + b and what rounding took from it.
 template <class W>
 TwoParts<W> ExactSum(W a, W b) {
     const W sum = a + b;
@@ -21,14 +21,14 @@ TwoParts<W> ExactSum(W a, W b) {
     return {sum, (a - (sum - shifted)) + (b - shifted)};
 }
 
-/* The same where |a| >= |b|, or a is 0. */
+// The same where |a| >= |b|, or a is 0.
 template <class W>
 TwoParts<W> ExactSumOrdered(W a, W b) {
     const W sum = a + b;
     return {sum, b - (sum - a)};
 }
 
-/* The product a * b and what rounding took from it; the factors must not be near the largest value. */
+// The product a * b and what rounding took from it; the factors must not be near the largest value.
 template <class W>
 TwoParts<W> ExactProduct(W a, W b) {
     constexpr W kSplitter = static_cast<W>((uint64{1} << (std::numeric_limits<W>::digits + 1) / 2) + 1);

@@ -1,10 +1,10 @@
-/* Integers wider than a register, as far as exact decimal conversion needs them. */
+// Integers wider than a register, as far as exact decimal conversion needs them.
 #pragma once
+
+#include <tessel/base/Types.h>
 
 #include <array>
 #include <bit>
-
-#include <tessel/base/Types.h>
 
 namespace tessel {
 
@@ -30,7 +30,7 @@ constexpr Uint128 Multiply64(uint64 a, uint64 b) {
 #endif
 }
 
-/* An unsigned integer of up to 32 * Limbs bits. What exceeds them is lost; callers choose a size that suffices. */
+// An unsigned integer of up to 32 * Limbs bits. What exceeds them is lost; callers choose a size that suffices.
 template <int Limbs>
 class BigUnsigned {
 public:
@@ -75,18 +75,18 @@ public:
         Trim();
     }
 
-    /* Index of the highest set bit; -1 for zero. */
+    // Index of the highest set bit; -1 for zero.
     constexpr int TopBit() const {
         return size_ == 0 ? -1 : 32 * (size_ - 1) + 31 - std::countl_zero(limbs_[size_ - 1]);
     }
 
-    /* The 128 bits from the highest set bit down; zeros follow a shorter number. */
+    // The 128 bits from the highest set bit down; zeros follow a shorter number.
     constexpr Uint128 Top128() const {
         const int top = TopBit();
         return {Bits64(top - 63), Bits64(top - 127)};
     }
 
-    /* -1, 0 or 1. */
+    // -1, 0 or 1.
     constexpr int Compare(const BigUnsigned& other) const {
         if (size_ != other.size_) return size_ < other.size_ ? -1 : 1;
         for (int i = size_ - 1; i >= 0; --i) {

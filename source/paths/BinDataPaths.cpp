@@ -1,10 +1,9 @@
 // Paths in binary streams.
+#include "diagnostics/Guarded.h"
+#include "paths/PathFlattening.h"
 #include <tessel/paths/PathManager.h>
 #include <tessel/streams/BinDataReader.h>
 #include <tessel/streams/BinDataWriter.h>
-
-#include "diagnostics/Guarded.h"
-#include "paths/PathFlattening.h"
 
 namespace tessel {
 

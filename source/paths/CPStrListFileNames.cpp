@@ -1,8 +1,7 @@
-/* The members of CPStrList that compare file names. */
+// The members of CPStrList that compare file names.
+#include "strings/CPStrWalk.h"
 #include <tessel/paths/PathManager.h>
 #include <tessel/strings/CPStrList.h>
-
-#include "strings/CPStrWalk.h"
 
 namespace tessel {
 

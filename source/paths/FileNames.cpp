@@ -1,16 +1,15 @@
 // Names for the system, and which names a file can have.
 #include "paths/FileNames.h"
 
+#include "diagnostics/Guarded.h"
+#include "paths/PathRefAccess.h"
+#include "paths/PathSteps.h"
+#include "paths/ShortcutResolver.h"
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathTextFormat.h>
 
 #include <algorithm>
 #include <cstring>
-
-#include "diagnostics/Guarded.h"
-#include "paths/PathRefAccess.h"
-#include "paths/PathSteps.h"
-#include "paths/ShortcutResolver.h"
 
 namespace tessel {
 namespace {

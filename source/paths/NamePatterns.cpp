@@ -1,12 +1,11 @@
 // Patterns for names.
+#include "diagnostics/Guarded.h"
+#include "paths/PathSteps.h"
 #include <tessel/paths/PathRef.h>
 #include <tessel/paths/PathTextFormat.h>
 
 #include <string_view>
 #include <vector>
-
-#include "diagnostics/Guarded.h"
-#include "paths/PathSteps.h"
 
 namespace tessel {
 namespace {

@@ -1,14 +1,13 @@
 // Shortening paths that are too long to be shown.
+#include "diagnostics/Guarded.h"
+#include "paths/PathRefAccess.h"
+#include "paths/PathSteps.h"
+#include "paths/PathTextWriters.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/paths/PathAbbreviation.h>
 #include <tessel/strings/StringUtils.h>
 
 #include <set>
-
-#include "diagnostics/Guarded.h"
-#include "paths/PathRefAccess.h"
-#include "paths/PathSteps.h"
-#include "paths/PathTextWriters.h"
 
 namespace tessel {
 namespace {

@@ -1,14 +1,12 @@
 // Cached items, and storing and finding them on the elements of paths.
+#include "diagnostics/Guarded.h"
+#include "paths/PathRefAccess.h"
 #include <tessel/paths/PathCachedItem.h>
-
 #include <tessel/time/Millisecs.h>
 
 #include <algorithm>
 #include <cstring>
 #include <utility>
-
-#include "diagnostics/Guarded.h"
-#include "paths/PathRefAccess.h"
 
 namespace tessel {
 

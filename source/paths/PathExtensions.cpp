@@ -1,13 +1,12 @@
 // The extensions of names, and the lists that say which file type has which extension.
+#include "diagnostics/Guarded.h"
+#include "paths/PathProcess.h"
+#include "paths/PathRefAccess.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/strings/StringUtils.h>
 
 #include <cstring>
-
-#include "diagnostics/Guarded.h"
-#include "paths/PathProcess.h"
-#include "paths/PathRefAccess.h"
 
 namespace tessel {
 namespace {

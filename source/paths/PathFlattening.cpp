@@ -1,6 +1,11 @@
 // "PTH0" and "PTH1": a magic, the size of what follows, the base, and the names from the first to the last.
 #include "paths/PathFlattening.h"
 
+#include "diagnostics/Guarded.h"
+#include "paths/PathItemStorage.h"
+#include "paths/PathProcess.h"
+#include "paths/PathRefAccess.h"
+#include "platform/CodePage.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/streams/Endianizer.h>
@@ -11,12 +16,6 @@
 #include <cstring>
 #include <memory>
 #include <string_view>
-
-#include "diagnostics/Guarded.h"
-#include "paths/PathItemStorage.h"
-#include "paths/PathProcess.h"
-#include "paths/PathRefAccess.h"
-#include "platform/CodePage.h"
 
 namespace tessel {
 namespace {

@@ -1,13 +1,12 @@
 #include "paths/PathFormatReader.h"
 
+#include "diagnostics/Guarded.h"
+#include "paths/PathSteps.h"
+#include "platform/FileSystem.h"
 #include <tessel/base/OVExcept.h>
 
 #include <algorithm>
 #include <cstring>
-
-#include "diagnostics/Guarded.h"
-#include "paths/PathSteps.h"
-#include "platform/FileSystem.h"
 
 namespace tessel {
 namespace WidePathFormat {

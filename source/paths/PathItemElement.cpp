@@ -1,12 +1,11 @@
 #include "paths/PathItemElement.h"
 
+#include "paths/PathItemStorage.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/strings/StringUtils.h>
 
 #include <algorithm>
 #include <new>
-
-#include "paths/PathItemStorage.h"
 
 namespace tessel {
 namespace {

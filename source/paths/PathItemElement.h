@@ -85,7 +85,7 @@ public:
     // The child of that name, made if there is none, and retained for the caller. Null (reported) when memory is short.
     PathItemElement* Child(const std::string& name);
 
-    // ---- with the path mutex held ----
+    // ---- with the path mutex held -----------------------------------------------------------------------------------
 
     int32 ChildCount() const { return static_cast<int32>(children_.size()); }
     PathItemElement* ChildAt(int32 index) const { return children_[static_cast<size_t>(index)].element; }
@@ -99,7 +99,7 @@ public:
     enum class Fault { kNone, kOwnParent, kBaseDepth, kDepth, kChildren };
     Fault Check();
 
-    // ---- for the storage ----
+    // ---- for the storage --------------------------------------------------------------------------------------------
 
     bool Claim();
     void BecomeBase(const char* name);

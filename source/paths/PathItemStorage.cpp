@@ -1,12 +1,11 @@
 #include "paths/PathItemStorage.h"
 
+#include "paths/PathItemElement.h"
 #include <tessel/diagnostics/DebugStream.h>
 
 #include <bit>
 #include <map>
 #include <new>
-
-#include "paths/PathItemElement.h"
 
 namespace tessel {
 namespace {

@@ -1,9 +1,9 @@
 // Paths through the flat interface. The flattened form and texts have files of their own.
-#include <tessel/paths/PathManager.h>
-
+#include "diagnostics/Guarded.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
+#include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
 #include <tessel/strings/StringCStr.h>
 #include <tessel/strings/StringPStr.h>
@@ -15,8 +15,6 @@
 #include <cstring>
 #include <new>
 #include <optional>
-
-#include "diagnostics/Guarded.h"
 
 namespace tessel {
 namespace {

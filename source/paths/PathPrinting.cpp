@@ -1,9 +1,8 @@
+#include "strings/PathText.h"
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathTextFormat.h>
 #include <tessel/strings/StringLStr.h>
 #include <tessel/strings/StringPStr.h>
-
-#include "strings/PathText.h"
 
 namespace tessel {
 namespace {

@@ -1,17 +1,16 @@
 // The start and stop of paths, and what is set for the whole process.
 #include "paths/PathProcess.h"
 
-#include <tessel/base/OVExcept.h>
-#include <tessel/diagnostics/DumpLeakInfo.h>
-
-#include <atomic>
-#include <cstring>
-
 #include "diagnostics/Guarded.h"
 #include "paths/PathItemStorage.h"
 #include "paths/PathRefAccess.h"
 #include "paths/PathSteps.h"
 #include "paths/Service.h"
+#include <tessel/base/OVExcept.h>
+#include <tessel/diagnostics/DumpLeakInfo.h>
+
+#include <atomic>
+#include <cstring>
 
 namespace tessel {
 namespace {

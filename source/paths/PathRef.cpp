@@ -1,19 +1,17 @@
 // PathRef: construction, names, relations, comparison and checks. Texts, the flattened form, extensions, cached
 // attributes and the file system have files of their own.
-#include <tessel/paths/PathRef.h>
-
-#include <tessel/base/OVExcept.h>
-#include <tessel/diagnostics/AllocTracker.h>
-#include <tessel/memory/TrackedMallocFree.h>
-#include <tessel/strings/StringUtils.h>
-
-#include <new>
-#include <utility>
-
 #include "diagnostics/Guarded.h"
 #include "paths/PathItemStorage.h"
 #include "paths/PathProcess.h"
 #include "paths/PathRefAccess.h"
+#include <tessel/base/OVExcept.h>
+#include <tessel/diagnostics/AllocTracker.h>
+#include <tessel/memory/TrackedMallocFree.h>
+#include <tessel/paths/PathRef.h>
+#include <tessel/strings/StringUtils.h>
+
+#include <new>
+#include <utility>
 
 namespace tessel {
 namespace {

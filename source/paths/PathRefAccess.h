@@ -2,9 +2,8 @@
 #ifndef TESSEL_SOURCE_PATHS_PATHREFACCESS_H
 #define TESSEL_SOURCE_PATHS_PATHREFACCESS_H
 
-#include <tessel/paths/PathRef.h>
-
 #include "paths/PathItemElement.h"
+#include <tessel/paths/PathRef.h>
 
 namespace tessel {
 

@@ -2,10 +2,10 @@
 #ifndef TESSEL_SOURCE_PATHS_PATHSTEPS_H
 #define TESSEL_SOURCE_PATHS_PATHSTEPS_H
 
-#include <string_view>
-
 #include "paths/PathProcess.h"
 #include "platform/CodePage.h"
+
+#include <string_view>
 
 namespace tessel {
 

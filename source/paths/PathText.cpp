@@ -1,4 +1,6 @@
 // Paths as text through the flat interface.
+#include "diagnostics/Guarded.h"
+#include "paths/PathSteps.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
@@ -10,9 +12,6 @@
 #include <cstring>
 #include <string>
 #include <string_view>
-
-#include "diagnostics/Guarded.h"
-#include "paths/PathSteps.h"
 
 namespace tessel {
 namespace {

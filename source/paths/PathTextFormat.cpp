@@ -1,14 +1,13 @@
 // Paths as text: the formats, and the writers.
+#include "diagnostics/Guarded.h"
+#include "paths/PathRefAccess.h"
+#include "paths/PathSteps.h"
+#include "paths/PathTextWriters.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/paths/PathCachedItem.h>
 
 #include <cstring>
 #include <new>
-
-#include "diagnostics/Guarded.h"
-#include "paths/PathRefAccess.h"
-#include "paths/PathSteps.h"
-#include "paths/PathTextWriters.h"
 
 namespace tessel {
 namespace {

@@ -1,39 +1,39 @@
-/* Files and folders as whole items, by name (see DriveTable.h for names).
-
-   Every function returns false on failure and sets LastError. Functions that make texts, or take names, may throw
-   std::bad_alloc. Any thread, except where the current folder of the process is changed. */
+// Files and folders as whole items, by name (see DriveTable.h for names).
+//
+// Every function returns false on failure and sets LastError. Functions that make texts, or take names, may throw
+// std::bad_alloc. Any thread, except where the current folder of the process is changed.
 #ifndef TESSEL_PLATFORM_FILESYSTEM_H
 #define TESSEL_PLATFORM_FILESYSTEM_H
+
+#include "platform/File.h"
 
 #include <cstdint>
 #include <string>
 #include <vector>
 
-#include "platform/File.h"
-
 namespace tessel::platform {
 
 struct ItemInfo {
     bool folder;
-    bool readOnly;                            /* nobody may write it */
-    bool hidden;                              /* its name begins with a dot; not known (false) of a handle */
-    std::uint32_t mode;                       /* the host's permissions, 0777 at most */
-    std::int64_t size;                        /* bytes; 0 for a folder */
-    std::int64_t created, accessed, modified; /* 100 ns since 1601-01-01 00:00:00 UTC */
+    bool readOnly;                             // nobody may write it
+    bool hidden;                               // its name begins with a dot; not known (false) of a handle
+    std::uint32_t mode;                        // the host's permissions, 0777 at most
+    std::int64_t size;                         // bytes; 0 for a folder
+    std::int64_t created, accessed, modified;  // 100 ns since 1601-01-01 00:00:00 UTC
 };
 
-/* Follows the host's symbolic links; one whose end cannot be reached is described itself. 2, or 3 when a folder on the
-   way is missing. */
+// Follows the host's symbolic links; one whose end cannot be reached is described itself. 2, or 3 when a folder on the
+// way is missing.
 bool ItemGetInfo(const char* name, ItemInfo& info);
 bool FileGetInfo(FileHandle file, ItemInfo& info);
 
 enum class ItemKind { kNone, kFile, kFolder };
 ItemKind ItemExists(const char* name);
 
-/* The last component of `name` as it is spelled on the disk (empty for a drive). 2 when there is none. */
+// The last component of `name` as it is spelled on the disk (empty for a drive). 2 when there is none.
 bool ItemRealName(const char* name, std::string& real);
 
-/* The whole of `name` as it is spelled on the disk. */
+// The whole of `name` as it is spelled on the disk.
 bool ItemRealPath(const char* name, std::string& real);
 
 struct FolderEntry {
@@ -41,39 +41,39 @@ struct FolderEntry {
     bool folder;
 };
 
-/* What the folder holds, without `.` and `..`, in the host's order. A character that a name cannot have here (the code
-   page lacks it, or it is a separator) shows as `?`. 267 when it is no folder. */
+// What the folder holds, without `.` and `..`, in the host's order. A character that a name cannot have here (the code
+// page lacks it, or it is a separator) shows as `?`. 267 when it is no folder.
 bool FolderList(const char* name, std::vector<FolderEntry>& entries);
 
-/* How many entries FolderList would give. */
+// How many entries FolderList would give.
 bool FolderCount(const char* name, std::int64_t& count);
 
-bool FolderCreate(const char* name); /* 183 when there is an item of that name, 3 when the parent is missing */
-bool FolderRemove(const char* name); /* 145 when it is not empty, 267 when it is no folder */
-bool FileDelete(const char* name);   /* 5 for a folder */
+bool FolderCreate(const char* name);  // 183 when there is an item of that name, 3 when the parent is missing
+bool FolderRemove(const char* name);  // 145 when it is not empty, 267 when it is no folder
+bool FileDelete(const char* name);    // 5 for a folder
 
-/* Renames or moves a file or a folder. The destination must not exist (183), unless it is the same item in another
-   spelling. A file moves between file systems by copying; a folder does not (17). */
+// Renames or moves a file or a folder. The destination must not exist (183), unless it is the same item in another
+// spelling. A file moves between file systems by copying; a folder does not (17).
 bool ItemRename(const char* from, const char* to);
 
-/* Copies bytes, permissions and modification time. The destination must not exist (80). Nothing is left behind after a
-   failure. */
+// Copies bytes, permissions and modification time. The destination must not exist (80). Nothing is left behind after a
+// failure.
 bool FileCopy(const char* from, const char* to);
 
 bool ItemSetReadOnly(const char* name, bool readOnly);
-bool ItemSetMode(const char* name, std::uint32_t mode); /* 0777 at most */
+bool ItemSetMode(const char* name, std::uint32_t mode);  // 0777 at most
 
-/* The permission bits that new files and folders of this process do not get. No other thread sees it changed. */
+// The permission bits that new files and folders of this process do not get. No other thread sees it changed.
 std::uint32_t PermissionMask();
 
-/* The current folder of the process. */
+// The current folder of the process.
 bool CurrentFolder(std::string& name);
 bool SetCurrentFolder(const char* name);
 
-/* The folder for temporary files, with a separator at its end. Not necessarily there. */
+// The folder for temporary files, with a separator at its end. Not necessarily there.
 bool TemporaryFolder(std::string& name);
 
-/* Of the volume that holds the item `name`. `freeBytes`: what the caller may still write. */
+// Of the volume that holds the item `name`. `freeBytes`: what the caller may still write.
 struct VolumeSpace {
     std::uint64_t totalBytes, freeBytes;
     std::uint32_t sectorBytes;

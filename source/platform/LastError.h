@@ -1,8 +1,8 @@
-/* The error number of the seam.
-
-   A function of the seam that fails says so in its result and leaves the reason here, per thread, as one of the numbers
-   the library was designed around. Success leaves the number alone. Each backend turns its own errors into these in one
-   table. */
+// The error number of the seam.
+//
+// A function of the seam that fails says so in its result and leaves the reason here, per thread, as one of the numbers
+// the library was designed around. Success leaves the number alone. Each backend turns its own errors into these in one
+// table.
 #ifndef TESSEL_PLATFORM_LASTERROR_H
 #define TESSEL_PLATFORM_LASTERROR_H
 
@@ -61,7 +61,7 @@ constexpr ErrorNumber kErrorTooManyLinks = 1142;
 constexpr ErrorNumber kErrorTimedOut = 1460;
 constexpr ErrorNumber kErrorCannotResolveName = 1921;
 
-/* The calling thread's number: why its last failing call of the seam failed. 0 at the start of a thread. */
+// The calling thread's number: why its last failing call of the seam failed. 0 at the start of a thread.
 ErrorNumber LastError() noexcept;
 void SetLastError(ErrorNumber number) noexcept;
 

@@ -1,4 +1,4 @@
-/* Reading memory that may not be there. */
+// Reading memory that may not be there.
 #ifndef TESSEL_PLATFORM_MEMORYREAD_H
 #define TESSEL_PLATFORM_MEMORYREAD_H
 
@@ -6,8 +6,8 @@
 
 namespace tessel::platform {
 
-/* Copies up to `count` bytes of this process at `from`, up to the first one that cannot be read. How many it copied.
-   Goes through the kernel and never traps; about one system call a call. Any thread. */
+// Copies up to `count` bytes of this process at `from`, up to the first one that cannot be read. How many it copied.
+// Goes through the kernel and never traps; about one system call a call. Any thread.
 std::size_t ReadMemory(const void* from, void* to, std::size_t count) noexcept;
 
 }  // namespace tessel::platform

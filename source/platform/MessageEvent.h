@@ -1,4 +1,4 @@
-/* The events by which a host tells a thread of its own process that input for it has arrived. One a thread. */
+// The events by which a host tells a thread of its own process that input for it has arrived. One a thread.
 #ifndef TESSEL_PLATFORM_MESSAGEEVENT_H
 #define TESSEL_PLATFORM_MESSAGEEVENT_H
 
@@ -7,11 +7,11 @@
 
 namespace tessel::platform {
 
-/* That of the calling thread, as long as the thread lives. Null when memory is short. */
+// That of the calling thread, as long as the thread lives. Null when memory is short.
 Event* OwnMessageEvent() noexcept;
 
-/* Signals that of a thread, which need not have asked for it yet. False with LastError: 87 for no thread of this
-   process, 8 for no memory. */
+// Signals that of a thread, which need not have asked for it yet. False with LastError: 87 for no thread of this
+// process, 8 for no memory.
 bool SignalMessageEvent(ThreadId thread) noexcept;
 
 }  // namespace tessel::platform

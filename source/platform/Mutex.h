@@ -1,4 +1,4 @@
-/* The host's plain mutex: not recursive, no allocation. For use below the library's own mutexes. */
+// The host's plain mutex: not recursive, no allocation. For use below the library's own mutexes.
 #ifndef TESSEL_PLATFORM_MUTEX_H
 #define TESSEL_PLATFORM_MUTEX_H
 
@@ -16,7 +16,7 @@ private:
     std::mutex mutex_;
 };
 
-/* Holds a mutex for a scope. */
+// Holds a mutex for a scope.
 class MutexHolder {
 public:
     explicit MutexHolder(Mutex& mutex) : mutex_(mutex) { mutex_.Lock(); }

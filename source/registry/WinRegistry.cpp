@@ -1,16 +1,14 @@
-#include <tessel/registry/WinRegistry.h>
-
-#include <tessel/base/OVExcept.h>
-#include <tessel/diagnostics/DebugStream.h>
-
-#include <cstring>
-#include <new>
-#include <string_view>
-
 #include "platform/CodePage.h"
 #include "platform/Mutex.h"
 #include "platform/Process.h"
 #include "registry/WinRegistryObjects.h"
+#include <tessel/base/OVExcept.h>
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/registry/WinRegistry.h>
+
+#include <cstring>
+#include <new>
+#include <string_view>
 
 namespace tessel {
 

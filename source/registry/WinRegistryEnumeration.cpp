@@ -1,9 +1,8 @@
+#include "platform/CodePage.h"
+#include "registry/WinRegistryObjects.h"
 #include <tessel/base/OVExcept.h>
 
 #include <new>
-
-#include "platform/CodePage.h"
-#include "registry/WinRegistryObjects.h"
 
 namespace tessel {
 

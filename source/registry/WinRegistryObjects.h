@@ -2,6 +2,8 @@
 #ifndef TESSEL_SOURCE_REGISTRY_WINREGISTRYOBJECTS_H
 #define TESSEL_SOURCE_REGISTRY_WINREGISTRYOBJECTS_H
 
+#include "platform/LastError.h"
+#include "platform/Registry.h"
 #include <tessel/registry/WinRegistry.h>
 
 #include <atomic>
@@ -9,9 +11,6 @@
 #include <new>
 #include <string>
 #include <vector>
-
-#include "platform/LastError.h"
-#include "platform/Registry.h"
 
 namespace tessel {
 

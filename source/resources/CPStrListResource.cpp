@@ -1,10 +1,9 @@
-/* The member of CPStrList that needs the resource manager. */
+// The member of CPStrList that needs the resource manager.
+#include "strings/CPStrWalk.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/resources/ResourceManager.h>
 #include <tessel/streams/Endianizer.h>
 #include <tessel/strings/CPStrList.h>
-
-#include "strings/CPStrWalk.h"
 
 namespace tessel {
 CPStrList::CPStrList(UHandle resource) {

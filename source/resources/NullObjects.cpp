@@ -1,8 +1,7 @@
 #include "resources/NullObjects.h"
 
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "resources/ResFileLock.h"
+#include <tessel/diagnostics/DebugStream.h>
 
 namespace tessel {
 

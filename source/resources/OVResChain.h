@@ -2,13 +2,12 @@
 #ifndef TESSEL_SOURCE_RESOURCES_OVRESCHAIN_H
 #define TESSEL_SOURCE_RESOURCES_OVRESCHAIN_H
 
+#include "resources/ResFileLock.h"
 #include <tessel/memory/TrackedMallocFree.h>
 #include <tessel/resources/ovresfile.h>
 
 #include <utility>
 #include <vector>
-
-#include "resources/ResFileLock.h"
 
 namespace tessel {
 

@@ -2,15 +2,14 @@
 #ifndef TESSEL_SOURCE_RESOURCES_OVRESFILE_H
 #define TESSEL_SOURCE_RESOURCES_OVRESFILE_H
 
+#include "resources/OVResfileIO.h"
+#include "resources/ResourceData.h"
+#include "resources/ResourceMap.h"
 #include <tessel/memory/TrackedMallocFree.h>
 #include <tessel/resources/ovresfile.h>
 
 #include <memory>
 #include <vector>
-
-#include "resources/OVResfileIO.h"
-#include "resources/ResourceData.h"
-#include "resources/ResourceMap.h"
 
 namespace tessel {
 

@@ -1,14 +1,13 @@
 // Writing resource files back: the update, which also packs them, and the image of a whole file.
+#include "diagnostics/Guarded.h"
+#include "resources/OVResFile.h"
+#include "resources/ResFileLock.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
 
 #include <algorithm>
 #include <cstring>
 #include <limits>
-
-#include "diagnostics/Guarded.h"
-#include "resources/OVResFile.h"
-#include "resources/ResFileLock.h"
 
 namespace tessel {
 

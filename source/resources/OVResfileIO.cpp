@@ -1,5 +1,7 @@
 #include "resources/OVResfileIO.h"
 
+#include "files/FileSupport.h"
+#include "resources/ResFileLock.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/memory/MemoryManager.h>
@@ -9,9 +11,6 @@
 #include <atomic>
 #include <cstring>
 #include <limits>
-
-#include "files/FileSupport.h"
-#include "resources/ResFileLock.h"
 
 namespace tessel {
 

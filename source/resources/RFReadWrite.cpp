@@ -1,16 +1,14 @@
 // Readers and writers, and the strings and paths that resources hold.
-#include <tessel/resources/RFReadWrite.h>
-
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/memory/MemoryManager.h>
-#include <tessel/paths/PathManager.h>
-
-#include <cstring>
-#include <new>
-
 #include "diagnostics/Guarded.h"
 #include "resources/Refnums.h"
 #include "resources/ResFileLock.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/memory/MemoryManager.h>
+#include <tessel/paths/PathManager.h>
+#include <tessel/resources/RFReadWrite.h>
+
+#include <cstring>
+#include <new>
 
 namespace tessel {
 

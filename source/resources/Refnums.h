@@ -2,10 +2,9 @@
 #ifndef TESSEL_SOURCE_RESOURCES_REFNUMS_H
 #define TESSEL_SOURCE_RESOURCES_REFNUMS_H
 
-#include <tessel/resources/RFReadWrite.h>
-
 #include "diagnostics/Guarded.h"
 #include "resources/ResFileLock.h"
+#include <tessel/resources/RFReadWrite.h>
 
 namespace tessel {
 

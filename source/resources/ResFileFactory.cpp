@@ -1,4 +1,8 @@
 // Making resource files and chains of them.
+#include "diagnostics/Guarded.h"
+#include "resources/OVResChain.h"
+#include "resources/OVResFile.h"
+#include "resources/ResFileLock.h"
 #include <tessel/base/MGModule.h>
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/FileManager.h>
@@ -10,11 +14,6 @@
 #include <cstring>
 #include <memory>
 #include <vector>
-
-#include "diagnostics/Guarded.h"
-#include "resources/OVResChain.h"
-#include "resources/OVResFile.h"
-#include "resources/ResFileLock.h"
 
 namespace tessel {
 

@@ -1,11 +1,10 @@
 #include "resources/ResourceData.h"
 
+#include "diagnostics/Guarded.h"
 #include <tessel/memory/MemoryManager.h>
 
 #include <functional>
 #include <unordered_set>
-
-#include "diagnostics/Guarded.h"
 
 namespace tessel {
 

@@ -1,21 +1,19 @@
 // The flat interface: refnums for files and chains, and resources found by their data handles.
-#include <tessel/resources/ResourceManager.h>
-
-#include <tessel/base/OVExcept.h>
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/memory/CookieManager.h>
-#include <tessel/resources/RFReadWrite.h>
-#include <tessel/resources/ovresfile.h>
-
-#include <memory>
-#include <vector>
-
 #include "diagnostics/Guarded.h"
 #include "resources/NullObjects.h"
 #include "resources/OVResChain.h"
 #include "resources/Refnums.h"
 #include "resources/ResFileLock.h"
 #include "resources/Service.h"
+#include <tessel/base/OVExcept.h>
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/memory/CookieManager.h>
+#include <tessel/resources/RFReadWrite.h>
+#include <tessel/resources/ResourceManager.h>
+#include <tessel/resources/ovresfile.h>
+
+#include <memory>
+#include <vector>
 
 namespace tessel {
 

@@ -2,13 +2,12 @@
 #ifndef TESSEL_SOURCE_RESOURCES_RESOURCEMAP_H
 #define TESSEL_SOURCE_RESOURCES_RESOURCEMAP_H
 
+#include "resources/RsrcFormat.h"
 #include <tessel/base/MgErr.h>
 #include <tessel/base/StringTypes.h>
 #include <tessel/memory/TrackedMallocFree.h>
 
 #include <vector>
-
-#include "resources/RsrcFormat.h"
 
 namespace tessel {
 

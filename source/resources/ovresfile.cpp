@@ -1,20 +1,19 @@
 // Open resource files: opening, finding and loading, adding and removing.
-#include <tessel/resources/ovresfile.h>
+#include "resources/OVResFile.h"
 
+#include "diagnostics/Guarded.h"
+#include "resources/OVResChain.h"
+#include "resources/Refnums.h"
+#include "resources/ResFileLock.h"
 #include <tessel/base/MGAppInterface.h>
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathManager.h>
+#include <tessel/resources/ovresfile.h>
 
 #include <cstring>
 #include <new>
-
-#include "diagnostics/Guarded.h"
-#include "resources/OVResChain.h"
-#include "resources/OVResFile.h"
-#include "resources/Refnums.h"
-#include "resources/ResFileLock.h"
 
 namespace tessel {
 

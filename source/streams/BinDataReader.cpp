@@ -1,12 +1,10 @@
 // ReadPath stands with the paths (paths/BinDataPaths.cpp).
-#include <tessel/streams/BinDataReader.h>
-
-#include <tessel/memory/MemoryManager.h>
-
-#include <cstring>
-
 #include "diagnostics/Guarded.h"
 #include "streams/Padding.h"
+#include <tessel/memory/MemoryManager.h>
+#include <tessel/streams/BinDataReader.h>
+
+#include <cstring>
 
 namespace tessel {
 namespace {

@@ -1,13 +1,11 @@
 // WritePath stands with the paths (paths/BinDataPaths.cpp).
-#include <tessel/streams/BinDataWriter.h>
-
+#include "streams/Padding.h"
 #include <tessel/diagnostics/DebugStream.h>
+#include <tessel/streams/BinDataWriter.h>
 
 #include <algorithm>
 #include <bit>
 #include <cstring>
-
-#include "streams/Padding.h"
 
 namespace tessel {
 namespace {

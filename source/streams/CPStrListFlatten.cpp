@@ -1,13 +1,12 @@
-/* The members of CPStrList that need the streams. */
+// The members of CPStrList that need the streams.
+#include "strings/CPStrWalk.h"
+#include "strings/HandleOps.h"
 #include <tessel/streams/BinDataReader.h>
 #include <tessel/streams/BinDataWriter.h>
 #include <tessel/strings/CPStrList.h>
 #include <tessel/strings/StringCPStr.h>
 
 #include <cstring>
-
-#include "strings/CPStrWalk.h"
-#include "strings/HandleOps.h"
 
 namespace tessel {
 namespace {

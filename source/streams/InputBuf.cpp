@@ -1,7 +1,6 @@
-#include <tessel/streams/InputBuf.h>
-
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
+#include <tessel/streams/InputBuf.h>
 
 #include <algorithm>
 #include <new>

@@ -1,7 +1,6 @@
-#include <tessel/streams/OutputBuf.h>
-
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
+#include <tessel/streams/OutputBuf.h>
 
 #include <algorithm>
 #include <new>

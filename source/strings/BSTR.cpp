@@ -1,6 +1,5 @@
-#include <tessel/strings/BSTR.h>
-
 #include <tessel/memory/TrackedMallocFree.h>
+#include <tessel/strings/BSTR.h>
 
 #include <cstring>
 

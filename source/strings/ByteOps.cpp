@@ -10,7 +10,7 @@ namespace {
 constexpr uint64 kEveryByte = 0x0101010101010101u;
 constexpr uint64 kHighBits = 0x80 * kEveryByte;
 
-/* The bits in which eight bytes differ, without the case of ASCII letters. */
+// The bits in which eight bytes differ, without the case of ASCII letters.
 uint64 AsciiDifference(uint64 x, uint64 y) {
     const uint64 lower = (x | 0x20 * kEveryByte) & ~kHighBits;
     const uint64 fromA = lower + (0x80 - 'a') * kEveryByte;
@@ -31,7 +31,7 @@ __attribute__((target("avx2"))) __m256i LoadBlock(const uint8* bytes) {
     return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(bytes));
 }
 
-/* The bits in which two blocks differ, without the case of ASCII letters. */
+// The bits in which two blocks differ, without the case of ASCII letters.
 __attribute__((target("avx2"))) __m256i BlockDifference(const uint8* a, const uint8* b) {
     const __m256i caseBit = _mm256_set1_epi8(0x20);
     const __m256i toTheTop = _mm256_set1_epi8(0x7F - 'z');  // letters become the largest signed bytes
@@ -41,7 +41,7 @@ __attribute__((target("avx2"))) __m256i BlockDifference(const uint8* a, const ui
     return _mm256_andnot_si256(_mm256_and_si256(letters, caseBit), _mm256_xor_si256(x, LoadBlock(b)));
 }
 
-/* How many bytes, in whole blocks, do not differ. */
+// How many bytes, in whole blocks, do not differ.
 __attribute__((target("avx2"))) size_t EqualBlocks(const uint8* a, const uint8* b, size_t n) {
     size_t i = 0;
     for (; i + 4 * kBlock <= n; i += 4 * kBlock) {

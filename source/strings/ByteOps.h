@@ -1,17 +1,16 @@
-/* Comparing runs of bytes, the ground of every comparison in this folder. */
+// Comparing runs of bytes, the ground of every comparison in this folder.
 #ifndef TESSEL_STRINGS_BYTEOPS_H
 #define TESSEL_STRINGS_BYTEOPS_H
 
+#include "platform/CodePage.h"
 #include <tessel/base/Types.h>
 
 #include <bit>
 #include <cstring>
 
-#include "platform/CodePage.h"
-
 namespace tessel {
 
-/* Up to eight bytes as a word, the first lowest; what is missing is 0. */
+// Up to eight bytes as a word, the first lowest; what is missing is 0.
 inline uint64 LoadWord(const uint8* bytes, size_t n) {
     if (n >= sizeof(uint64)) {
         uint64 word;
@@ -29,7 +28,7 @@ inline uint64 LoadWord(const uint8* bytes, size_t n) {
     return bytes[0] | uint64{bytes[n / 2]} << 8 * (n / 2) | uint64{bytes[n - 1]} << 8 * (n - 1);
 }
 
-/* Index of the first byte for which difference(word of a, word of b) has bits set, or n. */
+// Index of the first byte for which difference(word of a, word of b) has bits set, or n.
 template <class Difference>
 size_t FirstDifferenceBy(const uint8* a, const uint8* b, size_t n, Difference difference) {
     for (size_t i = 0; i < n; i += sizeof(uint64)) {
@@ -39,15 +38,15 @@ size_t FirstDifferenceBy(const uint8* a, const uint8* b, size_t n, Difference di
     return n;
 }
 
-/* Index of the first byte in which the two differ, or n. */
+// Index of the first byte in which the two differ, or n.
 inline size_t FirstDifference(const uint8* a, const uint8* b, size_t n) {
     return FirstDifferenceBy(a, b, n, [](uint64 x, uint64 y) { return x ^ y; });
 }
 
-/* Index of the first byte in which the two differ when ASCII letters are taken without regard to case, or n. */
+// Index of the first byte in which the two differ when ASCII letters are taken without regard to case, or n.
 size_t FirstAsciiDifference(const uint8* a, const uint8* b, size_t n);
 
-/* The same where bytes do not differ that `lower` maps to the same; it must treat ASCII letters as usual. */
+// The same where bytes do not differ that `lower` maps to the same; it must treat ASCII letters as usual.
 template <class Lower>
 size_t FirstDifferenceMapped(const uint8* a, const uint8* b, size_t n, Lower lower) {
     size_t at = FirstAsciiDifference(a, b, n);
@@ -58,13 +57,13 @@ size_t FirstDifferenceMapped(const uint8* a, const uint8* b, size_t n, Lower low
     return at;
 }
 
-/* With the case of the active code page. */
+// With the case of the active code page.
 inline size_t FirstDifferenceNoCase(const uint8* a, const uint8* b, size_t n) {
     const platform::CodePageTables& page = platform::ActiveCodePage();
     return FirstDifferenceMapped(a, b, n, [&](uint8 byte) { return page.lower[byte]; });
 }
 
-/* The first difference of bytes, else of lengths. */
+// The first difference of bytes, else of lengths.
 inline int32 CompareBytes(const uint8* a, size_t aLength, const uint8* b, size_t bLength) {
     constexpr size_t kWorthACall = 32;
     const size_t n = aLength < bLength ? aLength : bLength;
@@ -82,8 +81,8 @@ inline int32 CompareBytesNoCase(const uint8* a, size_t aLength, const uint8* b, 
     return static_cast<int32>(aLength) - static_cast<int32>(bLength);
 }
 
-/* The classic ELF hash: one step for each character, which may be negative, from 0; then the result. What a step leaves
-   in the upper four bits is shifted out by the next. */
+// The classic ELF hash: one step for each character, which may be negative, from 0; then the result. What a step leaves
+// in the upper four bits is shifted out by the next.
 inline uint32 ElfHashStep(uint32 hash, int32 character) {
     hash = (hash << 4) + static_cast<uint32>(character);
     return hash ^ (hash >> 24 & 0xF0);

@@ -1,11 +1,9 @@
+#include "strings/CPStrWalk.h"
+#include "strings/HandleOps.h"
 #include <tessel/strings/CPStrList.h>
-
 #include <tessel/strings/StringCPStr.h>
 #include <tessel/strings/StringPStr.h>
 #include <tessel/strings/ovstring.h>
-
-#include "strings/CPStrWalk.h"
-#include "strings/HandleOps.h"
 
 namespace tessel {
 namespace {

@@ -1,4 +1,4 @@
-/* Going through the elements of a CPStr. Null is the empty list. */
+// Going through the elements of a CPStr. Null is the empty list.
 #ifndef TESSEL_STRINGS_CPSTRWALK_H
 #define TESSEL_STRINGS_CPSTRWALK_H
 
@@ -12,14 +12,14 @@ inline int32 ElementCount(const CPStr* list) {
     return list ? std::max(list->count, 0) : 0;
 }
 
-/* Where element i is, or would be: 0 <= i <= count. */
+// Where element i is, or would be: 0 <= i <= count.
 inline ConstPStr ElementAt(const CPStr* list, int32 i) {
     ConstPStr element = list->bytes;
     while (i-- > 0) element += element[0] + 1;
     return element;
 }
 
-/* How many of the elements that the count promises lie whole in a list of so many bytes. */
+// How many of the elements that the count promises lie whole in a list of so many bytes.
 inline int32 ElementsPresent(const CPStr* list, uint32 size) {
     const auto* bytes = reinterpret_cast<const uint8*>(list);
     uint64 offset = offsetof(CPStr, bytes);
@@ -31,7 +31,7 @@ inline int32 ElementsPresent(const CPStr* list, uint32 size) {
     return present;
 }
 
-/* The first result of compare(element of a, element of b) over n elements that is not 0, or 0. */
+// The first result of compare(element of a, element of b) over n elements that is not 0, or 0.
 template <class Compare>
 int32 CompareElements(const CPStr* a, const CPStr* b, int32 n, Compare compare) {
     if (n <= 0) return 0;
@@ -43,7 +43,7 @@ int32 CompareElements(const CPStr* a, const CPStr* b, int32 n, Compare compare) 
     return 0;
 }
 
-/* Over the common elements, then by the counts. */
+// Over the common elements, then by the counts.
 template <class Compare>
 int32 CompareLists(const CPStr* a, const CPStr* b, Compare compare) {
     const int32 aCount = ElementCount(a);
@@ -52,7 +52,7 @@ int32 CompareLists(const CPStr* a, const CPStr* b, Compare compare) {
     return result ? result : aCount - bCount;
 }
 
-/* Both lists have n elements, and equal(element of a, element of b) holds for the first n. */
+// Both lists have n elements, and equal(element of a, element of b) holds for the first n.
 template <class Equal>
 bool FirstElementsEqual(const CPStr* a, const CPStr* b, int32 n, Equal equal) {
     return ElementCount(a) >= n && ElementCount(b) >= n &&

@@ -1,23 +1,22 @@
-/* Digits of an unsigned integer: decimal ones two at a time, hexadecimal ones all at once. */
+// Digits of an unsigned integer: decimal ones two at a time, hexadecimal ones all at once.
 #ifndef TESSEL_STRINGS_DECIMALDIGITS_H
 #define TESSEL_STRINGS_DECIMALDIGITS_H
 
+#include "numerics/DecimalConversion.h"
 #include <tessel/base/Types.h>
 
 #include <array>
 #include <bit>
 #include <cstring>
 
-#include "numerics/DecimalConversion.h"
-
 namespace tessel {
 
 constexpr size_t kMaxDecimalDigits = 20;
 
-/* For the values of each bit width from 1: added to a value it brings the number of digits into the upper half. */
+// For the values of each bit width from 1: added to a value it brings the number of digits into the upper half.
 constexpr auto kDigitCounts = [] {
     std::array<uint64, 32> counts{};
-    size_t digits = 1; /* of the smallest value of that width */
+    size_t digits = 1;  // of the smallest value of that width
     for (size_t i = 0; i < counts.size(); ++i) {
         const uint64 smallest = uint64{1} << i;
         while (digits < 10 && smallest >= kPowersOfTen64[digits]) ++digits;
@@ -27,7 +26,7 @@ constexpr auto kDigitCounts = [] {
     return counts;
 }();
 
-/* "00" to "99" */
+// "00" to "99"
 constexpr auto kDigitPairs = [] {
     std::array<char, 200> pairs{};
     for (size_t i = 0; i < 100; ++i) {
@@ -37,19 +36,19 @@ constexpr auto kDigitPairs = [] {
     return pairs;
 }();
 
-/* At least 1. */
+// At least 1.
 inline size_t CountDecimalDigits(uint64 value) {
     if (value <= UINT32_MAX) {
         const auto small = static_cast<uint32>(value);
         return static_cast<size_t>((small + kDigitCounts[std::bit_width(small | 1u) - 1]) >> 32);
     }
-    const auto guess = static_cast<size_t>(std::bit_width(value) * 1233 >> 12); /* 1233 / 4096 is about log10(2) */
+    const auto guess = static_cast<size_t>(std::bit_width(value) * 1233 >> 12);  // 1233 / 4096 is about log10(2)
     return guess + (guess < kPowersOfTen64.size() && value >= kPowersOfTen64[guess]);
 }
 
-/* Writes the digits so that they end at `end`. */
+// Writes the digits so that they end at `end`.
 inline void WriteDecimalDigits(char* end, uint64 value) {
-    while (value > UINT32_MAX) { /* 64-bit division is slow on 32-bit hosts */
+    while (value > UINT32_MAX) {  // 64-bit division is slow on 32-bit hosts
         end -= 2;
         std::memcpy(end, &kDigitPairs[value % 100 * 2], 2);
         value /= 100;
@@ -67,7 +66,7 @@ inline void WriteDecimalDigits(char* end, uint64 value) {
     }
 }
 
-/* Writes a decimal integer, at most 20 characters, and returns where it ends. */
+// Writes a decimal integer, at most 20 characters, and returns where it ends.
 inline char* WriteDecimal(char* out, uint64 magnitude, bool negative) {
     *out = '-';
     char* const end = out + negative + CountDecimalDigits(magnitude);
@@ -75,7 +74,7 @@ inline char* WriteDecimal(char* out, uint64 magnitude, bool negative) {
     return end;
 }
 
-/* The eight hexadecimal digits of a value as bytes in memory order of a text, leading zeros included. */
+// The eight hexadecimal digits of a value as bytes in memory order of a text, leading zeros included.
 inline uint64 HexDigits(uint32 value) {
     constexpr uint64 kEveryByte = 0x0101010101010101;
     uint64 digits = value;

@@ -1,4 +1,4 @@
-/* The process-wide decimal point, for those who read it on every call. */
+// The process-wide decimal point, for those who read it on every call.
 #ifndef TESSEL_STRINGS_DECIMALPOINT_H
 #define TESSEL_STRINGS_DECIMALPOINT_H
 

@@ -1,7 +1,6 @@
-#include <tessel/strings/NumericText.h>
-
 #include "numerics/DecimalConversion.h"
 #include "numerics/NumericAccess.h"
+#include <tessel/strings/NumericText.h>
 
 namespace tessel {
 namespace {

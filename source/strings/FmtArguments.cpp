@@ -7,7 +7,7 @@
 namespace tessel {
 namespace {
 
-/* The table lies on the stack beside what callers hand in: a type that no conversion has must not be fetched. */
+// The table lies on the stack beside what callers hand in: a type that no conversion has must not be fetched.
 bool IsFetched(FmtArgType type) {
     switch (type) {
         case FmtArgType::kInt:

@@ -1,21 +1,20 @@
-/* The arguments of a formatting call: one after the other, or through the table of positional parameters. */
+// The arguments of a formatting call: one after the other, or through the table of positional parameters.
 #ifndef TESSEL_STRINGS_FMTARGUMENTS_H
 #define TESSEL_STRINGS_FMTARGUMENTS_H
 
+#include "strings/FmtSpec.h"
 #include <tessel/base/Types.h>
 
 #include <cstdarg>
 
-#include "strings/FmtSpec.h"
-
 namespace tessel {
 
-/* What a conversion takes from the argument list. The numbers are those of the reports. */
+// What a conversion takes from the argument list. The numbers are those of the reports.
 enum class FmtArgType : int32 {
     kNone = 0,
-    kInt = -1,     /* default integer or character */
-    kPointer = -2, /* text, handle, path, rectangle, typed value */
-    kPoint = -3,   /* two int16 in one int32 */
+    kInt = -1,      // default integer or character
+    kPointer = -2,  // text, handle, path, rectangle, typed value
+    kPoint = -3,    // two int16 in one int32
     kInt32 = 3,
     kInt64 = 4,
     kDouble = 10,
@@ -27,7 +26,7 @@ union FmtValue {
     const void* pointer;
 };
 
-/* A va_list that can be passed by reference on every host. */
+// A va_list that can be passed by reference on every host.
 struct FmtArgumentList {
     va_list list;
 };
@@ -50,8 +49,8 @@ public:
         return value;
     }
 
-    /* The table: cleared, told what each parameter is, filled once, then read. Record and Fetch report what is wrong
-       and give false. */
+    // The table: cleared, told what each parameter is, filled once, then read. Record and Fetch report what is wrong
+    // and give false.
     void ClearTable();
     bool Record(int32 position, FmtArgType type);
     bool Fetch();

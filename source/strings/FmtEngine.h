@@ -1,4 +1,4 @@
-/* The formatting engine, for callers that need to know whether the format was good. */
+// The formatting engine, for callers that need to know whether the format was good.
 #ifndef TESSEL_STRINGS_FMTENGINE_H
 #define TESSEL_STRINGS_FMTENGINE_H
 
@@ -13,17 +13,16 @@ constexpr int32 kFmtNoLimit = -1;
 
 struct Formatted {
     int32 length;
-    bool good; /* false: stopped, and reported, at what is wrong with the format */
+    bool good;  // false: stopped, and reported, at what is wrong with the format
 };
 
-/* As SPrintfv. */
+// As SPrintfv.
 Formatted FormatText(char* dst, int32 size, const char* format, int32 formatLength, va_list args);
 
-/* A formatted text in storage of its own, so that the arguments may lie in the text that it is to replace or to extend.
- */
+// A formatted text in storage of its own, so that the arguments may lie in the text that it is to replace or to extend.
 class FormattedText {
 public:
-    /* kMemFullErr when memory is short, kGenericErr when the arguments' texts changed meanwhile. */
+    // kMemFullErr when memory is short, kGenericErr when the arguments' texts changed meanwhile.
     MgErr Format(const char* format, size_t length, va_list args);
 
     const char* Bytes() const { return long_.empty() ? short_ : long_.data(); }
@@ -31,7 +30,7 @@ public:
 
 private:
     char short_[512];
-    std::string long_; /* what is too long for that */
+    std::string long_;  // what is too long for that
     size_t length_ = 0;
 };
 

@@ -1,4 +1,4 @@
-/* The conversions of the format language: what each prints and which argument it takes. */
+// The conversions of the format language: what each prints and which argument it takes.
 #ifndef TESSEL_STRINGS_FMTITEM_H
 #define TESSEL_STRINGS_FMTITEM_H
 
@@ -9,20 +9,20 @@ namespace tessel {
 
 enum class FmtItem : uint8 {
     kUnknown,
-    kSigned, /* the first of the numbers */
+    kSigned,  // the first of the numbers
     kUnsigned,
     kHex,
     kOctal,
     kBinary,
     kAddress,
     kExponential,
-    kFixed, /* the last of the numbers */
+    kFixed,  // the last of the numbers
     kCharacter,
     kPoint,
     kNamedPoint,
     kRectangle,
     kNamedRectangle,
-    kCString, /* the first of the texts */
+    kCString,  // the first of the texts
     kPString,
     kLString,
     kLHandle,

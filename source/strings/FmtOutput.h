@@ -1,25 +1,24 @@
-/* Where formatted text goes: at most so many bytes at an address, or nowhere, only counted. */
+// Where formatted text goes: at most so many bytes at an address, or nowhere, only counted.
 #ifndef TESSEL_STRINGS_FMTOUTPUT_H
 #define TESSEL_STRINGS_FMTOUTPUT_H
 
+#include "strings/DecimalDigits.h"
 #include <tessel/base/Types.h>
 
 #include <algorithm>
 #include <bit>
 #include <cstring>
 
-#include "strings/DecimalDigits.h"
-
 namespace tessel {
 
-/* GCC 12 warns of the branches that a constant length does not take, in instrumented builds. */
+// GCC 12 warns of the branches that a constant length does not take, in instrumented builds.
 #if defined(__GNUC__) && !defined(__clang__)
 #    pragma GCC diagnostic push
 #    pragma GCC diagnostic ignored "-Warray-bounds"
 #    pragma GCC diagnostic ignored "-Wstringop-overread"
 #endif
 
-/* Copies and fills of a few bytes without a call, which would cost more than the work. */
+// Copies and fills of a few bytes without a call, which would cost more than the work.
 inline void CopyFew(char* dst, const char* src, size_t n) {
     if (n > 16) {
         std::memcpy(dst, src, n);
@@ -67,15 +66,15 @@ inline void FillFew(char* dst, char byte, size_t n) {
 
 class FmtOutput {
 public:
-    /* A null dst counts. What goes beyond `limit` bytes is dropped. */
+    // A null dst counts. What goes beyond `limit` bytes is dropped.
     FmtOutput(char* dst, size_t limit) : dst_(dst), limit_(limit) {}
 
     size_t Used() const { return used_; }
     bool HasRoom() const { return used_ < limit_; }
     void Restart() { used_ = 0; }
 
-    /* Another output to the same place, and going on where that one is. Only the one word that changes is passed
-       between the two: a copy of all three is made by wider loads, which wait for the word that was just written. */
+    // Another output to the same place, and going on where that one is. Only the one word that changes is passed
+    // between the two: a copy of all three is made by wider loads, which wait for the word that was just written.
     FmtOutput Twin() const { return FmtOutput(dst_, limit_); }
     void Resume(const FmtOutput& twin) { used_ = twin.used_; }
 
@@ -113,7 +112,7 @@ public:
         Put(text + unused, static_cast<size_t>(kDigits - unused));
     }
 
-    /* The address of n bytes to be written by the caller, or null (then Put them). */
+    // The address of n bytes to be written by the caller, or null (then Put them).
     char* Take(size_t n) {
         if (!dst_ || n > limit_ - used_) return nullptr;
         char* place = dst_ + used_;

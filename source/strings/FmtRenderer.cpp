@@ -1,5 +1,8 @@
 #include "strings/FmtRenderer.h"
 
+#include "numerics/NumericAccess.h"
+#include "strings/NumericTextParts.h"
+#include "strings/PathText.h"
 #include <tessel/numerics/NumericSupport.h>
 #include <tessel/strings/NumericText.h>
 #include <tessel/strings/StringCStr.h>
@@ -7,23 +10,19 @@
 
 #include <cmath>
 
-#include "numerics/NumericAccess.h"
-#include "strings/NumericTextParts.h"
-#include "strings/PathText.h"
-
 namespace tessel {
 namespace {
 
-constexpr int32 kScratchSize = 256; /* no rendered number is longer */
+constexpr int32 kScratchSize = 256;  // no rendered number is longer
 constexpr int32 kAddressDigits = 8;
 
 constexpr int32 kMaxSignificantDigits = 17;
 constexpr int32 kDefaultSignificantDigits = 7;
-constexpr int32 kExponentWidth = 5; /* sign, point and exponent of the exponential form, left out of a given width */
+constexpr int32 kExponentWidth = 5;  // sign, point and exponent of the exponential form, left out of a given width
 constexpr int32 kDefaultDecimals = 6;
 constexpr int32 kMaxDecimals = 63;
-constexpr int32 kDefaultFixedLimit = 18; /* powers of ten that the fixed form shows when no width is given */
-constexpr int32 kSpecialTextLength = 3;  /* "NaN", "Inf" */
+constexpr int32 kDefaultFixedLimit = 18;  // powers of ten that the fixed form shows when no width is given
+constexpr int32 kSpecialTextLength = 3;   // "NaN", "Inf"
 
 LStrView TextOf(FmtItem item, const void* argument) {
     switch (item) {
@@ -67,7 +66,7 @@ int32 ExponentialCode(const FmtSpec& spec) {
     return std::min(digits, kMaxSignificantDigits);
 }
 
-/* |trunc(log10 |x|)| is at most `limit`. Mostly the power of two tells; x is finite and not 0. */
+// |trunc(log10 |x|)| is at most `limit`. Mostly the power of two tells; x is finite and not 0.
 bool PowerFits(RealParts x, int32 limit) {
     constexpr double kLog10Of2 = 0.301029995663981195;
     const auto fits = [limit](auto power) { return std::abs(static_cast<int32>(power)) <= limit; };
@@ -77,7 +76,7 @@ bool PowerFits(RealParts x, int32 limit) {
     return fits(std::log10(std::ldexp(static_cast<Extended>(x.mantissa), x.exponent)));
 }
 
-/* Whether the fixed form of a real shows it without more digits than are sensible. */
+// Whether the fixed form of a real shows it without more digits than are sensible.
 bool FixedFits(RealParts x, int32 limit) {
     if (x.kind != RealKind::kFinite) return limit >= kSpecialTextLength;
     if (x.mantissa == 0) return limit >= 1;
@@ -85,7 +84,7 @@ bool FixedFits(RealParts x, int32 limit) {
 }
 
 bool FixedFits(const void* value, int16 type, int32 limit) {
-    if (!value) return limit >= 1; /* a zero */
+    if (!value) return limit >= 1;  // a zero
     const ExtendedComplex parts = ReadNumber(type, value);
     const auto fits = [limit](Extended part) { return FixedFits(TakeApart(FromExtended(part)), limit); };
     return fits(parts.re) && (type < kNumComplexSingle || fits(parts.im));
@@ -123,7 +122,7 @@ void FmtRenderer::RenderOther(FmtItem item, const FmtSpec& spec, FmtValue value)
     }
 }
 
-// ---- numbers ----
+// ---- numbers --------------------------------------------------------------------------------------------------------
 
 void FmtRenderer::RenderNumber(FmtItem item, const FmtSpec& spec, FmtValue value) {
     FmtSpec shape = spec;
@@ -138,7 +137,7 @@ void FmtRenderer::RenderNumber(FmtItem item, const FmtSpec& spec, FmtValue value
     RenderInteger(item, shape, value.integer);
 }
 
-/* Everything but signed decimal: the bit pattern. */
+// Everything but signed decimal: the bit pattern.
 void FmtRenderer::RenderInteger(FmtItem item, const FmtSpec& spec, int64 value) {
     const bool wide = spec.size == FmtSize::kInt64 && item != FmtItem::kAddress;
     uint64 bits = wide ? static_cast<uint64>(value) : static_cast<uint32>(value);
@@ -155,7 +154,7 @@ void FmtRenderer::RenderInteger(FmtItem item, const FmtSpec& spec, int64 value) 
     PutNumber(spec, p, static_cast<size_t>(end - p));
 }
 
-/* For an output that has no room for all of it, or only counts. */
+// For an output that has no room for all of it, or only counts.
 void FmtRenderer::RenderDecimalInPieces(const FmtSpec& spec, uint64 magnitude, bool negative) {
     char text[kMaxDecimalDigits + 1];
     const size_t length = CountDecimalDigits(magnitude) + negative;
@@ -174,7 +173,7 @@ void FmtRenderer::RenderReal(FmtItem item, const FmtSpec& spec, double value) {
     PutNumber(spec, text, static_cast<size_t>(Terminate(text, kScratchSize, length)));
 }
 
-/* Numbers of a type that the format names. */
+// Numbers of a type that the format names.
 void FmtRenderer::RenderTyped(FmtItem item, const FmtSpec& spec, const void* value, int16 type) {
     int32 code = IntegerCode(item);
     if (item == FmtItem::kExponential) code = ExponentialCode(spec);
@@ -198,7 +197,7 @@ void FmtRenderer::PutNumber(const FmtSpec& spec, const char* text, size_t length
     }
 }
 
-// ---- characters, texts, points and rectangles ----
+// ---- characters, texts, points and rectangles -----------------------------------------------------------------------
 
 void FmtRenderer::RenderCharacter(const FmtSpec& spec, int32 value) {
     if (spec.width == 2 || spec.width == 4) {

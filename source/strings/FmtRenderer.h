@@ -1,12 +1,11 @@
-/* Renders the items of a formatting call. */
+// Renders the items of a formatting call.
 #ifndef TESSEL_STRINGS_FMTRENDERER_H
 #define TESSEL_STRINGS_FMTRENDERER_H
-
-#include <tessel/base/StringTypes.h>
 
 #include "strings/FmtItem.h"
 #include "strings/FmtOutput.h"
 #include "strings/LStrView.h"
+#include <tessel/base/StringTypes.h>
 
 namespace tessel {
 

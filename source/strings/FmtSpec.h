@@ -1,4 +1,4 @@
-/* One conversion specifier of the format language (tessel/strings/StringFmtPrint.h), and how it is read. */
+// One conversion specifier of the format language (tessel/strings/StringFmtPrint.h), and how it is read.
 #ifndef TESSEL_STRINGS_FMTSPEC_H
 #define TESSEL_STRINGS_FMTSPEC_H
 
@@ -9,33 +9,33 @@
 
 namespace tessel {
 
-enum class FmtSize : uint8 { kNone, kLong, kInt32, kInt64 }; /* nothing, "l", "I", "ll" */
+enum class FmtSize : uint8 { kNone, kLong, kInt32, kInt64 };  // nothing, "l", "I", "ll"
 
 constexpr int16 kFmtNoType = 0;
-constexpr int16 kFmtTypeFromArgument = -1; /* "{*}" */
+constexpr int16 kFmtTypeFromArgument = -1;  // "{*}"
 constexpr int32 kFmtNoPrecision = -1;
 constexpr int32 kFmtMaxPosition = 10;
 
 struct FmtSpec {
-    int32 position = 0; /* of the argument, from 1; 0 takes the next one */
+    int32 position = 0;  // of the argument, from 1; 0 takes the next one
     int32 width = 0;
     int32 precision = kFmtNoPrecision;
-    int16 type = kFmtNoType; /* numeric type code of a typed prefix */
+    int16 type = kFmtNoType;  // numeric type code of a typed prefix
     FmtSize size = FmtSize::kNone;
     bool left = false;
     char pad = ' ';
     char conversion = 0;
 };
 
-/* Reads a specifier, the cursor being behind its "%". */
+// Reads a specifier, the cursor being behind its "%".
 class FmtSpecReader {
 public:
     FmtSpecReader(const char* cursor, const char* end) : cursor_(cursor), end_(end) {}
 
     const char* Cursor() const { return cursor_; }
 
-    /* False when the specifier is cut off by the end, or its position or type prefix is none of the language's. Whether
-       there is such a conversion is not looked at. */
+    // False when the specifier is cut off by the end, or its position or type prefix is none of the language's. Whether
+    // there is such a conversion is not looked at.
     [[gnu::always_inline]] bool Read(FmtSpec& spec) {
         bool digits = ReadFlagsAndWidth(spec);
         if (digits && !spec.left && Peek() == '$') {
@@ -62,7 +62,7 @@ public:
 private:
     char Peek() const { return cursor_ < end_ ? *cursor_ : '\0'; }
 
-    /* Digits as a number that stops growing at the largest int32; whether there were any. */
+    // Digits as a number that stops growing at the largest int32; whether there were any.
     bool ReadNumber(int32& number) {
         const char* start = cursor_;
         int64 value = 0;
@@ -96,7 +96,7 @@ private:
         }
     }
 
-    /* "{" and "*" or two letters; the "}" may be left out. */
+    // "{" and "*" or two letters; the "}" may be left out.
     bool ReadType(FmtSpec& spec) {
         ++cursor_;
         if (Peek() == '*') {

@@ -1,4 +1,4 @@
-/* The bytes of a text, whatever holds it. */
+// The bytes of a text, whatever holds it.
 #ifndef TESSEL_STRINGS_LSTRVIEW_H
 #define TESSEL_STRINGS_LSTRVIEW_H
 
@@ -6,7 +6,7 @@
 
 namespace tessel {
 
-/* Null and a length below 0 are the empty text. Not to be kept while a handle is resized. */
+// Null and a length below 0 are the empty text. Not to be kept while a handle is resized.
 struct LStrView {
     LStrView(const LStr* text) : LStrView(text ? text->bytes : nullptr, text ? text->count : 0) {}
     LStrView(LStrHandle handle) : LStrView(handle ? *handle : nullptr) {}

@@ -1,16 +1,14 @@
 // Any number in any format: the format codes, engineering and SI notation, complex values.
-#include <tessel/strings/NumericText.h>
-
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/numerics/NumericSupport.h>
-
 #include "numerics/NumericAccess.h"
 #include "strings/NumericTextParts.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/numerics/NumericSupport.h>
+#include <tessel/strings/NumericText.h>
 
 namespace tessel {
 namespace {
 
-// ---- format codes --------------------------------------------------------------------------------------------------
+// ---- format codes ---------------------------------------------------------------------------------------------------
 
 enum class FormatClass { kInteger, kPolar, kExponential, kSI, kEngineering, kOther, kFixed, kUnknown };
 
@@ -60,7 +58,7 @@ int32 SetFormat(int32 code) {
     return kComplexOther;
 }
 
-// ---- integer formats -----------------------------------------------------------------------------------------------
+// ---- integer formats ------------------------------------------------------------------------------------------------
 
 // A number in an integer format: how its bits are to be read, and in which width.
 struct IntegerImage {
@@ -100,7 +98,7 @@ int32 RenderIntegerFormat(const void* value, int16 type, int32 code, char* buffe
     return NumToStr(image.bits & (~uint64{0} >> (64 - image.width)), false, RadixOf(code), buffer, size);
 }
 
-// ---- engineering and SI notation -----------------------------------------------------------------------------------
+// ---- engineering and SI notation ------------------------------------------------------------------------------------
 
 constexpr int32 kLargestPrefix = 24;
 constexpr char kPrefixes[] = "yzafpnum kMGTPEZY";  // of 10^-24, 10^-21, ... 10^24; 10^0 has none
@@ -212,7 +210,7 @@ int32 RenderScaled(const RealSource& source, bool isSI, int32 decimals, char* bu
     return out.Length();
 }
 
-// ---- reals and complex values --------------------------------------------------------------------------------------
+// ---- reals and complex values ---------------------------------------------------------------------------------------
 
 int32 RenderPart(const RealSource& source, int32 code, char* buffer, int32 size, char decimalPoint, int32* slot) {
     switch (Classify(code)) {

@@ -1,9 +1,8 @@
+#include "numerics/NumericAccess.h"
+#include "strings/NumericTextParts.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/numerics/NumericSupport.h>
 #include <tessel/strings/NumericText.h>
-
-#include "numerics/NumericAccess.h"
-#include "strings/NumericTextParts.h"
 
 namespace tessel {
 namespace {

@@ -1,11 +1,10 @@
 // Text to numbers: reals into decimal records, integers in any radix.
-#include <array>
-#include <limits>
-
-#include <tessel/strings/NumericText.h>
-
 #include "numerics/NumericAccess.h"
 #include "strings/NumericTextParts.h"
+#include <tessel/strings/NumericText.h>
+
+#include <array>
+#include <limits>
 
 namespace tessel {
 namespace {
@@ -14,7 +13,7 @@ bool IsDigit(char c) {
     return c >= '0' && c <= '9';
 }
 
-// ---- reals ---------------------------------------------------------------------------------------------------------
+// ---- reals ----------------------------------------------------------------------------------------------------------
 
 constexpr int32 kMostExponentDigits = 4;
 constexpr int32 kLargestExponent = 32765;  // of a finite record
@@ -221,7 +220,7 @@ private:
     bool exponentNegative_ = false;
 };
 
-// ---- integers ------------------------------------------------------------------------------------------------------
+// ---- integers -------------------------------------------------------------------------------------------------------
 
 constexpr uint8 kNoDigit = 0xFF;
 

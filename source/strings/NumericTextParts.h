@@ -1,19 +1,18 @@
-/* Pieces that the numeric text files share. */
+// Pieces that the numeric text files share.
 #pragma once
+
+#include "numerics/DecimalConversion.h"
+#include "strings/DecimalDigits.h"
+#include <tessel/base/NumericTypes.h>
 
 #include <algorithm>
 #include <cstring>
 
-#include <tessel/base/NumericTypes.h>
-
-#include "numerics/DecimalConversion.h"
-#include "strings/DecimalDigits.h"
-
 namespace tessel {
 
-// ---- digits ----
+// ---- digits ---------------------------------------------------------------------------------------------------------
 
-/* The digits of a real, most significant first, with zeros after them: what is copied may run past the last digit. */
+// The digits of a real, most significant first, with zeros after them: what is copied may run past the last digit.
 struct DigitText {
     static constexpr int32 kDigits = 24;
     static constexpr int32 kZeros = 24;
@@ -40,9 +39,9 @@ private:
     }
 };
 
-// ---- bounded output ----
+// ---- bounded output -------------------------------------------------------------------------------------------------
 
-/* Appends to a buffer and drops what does not fit. */
+// Appends to a buffer and drops what does not fit.
 class TextOut {
 public:
     TextOut(char* buffer, int32 size) : begin_(buffer), at_(buffer), end_(buffer + std::max(size, int32{0})) {}
@@ -62,7 +61,7 @@ public:
         std::memset(at_, c, fitting);
         at_ += fitting;
     }
-    /* Digits from the `from`-th on, zeros after the last. */
+    // Digits from the `from`-th on, zeros after the last.
     void PutDigits(const DigitText& digits, int32 from, int32 length) {
         constexpr int32 kChunk = DigitText::kZeros;
         if (length <= kChunk && from <= digits.count && Room() >= static_cast<size_t>(kChunk)) {
@@ -86,13 +85,13 @@ private:
     char* end_;
 };
 
-/* "E", the sign and the digits of an exponent. Returns the length, at most kExponentTextSize. */
+// "E", the sign and the digits of an exponent. Returns the length, at most kExponentTextSize.
 inline constexpr int32 kExponentTextSize = 12;
 int32 WriteExponent(int32 exponent, char* out);
 
-// ---- reals ----
+// ---- reals ----------------------------------------------------------------------------------------------------------
 
-/* A real as decimal digits: d.ddd times ten to `lead`. */
+// A real as decimal digits: d.ddd times ten to `lead`.
 struct RealText {
     RealKind kind;
     bool negative;
@@ -100,28 +99,28 @@ struct RealText {
     DigitText digits;
 };
 
-/* What is rendered: a real, or an integer that is rendered exactly. */
+// What is rendered: a real, or an integer that is rendered exactly.
 struct RealSource {
     RealParts parts;
     bool isInteger;
     uint64 magnitude;  // of an integer; its sign is in parts
 };
 
-/* Renders a real with an exponential code (k > 0) or a fixed one (k <= 0). Not terminated. Returns the length, which is
-   `size` when the text was cut. */
+// Renders a real with an exponential code (k > 0) or a fixed one (k <= 0). Not terminated. Returns the length, which is
+// `size` when the text was cut.
 int32 FormatReal(const RealText& text, int32 k, char* buffer, int32 size, char decimalPoint);
 int32 RenderReal(const RealSource& source, int32 k, char* buffer, int32 size, char decimalPoint);
 
-/* Terminates a rendering of that length; one that fills the buffer was cut, which is reported. Returns the length. */
+// Terminates a rendering of that length; one that fills the buffer was cut, which is reported. Returns the length.
 int32 Terminate(char* buffer, int32 size, int32 length);
 
-// ---- integers ----
+// ---- integers -------------------------------------------------------------------------------------------------------
 
 inline constexpr int32 kLongestDecimal = 20;  // of 64 bits, or of 63 and a sign
 
-/* Renders an integer, terminated; a minus sign stands before the magnitude of a negative one. What does not fit is cut
-   at the front: that is reported, or tells `complete` where it is given. Returns the length; 0 for a radix other than
-   2, 8, 10 and 16. */
+// Renders an integer, terminated; a minus sign stands before the magnitude of a negative one. What does not fit is cut
+// at the front: that is reported, or tells `complete` where it is given. Returns the length; 0 for a radix other than
+// 2, 8, 10 and 16.
 int32 NumToStr(uint64 magnitude, bool negative, int32 radix, char* buffer, int32 size, bool* complete = nullptr);
 
 }  // namespace tessel

@@ -1,10 +1,9 @@
 // Decimal records and reals, exponential and fixed.
-#include <atomic>
-
+#include "strings/NumericTextParts.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/strings/NumericText.h>
 
-#include "strings/NumericTextParts.h"
+#include <atomic>
 
 namespace tessel {
 namespace {
@@ -22,7 +21,7 @@ CStr SpecialText(RealKind kind) {
     return (kind == RealKind::kNaN ? gNaNText : gInfText).load(std::memory_order_relaxed);
 }
 
-// ---- digits to text ----
+// ---- digits to text -------------------------------------------------------------------------------------------------
 
 void PutExponential(const RealText& text, int32 k, char decimalPoint, TextOut& out) {
     if (text.lead < kLeastLead) {
@@ -65,7 +64,7 @@ RealText RoundToText(RealParts parts, int32 k) {
     return text;
 }
 
-// ---- integers ----
+// ---- integers -------------------------------------------------------------------------------------------------------
 
 // The digits cut to k of them, the last one rounded half up; a carry out of the first raises the exponent.
 RealText CutInteger(uint64 magnitude, int32 k) {
@@ -101,7 +100,7 @@ int32 RenderInteger(const RealSource& source, int32 k, char* buffer, int32 size,
     return out.Length();
 }
 
-// ---- records ----
+// ---- records --------------------------------------------------------------------------------------------------------
 
 uint8 Nibble(const PackedDecimal& record, int32 index) {
     return (record.mantissa[index / 2] >> (index % 2 == 0 ? 0 : 4)) & 15;

@@ -1,13 +1,11 @@
-#include <tessel/strings/StringCLStr.h>
-
+#include "strings/HandleOps.h"
+#include "strings/LStrView.h"
 #include <tessel/diagnostics/DebugStream.h>
+#include <tessel/strings/StringCLStr.h>
 #include <tessel/strings/StringLStr.h>
 
 #include <algorithm>
 #include <cstring>
-
-#include "strings/HandleOps.h"
-#include "strings/LStrView.h"
 
 using namespace tessel;
 
@@ -16,7 +14,7 @@ namespace {
 constexpr uint32 kEmptyListSize = offsetof(CLStr, bytes);
 constexpr uint32 kAlignment = 4;
 
-/* What an element of so many bytes takes up. */
+// What an element of so many bytes takes up.
 uint32 ElementSize(size_t length) {
     return (LStrSize(length) + kAlignment - 1) / kAlignment * kAlignment;
 }
@@ -25,7 +23,7 @@ int32 ElementCount(const CLStr* list) {
     return std::max(list->count, 0);
 }
 
-/* Where element i stands, or would stand, in the list: 0 <= i <= count. */
+// Where element i stands, or would stand, in the list: 0 <= i <= count.
 uint32 OffsetOf(const CLStr* list, int32 i) {
     uint32 offset = kEmptyListSize;
     const auto* start = reinterpret_cast<const uint8*>(list);
@@ -41,7 +39,7 @@ int32 ClampToElement(const CLStr* list, int32 i) {
     return std::clamp(i, 0, std::max(ElementCount(list) - 1, 0));
 }
 
-/* The element may lie in the list. */
+// The element may lie in the list.
 MgErr InsertAt(CLStrHandle list, LStrView element, uint32 offset, bool exact) {
     const uint32 size = ElementSize(element.length);
     const uint32 listSize = CLStrSize(*list);
@@ -57,7 +55,7 @@ MgErr InsertAt(CLStrHandle list, LStrView element, uint32 offset, bool exact) {
     return kNoErr;
 }
 
-/* Brings the number at `at` into host order. */
+// Brings the number at `at` into host order.
 uint32 StdToHost(uint8* at) {
     const uint32 value = uint32{at[0]} << 24 | uint32{at[1]} << 16 | uint32{at[2]} << 8 | at[3];
     std::memcpy(at, &value, sizeof value);

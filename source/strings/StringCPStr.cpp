@@ -1,12 +1,10 @@
-#include <tessel/strings/StringCPStr.h>
-
+#include "strings/CPStrWalk.h"
+#include "strings/HandleOps.h"
 #include <tessel/diagnostics/DebugStream.h>
+#include <tessel/strings/StringCPStr.h>
 #include <tessel/strings/StringPStr.h>
 
 #include <cstring>
-
-#include "strings/CPStrWalk.h"
-#include "strings/HandleOps.h"
 
 using namespace tessel;
 
@@ -66,7 +64,7 @@ MgErr CPStrInsertEfficient(CPStrHandle list, ConstPStr element, int32 index, boo
         TESSEL_REPORT(kDebugError, 0x0D5CB872u) << "Bad inputs to CPStrInsertEfficient";
         return kGenericErr;
     }
-    Str255 inserted; /* the element may lie in the list */
+    Str255 inserted;  // the element may lie in the list
     PStrCpy(inserted, element);
     const int32 count = ElementCount(*list);
     const uint32 offset = OffsetOf(*list, std::clamp(index, 0, count));
@@ -87,7 +85,7 @@ MgErr CPStrRemove(CPStrHandle list, int32 index) {
 
 MgErr CPStrReplace(CPStrHandle list, ConstPStr element, int32 index) {
     if (!list || !element || ElementCount(*list) == 0) return kArgErr;
-    Str255 replacement; /* the element may lie in the list */
+    Str255 replacement;  // the element may lie in the list
     PStrCpy(replacement, element);
     const HandleRange replaced = {CPStrSize(*list), OffsetOf(*list, ClampToElement(*list, index)),
                                   CPStrIndex(list, index)[0] + 1u};

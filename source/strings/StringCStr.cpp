@@ -1,12 +1,10 @@
-#include <tessel/strings/StringCStr.h>
-
-#include <algorithm>
-
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"
 #include "strings/DecimalPoint.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/strings/StringCStr.h>
+
+#include <algorithm>
 
 using namespace tessel;
 
@@ -22,14 +20,14 @@ const uint8* Bytes(CStr s) {
     return reinterpret_cast<const uint8*>(s);
 }
 
-/* Bytes before the terminator, at most n. Reads no byte behind the terminator. */
+// Bytes before the terminator, at most n. Reads no byte behind the terminator.
 size_t LengthUpTo(CStr s, int32 n) {
     if (n <= 0 || !s) return 0;
     const void* terminator = std::memchr(s, 0, static_cast<size_t>(n));
     return terminator ? static_cast<size_t>(static_cast<CStr>(terminator) - s) : static_cast<size_t>(n);
 }
 
-/* The rule for texts of which one is the beginning of the other; `next` is the byte of b there. */
+// The rule for texts of which one is the beginning of the other; `next` is the byte of b there.
 int32 CompareEnds(size_t aLength, size_t bLength, int32 next) {
     if (aLength == bLength) return 0;
     return aLength < bLength ? -next : 1;
@@ -53,7 +51,7 @@ bool IsBlank(char c) {
     return c == ' ' || c == '\t';
 }
 
-/* Whether pattern stands at s, the blanks of s left out. */
+// Whether pattern stands at s, the blanks of s left out.
 bool MatchesWithoutBlanks(CStr s, CStr pattern) {
     while (*pattern) {
         while (IsBlank(*s)) ++s;
@@ -72,7 +70,7 @@ bool IsByte(int32 c) {
 
 }  // namespace
 
-// ---- length and copying ----
+// ---- length and copying ---------------------------------------------------------------------------------------------
 
 int32 StrLen(CStr s) {
     return static_cast<int32>(std::strlen(TextOf(s)));
@@ -99,7 +97,7 @@ int32 StrCat(char* dst, CStr src) {
     return static_cast<int32>(dstLength + srcLength);
 }
 
-// ---- comparison ----
+// ---- comparison -----------------------------------------------------------------------------------------------------
 
 int32 StrCmp(CStr a, CStr b) {
     a = TextOf(a);
@@ -133,7 +131,7 @@ bool StrNCaseEqual(CStr a, CStr b, int32 n) {
     return StrNCaseCmp(a, b, n) == 0;
 }
 
-// ---- searching ----
+// ---- searching ------------------------------------------------------------------------------------------------------
 
 char* StrChr(CStr s, int32 c) {
     const char sought = static_cast<char>(c);
@@ -152,7 +150,7 @@ bool StrIStr(CStr s, CStr pattern) {
     return false;
 }
 
-// ---- case and stepping ----
+// ---- case and stepping ----------------------------------------------------------------------------------------------
 
 void StrToUpper(char* s, int32 len) {
     if (len > 0 && s) platform::UpperText(s, static_cast<size_t>(len));
@@ -175,7 +173,7 @@ int32 StrPrevChar(CStr s, int32 index) {
     return static_cast<int32>(platform::PrevChar(s, s + index) - s);
 }
 
-// ---- characters ----
+// ---- characters -----------------------------------------------------------------------------------------------------
 
 bool IsDigit(int32 c) {
     return c >= '0' && c <= '9';
@@ -209,7 +207,7 @@ char HexChar(int32 n) {
     return "0123456789ABCDEF"[n & 15];
 }
 
-// ---- decimal point ----
+// ---- decimal point --------------------------------------------------------------------------------------------------
 
 uint8 StrGetDecimalPoint(void) {
     return g_decimalPoint;

@@ -1,10 +1,3 @@
-#include <tessel/strings/StringFmtPrint.h>
-
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/strings/StringFmtScan.h>
-
-#include <bit>
-
 #include "diagnostics/Guarded.h"
 #include "numerics/NumericAccess.h"
 #include "platform/CodePage.h"
@@ -13,6 +6,11 @@
 #include "strings/FmtOutput.h"
 #include "strings/FmtRenderer.h"
 #include "strings/HandleOps.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/strings/StringFmtPrint.h>
+#include <tessel/strings/StringFmtScan.h>
+
+#include <bit>
 
 using namespace tessel;
 
@@ -22,7 +20,7 @@ constexpr int32 kMaxPStr = 255;
 constexpr char kCarriageReturn = 13;
 constexpr uint8 kLineFeed = 10;
 
-/* Whether one of the eight bytes is "%" or a backslash: the lowest bit set stands in the first of them. */
+// Whether one of the eight bytes is "%" or a backslash: the lowest bit set stands in the first of them.
 uint64 SpecialBytes(uint64 word) {
     constexpr uint64 kOnes = 0x0101010101010101u;
     constexpr uint64 kHighs = 0x8080808080808080u;
@@ -35,7 +33,7 @@ bool IsSpecial(char c) {
     return c == '%' || c == '\\';
 }
 
-/* The first "%" or backslash, or end. */
+// The first "%" or backslash, or end.
 const char* FindSpecial(const char* p, const char* end) {
     for (; static_cast<size_t>(end - p) >= sizeof(uint64); p += sizeof(uint64)) {
         uint64 word;
@@ -46,13 +44,13 @@ const char* FindSpecial(const char* p, const char* end) {
     return p;
 }
 
-/* The same in a page whose characters may hold such bytes. */
+// The same in a page whose characters may hold such bytes.
 const char* FindSpecialByCharacters(const char* p, const char* end) {
     while (p < end && !IsSpecial(*p)) p += platform::CharLength(p, end);
     return p;
 }
 
-/* One formatting call. */
+// One formatting call.
 class Formatter {
 public:
     Formatter(FmtOutput output, const char* format, size_t length, FmtArgumentList& args)
@@ -61,7 +59,7 @@ public:
         byCharacters_ = page.multiByte && !page.utf8;
     }
 
-    /* The bytes that were, or would be, written, and whether the format was good. */
+    // The bytes that were, or would be, written, and whether the format was good.
     Formatted Run() {
         bool good = Pass();
         if (good && mode_ == Mode::kPositional) {
@@ -95,12 +93,12 @@ private:
     const char* cursor_ = nullptr;
     uint8 decimalPoint_ = 0;
     bool byCharacters_;
-    bool recording_ = false; /* the first pass over a format with positional parameters */
+    bool recording_ = false;  // the first pass over a format with positional parameters
     Mode mode_ = Mode::kUndecided;
 };
 
-/* Goes over the format once. While recording, the text between the specifiers is written and then overwritten. Cursor
-   and output are kept in registers for what is most frequent: plain text and specifiers of one letter. */
+// Goes over the format once. While recording, the text between the specifiers is written and then overwritten. Cursor
+// and output are kept in registers for what is most frequent: plain text and specifiers of one letter.
 bool Formatter::Pass() {
     const char* p = start_;
     FmtOutput output = output_.Twin();
@@ -128,7 +126,7 @@ bool Formatter::Pass() {
     return true;
 }
 
-/* Does what is most frequent; false for everything else. Inlined, so that the output stays in registers. */
+// Does what is most frequent; false for everything else. Inlined, so that the output stays in registers.
 [[gnu::always_inline]] inline bool Formatter::PlainConversion(const char* p, FmtOutput& output) {
     if (*p != '%' || end_ - p < 2 || mode_ == Mode::kPositional) return false;
     if (p[1] == 'd' || p[1] == 'u') {
@@ -150,7 +148,7 @@ bool Formatter::Pass() {
 void Formatter::Escape() {
     const char* next = cursor_ + 1;
     if (byCharacters_ && next < end_ && platform::CharLength(next, end_) > 1) {
-        cursor_ = next; /* an escaped character of several bytes is itself, whole */
+        cursor_ = next;  // an escaped character of several bytes is itself, whole
         return;
     }
     const uint8 byte = ScanForBackslash(&cursor_, end_);
@@ -174,7 +172,7 @@ bool Formatter::Specifier() {
     return ChooseMode(spec) && Convert(spec);
 }
 
-/* All specifiers are ordinary or all are positional. */
+// All specifiers are ordinary or all are positional.
 bool Formatter::ChooseMode(const FmtSpec& spec) {
     const Mode mode = spec.position ? Mode::kPositional : Mode::kOrdinary;
     if (mode_ == mode) return true;
@@ -266,7 +264,7 @@ MgErr FormattedText::Format(const char* format, size_t length, va_list args) {
     return Guarded([&]() -> MgErr {
         const size_t needed = run(nullptr, 0);
         if (needed > INT32_MAX - LStrSize(1)) return kMemFullErr;
-        long_.resize(needed + 1); /* one more, which shows that the text has grown */
+        long_.resize(needed + 1);  // one more, which shows that the text has grown
         length_ = run(long_.data(), needed + 1);
         return length_ == needed ? kNoErr : kGenericErr;
     });

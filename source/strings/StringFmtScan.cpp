@@ -1,6 +1,5 @@
-#include <tessel/strings/StringFmtScan.h>
-
 #include <tessel/strings/StringCStr.h>
+#include <tessel/strings/StringFmtScan.h>
 
 namespace {
 
@@ -12,7 +11,7 @@ int32 HexDigit(char c) {
     return kNotHex;
 }
 
-/* What a backslash and this byte stand for when it is no hexadecimal digit. */
+// What a backslash and this byte stand for when it is no hexadecimal digit.
 uint8 EscapedByte(char c) {
     switch (c) {
         case 'b':

@@ -1,13 +1,11 @@
-#include <tessel/strings/StringLStr.h>
-
-#include <algorithm>
-
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"
 #include "strings/HandleOps.h"
 #include "strings/LStrView.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/strings/StringLStr.h>
+
+#include <algorithm>
 
 using namespace tessel;
 
@@ -33,7 +31,7 @@ bool Equal(LStrView a, LStrView b) {
     return a.length == b.length && (a.length == 0 || std::memcmp(a.bytes, b.bytes, a.length) == 0);
 }
 
-/* The order of two texts of which one is null: it is below every text that is not empty. */
+// The order of two texts of which one is null: it is below every text that is not empty.
 int32 CompareNull(LStrView a, LStrView b) {
     return (a.length != 0) - (b.length != 0);
 }
@@ -44,7 +42,7 @@ int32 Store(const void* bytes, size_t length, LStrPtr dst) {
     return dst->count = static_cast<int32>(length);
 }
 
-/* Copies as much as `size` takes with its terminator. */
+// Copies as much as `size` takes with its terminator.
 size_t CopyTerminated(LStrView src, char* dst, uint32 size) {
     if (size == 0 || !dst) return 0;
     const size_t length = std::min<size_t>(src.length, size - 1);
@@ -53,13 +51,13 @@ size_t CopyTerminated(LStrView src, char* dst, uint32 size) {
     return length;
 }
 
-/* Where bytes lie in the handle's own block, which may move when it is resized; false for bytes outside it. */
+// Where bytes lie in the handle's own block, which may move when it is resized; false for bytes outside it.
 bool OffsetInBlock(LStrHandle handle, const void* bytes, size_t* offset) {
     *offset = reinterpret_cast<uintptr_t>(bytes) - reinterpret_cast<uintptr_t>(*handle);
     return *offset < LStrSize(LStrView(*handle).length);
 }
 
-/* Appends bytes, which may lie in the handle's own block. */
+// Appends bytes, which may lie in the handle's own block.
 MgErr Append(LStrHandle dst, const uint8* bytes, size_t n, bool exact) {
     const size_t count = LStrView(*dst).length;
     size_t offset = 0;
@@ -83,7 +81,7 @@ MgErr AppendOrCreate(LStrHandle* dst, const void* bytes, size_t n) {
 
 }  // namespace
 
-// ---- comparison ----
+// ---- comparison -----------------------------------------------------------------------------------------------------
 
 int32 LStrCmp(const LStr* a, const LStr* b) {
     return a && b ? Compare(a, b) : CompareNull(a, b);
@@ -127,7 +125,7 @@ int32 PLStrCaseCmp(ConstPStr a, const LStr* b) {
     return CompareNoCase(ViewOf(a), b);
 }
 
-// ---- into and out of the caller's buffers ----
+// ---- into and out of the caller's buffers ---------------------------------------------------------------------------
 
 int32 CToLStr(CStr src, LStrPtr dst) {
     return Store(src, src ? std::strlen(src) : 0, dst);
@@ -169,7 +167,7 @@ int32 LToPStr(const LStr* src, PStr dst) {
     return dst[0] = static_cast<uint8>(length);
 }
 
-// ---- into handles ----
+// ---- into handles ---------------------------------------------------------------------------------------------------
 
 MgErr LStrFromPtr(LStrHandle* handle, int32 length, const void* src) {
     if (!handle || length < 0) return kArgErr;
@@ -209,7 +207,7 @@ MgErr PStrToDSLStr(ConstPStr src, LStrHandle* handle) {
     return PToLHStr(src, handle);
 }
 
-// ---- editing in a handle ----
+// ---- editing in a handle --------------------------------------------------------------------------------------------
 
 MgErr LStrCat(LStrHandle dst, const LStr* src) {
     const LStrView text(src);

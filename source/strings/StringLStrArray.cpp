@@ -1,14 +1,12 @@
-#include <tessel/strings/StringLStrArray.h>
-
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/strings/StringCPStr.h>
-#include <tessel/strings/StringLStr.h>
-
-#include <cstring>
-
 #include "strings/CPStrWalk.h"
 #include "strings/HandleOps.h"
 #include "strings/LStrView.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/strings/StringCPStr.h>
+#include <tessel/strings/StringLStr.h>
+#include <tessel/strings/StringLStrArray.h>
+
+#include <cstring>
 
 using namespace tessel;
 

@@ -1,3 +1,9 @@
+#include "diagnostics/Guarded.h"
+#include "platform/Debugger.h"
+#include "platform/DriveTable.h"
+#include "platform/Mutex.h"
+#include <tessel/diagnostics/FileLoc.h>
+#include <tessel/strings/StringFmtPrint.h>
 #include <tessel/strings/StringOutput.h>
 
 #include <algorithm>
@@ -5,14 +11,6 @@
 #include <cstring>
 #include <new>
 #include <string>
-
-#include <tessel/diagnostics/FileLoc.h>
-#include <tessel/strings/StringFmtPrint.h>
-
-#include "diagnostics/Guarded.h"
-#include "platform/Debugger.h"
-#include "platform/DriveTable.h"
-#include "platform/Mutex.h"
 
 namespace tessel {
 namespace {

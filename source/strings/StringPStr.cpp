@@ -1,12 +1,10 @@
+#include "platform/CodePage.h"
+#include "strings/ByteOps.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/memory/MemoryManager.h>
 #include <tessel/strings/StringPStr.h>
 
 #include <algorithm>
-
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/memory/MemoryManager.h>
-
-#include "platform/CodePage.h"
-#include "strings/ByteOps.h"
 
 using namespace tessel;
 
@@ -32,7 +30,7 @@ char* Chars(uint8* bytes) {
     return reinterpret_cast<char*>(bytes);
 }
 
-/* A PStr that is being put together. */
+// A PStr that is being put together.
 class PStrBuilder {
 public:
     bool Add(const void* bytes, size_t n) {
@@ -47,7 +45,7 @@ private:
     Str255 text_ = {0};
 };
 
-/* Puts src with its replacements into `result`; false when that has no room. */
+// Puts src with its replacements into `result`; false when that has no room.
 bool ReplaceAll(ConstPStr src, CStr find, CStr replacement, PStrBuilder& result, bool& found) {
     const size_t findLength = std::strlen(find);
     const size_t replacementLength = std::strlen(replacement);
@@ -67,7 +65,7 @@ bool ReplaceAll(ConstPStr src, CStr find, CStr replacement, PStrBuilder& result,
 
 }  // namespace
 
-// ---- copying ----
+// ---- copying --------------------------------------------------------------------------------------------------------
 
 PStr PStrCpy(PStr dst, ConstPStr src) {
     if (dst) std::memmove(dst, TextOf(src), TextOf(src)[0] + size_t{1});
@@ -133,7 +131,7 @@ int32 PStrTerminateIfPossible(PStr s) {
     return s[0];
 }
 
-// ---- comparison ----
+// ---- comparison -----------------------------------------------------------------------------------------------------
 
 int32 PStrCmp(ConstPStr a, ConstPStr b) {
     a = TextOf(a);
@@ -175,7 +173,7 @@ bool PPStrCaseEqual(const ConstPStr* a, const ConstPStr* b) {
     return PStrCaseEqual(Pointee(a), Pointee(b));
 }
 
-// ---- searching and splitting ----
+// ---- searching and splitting ----------------------------------------------------------------------------------------
 
 int32 PStrInPStr(ConstPStr s, int32 start, ConstPStr pattern) {
     if (start < 0 || !s || TextOf(pattern)[0] == 0) return -1;
@@ -229,7 +227,7 @@ bool PStrFindReplace(PStr dst, ConstPStr src, CStr find, CStr replacement) {
     return found;
 }
 
-// ---- hashing ----
+// ---- hashing --------------------------------------------------------------------------------------------------------
 
 int32 PStrHash32(ConstPStr s, bool caseInsensitive) {
     if (!s) return 0;

@@ -1,18 +1,16 @@
-#include <tessel/strings/StringUtils.h>
-
-#include <tessel/strings/StringLStr.h>
-#include <tessel/strings/StringLStrArray.h>
-
-#include <algorithm>
-#include <cctype>
-#include <cwctype>
-#include <new>
-
 #include "diagnostics/Guarded.h"
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"
 #include "strings/HandleOps.h"
 #include "strings/LStrView.h"
+#include <tessel/strings/StringLStr.h>
+#include <tessel/strings/StringLStrArray.h>
+#include <tessel/strings/StringUtils.h>
+
+#include <algorithm>
+#include <cctype>
+#include <cwctype>
+#include <new>
 
 namespace tessel {
 namespace StringUtils {
@@ -20,7 +18,7 @@ namespace {
 
 constexpr size_t kMaxPStr = 255;
 
-// ---- the three shapes of a conversion: a new string, a given one, without exceptions ----
+// ---- the three shapes of a conversion: a new string, a given one, without exceptions --------------------------------
 
 template <class String, class Convert>
 String Made(Convert convert) {
@@ -62,7 +60,7 @@ void ThrowIf(MgErr err) {
     if (err) throw std::bad_alloc();
 }
 
-// ---- UTF-16 to UTF-8 ----
+// ---- UTF-16 to UTF-8 ------------------------------------------------------------------------------------------------
 
 constexpr char32_t kReplacementCharacter = 0xFFFD;
 
@@ -107,7 +105,7 @@ void ConvertToUtf8(const std::u16string& source, std::string* out) {
     out->swap(utf8);
 }
 
-// ---- algorithms over both kinds of characters ----
+// ---- algorithms over both kinds of characters -----------------------------------------------------------------------
 
 template <class Char>
 using String = std::basic_string<Char>;
@@ -172,8 +170,8 @@ void JoinAll(const std::vector<String<Char>>& elements, const String<Char>& sepa
     out->swap(joined);
 }
 
-/* Removes every range that begins with the opening and ends where endOf(text, behind the opening) says; npos ends the
-   work. */
+// Removes every range that begins with the opening and ends where endOf(text, behind the opening) says; npos ends the
+// work.
 template <class Char, class EndOf>
 void RemoveRanges(String<Char>* text, const String<Char>& opening, EndOf endOf) {
     if (!text || opening.empty()) return;
@@ -222,7 +220,7 @@ char16_t UpperWide(char16_t c) {
     return static_cast<char16_t>(std::towupper(c));
 }
 
-/* Index of the first pair of characters whose lower cases differ, or the shorter length. */
+// Index of the first pair of characters whose lower cases differ, or the shorter length.
 size_t FirstDifferentCharacter(const std::string& a, const std::string& b) {
     const size_t n = std::min(a.size(), b.size());
     return FirstDifferenceMapped(reinterpret_cast<const uint8*>(a.data()), reinterpret_cast<const uint8*>(b.data()), n,
@@ -252,7 +250,7 @@ MgErr FillArray(LStrArrayHandle array, const std::vector<std::string>& source) {
 
 }  // namespace
 
-// ---- to narrow ----
+// ---- to narrow ------------------------------------------------------------------------------------------------------
 
 void ToNarrowString(LStrHandle source, DeallocationPolicy policy, std::string* out) {
     if (out) out->assign(TextOf(LStrView(source)));
@@ -316,7 +314,7 @@ MgErr ToNarrowStringFromBSTRNoThrow(BSTR source, DeallocationPolicy policy, std:
     return NoThrow(out, [&](std::string* to) { ToNarrowStringFromBSTR(source, policy, to); });
 }
 
-// ---- to wide ----
+// ---- to wide --------------------------------------------------------------------------------------------------------
 
 void ToWideString(const std::string& source, std::u16string* out) {
     if (out) platform::ToUtf16(source, *out);
@@ -380,7 +378,7 @@ MgErr ToWideStringNoThrow(BSTR source, DeallocationPolicy policy, std::u16string
     return NoThrow(out, [&](std::u16string* to) { ToWideString(source, policy, to); });
 }
 
-// ---- to UTF-8 ----
+// ---- to UTF-8 -------------------------------------------------------------------------------------------------------
 
 std::string ToUTF8String(const std::u16string& source) {
     return Made<std::string>([&](std::string* out) { ConvertToUtf8(source, out); });
@@ -398,7 +396,7 @@ MgErr ToUTF8StringNoThrow(const std::string& source, std::string* out) {
     return NoThrow(out, [&](std::string* to) { platform::ToUtf8(source, *to); });
 }
 
-// ---- to the counted forms ----
+// ---- to the counted forms -------------------------------------------------------------------------------------------
 
 PStr ToPStr(const std::string& source, PStr buffer) {
     if (!buffer) return nullptr;
@@ -472,7 +470,7 @@ MgErr ToBSTRNoThrow(const std::u16string& source, BSTR* out) {
     return kNoErr;
 }
 
-// ---- assigning and appending ----
+// ---- assigning and appending ----------------------------------------------------------------------------------------
 
 MgErr AssignNoThrow(std::string* dst, const std::string& source) {
     return NoThrow(dst, [&](std::string* to) { to->assign(source); });
@@ -514,7 +512,7 @@ MgErr AppendNoThrow(std::u16string* dst, const char16_t* source) {
     return NoThrow(dst, [&](std::u16string* to) { to->append(source ? source : u""); });
 }
 
-// ---- parts ----
+// ---- parts ----------------------------------------------------------------------------------------------------------
 
 std::string Left(const std::string& text, uint32 n) {
     return LeftPart(text, n);
@@ -572,7 +570,7 @@ bool IsSurroundedByQuotes(const std::u16string& text) {
     return Quoted(text);
 }
 
-// ---- editing in place ----
+// ---- editing in place -----------------------------------------------------------------------------------------------
 
 void SearchAndReplace(std::string* text, const std::string& find, const std::string& replacement) {
     ReplaceEvery(text, find, replacement);
@@ -630,7 +628,7 @@ void RemoveBlockComments(std::u16string* text, const std::u16string& opening, co
     RemoveBlocks(text, opening, closing);
 }
 
-// ---- comparing and hashing ----
+// ---- comparing and hashing ------------------------------------------------------------------------------------------
 
 bool CaseInsensitiveEqual(const std::string& a, const std::string& b) {
     return a.size() == b.size() && FirstDifferentCharacter(a, b) == a.size();

@@ -1,10 +1,8 @@
+#include "strings/HandleOps.h"
+#include <tessel/diagnostics/DebugStream.h>
 #include <tessel/strings/ovhandle.h>
 
-#include <tessel/diagnostics/DebugStream.h>
-
 #include <utility>
-
-#include "strings/HandleOps.h"
 
 namespace tessel {
 

@@ -1,15 +1,3 @@
-#include <tessel/strings/ovstring.h>
-
-#include <tessel/diagnostics/DebugStream.h>
-#include <tessel/strings/StringCPStr.h>
-#include <tessel/strings/StringFmtPrint.h>
-#include <tessel/strings/StringPStr.h>
-
-#include <algorithm>
-#include <cstring>
-#include <string_view>
-#include <vector>
-
 #include "diagnostics/Guarded.h"
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"
@@ -17,11 +5,21 @@
 #include "strings/FmtEngine.h"
 #include "strings/HandleOps.h"
 #include "strings/LStrView.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/strings/StringCPStr.h>
+#include <tessel/strings/StringFmtPrint.h>
+#include <tessel/strings/StringPStr.h>
+#include <tessel/strings/ovstring.h>
+
+#include <algorithm>
+#include <cstring>
+#include <string_view>
+#include <vector>
 
 namespace tessel {
 namespace {
 
-/* Storage kinds. */
+// Storage kinds.
 enum : int32 {
     kText = 1,
     kText2 = 2,
@@ -50,7 +48,7 @@ bool IsTrimmed(uint8 byte) {
     return byte == ' ' || byte == '\t' || byte == '\r' || byte == '\n';
 }
 
-/* Brings an LStr handle to n bytes of text; n of 0 releases it. */
+// Brings an LStr handle to n bytes of text; n of 0 releases it.
 MgErr ResizeLStr(LStrHandle* handle, int32 n) {
     if (n == 0) return DSDisposeHandleAndNull(AsHandlePtr(handle));
     if (static_cast<uint32>(n) > INT32_MAX - LStrSize(0)) return kMemFullErr;
@@ -65,7 +63,7 @@ std::string_view CharactersOf(const uint8* bytes, int32 length) {
     return {reinterpret_cast<const char*>(bytes), static_cast<size_t>(length)};
 }
 
-/* Looks for a pattern in bytes that come one after the other (Knuth, Morris, Pratt). */
+// Looks for a pattern in bytes that come one after the other (Knuth, Morris, Pratt).
 class PatternMatcher {
 public:
     explicit PatternMatcher(std::string_view pattern) : pattern_(pattern), border_(pattern.size() + 1) {
@@ -76,7 +74,7 @@ public:
         matched_ = 0;
     }
 
-    /* Whether the pattern ends with this byte. */
+    // Whether the pattern ends with this byte.
     bool Take(char byte) {
         while (matched_ != 0 && (matched_ == pattern_.size() || pattern_[matched_] != byte))
             matched_ = border_[matched_];
@@ -84,7 +82,7 @@ public:
         return matched_ == pattern_.size();
     }
 
-    /* Goes on behind this text. */
+    // Goes on behind this text.
     void Restart(std::string_view text) {
         matched_ = 0;
         for (const char byte : text.substr(text.size() - std::min(text.size(), pattern_.size() - 1))) Take(byte);
@@ -92,11 +90,11 @@ public:
 
 private:
     std::string_view pattern_;
-    std::vector<size_t> border_; /* how long a beginning of the pattern its first i bytes end with */
+    std::vector<size_t> border_;  // how long a beginning of the pattern its first i bytes end with
     size_t matched_ = 0;
 };
 
-/* Each occurrence that ends with a byte of the text is taken off the result and the replacement is put there. */
+// Each occurrence that ends with a byte of the text is taken off the result and the replacement is put there.
 int32 ReplaceEvery(std::string_view text, std::string_view find, std::string_view replacement, std::string& result) {
     PatternMatcher matcher(find);
     int32 found = 0;
@@ -121,7 +119,7 @@ std::string NarrowText(const char16_t* text, int32 length) {
 
 }  // namespace
 
-// ---- OVString ----
+// ---- OVString -------------------------------------------------------------------------------------------------------
 
 int32 OVString::Length() const {
     return static_cast<int32>(LStrView(LHandle()).length);
@@ -151,7 +149,7 @@ MgErr OVString::CopyToNarrowString(std::string& out) const {
     return OVSubString(*this).CopyToNarrowString(out);
 }
 
-// ---- making a view ----
+// ---- making a view --------------------------------------------------------------------------------------------------
 
 OVSubString::OVSubString(const void* bytes, int32 length, int32 storageClass)
     : bytes_(static_cast<uint8*>(const_cast<void*>(bytes))),
@@ -221,7 +219,7 @@ OVTempString::OVTempString() : OVSubString(record_.room, 0, kTemporary) {
     temp_ = &record_;
 }
 
-// ---- resizing ----
+// ---- resizing -------------------------------------------------------------------------------------------------------
 
 MgErr OVSubString::Resize(int32 n) {
     if (n < 0) return kArgErr;
@@ -247,7 +245,7 @@ MgErr OVSubString::Resize(int32 n) {
     }
 }
 
-/* Makes the view's text the first bytes of the storage, which starts there. */
+// Makes the view's text the first bytes of the storage, which starts there.
 void OVSubString::MoveToStart(uint8* start) {
     if (skipped_ != 0) std::memmove(start, start + skipped_, static_cast<size_t>(length_));
     skipped_ = 0;
@@ -271,7 +269,7 @@ MgErr OVSubString::ResizeBuffer(int32 n) {
     return kNoErr;
 }
 
-/* What grows grows first, and what shrinks shrinks last: a failure leaves the text as it was. */
+// What grows grows first, and what shrinks shrinks last: a failure leaves the text as it was.
 MgErr OVSubString::ResizeHandle(int32 n) {
     const auto stored = static_cast<int32>(LStrView(*handle_).length);
     if (n < stored) MoveToStart((**handle_)->bytes);
@@ -328,7 +326,7 @@ MgErr OVSubString::ResizeTemp(int32 n) {
     return kNoErr;
 }
 
-// ---- editing ----
+// ---- editing --------------------------------------------------------------------------------------------------------
 
 MgErr OVSubString::Replace(const void* source, int32 length, int32 at, int32 count) {
     if (at < 0 || at > length_) at = length_;
@@ -346,7 +344,7 @@ MgErr OVSubString::Replace(const void* source, int32 length, int32 at, int32 cou
     return WithoutOverlap(source, length, [&](const void* bytes) { return ReplaceRange(bytes, length, at, count); });
 }
 
-/* Whether bytes lie in what an edit may move: the view, the block of its handle, or the whole list of its element. */
+// Whether bytes lie in what an edit may move: the view, the block of its handle, or the whole list of its element.
 bool OVSubString::IsInStorage(const void* bytes, int32 length) const {
     auto start = reinterpret_cast<uintptr_t>(bytes_) - static_cast<uint32>(skipped_);
     auto end = reinterpret_cast<uintptr_t>(bytes_) + static_cast<uint32>(length_);
@@ -361,7 +359,7 @@ bool OVSubString::IsInStorage(const void* bytes, int32 length) const {
     return at < end && at + static_cast<uint32>(length) > start;
 }
 
-/* Runs an edit with the source, or with a copy of it when the edit may move it. */
+// Runs an edit with the source, or with a copy of it when the edit may move it.
 template <class Edit>
 MgErr OVSubString::WithoutOverlap(const void* source, int32 length, Edit edit) {
     if (!source || length <= 0 || !IsInStorage(source, length)) return edit(source);
@@ -495,7 +493,7 @@ void OVSubString::TrimWhitespace() {
     while (length_ > 0 && IsTrimmed(bytes_[length_ - 1])) --length_;
 }
 
-// ---- comparing and searching ----
+// ---- comparing and searching ----------------------------------------------------------------------------------------
 
 int32 OVSubString::Compare(const void* bytes, int32 length) const {
     if (length_ == 0) return length > 0 ? -1 : 0;
@@ -568,7 +566,7 @@ int32 OVSubString::SearchNCCStr(CStr pattern, int32 start) const {
     return SearchNC(pattern, start);
 }
 
-// ---- copying out ----
+// ---- copying out ----------------------------------------------------------------------------------------------------
 
 void OVSubString::CopyToCStr(char* buffer, int32 size) const {
     if (size < 1) {
@@ -592,7 +590,7 @@ MgErr OVSubString::CopyToNarrowString(std::string& out) const {
     });
 }
 
-// ---- printing ----
+// ---- printing -------------------------------------------------------------------------------------------------------
 
 MgErr OVSubStringPrintf(OVSubString* string, bool append, CStr format, va_list args) {
     if (!string) {

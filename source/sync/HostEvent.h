@@ -2,10 +2,9 @@
 #ifndef TESSEL_SOURCE_SYNC_HOSTEVENT_H
 #define TESSEL_SOURCE_SYNC_HOSTEVENT_H
 
-#include <tessel/sync/PlatformEvent.h>
-
 #include "platform/Event.h"
 #include "sync/PlainAllocation.h"
+#include <tessel/sync/PlatformEvent.h>
 
 namespace tessel {
 

@@ -1,18 +1,17 @@
+#include "platform/MessageEvent.h"
+#include "platform/Mutex.h"
+#include "sync/HostEvent.h"
 #include <tessel/sync/PlatformEvent.h>
 #include <tessel/sync/PlatformEventTimer.h>
 
 #include <new>
 #include <utility>
 
-#include "platform/MessageEvent.h"
-#include "platform/Mutex.h"
-#include "sync/HostEvent.h"
-
 namespace tessel {
 
-/* Events that were destroyed, for the next to be made. Their memory stays that of an event for good: a signal releases
-   a waiter, who may destroy the event while the signaling thread still looks whom else to wake. When it finds another
-   event there, a thread that sleeps on that one looks up once for nothing. */
+// Events that were destroyed, for the next to be made. Their memory stays that of an event for good: a signal releases
+// a waiter, who may destroy the event while the signaling thread still looks whom else to wake. When it finds another
+// event there, a thread that sleeps on that one looks up once for nothing.
 class SpareEvents {
 public:
     HostEvent* Take() {
@@ -27,7 +26,7 @@ public:
     }
 
 private:
-    platform::Mutex mutex_; /* guards the list; nothing is taken inside */
+    platform::Mutex mutex_;  // guards the list; nothing is taken inside
     HostEvent* first_ = nullptr;
 };
 

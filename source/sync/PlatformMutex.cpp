@@ -1,7 +1,6 @@
-#include <tessel/sync/PlatformMutex.h>
-
 #include "platform/Mutex.h"
 #include "sync/PlainAllocation.h"
+#include <tessel/sync/PlatformMutex.h>
 
 namespace tessel {
 namespace {

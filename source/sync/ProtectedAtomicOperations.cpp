@@ -1,12 +1,11 @@
 #include "sync/ProtectedAtomicOperations.h"
 
-#include <atomic>
-#include <cstring>
-
+#include "sync/Service.h"
 #include <tessel/sync/ThAtomic.h>
 #include <tessel/system/CPUInformation.h>
 
-#include "sync/Service.h"
+#include <atomic>
+#include <cstring>
 
 namespace tessel {
 namespace {

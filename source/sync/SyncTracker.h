@@ -2,12 +2,11 @@
 #ifndef TESSEL_SOURCE_SYNC_SYNCTRACKER_H
 #define TESSEL_SOURCE_SYNC_SYNCTRACKER_H
 
+#include <tessel/base/MgErr.h>
 #include <tessel/diagnostics/AllocTracker.h>
 #include <tessel/diagnostics/DumpLeakInfo.h>
 
 #include <atomic>
-
-#include <tessel/base/MgErr.h>
 
 namespace tessel {
 

@@ -1,15 +1,13 @@
-#include <tessel/sync/ThEvent.h>
-
-#include <memory>
-
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "platform/LastError.h"
 #include "platform/MessageEvent.h"
 #include "sync/HostEvent.h"
 #include "sync/PlainAllocation.h"
 #include "sync/Service.h"
 #include "sync/SyncTracker.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/sync/ThEvent.h>
+
+#include <memory>
 
 namespace tessel {
 namespace {

@@ -1,6 +1,5 @@
-#include <tessel/sync/ThLocalStorage.h>
-
 #include "platform/Thread.h"
+#include <tessel/sync/ThLocalStorage.h>
 
 using namespace tessel;
 

@@ -1,13 +1,11 @@
-#include <tessel/sync/ThMutex.h>
-
-#include <memory>
-
-#include <tessel/diagnostics/DebugStream.h>
-
 #include "platform/Thread.h"
 #include "sync/PlainAllocation.h"
 #include "sync/Service.h"
 #include "sync/SyncTracker.h"
+#include <tessel/diagnostics/DebugStream.h>
+#include <tessel/sync/ThMutex.h>
+
+#include <memory>
 
 namespace tessel {
 namespace {

@@ -1,9 +1,7 @@
-#include <tessel/sync/ThSleep.h>
-
-#include <tessel/time/Millisecs.h>
-
 #include "platform/Clock.h"
 #include "platform/Thread.h"
+#include <tessel/sync/ThSleep.h>
+#include <tessel/time/Millisecs.h>
 
 void ThSleep(uint32 milliseconds) {
     tessel::platform::SleepMilliseconds(milliseconds);

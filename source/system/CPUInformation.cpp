@@ -1,12 +1,11 @@
+#include "diagnostics/Guarded.h"
+#include "platform/System.h"
 #include <tessel/system/CPUInformation.h>
 
 #include <algorithm>
 #include <atomic>
 #include <iterator>
 #include <memory>
-
-#include "diagnostics/Guarded.h"
-#include "platform/System.h"
 
 CStr GetCPUArchName(int32 arch) {
     static const CStr kNames[] = {"InvalidCPU", "68K",   "PowerPC", "X86", "Sparc", "PARisc",

@@ -1,8 +1,7 @@
+#include "platform/System.h"
 #include <tessel/system/OpSystemInfo.h>
 
 #include <iterator>
-
-#include "platform/System.h"
 
 CStr GetOSNameFromID(int32 targetID) {
     static const CStr kNames[] = {"invalid OS target", "Mac OS", "Windows 3.1", "Windows 95/NT", "Solaris 1",

@@ -1,17 +1,15 @@
-#include <tessel/threads/ThThread.h>
-
+#include "platform/Clock.h"
+#include "platform/LastError.h"
+#include "threads/ThreadTable.h"
 #include <tessel/diagnostics/AllocTracker.h>
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/diagnostics/DumpLeakInfo.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/numerics/FloatingPointRegisters.h>
 #include <tessel/sync/ThLocalStorage.h>
+#include <tessel/threads/ThThread.h>
 
 #include <atomic>
-
-#include "platform/Clock.h"
-#include "platform/LastError.h"
-#include "threads/ThreadTable.h"
 
 namespace tessel {
 

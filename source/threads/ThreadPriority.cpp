@@ -1,10 +1,9 @@
+#include "platform/LastError.h"
+#include "threads/ThreadTable.h"
 #include <tessel/diagnostics/DebugStream.h>
 
 #include <atomic>
 #include <cstring>
-
-#include "platform/LastError.h"
-#include "threads/ThreadTable.h"
 
 namespace tessel {
 namespace {

@@ -2,11 +2,10 @@
 #ifndef TESSEL_SOURCE_THREADS_THREADTABLE_H
 #define TESSEL_SOURCE_THREADS_THREADTABLE_H
 
-#include <tessel/sync/ThMutex.h>
-#include <tessel/threads/ThThread.h>
-
 #include "platform/Thread.h"
 #include "threads/Service.h"
+#include <tessel/sync/ThMutex.h>
+#include <tessel/threads/ThThread.h>
 
 namespace tessel {
 

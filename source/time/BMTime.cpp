@@ -1,9 +1,8 @@
+#include "platform/Clock.h"
 #include <tessel/time/BMTime.h>
 
 #include <algorithm>
 #include <cstring>
-
-#include "platform/Clock.h"
 
 namespace tessel {
 namespace {

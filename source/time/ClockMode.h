@@ -2,9 +2,9 @@
 #ifndef TESSEL_SOURCE_TIME_CLOCKMODE_H
 #define TESSEL_SOURCE_TIME_CLOCKMODE_H
 
-#include <atomic>
-
 #include <tessel/time/HRTime.h>
+
+#include <atomic>
 
 namespace tessel {
 

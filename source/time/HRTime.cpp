@@ -1,11 +1,9 @@
+#include "platform/Clock.h"
+#include "time/ClockMode.h"
+#include <tessel/system/OpSystemInfo.h>
 #include <tessel/time/HRTime.h>
 
 #include <cmath>
-
-#include <tessel/system/OpSystemInfo.h>
-
-#include "platform/Clock.h"
-#include "time/ClockMode.h"
 
 namespace tessel {
 namespace {

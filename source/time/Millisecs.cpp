@@ -1,6 +1,5 @@
-#include <tessel/time/Millisecs.h>
-
 #include "platform/Clock.h"
+#include <tessel/time/Millisecs.h>
 
 uint32 MilliSecs(void) {
     return tessel::platform::TickMilliseconds();

@@ -1,9 +1,8 @@
+#include "platform/System.h"
 #include <tessel/utilities/OVGuid.h>
 #include <tessel/utilities/RandomGen.h>
 
 #include <cstring>
-
-#include "platform/System.h"
 
 static_assert(sizeof(OVGuidType) == 16 && offsetof(OVGuidType, data4) == 8);
 

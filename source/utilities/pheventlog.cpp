@@ -1,8 +1,7 @@
+#include <tessel/memory/MemoryManager.h>
 #include <tessel/utilities/pheventlog.h>
 
 #include <initializer_list>
-
-#include <tessel/memory/MemoryManager.h>
 
 void InitEventLoggingMgr() {
 }

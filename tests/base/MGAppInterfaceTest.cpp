@@ -1,5 +1,6 @@
-#include <gtest/gtest.h>
 #include <tessel/base/MGAppInterface.h>
+
+#include <gtest/gtest.h>
 
 namespace {
 

@@ -1,11 +1,11 @@
-#include <gtest/gtest.h>
-#include <sys/stat.h>
 #include <tessel/base/MGModule.h>
-#include <unistd.h>
 
 #include <climits>
 #include <ctime>
+#include <gtest/gtest.h>
 #include <string>
+#include <sys/stat.h>
+#include <unistd.h>
 
 namespace {
 

@@ -1,6 +1,6 @@
-#include <gtest/gtest.h>
 #include <tessel/base/MGPlacementNew.h>
 
+#include <gtest/gtest.h>
 #include <new>
 #include <string>
 

@@ -1,5 +1,6 @@
-#include <gtest/gtest.h>
 #include <tessel/base/MgErr.h>
+
+#include <gtest/gtest.h>
 
 namespace {
 

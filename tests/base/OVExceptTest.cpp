@@ -1,13 +1,12 @@
-#include <gtest/gtest.h>
+#include "diagnostics/Guarded.h"
+#include "support/ReportRecorder.h"
 #include <tessel/base/OVExcept.h>
 
+#include <gtest/gtest.h>
 #include <new>
 #include <stdexcept>
 #include <string>
 #include <typeinfo>
-
-#include "diagnostics/Guarded.h"
-#include "support/ReportRecorder.h"
 
 namespace tessel {
 namespace {

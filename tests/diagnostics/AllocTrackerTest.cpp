@@ -1,19 +1,18 @@
-#include <gtest/gtest.h>
+#include "diagnostics/AllocTracking.h"
+#include "diagnostics/TrackerHeap.h"
+#include "support/ReportRecorder.h"
+#include "support/TextDumper.h"
 #include <tessel/diagnostics/AllocTracker.h>
 #include <tessel/diagnostics/DebugStream.h>
 
 #include <algorithm>
 #include <cstdlib>
+#include <gtest/gtest.h>
 #include <map>
 #include <memory>
 #include <random>
 #include <thread>
 #include <vector>
-
-#include "diagnostics/AllocTracking.h"
-#include "diagnostics/TrackerHeap.h"
-#include "support/ReportRecorder.h"
-#include "support/TextDumper.h"
 
 namespace tessel {
 namespace {

@@ -1,14 +1,13 @@
-#include <gtest/gtest.h>
-#include <sys/mman.h>
-#include <sys/resource.h>
+#include "support/ReportRecorder.h"
 #include <tessel/diagnostics/DebugOutput.h>
 #include <tessel/diagnostics/DebugStream.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cstdlib>
-
-#include "support/ReportRecorder.h"
+#include <gtest/gtest.h>
+#include <sys/mman.h>
+#include <sys/resource.h>
+#include <unistd.h>
 
 namespace tessel {
 namespace {

@@ -1,13 +1,12 @@
-#include <gtest/gtest.h>
+#include "diagnostics/Service.h"
+#include "support/ReportRecorder.h"
 #include <tessel/diagnostics/DebugStream.h>
 
 #include <cstring>
+#include <gtest/gtest.h>
 #include <limits>
 #include <memory>
 #include <vector>
-
-#include "diagnostics/Service.h"
-#include "support/ReportRecorder.h"
 
 namespace tessel {
 namespace {

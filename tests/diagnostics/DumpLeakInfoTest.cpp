@@ -1,16 +1,15 @@
-#include <gtest/gtest.h>
-#include <stdlib.h>
-#include <sys/mman.h>
+#include "support/ReportRecorder.h"
+#include "support/ScratchDrive.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/DumpLeakInfo.h>
 #include <tessel/diagnostics/FileLoc.h>
 
 #include <cstring>
 #include <filesystem>
+#include <gtest/gtest.h>
 #include <memory>
-
-#include "support/ReportRecorder.h"
-#include "support/ScratchDrive.h"
+#include <stdlib.h>
+#include <sys/mman.h>
 
 namespace tessel {
 namespace {

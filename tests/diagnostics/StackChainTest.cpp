@@ -1,7 +1,7 @@
-#include <gtest/gtest.h>
 #include <tessel/diagnostics/StackChain.h>
 
 #include <exception>
+#include <gtest/gtest.h>
 #include <string>
 #include <thread>
 #include <vector>

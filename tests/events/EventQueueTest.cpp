@@ -1,11 +1,11 @@
-#include <deque>
-#include <random>
-
 #include "EventsTestSupport.h"
 #include "events/MGEventQueueImpl.h"
 #include "memory/Heap.h"
 #include "support/FailingAllocator.h"
 #include "support/HandClock.h"
+
+#include <deque>
+#include <random>
 
 namespace tessel::test {
 namespace {

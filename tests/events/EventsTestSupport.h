@@ -2,18 +2,17 @@
 #ifndef TESSEL_TESTS_EVENTS_EVENTSTESTSUPPORT_H
 #define TESSEL_TESTS_EVENTS_EVENTSTESTSUPPORT_H
 
-#include <gmock/gmock.h>
+#include "events/OccurrenceLocks.h"
+#include "support/ReportRecorder.h"
+#include "support/StartedLibrary.h"
 #include <tessel/tessel.h>
 
 #include <atomic>
 #include <cstdlib>
+#include <gmock/gmock.h>
 #include <string>
 #include <thread>
 #include <vector>
-
-#include "events/OccurrenceLocks.h"
-#include "support/ReportRecorder.h"
-#include "support/StartedLibrary.h"
 
 namespace tessel::test {
 

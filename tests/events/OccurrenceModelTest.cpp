@@ -1,10 +1,10 @@
 // Random operations on the occurrences of one thread, beside a model of the rules.
+#include "EventsTestSupport.h"
+#include "events/TimeList.h"
+
 #include <deque>
 #include <functional>
 #include <random>
-
-#include "EventsTestSupport.h"
-#include "events/TimeList.h"
 
 namespace tessel::test {
 namespace {

@@ -1,12 +1,3 @@
-#include <signal.h>
-#include <sys/time.h>
-
-#include <array>
-#include <chrono>
-#include <mutex>
-#include <optional>
-#include <random>
-
 #include "EventsTestSupport.h"
 #include "events/Occurrences.h"
 #include "events/Service.h"
@@ -15,6 +6,14 @@
 #include "platform/posix/SystemCalls.h"
 #include "support/FailingAllocator.h"
 #include "support/HandClock.h"
+
+#include <array>
+#include <chrono>
+#include <mutex>
+#include <optional>
+#include <random>
+#include <signal.h>
+#include <sys/time.h>
 
 namespace tessel::test {
 namespace {

@@ -1,16 +1,15 @@
-#include <sys/stat.h>
+#include "platform/Clock.h"
+#include "platform/LastError.h"
+#include "support/FailingPlatform.h"
+#include "support/HandClock.h"
+#include "support/StartedFiles.h"
 #include <tessel/files/FileManager.h>
 #include <tessel/paths/PathRef.h>
 
 #include <cerrno>
 #include <climits>
 #include <string>
-
-#include "platform/Clock.h"
-#include "platform/LastError.h"
-#include "support/FailingPlatform.h"
-#include "support/HandClock.h"
-#include "support/StartedFiles.h"
+#include <sys/stat.h>
 
 namespace tessel::test {
 namespace {

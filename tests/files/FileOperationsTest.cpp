@@ -1,17 +1,16 @@
-#include <sys/stat.h>
+#include "support/StartedFiles.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/files/CachedPathFlavor.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/strings/StringCPStr.h>
-#include <unistd.h>
 
 #include <cmath>
 #include <cstring>
 #include <filesystem>
 #include <string>
-
-#include "support/StartedFiles.h"
+#include <sys/stat.h>
+#include <unistd.h>
 
 namespace tessel::test {
 namespace {

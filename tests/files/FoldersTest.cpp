@@ -1,4 +1,5 @@
 // Shortcuts, the recycle bin, and well-known folders.
+#include "support/StartedFiles.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/files/AppPath.h>
 #include <tessel/files/FileManager.h>
@@ -11,8 +12,6 @@
 #include <filesystem>
 #include <map>
 #include <string>
-
-#include "support/StartedFiles.h"
 
 namespace tessel::test {
 namespace {

@@ -1,12 +1,11 @@
-#include <gtest/gtest.h>
+#include "support/ReportRecorder.h"
 #include <tessel/frame/ServiceRegistry.h>
 
+#include <gtest/gtest.h>
 #include <memory>
 #include <new>
 #include <string>
 #include <vector>
-
-#include "support/ReportRecorder.h"
 
 namespace tessel {
 namespace {

@@ -1,16 +1,15 @@
 // The start of the library when memory runs out. The operators new of this program fail along with the library's own
 // allocations.
-#include <gtest/gtest.h>
+#include "memory/Heap.h"
+#include "support/FailingAllocator.h"
 #include <tessel/diagnostics/DebugOutput.h>
 #include <tessel/frame/TesselInit.h>
 #include <tessel/memory/MemoryManager.h>
 
 #include <atomic>
 #include <cstdlib>
+#include <gtest/gtest.h>
 #include <new>
-
-#include "memory/Heap.h"
-#include "support/FailingAllocator.h"
 
 namespace {
 

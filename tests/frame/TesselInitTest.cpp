@@ -1,5 +1,6 @@
-#include <gtest/gtest.h>
-#include <stdlib.h>
+#include "frame/CoreServices.h"
+#include "support/ReportRecorder.h"
+#include "support/StartedLibrary.h"
 #include <tessel/frame/TesselInit.h>
 #include <tessel/memory/MemoryManager.h>
 
@@ -7,12 +8,10 @@
 #include <array>
 #include <filesystem>
 #include <fstream>
+#include <gtest/gtest.h>
 #include <map>
 #include <sstream>
-
-#include "frame/CoreServices.h"
-#include "support/ReportRecorder.h"
-#include "support/StartedLibrary.h"
+#include <stdlib.h>
 
 namespace tessel {
 namespace {

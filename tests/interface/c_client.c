@@ -1,7 +1,8 @@
-/* A host in plain C11: starts the library, uses flat functions of several families, stops it. */
+// A host in plain C11: starts the library, uses flat functions of several families, stops it.
+#include <tessel/tessel.h>
+
 #include <stdio.h>
 #include <string.h>
-#include <tessel/tessel.h>
 
 static int failures;
 

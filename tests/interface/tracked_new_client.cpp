@@ -22,7 +22,7 @@ void TakeReport(CStr, int32, CStr, int32, uint32, CStr text) {
 
 void CheckOperators() {
     char* guarded = new char[5];
-    const char* volatile end = guarded + 5; /* the compiler knows of no bytes there */
+    const char* volatile end = guarded + 5;  // the compiler knows of no bytes there
     Check(std::memcmp(end, "ORV13MEM", 8) == 0, "operator new[] leaves guard bytes");
     delete[] guarded;
     int* none = new int[0];
@@ -32,7 +32,7 @@ void CheckOperators() {
     delete[] other;
     delete static_cast<int*>(nullptr);
     volatile size_t huge = size_t(-1) / 2;
-    char* volatile block = new (std::nothrow) char[huge]; /* what nobody sees may be left out */
+    char* volatile block = new (std::nothrow) char[huge];  // what nobody sees may be left out
     Check(block == nullptr, "the no-throw form returns null");
     try {
         block = new char[huge];

@@ -1,15 +1,12 @@
+#include "support/StartedMemory.h"
 #include <tessel/memory/CookieManager.h>
-
-#include <gmock/gmock.h>
+#include <tessel/memory/MemoryManager.h>
 
 #include <atomic>
 #include <cstring>
+#include <gmock/gmock.h>
 #include <thread>
 #include <vector>
-
-#include <tessel/memory/MemoryManager.h>
-
-#include "support/StartedMemory.h"
 
 namespace tessel {
 namespace {

@@ -1,13 +1,10 @@
+#include "support/StartedMemory.h"
 #include <tessel/memory/HObjList.h>
-
-#include <gmock/gmock.h>
-
-#include <random>
-#include <vector>
-
 #include <tessel/memory/MemoryManager.h>
 
-#include "support/StartedMemory.h"
+#include <gmock/gmock.h>
+#include <random>
+#include <vector>
 
 namespace tessel {
 namespace {

@@ -1,11 +1,9 @@
-#include <gmock/gmock.h>
-
-#include <random>
-#include <string>
-
+#include "support/StartedMemory.h"
 #include <tessel/memory/MemoryManager.h>
 
-#include "support/StartedMemory.h"
+#include <gmock/gmock.h>
+#include <random>
+#include <string>
 
 namespace tessel {
 namespace {

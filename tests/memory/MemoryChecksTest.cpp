@@ -1,20 +1,18 @@
-#include <gmock/gmock.h>
-
-#include <algorithm>
-#include <cstdlib>
-#include <cstring>
-#include <map>
-#include <string>
-#include <vector>
-
-#include <tessel/memory/MemoryManager.h>
-#include <tessel/memory/TrackedMallocFree.h>
-
 #include "memory/GuardBytes.h"
 #include "memory/Heap.h"
 #include "memory/MasterPointers.h"
 #include "memory/MemorySettings.h"
 #include "support/StartedMemory.h"
+#include <tessel/memory/MemoryManager.h>
+#include <tessel/memory/TrackedMallocFree.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <gmock/gmock.h>
+#include <map>
+#include <string>
+#include <vector>
 
 namespace tessel {
 

@@ -1,16 +1,9 @@
 // What happens when memory runs out at any point, when threads meet, and when something is left.
-#include <gmock/gmock.h>
-#include <malloc.h>
-
-#include <algorithm>
-#include <atomic>
-#include <cstdlib>
-#include <cstring>
-#include <functional>
-#include <memory>
-#include <thread>
-#include <vector>
-
+#include "memory/Heap.h"
+#include "memory/Service.h"
+#include "support/FailingAllocator.h"
+#include "support/ScratchDrive.h"
+#include "support/StartedMemory.h"
 #include <tessel/memory/CookieManager.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/memory/MemoryUtil.h>
@@ -19,11 +12,16 @@
 #include <tessel/sync/ThEvent.h>
 #include <tessel/sync/ThMutex.h>
 
-#include "memory/Heap.h"
-#include "memory/Service.h"
-#include "support/FailingAllocator.h"
-#include "support/ScratchDrive.h"
-#include "support/StartedMemory.h"
+#include <algorithm>
+#include <atomic>
+#include <cstdlib>
+#include <cstring>
+#include <functional>
+#include <gmock/gmock.h>
+#include <malloc.h>
+#include <memory>
+#include <thread>
+#include <vector>
 
 namespace tessel {
 

@@ -1,5 +1,6 @@
 // The table of types, conversions, rounding and constants.
-#include <gtest/gtest.h>
+#include "numerics/Extended.h"
+#include "support/ReportRecorder.h"
 #include <tessel/numerics/FloatingPointConstants.h>
 #include <tessel/numerics/NumericSupport.h>
 #include <tessel/numerics/RealMath.h>
@@ -8,13 +9,11 @@
 #include <cfenv>
 #include <cmath>
 #include <cstring>
+#include <gtest/gtest.h>
 #include <limits>
 #include <random>
 #include <tuple>
 #include <vector>
-
-#include "numerics/Extended.h"
-#include "support/ReportRecorder.h"
 
 namespace {
 
@@ -71,7 +70,7 @@ TEST(RoundingUtil, ToAnIncrementHalvesAwayFromZero) {
     for (const auto& c : cases) EXPECT_EQ(RndToInc(c[0], c[1]), c[2]) << c[0] << " to " << c[1];
 }
 
-// ---- between integers ----
+// ---- between integers -----------------------------------------------------------------------------------------------
 
 template <class From, class To>
 void ExpectWrapAround(int16 from, int16 to) {
@@ -107,7 +106,7 @@ TEST(ConvertNum, IntegersWrapAround) {
     ExpectWrapAroundIntoAll<uint64>(kNumUInt64);
 }
 
-// ---- reals into integers ----
+// ---- reals into integers --------------------------------------------------------------------------------------------
 
 // The rule, by comparing the distance to the two neighbours.
 template <class Int>
@@ -197,7 +196,7 @@ TEST(ConvertNum, ExtendedValuesNearTheLimits) {
     }
 }
 
-// ---- the rest ----
+// ---- the rest -------------------------------------------------------------------------------------------------------
 
 template <class To, class From>
 To Converted(int16 from, const From& value, int16 to) {

@@ -1,6 +1,7 @@
 // The conventions of the math family: where values are special, halves, missing results. How near the results are to
 // the exact ones is measured in MathAccuracyTest.cpp.
-#include <gtest/gtest.h>
+#include "numerics/Extended.h"
+#include "support/ReportRecorder.h"
 #include <tessel/numerics/ComplexMath.h>
 #include <tessel/numerics/FloatingPointConstants.h>
 #include <tessel/numerics/IntegerMath.h>
@@ -8,11 +9,9 @@
 
 #include <cmath>
 #include <cstring>
+#include <gtest/gtest.h>
 #include <limits>
 #include <ostream>
-
-#include "numerics/Extended.h"
-#include "support/ReportRecorder.h"
 
 namespace {
 
@@ -267,7 +266,7 @@ TEST(RealMath, Predicates) {
     }
 }
 
-// ---- complex ----
+// ---- complex --------------------------------------------------------------------------------------------------------
 
 using ComplexUnary = void (*)(const cmplx128*, cmplx128*);
 using ComplexBinary = void (*)(const cmplx128*, const cmplx128*, cmplx128*);
@@ -436,7 +435,7 @@ TEST(ComplexMath, ExtendedQuotientsStayInRange) {
     EXPECT_EQ(ToExtended(log), 3);
 }
 
-// ---- integers ----
+// ---- integers -------------------------------------------------------------------------------------------------------
 
 TEST(IntegerMath, WrapAroundAndQuotients) {
     EXPECT_EQ(RTiMul(0x10001, 0x10001), 0x20001);

@@ -1,16 +1,15 @@
 // The register layer.
-#include <gtest/gtest.h>
+#include "numerics/Extended.h"
 #include <tessel/numerics/FloatingPointConstants.h>
 #include <tessel/numerics/FloatingPointRegisters.h>
 
 #include <cfenv>
 #include <cmath>
 #include <cstring>
+#include <gtest/gtest.h>
 #include <random>
 #include <thread>
 #include <vector>
-
-#include "numerics/Extended.h"
 
 namespace {
 
@@ -153,7 +152,7 @@ TEST_F(Registers, ExtendedInMemoryToIntegers) {
     EXPECT_EQ(FloatExtToInt64(ENaN()), INT64_MAX);
 }
 
-// ---- decimal records ----
+// ---- decimal records ------------------------------------------------------------------------------------------------
 
 TEST_F(Registers, DecimalRecords) {
     const struct {
@@ -252,7 +251,7 @@ TEST_F(Registers, DecimalsAreRoundedOnce) {
     }
 }
 
-// ---- narrow stores ----
+// ---- narrow stores --------------------------------------------------------------------------------------------------
 
 template <class Real>
 void ExpectStoredAsTheHost(Extended x, void (*store)(Real*)) {
@@ -290,7 +289,7 @@ TEST_F(Registers, NarrowStoresRoundAsTheHost) {
     std::fesetround(FE_TONEAREST);
 }
 
-// ---- operations ----
+// ---- operations -----------------------------------------------------------------------------------------------------
 
 TEST_F(Registers, RealOperations) {
     const struct {
@@ -435,7 +434,7 @@ TEST_F(Registers, FromMemoryToMemory) {
     EXPECT_EQ(FPCheck(), 1);
 }
 
-// ---- sums ----
+// ---- sums -----------------------------------------------------------------------------------------------------------
 
 TEST(Sums, ElementsApartAndBackwards) {
     const double values[] = {1e20, 3.5, 1, 99, -1e20, 99};

@@ -1,11 +1,10 @@
 // Cached attributes; the start and stop of paths, and what they leave behind.
-#include <tessel/paths/PathCachedItem.h>
-
-#include <thread>
-
 #include "paths/PathRefAccess.h"
 #include "paths/PathTestSupport.h"
 #include "support/HandClock.h"
+#include <tessel/paths/PathCachedItem.h>
+
+#include <thread>
 
 namespace tessel {
 namespace {

@@ -1,9 +1,8 @@
 // The flattened form, byte by byte, and what is damaged.
-#include <tessel/streams/BinDataReader.h>
-#include <tessel/streams/BinDataWriter.h>
-
 #include "paths/PathTestSupport.h"
 #include "platform/CodePage.h"
+#include <tessel/streams/BinDataReader.h>
+#include <tessel/streams/BinDataWriter.h>
 
 namespace tessel {
 namespace {

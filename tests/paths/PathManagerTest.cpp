@@ -1,7 +1,6 @@
 // The flat interface: what it accepts, and what it answers for null and for bad paths.
-#include <tessel/memory/MemoryManager.h>
-
 #include "paths/PathTestSupport.h"
+#include <tessel/memory/MemoryManager.h>
 
 namespace tessel {
 namespace {

@@ -1,11 +1,10 @@
 // The elements of paths, their names and their relations.
+#include "paths/PathRefAccess.h"
+#include "paths/PathTestSupport.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathCachedItem.h>
 
 #include <thread>
-
-#include "paths/PathRefAccess.h"
-#include "paths/PathTestSupport.h"
 
 namespace tessel {
 namespace {

@@ -1,8 +1,7 @@
 // What the strings do with paths: "%z", and lists compared as file names.
+#include "paths/PathTestSupport.h"
 #include <tessel/strings/CPStrList.h>
 #include <tessel/strings/StringFmtPrint.h>
-
-#include "paths/PathTestSupport.h"
 
 namespace tessel {
 namespace {

@@ -2,18 +2,17 @@
 #ifndef TESSEL_TESTS_PATHS_PATHTESTSUPPORT_H
 #define TESSEL_TESTS_PATHS_PATHTESTSUPPORT_H
 
-#include <gtest/gtest.h>
+#include "support/ReportRecorder.h"
+#include "support/StartedPaths.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
 
 #include <cstring>
+#include <gtest/gtest.h>
 #include <initializer_list>
 #include <string>
 #include <vector>
-
-#include "support/ReportRecorder.h"
-#include "support/StartedPaths.h"
 
 namespace tessel::test {
 

@@ -1,10 +1,9 @@
 // Paths as text, text as paths, and names for the system.
+#include "paths/PathTestSupport.h"
+#include "platform/CodePage.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathAbbreviation.h>
 #include <tessel/paths/PathTextFormat.h>
-
-#include "paths/PathTestSupport.h"
-#include "platform/CodePage.h"
 
 namespace tessel {
 namespace {

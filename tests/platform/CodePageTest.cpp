@@ -1,12 +1,10 @@
 #include "platform/CodePage.h"
-
-#include <gtest/gtest.h>
+#include "platform/LastError.h"
 
 #include <cstring>
+#include <gtest/gtest.h>
 #include <string>
 #include <vector>
-
-#include "platform/LastError.h"
 
 namespace tessel::platform {
 namespace {
@@ -16,7 +14,7 @@ protected:
     ~CodePage() override { SetCodePage(kCodePageUtf8); }
 };
 
-/* Lengths of the characters, walking forward; and the same walking back. */
+// Lengths of the characters, walking forward; and the same walking back.
 std::vector<std::size_t> Lengths(const std::string& text) {
     std::vector<std::size_t> lengths;
     const char* end = text.data() + text.size();
@@ -36,9 +34,9 @@ TEST_F(CodePage, CharactersAreWhole) {
     };
     const Row rows[] = {
         {65001, "a\xC3\xA4\xE2\x82\xAC\xF0\x9F\x98\x80z", {1, 2, 3, 4, 1}},
-        {65001, "\x80\xC3z\xC0\xAF\xED\xA0\x80\xF5\xE2\x82", {1, 1, 1, 1, 1, 1, 1, 1, 1, 1, 1}}, /* none is valid */
+        {65001, "\x80\xC3z\xC0\xAF\xED\xA0\x80\xF5\xE2\x82", {1, 1, 1, 1, 1, 1, 1, 1, 1, 1, 1}},  // none is valid
         {1252, "\xE4\xF6z", {1, 1, 1}},
-        {932, "\x83\x5C\xB1\\\x81\x81\x81\x81z\x83", {2, 1, 1, 2, 2, 1, 1}}, /* the last lead byte has no trail */
+        {932, "\x83\x5C\xB1\\\x81\x81\x81\x81z\x83", {2, 1, 1, 2, 2, 1, 1}},  // the last lead byte has no trail
         {936, "\xC4\xE3z", {2, 1}},
         {949, "\xB0\xA1z", {2, 1}},
         {950, "\xA4\x5Cz", {2, 1}},
@@ -71,7 +69,7 @@ TEST_F(CodePage, CaseMapsLeaveTrailBytesAlone) {
         const char* upper;
     };
     const Row rows[] = {
-        {1252, "az\xE4\xFF\xB5\xDF\x9A", "AZ\xC4\x9F\xB5\xDF\x8A"}, /* no capital of the micro sign and the sharp s */
+        {1252, "az\xE4\xFF\xB5\xDF\x9A", "AZ\xC4\x9F\xB5\xDF\x8A"},  // no capital of the micro sign and the sharp s
         {1251, "\xE0\xB8", "\xC0\xA8"},
         {932, "a\x83\x61\xB1z", "A\x83\x61\xB1Z"},
         {65001, "a\xC3\xA4z", "A\xC3\xA4Z"},

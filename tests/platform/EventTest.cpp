@@ -1,18 +1,16 @@
+#include "platform/Clock.h"
 #include "platform/Event.h"
-
-#include <gtest/gtest.h>
-#include <signal.h>
-#include <sys/time.h>
+#include "platform/posix/SystemCalls.h"
+#include "support/FailingPlatform.h"
+#include "support/HandClock.h"
 
 #include <atomic>
 #include <cerrno>
 #include <chrono>
+#include <gtest/gtest.h>
+#include <signal.h>
+#include <sys/time.h>
 #include <thread>
-
-#include "platform/Clock.h"
-#include "platform/posix/SystemCalls.h"
-#include "support/FailingPlatform.h"
-#include "support/HandClock.h"
 
 namespace tessel::platform {
 namespace {
@@ -36,7 +34,7 @@ TEST(Event, NobodyAsleepNoSystemCall) {
     EXPECT_EQ(0, watching.Calls());
 }
 
-/* Each reading of the time of day lies an hour before the one before. */
+// Each reading of the time of day lies an hour before the one before.
 int ReadFallingTimeOfDay(clockid_t clock, timespec* time) {
     static std::atomic<time_t> hours{0};
     int result = clock_gettime(clock, time);
@@ -89,7 +87,7 @@ TEST(Event, WaitAnyTakesTheFirstSignaled) {
 }
 
 TEST(Clock, IsReadFromTheHost) {
-    HandClock clock(5'000'000'123'456); /* far beyond 2^32 milliseconds */
+    HandClock clock(5'000'000'123'456);  // far beyond 2^32 milliseconds
     std::uint32_t start = TickMilliseconds();
     EXPECT_EQ(static_cast<std::uint32_t>(5'000'000'123'456), start);
     EXPECT_EQ(std::uint64_t{5'000'000'123'456}, HighResolutionCount() / (HighResolutionFrequency() / 1000));

@@ -1,19 +1,17 @@
+#include "platform/CodePage.h"
+#include "platform/DriveTable.h"
 #include "platform/FileSystem.h"
-
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-#include <sys/stat.h>
-#include <unistd.h>
+#include "platform/LastError.h"
+#include "support/FailingPlatform.h"
+#include "support/ScratchDrive.h"
 
 #include <cerrno>
 #include <cstdlib>
 #include <filesystem>
-
-#include "platform/CodePage.h"
-#include "platform/DriveTable.h"
-#include "platform/LastError.h"
-#include "support/FailingPlatform.h"
-#include "support/ScratchDrive.h"
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 namespace tessel::platform {
 namespace {
@@ -38,10 +36,10 @@ TEST(DriveTable, TextsOfNames) {
         {"c:/dir/", "/dir", 0},
         {"T:\\", "/mnt/x", 0},
         {"T:\\a\\b", "/mnt/x/a/b", 0},
-        {"T:a", "/mnt/x/a", 0}, /* the current folder lies elsewhere */
+        {"T:a", "/mnt/x/a", 0},  // the current folder lies elsewhere
         {"\\\\server\\share\\a", "/net/server/share/a", 0},
         {"dir\\a", "dir/a", 0},
-        /* no name leads out of its drive or its share */
+        // no name leads out of its drive or its share
         {"T:\\..\\..\\etc\\.\\a\\..\\..\\.b", "/mnt/x/.b", 0},
         {"T:..\\a", "/mnt/x/a", 0},
         {"T:/a//../..", "/mnt/x", 0},
@@ -112,7 +110,7 @@ TEST(DriveTable, NamesMatchWithoutRegardToCase) {
 
 TEST(DriveTable, NamesAreInTheCodePage) {
     ScratchDrive drive;
-    drive.Put("ソ.txt", "x"); /* in the double-byte page its second byte is a backslash */
+    drive.Put("ソ.txt", "x");  // in the double-byte page its second byte is a backslash
     ASSERT_TRUE(SetCodePage(932));
     EXPECT_EQ(ItemKind::kFile, ItemExists("T:\\\x83\x5C.txt"));
     std::vector<FolderEntry> entries;
@@ -202,7 +200,7 @@ TEST(FileSystem, FoldersAreMadeListedAndRemoved) {
 
 TEST(FileSystem, RenamingNeverReplaces) {
     ScratchDrive drive;
-    for (bool plainRename : {false, true}) { /* true: a file system that cannot rename without replacing */
+    for (bool plainRename : {false, true}) {  // true: a file system that cannot rename without replacing
         drive.Put("a", "from");
         drive.Put("b", "to");
         FailingPlatform failing("renameat2", 1, EINVAL, plainRename ? 1 : 0);
@@ -241,7 +239,7 @@ TEST(FileSystem, CopiesAreWholeOrNotThere) {
     ScratchDrive drive;
     std::string content(300'001, 'x');
     drive.Put("a", content);
-    for (int error : {0, ENOSYS}) { /* ENOSYS: a kernel that does not copy */
+    for (int error : {0, ENOSYS}) {  // ENOSYS: a kernel that does not copy
         FailingPlatform failing("copy_file_range", 1, error, error ? 1 : 0);
         EXPECT_TRUE(FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()));
         EXPECT_EQ(content, drive.Get("b"));

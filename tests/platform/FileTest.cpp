@@ -1,19 +1,17 @@
 #include "platform/File.h"
-
-#include <gtest/gtest.h>
-#include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <atomic>
-#include <cerrno>
-#include <string>
-#include <thread>
-
 #include "platform/FileSystem.h"
 #include "platform/LastError.h"
 #include "support/FailingPlatform.h"
 #include "support/ScratchDrive.h"
+
+#include <atomic>
+#include <cerrno>
+#include <gtest/gtest.h>
+#include <string>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <thread>
+#include <unistd.h>
 
 namespace tessel::platform {
 namespace {
@@ -21,7 +19,7 @@ namespace {
 using test::FailingPlatform;
 using test::ScratchDrive;
 
-/* Runs `work` in a forked process; its result comes back as the exit status. */
+// Runs `work` in a forked process; its result comes back as the exit status.
 template <typename Work>
 int InAnotherProcess(Work work) {
     pid_t child = fork();
@@ -47,7 +45,7 @@ TEST(File, DispositionsDecideWhatIsMade) {
     FileHandle file = Open(name, kWrite, 0, Disposition::kCreateNew);
     ASSERT_NE(kNoFile, file);
     EXPECT_TRUE(FileClose(file));
-    EXPECT_EQ(kNoFile, Open(drive.Name("A.TXT"), kWrite, 0, Disposition::kCreateNew)); /* the same to the library */
+    EXPECT_EQ(kNoFile, Open(drive.Name("A.TXT"), kWrite, 0, Disposition::kCreateNew));  // the same to the library
     EXPECT_EQ(kErrorFileExists, LastError());
 
     for (Disposition emptying : {Disposition::kTruncateExisting, Disposition::kCreateAlways}) {
@@ -125,7 +123,7 @@ TEST(File, TransfersGoOnAfterInterruptions) {
     FileHandle file = Open(drive.Name("a"));
     std::size_t actual = 0;
     char buffer[16];
-    for (int error : {0, EINTR}) { /* 0: one byte at a time */
+    for (int error : {0, EINTR}) {  // 0: one byte at a time
         ASSERT_TRUE(FileSetSize(file, 0) && FileSeek(file, 0, SeekFrom::kStart));
         {
             FailingPlatform failing("write", 1, error, 5);
@@ -172,8 +170,8 @@ TEST(File, FailuresTellWhatWasDone) {
     }
 }
 
-/* Rows of what a first opener has and denies, against a second one. The expectation is the rule itself: neither may
-   have what the other denies. */
+// Rows of what a first opener has and denies, against a second one. The expectation is the rule itself: neither may
+// have what the other denies.
 TEST(File, ShareModesHoldWithinAndBetweenProcesses) {
     ScratchDrive drive;
     drive.Put("a", "content");
@@ -203,7 +201,7 @@ TEST(File, ShareModesHoldWithinAndBetweenProcesses) {
     EXPECT_NE(kNoFile, after);
     EXPECT_EQ(kNoFile, Open(name, kWrite, 0, Disposition::kCreateAlways));
     FileClose(after);
-    EXPECT_EQ("content", drive.Get("a")); /* the refused opening did not empty it */
+    EXPECT_EQ("content", drive.Get("a"));  // the refused opening did not empty it
 }
 
 TEST(File, NeverDoTwoExclusiveOpenersWin) {
@@ -271,7 +269,7 @@ TEST(File, RangeLocksAreExclusiveForReadersToo) {
 TEST(File, TimesAreKept) {
     ScratchDrive drive;
     drive.Put("a", "");
-    constexpr std::int64_t created = 125911584000000000, modified = 126227808001234567; /* 2000, 2001 */
+    constexpr std::int64_t created = 125911584000000000, modified = 126227808001234567;  // 2000, 2001
     FileHandle file = Open(drive.Name("a"), kWrite);
     ASSERT_TRUE(FileSetTimes(file, created, 0, modified));
     ItemInfo byHandle, byName;
@@ -279,11 +277,11 @@ TEST(File, TimesAreKept) {
     FileClose(file);
     struct stat status;
     ASSERT_EQ(0, stat(drive.Native("a").c_str(), &status));
-    EXPECT_EQ(978307200, status.st_mtime); /* 2001-01-01 00:00:00 UTC */
+    EXPECT_EQ(978307200, status.st_mtime);  // 2001-01-01 00:00:00 UTC
     EXPECT_EQ(123456700, status.st_mtim.tv_nsec);
     EXPECT_EQ(modified, byHandle.modified);
     EXPECT_EQ(modified, byName.modified);
-    EXPECT_EQ(byName.created, byHandle.created); /* what was set, where the file system keeps attributes */
+    EXPECT_EQ(byName.created, byHandle.created);  // what was set, where the file system keeps attributes
 }
 
 }  // namespace

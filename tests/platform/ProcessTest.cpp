@@ -1,19 +1,3 @@
-#include <errno.h>
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-#include <sys/mman.h>
-#include <sys/ptrace.h>
-#include <sys/resource.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <atomic>
-#include <cstdlib>
-#include <cstring>
-#include <fstream>
-#include <iterator>
-#include <thread>
-
 #include "platform/Debugger.h"
 #include "platform/LastError.h"
 #include "platform/MemoryRead.h"
@@ -24,9 +8,24 @@
 #include "platform/posix/Errors.h"
 #include "support/FailingPlatform.h"
 
+#include <atomic>
+#include <cstdlib>
+#include <cstring>
+#include <errno.h>
+#include <fstream>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <iterator>
+#include <sys/mman.h>
+#include <sys/ptrace.h>
+#include <sys/resource.h>
+#include <sys/wait.h>
+#include <thread>
+#include <unistd.h>
+
 namespace tessel::test {
 
-/* A function that the dynamic linker does not know: it is in the program's own symbols only. */
+// A function that the dynamic linker does not know: it is in the program's own symbols only.
 __attribute__((noinline)) int Landmark(int value) {
     return value + 42;
 }
@@ -149,7 +148,7 @@ TEST(Module, ModulesHaveFiles) {
     std::string executable, own;
     ASSERT_TRUE(ModuleFileName(kExecutable, executable));
     EXPECT_THAT(executable, ::testing::AllOf(::testing::StartsWith("C:\\"), ::testing::EndsWith("\\platform_tests")));
-    ASSERT_TRUE(ModuleFileName(OwnModule(), own)); /* the library's objects are part of this program */
+    ASSERT_TRUE(ModuleFileName(OwnModule(), own));  // the library's objects are part of this program
     EXPECT_EQ(executable, own);
     EXPECT_FALSE(ModuleFileName(12345, own));
     EXPECT_EQ(kErrorModuleNotFound, LastError());
@@ -180,7 +179,7 @@ TEST(System, FactsAgreeWithTheHost) {
     EXPECT_FALSE(version.name.empty());
     ProcessorFacts facts = GetProcessorFacts();
     EXPECT_EQ(NumberOfProcessors(), facts.logical);
-    EXPECT_NE(0u, facts.features & kCompareExchange8); /* of every processor this builds for */
+    EXPECT_NE(0u, facts.features & kCompareExchange8);  // of every processor this builds for
     unsigned char first[16] = {}, second[16] = {};
     FailingPlatform failing("getrandom", 1, EINTR);
     EXPECT_TRUE(RandomBytes(first, sizeof first) && RandomBytes(second, sizeof second));
@@ -228,7 +227,7 @@ TEST(Thread, RunsAndReturnsItsCode) {
 }
 
 TEST(Thread, HandlesMayGoBeforeTheThread) {
-    static Worker worker; /* the thread is not waited for */
+    static Worker worker;  // the thread is not waited for
     ThreadId id = 0;
     ThreadClose(ThreadStart(WorkUntilStopped, &worker, id));
     while (!worker.started) YieldThread();
@@ -237,7 +236,7 @@ TEST(Thread, HandlesMayGoBeforeTheThread) {
     bool running = false;
     EXPECT_TRUE(ThreadRunning(self, running));
     EXPECT_TRUE(running);
-    EXPECT_FALSE(ThreadEnd(self, 0)); /* not started here */
+    EXPECT_FALSE(ThreadEnd(self, 0));  // not started here
     EXPECT_EQ(kErrorAccessDenied, LastError());
     EXPECT_TRUE(ThreadClose(self));
 }
@@ -246,7 +245,7 @@ TEST(Thread, EndsByForceWhereverItIs) {
 #if defined(__SANITIZE_THREAD__)
     GTEST_SKIP() << "the thread sanitizer waits for the bookkeeping of a thread that ends without any";
 #endif
-    Worker worker; /* never told to stop: without force this thread would run for ever */
+    Worker worker;  // never told to stop: without force this thread would run for ever
     ThreadId id = 0;
     ThreadHandle thread = ThreadStart(
         [](void* argument) -> std::int32_t {
@@ -261,7 +260,7 @@ TEST(Thread, EndsByForceWhereverItIs) {
     std::int32_t code = 0;
     EXPECT_TRUE(ThreadExitCode(thread, code));
     EXPECT_EQ(77, code);
-    EXPECT_TRUE(ThreadEnd(thread, 78)); /* already over: nothing happens */
+    EXPECT_TRUE(ThreadEnd(thread, 78));  // already over: nothing happens
     EXPECT_TRUE(ThreadExitCode(thread, code));
     EXPECT_EQ(77, code);
     EXPECT_TRUE(ThreadClose(thread));
@@ -269,25 +268,25 @@ TEST(Thread, EndsByForceWhereverItIs) {
 
 TEST(Thread, PrioritiesAreTheHosts) {
     if (::getpriority(PRIO_PROCESS, 0) != 0) GTEST_SKIP() << "the process itself does not have the priority 0";
-    std::thread([] { /* a lowered priority cannot always be raised again */
-                     ThreadHandle self = ThreadOpenCurrent();
-                     std::int32_t priority = 99;
-                     EXPECT_TRUE(ThreadGetPriority(self, priority));
-                     EXPECT_EQ(0, priority);
-                     for (std::int32_t lower : {-1, -2, -15}) {
-                         EXPECT_TRUE(ThreadSetPriority(self, lower));
-                         EXPECT_TRUE(ThreadGetPriority(self, priority));
-                         EXPECT_EQ(lower, priority);
-                     }
-                     EXPECT_FALSE(ThreadSetPriority(self, 7));
-                     EXPECT_EQ(kErrorInvalidParameter, LastError());
-                     if (ThreadSetPriority(self, 15)) {
-                         EXPECT_TRUE(ThreadGetPriority(self, priority));
-                         EXPECT_EQ(15, priority);
-                     } else {
-                         EXPECT_EQ(kErrorAccessDenied, LastError());
-                     }
-                     ThreadClose(self);
+    std::thread([] {  // a lowered priority cannot always be raised again
+        ThreadHandle self = ThreadOpenCurrent();
+        std::int32_t priority = 99;
+        EXPECT_TRUE(ThreadGetPriority(self, priority));
+        EXPECT_EQ(0, priority);
+        for (std::int32_t lower : {-1, -2, -15}) {
+            EXPECT_TRUE(ThreadSetPriority(self, lower));
+            EXPECT_TRUE(ThreadGetPriority(self, priority));
+            EXPECT_EQ(lower, priority);
+        }
+        EXPECT_FALSE(ThreadSetPriority(self, 7));
+        EXPECT_EQ(kErrorInvalidParameter, LastError());
+        if (ThreadSetPriority(self, 15)) {
+            EXPECT_TRUE(ThreadGetPriority(self, priority));
+            EXPECT_EQ(15, priority);
+        } else {
+            EXPECT_EQ(kErrorAccessDenied, LastError());
+        }
+        ThreadClose(self);
     })
         .join();
 }

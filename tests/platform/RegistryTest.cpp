@@ -1,16 +1,14 @@
+#include "platform/CodePage.h"
 #include "platform/Registry.h"
-
-#include <gtest/gtest.h>
-#include <sys/stat.h>
-#include <unistd.h>
+#include "support/FailingPlatform.h"
+#include "support/ScratchDrive.h"
 
 #include <cerrno>
 #include <cstdlib>
 #include <filesystem>
-
-#include "platform/CodePage.h"
-#include "support/FailingPlatform.h"
-#include "support/ScratchDrive.h"
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 namespace tessel::platform {
 namespace {
@@ -60,14 +58,14 @@ TEST_F(Registry, KeysIgnoreCaseAndKeepIt) {
     RegistryKey* maker = Create("software\\Maker");
     std::string name;
     EXPECT_EQ(kErrorSuccess, RegistryEnumerateKey(maker, 0, name));
-    EXPECT_EQ("..", name); /* a name like any other */
+    EXPECT_EQ("..", name);  // a name like any other
     EXPECT_EQ(kErrorSuccess, RegistryEnumerateKey(maker, 1, name));
     EXPECT_EQ("Größe", name);
     EXPECT_EQ(kErrorNoMoreItems, RegistryEnumerateKey(maker, 2, name));
     RegistryClose(maker);
     EXPECT_EQ(kErrorSuccess, TryOpen("software\\maker\\..\\A/B"));
 
-    EXPECT_EQ(kErrorAccessDenied, RegistryDelete(root_, "Software\\Maker\\..")); /* it holds a key */
+    EXPECT_EQ(kErrorAccessDenied, RegistryDelete(root_, "Software\\Maker\\.."));  // it holds a key
     EXPECT_EQ(kErrorSuccess, RegistryDelete(root_, "Software\\Maker\\..\\a/b"));
     EXPECT_EQ(kErrorSuccess, RegistryDelete(root_, "Software\\Maker\\.."));
     EXPECT_EQ(kErrorFileNotFound, RegistryDelete(root_, "Software\\Maker\\.."));
@@ -84,7 +82,7 @@ TEST_F(Registry, ViewsAndRootsAreApart) {
     EXPECT_EQ(kErrorFileNotFound, RegistryOpen(view64, "Key", false, key));
     EXPECT_EQ(kErrorInvalidParameter, RegistryOpenRoot(RegistryRoot::kUsers, 1, key));
     std::uint32_t keys = 9, values = 9;
-    EXPECT_EQ(kErrorSuccess, RegistryCounts(view64, keys, values)); /* nothing of it is on the disk yet */
+    EXPECT_EQ(kErrorSuccess, RegistryCounts(view64, keys, values));  // nothing of it is on the disk yet
     EXPECT_EQ(0u, keys + values);
     RegistryClose(other);
     RegistryClose(view64);
@@ -115,7 +113,7 @@ TEST_F(Registry, ValuesKeepTypeAndBytes) {
     for (std::uint32_t i = 0; RegistryEnumerateValue(key, i, name) == 0; ++i) names += "<" + name + ">";
     EXPECT_EQ("<><=.%2F/\\><Path>", names);
     EXPECT_EQ(kErrorSuccess, RegistryFlush(key));
-    EXPECT_EQ("REG 3\n" + bytes, drive_.Get("store/HKEY_LOCAL_MACHINE/Key/=Path")); /* the documented form */
+    EXPECT_EQ("REG 3\n" + bytes, drive_.Get("store/HKEY_LOCAL_MACHINE/Key/=Path"));  // the documented form
 
     drive_.Put("store/HKEY_LOCAL_MACHINE/Key/=Path", "REG x\n");
     EXPECT_EQ(kErrorRegistryCorrupt, RegistryQueryValue(key, "Path", type, data));
@@ -130,7 +128,7 @@ TEST_F(Registry, ValuesKeepTypeAndBytes) {
 
 TEST_F(Registry, NamesAreInTheCodePage) {
     ASSERT_TRUE(SetCodePage(932));
-    RegistryKey* key = Create("\x83\x5C\\Sub"); /* one character whose second byte is a backslash, then a separator */
+    RegistryKey* key = Create("\x83\x5C\\Sub");  // one character whose second byte is a backslash, then a separator
     RegistryClose(key);
     std::string name;
     EXPECT_EQ(kErrorSuccess, RegistryEnumerateKey(root_, 0, name));
@@ -180,7 +178,7 @@ TEST_F(Registry, WhatIsNoneOfItsOwnIsLeftAlone) {
     EXPECT_EQ(kErrorSuccess, RegistryDelete(root_, "Key"));
     EXPECT_EQ("file", drive_.Get("outside/.precious"));
 
-    /* It does not come back by what is done to it from now on. */
+    // It does not come back by what is done to it from now on.
     EXPECT_EQ(kErrorKeyDeleted, RegistrySetValue(key, "x", 1, "x", 1));
     EXPECT_EQ(kErrorKeyDeleted, RegistryCreate(key, "Sub", made));
     EXPECT_EQ(kErrorKeyDeleted, RegistryEnumerateKey(key, 0, data));
@@ -192,7 +190,7 @@ TEST_F(Registry, WhatIsNoneOfItsOwnIsLeftAlone) {
 TEST_F(Registry, NamesMayBeLongAndFilesLeftBehind) {
     RegistryKey* key = Create("Key");
     const std::string name(250, 'n');
-    FailingPlatform failing("open", 2, EEXIST, 3); /* the first call is for the lock */
+    FailingPlatform failing("open", 2, EEXIST, 3);  // the first call is for the lock
     EXPECT_EQ(kErrorSuccess, RegistrySetValue(key, name.c_str(), 1, "x", 1));
     EXPECT_EQ(5, failing.Calls());
     EXPECT_EQ(kErrorSuccess, RegistryDeleteValue(key, name.c_str()));

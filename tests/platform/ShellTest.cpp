@@ -1,15 +1,13 @@
+#include "platform/LastError.h"
 #include "platform/Shell.h"
-
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-#include <sys/stat.h>
+#include "support/ScratchDrive.h"
 
 #include <cstdlib>
 #include <filesystem>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
 #include <map>
-
-#include "platform/LastError.h"
-#include "support/ScratchDrive.h"
+#include <sys/stat.h>
 
 namespace tessel::platform {
 namespace {
@@ -17,7 +15,7 @@ namespace {
 using test::ScratchDrive;
 namespace fs = std::filesystem;
 
-/* A home in the scratch folder; what the environment said before comes back. */
+// A home in the scratch folder; what the environment said before comes back.
 class Shell : public ::testing::Test {
 protected:
     Shell() {
@@ -87,7 +85,7 @@ std::string Bytes(std::uint64_t value, int size) {
     return bytes;
 }
 
-/* The header of a shortcut with these flags, and nothing else in it. */
+// The header of a shortcut with these flags, and nothing else in it.
 std::string Header(std::uint32_t flags) {
     return std::string("\x4C\0\0\0\x01\x14\x02\0\0\0\0\0\xC0\0\0\0\0\0\0\x46", 20) + Bytes(flags, 4) +
            std::string(52, '\0');

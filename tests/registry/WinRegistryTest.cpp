@@ -1,24 +1,22 @@
-#include <tessel/base/OVExcept.h>
-#include <tessel/registry/WinRegistry.h>
-
-#include <errno.h>
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <cstdlib>
-#include <memory>
-#include <string>
-#include <thread>
-#include <vector>
-
 #include "platform/CodePage.h"
 #include "registry/WinRegistryObjects.h"
 #include "support/FailingPlatform.h"
 #include "support/ReportRecorder.h"
 #include "support/ScratchDrive.h"
 #include "support/malloc/FailingMalloc.h"
+#include <tessel/base/OVExcept.h>
+#include <tessel/registry/WinRegistry.h>
+
+#include <cstdlib>
+#include <errno.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <memory>
+#include <string>
+#include <sys/wait.h>
+#include <thread>
+#include <unistd.h>
+#include <vector>
 
 namespace tessel {
 namespace {
@@ -26,7 +24,7 @@ namespace {
 using testing::ElementsAre;
 using Key = AutoRelease<IWinRegistryKey>;
 
-/* The roots are made once a process: so is their store. */
+// The roots are made once a process: so is their store.
 class Store : public testing::Environment {
 public:
     void SetUp() override {
@@ -284,7 +282,7 @@ TEST_F(Registry, WhatIsNoStringOrDamagedIsRaised) {
                  [] { WinRegistryValueEnumeration enumeration(nullptr); });
 }
 
-/* Two processes write one value, and make one key in two spellings, as fast as they can, while this one reads. */
+// Two processes write one value, and make one key in two spellings, as fast as they can, while this one reads.
 TEST_F(Registry, ProcessesNeverSeeHalfAValue) {
     constexpr int kRounds = 200;
     const auto valueOf = [](int i) {

@@ -1,7 +1,6 @@
 // Lists of strings over the data of resources.
-#include <tessel/strings/CPStrList.h>
-
 #include "resources/ResourceTestSupport.h"
+#include <tessel/strings/CPStrList.h>
 
 namespace tessel::test {
 namespace {

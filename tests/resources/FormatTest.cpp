@@ -1,7 +1,7 @@
 // The bytes: what is written, what is accepted, and what is refused without a step outside.
-#include <gmock/gmock.h>
-
 #include "resources/ResourceTestSupport.h"
+
+#include <gmock/gmock.h>
 
 namespace tessel::test {
 namespace {

@@ -1,14 +1,13 @@
 // Refnums, chains, handles, strings and paths, readers and writers.
-#include <gmock/gmock.h>
+#include "resources/ResourceTestSupport.h"
 #include <tessel/files/FileManager.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/resources/RFReadWrite.h>
 
 #include <atomic>
 #include <climits>
+#include <gmock/gmock.h>
 #include <thread>
-
-#include "resources/ResourceTestSupport.h"
 
 namespace tessel::test {
 namespace {

@@ -2,16 +2,15 @@
 #ifndef TESSEL_TESTS_RESOURCES_RESOURCETESTSUPPORT_H
 #define TESSEL_TESTS_RESOURCES_RESOURCETESTSUPPORT_H
 
-#include <gtest/gtest.h>
+#include "support/StartedFiles.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/resources/ResourceManager.h>
 
 #include <fstream>
+#include <gtest/gtest.h>
 #include <iterator>
 #include <string>
 #include <vector>
-
-#include "support/StartedFiles.h"
 
 namespace tessel::test {
 

@@ -1,16 +1,14 @@
 // Updates: what they write, and what is left when they fail or are killed.
-#include <gmock/gmock.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <tessel/resources/RFReadWrite.h>
-
-#include <cerrno>
-#include <map>
-
 #include "platform/posix/SystemCalls.h"
 #include "resources/ResourceTestSupport.h"
 #include "support/FailingPlatform.h"
+#include <tessel/resources/RFReadWrite.h>
+
+#include <cerrno>
+#include <gmock/gmock.h>
+#include <map>
+#include <sys/wait.h>
+#include <unistd.h>
 
 namespace tessel::test {
 namespace {

@@ -1,14 +1,13 @@
-#include <gtest/gtest.h>
+#include "support/ReportRecorder.h"
+#include "support/StartedPaths.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/streams/BinDataReader.h>
 #include <tessel/streams/BinDataWriter.h>
 
 #include <cstring>
 #include <functional>
+#include <gtest/gtest.h>
 #include <string>
-
-#include "support/ReportRecorder.h"
-#include "support/StartedPaths.h"
 
 namespace tessel {
 namespace {

@@ -1,14 +1,13 @@
-#include <gtest/gtest.h>
+#include "support/ReportRecorder.h"
+#include "support/StartedPaths.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/streams/InputBuf.h>
 #include <tessel/streams/OutputBuf.h>
 
 #include <cstring>
+#include <gtest/gtest.h>
 #include <memory>
 #include <string>
-
-#include "support/ReportRecorder.h"
-#include "support/StartedPaths.h"
 
 namespace tessel {
 namespace {

@@ -1,13 +1,11 @@
+#include "support/StartedPaths.h"
 #include <tessel/streams/BinDataReader.h>
 #include <tessel/streams/BinDataWriter.h>
 #include <tessel/strings/CPStrList.h>
 #include <tessel/strings/StringPStr.h>
 
 #include <gtest/gtest.h>
-
 #include <string>
-
-#include "support/StartedPaths.h"
 
 namespace tessel {
 namespace {

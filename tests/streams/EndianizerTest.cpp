@@ -1,8 +1,8 @@
-#include <gtest/gtest.h>
 #include <tessel/streams/Endianizer.h>
 
 #include <array>
 #include <cstring>
+#include <gtest/gtest.h>
 
 namespace tessel {
 namespace {

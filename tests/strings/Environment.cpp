@@ -1,8 +1,8 @@
 // The subsystems that the strings stand on run for all tests of this folder.
-#include <gtest/gtest.h>
-
 #include "memory/Service.h"
 #include "sync/Service.h"
+
+#include <gtest/gtest.h>
 
 namespace {
 

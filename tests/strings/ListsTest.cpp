@@ -1,4 +1,6 @@
 // The list forms: CPStr, CLStr, _LStrArray and CPStrList.
+#include "strings/Support.h"
+#include "support/ReportRecorder.h"
 #include <tessel/strings/CPStrList.h>
 #include <tessel/strings/StringCLStr.h>
 #include <tessel/strings/StringCPStr.h>
@@ -8,9 +10,6 @@
 #include <algorithm>
 #include <cstring>
 #include <random>
-
-#include "strings/Support.h"
-#include "support/ReportRecorder.h"
 
 using namespace tessel;
 using namespace tessel::test;

@@ -1,5 +1,4 @@
 // Text to numbers.
-#include <gtest/gtest.h>
 #include <tessel/numerics/FloatingPointConstants.h>
 #include <tessel/numerics/FloatingPointRegisters.h>
 #include <tessel/strings/NumericText.h>
@@ -10,6 +9,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <gtest/gtest.h>
 #include <random>
 #include <string>
 #include <string_view>
@@ -137,7 +137,7 @@ TEST(NumericTextParse, SeventeenDigitsComeBackAsTheSameDouble) {
     }
 }
 
-// ---- integers ----
+// ---- integers -------------------------------------------------------------------------------------------------------
 
 struct IntegerCase {
     std::string_view text;

@@ -1,22 +1,20 @@
 // Numbers to text.
-#include <gtest/gtest.h>
+#include "numerics/Extended.h"
+#include "support/ReportRecorder.h"
+#include <tessel/numerics/NumericSupport.h>
+#include <tessel/strings/NumericText.h>
 
 #include <charconv>
 #include <cinttypes>
 #include <cmath>
 #include <cstdio>
 #include <cstring>
+#include <gtest/gtest.h>
 #include <limits>
 #include <random>
 #include <string>
 #include <tuple>
 #include <vector>
-
-#include <tessel/numerics/NumericSupport.h>
-#include <tessel/strings/NumericText.h>
-
-#include "numerics/Extended.h"
-#include "support/ReportRecorder.h"
 
 namespace {
 
@@ -64,7 +62,7 @@ std::string IntText(T value, int32 radix, bool isSigned, int32 size = kSize) {
     return {buffer.data(), static_cast<size_t>(length)};
 }
 
-// ---- integer formats ----
+// ---- integer formats ------------------------------------------------------------------------------------------------
 
 TEST(NumericTextRender, IntegersInEveryRadix) {
     EXPECT_EQ(IntText<int32>(-255, 16, true), "FFFFFF01");
@@ -126,7 +124,7 @@ TEST(NumericTextRender, IntegersThatDoNotFitAreCutAtTheFront) {
     EXPECT_TRUE(reports.Has(2, "NumToStr requires at least 2 bytes in the input buffer."));
 }
 
-// ---- reals ----
+// ---- reals ----------------------------------------------------------------------------------------------------------
 
 TEST(NumericTextRender, RealsFixedAndExponential) {
     const std::vector<std::tuple<double, int, const char*>> cases{
@@ -211,7 +209,7 @@ TEST(NumericTextRender, RandomDoublesAgreeWithPrintf) {
     EXPECT_EQ(differing, 0);
 }
 
-// ---- engineering and SI notation ----
+// ---- engineering and SI notation ------------------------------------------------------------------------------------
 
 TEST(NumericTextRender, EngineeringAndSI) {
     const std::vector<std::tuple<double, int, const char*>> cases{
@@ -249,7 +247,7 @@ TEST(NumericTextRender, SharedExponentTakesTheSuffix) {
     }
 }
 
-// ---- complex values and odd codes ----
+// ---- complex values and odd codes -----------------------------------------------------------------------------------
 
 TEST(NumericTextRender, ComplexValues) {
     EXPECT_EQ(Text(cmplx128{1.5, -2.25}, -2), "1.50 -2.25 i");
@@ -291,7 +289,7 @@ TEST(NumericTextRender, TextThatDoesNotFit) {
     EXPECT_TRUE(reports.Has(4, "buffer overflow imminent"));
 }
 
-// ---- decimal records ----
+// ---- decimal records ------------------------------------------------------------------------------------------------
 
 std::string Packed(const PackedDecimal& record, int16 format) {
     char buffer[128];

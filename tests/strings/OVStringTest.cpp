@@ -1,3 +1,5 @@
+#include "strings/Support.h"
+#include "support/ReportRecorder.h"
 #include <tessel/strings/StringCPStr.h>
 #include <tessel/strings/StringFmtPrint.h>
 #include <tessel/strings/ovhandle.h>
@@ -5,9 +7,6 @@
 
 #include <cstring>
 #include <random>
-
-#include "strings/Support.h"
-#include "support/ReportRecorder.h"
 
 using namespace tessel;
 using namespace tessel::test;

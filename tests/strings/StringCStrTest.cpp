@@ -1,12 +1,10 @@
+#include "strings/Support.h"
+#include "support/ReportRecorder.h"
 #include <tessel/strings/StringCStr.h>
-
-#include <strings.h>
 
 #include <cstring>
 #include <random>
-
-#include "strings/Support.h"
-#include "support/ReportRecorder.h"
+#include <strings.h>
 
 using namespace tessel::test;
 

@@ -1,17 +1,15 @@
-#include <tessel/strings/StringFmtPrint.h>
-
+#include "strings/Support.h"
+#include "support/ReportRecorder.h"
 #include <tessel/base/NumericTypes.h>
 #include <tessel/numerics/NumericSupport.h>
 #include <tessel/strings/NumericText.h>
 #include <tessel/strings/StringCStr.h>
+#include <tessel/strings/StringFmtPrint.h>
 
 #include <cstdio>
 #include <cstring>
 #include <limits>
 #include <random>
-
-#include "strings/Support.h"
-#include "support/ReportRecorder.h"
 
 using namespace tessel;
 using namespace tessel::test;

@@ -1,8 +1,6 @@
-#include <tessel/strings/StringFmtScan.h>
-
-#include <tessel/strings/StringCStr.h>
-
 #include "strings/Support.h"
+#include <tessel/strings/StringCStr.h>
+#include <tessel/strings/StringFmtScan.h>
 
 namespace {
 

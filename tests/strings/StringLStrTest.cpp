@@ -1,10 +1,9 @@
+#include "strings/Support.h"
+#include "support/ReportRecorder.h"
 #include <tessel/strings/StringLStr.h>
 #include <tessel/strings/StringPStr.h>
 
 #include <cstring>
-
-#include "strings/Support.h"
-#include "support/ReportRecorder.h"
 
 using namespace tessel::test;
 

@@ -1,11 +1,10 @@
-#include <gtest/gtest.h>
+#include "support/ScratchDrive.h"
 #include <tessel/diagnostics/FileLoc.h>
 #include <tessel/strings/StringOutput.h>
 
+#include <gtest/gtest.h>
 #include <memory>
 #include <string>
-
-#include "support/ScratchDrive.h"
 
 namespace tessel {
 namespace {

@@ -1,8 +1,6 @@
-#include <tessel/strings/StringPStr.h>
-
-#include <tessel/memory/MemoryManager.h>
-
 #include "strings/Support.h"
+#include <tessel/memory/MemoryManager.h>
+#include <tessel/strings/StringPStr.h>
 
 using namespace tessel::test;
 

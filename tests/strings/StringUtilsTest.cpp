@@ -1,8 +1,7 @@
+#include "strings/Support.h"
 #include <tessel/strings/StringLStrArray.h>
 #include <tessel/strings/StringPStr.h>
 #include <tessel/strings/StringUtils.h>
-
-#include "strings/Support.h"
 
 using namespace tessel;
 using namespace tessel::StringUtils;

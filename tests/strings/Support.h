@@ -2,15 +2,14 @@
 #ifndef TESSEL_TESTS_STRINGS_SUPPORT_H
 #define TESSEL_TESTS_STRINGS_SUPPORT_H
 
-#include <gtest/gtest.h>
+#include "platform/CodePage.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/strings/StringLStr.h>
 
+#include <gtest/gtest.h>
 #include <string>
 #include <string_view>
 #include <vector>
-
-#include "platform/CodePage.h"
 
 namespace tessel::test {
 

@@ -1,10 +1,10 @@
 #include "support/FailingAllocator.h"
 
-#include <atomic>
-#include <cstdlib>
-
 #include "diagnostics/TrackerHeap.h"
 #include "memory/Heap.h"
+
+#include <atomic>
+#include <cstdlib>
 
 namespace tessel::test {
 namespace {

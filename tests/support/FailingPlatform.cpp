@@ -1,13 +1,13 @@
 #include "support/FailingPlatform.h"
 
+#include "platform/posix/SystemCalls.h"
+
 #include <atomic>
 #include <cerrno>
 #include <cstring>
 #include <stdexcept>
 #include <tuple>
 #include <type_traits>
-
-#include "platform/posix/SystemCalls.h"
 
 namespace tessel::test {
 
@@ -25,7 +25,7 @@ bool IsDue() {
     return number >= first && number <= last;
 }
 
-/* Stands in for the member `kCall` of the table. */
+// Stands in for the member `kCall` of the table.
 template <auto kCall>
 struct Stand;
 
@@ -35,7 +35,7 @@ struct Stand<kCall> {
         if (!IsDue()) return (original.*kCall)(arguments...);
         if (failure != 0) {
             errno = failure;
-            return (Result)-1; /* also of a pointer: MAP_FAILED */
+            return (Result)-1;  // also of a pointer: MAP_FAILED
         }
         if constexpr (std::is_same_v<std::tuple_element_t<sizeof...(Arguments) - 1, std::tuple<Arguments...>>,
                                      std::size_t> &&

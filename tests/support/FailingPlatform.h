@@ -1,4 +1,4 @@
-/* Makes calls of the kernel fail, while the object lives. One object at a time. */
+// Makes calls of the kernel fail, while the object lives. One object at a time.
 #ifndef TESSEL_TESTS_SUPPORT_FAILINGPLATFORM_H
 #define TESSEL_TESTS_SUPPORT_FAILINGPLATFORM_H
 
@@ -8,14 +8,14 @@ namespace tessel::test {
 
 class FailingPlatform {
 public:
-    /* The n-th call (from 1) of the one named as in the table of system calls, and `times` - 1 after it, fail with
-       `error`. With an error of 0 a read or a write moves one byte instead. */
+    // The n-th call (from 1) of the one named as in the table of system calls, and `times` - 1 after it, fail with
+    // `error`. With an error of 0 a read or a write moves one byte instead.
     FailingPlatform(const char* call, int n, int error, int times = 1);
     ~FailingPlatform();
     FailingPlatform(const FailingPlatform&) = delete;
     FailingPlatform& operator=(const FailingPlatform&) = delete;
 
-    /* How many calls there were, failed or not. */
+    // How many calls there were, failed or not.
     int Calls() const;
 };
 

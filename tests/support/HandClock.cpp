@@ -1,8 +1,8 @@
 #include "support/HandClock.h"
 
-#include <atomic>
-
 #include "platform/posix/SystemCalls.h"
+
+#include <atomic>
 
 namespace tessel::test {
 
@@ -10,7 +10,7 @@ using platform::systemCalls;
 
 namespace {
 
-std::atomic<std::int64_t> now; /* nanoseconds */
+std::atomic<std::int64_t> now;  // nanoseconds
 platform::SystemCalls original;
 
 int Read(clockid_t, timespec* time) {

@@ -1,4 +1,4 @@
-/* Clocks that stand still and are moved by hand, while the object lives. One at a time. Sleeping moves them. */
+// Clocks that stand still and are moved by hand, while the object lives. One at a time. Sleeping moves them.
 #ifndef TESSEL_TESTS_SUPPORT_HANDCLOCK_H
 #define TESSEL_TESTS_SUPPORT_HANDCLOCK_H
 
@@ -8,7 +8,7 @@ namespace tessel::test {
 
 class HandClock {
 public:
-    /* Both clocks start at so many milliseconds: the monotonic one from its origin, the time of day from 1970. */
+    // Both clocks start at so many milliseconds: the monotonic one from its origin, the time of day from 1970.
     explicit HandClock(std::int64_t milliseconds);
     ~HandClock();
     HandClock(const HandClock&) = delete;

@@ -1,13 +1,13 @@
 #include "support/ScratchDrive.h"
 
+#include "platform/DriveTable.h"
+
 #include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
 #include <stdexcept>
-
-#include "platform/DriveTable.h"
 
 namespace tessel::test {
 

@@ -1,4 +1,4 @@
-/* A temporary folder mounted as drive T: while the object lives, and removed with all it holds. One at a time. */
+// A temporary folder mounted as drive T: while the object lives, and removed with all it holds. One at a time.
 #ifndef TESSEL_TESTS_SUPPORT_SCRATCHDRIVE_H
 #define TESSEL_TESTS_SUPPORT_SCRATCHDRIVE_H
 
@@ -14,14 +14,14 @@ public:
     ScratchDrive(const ScratchDrive&) = delete;
     ScratchDrive& operator=(const ScratchDrive&) = delete;
 
-    /* The host's name of the folder, and of something in it ("sub/file"). */
+    // The host's name of the folder, and of something in it ("sub/file").
     const std::string& Native() const { return folder_; }
     std::string Native(std::string_view inside) const { return folder_ + "/" + std::string(inside); }
 
-    /* The library's name: `T:\sub\file` for "sub/file". */
+    // The library's name: `T:\sub\file` for "sub/file".
     std::string Name(std::string_view inside) const;
 
-    /* Both go past the library. */
+    // Both go past the library.
     void Put(std::string_view inside, std::string_view bytes) const;
     std::string Get(std::string_view inside) const;
 

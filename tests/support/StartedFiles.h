@@ -2,12 +2,11 @@
 #ifndef TESSEL_TESTS_SUPPORT_STARTEDFILES_H
 #define TESSEL_TESTS_SUPPORT_STARTEDFILES_H
 
-#include <tessel/paths/PathRef.h>
-
 #include "files/Service.h"
 #include "resources/Service.h"
 #include "support/ScratchDrive.h"
 #include "support/StartedPaths.h"
+#include <tessel/paths/PathRef.h>
 
 namespace tessel::test {
 

@@ -1,7 +1,8 @@
 #include "support/StartedLibrary.h"
 
-#include <gtest/gtest.h>
 #include <tessel/frame/TesselInit.h>
+
+#include <gtest/gtest.h>
 
 namespace tessel::test {
 

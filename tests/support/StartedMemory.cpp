@@ -1,9 +1,9 @@
 #include "support/StartedMemory.h"
 
-#include <gtest/gtest.h>
-
 #include "memory/Service.h"
 #include "sync/Service.h"
+
+#include <gtest/gtest.h>
 
 namespace tessel::test {
 

@@ -2,12 +2,12 @@
 #ifndef TESSEL_TESTS_SUPPORT_STARTEDPATHS_H
 #define TESSEL_TESTS_SUPPORT_STARTEDPATHS_H
 
-#include <gtest/gtest.h>
-
 #include "memory/Service.h"
 #include "paths/Service.h"
 #include "support/ReportRecorder.h"
 #include "sync/Service.h"
+
+#include <gtest/gtest.h>
 
 namespace tessel::test {
 

@@ -1,11 +1,9 @@
-#include <gmock/gmock.h>
-
-#include <atomic>
-#include <cstdlib>
-#include <thread>
-#include <utility>
-#include <vector>
-
+#include "platform/Thread.h"
+#include "support/HandClock.h"
+#include "support/ReportRecorder.h"
+#include "support/malloc/FailingMalloc.h"
+#include "sync/ProtectedAtomicOperations.h"
+#include "sync/Service.h"
 #include <tessel/sync/PlatformEvent.h>
 #include <tessel/sync/PlatformEventTimer.h>
 #include <tessel/sync/PlatformMutex.h>
@@ -16,12 +14,12 @@
 #include <tessel/sync/ThSleep.h>
 #include <tessel/time/Millisecs.h>
 
-#include "platform/Thread.h"
-#include "support/HandClock.h"
-#include "support/ReportRecorder.h"
-#include "support/malloc/FailingMalloc.h"
-#include "sync/ProtectedAtomicOperations.h"
-#include "sync/Service.h"
+#include <atomic>
+#include <cstdlib>
+#include <gmock/gmock.h>
+#include <thread>
+#include <utility>
+#include <vector>
 
 namespace tessel {
 namespace {

@@ -1,14 +1,13 @@
-#include <errno.h>
-#include <gmock/gmock.h>
-
-#include <tessel/system/CPUInformation.h>
-#include <tessel/system/OpSystemInfo.h>
-#include <tessel/system/PlatformInformation.h>
-
 #include "platform/System.h"
 #include "platform/Thread.h"
 #include "support/FailingPlatform.h"
 #include "support/ReportRecorder.h"
+#include <tessel/system/CPUInformation.h>
+#include <tessel/system/OpSystemInfo.h>
+#include <tessel/system/PlatformInformation.h>
+
+#include <errno.h>
+#include <gmock/gmock.h>
 
 namespace tessel {
 namespace {

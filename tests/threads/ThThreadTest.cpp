@@ -1,24 +1,22 @@
-#include <tessel/sync/ThEvent.h>
-#include <tessel/threads/ThThread.h>
-
-#include <errno.h>
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-#include <pthread.h>
-#include <sys/resource.h>
-
-#include <atomic>
-#include <cstdlib>
-#include <filesystem>
-#include <string>
-#include <thread>
-#include <vector>
-
 #include "platform/posix/SystemCalls.h"
 #include "support/ReportRecorder.h"
 #include "support/ScratchDrive.h"
 #include "support/StartedLibrary.h"
 #include "threads/Service.h"
+#include <tessel/sync/ThEvent.h>
+#include <tessel/threads/ThThread.h>
+
+#include <atomic>
+#include <cstdlib>
+#include <errno.h>
+#include <filesystem>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <pthread.h>
+#include <string>
+#include <sys/resource.h>
+#include <thread>
+#include <vector>
 
 namespace {
 
@@ -32,7 +30,7 @@ protected:
         EXPECT_EQ(AssimilateStartUpThread(), 1);
         reports_.Clear();
     }
-    /* The service with other priorities. Threads have to be assimilated again. */
+    // The service with other priorities. Threads have to be assimilated again.
     void Restart(tessel::ThreadPriorityReader configured) {
         EXPECT_EQ(tessel::ThThreadStop(), kNoErr);
         reports_.Clear();
@@ -48,7 +46,7 @@ protected:
     tessel::test::StartedLibrary library_;
 };
 
-/* Waits until it is let go. */
+// Waits until it is let go.
 int32 AwaitEvent(void* event) {
     return ThEventWait(static_cast<ThEvent>(event));
 }
@@ -58,7 +56,7 @@ size_t ThreadsOfProcess() {
     return static_cast<size_t>(std::distance(begin(tasks), end(tasks)));
 }
 
-/* The host lists a thread for a moment after its end. One that is left for good makes the test run out of time. */
+// The host lists a thread for a moment after its end. One that is left for good makes the test run out of time.
 void AwaitThreads(size_t most) {
     while (ThreadsOfProcess() > most) std::this_thread::yield();
 }
@@ -201,7 +199,7 @@ TEST_F(ThThreadTest, ReportsBadRecordsAndThreadsThatAreLeft) {
     EXPECT_THAT(reports_.Texts(), ElementsAre("disposing thread out of range"));
 }
 
-/* A clock that leaps over every long wait. */
+// A clock that leaps over every long wait.
 struct LeapOverLongWaits {
     static inline std::atomic<int64_t> leapt{0};  // seconds
     static inline tessel::platform::SystemCalls original;

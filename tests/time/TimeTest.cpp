@@ -1,15 +1,13 @@
-#include <gtest/gtest.h>
-
-#include <cmath>
-#include <limits>
-#include <random>
-
+#include "support/HandClock.h"
+#include "time/ClockMode.h"
 #include <tessel/time/BMTime.h>
 #include <tessel/time/HRTime.h>
 #include <tessel/time/Millisecs.h>
 
-#include "support/HandClock.h"
-#include "time/ClockMode.h"
+#include <cmath>
+#include <gtest/gtest.h>
+#include <limits>
+#include <random>
 
 namespace tessel {
 namespace {

@@ -1,25 +1,23 @@
+#include "support/FailingPlatform.h"
+#include "support/HandClock.h"
+#include "support/ReportRecorder.h"
+#include "support/malloc/FailingMalloc.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/utilities/OVGuid.h>
 #include <tessel/utilities/RandomGen.h>
 
-#include <errno.h>
-#include <gtest/gtest.h>
-
 #include <algorithm>
 #include <cstring>
+#include <errno.h>
+#include <gtest/gtest.h>
 #include <set>
 #include <string>
 #include <thread>
 #include <vector>
 
-#include "support/FailingPlatform.h"
-#include "support/HandClock.h"
-#include "support/ReportRecorder.h"
-#include "support/malloc/FailingMalloc.h"
-
 namespace {
 
-/* The process-wide generator, seeded by a clock whose low 14 bits are 0: 1234, x 8191 & 0x3FFF, and that again. */
+// The process-wide generator, seeded by a clock whose low 14 bits are 0: 1234, x 8191 & 0x3FFF, and that again.
 struct SeededGenerator {
     tessel::test::HandClock clock{3 * 0x4000};
     int32 seeds[3] = {1234, 15150, 1234};

@@ -1,11 +1,10 @@
 #include <tessel/utilities/SortSearch.h>
 
-#include <gtest/gtest.h>
-
 #include <algorithm>
 #include <climits>
 #include <cmath>
 #include <cstring>
+#include <gtest/gtest.h>
 #include <random>
 #include <string>
 #include <utility>
@@ -15,7 +14,7 @@ namespace {
 
 using Record = std::string;  // its bytes; the first is the key
 
-/* Records between guards, and comparisons of them that may lie. */
+// Records between guards, and comparisons of them that may lie.
 struct Bench {
     size_t count, size;
     std::vector<char> bytes;
@@ -47,7 +46,7 @@ struct Bench {
     }
 };
 
-/* random, few distinct, rising, falling, equal, falling then rising */
+// random, few distinct, rising, falling, equal, falling then rising
 std::vector<std::vector<int>> Shapes(int count) {
     std::mt19937 random(static_cast<unsigned>(count));
     std::vector<std::vector<int>> shapes(6);
@@ -183,7 +182,7 @@ TEST(QSort, TakesTheStepsDescribed) {
     EXPECT_EQ(CompareUIntPtrTs(&most, &most), 0);
 }
 
-/* Chooses its answers as it goes (McIlroy's adversary): a record has no value yet until it must have one. */
+// Chooses its answers as it goes (McIlroy's adversary): a record has no value yet until it must have one.
 TEST(QSort, HasNoBadCase) {
     static constexpr int32 kCount = 32000, kGas = kCount;
     struct Adversary {

@@ -1,11 +1,9 @@
+#include "support/malloc/FailingMalloc.h"
 #include <tessel/utilities/UserCommandLine.h>
 
 #include <gtest/gtest.h>
-
 #include <string>
 #include <vector>
-
-#include "support/malloc/FailingMalloc.h"
 
 namespace {
 
@@ -18,7 +16,7 @@ Words Get(void (*getter)(int32* count, char*** args)) {
     return Words(args, args + count);
 }
 
-/* A host's arguments, as main gets them. */
+// A host's arguments, as main gets them.
 class Host {
 public:
     explicit Host(Words words) : words_(std::move(words)) {

@@ -1,13 +1,11 @@
+#include "support/StartedLibrary.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/utilities/VersionUtil.h>
 #include <tessel/utilities/pheventlog.h>
 
-#include <gtest/gtest.h>
-
 #include <cstring>
+#include <gtest/gtest.h>
 #include <string>
-
-#include "support/StartedLibrary.h"
 
 namespace {
 

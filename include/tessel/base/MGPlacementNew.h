@@ -1,4 +1,4 @@
-/* Deferred deleters: the end of objects that were built in static storage. */
+// Deferred deleters: the end of objects that were built in static storage.
 #ifndef TESSEL_BASE_MGPLACEMENTNEW_H
 #define TESSEL_BASE_MGPLACEMENTNEW_H
 
@@ -8,7 +8,7 @@
 
 namespace tessel {
 
-/// One deferred deletion. Made with new.
+// One deferred deletion. Made with new.
 class TESSEL_API MGPlacementDeletor {
 public:
     virtual ~MGPlacementDeletor();
@@ -19,7 +19,7 @@ private:
     MGPlacementDeletor* next_ = nullptr;
 };
 
-/// Destroys an object that was built with placement new.
+// Destroys an object that was built with placement new.
 template <class T>
 class MGPlacementDelete final : public MGPlacementDeletor {
 public:
@@ -30,10 +30,10 @@ private:
     T* object_;
 };
 
-/// Hands a deleter over to the library, which runs it when the memory manager stops. Any thread.
+// Hands a deleter over to the library, which runs it when the memory manager stops. Any thread.
 TESSEL_API void MGPlacementNewRegisterDeletor(MGPlacementDeletor* deletor);
 
-/// Destroys the deleters registered, newest first, each of which destroys its object.
+// Destroys the deleters registered, newest first, each of which destroys its object.
 TESSEL_API void MGPlacementNewRunCleanup();
 
 }  // namespace tessel

@@ -1,6 +1,6 @@
-/* The result of almost every operation: 0 is success.
-
-   Name, code and meaning stand in one list, from which the constants and MgErrMeaning are made. */
+// The result of almost every operation: 0 is success.
+//
+// Name, code and meaning stand in one list, from which the constants and MgErrMeaning are made.
 #ifndef TESSEL_BASE_MGERR_H
 #define TESSEL_BASE_MGERR_H
 
@@ -8,7 +8,7 @@
 
 typedef int32 MgErr;
 
-/* X(constant, code, meaning) */
+// X(constant, code, meaning)
 #define TESSEL_MGERR_LIST(X)                                                                   \
     X(kNoErr, 0, "success")                                                                    \
     X(kArgErr, 1, "bad argument")                                                              \
@@ -52,8 +52,8 @@ enum {
 
 TESSEL_BEGIN_C
 
-/* The meaning of a code in a few words, for people. "unknown error" for a code that is not in the list.
-   The text is constant. Any thread. */
+// The meaning of a code in a few words, for people. "unknown error" for a code that is not in the list.
+// The text is constant. Any thread.
 TESSEL_API const char* MgErrMeaning(MgErr err);
 
 TESSEL_END_C

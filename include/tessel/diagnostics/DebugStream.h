@@ -1,11 +1,11 @@
-/* Reports: one line of text with a level, the place it was made at and a constant of that place.
-
-       TESSEL_REPORT(kDebugWarning, 0x1B2C3D4Eu) << "Cannot lock " << count << " handles.";
-
-   DebugStream         the text of one report
-   TESSEL_REPORT       makes a report where it stands
-   ToDebugStream       appends a value; other headers add overloads for their own types
-   DbgFmt...           values written in a form of their own: hexadecimal, pointers, four-character codes */
+// Reports: one line of text with a level, the place it was made at and a constant of that place.
+//
+//     TESSEL_REPORT(kDebugWarning, 0x1B2C3D4Eu) << "Cannot lock " << count << " handles.";
+//
+// DebugStream         the text of one report
+// TESSEL_REPORT       makes a report where it stands
+// ToDebugStream       appends a value; other headers add overloads for their own types
+// DbgFmt...           values written in a form of their own: hexadecimal, pointers, four-character codes
 #ifndef TESSEL_DIAGNOSTICS_DEBUGSTREAM_H
 #define TESSEL_DIAGNOSTICS_DEBUGSTREAM_H
 
@@ -22,9 +22,9 @@
 
 namespace tessel {
 
-/// The text of one report while it is made. At most 255 bytes fit, what goes beyond is dropped; the text is always
-/// terminated. The file and identifier texts are kept by address. Belongs to one thread. Works at all times: before the
-/// library is started and after it is stopped too.
+// The text of one report while it is made. At most 255 bytes fit, what goes beyond is dropped; the text is always
+// terminated. The file and identifier texts are kept by address. Belongs to one thread. Works at all times: before the
+// library is started and after it is stopped too.
 class TESSEL_API DebugStream {
 public:
     DebugStream(CStr file, int32 line, CStr identifier, _DebugOutputLevel level) noexcept;
@@ -35,13 +35,13 @@ public:
     void SetSiteCode(uint32 siteCode) noexcept { siteCode_ = siteCode; }
 
     void Append(char byte) noexcept { Append(&byte, &byte + 1); }
-    void Append(CStr text) noexcept;                           ///< null appends nothing
-    void Append(const char* begin, const char* end) noexcept;  ///< an empty range appends nothing
+    void Append(CStr text) noexcept;                           // null appends nothing
+    void Append(const char* begin, const char* end) noexcept;  // an empty range appends nothing
 
     CStr Text() const noexcept { return text_ ? text_ : ""; }
     size_t Length() const noexcept { return static_cast<size_t>(write_ - text_); }
 
-    /// Hands the report to DebugOutputCallHandler, then gives the buffer back. Nothing can be appended after it.
+    // Hands the report to DebugOutputCallHandler, then gives the buffer back. Nothing can be appended after it.
     void Process();
 
 private:
@@ -61,10 +61,10 @@ private:
 TESSEL_API void ToDebugStream(DebugStream& stream, char byte);
 TESSEL_API void ToDebugStream(DebugStream& stream, CStr text);
 TESSEL_API void ToDebugStream(DebugStream& stream, std::string_view text);
-TESSEL_API void ToDebugStream(DebugStream& stream, const LStr* text);        ///< the bytes; null appends nothing
-TESSEL_API void ToDebugStream(DebugStream& stream, LStrHandle text);         ///< the bytes; null appends nothing
-TESSEL_API void ToDebugStream(DebugStream& stream, const LStrHandle* text);  ///< the bytes; null appends nothing
-TESSEL_API void ToDebugStream(DebugStream& stream, short value);             ///< decimal, as all integers
+TESSEL_API void ToDebugStream(DebugStream& stream, const LStr* text);        // the bytes; null appends nothing
+TESSEL_API void ToDebugStream(DebugStream& stream, LStrHandle text);         // the bytes; null appends nothing
+TESSEL_API void ToDebugStream(DebugStream& stream, const LStrHandle* text);  // the bytes; null appends nothing
+TESSEL_API void ToDebugStream(DebugStream& stream, short value);             // decimal, as all integers
 TESSEL_API void ToDebugStream(DebugStream& stream, int value);
 TESSEL_API void ToDebugStream(DebugStream& stream, long value);
 TESSEL_API void ToDebugStream(DebugStream& stream, long long value);
@@ -73,18 +73,18 @@ TESSEL_API void ToDebugStream(DebugStream& stream, unsigned short value);
 TESSEL_API void ToDebugStream(DebugStream& stream, unsigned int value);
 TESSEL_API void ToDebugStream(DebugStream& stream, unsigned long value);
 TESSEL_API void ToDebugStream(DebugStream& stream, unsigned long long value);
-TESSEL_API void ToDebugStream(DebugStream& stream, float value);            ///< six digits after the point
-TESSEL_API void ToDebugStream(DebugStream& stream, double value);           ///< six digits after the point
+TESSEL_API void ToDebugStream(DebugStream& stream, float value);            // six digits after the point
+TESSEL_API void ToDebugStream(DebugStream& stream, double value);           // six digits after the point
 TESSEL_API void ToDebugStream(DebugStream& stream, const cmplx64& value);   ///< "(re, im)"
 TESSEL_API void ToDebugStream(DebugStream& stream, const cmplx128& value);  ///< "(re, im)"
-TESSEL_API void ToDebugStream(DebugStream& stream, void (*function)());     ///< the address, upper-case hexadecimal
+TESSEL_API void ToDebugStream(DebugStream& stream, void (*function)());     // the address, upper-case hexadecimal
 
 template <class R, class... A>
 void ToDebugStream(DebugStream& stream, R (*function)(A...)) {
     ToDebugStream(stream, reinterpret_cast<void (*)()>(function));
 }
 
-/// A value with a written form of its own. The helpers below hold their value; texts are kept by address.
+// A value with a written form of its own. The helpers below hold their value; texts are kept by address.
 class TESSEL_API DbgFmtToDebugStream {
 public:
     virtual void ToDebugStream(DebugStream& stream) const = 0;
@@ -97,7 +97,7 @@ inline void ToDebugStream(DebugStream& stream, const DbgFmtToDebugStream& value)
     value.ToDebugStream(stream);
 }
 
-/// A CStr as it is. Null writes nothing.
+// A CStr as it is. Null writes nothing.
 class TESSEL_API DbgFmtCStr final : public DbgFmtToDebugStream {
 public:
     explicit DbgFmtCStr(CStr text) : text_(text) {}
@@ -107,7 +107,7 @@ private:
     CStr text_;
 };
 
-/// The bytes of a PStr. Null writes nothing.
+// The bytes of a PStr. Null writes nothing.
 class TESSEL_API DbgFmtPStr final : public DbgFmtToDebugStream {
 public:
     explicit DbgFmtPStr(ConstPStr text) : text_(text) {}
@@ -117,7 +117,7 @@ private:
     ConstPStr text_;
 };
 
-/// "0x" and at least eight lower-case hexadecimal digits.
+// "0x" and at least eight lower-case hexadecimal digits.
 class TESSEL_API DbgFmtPtr final : public DbgFmtToDebugStream {
 public:
     explicit DbgFmtPtr(int value) : value_(static_cast<unsigned int>(value)) {}
@@ -130,7 +130,7 @@ private:
     uintptr_t value_;
 };
 
-/// "0x" and at least eight lower-case hexadecimal digits.
+// "0x" and at least eight lower-case hexadecimal digits.
 class TESSEL_API DbgFmtHex final : public DbgFmtToDebugStream {
 public:
     explicit DbgFmtHex(uint32 value) : value_(value) {}
@@ -140,7 +140,7 @@ private:
     uint32 value_;
 };
 
-/// The four bytes of a code in memory order, a control character as a space.
+// The four bytes of a code in memory order, a control character as a space.
 class TESSEL_API DbgFmtQuadChar final : public DbgFmtToDebugStream {
 public:
     explicit DbgFmtQuadChar(int value) : value_(static_cast<uint32>(value)) {}
@@ -153,7 +153,7 @@ private:
     uint32 value_;
 };
 
-/// "0x" and the identifier of a thread in lower-case hexadecimal digits; the calling thread's by default.
+// "0x" and the identifier of a thread in lower-case hexadecimal digits; the calling thread's by default.
 class TESSEL_API DbgFmtSysThreadID final : public DbgFmtToDebugStream {
 public:
     DbgFmtSysThreadID();
@@ -164,7 +164,7 @@ private:
     uintptr_t threadID_;
 };
 
-/// A number already formatted: at most 31 bytes of text, held here.
+// A number already formatted: at most 31 bytes of text, held here.
 class TESSEL_API DbgFmtNum final : public DbgFmtToDebugStream {
 public:
     explicit DbgFmtNum(CStr text) noexcept;
@@ -174,8 +174,8 @@ private:
     char text_[32];
 };
 
-/// A value in a format of the caller's, which must hold exactly one conversion, one that suits the type; else
-/// "__DbgFmtType: Bad Format__" is written. At most 31 bytes.
+// A value in a format of the caller's, which must hold exactly one conversion, one that suits the type; else
+// "__DbgFmtType: Bad Format__" is written. At most 31 bytes.
 template <class T>
 class DbgFmtType final : public DbgFmtToDebugStream {
     static_assert(std::is_scalar_v<T>, "a printf conversion takes a number or a pointer");
@@ -193,7 +193,7 @@ private:
     char text_[32] = {};
 };
 
-/// A report that is processed at the end of the statement that makes it.
+// A report that is processed at the end of the statement that makes it.
 class TESSEL_API DebugReport {
 public:
     DebugReport(CStr file, int32 line, CStr identifier, _DebugOutputLevel level, uint32 siteCode);
@@ -201,7 +201,7 @@ public:
     DebugReport(const DebugReport&) = delete;
     DebugReport& operator=(const DebugReport&) = delete;
 
-    /// Appends anything that some ToDebugStream takes. Found where the value's type is declared.
+    // Appends anything that some ToDebugStream takes. Found where the value's type is declared.
     template <class T>
     DebugReport& operator<<(const T& value) {
         ToDebugStream(stream_, value);
@@ -215,7 +215,7 @@ private:
 
 }  // namespace tessel
 
-/// Makes a report: TESSEL_REPORT(level, siteCode) << ...; the site code is a constant of this place alone.
+// Makes a report: TESSEL_REPORT(level, siteCode) << ...; the site code is a constant of this place alone.
 #    define TESSEL_REPORT(level, siteCode) ::tessel::DebugReport(__FILE__, __LINE__, __func__, (level), (siteCode))
 
 #endif

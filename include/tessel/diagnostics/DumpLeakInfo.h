@@ -1,4 +1,4 @@
-/* Leak reports: what is still living in a tracker, written to a text file and summed up in a report. */
+// Leak reports: what is still living in a tracker, written to a text file and summed up in a report.
 #ifndef TESSEL_DIAGNOSTICS_DUMPLEAKINFO_H
 #define TESSEL_DIAGNOSTICS_DUMPLEAKINFO_H
 
@@ -6,11 +6,11 @@
 
 TESSEL_BEGIN_C
 
-/* Reports the unreported records of a tracker (null: does nothing). When there are more than expected, each is written
-   to the named file in the system's temporary folder, and a level-3 report tells how many more; else a level-0 report
-   tells the total. The file is created afresh and readable by the user alone, since it shows what the objects hold. No
-   link is followed, and another user's file is left alone; that no file, or not all of it, could be written is
-   reported (level 2). Neither atomic nor durable. Any thread. */
+// Reports the unreported records of a tracker (null: does nothing). When there are more than expected, each is written
+// to the named file in the system's temporary folder, and a level-3 report tells how many more; else a level-0 report
+// tells the total. The file is created afresh and readable by the user alone, since it shows what the objects hold. No
+// link is followed, and another user's file is left alone; that no file, or not all of it, could be written is
+// reported (level 2). Neither atomic nor durable. Any thread.
 TESSEL_API void DumpLeakInfo(AllocTrackerPtr tracker, int32 expected, CStr name, CStr fileName);
 
 TESSEL_END_C
@@ -19,7 +19,7 @@ TESSEL_END_C
 
 namespace tessel {
 
-/// Writes a leak report. The texts are kept by address.
+// Writes a leak report. The texts are kept by address.
 class TESSEL_API LeakDumper : public AllocDumper {
 public:
     LeakDumper(int32 expected, const char* name, const char* fileName);
@@ -29,12 +29,12 @@ public:
 
     const char* ObjBeingTrackedName() override;
     bool GetShowStackNames() override;
-    /// Writes to the open file, else to a level-0 report.
+    // Writes to the open file, else to a level-0 report.
     void FormatToOutput(const char* format, ...) override __attribute__((format(printf, 2, 3)));
-    /// At most 254 bytes, each that cannot be printed as ".". Of an object that cannot be read, none.
+    // At most 254 bytes, each that cannot be printed as ".". Of an object that cannot be read, none.
     void DumpItemContents(const void* address, uint32 size) override;
 
-    /// The report described at DumpLeakInfo.
+    // The report described at DumpLeakInfo.
     void DumpLeaks(AllocTracker& tracker);
 
 private:

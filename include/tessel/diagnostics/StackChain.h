@@ -1,7 +1,7 @@
-/* Call stacks: recording the calls that led here, and naming them.
-
-   Recording follows the frame pointers within the calling thread's stack. It makes no system call and no allocation and
-   cannot fault, so that it can be done for every object made. */
+// Call stacks: recording the calls that led here, and naming them.
+//
+// Recording follows the frame pointers within the calling thread's stack. It makes no system call and no allocation and
+// cannot fault, so that it can be done for every object made.
 #ifndef TESSEL_DIAGNOSTICS_STACKCHAIN_H
 #define TESSEL_DIAGNOSTICS_STACKCHAIN_H
 
@@ -11,25 +11,25 @@
 
 namespace tessel {
 
-/// Records return addresses. Belongs to one thread while it records.
+// Records return addresses. Belongs to one thread while it records.
 class TESSEL_API StackChain {
 public:
-    /// Records from the caller's frame, leaving out the `skip` innermost frames. With 0 the first address recorded lies
-    /// in the function that calls Record.
+    // Records from the caller's frame, leaving out the `skip` innermost frames. With 0 the first address recorded lies
+    // in the function that calls Record.
     virtual void Record(int32 skip) = 0;
-    /// Records from a given frame: its return address first, then those of the frames that called it.
+    // Records from a given frame: its return address first, then those of the frames that called it.
     virtual void RecordFrom(const void* framePointer, const void* returnAddress, int32 skip) = 0;
 
 protected:
     ~StackChain() = default;
 
-    /// The walk: stores up to `capacity` addresses and returns how many. The frame must be one of the calling thread's;
-    /// the walk ends at the first frame that is not.
+    // The walk: stores up to `capacity` addresses and returns how many. The frame must be one of the calling thread's;
+    // the walk ends at the first frame that is not.
     static int32 RecordToBuf(const void** addresses, int32 capacity, const void* framePointer,
                              const void* returnAddress, int32 skip) noexcept;
 };
 
-/// Holds at most N addresses.
+// Holds at most N addresses.
 template <int32 N>
 class StackChainFS final : public StackChain {
 public:
@@ -47,7 +47,7 @@ private:
     const void* addresses_[N];
 };
 
-/// The name of a code address. "<unknown>" stands for what is not known.
+// The name of a code address. "<unknown>" stands for what is not known.
 class TESSEL_API FrameDecoder {
 public:
     explicit FrameDecoder(const void* address);
@@ -55,9 +55,9 @@ public:
     const void* Address() const { return address_; }
     const char* Module() const { return module_; }
     const char* Symbol() const { return symbol_; }
-    uintptr_t Offset() const { return offset_; }  ///< of the address from the start of the symbol
+    uintptr_t Offset() const { return offset_; }  // of the address from the start of the symbol
 
-    /// Module and symbol, "%s %s".
+    // Module and symbol, "%s %s".
     const char* Name() const { return name_; }
 
 private:

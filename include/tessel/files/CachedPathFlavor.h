@@ -1,5 +1,5 @@
-/* What a host that knows whether an item exists may cache about its path, under kPathFlavorKey, so that queries about a
-   missing item need not touch the disk. */
+// What a host that knows whether an item exists may cache about its path, under kPathFlavorKey, so that queries about a
+// missing item need not touch the disk.
 #ifndef TESSEL_FILES_CACHEDPATHFLAVOR_H
 #define TESSEL_FILES_CACHEDPATHFLAVOR_H
 
@@ -14,7 +14,7 @@ inline constexpr char kPathFlavorKey[] = "FExists";
 
 class CachedPathFlavor : public PathRef::CachedItem {
 public:
-    /* Neither a file nor a folder: there is no such item, nor anything below it. */
+    // Neither a file nor a folder: there is no such item, nor anything below it.
     CachedPathFlavor(uint32 lifetime, RelationToMetaData relation, bool isFile, bool isFolder)
         : CachedItem(lifetime, relation), isFile_(isFile), isFolder_(isFolder) {}
 

@@ -1,36 +1,36 @@
-/* The user's and the system's standard folders. Any thread. */
+// The user's and the system's standard folders. Any thread.
 #ifndef TESSEL_FILES_SYSTEMDIRS_H
 #define TESSEL_FILES_SYSTEMDIRS_H
 
 #include <tessel/base/MgErr.h>
 
-/* Kinds of folder. Several kinds are the same folder. */
+// Kinds of folder. Several kinds are the same folder.
 typedef int32 SystemDirType;
 enum {
     kSystemDirUserHome = 0,
     kSystemDirUserDesktop = 1,
     kSystemDirUserDocuments = 2,
     kSystemDirUserApplicationData = 3,
-    kSystemDirUserApplicationData2 = 4, /* as 3 */
+    kSystemDirUserApplicationData2 = 4,  // as 3
     kSystemDirTemporary = 5,
     kSystemDirPublicDocuments = 6,
     kSystemDirPublicApplicationData = 7,
-    kSystemDirPublicApplicationData2 = 8, /* as 7 */
+    kSystemDirPublicApplicationData2 = 8,  // as 7
     kSystemDirSystem = 9,
-    kSystemDirSystem2 = 10, /* as 9 */
+    kSystemDirSystem2 = 10,  // as 9
     kSystemDirProgramFiles = 11,
     kSystemDirSystemVolume = 12,
-    kSystemDirPublicApplicationData3 = 13 /* as 7 */
+    kSystemDirPublicApplicationData3 = 13  // as 7
 };
 
 TESSEL_BEGIN_C
 
-/* The folder of a kind; a missing one is made when `create` is not 0. *path is made when it is null; when the system
-   has no such folder it stays as it was, and the result is kNoErr. kArgErr: unknown kind. Lets OVExcept (kGenericErr)
-   out when the system does not tell the temporary folder. */
+// The folder of a kind; a missing one is made when `create` is not 0. *path is made when it is null; when the system
+// has no such folder it stays as it was, and the result is kNoErr. kArgErr: unknown kind. Lets OVExcept (kGenericErr)
+// out when the system does not tell the temporary folder.
 TESSEL_API MgErr GetSystemDir(SystemDirType kind, int32 create, Path* path);
 
-/* Not provided: kNotFoundErr when `kind` is not 0, else kArgErr. */
+// Not provided: kNotFoundErr when `kind` is not 0, else kArgErr.
 TESSEL_API MgErr FGetOSFolderPath(Path path, int32 kind);
 
 TESSEL_END_C
@@ -40,7 +40,7 @@ TESSEL_END_C
 
 namespace tessel {
 
-/* The same as objects: an empty absolute path when there is no such folder. Raise OVExcept on failure. */
+// The same as objects: an empty absolute path when there is no such folder. Raise OVExcept on failure.
 class TESSEL_API SystemDirs {
 public:
     SystemDirs() = delete;

@@ -1,4 +1,4 @@
-/* The library's services that a host can take hold of, or make its own services depend on. */
+// The library's services that a host can take hold of, or make its own services depend on.
 #ifndef TESSEL_FRAME_CORESERVICES_H
 #define TESSEL_FRAME_CORESERVICES_H
 
@@ -8,8 +8,8 @@
 
 namespace tessel {
 
-/// The service object, built on the first call and again after it was stopped. Null when memory runs out. The host
-/// starts HardWaitBehavior and OccurrenceManager itself; the others are started by InitTesselBase.
+// The service object, built on the first call and again after it was stopped. Null when memory runs out. The host
+// starts HardWaitBehavior and OccurrenceManager itself; the others are started by InitTesselBase.
 TESSEL_API IServiceObject* MemoryManagerService();
 TESSEL_API IServiceObject* PathManagerService();
 TESSEL_API IServiceObject* ProtectedAtomicOperationsService();

@@ -1,6 +1,6 @@
-/* Start and stop of the library, on the host's start-up thread:
-
-       InitTesselBase();  InitTesselAppSupport();  ...  UninitTesselAppSupport();  UninitTesselBase(); */
+// Start and stop of the library, on the host's start-up thread:
+//
+// InitTesselBase();  InitTesselAppSupport();  ...  UninitTesselAppSupport();  UninitTesselBase();
 #ifndef TESSEL_FRAME_TESSELINIT_H
 #define TESSEL_FRAME_TESSELINIT_H
 
@@ -8,19 +8,17 @@
 
 TESSEL_BEGIN_C
 
-/* Starts the core services: reports, events, mutexes, memory, paths, files. 2 when memory runs out, else the result of
-   the service that failed. Once until undone. */
+// Starts the core services: reports, events, mutexes, memory, paths, files. 2 when memory runs out, else the result of
+// the service that failed. Once until undone.
 TESSEL_API MgErr InitTesselBase(void);
 
-/* Stops them in the reverse order, with the leak reports; application support first when it is still started. Always 0.
- */
+// Stops them in the reverse order, with the leak reports; application support first when it is still started. Always 0.
 TESSEL_API MgErr UninitTesselBase(void);
 
-/* Starts configuration, threads and resources. Does nothing before InitTesselBase, and when they are started. Always 0.
- */
+// Starts configuration, threads and resources. Does nothing before InitTesselBase, and when they are started. Always 0.
 TESSEL_API MgErr InitTesselAppSupport(void);
 
-/* Stops them. Does nothing when they are not started. Always 0. */
+// Stops them. Does nothing when they are not started. Always 0.
 TESSEL_API MgErr UninitTesselAppSupport(void);
 
 TESSEL_END_C

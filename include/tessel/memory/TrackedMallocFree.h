@@ -1,8 +1,8 @@
-/* Tracked allocation: what is not freed by the stop of the library is named in a leak report, with the place it was
-   made.
-
-   The flat functions work before start and after stop too (then untracked). In C++, derive from tessel::TrackedObject
-   to have a class allocated that way, and give containers tessel::TrackedAllocator. */
+// Tracked allocation: what is not freed by the stop of the library is named in a leak report, with the place it was
+// made.
+//
+// The flat functions work before start and after stop too (then untracked). In C++, derive from tessel::TrackedObject
+// to have a class allocated that way, and give containers tessel::TrackedAllocator.
 #ifndef TESSEL_MEMORY_TRACKEDMALLOCFREE_H
 #define TESSEL_MEMORY_TRACKEDMALLOCFREE_H
 
@@ -11,16 +11,16 @@
 
 TESSEL_BEGIN_C
 
-/* `size` bytes, aligned for any plain type; null when there is no memory. Free with TrackedFree. Any thread. */
+// `size` bytes, aligned for any plain type; null when there is no memory. Free with TrackedFree. Any thread.
 TESSEL_API void* TrackedMalloc(size_t size);
 
-/* Frees what TrackedMalloc gave. Null is fine. Damaged guard bytes are only reported. Any thread. */
+// Frees what TrackedMalloc gave. Null is fine. Damaged guard bytes are only reported. Any thread.
 TESSEL_API void TrackedFree(void* address);
 
-/* The leak report of the tracked blocks that live now and were not reported yet, into "ovnewdelleaks.txt". */
+// The leak report of the tracked blocks that live now and were not reported yet, into "ovnewdelleaks.txt".
 TESSEL_API void TrackedMallocDumpTracker(void);
 
-/* Marks the tracked blocks that live now as reported: later reports name only newer ones. */
+// Marks the tracked blocks that live now as reported: later reports name only newer ones.
 TESSEL_API void TrackedMallocResetTracker(void);
 
 TESSEL_END_C
@@ -30,12 +30,12 @@ TESSEL_END_C
 
 namespace tessel {
 
-/* operator new and operator delete over the functions above: 0 bytes give a block of their own, out of memory throws
-   std::bad_alloc whose text is "bad allocation". The forms of a class or a program that replaces its own. */
+// operator new and operator delete over the functions above: 0 bytes give a block of their own, out of memory throws
+// std::bad_alloc whose text is "bad allocation". The forms of a class or a program that replaces its own.
 TESSEL_API void* TrackedNew(size_t size);
 TESSEL_API void* TrackedNewNoThrow(size_t size) noexcept;
 
-/* Base of classes whose objects are tracked when made with new. */
+// Base of classes whose objects are tracked when made with new.
 class TrackedObject {
 public:
     static void* operator new(size_t size) { return TrackedNew(size); }
@@ -50,7 +50,7 @@ public:
     static void operator delete[](void* address, const std::nothrow_t&) noexcept { TrackedFree(address); }
 };
 
-/* Allocator for standard containers. */
+// Allocator for standard containers.
 template <class T>
 struct TrackedAllocator {
     static_assert(alignof(T) <= alignof(max_align_t), "TrackedMalloc aligns for plain types only");

@@ -1,10 +1,10 @@
-/* Real arithmetic and mathematics on single, double and extended operands (the final S, D or X of a name).
-
-   Operands and results are passed by pointer, so that a caller can use any member in the same way. A result may be
-   stored over an operand. Pointers must not be null and are not checked, except those to the results of a member that
-   has two: a null one is not stored. Nothing fails: a NaN operand gives a NaN (but x to the power 0 and 1 to any power
-   are 1), a result without a value is a NaN or an infinity. How results are rounded is said in
-   <tessel/numerics/RoundingUtil.h>. Any thread. */
+// Real arithmetic and mathematics on single, double and extended operands (the final S, D or X of a name).
+//
+// Operands and results are passed by pointer, so that a caller can use any member in the same way. A result may be
+// stored over an operand. Pointers must not be null and are not checked, except those to the results of a member that
+// has two: a null one is not stored. Nothing fails: a NaN operand gives a NaN (but x to the power 0 and 1 to any power
+// are 1), a result without a value is a NaN or an infinity. How results are rounded is said in
+// <tessel/numerics/RoundingUtil.h>. Any thread.
 #ifndef TESSEL_NUMERICS_REALMATH_H
 #define TESSEL_NUMERICS_REALMATH_H
 
@@ -12,165 +12,165 @@
 
 TESSEL_BEGIN_C
 
-/* ---- arithmetic and rounding ---- */
+// ---- arithmetic and rounding ----------------------------------------------------------------------------------------
 
-/* x + y */
+// x + y
 TESSEL_API void RTfAddS(const float* x, const float* y, float* result);
 TESSEL_API void RTfAddD(const double* x, const double* y, double* result);
 TESSEL_API void RTfAddX(const floatExt* x, const floatExt* y, floatExt* result);
 
-/* x - y */
+// x - y
 TESSEL_API void RTfSubS(const float* x, const float* y, float* result);
 TESSEL_API void RTfSubD(const double* x, const double* y, double* result);
 TESSEL_API void RTfSubX(const floatExt* x, const floatExt* y, floatExt* result);
 
-/* x y */
+// x y
 TESSEL_API void RTfMulS(const float* x, const float* y, float* result);
 TESSEL_API void RTfMulD(const double* x, const double* y, double* result);
 TESSEL_API void RTfMulX(const floatExt* x, const floatExt* y, floatExt* result);
 
-/* x / y */
+// x / y
 TESSEL_API void RTfDivS(const float* x, const float* y, float* result);
 TESSEL_API void RTfDivD(const double* x, const double* y, double* result);
 TESSEL_API void RTfDivX(const floatExt* x, const floatExt* y, floatExt* result);
 
-/* x - floor(x / y) y, the remainder that has the sign of y, or +0: RTfModD of -7 and 3 is 2. */
+// x - floor(x / y) y, the remainder that has the sign of y, or +0: RTfModD of -7 and 3 is 2.
 TESSEL_API void RTfModS(const float* x, const float* y, float* result);
 TESSEL_API void RTfModD(const double* x, const double* y, double* result);
 TESSEL_API void RTfModX(const floatExt* x, const floatExt* y, floatExt* result);
 
-/* The remainder of the truncated quotient, which has the sign of x. RTfRemX is not provided: it is reported (fatal) and
-   gives a NaN. */
+// The remainder of the truncated quotient, which has the sign of x. RTfRemX is not provided: it is reported (fatal) and
+// gives a NaN.
 TESSEL_API void RTfRemS(const float* x, const float* y, float* result);
 TESSEL_API void RTfRemD(const double* x, const double* y, double* result);
 TESSEL_API void RTfRemX(const floatExt* x, const floatExt* y, floatExt* result);
 
-/* floor(x / y), and x - y times that (as RTfMod). */
+// floor(x / y), and x - y times that (as RTfMod).
 TESSEL_API void RTfQRemS(const float* x, const float* y, float* quotient, float* remainder);
 TESSEL_API void RTfQRemD(const double* x, const double* y, double* quotient, double* remainder);
 TESSEL_API void RTfQRemX(const floatExt* x, const floatExt* y, floatExt* quotient, floatExt* remainder);
 
-/* The larger and the smaller of two; both NaN when one operand is. Equal operands give x. */
+// The larger and the smaller of two; both NaN when one operand is. Equal operands give x.
 TESSEL_API void RTfMaxMinS(const float* x, const float* y, float* max, float* min);
 TESSEL_API void RTfMaxMinD(const double* x, const double* y, double* max, double* min);
 TESSEL_API void RTfMaxMinX(const floatExt* x, const floatExt* y, floatExt* max, floatExt* min);
 
-/* |x| */
+// |x|
 TESSEL_API void RTfAbsS(const float* x, float* result);
 TESSEL_API void RTfAbsD(const double* x, double* result);
 TESSEL_API void RTfAbsX(const floatExt* x, floatExt* result);
 
-/* -x */
+// -x
 TESSEL_API void RTfNegS(const float* x, float* result);
 TESSEL_API void RTfNegD(const double* x, double* result);
 TESSEL_API void RTfNegX(const floatExt* x, floatExt* result);
 
-/* x + 1 */
+// x + 1
 TESSEL_API void RTfIncS(const float* x, float* result);
 TESSEL_API void RTfIncD(const double* x, double* result);
 TESSEL_API void RTfIncX(const floatExt* x, floatExt* result);
 
-/* x - 1 */
+// x - 1
 TESSEL_API void RTfDecS(const float* x, float* result);
 TESSEL_API void RTfDecD(const double* x, double* result);
 TESSEL_API void RTfDecX(const floatExt* x, floatExt* result);
 
-/* 1 / x */
+// 1 / x
 TESSEL_API void RTfRecipS(const float* x, float* result);
 TESSEL_API void RTfRecipD(const double* x, double* result);
 TESSEL_API void RTfRecipX(const floatExt* x, floatExt* result);
 
-/* Square root; a negative x gives a NaN. */
+// Square root; a negative x gives a NaN.
 TESSEL_API void RTfSqrtS(const float* x, float* result);
 TESSEL_API void RTfSqrtD(const double* x, double* result);
 TESSEL_API void RTfSqrtX(const floatExt* x, floatExt* result);
 
-/* -1, 0 or 1. */
+// -1, 0 or 1.
 TESSEL_API void RTfSignS(const float* x, float* result);
 TESSEL_API void RTfSignD(const double* x, double* result);
 TESSEL_API void RTfSignX(const floatExt* x, floatExt* result);
 
-/* Nearest integer, halves to even; a zero is +0. */
+// Nearest integer, halves to even; a zero is +0.
 TESSEL_API void RTfRoundS(const float* x, float* result);
 TESSEL_API void RTfRoundD(const double* x, double* result);
 TESSEL_API void RTfRoundX(const floatExt* x, floatExt* result);
 
-/* Smallest integer not below x. */
+// Smallest integer not below x.
 TESSEL_API void RTfCeilS(const float* x, float* result);
 TESSEL_API void RTfCeilD(const double* x, double* result);
 TESSEL_API void RTfCeilX(const floatExt* x, floatExt* result);
 
-/* Largest integer not above x. */
+// Largest integer not above x.
 TESSEL_API void RTfFloorS(const float* x, float* result);
 TESSEL_API void RTfFloorD(const double* x, double* result);
 TESSEL_API void RTfFloorX(const floatExt* x, floatExt* result);
 
-/* x times 2 to the power trunc(n). */
+// x times 2 to the power trunc(n).
 TESSEL_API void RTfiScaleS(const float* x, const float* n, float* result);
 TESSEL_API void RTfiScaleD(const double* x, const double* n, double* result);
 TESSEL_API void RTfiScaleX(const floatExt* x, const floatExt* n, floatExt* result);
 
-/* x as mantissa times 2 to the power exponent, 1 <= |mantissa| < 2; both 0 for x = 0. An infinity has mantissa and
-   exponent infinite, a NaN both NaN. */
+// x as mantissa times 2 to the power exponent, 1 <= |mantissa| < 2; both 0 for x = 0. An infinity has mantissa and
+// exponent infinite, a NaN both NaN.
 TESSEL_API void RTfGetMantExpS(const float* x, float* mantissa, float* exponent);
 TESSEL_API void RTfGetMantExpD(const double* x, double* mantissa, double* exponent);
 TESSEL_API void RTfGetMantExpX(const floatExt* x, floatExt* mantissa, floatExt* exponent);
 
-/* ---- logarithms: of 0 -infinity, of a negative value or a NaN the NaN of the precision ---- */
+// ---- logarithms: of 0 -infinity, of a negative value or a NaN the NaN of the precision ------------------------------
 
-/* Natural */
+// Natural
 TESSEL_API void RTfLognS(const float* x, float* result);
 TESSEL_API void RTfLognD(const double* x, double* result);
 TESSEL_API void RTfLognX(const floatExt* x, floatExt* result);
 
-/* Base 10 */
+// Base 10
 TESSEL_API void RTfLog10S(const float* x, float* result);
 TESSEL_API void RTfLog10D(const double* x, double* result);
 TESSEL_API void RTfLog10X(const floatExt* x, floatExt* result);
 
-/* Base 2 */
+// Base 2
 TESSEL_API void RTfLog2S(const float* x, float* result);
 TESSEL_API void RTfLog2D(const double* x, double* result);
 TESSEL_API void RTfLog2X(const floatExt* x, floatExt* result);
 
-/* ln(1 + x), exact for small x: of -1 -infinity, below it a NaN. */
+// ln(1 + x), exact for small x: of -1 -infinity, below it a NaN.
 TESSEL_API void RTfLognp1S(const float* x, float* result);
 TESSEL_API void RTfLognp1D(const double* x, double* result);
 TESSEL_API void RTfLognp1X(const floatExt* x, floatExt* result);
 
-/* Base `base`: ln x / ln base. */
+// Base `base`: ln x / ln base.
 TESSEL_API void RTfLogxS(const float* base, const float* x, float* result);
 TESSEL_API void RTfLogxD(const double* base, const double* x, double* result);
 TESSEL_API void RTfLogxX(const floatExt* base, const floatExt* x, floatExt* result);
 
-/* ---- powers ---- */
+// ---- powers ---------------------------------------------------------------------------------------------------------
 
-/* e to the power x */
+// e to the power x
 TESSEL_API void RTfExpS(const float* x, float* result);
 TESSEL_API void RTfExpD(const double* x, double* result);
 TESSEL_API void RTfExpX(const floatExt* x, floatExt* result);
 
-/* e to the power x, minus 1; exact for small x. */
+// e to the power x, minus 1; exact for small x.
 TESSEL_API void RTfExpm1S(const float* x, float* result);
 TESSEL_API void RTfExpm1D(const double* x, double* result);
 TESSEL_API void RTfExpm1X(const floatExt* x, floatExt* result);
 
-/* 10 to the power x */
+// 10 to the power x
 TESSEL_API void RTfPow10S(const float* x, float* result);
 TESSEL_API void RTfPow10D(const double* x, double* result);
 TESSEL_API void RTfPow10X(const floatExt* x, floatExt* result);
 
-/* 2 to the power x */
+// 2 to the power x
 TESSEL_API void RTfPow2S(const float* x, float* result);
 TESSEL_API void RTfPow2D(const double* x, double* result);
 TESSEL_API void RTfPow2X(const floatExt* x, floatExt* result);
 
-/* x to the power y */
+// x to the power y
 TESSEL_API void RTfPowxS(const float* x, const float* y, float* result);
 TESSEL_API void RTfPowxD(const double* x, const double* y, double* result);
 TESSEL_API void RTfPowxX(const floatExt* x, const floatExt* y, floatExt* result);
 
-/* ---- trigonometry, in radians ---- */
+// ---- trigonometry, in radians ---------------------------------------------------------------------------------------
 
 TESSEL_API void RTfSinS(const float* x, float* result);
 TESSEL_API void RTfSinD(const double* x, double* result);
@@ -184,27 +184,27 @@ TESSEL_API void RTfTanS(const float* x, float* result);
 TESSEL_API void RTfTanD(const double* x, double* result);
 TESSEL_API void RTfTanX(const floatExt* x, floatExt* result);
 
-/* Sine and cosine at once. */
+// Sine and cosine at once.
 TESSEL_API void RTfSinCosS(const float* x, float* sine, float* cosine);
 TESSEL_API void RTfSinCosD(const double* x, double* sine, double* cosine);
 TESSEL_API void RTfSinCosX(const floatExt* x, floatExt* sine, floatExt* cosine);
 
-/* 1 / cos x */
+// 1 / cos x
 TESSEL_API void RTfSecS(const float* x, float* result);
 TESSEL_API void RTfSecD(const double* x, double* result);
 TESSEL_API void RTfSecX(const floatExt* x, floatExt* result);
 
-/* 1 / sin x */
+// 1 / sin x
 TESSEL_API void RTfCscS(const float* x, float* result);
 TESSEL_API void RTfCscD(const double* x, double* result);
 TESSEL_API void RTfCscX(const floatExt* x, floatExt* result);
 
-/* 1 / tan x */
+// 1 / tan x
 TESSEL_API void RTfCotS(const float* x, float* result);
 TESSEL_API void RTfCotD(const double* x, double* result);
 TESSEL_API void RTfCotX(const floatExt* x, floatExt* result);
 
-/* sin x / x; 1 at 0. */
+// sin x / x; 1 at 0.
 TESSEL_API void RTfSincS(const float* x, float* result);
 TESSEL_API void RTfSincD(const double* x, double* result);
 TESSEL_API void RTfSincX(const floatExt* x, floatExt* result);
@@ -221,7 +221,7 @@ TESSEL_API void RTfAtanS(const float* x, float* result);
 TESSEL_API void RTfAtanD(const double* x, double* result);
 TESSEL_API void RTfAtanX(const floatExt* x, floatExt* result);
 
-/* Angle of the point (x, y), from -pi to pi: atan2(y, x). */
+// Angle of the point (x, y), from -pi to pi: atan2(y, x).
 TESSEL_API void RTfAtan2S(const float* x, const float* y, float* result);
 TESSEL_API void RTfAtan2D(const double* x, const double* y, double* result);
 TESSEL_API void RTfAtan2X(const floatExt* x, const floatExt* y, floatExt* result);
@@ -250,7 +250,7 @@ TESSEL_API void RTfAtanhS(const float* x, float* result);
 TESSEL_API void RTfAtanhD(const double* x, double* result);
 TESSEL_API void RTfAtanhX(const floatExt* x, floatExt* result);
 
-/* ---- predicates: 1 or 0. A comparison with a NaN is false, except NE, which is true ---- */
+// ---- predicates: 1 or 0. A comparison with a NaN is false, except NE, which is true ---------------------------------
 
 TESSEL_API int32 RTfIsNanS(const float* x);
 TESSEL_API int32 RTfIsNanD(const double* x);

@@ -1,4 +1,4 @@
-/* How PathRef::ToAbbreviatedDisplayStrings shortens paths that are too long to be shown. */
+// How PathRef::ToAbbreviatedDisplayStrings shortens paths that are too long to be shown.
 #ifndef TESSEL_PATHS_PATHABBREVIATION_H
 #define TESSEL_PATHS_PATHABBREVIATION_H
 
@@ -8,14 +8,14 @@
 
 namespace tessel {
 
-/* Says which text is too long to be shown. */
+// Says which text is too long to be shown.
 class TESSEL_API PathRef::MeasurementStyle {
 public:
     virtual ~MeasurementStyle();
     virtual bool StringIsTooLong(const StringType& text) const = 0;
 };
 
-/* More than `maximum` characters are too long; a multi-byte character is one. */
+// More than `maximum` characters are too long; a multi-byte character is one.
 class TESSEL_API PathRef::CharCountMeasurementStyle : public PathRef::MeasurementStyle {
 public:
     explicit CharCountMeasurementStyle(uint32 maximum);
@@ -26,7 +26,7 @@ private:
     uint32 maximum_;
 };
 
-/* Makes the texts, one for each path, in their order. kArgErr for a null `out`; raises what a writer raises. */
+// Makes the texts, one for each path, in their order. kArgErr for a null `out`; raises what a writer raises.
 class TESSEL_API PathRef::AbbreviationStyle {
 public:
     AbbreviationStyle();
@@ -34,7 +34,7 @@ public:
     virtual MgErr PerformAbbreviation(const std::list<PathRef>& paths, std::vector<StringType>* out,
                                       const MeasurementStyle& measure) const = 0;
 
-    /* Whether whole paths are shown also where the last names would do. */
+    // Whether whole paths are shown also where the last names would do.
     virtual bool GetForceFullPathStrings() const;
     virtual void SetForceFullPathStrings(bool force);
 
@@ -42,7 +42,7 @@ private:
     bool forceFullPathStrings_ = false;
 };
 
-/* Shows the last names when they all differ, else the whole paths; too long a text loses its front to "...". */
+// Shows the last names when they all differ, else the whole paths; too long a text loses its front to "...".
 class TESSEL_API PathRef::TrimFromFrontAbbreviationStyle : public PathRef::AbbreviationStyle {
 public:
     TrimFromFrontAbbreviationStyle();

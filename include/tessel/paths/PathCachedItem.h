@@ -1,8 +1,8 @@
-/* What a path can have cached about itself (PathRef::Cache): an item with a lifetime, and items that hold a value.
-
-   A host derives its own from PathRef::CachedItem. Lifetimes are milliseconds; 2^31 - 1 is the
-   longest, and longer ones become it. The library calls an item, and deletes it, with no lock of its own held, on any
-   thread. */
+// What a path can have cached about itself (PathRef::Cache): an item with a lifetime, and items that hold a value.
+//
+// A host derives its own from PathRef::CachedItem. Lifetimes are milliseconds; 2^31 - 1 is the
+// longest, and longer ones become it. The library calls an item, and deletes it, with no lock of its own held, on any
+// thread.
 #ifndef TESSEL_PATHS_PATHCACHEDITEM_H
 #define TESSEL_PATHS_PATHCACHEDITEM_H
 
@@ -16,20 +16,20 @@ namespace tessel {
 class TESSEL_API PathRef::CachedItem : public TrackedObject {
 public:
     enum RelationToMetaData : int32 {
-        kDependsOnFile = 0, /* dropped by FlushCache, that is whenever the library changes the file */
-        kIndependent = 1    /* stays until it expires */
+        kDependsOnFile = 0,  // dropped by FlushCache, that is whenever the library changes the file
+        kIndependent = 1     // stays until it expires
     };
 
     CachedItem(uint32 lifetime, RelationToMetaData relation);
 
-    virtual bool IsA(const char* className) const; /* true for the item's own class and for "CachedItem" */
+    virtual bool IsA(const char* className) const;  // true for the item's own class and for "CachedItem"
     virtual ~CachedItem();
     virtual bool Expired() const;
-    virtual bool Invalidate() const; /* whether FlushCache drops it */
+    virtual bool Invalidate() const;  // whether FlushCache drops it
     virtual void Reset(uint32 lifetime);
-    virtual uint32 Size() const;   /* bytes of memory */
-    virtual uint32 Rotten() const; /* milliseconds since it expired; 0 before */
-    virtual void Attached();       /* called when the item has been stored */
+    virtual uint32 Size() const;    // bytes of memory
+    virtual uint32 Rotten() const;  // milliseconds since it expired; 0 before
+    virtual void Attached();        // called when the item has been stored
 
     CachedItem(const CachedItem&) = delete;
     CachedItem& operator=(const CachedItem&) = delete;

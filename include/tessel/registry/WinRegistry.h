@@ -1,40 +1,40 @@
-/* The settings registry: keys that hold keys and values, under seven roots.
-
-     root->OpenSubKey("SOFTWARE\\Maker\\Product", key.Out())      then      key->GetStringValue("Path")
-
-   Names ignore case. An operation that returns an MgErr returns kNoErr, kArgErr (a missing argument), kMemFullErr or
-   kRegistryErr (the registry refused); why it failed is the platform's number in GetLastError (87, 14, 2 not found, 5
-   access denied, 6 closed ...), which is 0 after success. Where it is said, an operation raises an OVExcept.
-
-   Text and data that a key returns lie in the key's value buffer: valid until the next read on that key. Null stands
-   for no value. A null or empty value name is the key's unnamed value. The uint8 forms take the same names and texts as
-   bytes.
-
-   TESSEL_REGISTRY names the folder that holds all, by an absolute name. With a relative one there is no registry: it is
-   reported when a root is first asked for, and every operation fails with 6.
-
-   A key is for one thread at a time, and may be released before what was made from it. The roots may be used by any
-   thread to open and create keys. */
+// The settings registry: keys that hold keys and values, under seven roots.
+//
+//   root->OpenSubKey("SOFTWARE\\Maker\\Product", key.Out())      then      key->GetStringValue("Path")
+//
+// Names ignore case. An operation that returns an MgErr returns kNoErr, kArgErr (a missing argument), kMemFullErr or
+// kRegistryErr (the registry refused); why it failed is the platform's number in GetLastError (87, 14, 2 not found, 5
+// access denied, 6 closed ...), which is 0 after success. Where it is said, an operation raises an OVExcept.
+//
+// Text and data that a key returns lie in the key's value buffer: valid until the next read on that key. Null stands
+// for no value. A null or empty value name is the key's unnamed value. The uint8 forms take the same names and texts as
+// bytes.
+//
+// TESSEL_REGISTRY names the folder that holds all, by an absolute name. With a relative one there is no registry: it is
+// reported when a root is first asked for, and every operation fails with 6.
+//
+// A key is for one thread at a time, and may be released before what was made from it. The roots may be used by any
+// thread to open and create keys.
 #ifndef TESSEL_REGISTRY_WINREGISTRY_H
 #define TESSEL_REGISTRY_WINREGISTRY_H
 
 #include <tessel/base/MgErr.h>
 #include <tessel/base/Types.h>
 
-/* Views of the registry: two stores beside each other. */
+// Views of the registry: two stores beside each other.
 #define kRegistryViewDefault ((uint32)0)
 #define kRegistryViewOf64Bit ((uint32)0x100)
 
-/* Types of values, as the registry defines them. */
+// Types of values, as the registry defines them.
 enum {
     kRegistryTypeNone = 0,
     kRegistryTypeString = 1,
-    kRegistryTypeExpandString = 2, /* with references to environment variables, %NAME% */
+    kRegistryTypeExpandString = 2,  // with references to environment variables, %NAME%
     kRegistryTypeBinary = 3,
     kRegistryTypeInt32 = 4,
     kRegistryTypeInt32BigEndian = 5,
     kRegistryTypeLink = 6,
-    kRegistryTypeMultiString = 7, /* zero-terminated texts, and an empty one behind the last */
+    kRegistryTypeMultiString = 7,  // zero-terminated texts, and an empty one behind the last
     kRegistryTypeInt64 = 11
 };
 
@@ -42,44 +42,44 @@ enum {
 
 namespace tessel {
 
-/// A value as it was when it was read. The texts and the data live as long as the object.
+// A value as it was when it was read. The texts and the data live as long as the object.
 class TESSEL_API IWinRegistryValue {
 public:
     virtual ~IWinRegistryValue() = default;
     virtual CStr GetName() = 0;
-    virtual const void* GetData() = 0;  ///< null when the value could not be read
+    virtual const void* GetData() = 0;  // null when the value could not be read
     virtual uint32 GetSize() = 0;
     virtual uint32 GetType() = 0;
     virtual uint32 GetLastError() = 0;
-    /// The text of type 1; of type 2 with the references to environment variables expanded, once; null for other types.
-    /// Raises kRegistryErr or kGenericErr when it cannot be expanded.
+    // The text of type 1; of type 2 with the references to environment variables expanded, once; null for other types.
+    // Raises kRegistryErr or kGenericErr when it cannot be expanded.
     virtual CStr GetString() = 0;
-    /// Destroys it. Only for the owner: the current value of an enumeration belongs to the enumeration.
+    // Destroys it. Only for the owner: the current value of an enumeration belongs to the enumeration.
     virtual void Release() = 0;
 };
 
 class IWinRegistryKey;
 
-/// Walks over the subkeys of a key. Stands before the first one at first.
+// Walks over the subkeys of a key. Stands before the first one at first.
 class TESSEL_API IWinRegistryKeyEnumeration {
 public:
     virtual ~IWinRegistryKeyEnumeration() = default;
     virtual uint32 GetLastError() = 0;
-    /// The current subkey, open for reading; null before the first and behind the last. Valid until MoveNext or
-    /// Release.
+    // The current subkey, open for reading; null before the first and behind the last. Valid until MoveNext or
+    // Release.
     virtual IWinRegistryKey* GetCurrent() = 0;
-    /// False behind the last (then GetLastError is 259) and on an error.
+    // False behind the last (then GetLastError is 259) and on an error.
     virtual bool MoveNext() = 0;
     virtual void Release() = 0;
 };
 
-/// Walks over the values of a key. Stands before the first one at first.
+// Walks over the values of a key. Stands before the first one at first.
 class TESSEL_API IWinRegistryValueEnumeration {
 public:
     virtual ~IWinRegistryValueEnumeration() = default;
     virtual uint32 GetLastError() = 0;
-    virtual IWinRegistryValue* GetCurrent() = 0;  ///< as in a key enumeration
-    virtual bool MoveNext() = 0;                  ///< as in a key enumeration
+    virtual IWinRegistryValue* GetCurrent() = 0;  // as in a key enumeration
+    virtual bool MoveNext() = 0;                  // as in a key enumeration
     virtual void Release() = 0;
 };
 
@@ -88,43 +88,43 @@ public:
     virtual ~IWinRegistryKey() = default;
 
     virtual bool IsOpen() = 0;
-    virtual CStr GetName() = 0;          ///< the last element of its path
-    virtual CStr GetFullName() = 0;      ///< from the root's name on, with backslashes
-    virtual int32 GetSubKeyCount() = 0;  ///< -1 on failure
-    virtual int32 GetValueCount() = 0;   ///< -1 on failure
-    virtual uint32 GetLastError() = 0;   ///< of the last operation on this key
+    virtual CStr GetName() = 0;          // the last element of its path
+    virtual CStr GetFullName() = 0;      // from the root's name on, with backslashes
+    virtual int32 GetSubKeyCount() = 0;  // -1 on failure
+    virtual int32 GetValueCount() = 0;   // -1 on failure
+    virtual uint32 GetLastError() = 0;   // of the last operation on this key
 
-    /// Opens a key below this one, `name` being one name or several with backslashes between them: for reading and
-    /// writing when writeAccess is positive, else for reading. The caller releases *key; null on failure.
+    // Opens a key below this one, `name` being one name or several with backslashes between them: for reading and
+    // writing when writeAccess is positive, else for reading. The caller releases *key; null on failure.
     virtual MgErr OpenSubKey(const uint8* name, int32 writeAccess, IWinRegistryKey** key) = 0;
     virtual MgErr OpenSubKey(CStr name, int32 writeAccess, IWinRegistryKey** key) = 0;
-    virtual MgErr OpenSubKey(const uint8* name, IWinRegistryKey** key) = 0;  ///< for reading
-    virtual MgErr OpenSubKey(CStr name, IWinRegistryKey** key) = 0;          ///< for reading
+    virtual MgErr OpenSubKey(const uint8* name, IWinRegistryKey** key) = 0;  // for reading
+    virtual MgErr OpenSubKey(CStr name, IWinRegistryKey** key) = 0;          // for reading
 
     virtual bool SubKeyExists(const uint8* name) = 0;
     virtual bool SubKeyExists(CStr name) = 0;
 
-    /// Opens a key below this one for reading and writing, and makes what is missing. The caller releases *key.
+    // Opens a key below this one for reading and writing, and makes what is missing. The caller releases *key.
     virtual MgErr CreateSubKey(const uint8* name, IWinRegistryKey** key) = 0;
     virtual MgErr CreateSubKey(CStr name, IWinRegistryKey** key) = 0;
 
-    /// The caller releases *enumeration.
+    // The caller releases *enumeration.
     virtual MgErr EnumerateSubKeys(IWinRegistryKeyEnumeration** enumeration) = 0;
     virtual MgErr EnumerateValues(IWinRegistryValueEnumeration** enumeration) = 0;
 
-    /// The text of a string value; one of type 2 with the references to environment variables expanded. Null when there
-    /// is no such value. Raises kRegistryTypeErr for a value of another type, kRegistryErr when it cannot be read or
-    /// expanded, kGenericErr when the expanded text is longer than 1 MiB.
+    // The text of a string value; one of type 2 with the references to environment variables expanded. Null when there
+    // is no such value. Raises kRegistryTypeErr for a value of another type, kRegistryErr when it cannot be read or
+    // expanded, kGenericErr when the expanded text is longer than 1 MiB.
     virtual CStr GetStringValue(const uint8* name) = 0;
     virtual CStr GetStringValue(CStr name) = 0;
     virtual CStr GetDefaultStringValue() = 0;
 
-    /// The raw data, its type and size (each output may be null). Null and zeros when there is no such value. Raises
-    /// kRegistryErr when it cannot be read. A value of size 0 is not null.
+    // The raw data, its type and size (each output may be null). Null and zeros when there is no such value. Raises
+    // kRegistryErr when it cannot be read. A value of size 0 is not null.
     virtual const void* QueryValue(const uint8* name, uint32* type, uint32* size) = 0;
     virtual const void* QueryValue(CStr name, uint32* type, uint32* size) = 0;
 
-    /// Stores a string (type 1) with its terminating zero.
+    // Stores a string (type 1) with its terminating zero.
     virtual MgErr SetStringValue(const uint8* name, const uint8* text) = 0;
     virtual MgErr SetStringValue(const uint8* name, CStr text) = 0;
     virtual MgErr SetStringValue(CStr name, const uint8* text) = 0;
@@ -132,30 +132,30 @@ public:
     virtual MgErr SetDefaultStringValue(const uint8* text) = 0;
     virtual MgErr SetDefaultStringValue(CStr text) = 0;
 
-    /// Stores the unnamed string of a subkey, which is made when it is missing.
+    // Stores the unnamed string of a subkey, which is made when it is missing.
     virtual MgErr SetSubKeyDefaultValue(const uint8* subKey, const uint8* text) = 0;
     virtual MgErr SetSubKeyDefaultValue(const uint8* subKey, CStr text) = 0;
     virtual MgErr SetSubKeyDefaultValue(CStr subKey, const uint8* text) = 0;
     virtual MgErr SetSubKeyDefaultValue(CStr subKey, CStr text) = 0;
 
-    /// Stores raw data of any type, at most 64 MiB of it (87 for more). Null data: nothing, when the size is 0.
+    // Stores raw data of any type, at most 64 MiB of it (87 for more). Null data: nothing, when the size is 0.
     virtual MgErr SetValue(const uint8* name, uint32 type, const void* data, uint32 size) = 0;
     virtual MgErr SetValue(CStr name, uint32 type, const void* data, uint32 size) = 0;
 
-    /// Deletes a subkey and everything below it. Stops at the first key that cannot be deleted.
+    // Deletes a subkey and everything below it. Stops at the first key that cannot be deleted.
     virtual MgErr DeleteSubKey(const uint8* name) = 0;
     virtual MgErr DeleteSubKey(CStr name) = 0;
 
-    /// Puts what was written onto the device.
+    // Puts what was written onto the device.
     virtual MgErr Flush() = 0;
-    /// Later operations fail with 6. Roots stay open.
+    // Later operations fail with 6. Roots stay open.
     virtual MgErr Close() = 0;
-    /// Closes and destroys the key. Nothing for a root.
+    // Closes and destroys the key. Nothing for a root.
     virtual void Release() = 0;
 };
 
-/* The roots, each in the view given (0 or 0x100; any other is reported and gives null). Made on first use, once a
-   process; the library's. Any thread. */
+// The roots, each in the view given (0 or 0x100; any other is reported and gives null). Made on first use, once a
+// process; the library's. Any thread.
 TESSEL_API IWinRegistryKey* GetClassesRootRegistryKey(uint32 view);
 TESSEL_API IWinRegistryKey* GetCurrentConfigRegistryKey(uint32 view);
 TESSEL_API IWinRegistryKey* GetCurrentUserRegistryKey(uint32 view);
@@ -164,7 +164,7 @@ TESSEL_API IWinRegistryKey* GetLocalMachineRegistryKey(uint32 view);
 TESSEL_API IWinRegistryKey* GetPerformanceDataRegistryKey(uint32 view);
 TESSEL_API IWinRegistryKey* GetUsersRegistryKey(uint32 view);
 
-/// Ends an object by its own release operation.
+// Ends an object by its own release operation.
 struct ReleaseDeletor {
     template <class T>
     void operator()(T* object) const {
@@ -172,7 +172,7 @@ struct ReleaseDeletor {
     }
 };
 
-/// Owns an object (or none) and ends it, at the end of a scope at the latest, by a deletor.
+// Owns an object (or none) and ends it, at the end of a scope at the latest, by a deletor.
 template <class T, class Deletor>
 class AutoDeletor {
 public:
@@ -186,12 +186,12 @@ public:
     T& operator*() const { return *object_; }
     explicit operator bool() const { return object_ != nullptr; }
 
-    /// For an out-parameter. Ends what is owned first.
+    // For an out-parameter. Ends what is owned first.
     T** Out() {
         Reset(nullptr);
         return &object_;
     }
-    /// Gives the object up to the caller.
+    // Gives the object up to the caller.
     T* Detach() {
         T* object = object_;
         object_ = nullptr;

@@ -1,4 +1,4 @@
-/* Readers and writers of resource files: a chain or a file with the operations that users want most. */
+// Readers and writers of resource files: a chain or a file with the operations that users want most.
 #ifndef TESSEL_RESOURCES_RFREADWRITE_H
 #define TESSEL_RESOURCES_RFREADWRITE_H
 
@@ -9,8 +9,8 @@
 
 namespace tessel {
 
-/* Reads resources of a chain or a file, which stays its maker's unless the reader opened it itself. Without one, every
-   read gives kResNotFoundErr. One thread at a time. */
+// Reads resources of a chain or a file, which stays its maker's unless the reader opened it itself. Without one, every
+// read gives kResNotFoundErr. One thread at a time.
 class TESSEL_API RFReader : public TrackedObject {
 public:
     RFReader() = default;
@@ -20,20 +20,20 @@ public:
     RFReader(const RFReader&) = delete;
     RFReader& operator=(const RFReader&) = delete;
 
-    /* Opens a file, which the reader owns. Whatever it read before is let go (closed when it was its own). */
+    // Opens a file, which the reader owns. Whatever it read before is let go (closed when it was its own).
     MgErr OpenPath(Path path, int32 mode, _FMFileType* type, _FMFileCreator* creator);
-    /* Closes and destroys the chain. kNotFoundErr: there is none. On another error the reader keeps it. */
+    // Closes and destroys the chain. kNotFoundErr: there is none. On another error the reader keeps it.
     MgErr Close();
 
-    /* The data in place; they stay loaded. `size` may be null. */
+    // The data in place; they stay loaded. `size` may be null.
     MgErr PtrToResDataInternal(ResType type, int32 id, const uint8** data, uint32* size);
     MgErr PtrToResDataByNameInternal(ResType type, ConstPStr name, const uint8** data, uint32* size);
 
-    /* The data as a handle that the caller owns. */
+    // The data as a handle that the caller owns.
     MgErr AllocDSHandle(ResType type, int32 id, UHandle* data);
     MgErr AllocDSHandleByName(ResType type, ConstPStr name, UHandle* data);
 
-    /* As the flat functions of almost the same names. */
+    // As the flat functions of almost the same names.
     MgErr GetString(int32 id, UHandle* data);
     MgErr GetPStr(int32 id, PStr string);
     MgErr GetIndString(PStr string, int32 id, int32 index);
@@ -41,11 +41,11 @@ public:
     MgErr GetPath(ResType type, int32 id, Path* path);
     MgErr GetIndPath(Path* path, int32 id, int32 index);
 
-    /* A refnum for the chain, made on first call, until it is released. 0 without a chain. */
+    // A refnum for the chain, made on first call, until it is released. 0 without a chain.
     virtual RsrcFile MapToObsoleteRsrcFile();
     MgErr ReleaseRsrcFileRefnum();
 
-    /* The chain. Reports when there is none. */
+    // The chain. Reports when there is none.
     ResChain* LowLevelResChain();
 
 protected:
@@ -56,7 +56,7 @@ protected:
     ResChain* fChain = nullptr;
 };
 
-/* Also changes a file. */
+// Also changes a file.
 class TESSEL_API RFReadWrite : public RFReader {
 public:
     RFReadWrite() = default;
@@ -65,26 +65,26 @@ public:
 
     static MgErr CreateResourceFile(Path path, int32 replace, _FMFileCreator creator, _FMFileType type, int32 unused);
 
-    /* Works on a new empty file in memory, which the writer owns. */
+    // Works on a new empty file in memory, which the writer owns.
     MgErr CreateMemoryResourceFile(_FMFileCreator creator, _FMFileType type);
 
-    /* `mode` 0 copies the bytes, else the file takes the handle on success. kGenericErr without a handle. */
+    // `mode` 0 copies the bytes, else the file takes the handle on success. kGenericErr without a handle.
     MgErr AddFromHandle(UHandle data, int32 mode, ResType type, int32 id, ConstPStr name);
     MgErr AddFromPtr(const void* data, uint32 size, ResType type, int32 id, ConstPStr name);
-    /* A resource that is not there is no error. */
+    // A resource that is not there is no error.
     MgErr Remove(ResType type, int32 id);
     MgErr ReplaceFromHandle(UHandle data, int32 mode, ResType type, int32 id, ConstPStr name);
     MgErr UpdateFile();
     RsrcFile MapToObsoleteRsrcFile() override;
 
-    /* The file. Reports when there is none. */
+    // The file. Reports when there is none.
     ResFile* LowLevelResFile();
 
 private:
     ResFile* File() const { return static_cast<ResFile*>(fChain); }
 };
 
-/* On the heap, for the caller to delete; null when memory is full. */
+// On the heap, for the caller to delete; null when memory is full.
 TESSEL_API RFReader* CreateRFReader(RsrcFile refnum);
 TESSEL_API RFReadWrite* CreateRFReadWrite();
 

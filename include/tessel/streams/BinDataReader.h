@@ -1,4 +1,4 @@
-/* Typed reading from an input buffer in the byte order of an Endianizer. */
+// Typed reading from an input buffer in the byte order of an Endianizer.
 #ifndef TESSEL_STREAMS_BINDATAREADER_H
 #define TESSEL_STREAMS_BINDATAREADER_H
 
@@ -12,15 +12,15 @@
 
 namespace tessel {
 
-/* Every read returns the value, or 0, null or empty text after an error. The first error stays: read all that belongs
-   together and ask GetError once at the end. Reading past the end is error 74.
-
-   The reader owns neither the buffer nor the Endianizer; both must outlive it. One thread at a time. */
+// Every read returns the value, or 0, null or empty text after an error. The first error stays: read all that belongs
+// together and ask GetError once at the end. Reading past the end is error 74.
+//
+// The reader owns neither the buffer nor the Endianizer; both must outlive it. One thread at a time.
 class TESSEL_API BinDataReader : public TrackedObject {
 public:
     BinDataReader(InputBuf* buffer, const Endianizer* endianizer);
 
-    virtual void Align(uint32 n); /* moves on to the next multiple of n bytes from the start of the buffer */
+    virtual void Align(uint32 n);  // moves on to the next multiple of n bytes from the start of the buffer
     virtual InputBuf* GetBuffer() const;
     virtual MgErr GetError();
 
@@ -32,31 +32,31 @@ public:
     virtual uint32 ReadU32();
     virtual int64 ReadI64();
     virtual uint64 ReadU64();
-    virtual int32 Read4Char(); /* four bytes as they are, never converted */
+    virtual int32 Read4Char();  // four bytes as they are, never converted
     virtual float ReadF32();
     virtual double ReadF64();
     virtual floatExt ReadFX();
     virtual uint8 ReadBool();
 
-    /* A flattened path. The caller destroys the path. Null for the null path and after an error. */
+    // A flattened path. The caller destroys the path. Null for the null path and after an error.
     virtual Path ReadPath();
 
-    /* A PStr padded to a multiple of `align` bytes (0 or 1: none). `out` holds 256 bytes. */
+    // A PStr padded to a multiple of `align` bytes (0 or 1: none). `out` holds 256 bytes.
     virtual void ReadPStr(PStr out, uint32 align);
     virtual void ReadPStrAsNarrow(std::string& out, uint32 align);
 
-    /* An LStr. Error 116 when its count is negative, or both above 2 MiB and more than the buffer holds.
-       The caller disposes of the handle; null stands for the empty string. */
+    // An LStr. Error 116 when its count is negative, or both above 2 MiB and more than the buffer holds.
+    // The caller disposes of the handle; null stands for the empty string.
     virtual void ReadLStrAsNarrow(std::string& out);
     virtual LStrHandle ReadLStr();
 
-    /* n bytes; all zero after an error. A null destination skips them. */
+    // n bytes; all zero after an error. A null destination skips them.
     virtual void ReadBytes(void* destination, uint32 n);
     virtual void Skip(uint32 n);
 
     virtual ~BinDataReader();
 
-    void SetError(MgErr err); /* unless there is one already */
+    void SetError(MgErr err);  // unless there is one already
 
     BinDataReader(const BinDataReader&) = delete;
     BinDataReader& operator=(const BinDataReader&) = delete;

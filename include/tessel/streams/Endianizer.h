@@ -1,5 +1,5 @@
-/* Byte order: helpers that turn a value around in place, and the Endianizers, which convert between the byte order of a
-   stream and the host's. */
+// Byte order: helpers that turn a value around in place, and the Endianizers, which convert between the byte order of a
+// stream and the host's.
 #ifndef TESSEL_STREAMS_ENDIANIZER_H
 #define TESSEL_STREAMS_ENDIANIZER_H
 
@@ -8,23 +8,23 @@
 
 TESSEL_BEGIN_C
 
-/* In place; the value may lie at any address. A null pointer is not allowed. Any thread. */
-TESSEL_API void SwapBW(void* value16); /* exchanges the two bytes of a 16-bit value */
-TESSEL_API void SwapWL(void* value32); /* exchanges the two 16-bit halves of a 32-bit value */
-TESSEL_API void RevBL(void* value32);  /* reverses the four bytes of a 32-bit value */
-TESSEL_API void RevBQ(void* value64);  /* reverses the eight bytes of a 64-bit value */
+// In place; the value may lie at any address. A null pointer is not allowed. Any thread.
+TESSEL_API void SwapBW(void* value16);  // exchanges the two bytes of a 16-bit value
+TESSEL_API void SwapWL(void* value32);  // exchanges the two 16-bit halves of a 32-bit value
+TESSEL_API void RevBL(void* value32);   // reverses the four bytes of a 32-bit value
+TESSEL_API void RevBQ(void* value64);   // reverses the eight bytes of a 64-bit value
 
 TESSEL_END_C
 
 #ifdef __cplusplus
 namespace tessel {
 
-/* Converts between stream bytes and host values. Immutable: one instance serves all threads.
-
-   Pointers may have any alignment. Single and double reals go through the 32- and 64-bit operations. An extended real
-   takes up StreamFXSize bytes: 16 in the standard form of the big- and little-endian Endianizers (sign and exponent in
-   the first two bytes, the fraction in the next eight, six zero bytes; the little-endian form is the reverse of it), 10
-   in the native one, which keeps the value as it lies in memory. */
+// Converts between stream bytes and host values. Immutable: one instance serves all threads.
+//
+// Pointers may have any alignment. Single and double reals go through the 32- and 64-bit operations. An extended real
+// takes up StreamFXSize bytes: 16 in the standard form of the big- and little-endian Endianizers (sign and exponent in
+// the first two bytes, the fraction in the next eight, six zero bytes; the little-endian form is the reverse of it), 10
+// in the native one, which keeps the value as it lies in memory.
 class TESSEL_API Endianizer {
 public:
     virtual ~Endianizer();
@@ -43,8 +43,8 @@ public:
     virtual void FromNativeFX(const floatExt& value, void* stream) const = 0;
     virtual void FromNative128(const void* value, void* stream) const = 0;
 
-    virtual uint32 StreamFXSize() const = 0; /* bytes of an extended real in the stream: 16 or 10 */
-    virtual int32 IsSwapping() const = 0;    /* 1 when the stream's order is not the host's, else 0 */
+    virtual uint32 StreamFXSize() const = 0;  // bytes of an extended real in the stream: 16 or 10
+    virtual int32 IsSwapping() const = 0;     // 1 when the stream's order is not the host's, else 0
 
 protected:
     Endianizer() = default;
@@ -52,7 +52,7 @@ protected:
     Endianizer& operator=(const Endianizer&) = default;
 };
 
-/* The three Endianizers. They belong to the library and live as long as it is loaded. Any thread. */
+// The three Endianizers. They belong to the library and live as long as it is loaded. Any thread.
 TESSEL_API const Endianizer* NativeEndianizer();
 TESSEL_API const Endianizer* BigEndianizer();
 TESSEL_API const Endianizer* LittleEndianizer();

@@ -1,7 +1,7 @@
-/* Input buffers: bytes to read, handed out as pointers to the next n of them.
-
-   The first error stays with the buffer: every later request yields null and that error. A buffer is used by one thread
-   at a time. */
+// Input buffers: bytes to read, handed out as pointers to the next n of them.
+//
+// The first error stays with the buffer: every later request yields null and that error. A buffer is used by one thread
+// at a time.
 #ifndef TESSEL_STREAMS_INPUTBUF_H
 #define TESSEL_STREAMS_INPUTBUF_H
 
@@ -15,15 +15,15 @@ namespace tessel {
 
 class TESSEL_API InputBuf : public TrackedObject {
 public:
-    /* A pointer to the next n bytes, which stays good as long as the buffer; the read position moves past them unless
-       peek is not 0. Stores the buffer's error. Null for n = 0 and after an error.
-
-       When fewer than n bytes remain: with `available` null, error 74 and null; otherwise a pointer to what remains
-       (null at the end), its length in `available` and no error. When n bytes remain, `available` is n. */
+    // A pointer to the next n bytes, which stays good as long as the buffer; the read position moves past them unless
+    // peek is not 0. Stores the buffer's error. Null for n = 0 and after an error.
+    //
+    // When fewer than n bytes remain: with `available` null, error 74 and null; otherwise a pointer to what remains
+    // (null at the end), its length in `available` and no error. When n bytes remain, `available` is n.
     virtual const void* GetDataPointer(uint32 n, MgErr& err, uint32* available = nullptr, int32 peek = 0) = 0;
 
-    virtual uint32 GetBytesRead() const = 0; /* the read position */
-    virtual uint32 GetSize() const = 0;      /* bytes in all; 0 after an error */
+    virtual uint32 GetBytesRead() const = 0;  // the read position
+    virtual uint32 GetSize() const = 0;       // bytes in all; 0 after an error
 
     virtual ~InputBuf();
 
@@ -34,7 +34,7 @@ protected:
     InputBuf() = default;
 };
 
-/* Reads a block of the caller's, which must stay where it is. A null pointer is an empty block. */
+// Reads a block of the caller's, which must stay where it is. A null pointer is an empty block.
 class TESSEL_API MemInputBuf final : public InputBuf {
 public:
     MemInputBuf(const void* data, uint32 size);
@@ -50,8 +50,8 @@ private:
     uint32 position_ = 0;
 };
 
-/* Reads the text of a string handle, which it takes from the caller's variable (set to null) and disposes of.
-   A null handle puts the buffer in error 1. */
+// Reads the text of a string handle, which it takes from the caller's variable (set to null) and disposes of.
+// A null handle puts the buffer in error 1.
 class TESSEL_API LStrInputBuf final : public InputBuf {
 public:
     explicit LStrInputBuf(LStrHandle& text);
@@ -60,7 +60,7 @@ public:
     uint32 GetSize() const override;
     ~LStrInputBuf() override;
 
-    /* Hands the string handle back to the caller, who owns it then; the buffer is in error 1 from now on. */
+    // Hands the string handle back to the caller, who owns it then; the buffer is in error 1 from now on.
     LStrHandle ReleaseOwnership();
 
 private:
@@ -70,7 +70,7 @@ private:
     uint32 position_ = 0;
 };
 
-/* A new buffer, or null when memory is short (the string handle then stays with the caller). The caller deletes it. */
+// A new buffer, or null when memory is short (the string handle then stays with the caller). The caller deletes it.
 TESSEL_API MemInputBuf* CreateMemInputBuf(const void* data, uint32 size);
 TESSEL_API LStrInputBuf* CreateLStrInputBuf(LStrHandle& text);
 

@@ -1,5 +1,5 @@
-/* String outputs: objects that write formatted text to the console, to the debugger channel, to a file, or to two such
-   outputs at once. The format language is that of strings/StringFmtPrint.h. */
+// String outputs: objects that write formatted text to the console, to the debugger channel, to a file, or to two such
+// outputs at once. The format language is that of strings/StringFmtPrint.h.
 #ifndef TESSEL_STRINGS_STRINGOUTPUT_H
 #define TESSEL_STRINGS_STRINGOUTPUT_H
 
@@ -14,21 +14,21 @@ namespace tessel {
 
 class FileLoc;
 
-/// Where formatted text goes. One output belongs to one thread at a time.
+// Where formatted text goes. One output belongs to one thread at a time.
 class TESSEL_API StringOutput : public TrackedObject {
 public:
-    /// How a file is opened. Any other value appends.
+    // How a file is opened. Any other value appends.
     enum OpenMode : int32 { kTruncate = 0, kAppendAtEnd = 1 };
 
     virtual ~StringOutput() = default;
     virtual void Open(OpenMode mode);
-    /// Print one piece of text of at most 2047 bytes; return how many prints there were so far.
+    // Print one piece of text of at most 2047 bytes; return how many prints there were so far.
     virtual int32 PrintData(CStr format, ...) = 0;
     virtual int32 PrintDataV(CStr format, va_list arguments) = 0;
     virtual void Flush();
 };
 
-/// Counts the prints, and drops one that is made while another is under way (by a report raised while printing).
+// Counts the prints, and drops one that is made while another is under way (by a report raised while printing).
 class TESSEL_API StringOutputBase : public StringOutput {
 public:
     int32 PrintData(CStr format, ...) override;
@@ -37,10 +37,10 @@ public:
 protected:
     static constexpr int32 kBufferSize = 2048;
 
-    /// Formats the text and sends it where it belongs.
+    // Formats the text and sends it where it belongs.
     virtual void WriteFormatted(CStr format, va_list arguments) = 0;
 
-    /// Formats into a buffer of `size` bytes, at most size - 1 and a terminator; returns the length.
+    // Formats into a buffer of `size` bytes, at most size - 1 and a terminator; returns the length.
     static int32 vsnprintf(char* buffer, int32 size, CStr format, va_list arguments);
 
 private:
@@ -48,7 +48,7 @@ private:
     std::atomic<bool> busy_{false};
 };
 
-/// Writes to the console, which it makes when there is none; the last such output takes it away again.
+// Writes to the console, which it makes when there is none; the last such output takes it away again.
 class TESSEL_API StringOutputWinConsole final : public StringOutputBase {
 public:
     StringOutputWinConsole();
@@ -60,7 +60,7 @@ private:
     char buffer_[kBufferSize];
 };
 
-/// Writes to the debugger channel.
+// Writes to the debugger channel.
 class TESSEL_API StringOutputWinDebugStr final : public StringOutputBase {
 private:
     void WriteFormatted(CStr format, va_list arguments) override;
@@ -68,10 +68,10 @@ private:
     char buffer_[kBufferSize];
 };
 
-/// Writes to a file once it is open; prints nothing before, or when it cannot be opened.
+// Writes to a file once it is open; prints nothing before, or when it cannot be opened.
 class TESSEL_API StringOutputFile final : public StringOutputBase {
 public:
-    /// Takes the location over.
+    // Takes the location over.
     explicit StringOutputFile(FileLoc* location) : location_(location) {}
     ~StringOutputFile() override;
     void Open(OpenMode mode) override;
@@ -86,10 +86,10 @@ private:
     char buffer_[kBufferSize];
 };
 
-/// Passes everything on to one output and then to another; either may be null.
+// Passes everything on to one output and then to another; either may be null.
 class TESSEL_API StringOutputFork final : public StringOutput {
 public:
-    /// `owns`: deletes both at its end.
+    // `owns`: deletes both at its end.
     StringOutputFork(StringOutput* first, StringOutput* second, bool owns)
         : first_(first), second_(second), owns_(owns) {}
     ~StringOutputFork() override;
@@ -97,7 +97,7 @@ public:
     StringOutputFork& operator=(const StringOutputFork&) = delete;
 
     void Open(OpenMode mode) override;
-    /// The result is the second output's, without one the first's.
+    // The result is the second output's, without one the first's.
     int32 PrintData(CStr format, ...) override;
     int32 PrintDataV(CStr format, va_list arguments) override;
     void Flush() override;
@@ -108,12 +108,12 @@ private:
     bool owns_;
 };
 
-/// Makes outputs, owned by the caller. Null when memory runs out.
+// Makes outputs, owned by the caller. Null when memory runs out.
 class TESSEL_API StringOutputFactory {
 public:
     static StringOutput* CreateDebugPrintOutput();
     static StringOutput* CreateConsoleOutput();
-    /// Takes the location over, unless it returns null.
+    // Takes the location over, unless it returns null.
     static StringOutput* CreateFileOutput(FileLoc* location);
 };
 

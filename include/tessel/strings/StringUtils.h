@@ -1,9 +1,9 @@
-/* StringUtils: functions on the standard strings.
-
-   Narrow text is bytes in the active code page, wide text is UTF-16. A plain function throws std::bad_alloc when memory
-   is short; its NoThrow form throws nothing and returns kArgErr for a null output pointer, kMemFullErr when memory is
-   short. A null source pointer or handle is the empty text. What cannot be converted becomes "?". Any thread, on
-   distinct data. */
+// StringUtils: functions on the standard strings.
+//
+// Narrow text is bytes in the active code page, wide text is UTF-16. A plain function throws std::bad_alloc when memory
+// is short; its NoThrow form throws nothing and returns kArgErr for a null output pointer, kMemFullErr when memory is
+// short. A null source pointer or handle is the empty text. What cannot be converted becomes "?". Any thread, on
+// distinct data.
 #ifndef TESSEL_STRINGS_STRINGUTILS_H
 #define TESSEL_STRINGS_STRINGUTILS_H
 
@@ -18,14 +18,13 @@
 namespace tessel {
 namespace StringUtils {
 
-/* Whether a conversion releases its source, a handle or a BSTR, afterwards. Any other value keeps it. */
+// Whether a conversion releases its source, a handle or a BSTR, afterwards. Any other value keeps it.
 enum DeallocationPolicy : int32 { kKeepSource = 0, kReleaseSource = 1 };
 
-/* Which ends Trim trims. */
+// Which ends Trim trims.
 enum StringTrimmingPolicy : int32 { kTrimStart = 1, kTrimEnd = 2, kTrimBoth = 3 };
 
-/* ---- to narrow, wide and UTF-8 -------------------------------------------------------------------------------------
- */
+// ---- to narrow, wide and UTF-8 --------------------------------------------------------------------------------------
 
 TESSEL_API std::string ToNarrowString(LStrHandle source, DeallocationPolicy policy);
 TESSEL_API std::string ToNarrowString(const LStr* source);
@@ -64,32 +63,30 @@ TESSEL_API std::string ToUTF8String(const std::string& source);
 TESSEL_API MgErr ToUTF8StringNoThrow(const std::u16string& source, std::string* out);
 TESSEL_API MgErr ToUTF8StringNoThrow(const std::string& source, std::string* out);
 
-/* ---- to the counted forms ------------------------------------------------------------------------------------------
- */
+// ---- to the counted forms -------------------------------------------------------------------------------------------
 
-/* At most 255 bytes; the buffer must take 256. Returns the buffer; null gives null. */
+// At most 255 bytes; the buffer must take 256. Returns the buffer; null gives null.
 TESSEL_API PStr ToPStr(const std::string& source, PStr buffer);
 TESSEL_API PStr ToPStr(const std::u16string& source, PStr buffer);
 TESSEL_API MgErr ToPStrNoThrow(const std::string& source, PStr buffer);
 TESSEL_API MgErr ToPStrNoThrow(const std::u16string& source, PStr buffer);
 
-/* A new handle, or *handle resized (created when it is null), which is also returned. The caller owns it. */
+// A new handle, or *handle resized (created when it is null), which is also returned. The caller owns it.
 TESSEL_API LStrHandle ToLStrHandle(const std::string& source);
 TESSEL_API LStrHandle ToLStrHandle(const std::string& source, LStrHandle* handle);
 TESSEL_API MgErr ToLStrHandleNoThrow(const std::string& source, LStrHandle* handle);
 
-/* Replaces *array by a new array with a handle for each string, which the caller owns; the old array, unless it is
-   null, is disposed of. On failure *array is unchanged. */
+// Replaces *array by a new array with a handle for each string, which the caller owns; the old array, unless it is
+// null, is disposed of. On failure *array is unchanged.
 TESSEL_API MgErr ToLStrArrayHandleNoThrow(const std::vector<std::string>& source, LStrArrayHandle* array);
 
-/* A new BSTR, which the caller frees with BSTRFree. */
+// A new BSTR, which the caller frees with BSTRFree.
 TESSEL_API BSTR ToBSTR(const std::string& source);
 TESSEL_API BSTR ToBSTR(const std::u16string& source);
 TESSEL_API MgErr ToBSTRNoThrow(const std::string& source, BSTR* out);
 TESSEL_API MgErr ToBSTRNoThrow(const std::u16string& source, BSTR* out);
 
-/* ---- assigning and appending ---------------------------------------------------------------------------------------
- */
+// ---- assigning and appending ----------------------------------------------------------------------------------------
 
 TESSEL_API MgErr AssignNoThrow(std::string* dst, const std::string& source);
 TESSEL_API MgErr AssignNoThrow(std::string* dst, CStr source);
@@ -102,10 +99,9 @@ TESSEL_API MgErr AppendNoThrow(std::string* dst, ConstPStr source);
 TESSEL_API MgErr AppendNoThrow(std::u16string* dst, const std::u16string& source);
 TESSEL_API MgErr AppendNoThrow(std::u16string* dst, const char16_t* source);
 
-/* ---- parts ---------------------------------------------------------------------------------------------------------
- */
+// ---- parts ----------------------------------------------------------------------------------------------------------
 
-/* The first (last) n characters; n of 0 or beyond the length is all of them. */
+// The first (last) n characters; n of 0 or beyond the length is all of them.
 TESSEL_API std::string Left(const std::string& text, uint32 n);
 TESSEL_API std::u16string Left(const std::u16string& text, uint32 n);
 TESSEL_API std::string Right(const std::string& text, uint32 n);
@@ -120,14 +116,13 @@ TESSEL_API bool EndsWith(const std::string& text, const std::string& end);
 TESSEL_API bool EndsWith(const std::u16string& text, char16_t c);
 TESSEL_API bool EndsWith(const std::u16string& text, const std::u16string& end);
 
-/* Whether it starts and ends with a double quote, or starts and ends with a single quote; one quote alone does. */
+// Whether it starts and ends with a double quote, or starts and ends with a single quote; one quote alone does.
 TESSEL_API bool IsSurroundedByQuotes(const std::string& text);
 TESSEL_API bool IsSurroundedByQuotes(const std::u16string& text);
 
-/* ---- editing in place: null is left alone --------------------------------------------------------------------------
- */
+// ---- editing in place: null is left alone ---------------------------------------------------------------------------
 
-/* Replaces every occurrence, left to right, resuming after each replacement. An empty `find` replaces nothing. */
+// Replaces every occurrence, left to right, resuming after each replacement. An empty `find` replaces nothing.
 TESSEL_API void SearchAndReplace(std::string* text, const std::string& find, const std::string& replacement);
 TESSEL_API void SearchAndReplace(std::u16string* text, const std::u16string& find, const std::u16string& replacement);
 
@@ -136,36 +131,35 @@ TESSEL_API void ToUpperCase(std::u16string* text);
 TESSEL_API void ToLowerCase(std::string* text);
 TESSEL_API void ToLowerCase(std::u16string* text);
 
-/* Removes spaces and tabs from the chosen ends. */
+// Removes spaces and tabs from the chosen ends.
 TESSEL_API void Trim(std::string* text, StringTrimmingPolicy policy);
 TESSEL_API void Trim(std::u16string* text, StringTrimmingPolicy policy);
 
-/* The elements with the separator between them. */
+// The elements with the separator between them.
 TESSEL_API void Join(const std::vector<std::string>& elements, const std::string& separator, std::string* out);
 TESSEL_API void Join(const std::vector<std::u16string>& elements, const std::u16string& separator, std::u16string* out);
 
-/* Removes each marker and what follows it up to, not including, the next CR or LF, or to the end. */
+// Removes each marker and what follows it up to, not including, the next CR or LF, or to the end.
 TESSEL_API void RemoveLineComments(std::string* text, const std::string& marker);
 TESSEL_API void RemoveLineComments(std::u16string* text, const std::u16string& marker);
 
-/* Removes each block from an opening marker through the next closing one. A block that is not closed stays. */
+// Removes each block from an opening marker through the next closing one. A block that is not closed stays.
 TESSEL_API void RemoveBlockComments(std::string* text, const std::string& opening, const std::string& closing);
 TESSEL_API void RemoveBlockComments(std::u16string* text, const std::u16string& opening, const std::u16string& closing);
 
-/* ---- comparing and hashing -----------------------------------------------------------------------------------------
- */
+// ---- comparing and hashing ------------------------------------------------------------------------------------------
 
-/* Without regard to case, as tolower and towlower of the current locale see it. Compare gives -1, 0 or 1. */
+// Without regard to case, as tolower and towlower of the current locale see it. Compare gives -1, 0 or 1.
 TESSEL_API bool CaseInsensitiveEqual(const std::string& a, const std::string& b);
 TESSEL_API bool CaseInsensitiveEqual(const std::u16string& a, const std::u16string& b);
 TESSEL_API int32 CaseInsensitiveCompare(const std::string& a, const std::string& b);
 TESSEL_API int32 CaseInsensitiveCompare(const std::u16string& a, const std::u16string& b);
 
-/* 28-bit ELF hash of the characters up to the first zero, or of their upper-case form. Characters are signed: it
-   differs from PStrHash32 for bytes above 127. */
+// 28-bit ELF hash of the characters up to the first zero, or of their upper-case form. Characters are signed: it
+// differs from PStrHash32 for bytes above 127.
 TESSEL_API int32 Hash(const std::string& text, bool caseInsensitive);
 
-/* Shared empty strings. */
+// Shared empty strings.
 TESSEL_API const std::string& EmptyNarrowString();
 TESSEL_API const std::u16string& EmptyWideString();
 

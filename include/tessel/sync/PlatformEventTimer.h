@@ -1,4 +1,4 @@
-/* Latency statistics in high-resolution time (time/HRTime.h). Callers serialise. */
+// Latency statistics in high-resolution time (time/HRTime.h). Callers serialise.
 #ifndef TESSEL_SYNC_PLATFORMEVENTTIMER_H
 #define TESSEL_SYNC_PLATFORMEVENTTIMER_H
 
@@ -13,11 +13,11 @@ class TESSEL_API PlatformEventTimer {
 public:
     PlatformEventTimer() = default;
 
-    /* From here on the time counts. */
+    // From here on the time counts.
     void Start();
-    /* Adds the time since Start to the statistics, unless the clock went backwards. */
+    // Adds the time since Start to the statistics, unless the clock went backwards.
     void RecordLatency();
-    /* Each output may be null. `third` is always 0. */
+    // Each output may be null. `third` is always 0.
     void GetLatencyStats(uint32* count, _HRTime* total, _HRTime* third, _HRTime* minimum, _HRTime* maximum) const;
 
 private:

@@ -1,4 +1,4 @@
-/* The plain mutex of the host, for what must not use ThMutex. Not recursive. */
+// The plain mutex of the host, for what must not use ThMutex. Not recursive.
 #ifndef TESSEL_SYNC_PLATFORMMUTEX_H
 #define TESSEL_SYNC_PLATFORMMUTEX_H
 
@@ -8,7 +8,7 @@
 
 namespace tessel {
 
-/* Every operation returns 0. */
+// Every operation returns 0.
 class TESSEL_API PlatformMutex {
 public:
     virtual ~PlatformMutex();
@@ -18,7 +18,7 @@ public:
     virtual MgErr Uninit() = 0;
 };
 
-/* A new mutex of this host, or null. Destroy: null is fine. */
+// A new mutex of this host, or null. Destroy: null is fine.
 TESSEL_API PlatformMutex* CreatePlatformMutex();
 TESSEL_API MgErr DestroyPlatformMutex(PlatformMutex* mutex);
 

@@ -1,10 +1,10 @@
-/* Thread-local storage: one pointer per thread and key, null at first. Any thread. */
+// Thread-local storage: one pointer per thread and key, null at first. Any thread.
 #ifndef TESSEL_SYNC_THLOCALSTORAGE_H
 #define TESSEL_SYNC_THLOCALSTORAGE_H
 
 #include <tessel/base/Types.h>
 
-/* What ThLocalStorageAllocateKey returns when there is no key left. */
+// What ThLocalStorageAllocateKey returns when there is no key left.
 #define kThNoLocalStorageKey ((uint32)0xFFFFFFFF)
 
 TESSEL_BEGIN_C
@@ -13,7 +13,7 @@ TESSEL_API uint32 ThLocalStorageAllocateKey(void);
 TESSEL_API void ThLocalStorageSetValue(uint32 key, void* value);
 TESSEL_API void* ThLocalStorageGetValue(uint32 key);
 
-/* The values are the callers'. */
+// The values are the callers'.
 TESSEL_API void ThLocalStorageFreeKey(uint32 key);
 
 TESSEL_END_C

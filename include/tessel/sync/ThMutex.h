@@ -1,8 +1,8 @@
-/* Mutexes. Not recursive: a thread must not acquire a mutex that it holds.
-
-   ThMutexAcquire and ThMutexRelease are inline and cost one atomic operation each while nobody else wants the mutex.
-   A thread that finds it held spins briefly, then joins the count and sleeps; a release hands the mutex to one that
-   sleeps before anybody else can take it, so that no sleeper waits for ever. */
+// Mutexes. Not recursive: a thread must not acquire a mutex that it holds.
+//
+// ThMutexAcquire and ThMutexRelease are inline and cost one atomic operation each while nobody else wants the mutex.
+// A thread that finds it held spins briefly, then joins the count and sleeps; a release hands the mutex to one that
+// sleeps before anybody else can take it, so that no sleeper waits for ever.
 #ifndef TESSEL_SYNC_THMUTEX_H
 #define TESSEL_SYNC_THMUTEX_H
 
@@ -11,28 +11,28 @@
 #include <tessel/sync/ThEvent.h>
 
 typedef struct THMUTEXREC {
-    int32 count;     /* -1 when free; else the number of threads that hold it or sleep for it, minus one */
-    ThEvent event;   /* wakes one that sleeps */
-    uint32 verifier; /* kThMutexVerifier */
+    int32 count;      // -1 when free; else the number of threads that hold it or sleep for it, minus one
+    ThEvent event;    // wakes one that sleeps
+    uint32 verifier;  // kThMutexVerifier
 } THMUTEXREC;
 typedef THMUTEXREC* ThMutex;
 
-#define kThMutexVerifier ((uint32)0x7874754D) /* the bytes "Mutx" */
+#define kThMutexVerifier ((uint32)0x7874754D)  // the bytes "Mutx"
 
 TESSEL_BEGIN_C
 
-/* A new, free mutex in *mutex, owned by the caller; null there and kMemFullErr when it cannot be made. The name is not
-   used. */
+// A new, free mutex in *mutex, owned by the caller; null there and kMemFullErr when it cannot be made. The name is not
+// used.
 TESSEL_API MgErr ThMutexCreate(ThMutex* mutex, CStr name);
 
-/* Nothing for null; an error report for a wrong verifier. No thread may hold it. */
+// Nothing for null; an error report for a wrong verifier. No thread may hold it.
 TESSEL_API void ThMutexDestroy(ThMutex mutex);
 
-/* What the inline operations do when another thread holds the mutex, or sleeps for it. Not for null. */
+// What the inline operations do when another thread holds the mutex, or sleeps for it. Not for null.
 TESSEL_API void ThMutexAcquireHeld(ThMutex mutex);
 TESSEL_API void ThMutexWakeNext(ThMutex mutex);
 
-/* Both do nothing for null. */
+// Both do nothing for null.
 static inline void ThMutexAcquire(ThMutex mutex) {
     int32 free = -1;
     if (!mutex) return;
@@ -51,7 +51,7 @@ TESSEL_END_C
 
 namespace tessel {
 
-/* Holds a mutex for a scope. */
+// Holds a mutex for a scope.
 class ThMutexHolder {
 public:
     explicit ThMutexHolder(ThMutex mutex) : fMutex(mutex) { ThMutexAcquire(fMutex); }

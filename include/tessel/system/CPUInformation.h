@@ -1,50 +1,50 @@
-/* The processors of this machine. */
+// The processors of this machine.
 #ifndef TESSEL_SYSTEM_CPUINFORMATION_H
 #define TESSEL_SYSTEM_CPUINFORMATION_H
 
 #include <tessel/base/Types.h>
 
-/* Architectures that this library is built for. */
+// Architectures that this library is built for.
 enum { kCPUArchX86 = 3, kCPUArchX64 = 9 };
 
-/* The features that CPUInformation::GetFeatures knows are asked for with this selector. */
+// The features that CPUInformation::GetFeatures knows are asked for with this selector.
 #define kCPUFeatureSelector ((uint32)0x80000001)
 
 TESSEL_BEGIN_C
 
-/* The name of an architecture (0 to 10), "<unknown value>" for any other. Constant text. */
+// The name of an architecture (0 to 10), "<unknown value>" for any other. Constant text.
 TESSEL_API CStr GetCPUArchName(int32 arch);
 
-TESSEL_API void InitCPUInformation(void);   /* nothing: CPUInfo builds it */
-TESSEL_API void UninitCPUInformation(void); /* destroys what CPUInfo built */
+TESSEL_API void InitCPUInformation(void);    // nothing: CPUInfo builds it
+TESSEL_API void UninitCPUInformation(void);  // destroys what CPUInfo built
 
 TESSEL_END_C
 
 #ifdef __cplusplus
-#    include <string>
-
 #    include <tessel/diagnostics/DebugStream.h>
+
+#    include <string>
 
 namespace tessel {
 
-/* What a processor can do. */
+// What a processor can do.
 class TESSEL_API CPUFeatures {
 public:
     virtual ~CPUFeatures();
     virtual uint64 GetFlags() const = 0;
     virtual uint8 GetThreadsPerCore() const = 0;
 
-    static constexpr uint64 kCompareExchange8 = 512; /* 8 bytes at once */
+    static constexpr uint64 kCompareExchange8 = 512;  // 8 bytes at once
 };
 
-/* The machine that the processors are in. */
+// The machine that the processors are in.
 class TESSEL_API MachineDescription {
 public:
     virtual ~MachineDescription();
     virtual uint32 GetNumLogicalProcessors() const = 0;
     virtual uint32 GetNumCores() const = 0;
     virtual uint32 GetNumPackages() const = 0;
-    /* Null for a selector that is not known. */
+    // Null for a selector that is not known.
     virtual const CPUFeatures* GetFeatures(uint32 selector) const = 0;
 };
 
@@ -53,21 +53,21 @@ public:
     virtual int32 GetArch() const = 0;
     virtual const std::string& GetArchName() const = 0;
     virtual uint32 GetNumLogicalCPUs() const = 0;
-    virtual uint32 GetNumHardwareThreads() const = 0; /* threads of a core x cores */
+    virtual uint32 GetNumHardwareThreads() const = 0;  // threads of a core x cores
     virtual uint32 GetNumCores() const = 0;
     virtual uint32 GetNumPackages() const = 0;
-    /* Null when the selector or the machine is not known. */
+    // Null when the selector or the machine is not known.
     virtual const CPUFeatures* GetFeatures(uint32 selector) const = 0;
     virtual const MachineDescription* GetMachineDescription() const = 0;
-    /* Appends "CPUArch: x64, NumLogicalCPUs: 8". */
+    // Appends "CPUArch: x64, NumLogicalCPUs: 8".
     virtual void WriteToDebugStream(DebugStream& stream) const = 0;
     virtual ~CPUInformation();
 };
 
-/* Of this host. Built on the first call, the library's; null when memory runs out. */
+// Of this host. Built on the first call, the library's; null when memory runs out.
 TESSEL_API CPUInformation* CPUInfo();
 
-/* WriteToDebugStream, or "Invalid CPUInformation" for null. */
+// WriteToDebugStream, or "Invalid CPUInformation" for null.
 TESSEL_API void ToDebugStream(DebugStream& stream, const CPUInformation* info);
 
 }  // namespace tessel

@@ -1,4 +1,4 @@
-/* Operating system and processors together. */
+// Operating system and processors together.
 #ifndef TESSEL_SYSTEM_PLATFORMINFORMATION_H
 #define TESSEL_SYSTEM_PLATFORMINFORMATION_H
 
@@ -18,7 +18,7 @@ protected:
     virtual ~PlatformInformation();
 };
 
-/* OSInfo() and CPUInfo(). Built on the first call, the library's. */
+// OSInfo() and CPUInfo(). Built on the first call, the library's.
 TESSEL_API PlatformInformation* PlatformInfo();
 
 }  // namespace tessel

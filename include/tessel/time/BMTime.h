@@ -1,11 +1,11 @@
-/* Time stamps of high resolution: the performance counter (HiResClock), and absolute time (ATime128) with its
-   conversion from and to file times. Any thread; values are plain. */
+// Time stamps of high resolution: the performance counter (HiResClock), and absolute time (ATime128) with its
+// conversion from and to file times. Any thread; values are plain.
 #ifndef TESSEL_TIME_BMTIME_H
 #define TESSEL_TIME_BMTIME_H
 
 #include <tessel/base/Types.h>
 
-/* 100 ns since 1601-01-01 00:00:00 UTC, as two words. */
+// 100 ns since 1601-01-01 00:00:00 UTC, as two words.
 typedef struct FILETIME {
     uint32 dwLowDateTime;
     uint32 dwHighDateTime;
@@ -15,12 +15,12 @@ typedef struct FILETIME {
 
 namespace tessel {
 
-/* A count of the performance counter, or a difference of two. */
+// A count of the performance counter, or a difference of two.
 class TESSEL_API HiResClock {
 public:
     HiResClock() = default;
     void SetToNow();
-    /* The count, as an unsigned number, in seconds. */
+    // The count, as an unsigned number, in seconds.
     double ToSeconds() const;
     HiResClock operator+(const HiResClock& other) const;
     HiResClock operator-(const HiResClock& other) const;
@@ -29,32 +29,32 @@ private:
     uint64 fCount = 0;
 };
 
-/* Seconds since 1904-01-01 00:00:00 UTC as one signed number with 64 fraction bits: a time before the epoch has
-   negative seconds and a fraction that is not negative (-0.5 s is seconds -1, fraction 2^63). */
+// Seconds since 1904-01-01 00:00:00 UTC as one signed number with 64 fraction bits: a time before the epoch has
+// negative seconds and a fraction that is not negative (-0.5 s is seconds -1, fraction 2^63).
 class TESSEL_API ATime128 {
 public:
     ATime128() = default;
     ATime128(int64 seconds, uint64 fraction) : fFraction(fraction), fSeconds(seconds) {}
-    /* Exact, truncating toward zero below 2^-64 s. Infinities, NaNs and what is too large give the largest or, with the
-       sign bit set, the smallest value. */
+    // Exact, truncating toward zero below 2^-64 s. Infinities, NaNs and what is too large give the largest or, with the
+    // sign bit set, the smallest value.
     explicit ATime128(double seconds);
     double ToDouble() const;
 
-    /* Null outputs are skipped. */
+    // Null outputs are skipped.
     void Get(uint32* secondsHigh, uint32* secondsLow, uint32* fractionHigh, uint32* fractionLow) const;
     int64 GetInt64Seconds() const { return fSeconds; }
     uint64 GetUInt64Fraction() const { return fFraction; }
     void SetInt64Seconds(const int64& seconds) { fSeconds = seconds; }
     void SetUInt64Fraction(const uint64& fraction) { fFraction = fraction; }
 
-    /* Adds 2^-64 s. */
+    // Adds 2^-64 s.
     void IncrementLSB();
 
-    /* Each half alone; the fraction lies in [0, 1). */
+    // Each half alone; the fraction lies in [0, 1).
     double getSeconds() const;
     double getFraction() const;
 
-    /* Modulo 2^128. The product is rounded half away from zero. */
+    // Modulo 2^128. The product is rounded half away from zero.
     ATime128 operator+(const ATime128& other) const;
     ATime128 operator-(const ATime128& other) const;
     ATime128 operator-() const;
@@ -67,11 +67,11 @@ private:
     int64 fSeconds = 0;
 };
 
-/* From a count of 100 ns since 1601; to double precision, about half a microsecond these days. */
+// From a count of 100 ns since 1601; to double precision, about half a microsecond these days.
 TESSEL_API ATime128 ATime128FromHILOTime(const uint32& high, const uint32& low);
 TESSEL_API ATime128 ATime128FromFILETIME(const FILETIME& fileTime);
 
-/* Rounded down to 100 ns. */
+// Rounded down to 100 ns.
 TESSEL_API FILETIME FILETIMEFromATime128(const ATime128& time);
 
 TESSEL_API ATime128 GetCurrentATime128();

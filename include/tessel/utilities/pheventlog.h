@@ -1,4 +1,4 @@
-/* The event log: an interface that hosts link against. It records nothing, and reads as an empty log. Any thread. */
+// The event log: an interface that hosts link against. It records nothing, and reads as an empty log. Any thread.
 #ifndef TESSEL_UTILITIES_PHEVENTLOG_H
 #define TESSEL_UTILITIES_PHEVENTLOG_H
 
@@ -7,7 +7,7 @@
 
 TESSEL_BEGIN_C
 
-/* These do nothing. */
+// These do nothing.
 TESSEL_API void InitEventLoggingMgr(void);
 TESSEL_API void UnInitEventLoggingMgr(void);
 TESSEL_API void EventLoggingEnable(int32 enable);
@@ -18,11 +18,10 @@ TESSEL_API void EventLoggingLogUserEvent(uint32 event, uint32 value);
 TESSEL_API void EventLoggingLogUserBuffer(uint32 event, const void* data, uint32 size);
 TESSEL_API void EventLoggingEnumerateThreads(void (*visit)(uint32 threadID, void* context), void* context);
 
-/* Sets each output to 0. Null outputs are skipped. */
+// Sets each output to 0. Null outputs are skipped.
 TESSEL_API void EventLoggingGetFlags(uint32* flags, uint32* mask);
 
-/* Sets each output to 0 and the text (null: none) to the empty string. Null outputs are skipped. Returns 0: no entry.
- */
+// Sets each output to 0 and the text (null: none) to the empty string. Null outputs are skipped. Returns 0: no entry.
 TESSEL_API int32 EventLoggingEnumLogEntry(uint32 selector, uint32* threadID, uint32* event, uint32* value,
                                           uint32* timeHigh, uint32* timeLow, LStrHandle text);
 

@@ -1,11 +1,11 @@
 #include "platform/Clock.h"
 
+#include "platform/posix/FileHandles.h"
+#include "platform/posix/SystemCalls.h"
+
 #include <errno.h>
 #include <sched.h>
 #include <sys/resource.h>
-
-#include "platform/posix/FileHandles.h"
-#include "platform/posix/SystemCalls.h"
 
 namespace tessel::platform {
 
@@ -70,7 +70,7 @@ void SleepMilliseconds(std::uint32_t milliseconds) noexcept {
         until.tv_nsec -= static_cast<long>(kNanosecondsPerSecond);
         ++until.tv_sec;
     }
-    /* To a moment rather than for a time: so interruptions, however many, do not make it longer. */
+    // To a moment rather than for a time: so interruptions, however many, do not make it longer.
     while (systemCalls.clock_nanosleep(CLOCK_MONOTONIC, TIMER_ABSTIME, &until, nullptr) != 0 && errno == EINTR) {
     }
 }

@@ -1,20 +1,19 @@
 #include "platform/CodePage.h"
 
+#include "platform/Mutex.h"
+#include "platform/posix/Errors.h"
+#include "platform/posix/Utf8.h"
+
+#include <cstdlib>
+#include <cstring>
 #include <errno.h>
 #include <iconv.h>
 #include <langinfo.h>
 #include <locale.h>
-#include <strings.h>
-#include <wctype.h>
-
-#include <cstdlib>
-#include <cstring>
 #include <memory>
 #include <new>
-
-#include "platform/Mutex.h"
-#include "platform/posix/Errors.h"
-#include "platform/posix/Utf8.h"
+#include <strings.h>
+#include <wctype.h>
 
 namespace tessel::platform {
 
@@ -22,8 +21,8 @@ namespace tessel::platform {
 
 namespace {
 
-constexpr char32_t kFirstControl = 0x80;          /* of those beyond ASCII; there are 32 */
-constexpr std::uint32_t kCodePageGb18030 = 54936; /* the only one whose second byte tells the length */
+constexpr char32_t kFirstControl = 0x80;           // of those beyond ASCII; there are 32
+constexpr std::uint32_t kCodePageGb18030 = 54936;  // the only one whose second byte tells the length
 
 constexpr void FillAscii(CodePageTables& tables) {
     for (unsigned byte = 0; byte < 256; ++byte) {
@@ -42,14 +41,14 @@ constexpr CodePageTables MakeUtf8Tables() {
 
 constinit const CodePageTables utf8Tables = MakeUtf8Tables();
 
-/* A page other than UTF-8, and what the host's converter calls it. Never freed: earlier tables stay valid. */
+// A page other than UTF-8, and what the host's converter calls it. Never freed: earlier tables stay valid.
 struct OtherPage : CodePageTables {
     char converterName[32];
-    std::uint32_t unused = 0; /* in a single-byte page: of the bytes 80 to 9F, those that are no character */
+    std::uint32_t unused = 0;  // in a single-byte page: of the bytes 80 to 9F, those that are no character
     OtherPage* next;
 };
 
-constinit OtherPage* otherPages = nullptr; /* guarded by pagesMutex */
+constinit OtherPage* otherPages = nullptr;  // guarded by pagesMutex
 Mutex pagesMutex;
 
 struct NamedPage {
@@ -57,7 +56,7 @@ struct NamedPage {
     std::uint32_t codePage;
 };
 
-/* Pages whose name at the converter is not CP and the number. The first name of a page is the converter's. */
+// Pages whose name at the converter is not CP and the number. The first name of a page is the converter's.
 constexpr NamedPage kNamedPages[] = {{"UTF-8", kCodePageUtf8},
                                      {"UTF8", kCodePageUtf8},
                                      {"CP932", 932},
@@ -96,8 +95,7 @@ std::string ConverterName(std::uint32_t codePage) {
     return "CP" + std::to_string(codePage);
 }
 
-/* The number that a text names: digits, a name of the table, or CP, IBM or WINDOWS- and digits. 0 when it names none.
- */
+// The number that a text names: digits, a name of the table, or CP, IBM or WINDOWS- and digits. 0 when it names none.
 std::uint32_t CodePageNumber(const char* text) {
     for (const NamedPage& page : kNamedPages) {
         if (strcasecmp(text, page.name) == 0) return page.codePage;
@@ -124,7 +122,7 @@ public:
     bool IsOpen() const { return handle_ != reinterpret_cast<iconv_t>(-1); }
     void Restart() { iconv(handle_, nullptr, nullptr, nullptr, nullptr); }
 
-    /* 0, or the errno that stopped it: EILSEQ (no such character), EINVAL (cut short), E2BIG (no room). */
+    // 0, or the errno that stopped it: EILSEQ (no such character), EINVAL (cut short), E2BIG (no room).
     int Run(const char*& in, std::size_t& inCount, char*& out, std::size_t& outCount) {
         char* input = const_cast<char*>(in);
         std::size_t result = iconv(handle_, &input, &inCount, &out, &outCount);
@@ -136,7 +134,7 @@ private:
     iconv_t handle_;
 };
 
-/* One character alone: 0 and the character, EINVAL when it is only begun, EILSEQ when it is none. */
+// One character alone: 0 and the character, EINVAL when it is only begun, EILSEQ when it is none.
 int DecodeOne(Converter& toWide, const char* bytes, std::size_t count, char32_t& character) {
     toWide.Restart();
     char32_t wide[4] = {};
@@ -147,7 +145,7 @@ int DecodeOne(Converter& toWide, const char* bytes, std::size_t count, char32_t&
     return error != 0 || room == sizeof wide - sizeof(char32_t) ? error : EILSEQ;
 }
 
-/* How many bytes a character has that begins with the first of `bytes`; `known` of them are set. */
+// How many bytes a character has that begins with the first of `bytes`; `known` of them are set.
 std::uint8_t ProbeLength(Converter& toWide, char* bytes, std::size_t known) {
     if (known == 4) return 1;
     bool begun = false;
@@ -165,7 +163,7 @@ std::uint8_t ProbeLength(Converter& toWide, char* bytes, std::size_t known) {
     return begun ? ProbeLength(toWide, pending, known + 1) : 1;
 }
 
-/* The lead bytes as documented for these four, which converters see differently at the edges. */
+// The lead bytes as documented for these four, which converters see differently at the edges.
 bool DocumentedLeadByte(std::uint32_t codePage, unsigned byte) {
     if (codePage == 932) return (byte >= 0x81 && byte <= 0x9F) || (byte >= 0xE0 && byte <= 0xFC);
     return byte >= 0x81 && byte <= 0xFE;
@@ -186,7 +184,7 @@ void FillLengths(CodePageTables& tables, Converter& toWide) {
     }
 }
 
-/* A character's byte in a single-byte page, or `otherwise`. */
+// A character's byte in a single-byte page, or `otherwise`.
 std::uint8_t ByteOf(const char32_t (&characters)[256], char32_t character, unsigned otherwise) {
     for (unsigned byte = 0; byte < 256; ++byte) {
         if (characters[byte] == character) return static_cast<std::uint8_t>(byte);
@@ -210,7 +208,7 @@ void FillCaseMaps(CodePageTables& tables, Converter& toWide) {
     freelocale(locale);
 }
 
-/* The bytes 80 to 9F that the converter knows no character for. */
+// The bytes 80 to 9F that the converter knows no character for.
 std::uint32_t UnusedControls(Converter& toWide) {
     std::uint32_t unused = 0;
     for (unsigned i = 0; i < 32; ++i) {
@@ -221,7 +219,7 @@ std::uint32_t UnusedControls(Converter& toWide) {
     return unused;
 }
 
-/* A page for texts keeps ASCII where it is (some put a currency sign at the backslash, and a line over the tilde). */
+// A page for texts keeps ASCII where it is (some put a currency sign at the backslash, and a line over the tilde).
 bool KeepsAscii(Converter& toWide) {
     for (unsigned byte = 0x20; byte < 0x7F; ++byte) {
         char text = static_cast<char>(byte);
@@ -248,7 +246,7 @@ std::unique_ptr<OtherPage> MakePage(std::uint32_t codePage) {
     return page;
 }
 
-/* Null when the host does not know it. The caller holds pagesMutex. */
+// Null when the host does not know it. The caller holds pagesMutex.
 const CodePageTables* FindPage(std::uint32_t codePage) {
     if (codePage == kCodePageUtf8) return &utf8Tables;
     for (OtherPage* page = otherPages; page; page = page->next) {
@@ -349,8 +347,8 @@ const char* PrevUtf8(const char* start, const char* text) {
     return text - 1;
 }
 
-/* Where a byte may be a lead or a trail, only the way from a known start tells. Every byte below the lead bytes ends a
-   character, so the way begins behind the last such byte. */
+// Where a byte may be a lead or a trail, only the way from a known start tells. Every byte below the lead bytes ends a
+// character, so the way begins behind the last such byte.
 const char* PrevByScanning(const char* start, const char* text, const CodePageTables& tables) {
     const char* from = text - 1;
     while (from > start && tables.length[static_cast<std::uint8_t>(from[-1])] > 1) --from;
@@ -432,7 +430,7 @@ void AppendUtf8(std::string& text, char32_t character) {
 
 namespace {
 
-/* Calls take(character, valid) for each character of UTF-8. True when all were valid. */
+// Calls take(character, valid) for each character of UTF-8. True when all were valid.
 template <typename Taker>
 bool ForEachUtf8(std::string_view utf8, Taker take) {
     bool valid = true;
@@ -447,7 +445,7 @@ bool ForEachUtf8(std::string_view utf8, Taker take) {
     return valid;
 }
 
-/* Converters are for one thread and dear to open: each thread keeps its last one in each direction. */
+// Converters are for one thread and dear to open: each thread keeps its last one in each direction.
 struct ThreadConverters {
     const CodePageTables* page = nullptr;
     std::unique_ptr<Converter> toUtf8, fromUtf8;
@@ -465,14 +463,14 @@ ThreadConverters& Converters(const CodePageTables& page) {
     return converters;
 }
 
-/* What takes the place of a character at which the converter stopped. */
+// What takes the place of a character at which the converter stopped.
 struct Substitute {
-    std::size_t skipped; /* bytes */
-    bool same;           /* it is the same character */
+    std::size_t skipped;  // bytes
+    bool same;            // it is the same character
 };
 
-/* Runs the converter over `in`. Where it stops at a character, substitute(rest, out) appends what takes its place. True
-   when no character was lost. */
+// Runs the converter over `in`. Where it stops at a character, substitute(rest, out) appends what takes its place. True
+// when no character was lost.
 template <typename Substituter>
 bool Convert(Converter& converter, std::string_view in, std::string& out, Substituter substitute) {
     bool complete = converter.IsOpen();
@@ -495,8 +493,8 @@ bool Convert(Converter& converter, std::string_view in, std::string& out, Substi
     return complete;
 }
 
-/* The bytes from 80 to 9F that a single-byte page leaves unused are the controls of these numbers, both ways: on the
-   hosts that the pages come from they are, so that no text changes on its way to Unicode and back. */
+// The bytes from 80 to 9F that a single-byte page leaves unused are the controls of these numbers, both ways: on the
+// hosts that the pages come from they are, so that no text changes on its way to Unicode and back.
 bool IsControl(const CodePageTables& page, char32_t character) {
     if (character < kFirstControl || character >= kFirstControl + 32) return false;
     return (static_cast<const OtherPage&>(page).unused >> (character - kFirstControl) & 1) != 0;

@@ -1,14 +1,13 @@
 #include "platform/Debugger.h"
 
+#include "platform/posix/SystemCalls.h"
+
+#include <cstdlib>
+#include <cstring>
 #include <errno.h>
 #include <fcntl.h>
 #include <signal.h>
 #include <unistd.h>
-
-#include <cstdlib>
-#include <cstring>
-
-#include "platform/posix/SystemCalls.h"
 
 namespace tessel::platform {
 
@@ -29,7 +28,7 @@ void WriteAll(int file, const char* text, std::size_t count) {
 }  // namespace
 
 bool DebuggerAttached() noexcept {
-    char status[2048]; /* the line stands near the top */
+    char status[2048];  // the line stands near the top
     int file = systemCalls.open("/proc/self/status", O_RDONLY | O_CLOEXEC, 0);
     if (file < 0) return false;
     ssize_t count = systemCalls.read(file, status, sizeof status - 1);

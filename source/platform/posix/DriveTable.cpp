@@ -1,20 +1,19 @@
 #include "platform/DriveTable.h"
 
-#include <dirent.h>
-#include <locale.h>
-#include <unistd.h>
-#include <wctype.h>
-
-#include <algorithm>
-#include <atomic>
-#include <cstdlib>
-#include <memory>
-
 #include "platform/CodePage.h"
 #include "platform/Mutex.h"
 #include "platform/posix/NativeNames.h"
 #include "platform/posix/SystemCalls.h"
 #include "platform/posix/Utf8.h"
+
+#include <algorithm>
+#include <atomic>
+#include <cstdlib>
+#include <dirent.h>
+#include <locale.h>
+#include <memory>
+#include <unistd.h>
+#include <wctype.h>
 
 namespace tessel::platform {
 
@@ -22,20 +21,20 @@ namespace tessel::platform {
 
 namespace {
 
-/* Folders are absolute and without a separator at the end, so "/" is the empty text; `present` tells the two apart. */
+// Folders are absolute and without a separator at the end, so "/" is the empty text; `present` tells the two apart.
 struct Table {
     bool present[26] = {};
     std::string folder[26];
     std::string network;
-    std::unique_ptr<Table> older; /* readers may still hold it */
+    std::unique_ptr<Table> older;  // readers may still hold it
 };
 
 std::atomic<Table*> activeTable{nullptr};
-Mutex tableMutex; /* guards the making of a table */
+Mutex tableMutex;  // guards the making of a table
 
-/* Owns the newest table, and through it the older ones. */
+// Owns the newest table, and through it the older ones.
 std::unique_ptr<Table>& OwnedTable() {
-    static std::unique_ptr<Table>* const owned = new std::unique_ptr<Table>; /* outlives every thread */
+    static std::unique_ptr<Table>* const owned = new std::unique_ptr<Table>;  // outlives every thread
     return *owned;
 }
 
@@ -49,7 +48,7 @@ int DriveIndex(char letter) {
     return letter >= 'A' && letter <= 'Z' ? letter - 'A' : -1;
 }
 
-/* One entry of TESSEL_DRIVES; what does not read `X=/folder` is left out. */
+// One entry of TESSEL_DRIVES; what does not read `X=/folder` is left out.
 void AddDrive(Table& table, std::string_view entry) {
     if (entry.size() < 3 || entry[1] != '=' || entry[2] != '/') return;
     int index = DriveIndex(entry[0]);
@@ -93,7 +92,7 @@ bool IsAtOrUnder(std::string_view native, std::string_view folder) {
     return native.size() == folder.size() || native[folder.size()] == '/';
 }
 
-/* The drive that lies nearest above a native name, or -1. */
+// The drive that lies nearest above a native name, or -1.
 int NearestDrive(const Table& table, std::string_view native) {
     int nearest = -1;
     for (int i = 0; i < 26; ++i) {
@@ -119,7 +118,7 @@ void ReloadDrives() {
 
 namespace {
 
-/* The name in UTF-8 with `/` between its parts. */
+// The name in UTF-8 with `/` between its parts.
 bool Normalize(std::string_view name, std::string& text) {
     if (ActiveCodePage().utf8) {
         text.assign(name);
@@ -131,14 +130,13 @@ bool Normalize(std::string_view name, std::string& text) {
     return true;
 }
 
-/* A name from a root on, without its `.` and `..`. They are taken out of the text, as they are meant in such names: a
-   `..` at the root stays there, so that no name leads out of its drive, and one behind a link leads back to before it.
- */
+// A name from a root on, without its `.` and `..`. They are taken out of the text, as they are meant in such names: a
+// `..` at the root stays there, so that no name leads out of its drive, and one behind a link leads back to before it.
 std::string WithoutDots(std::string_view name) {
     if (name.find("/.") == std::string_view::npos) return std::string(name);
     std::string plain;
     while (!name.empty()) {
-        name.remove_prefix(1); /* the separator */
+        name.remove_prefix(1);  // the separator
         std::string_view part = name.substr(0, name.find('/'));
         name.remove_prefix(part.size());
         if (part == "..")
@@ -149,7 +147,7 @@ std::string WithoutDots(std::string_view name) {
     return plain;
 }
 
-/* `//server/share/dir`: the root is the share. */
+// `//server/share/dir`: the root is the share.
 bool NetworkName(const Table& table, std::string_view text, std::string& native) {
     std::size_t shareAt = std::min(text.find('/', 2), text.size());
     std::size_t restAt = shareAt < text.size() ? std::min(text.find('/', shareAt + 1), text.size()) : text.size();
@@ -162,7 +160,7 @@ bool NetworkName(const Table& table, std::string_view text, std::string& native)
     return true;
 }
 
-/* `rest` is what stands behind the drive: absolute on it, or relative to the current folder if that lies there. */
+// `rest` is what stands behind the drive: absolute on it, or relative to the current folder if that lies there.
 bool DriveName(const Table& table, int index, std::string_view rest, std::string& native) {
     if (index < 0 || !table.present[index]) return FailWith(kErrorPathNotFound);
     const std::string& root = table.folder[index];
@@ -176,7 +174,7 @@ bool DriveName(const Table& table, int index, std::string_view rest, std::string
     return true;
 }
 
-/* The host's name as the text says, maybe with separators at its end. */
+// The host's name as the text says, maybe with separators at its end.
 bool Translate(std::string&& text, std::string& native) {
     const Table& table = Drives();
     if (text.size() > 1 && text[0] == '/' && text[1] == '/') return NetworkName(table, text, native);
@@ -218,7 +216,7 @@ std::string_view NativeLast(std::string_view native) {
 
 namespace {
 
-/* Upper case as every language maps it. The C library's own tables, whatever locale the process has. */
+// Upper case as every language maps it. The C library's own tables, whatever locale the process has.
 char32_t UpperOf(char32_t character) {
     if (character < 0x80) return character >= 'a' && character <= 'z' ? character - 32 : character;
     static const locale_t locale = newlocale(LC_CTYPE_MASK, "C.UTF-8", nullptr);
@@ -251,7 +249,7 @@ bool FindInFolder(const std::string& folder, std::string_view name, std::string&
     return !found.empty();
 }
 
-/* One character of UTF-8, or one byte that is none, marked so that it equals only itself. */
+// One character of UTF-8, or one byte that is none, marked so that it equals only itself.
 char32_t TakeUpper(std::string_view& text) noexcept {
     char32_t character = 0;
     std::size_t length = DecodeUtf8(text.data(), text.data() + text.size(), character);
@@ -319,7 +317,7 @@ bool NativeToName(std::string_view native, std::string& name) {
     if (!onNetwork && drive < 0) return FailWith(kErrorPathNotFound);
 
     std::string rest = NameFromDisk(plain.substr(onNetwork ? network.size() : table.folder[drive].size()));
-    /* What NameFromDisk leaves of `/` are the separators; no trail byte of a code page is one. */
+    // What NameFromDisk leaves of `/` are the separators; no trail byte of a code page is one.
     std::replace(rest.begin(), rest.end(), '/', '\\');
     if (onNetwork) {
         name = "\\" + rest;
@@ -334,25 +332,25 @@ bool NativeToName(std::string_view native, std::string& name) {
 
 namespace {
 
-/* File systems by the number that the kernel knows them by (statfs). */
+// File systems by the number that the kernel knows them by (statfs).
 DriveKind KindOfFileSystem(long type) {
     switch (static_cast<std::uint32_t>(type)) {
-        case 0x6969u:     /* NFS */
-        case 0x517Bu:     /* SMB */
-        case 0xFE534D42u: /* SMB2 */
-        case 0xFF534D42u: /* CIFS */
-        case 0x01021997u: /* 9P */
-        case 0x00C36400u: /* Ceph */
-        case 0x5346414Fu: /* AFS */
+        case 0x6969u:      // NFS
+        case 0x517Bu:      // SMB
+        case 0xFE534D42u:  // SMB2
+        case 0xFF534D42u:  // CIFS
+        case 0x01021997u:  // 9P
+        case 0x00C36400u:  // Ceph
+        case 0x5346414Fu:  // AFS
             return DriveKind::kNetwork;
-        case 0x9660u:     /* ISO 9660 */
-        case 0x15013346u: /* UDF */
+        case 0x9660u:      // ISO 9660
+        case 0x15013346u:  // UDF
             return DriveKind::kCompactDisc;
-        case 0x01021994u: /* tmpfs */
-        case 0x858458F6u: /* ramfs */
+        case 0x01021994u:  // tmpfs
+        case 0x858458F6u:  // ramfs
             return DriveKind::kMemory;
-        case 0x4D44u:     /* FAT */
-        case 0x2011BAB0u: /* exFAT */
+        case 0x4D44u:      // FAT
+        case 0x2011BAB0u:  // exFAT
             return DriveKind::kRemovable;
         default:
             return DriveKind::kFixed;

@@ -1,17 +1,16 @@
 #include "platform/posix/ElfSymbols.h"
 
-#include <errno.h>
-#include <link.h>
-#include <unistd.h>
+#include "platform/Mutex.h"
+#include "platform/posix/SystemCalls.h"
 
 #include <algorithm>
 #include <cstring>
+#include <errno.h>
+#include <link.h>
 #include <map>
 #include <string>
+#include <unistd.h>
 #include <vector>
-
-#include "platform/Mutex.h"
-#include "platform/posix/SystemCalls.h"
 
 namespace tessel::platform {
 
@@ -24,16 +23,16 @@ using Segment = ElfW(Phdr);
 
 struct Function {
     std::uintptr_t start, size;
-    std::size_t name; /* where it stands in the texts */
+    std::size_t name;  // where it stands in the texts
 };
 
-/* What is kept of a file. */
+// What is kept of a file.
 struct Names {
-    std::vector<Function> functions; /* sorted by start */
+    std::vector<Function> functions;  // sorted by start
     std::string texts;
 };
 
-/* A file read in pieces: of one with debugging information only a small part is wanted. */
+// A file read in pieces: of one with debugging information only a small part is wanted.
 class ElfFile {
 public:
     explicit ElfFile(const char* native) : file_(systemCalls.open(native, O_RDONLY | O_CLOEXEC, 0)) {}
@@ -43,7 +42,7 @@ public:
     ElfFile(const ElfFile&) = delete;
     ElfFile& operator=(const ElfFile&) = delete;
 
-    /* False unless all of it is there. */
+    // False unless all of it is there.
     bool Read(std::uint64_t at, void* to, std::size_t count) const {
         if (file_ < 0 || systemCalls.lseek(file_, static_cast<off_t>(at), SEEK_SET) < 0) return false;
         for (std::size_t done = 0; done < count;) {
@@ -64,10 +63,10 @@ private:
     int file_;
 };
 
-/* No table or text of a module is longer than this; a file that says so is damaged. */
+// No table or text of a module is longer than this; a file that says so is damaged.
 constexpr std::uint64_t kMostBytes = 256u << 20;
 
-/* The address that the file gives its first loaded byte: what offsets are measured from. */
+// The address that the file gives its first loaded byte: what offsets are measured from.
 std::uintptr_t LoadAddress(const ElfFile& file, const Header& header) {
     std::vector<Segment> segments;
     if (header.e_phentsize != sizeof(Segment)) return 0;
@@ -113,7 +112,7 @@ Names ReadNames(const char* native) {
 }  // namespace
 
 bool FindElfSymbol(const std::string& native, std::uintptr_t offset, std::string& name, std::uintptr_t& start) {
-    static Mutex mutex; /* guards `files` */
+    static Mutex mutex;  // guards `files`
     static auto* const files = new std::map<std::string, Names>;
     MutexHolder holder(mutex);
     auto [entry, isNew] = files->try_emplace(native);

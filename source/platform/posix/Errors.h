@@ -1,4 +1,4 @@
-/* From errno to the numbers of the seam. */
+// From errno to the numbers of the seam.
 #ifndef TESSEL_PLATFORM_POSIX_ERRORS_H
 #define TESSEL_PLATFORM_POSIX_ERRORS_H
 
@@ -8,7 +8,7 @@ namespace tessel::platform {
 
 ErrorNumber ErrorOfErrno(int error) noexcept;
 
-/* Both set LastError and return false, for `return Fail(...)`. */
+// Both set LastError and return false, for `return Fail(...)`.
 bool FailWith(ErrorNumber number) noexcept;
 bool FailErrno() noexcept;
 

@@ -1,13 +1,12 @@
 #include "platform/Event.h"
 
-#include <errno.h>
-#include <linux/futex.h>
-
-#include <algorithm>
-
 #include "platform/Mutex.h"
 #include "platform/Thread.h"
 #include "platform/posix/SystemCalls.h"
+
+#include <algorithm>
+#include <errno.h>
+#include <linux/futex.h>
 
 namespace tessel::platform {
 
@@ -23,15 +22,15 @@ std::int64_t MonotonicNanoseconds() {
     return static_cast<std::int64_t>(time.tv_sec) * kNanosecondsPerSecond + time.tv_nsec;
 }
 
-/* A moment to wait for, or none. */
+// A moment to wait for, or none.
 class Deadline {
 public:
     explicit Deadline(std::int32_t milliseconds) {
         if (milliseconds >= 0) at_ = MonotonicNanoseconds() + std::int64_t{milliseconds} * 1'000'000;
     }
 
-    /* Sleeps while the word is 0: kTaken when that may have changed. The kernel counts its time from after our look at
-       the clock, so it is never over early. */
+    // Sleeps while the word is 0: kTaken when that may have changed. The kernel counts its time from after our look at
+    // the clock, so it is never over early.
     EventWait SleepWhileZero(std::atomic<std::uint32_t>& word) const {
         timespec left{};
         if (at_ != kNever) {
@@ -48,27 +47,27 @@ public:
 
 private:
     static constexpr std::int64_t kNever = -1;
-    std::int64_t at_ = kNever; /* nanoseconds of the monotonic clock */
+    std::int64_t at_ = kNever;  // nanoseconds of the monotonic clock
 };
 
 void WakeOne(std::atomic<std::uint32_t>& word) {
     systemCalls.futex(reinterpret_cast<std::uint32_t*>(&word), FUTEX_WAKE_PRIVATE, 1, nullptr);
 }
 
-/* Looking again pays when the signal comes sooner than a sleep and a wake-up cost. What each event lately met decides
-   how: a signaler on another processor needs no more than a short spin, one on this processor cannot run before we
-   yield, and one that was long in coming is not worth either. Two threads that hand a turn to each other would go on
-   sleeping once they began to, as each takes longer to wake than the other looks: so one short sleep in eight is
-   followed by a look that outlasts a wake-up. */
+// Looking again pays when the signal comes sooner than a sleep and a wake-up cost. What each event lately met decides
+// how: a signaler on another processor needs no more than a short spin, one on this processor cannot run before we
+// yield, and one that was long in coming is not worth either. Two threads that hand a turn to each other would go on
+// sleeping once they began to, as each takes longer to wake than the other looks: so one short sleep in eight is
+// followed by a look that outlasts a wake-up.
 enum Habit : std::uint8_t {
-    kLong = 0,             /* the last wait slept long */
-    kSoon = 1,             /* spin, then yield */
-    kOnThisProcessor = 16, /* yield at once; counts down to kSoon, as threads move */
-    kPatient = 17          /* yield at once, and many times */
+    kLong = 0,              // the last wait slept long
+    kSoon = 1,              // spin, then yield
+    kOnThisProcessor = 16,  // yield at once; counts down to kSoon, as threads move
+    kPatient = 17           // yield at once, and many times
 };
-constexpr int kSpins = 32, kYields = 6;       /* some 2 us in all */
-constexpr int kPatientYields = 160;           /* some 40 us */
-constexpr std::int64_t kShortSleep = 100'000; /* nanoseconds; wake-ups among them may take half */
+constexpr int kSpins = 32, kYields = 6;        // some 2 us in all
+constexpr int kPatientYields = 160;            // some 40 us
+constexpr std::int64_t kShortSleep = 100'000;  // nanoseconds; wake-ups among them may take half
 
 bool SpinningHelps() {
     static const bool several = NumberOfProcessors() > 1;
@@ -104,7 +103,7 @@ EventWait Event::WaitForSignal(std::int32_t milliseconds) noexcept {
     return taken ? EventWait::kTaken : SleepFor(milliseconds);
 }
 
-/* The calling thread is counted among the sleepers already. */
+// The calling thread is counted among the sleepers already.
 EventWait Event::SleepFor(std::int32_t milliseconds) noexcept {
     Deadline deadline(milliseconds);
     std::int64_t start = MonotonicNanoseconds();
@@ -120,7 +119,7 @@ EventWait Event::SleepFor(std::int32_t milliseconds) noexcept {
 
 // ---- several events -------------------------------------------------------------------------------------------------
 
-/* One event's entry in a WaitAny: what to set and wake when it is signaled. */
+// One event's entry in a WaitAny: what to set and wake when it is signaled.
 struct Event::Watch {
     std::atomic<std::uint32_t>* woken;
     Watch* next;
@@ -128,7 +127,7 @@ struct Event::Watch {
 
 namespace {
 
-/* Guards the lists of watches of all events. Nothing is taken inside it. */
+// Guards the lists of watches of all events. Nothing is taken inside it.
 constinit Mutex watchMutex;
 
 }  // namespace

@@ -1,18 +1,17 @@
 #include "platform/File.h"
 
-#include <errno.h>
-#include <sys/mman.h>
-#include <unistd.h>
-
-#include <algorithm>
-#include <cstdio>
-#include <limits>
-#include <string>
-
 #include "platform/posix/Errors.h"
 #include "platform/posix/FileHandles.h"
 #include "platform/posix/NativeNames.h"
 #include "platform/posix/SystemCalls.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <errno.h>
+#include <limits>
+#include <string>
+#include <sys/mman.h>
+#include <unistd.h>
 
 namespace tessel::platform {
 
@@ -20,10 +19,10 @@ namespace tessel::platform {
 
 namespace {
 
-/* Every open file holds locks on some of four bytes, which lie far beyond any data and are never written. The locks
-   belong to the open file description: they are seen between processes and between two opens of one process, and go
-   when the file is closed. All holders lock for reading, so that any number of them can hold the same mark. The order
-   of the marks makes the usual sets contiguous. */
+// Every open file holds locks on some of four bytes, which lie far beyond any data and are never written. The locks
+// belong to the open file description: they are seen between processes and between two opens of one process, and go
+// when the file is closed. All holders lock for reading, so that any number of them can hold the same mark. The order
+// of the marks makes the usual sets contiguous.
 constexpr std::int64_t kMarksAt = std::int64_t{1} << 62;
 constexpr unsigned kHasWrite = 1, kHasRead = 2, kDenyWrite = 4, kDenyRead = 8;
 constexpr int kMarkCount = 4;
@@ -37,7 +36,7 @@ unsigned MarksOf(std::uint32_t access, std::uint32_t deny) {
     return marks;
 }
 
-/* The marks of others that stand against ours: what we have against what they deny, and the other way. */
+// The marks of others that stand against ours: what we have against what they deny, and the other way.
 unsigned AdverseMarks(unsigned marks) {
     return (marks & 3u) << 2 | marks >> 2;
 }
@@ -57,7 +56,7 @@ int LockBytes(int descriptor, int command, short type, std::int64_t start, std::
 
 enum class Marking { kDone, kRefused, kNoLocks };
 
-/* Calls act(first mark, count) for each run of contiguous marks, until one of them is not kDone. */
+// Calls act(first mark, count) for each run of contiguous marks, until one of them is not kDone.
 template <typename Action>
 Marking ForEachRun(unsigned marks, Action act) {
     for (int first = 0; first < kMarkCount; ++first) {
@@ -71,8 +70,8 @@ Marking ForEachRun(unsigned marks, Action act) {
     return Marking::kDone;
 }
 
-/* A descriptor without read access (the file may be written but not read) can only lock for writing, which refuses more
-   than it must: never too little. */
+// A descriptor without read access (the file may be written but not read) can only lock for writing, which refuses more
+// than it must: never too little.
 Marking SetMarks(int descriptor, unsigned marks, bool readable) {
     return ForEachRun(marks, [&](int first, int count) {
         struct flock range;
@@ -90,12 +89,12 @@ Marking TestMarks(int descriptor, unsigned marks) {
     });
 }
 
-/* Marks first and tests then: of two openers at the same moment at least one sees the other's marks. A file system that
-   has no locks denies nothing. */
+// Marks first and tests then: of two openers at the same moment at least one sees the other's marks. A file system that
+// has no locks denies nothing.
 bool ShareAllows(int descriptor, std::uint32_t access, std::uint32_t deny, bool readable) {
     unsigned marks = MarksOf(access, deny);
     Marking result = SetMarks(descriptor, marks, readable);
-    /* Mostly nobody else has the file open, and one look at all the marks tells. */
+    // Mostly nobody else has the file open, and one look at all the marks tells.
     if (result == Marking::kDone) result = TestMarks(descriptor, (1u << kMarkCount) - 1);
     if (result == Marking::kRefused) result = TestMarks(descriptor, AdverseMarks(marks));
     return result != Marking::kRefused;
@@ -111,7 +110,7 @@ int OpenRetrying(const char* native, int flags, mode_t mode = 0666) {
     return descriptor;
 }
 
-/* Marks are set by reading, so files are opened for reading too wherever they may be read. */
+// Marks are set by reading, so files are opened for reading too wherever they may be read.
 int OpenDescriptor(const char* native, std::uint32_t access, int flags, bool& readable) {
     readable = true;
     if (access == kRead) return OpenRetrying(native, O_RDONLY | flags);
@@ -121,13 +120,13 @@ int OpenDescriptor(const char* native, std::uint32_t access, int flags, bool& re
     return OpenRetrying(native, O_WRONLY | flags);
 }
 
-/* Opening never waits, but the later reads and writes of a device do, as those of a file. */
+// Opening never waits, but the later reads and writes of a device do, as those of a file.
 bool MakeWaiting(int descriptor) {
     int flags = fcntl(descriptor, F_GETFL);
     return flags >= 0 && fcntl(descriptor, F_SETFL, flags & ~O_NONBLOCK) == 0;
 }
 
-/* Folders, pipes and sockets have no bytes at positions. A device may be opened. */
+// Folders, pipes and sockets have no bytes at positions. A device may be opened.
 bool CheckKind(int descriptor) {
     struct statx status;
     if (systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_TYPE, &status) != 0) return FailErrno();
@@ -144,15 +143,15 @@ bool Truncate(int descriptor, std::int64_t size) {
     return result == 0;
 }
 
-/* What has to hold of a descriptor before it is handed out. */
+// What has to hold of a descriptor before it is handed out.
 bool Admit(int descriptor, std::uint32_t access, std::uint32_t deny, bool readable, bool empty) {
     if (!CheckKind(descriptor)) return false;
     if (!ShareAllows(descriptor, access, deny, readable)) return FailWith(kErrorSharingViolation);
-    if (empty && !Truncate(descriptor, 0) && errno != EINVAL) return FailErrno(); /* EINVAL: a device */
+    if (empty && !Truncate(descriptor, 0) && errno != EINVAL) return FailErrno();  // EINVAL: a device
     return true;
 }
 
-/* Removes what has the name, when it is this user's and no folder. True also when there is nothing. */
+// Removes what has the name, when it is this user's and no folder. True also when there is nothing.
 bool RemoveOwn(const char* native) {
     struct statx status;
     if (systemCalls.statx(AT_FDCWD, native, AT_SYMLINK_NOFOLLOW, STATX_TYPE | STATX_UID, &status) != 0)
@@ -201,7 +200,7 @@ FileHandle FileCreatePrivate(const char* name, std::uint32_t access) {
     if (!NameToNativeText(name, native)) return kNoFile;
     MatchOnDisk(native);
     if (!RemoveOwn(native.c_str())) return kNoFile;
-    /* Whoever puts something there in between is refused, a link too. */
+    // Whoever puts something there in between is refused, a link too.
     const int descriptor = OpenRetrying(native.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
     if (descriptor >= 0) return HandleOf(descriptor, access);
     FailWith(errno == EEXIST ? kErrorAccessDenied : ErrorOfErrno(errno));
@@ -209,7 +208,7 @@ FileHandle FileCreatePrivate(const char* name, std::uint32_t access) {
 }
 
 bool FileClose(FileHandle file) {
-    /* After EINTR the descriptor is gone all the same; a second close could hit another thread's file. */
+    // After EINTR the descriptor is gone all the same; a second close could hit another thread's file.
     return systemCalls.close(DescriptorOf(file)) == 0 || errno == EINTR || FailErrno();
 }
 
@@ -280,7 +279,7 @@ bool FileReserve(FileHandle file, std::int64_t size) {
     } while (result != 0 && errno == EINTR);
     if (result == 0 || errno == EOPNOTSUPP || errno == ENOSYS || errno == ENODEV) return true;
     ErrorNumber reason = ErrorOfErrno(errno);
-    Truncate(DescriptorOf(file), before); /* a part may have been had */
+    Truncate(DescriptorOf(file), before);  // a part may have been had
     return FailWith(reason);
 }
 
@@ -289,7 +288,7 @@ bool FileFlush(FileHandle file) {
     do {
         result = systemCalls.fsync(DescriptorOf(file));
     } while (result != 0 && errno == EINTR);
-    return result == 0 || errno == EINVAL || errno == EROFS || FailErrno(); /* both: there is no device to wait for */
+    return result == 0 || errno == EINVAL || errno == EROFS || FailErrno();  // both: there is no device to wait for
 }
 
 // ---- mapping --------------------------------------------------------------------------------------------------------
@@ -324,14 +323,14 @@ bool ValidRange(std::int64_t offset, std::int64_t count) {
     return offset >= 0 && count >= 0 && offset <= kMarksAt - count;
 }
 
-/* True when another handle holds a part of the range. */
+// True when another handle holds a part of the range.
 bool HeldByOther(int descriptor, std::int64_t offset, std::int64_t count) {
     struct flock range;
     return LockBytes(descriptor, F_OFD_GETLK, F_WRLCK, offset, count, range) == 0 && range.l_type != F_UNLCK;
 }
 
-/* The host locks exclusively only what may be written. A handle that only reads takes a shared lock instead and then
-   looks whether anybody else has one: mark, then test, as for the share modes. */
+// The host locks exclusively only what may be written. A handle that only reads takes a shared lock instead and then
+// looks whether anybody else has one: mark, then test, as for the share modes.
 bool LockForReader(int descriptor, std::int64_t offset, std::int64_t count) {
     if (HeldByOther(descriptor, offset, count)) return FailWith(kErrorLockViolation);
     struct flock range;
@@ -355,13 +354,13 @@ bool FileLock(FileHandle file, std::int64_t offset, std::int64_t count) {
 bool FileUnlock(FileHandle file, std::int64_t offset, std::int64_t count) {
     if (!ValidRange(offset, count)) return FailWith(kErrorInvalidParameter);
     if (count == 0) return true;
-    /* A handle does not see its own locks. A second one on the same file does. */
+    // A handle does not see its own locks. A second one on the same file does.
     char self[40];
     std::snprintf(self, sizeof self, "/proc/self/fd/%d", DescriptorOf(file));
     int other = OpenRetrying(self, O_RDONLY);
     bool locked = other < 0 || HeldByOther(other, offset, count);
     if (other >= 0) systemCalls.close(other);
-    /* What another handle holds is not this one's to unlock. */
+    // What another handle holds is not this one's to unlock.
     if (!locked || HeldByOther(DescriptorOf(file), offset, count)) return FailWith(kErrorNotLocked);
     struct flock range;
     return LockBytes(DescriptorOf(file), F_OFD_SETLK, F_UNLCK, offset, count, range) == 0 || FailErrno();
@@ -394,7 +393,7 @@ bool FileSetTimes(FileHandle file, std::int64_t created, std::int64_t accessed, 
     if (created != 0) {
         unsigned char bytes[8];
         ToBytes(created, bytes);
-        systemCalls.fsetxattr(descriptor, kCreatedAttribute, bytes, sizeof bytes, 0); /* kept where it can be */
+        systemCalls.fsetxattr(descriptor, kCreatedAttribute, bytes, sizeof bytes, 0);  // kept where it can be
     }
     timespec times[2] = {HostTime(accessed), HostTime(modified)};
     return systemCalls.futimens(descriptor, times) == 0 || FailErrno();

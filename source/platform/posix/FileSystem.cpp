@@ -1,20 +1,19 @@
 #include "platform/FileSystem.h"
 
-#include <dirent.h>
-#include <errno.h>
-#include <linux/fs.h>
-#include <sys/stat.h>
-#include <unistd.h>
+#include "platform/posix/FileHandles.h"
+#include "platform/posix/NativeNames.h"
+#include "platform/posix/SystemCalls.h"
 
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <dirent.h>
+#include <errno.h>
+#include <linux/fs.h>
 #include <memory>
 #include <new>
-
-#include "platform/posix/FileHandles.h"
-#include "platform/posix/NativeNames.h"
-#include "platform/posix/SystemCalls.h"
+#include <sys/stat.h>
+#include <unistd.h>
 
 namespace tessel::platform {
 
@@ -35,8 +34,8 @@ void FillInfo(const struct statx& status, ItemInfo& info) {
 
 namespace {
 
-/* A link whose end cannot be reached (it leads nowhere, in a circle, into a closed folder) is described itself, so that
-   it can be seen and deleted. */
+// A link whose end cannot be reached (it leads nowhere, in a circle, into a closed folder) is described itself, so that
+// it can be seen and deleted.
 bool GetStatus(const std::string& native, unsigned mask, struct statx& status) {
     if (systemCalls.statx(AT_FDCWD, native.c_str(), 0, mask, &status) == 0) return true;
     return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, mask, &status) == 0;
@@ -87,7 +86,7 @@ ItemKind ItemExists(const char* name) {
 bool ItemRealName(const char* name, std::string& real) {
     std::string native, path;
     if (!NameToAbsoluteNative(name, native)) return false;
-    bool drive = NativeToName(native, path) && path.size() == 3; /* `T:` and the separator */
+    bool drive = NativeToName(native, path) && path.size() == 3;  // `T:` and the separator
     real = drive ? "" : NameFromDisk(NativeLast(native));
     return true;
 }
@@ -166,7 +165,7 @@ bool FolderRemove(const char* name) {
     return OnExistingItem(name, [](const std::string& native) {
         if (systemCalls.rmdir(native.c_str()) == 0) return true;
         if (errno != ENOTDIR) return false;
-        /* A link to a folder goes like a folder; what it leads to stays. */
+        // A link to a folder goes like a folder; what it leads to stays.
         struct statx status;
         bool link = IsLink(native) && GetStatus(native, STATX_TYPE, status) && S_ISDIR(status.stx_mode);
         if (link) return systemCalls.unlink(native.c_str()) == 0;
@@ -183,8 +182,8 @@ bool FileDelete(const char* name) {
 
 namespace {
 
-/* For file systems that cannot rename without replacing. A file is linked under its new name first, which fails when
-   that is taken; for a folder, which cannot be linked, there is a moment between the look and the renaming. */
+// For file systems that cannot rename without replacing. A file is linked under its new name first, which fails when
+// that is taken; for a folder, which cannot be linked, there is a moment between the look and the renaming.
 bool RenameWithoutReplacing(const std::string& from, const std::string& to) {
     if (systemCalls.renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), RENAME_NOREPLACE) == 0) return true;
     if (errno != EINVAL && errno != ENOSYS) return false;
@@ -222,13 +221,13 @@ bool ItemRename(const char* from, const char* to) {
     if (match == Match::kParentMissing) return FailWith(kErrorPathNotFound);
     bool otherSpelling = match == Match::kAll && respelled == source;
     if (match == Match::kAll && !otherSpelling) return FailWith(kErrorAlreadyExists);
-    /* The parent as on the disk, the last part as the caller wants it. */
+    // The parent as on the disk, the last part as the caller wants it.
     std::string wanted = NativeParent(respelled);
     if (wanted != "/") wanted += '/';
     wanted += NativeLast(target);
     if (wanted == source || RenameWithoutReplacing(source, wanted)) return true;
     if (errno == EXDEV) return MoveAcross(source, from, to);
-    /* A file system that ignores case itself takes the new spelling for a name that is taken. */
+    // A file system that ignores case itself takes the new spelling for a name that is taken.
     bool itself = errno == EEXIST && otherSpelling && SameItem(source, wanted);
     if (itself && systemCalls.renameat2(AT_FDCWD, source.c_str(), AT_FDCWD, wanted.c_str(), 0) == 0) return true;
     return FailErrno();
@@ -236,7 +235,7 @@ bool ItemRename(const char* from, const char* to) {
 
 namespace {
 
-/* One file handle for a scope. */
+// One file handle for a scope.
 class OpenedFile {
 public:
     OpenedFile(const char* name, std::uint32_t access, std::uint32_t deny, Disposition disposition)
@@ -268,7 +267,7 @@ bool CopyThroughBuffer(FileHandle from, FileHandle to) {
     return true;
 }
 
-/* Lets the kernel copy as long as it gets on; the rest, or what it cannot copy at all, goes through a buffer. */
+// Lets the kernel copy as long as it gets on; the rest, or what it cannot copy at all, goes through a buffer.
 bool CopyBytes(FileHandle from, FileHandle to) {
     constexpr std::size_t kAtOnce = std::size_t{1} << 30;
     ssize_t moved;
@@ -317,7 +316,7 @@ bool ItemSetReadOnly(const char* name, bool readOnly) {
     ItemInfo info{};
     if (!ItemGetInfo(name, info)) return false;
     if (info.readOnly == readOnly) return true;
-    /* Writing comes back to those who may read, as far as new files would get it. */
+    // Writing comes back to those who may read, as far as new files would get it.
     std::uint32_t writers = (info.mode & 0444u) >> 1 & ~PermissionMask();
     return ItemSetMode(name, readOnly ? info.mode & ~0222u : info.mode | writers | 0200u);
 }
@@ -329,7 +328,7 @@ std::uint32_t PermissionMask() {
     while (status && std::fgets(line, sizeof line, status.get())) {
         if (std::sscanf(line, "Umask: %o", &mask) == 1) return mask;
     }
-    /* Without /proc it can only be read by setting it. */
+    // Without /proc it can only be read by setting it.
     mask = ::umask(0);
     ::umask(static_cast<mode_t>(mask));
     return mask;
@@ -349,7 +348,7 @@ bool SetCurrentFolder(const char* name) {
 bool TemporaryFolder(std::string& name) {
     const char* folder = std::getenv("TMPDIR");
     if (!NativeToName(folder && *folder == '/' ? folder : "/tmp", name)) return false;
-    if (name.size() > 3) name += '\\'; /* all but a drive, which has it */
+    if (name.size() > 3) name += '\\';  // all but a drive, which has it
     return true;
 }
 

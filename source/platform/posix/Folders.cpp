@@ -1,13 +1,12 @@
 #include "platform/posix/Folders.h"
 
+#include "platform/posix/NativeNames.h"
+#include "platform/posix/SystemCalls.h"
+
+#include <cstdlib>
 #include <errno.h>
 #include <pwd.h>
 #include <unistd.h>
-
-#include <cstdlib>
-
-#include "platform/posix/NativeNames.h"
-#include "platform/posix/SystemCalls.h"
 
 namespace tessel::platform {
 

@@ -1,4 +1,4 @@
-/* The user's own folders, by the host's names. */
+// The user's own folders, by the host's names.
 #ifndef TESSEL_PLATFORM_POSIX_FOLDERS_H
 #define TESSEL_PLATFORM_POSIX_FOLDERS_H
 
@@ -6,13 +6,13 @@
 
 namespace tessel::platform {
 
-/* $HOME, else what the account says, else "/". No separator at the end, but for "/". */
+// $HOME, else what the account says, else "/". No separator at the end, but for "/".
 std::string HomeFolder();
 
-/* What an XDG variable names if it is absolute, else `underHome` in the home folder. */
+// What an XDG variable names if it is absolute, else `underHome` in the home folder.
 std::string XdgFolder(const char* variable, const char* underHome);
 
-/* Makes the folder and what is missing above it. True when it is there. False with errno. */
+// Makes the folder and what is missing above it. True when it is there. False with errno.
 bool MakeFolders(const std::string& native, unsigned mode = 0777);
 
 }  // namespace tessel::platform

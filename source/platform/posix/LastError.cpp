@@ -1,8 +1,8 @@
 #include "platform/LastError.h"
 
-#include <errno.h>
-
 #include "platform/posix/Errors.h"
+
+#include <errno.h>
 
 namespace tessel::platform {
 
@@ -15,7 +15,7 @@ struct ErrnoRow {
     ErrorNumber number;
 };
 
-/* The one table. Codes that are equal on some hosts (EAGAIN, EWOULDBLOCK) stand once; the first row wins. */
+// The one table. Codes that are equal on some hosts (EAGAIN, EWOULDBLOCK) stand once; the first row wins.
 constexpr ErrnoRow kErrnoRows[] = {
     {0, kErrorSuccess},
     {ENOENT, kErrorFileNotFound},

@@ -1,23 +1,22 @@
 #include "platform/MemoryRead.h"
 
-#include <errno.h>
-#include <pthread.h>
-#include <unistd.h>
+#include "platform/posix/SystemCalls.h"
 
 #include <algorithm>
 #include <atomic>
-
-#include "platform/posix/SystemCalls.h"
+#include <errno.h>
+#include <pthread.h>
+#include <unistd.h>
 
 namespace tessel::platform {
 
 namespace {
 
-/* Whether memory can be read is the same for a whole page; larger pages are multiples of this one. */
+// Whether memory can be read is the same for a whole page; larger pages are multiples of this one.
 constexpr std::size_t kPage = 4096;
 constexpr std::size_t kPiecesAtOnce = 16;
 
-/* Asking the kernel for the process id would double the cost of a read. It changes in a forked child only. */
+// Asking the kernel for the process id would double the cost of a read. It changes in a forked child only.
 std::atomic<pid_t> processId{0};
 
 pid_t OwnProcess() {
@@ -29,7 +28,7 @@ pid_t OwnProcess() {
     return own;
 }
 
-/* Cuts the range at the bounds of pages, because the kernel copies a piece whole or not at all. */
+// Cuts the range at the bounds of pages, because the kernel copies a piece whole or not at all.
 std::size_t CutAtPages(const char* from, std::size_t count, iovec (&pieces)[kPiecesAtOnce], std::size_t& bytes) {
     std::size_t used = 0;
     bytes = 0;
@@ -55,7 +54,7 @@ Outcome ReadPieces(const char* from, char* to, std::size_t count, std::size_t& d
     return done == bytes ? Outcome::kRead : Outcome::kStopped;
 }
 
-/* For kernels and sandboxes that do not let a process read itself: a pipe takes what can be read of a page. */
+// For kernels and sandboxes that do not let a process read itself: a pipe takes what can be read of a page.
 std::size_t ReadThroughPipe(const char* from, char* to, std::size_t count) {
     int ends[2];
     if (systemCalls.pipe2(ends, O_CLOEXEC) != 0) return 0;

@@ -1,17 +1,16 @@
 #include "platform/MessageEvent.h"
 
-#include <fcntl.h>
-#include <unistd.h>
-
-#include <cstdio>
-#include <cstdlib>
-#include <cstring>
-#include <new>
-
 #include "platform/Mutex.h"
 #include "platform/posix/Errors.h"
 #include "platform/posix/SystemCalls.h"
 #include "platform/posix/Threads.h"
+
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <fcntl.h>
+#include <new>
+#include <unistd.h>
 
 namespace tessel::platform {
 
@@ -19,12 +18,12 @@ namespace {
 
 struct Source {
     ThreadId thread;
-    std::uint64_t start; /* of the thread: its number may be given to another */
+    std::uint64_t start;  // of the thread: its number may be given to another
     Source* next;
     Event event;
 };
 
-/* When the thread began, in the host's ticks; 0 when it does not tell. */
+// When the thread began, in the host's ticks; 0 when it does not tell.
 std::uint64_t StartOf(ThreadId thread) {
     char name[48], text[512];
     std::snprintf(name, sizeof name, "/proc/self/task/%u/stat", static_cast<unsigned>(thread));
@@ -34,23 +33,23 @@ std::uint64_t StartOf(ThreadId thread) {
     systemCalls.close(file);
     if (got <= 0) return 0;
     text[got] = 0;
-    constexpr int kStateField = 3, kStartField = 22; /* the name before them, in brackets, may hold anything */
+    constexpr int kStateField = 3, kStartField = 22;  // the name before them, in brackets, may hold anything
     const char* at = std::strrchr(text, ')');
     for (int field = kStateField - 1; at && field < kStartField; ++field) at = std::strchr(at + 1, ' ');
     return at ? std::strtoull(at, nullptr, 10) : 0;
 }
 
-constinit Mutex sourcesMutex; /* guards the list; nothing is taken inside but what an event takes */
+constinit Mutex sourcesMutex;  // guards the list; nothing is taken inside but what an event takes
 constinit Source* sources = nullptr;
 
-/* The link that holds the thread's source, or the one at the end; under the mutex. */
+// The link that holds the thread's source, or the one at the end; under the mutex.
 Source** Find(ThreadId thread) {
     Source** link = &sources;
     while (*link && (*link)->thread != thread) link = &(*link)->next;
     return link;
 }
 
-/* An earlier thread of that number may have left one that was signaled and never asked for. */
+// An earlier thread of that number may have left one that was signaled and never asked for.
 Source* FindOrMake(ThreadId thread) {
     Source** link = Find(thread);
     std::uint64_t start = StartOf(thread);
@@ -62,7 +61,7 @@ Source* FindOrMake(ThreadId thread) {
     return *link;
 }
 
-/* Takes the calling thread's source out when the thread ends. */
+// Takes the calling thread's source out when the thread ends.
 struct Owner {
     Source* source = nullptr;
     ~Owner() {

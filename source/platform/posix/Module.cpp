@@ -1,21 +1,20 @@
 #include "platform/Module.h"
 
+#include "platform/posix/ElfSymbols.h"
+#include "platform/posix/NativeNames.h"
+
+#include <cstdlib>
 #include <cxxabi.h>
 #include <dlfcn.h>
 #include <link.h>
-#include <unistd.h>
-
-#include <cstdlib>
 #include <memory>
-
-#include "platform/posix/ElfSymbols.h"
-#include "platform/posix/NativeNames.h"
+#include <unistd.h>
 
 namespace tessel::platform {
 
 namespace {
 
-/* The host's full name of the executable; empty when it does not tell. */
+// The host's full name of the executable; empty when it does not tell.
 std::string ExecutableFile() {
     std::string name(256, 0);
     for (;;) {
@@ -29,7 +28,7 @@ std::string ExecutableFile() {
     }
 }
 
-/* Where the first segment lies: the bias alone is 0 for an executable that is not relocated. */
+// Where the first segment lies: the bias alone is 0 for an executable that is not relocated.
 ModuleHandle BaseOf(const dl_phdr_info& info) {
     for (int i = 0; i < info.dlpi_phnum; ++i) {
         const auto& segment = info.dlpi_phdr[i];
@@ -38,12 +37,12 @@ ModuleHandle BaseOf(const dl_phdr_info& info) {
     return static_cast<ModuleHandle>(info.dlpi_addr);
 }
 
-/* Calls visit(base, host name) for each module, the executable first, until it returns false. */
+// Calls visit(base, host name) for each module, the executable first, until it returns false.
 template <typename Visitor>
 void ForEachModule(Visitor visit) {
     dl_iterate_phdr(
         [](dl_phdr_info* info, std::size_t, void* context) {
-            /* The executable's own name is empty here. */
+            // The executable's own name is empty here.
             return (*static_cast<Visitor*>(context))(BaseOf(*info), info->dlpi_name ? info->dlpi_name : "") ? 0 : 1;
         },
         &visit);
@@ -107,7 +106,7 @@ bool DescribeAddress(const void* address, AddressEntry& entry) {
     if (dladdr(address, &info) == 0) return FailWith(kErrorModuleNotFound);
     std::string file = info.dli_fname ? info.dli_fname : "";
     std::uintptr_t base = reinterpret_cast<std::uintptr_t>(info.dli_fbase);
-    if (base == ExecutableBase()) file = ExecutableFile(); /* its name here is what it was called by */
+    if (base == ExecutableBase()) file = ExecutableFile();  // its name here is what it was called by
     entry.module = NameFromDisk(NativeLast(file));
     entry.offset = reinterpret_cast<std::uintptr_t>(address) - base;
     std::uintptr_t start = reinterpret_cast<std::uintptr_t>(info.dli_saddr) - base;
@@ -119,7 +118,7 @@ bool DescribeAddress(const void* address, AddressEntry& entry) {
 }
 
 bool IsInModule(const void* address) noexcept {
-#ifdef DLFO_STRUCT_HAS_EH_DBASE /* a C library that has _dl_find_object */
+#ifdef DLFO_STRUCT_HAS_EH_DBASE  // a C library that has _dl_find_object
     dl_find_object object;
     return _dl_find_object(const_cast<void*>(address), &object) == 0;
 #else

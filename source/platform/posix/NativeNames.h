@@ -1,47 +1,46 @@
-/* From the library's names to the host's, for the files of this backend that call the kernel by name. */
+// From the library's names to the host's, for the files of this backend that call the kernel by name.
 #ifndef TESSEL_PLATFORM_POSIX_NATIVENAMES_H
 #define TESSEL_PLATFORM_POSIX_NATIVENAMES_H
 
-#include <errno.h>
-
-#include <string>
-#include <string_view>
-
 #include "platform/DriveTable.h"
 #include "platform/posix/Errors.h"
+
+#include <errno.h>
+#include <string>
+#include <string_view>
 
 namespace tessel::platform {
 
 enum class Match { kAll, kLastMissing, kParentMissing };
 
-/* Respells the parts of `native` that exist on the disk in another case only. */
+// Respells the parts of `native` that exist on the disk in another case only.
 Match MatchOnDisk(std::string& native);
 
-/* What NameToNativeText says, from the current folder on where it is relative. */
+// What NameToNativeText says, from the current folder on where it is relative.
 bool NameToAbsoluteText(std::string_view name, std::string& native);
 
-/* The item that `name` names, spelled as on the disk and absolute. False with LastError when it is missing. */
+// The item that `name` names, spelled as on the disk and absolute. False with LastError when it is missing.
 bool NameToAbsoluteNative(const char* name, std::string& native);
 
-/* The entry of `folder` that is `name`, exactly or in another case. The first in byte order where several are, so that
-   the answer does not hang on the order of the listing. */
+// The entry of `folder` that is `name`, exactly or in another case. The first in byte order where several are, so that
+// the answer does not hang on the order of the listing.
 bool FindInFolder(const std::string& folder, std::string_view name, std::string& found);
 
-/* Equal but for case, of two names in UTF-8. */
+// Equal but for case, of two names in UTF-8.
 bool EqualNames(std::string_view a, std::string_view b) noexcept;
 
-/* Takes the first character off a name in UTF-8 (not empty), in upper case. A byte that is none equals only itself. */
+// Takes the first character off a name in UTF-8 (not empty), in upper case. A byte that is none equals only itself.
 char32_t TakeUpper(std::string_view& text) noexcept;
 
-/* A name on the disk as the library sees it: in the code page, with `?` for what a name cannot hold. */
+// A name on the disk as the library sees it: in the code page, with `?` for what a name cannot hold.
 std::string NameFromDisk(std::string_view diskName);
 
-/* Splits off the last component. "/" for the parent of a top one, "." for that of a relative one. */
+// Splits off the last component. "/" for the parent of a top one, "." for that of a relative one.
 std::string NativeParent(std::string_view native);
 std::string_view NativeLast(std::string_view native);
 
-/* Runs operation(native) on an item that must exist: exactly as spelled first, and if there is none, as found on the
-   disk. The operation returns false and sets errno; so a name that fits costs no look at the disk. */
+// Runs operation(native) on an item that must exist: exactly as spelled first, and if there is none, as found on the
+// disk. The operation returns false and sets errno; so a name that fits costs no look at the disk.
 template <typename Operation>
 bool OnExistingItem(std::string_view name, Operation operation) {
     std::string native;

@@ -1,11 +1,10 @@
 #include "platform/Process.h"
 
-#include <stdlib.h>
-#include <unistd.h>
+#include "platform/posix/TextFile.h"
 
 #include <cstdlib>
-
-#include "platform/posix/TextFile.h"
+#include <stdlib.h>
+#include <unistd.h>
 
 namespace tessel::platform {
 
@@ -20,7 +19,7 @@ std::uint32_t ProcessId() noexcept {
 std::vector<std::string> ProcessArguments() {
     std::vector<std::string> arguments;
     std::string all;
-    ReadTextFile("/proc/self/cmdline", all); /* each ends with a zero byte */
+    ReadTextFile("/proc/self/cmdline", all);  // each ends with a zero byte
     for (std::size_t start = 0; start < all.size();) {
         arguments.emplace_back(all.c_str() + start);
         start += arguments.back().size() + 1;
@@ -47,7 +46,7 @@ std::string EnvironmentExpand(std::string_view text) {
         expanded += text.substr(0, open);
         std::string name(text.substr(open + 1, close - open - 1));
         const char* value = name.empty() ? nullptr : std::getenv(name.c_str());
-        /* Of a name that is none, the second sign may begin another. */
+        // Of a name that is none, the second sign may begin another.
         expanded += value ? value : "%" + name;
         text.remove_prefix(value ? close + 1 : close);
     }

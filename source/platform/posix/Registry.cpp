@@ -1,46 +1,45 @@
 #include "platform/Registry.h"
 
-#include <dirent.h>
-#include <errno.h>
-#include <unistd.h>
-
-#include <algorithm>
-#include <charconv>
-#include <cstdio>
-#include <cstdlib>
-#include <memory>
-#include <string_view>
-#include <vector>
-
 #include "platform/CodePage.h"
 #include "platform/posix/Folders.h"
 #include "platform/posix/NativeNames.h"
 #include "platform/posix/SystemCalls.h"
 #include "platform/posix/TextFile.h"
 
-/* On the disk:
+#include <algorithm>
+#include <charconv>
+#include <cstdio>
+#include <cstdlib>
+#include <dirent.h>
+#include <errno.h>
+#include <memory>
+#include <string_view>
+#include <unistd.h>
+#include <vector>
 
-     <store>/HKEY_LOCAL_MACHINE/SOFTWARE/Maker/=Path
-
-   A key is a folder of its name; a value is a file of its name behind `=`, so that the two never meet. `%` and two
-   hexadecimal digits stand for a byte that a file's name cannot have, or that would read as something else. Names that
-   begin with a dot belong to the store: its lock, and values being written. The 64-bit view is a store of its own in
-   the folder `.view64`.
-
-   A name too long for the host is `%~` and a hash of the name without regard to case; the name itself is in the file
-   `.name` of the key's folder, or in the value's file before the data.
-
-   A value's file holds `REG `, the type in decimal digits, a line feed, and the raw data; behind the type of one with a
-   long name stand a blank and the length of the name. What a folder holds otherwise, links to other folders too, is
-   none of the registry's and goes with its key. */
+// On the disk:
+//
+//   <store>/HKEY_LOCAL_MACHINE/SOFTWARE/Maker/=Path
+//
+// A key is a folder of its name; a value is a file of its name behind `=`, so that the two never meet. `%` and two
+// hexadecimal digits stand for a byte that a file's name cannot have, or that would read as something else. Names that
+// begin with a dot belong to the store: its lock, and values being written. The 64-bit view is a store of its own in
+// the folder `.view64`.
+//
+// A name too long for the host is `%~` and a hash of the name without regard to case; the name itself is in the file
+// `.name` of the key's folder, or in the value's file before the data.
+//
+// A value's file holds `REG `, the type in decimal digits, a line feed, and the raw data; behind the type of one with a
+// long name stand a blank and the length of the name. What a folder holds otherwise, links to other folders too, is
+// none of the registry's and goes with its key.
 
 namespace tessel::platform {
 
 struct RegistryKey {
-    std::string store;  /* the host's name of the folder that holds all */
-    std::string folder; /* the host's name; that of a root need not exist */
+    std::string store;   // the host's name of the folder that holds all
+    std::string folder;  // the host's name; that of a root need not exist
     bool root, write;
-    mutable std::vector<std::string> listing; /* of the enumeration under way */
+    mutable std::vector<std::string> listing;  // of the enumeration under way
 };
 
 namespace {
@@ -77,7 +76,7 @@ std::string Unescaped(std::string_view escaped) {
     return name;
 }
 
-/* Between the code page of the library and the UTF-8 of the disk. */
+// Between the code page of the library and the UTF-8 of the disk.
 std::string ForDisk(const char* name) {
     std::string text = name ? name : "";
     if (ActiveCodePage().utf8) return text;
@@ -93,14 +92,14 @@ std::string FromDisk(const std::string& text) {
     return name;
 }
 
-constexpr std::string_view kHashed = "%~"; /* no escaped byte begins so */
+constexpr std::string_view kHashed = "%~";  // no escaped byte begins so
 constexpr const char* kNameFile = "/.name";
 
 bool IsHashed(std::string_view diskName) {
     return diskName.substr(0, kHashed.size()) == kHashed;
 }
 
-/* 128 bits of a name without regard to case: two never meet by chance. */
+// 128 bits of a name without regard to case: two never meet by chance.
 std::string HashText(std::string_view name) {
     constexpr std::uint64_t kPrime = 0x100000001B3u;
     std::uint64_t first = 0xCBF29CE484222325u, second = 0x9E3779B97F4A7C15u;
@@ -116,14 +115,14 @@ std::string HashText(std::string_view name) {
     return text;
 }
 
-/* The name on the disk of a key or, behind the mark, of a value; without the mark. */
+// The name on the disk of a key or, behind the mark, of a value; without the mark.
 std::string DiskNameOf(std::string_view name) {
     constexpr std::size_t kLongest = 255 - sizeof kValueMark;
     std::string escaped = Escaped(name);
     return escaped.size() <= kLongest ? escaped : std::string(kHashed) + HashText(name);
 }
 
-/* The name of a key that was written by earlier versions fills the last byte too. */
+// The name of a key that was written by earlier versions fills the last byte too.
 std::string KeyDiskNameOf(std::string_view name) {
     std::string escaped = Escaped(name);
     return escaped.size() <= 255 ? escaped : DiskNameOf(name);
@@ -134,7 +133,7 @@ std::string ValueFileName(const char* name) {
 }
 
 struct KeyName {
-    std::string name, disk; /* both in UTF-8 */
+    std::string name, disk;  // both in UTF-8
 };
 
 std::vector<KeyName> PathParts(const char* path) {
@@ -154,15 +153,15 @@ std::vector<KeyName> PathParts(const char* path) {
 
 // ---- the store ------------------------------------------------------------------------------------------------------
 
-/* Empty when the setting names none: a relative one would lie elsewhere for every process. */
+// Empty when the setting names none: a relative one would lie elsewhere for every process.
 std::string StoreFolder() {
     const char* setting = std::getenv("TESSEL_REGISTRY");
     if (setting && *setting) return *setting == '/' ? setting : "";
     return XdgFolder("XDG_CONFIG_HOME", ".config") + "/tessel/registry";
 }
 
-/* Held by whoever changes the store, in whatever process: so no two make one name in two spellings, and no key goes
-   while a value is put into it. Where it cannot be had (a file system without locks) things go on without. */
+// Held by whoever changes the store, in whatever process: so no two make one name in two spellings, and no key goes
+// while a value is put into it. Where it cannot be had (a file system without locks) things go on without.
 class StoreLock {
 public:
     explicit StoreLock(const std::string& store) {
@@ -188,19 +187,19 @@ bool Exists(const std::string& native) {
     return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0;
 }
 
-/* Whether it is a folder itself: a link might lead out of the store, and what is deleted must lie within. */
+// Whether it is a folder itself: a link might lead out of the store, and what is deleted must lie within.
 bool IsFolder(const std::string& native) {
     struct statx status;
     return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0 &&
            S_ISDIR(status.stx_mode);
 }
 
-/* 1018 when somebody has deleted the key meanwhile. A root is always there, if only by name. */
+// 1018 when somebody has deleted the key meanwhile. A root is always there, if only by name.
 ErrorNumber CheckThere(const RegistryKey* key) {
     return key->root || IsFolder(key->folder) ? kErrorSuccess : kErrorKeyDeleted;
 }
 
-/* The item of `folder` with that name, in whatever case; the name as given where there is none. */
+// The item of `folder` with that name, in whatever case; the name as given where there is none.
 std::string ItemIn(const std::string& folder, const std::string& diskName) {
     std::string native = folder + "/" + diskName, found;
     if (!Exists(native) && FindInFolder(folder, diskName, found)) native = folder + "/" + found;
@@ -213,7 +212,7 @@ std::string KeyFolder(const RegistryKey* parent, const char* path) {
     return folder;
 }
 
-/* Writes the long names of a key that was just made, and of those above it. */
+// Writes the long names of a key that was just made, and of those above it.
 bool KeepNames(const RegistryKey* parent, const char* path) {
     std::string folder = parent->folder;
     for (const KeyName& part : PathParts(path)) {
@@ -233,7 +232,7 @@ Kind KindOf(const std::string& folder, const dirent& entry) {
     return isFolder ? Kind::kKey : Kind::kOther;
 }
 
-/* Calls visit(name on the disk, kind) for all that a key's folder holds. */
+// Calls visit(name on the disk, kind) for all that a key's folder holds.
 template <typename Visitor>
 ErrorNumber VisitFolder(const std::string& folder, Visitor visit) {
     std::unique_ptr<DIR, int (*)(DIR*)> listing(opendir(folder.c_str()), closedir);
@@ -332,9 +331,9 @@ ErrorNumber RegistryCounts(const RegistryKey* key, std::uint32_t& subKeys, std::
 namespace {
 
 constexpr std::string_view kValueHeader = "REG ";
-constexpr std::size_t kLongestHeader = kValueHeader.size() + 22; /* two numbers, the blank and the line feed */
+constexpr std::size_t kLongestHeader = kValueHeader.size() + 22;  // two numbers, the blank and the line feed
 
-/* Of a value's file: what stands where. `length` is that of the name before the data. */
+// Of a value's file: what stands where. `length` is that of the name before the data.
 struct ValueHeader {
     std::uint32_t type = 0;
     std::size_t size = 0, length = 0;
@@ -351,7 +350,7 @@ bool ParseHeader(const std::string& text, bool hashed, ValueHeader& header) {
     return header.length <= text.size() - header.size;
 }
 
-/* The name of what stands in a key's folder, in UTF-8. False when it cannot be read: then it is none of ours. */
+// The name of what stands in a key's folder, in UTF-8. False when it cannot be read: then it is none of ours.
 bool NameOfItem(const std::string& folder, std::string_view item, Kind kind, std::string& name) {
     constexpr std::size_t kMost = 1024 * 1024;
     const std::string_view disk = item.substr(kind == Kind::kValue ? 1 : 0);
@@ -365,7 +364,7 @@ bool NameOfItem(const std::string& folder, std::string_view item, Kind kind, std
     return true;
 }
 
-/* The first index lists the folder, the others read on in that listing. */
+// The first index lists the folder, the others read on in that listing.
 ErrorNumber Enumerate(const RegistryKey* key, Kind kind, std::uint32_t index, std::string& name) {
     if (!key) return kErrorInvalidHandle;
     if (index == 0) {
@@ -396,10 +395,10 @@ ErrorNumber RegistryEnumerateValue(const RegistryKey* key, std::uint32_t index, 
 
 namespace {
 
-constexpr std::size_t kLongestName = 1024 * 1024; /* bytes of a value's name before its data */
+constexpr std::size_t kLongestName = 1024 * 1024;  // bytes of a value's name before its data
 
-/* As the name is spelled first: a name that fits costs no look at the folder. False with errno. No more is read than
-   a value may have, and a byte: a damaged store must not take all memory. */
+// As the name is spelled first: a name that fits costs no look at the folder. False with errno. No more is read than
+// a value may have, and a byte: a damaged store must not take all memory.
 bool ReadValueFile(const std::string& folder, const std::string& diskName, std::string& text) {
     constexpr std::size_t kMost = kLongestHeader + kLongestName + kLargestRegistryValue + 1;
     std::string found;

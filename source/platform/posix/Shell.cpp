@@ -1,16 +1,5 @@
 #include "platform/Shell.h"
 
-#include <errno.h>
-#include <linux/fs.h>
-#include <stdio.h>
-#include <time.h>
-#include <unistd.h>
-
-#include <algorithm>
-#include <cstdint>
-#include <cstdlib>
-#include <string_view>
-
 #include "platform/CodePage.h"
 #include "platform/Process.h"
 #include "platform/posix/Folders.h"
@@ -18,13 +7,23 @@
 #include "platform/posix/SystemCalls.h"
 #include "platform/posix/TextFile.h"
 
+#include <algorithm>
+#include <cstdint>
+#include <cstdlib>
+#include <errno.h>
+#include <linux/fs.h>
+#include <stdio.h>
+#include <string_view>
+#include <time.h>
+#include <unistd.h>
+
 namespace tessel::platform {
 
 // ---- standard folders -----------------------------------------------------------------------------------------------
 
 namespace {
 
-/* A line of user-dirs.dirs: XDG_DESKTOP_DIR="$HOME/Desktop". Only absolute folders and those under $HOME count. */
+// A line of user-dirs.dirs: XDG_DESKTOP_DIR="$HOME/Desktop". Only absolute folders and those under $HOME count.
 bool ParseUserFolder(std::string_view line, std::string_view variable, std::string& folder) {
     line.remove_prefix(std::min(line.find_first_not_of(" \t"), line.size()));
     if (line.substr(0, variable.size()) != variable) return false;
@@ -92,7 +91,7 @@ bool ShellFolderName(ShellFolder kind, bool create, std::string& name) {
     struct statx status;
     bool there = systemCalls.statx(AT_FDCWD, native.c_str(), 0, STATX_TYPE, &status) == 0 && S_ISDIR(status.stx_mode);
     if (!there && !create) return FailWith(kErrorFileNotFound);
-    if (!there && !MakeFolders(native, 0700)) return FailErrno(); /* new folders of the user's are private */
+    if (!there && !MakeFolders(native, 0700)) return FailErrno();  // new folders of the user's are private
     return NativeToName(native, name);
 }
 
@@ -100,7 +99,7 @@ bool ShellFolderName(ShellFolder kind, bool create, std::string& name) {
 
 namespace {
 
-/* A trash folder, and the folder that the paths in it are relative to (empty: they are absolute). */
+// A trash folder, and the folder that the paths in it are relative to (empty: they are absolute).
 struct Trash {
     std::string folder, top;
 };
@@ -113,7 +112,7 @@ bool SameDevice(const struct statx& a, const struct statx& b) {
     return a.stx_dev_major == b.stx_dev_major && a.stx_dev_minor == b.stx_dev_minor;
 }
 
-/* The top folder of the file system that holds the item. */
+// The top folder of the file system that holds the item.
 std::string TopFolder(const std::string& native, const struct statx& item) {
     std::string top = NativeParent(native);
     struct statx status;
@@ -125,8 +124,8 @@ bool MakeTrash(const std::string& folder) {
     return MakeFolders(folder + "/files", 0700) && MakeFolders(folder + "/info", 0700);
 }
 
-/* The home trash for what lies on its file system; else that at the top of the item's own: the shared one if it is set
-   up as it must be (a real folder with the sticky bit), else one of the user's. */
+// The home trash for what lies on its file system; else that at the top of the item's own: the shared one if it is set
+// up as it must be (a real folder with the sticky bit), else one of the user's.
 bool FindTrash(const std::string& native, const struct statx& item, Trash& trash) {
     struct statx status;
     trash = {XdgFolder("XDG_DATA_HOME", ".local/share") + "/Trash", ""};
@@ -166,8 +165,7 @@ std::string TrashInfo(const std::string& native, const Trash& trash) {
     return "[Trash Info]\nPath=" + PercentEncoded(path) + "\nDeletionDate=" + date + "\n";
 }
 
-/* The information first, which takes the name; then the item itself. False with errno; EEXIST when the name is taken.
- */
+// The information first, which takes the name; then the item itself. False with errno; EEXIST when the name is taken.
 bool PutIntoTrash(const std::string& native, const Trash& trash, const std::string& name) {
     std::string info = trash.folder + "/info/" + name + ".trashinfo";
     if (!CreateTextFile(info, TrashInfo(native, trash))) return false;
@@ -201,13 +199,13 @@ bool ShellTrash(const char* name) {
 
 namespace {
 
-/* The parts of a shortcut file as documented by its maker ([MS-SHLLINK]); every number lowest byte first. */
+// The parts of a shortcut file as documented by its maker ([MS-SHLLINK]); every number lowest byte first.
 class ShortcutReader {
 public:
     explicit ShortcutReader(std::string_view bytes) : bytes_(bytes) {}
 
-    /* False when it is no shortcut, or has no target in a form that can be read. `linkFolder`: where the shortcut lies,
-       with a separator at its end. */
+    // False when it is no shortcut, or has no target in a form that can be read. `linkFolder`: where the shortcut lies,
+    // with a separator at its end.
     bool Target(std::string_view linkFolder, std::string& target) {
         constexpr std::string_view kHeader("\x4C\0\0\0\x01\x14\x02\0\0\0\0\0\xC0\0\0\0\0\0\0\x46", 20);
         if (bytes_.size() < kHeaderSize || bytes_.substr(0, kHeader.size()) != kHeader) return false;
@@ -230,7 +228,7 @@ private:
     static constexpr std::uint32_t kHasIDList = 1, kHasLinkInfo = 2, kHasRelativePath = 8, kIsUnicode = 0x80,
                                    kForceNoLinkInfo = 0x100, kHasExpString = 0x200;
 
-    /* Numbers and texts outside the file read as 0 and as empty. */
+    // Numbers and texts outside the file read as 0 and as empty.
     std::uint32_t Number(std::size_t at, int size) const {
         std::uint32_t number = 0;
         if (at > bytes_.size() || bytes_.size() - at < static_cast<std::size_t>(size)) return 0;
@@ -255,7 +253,7 @@ private:
         std::string_view rest = bytes_.substr(at, count);
         return std::string(rest.substr(0, rest.find('\0')));
     }
-    /* Where the structure at `base` says its text is: in both forms, of which the wide one counts when it is there. */
+    // Where the structure at `base` says its text is: in both forms, of which the wide one counts when it is there.
     std::string TextAt(std::size_t base, std::uint32_t offset, std::uint32_t wideOffset) const {
         if (wideOffset) return Wide(base + wideOffset, bytes_.size());
         return offset ? Narrow(base + offset, bytes_.size()) : "";
@@ -279,7 +277,7 @@ private:
         return !target.empty();
     }
 
-    /* Of the counted texts that follow, the relative path is the second. `at` moves behind all of them. */
+    // Of the counted texts that follow, the relative path is the second. `at` moves behind all of them.
     std::string RelativePath(std::size_t& at) const {
         std::string relative;
         for (std::uint32_t flag = 4; flag <= 0x40; flag <<= 1) {
@@ -293,7 +291,7 @@ private:
         return relative;
     }
 
-    /* A target with environment variables in it, in one of the blocks at the end. */
+    // A target with environment variables in it, in one of the blocks at the end.
     bool EnvironmentTarget(std::size_t at, std::string& target) const {
         constexpr std::uint32_t kEnvironmentBlock = 0xA0000001;
         constexpr std::size_t kNarrowSize = 260;

@@ -7,22 +7,22 @@
 #    include <cpuid.h>
 #endif
 
+#include "platform/Thread.h"
+#include "platform/posix/Errors.h"
+#include "platform/posix/SystemCalls.h"
+#include "platform/posix/TextFile.h"
+
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <set>
 #include <string_view>
 
-#include "platform/Thread.h"
-#include "platform/posix/Errors.h"
-#include "platform/posix/SystemCalls.h"
-#include "platform/posix/TextFile.h"
-
 namespace tessel::platform {
 
 namespace {
 
-/* Calls take(line) for each line of a text. */
+// Calls take(line) for each line of a text.
 template <typename Taker>
 void ForEachLine(std::string_view text, Taker take) {
     while (!text.empty()) {
@@ -32,7 +32,7 @@ void ForEachLine(std::string_view text, Taker take) {
     }
 }
 
-/* What follows `key` in a line that begins with it, without blanks, signs and quotes around it. */
+// What follows `key` in a line that begins with it, without blanks, signs and quotes around it.
 bool ValueOf(std::string_view line, std::string_view key, std::string& value) {
     if (line.substr(0, key.size()) != key) return false;
     line.remove_prefix(key.size());
@@ -83,7 +83,7 @@ ProcessorFacts GetProcessorFacts() {
     std::string text, value, package;
     if (!ReadTextFile("/proc/cpuinfo", text))
         facts.trouble = "cannot read /proc/cpuinfo, error " + std::to_string(ErrorOfErrno(errno));
-    std::set<std::string> packages, cores; /* a core's number counts within its package */
+    std::set<std::string> packages, cores;  // a core's number counts within its package
     std::uint32_t processors = 0;
     ForEachLine(text, [&](std::string_view line) {
         if (ValueOf(line, "processor", value)) ++processors;

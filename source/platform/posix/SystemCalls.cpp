@@ -12,7 +12,7 @@ namespace tessel::platform {
 
 namespace {
 
-/* The C library's own declare variable arguments. */
+// The C library's own declare variable arguments.
 int Open(const char* name, int flags, mode_t mode) {
     return ::open(name, flags, mode);
 }
@@ -20,7 +20,7 @@ int Lock(int file, int command, struct flock* range) {
     return ::fcntl(file, command, range);
 }
 
-/* The C library has no futex. On 32-bit hosts the call with 64-bit times is another one. */
+// The C library has no futex. On 32-bit hosts the call with 64-bit times is another one.
 long Futex(std::uint32_t* word, int operation, std::uint32_t value, const struct timespec* timeout) {
 #if defined(SYS_futex_time64)
     return ::syscall(SYS_futex_time64, word, operation, value, timeout, nullptr, 0);
@@ -33,7 +33,7 @@ int Membarrier(int command, unsigned flags) {
     return static_cast<int>(::syscall(SYS_membarrier, command, flags, 0));
 }
 
-/* Reports through its result, unlike all others. */
+// Reports through its result, unlike all others.
 int ClockNanosleep(clockid_t clock, int flags, const struct timespec* time, struct timespec* remaining) {
     int error = ::clock_nanosleep(clock, flags, time, remaining);
     if (error == 0) return 0;

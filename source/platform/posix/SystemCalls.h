@@ -1,8 +1,10 @@
-/* Every call that this backend makes of the kernel, by name, in one table that tests replace parts of: a short write,
-   an interruption, a full disk, a clock moved by hand. */
+// Every call that this backend makes of the kernel, by name, in one table that tests replace parts of: a short write,
+// an interruption, a full disk, a clock moved by hand.
 #ifndef TESSEL_PLATFORM_POSIX_SYSTEMCALLS_H
 #define TESSEL_PLATFORM_POSIX_SYSTEMCALLS_H
 
+#include <cstddef>
+#include <cstdint>
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <sys/statfs.h>
@@ -10,12 +12,9 @@
 #include <sys/uio.h>
 #include <time.h>
 
-#include <cstddef>
-#include <cstdint>
-
 namespace tessel::platform {
 
-/* X(result, name, parameters): all return -1 (mmap: MAP_FAILED) and set errno on failure. */
+// X(result, name, parameters): all return -1 (mmap: MAP_FAILED) and set errno on failure.
 #define TESSEL_SYSTEM_CALLS(X)                                                                                     \
     X(int, open, (const char* name, int flags, mode_t mode))                                                       \
     X(int, close, (int file))                                                                                      \

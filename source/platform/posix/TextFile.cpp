@@ -1,14 +1,13 @@
 #include "platform/posix/TextFile.h"
 
-#include <errno.h>
-#include <fcntl.h>
-#include <unistd.h>
+#include "platform/posix/SystemCalls.h"
 
 #include <algorithm>
 #include <atomic>
 #include <cstdio>
-
-#include "platform/posix/SystemCalls.h"
+#include <errno.h>
+#include <fcntl.h>
+#include <unistd.h>
 
 namespace tessel::platform {
 
@@ -32,13 +31,13 @@ bool WriteAll(int file, const std::string& data) {
     return true;
 }
 
-/* Unlike any other's, in this process or another: who made it, and which it is. Hidden, beside the file it will be.
-   Short, as that file's name may be as long as a name can be. */
+// Unlike any other's, in this process or another: who made it, and which it is. Hidden, beside the file it will be.
+// Short, as that file's name may be as long as a name can be.
 std::string TemporaryName(const std::string& native) {
     static std::atomic<unsigned> number{0};
     char name[48];
     std::snprintf(name, sizeof name, ".%d.%u.tmp", ::getpid(), number.fetch_add(1));
-    std::size_t last = native.rfind('/') + 1; /* 0 when there is no folder */
+    std::size_t last = native.rfind('/') + 1;  // 0 when there is no folder
     return native.substr(0, last) + name;
 }
 
@@ -46,7 +45,7 @@ std::string TemporaryName(const std::string& native) {
 
 bool ReadTextFile(const char* native, std::string& text, std::size_t most) {
     text.clear();
-    int file = OpenRetrying(native, O_RDONLY | O_NONBLOCK, 0); /* a pipe of that name must not make us wait */
+    int file = OpenRetrying(native, O_RDONLY | O_NONBLOCK, 0);  // a pipe of that name must not make us wait
     if (file < 0) return false;
     char buffer[4096];
     ssize_t moved = 1;
@@ -76,7 +75,7 @@ bool CreateTextFile(const std::string& native, const std::string& data) {
 }
 
 bool ReplaceFile(const std::string& native, const std::string& data) {
-    constexpr int kTries = 100; /* a process of our number may have ended and left its files behind */
+    constexpr int kTries = 100;  // a process of our number may have ended and left its files behind
     std::string temporary;
     bool made = false;
     for (int i = 0; i < kTries && !made; ++i) {

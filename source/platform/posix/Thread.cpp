@@ -1,6 +1,15 @@
 #include "platform/Thread.h"
 
+#include "platform/Clock.h"
+#include "platform/Event.h"
+#include "platform/Mutex.h"
+#include "platform/posix/Errors.h"
+#include "platform/posix/Threads.h"
+
+#include <algorithm>
+#include <atomic>
 #include <errno.h>
+#include <new>
 #include <pthread.h>
 #include <sched.h>
 #include <signal.h>
@@ -9,33 +18,23 @@
 #include <sys/syscall.h>
 #include <unistd.h>
 
-#include <algorithm>
-#include <atomic>
-#include <new>
-
-#include "platform/Clock.h"
-#include "platform/Event.h"
-#include "platform/Mutex.h"
-#include "platform/posix/Errors.h"
-#include "platform/posix/Threads.h"
-
 namespace tessel::platform {
 
-/* Shared by the handles to a thread and, while it runs, by the thread: the last of them frees it. */
+// Shared by the handles to a thread and, while it runs, by the thread: the last of them frees it.
 struct ThreadRecord {
     std::atomic<int> references{1};
     std::atomic<ThreadId> id{0};
     std::atomic<bool> ended{false};
-    std::atomic<bool> forced{false};    /* ended by ThreadEnd */
-    std::atomic<bool> abandoned{false}; /* forced, and its own reference given back */
+    std::atomic<bool> forced{false};     // ended by ThreadEnd
+    std::atomic<bool> abandoned{false};  // forced, and its own reference given back
     std::atomic<std::int32_t> exitCode{0};
-    bool started = false; /* by this seam */
-    bool joined = false;  /* nothing of it runs any more; guarded by joinMutex */
+    bool started = false;  // by this seam
+    bool joined = false;   // nothing of it runs any more; guarded by joinMutex
     pthread_t thread{};
     ThreadProcedure procedure = nullptr;
     void* argument = nullptr;
     Event idKnown;
-    Event over; /* signaled for good once the thread has ended: who takes the signal gives it back */
+    Event over;  // signaled for good once the thread has ended: who takes the signal gives it back
     Mutex joinMutex;
 };
 
@@ -45,7 +44,7 @@ namespace {
 
 constexpr std::int32_t kStillActive = 259;
 
-/* The calling thread's record if this seam started it, and its id once asked for. */
+// The calling thread's record if this seam started it, and its id once asked for.
 constinit thread_local ThreadRecord* currentRecord = nullptr;
 constinit thread_local ThreadId currentId = 0;
 
@@ -69,7 +68,7 @@ void WakeOnTime() noexcept {
 
 ThreadId CurrentThreadId() noexcept {
     if (currentId == 0) {
-        /* A forked child's one thread has another id than the thread it was. */
+        // A forked child's one thread has another id than the thread it was.
         static const int registered = pthread_atfork(nullptr, nullptr, [] { currentId = 0; });
         (void)registered;
         currentId = static_cast<ThreadId>(::syscall(SYS_gettid));
@@ -81,12 +80,12 @@ ThreadId CurrentThreadId() noexcept {
 
 namespace {
 
-/* The host's own cancellation unwinds the thread's stack, and a frame on the way that lets no exception out would end
-   the process. So the thread is sent a signal, on which it leaves without looking back.
-
-   Nothing of such a thread was cleaned up: its thread-local values still stand in its memory, and others may hold
-   pointers to its stack. So the host is never asked to join or detach it: the memory stays the dead thread's for good,
-   and no other thread begins with what it left. */
+// The host's own cancellation unwinds the thread's stack, and a frame on the way that lets no exception out would end
+// the process. So the thread is sent a signal, on which it leaves without looking back.
+//
+// Nothing of such a thread was cleaned up: its thread-local values still stand in its memory, and others may hold
+// pointers to its stack. So the host is never asked to join or detach it: the memory stays the dead thread's for good,
+// and no other thread begins with what it left.
 int EndSignal() {
     return SIGRTMAX - 3;
 }
@@ -102,10 +101,10 @@ void OnEndSignal(int, siginfo_t* info, void*) {
     if (info->si_code != SI_QUEUE || info->si_pid != ::getpid() || !record || record != currentRecord) return;
     record->forced.store(true, std::memory_order_relaxed);
     MarkEnded(*record, record->exitCode.load(std::memory_order_relaxed));
-    ::syscall(SYS_exit, 0); /* of this thread alone */
+    ::syscall(SYS_exit, 0);  // of this thread alone
 }
 
-/* False when the host uses the signal for something else. */
+// False when the host uses the signal for something else.
 bool InstallEndSignal() {
     static const bool installed = [] {
         struct sigaction before {};
@@ -130,12 +129,12 @@ void AdmitEndSignal() {
 }  // namespace
 
 bool ThreadEnd(ThreadHandle thread, std::int32_t code) noexcept {
-    constexpr std::int32_t kPatience = 1000; /* milliseconds */
+    constexpr std::int32_t kPatience = 1000;  // milliseconds
     if (!thread) return FailWith(kErrorInvalidHandle);
     if (!thread->started || thread == currentRecord) return FailWith(kErrorAccessDenied);
     if (!InstallEndSignal()) return FailWith(kErrorNotSupported);
     {
-        MutexHolder holder(thread->joinMutex); /* while it is held, the host does not reuse the thread's name */
+        MutexHolder holder(thread->joinMutex);  // while it is held, the host does not reuse the thread's name
         if (thread->joined || thread->ended.load(std::memory_order_acquire)) return true;
         thread->exitCode.store(code, std::memory_order_relaxed);
         union sigval value {};
@@ -144,7 +143,7 @@ bool ThreadEnd(ThreadHandle thread, std::int32_t code) noexcept {
         if (error != 0 && error != ESRCH) return FailWith(ErrorOfErrno(error));
     }
     if (!ThreadJoin(thread, kPatience)) return false;
-    /* What the thread itself can no longer do. */
+    // What the thread itself can no longer do.
     if (thread->forced && !thread->abandoned.exchange(true)) {
         ForgetMessageEvent(thread->id);
         Release(thread);
@@ -156,10 +155,10 @@ bool ThreadEnd(ThreadHandle thread, std::int32_t code) noexcept {
 
 namespace {
 
-/* As the process was started with it. */
+// As the process was started with it.
 const int processNice = ::getpriority(PRIO_PROCESS, 0);
 
-/* The host hands a maker's priority on to the threads it makes. Where it may not be raised again it stays. */
+// The host hands a maker's priority on to the threads it makes. Where it may not be raised again it stays.
 void TakeProcessPriority() {
     if (::getpriority(PRIO_PROCESS, 0) != processNice) ::setpriority(PRIO_PROCESS, 0, processNice);
 }
@@ -171,7 +170,7 @@ void* RunThread(void* context) {
     TakeProcessPriority();
     record->id.store(CurrentThreadId(), std::memory_order_release);
     record->idKnown.Set();
-    /* Also when the host's own way out of a thread unwinds it. */
+    // Also when the host's own way out of a thread unwinds it.
     struct AtEnd {
         ThreadRecord* record;
         std::int32_t code;
@@ -236,7 +235,7 @@ bool ThreadExitCode(ThreadHandle thread, std::int32_t& code) noexcept {
 
 namespace {
 
-/* Of a foreign thread the host tells no more than whether it is there. */
+// Of a foreign thread the host tells no more than whether it is there.
 bool AwaitForeign(const ThreadRecord& record, std::int32_t milliseconds) {
     std::uint32_t start = TickMilliseconds();
     while (IsThreadOfProcess(record.id)) {
@@ -261,7 +260,7 @@ bool ThreadJoin(ThreadHandle thread, std::int32_t milliseconds) noexcept {
     MutexHolder holder(thread->joinMutex);
     if (thread->joined || thread == currentRecord) return true;
     if (thread->forced)
-        AwaitForeign(*thread, -1); /* it is on its last steps */
+        AwaitForeign(*thread, -1);  // it is on its last steps
     else
         pthread_join(thread->thread, nullptr);
     thread->joined = true;
@@ -283,11 +282,11 @@ struct PriorityRow {
     int nice;
 };
 
-/* The documented priorities, and the host's: a lower one is more urgent there. */
+// The documented priorities, and the host's: a lower one is more urgent there.
 constexpr PriorityRow kPriorities[] = {{-15, 19}, {-2, 10}, {-1, 5}, {0, 0}, {1, -5}, {2, -10}, {15, -20}};
 
-/* The host names threads by number in these calls, and gives the number of one that has ended to the next, in whatever
-   process. */
+// The host names threads by number in these calls, and gives the number of one that has ended to the next, in whatever
+// process.
 bool IsThere(ThreadHandle thread) {
     bool running = false;
     return ThreadRunning(thread, running) && running;
@@ -308,7 +307,7 @@ bool ThreadGetPriority(ThreadHandle thread, std::int32_t& priority) noexcept {
     errno = 0;
     int nice = getpriority(PRIO_PROCESS, thread->id);
     if (errno != 0) return FailErrno();
-    /* The most urgent row that the thread's number reaches. */
+    // The most urgent row that the thread's number reaches.
     for (const PriorityRow& row : kPriorities) {
         if (nice >= row.nice) {
             priority = row.priority;

@@ -1,8 +1,8 @@
 #include "platform/ThreadFence.h"
 
-#include <linux/membarrier.h>
-
 #include "platform/posix/SystemCalls.h"
+
+#include <linux/membarrier.h>
 
 namespace tessel::platform {
 

@@ -1,4 +1,4 @@
-/* What this backend's files know of threads among themselves. */
+// What this backend's files know of threads among themselves.
 #ifndef TESSEL_PLATFORM_POSIX_THREADS_H
 #define TESSEL_PLATFORM_POSIX_THREADS_H
 
@@ -6,10 +6,10 @@
 
 namespace tessel::platform {
 
-/* Whether a thread of that number runs in this process. */
+// Whether a thread of that number runs in this process.
 bool IsThreadOfProcess(ThreadId thread) noexcept;
 
-/* Drops the message event of a thread that was ended by force. */
+// Drops the message event of a thread that was ended by force.
 void ForgetMessageEvent(ThreadId thread) noexcept;
 
 }  // namespace tessel::platform

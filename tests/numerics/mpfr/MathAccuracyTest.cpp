@@ -1,7 +1,6 @@
 // How near the members of the math family come to the exact values: the largest error over random arguments, against
 // MPFR and MPC. With TESSEL_ACCURACY_TABLE=file in the environment the figures are written there, as docs/accuracy.md.
-#include <gtest/gtest.h>
-#include <mpc.h>
+#include "numerics/Extended.h"
 #include <tessel/numerics/ComplexMath.h>
 #include <tessel/numerics/RealMath.h>
 
@@ -10,11 +9,11 @@
 #include <cstdio>
 #include <cstdlib>
 #include <fstream>
+#include <gtest/gtest.h>
+#include <mpc.h>
 #include <random>
 #include <string>
 #include <vector>
-
-#include "numerics/Extended.h"
 
 namespace {
 
