@@ -57,6 +57,7 @@ Text MakeText(int32 version, uint32 level) {
 }  // namespace
 
 void BuildVersStr(int32 version, PStr out) {
+    if (!out) return;
     Text text = MakeText(version, kVersionStringShort);
     out[0] = static_cast<uint8>(text.length);
     std::memcpy(out + 1, text.bytes, text.length);

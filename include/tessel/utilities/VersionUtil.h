@@ -21,7 +21,7 @@ typedef enum VersionStringDetailLevel {
 
 TESSEL_BEGIN_C
 
-// The short text. `out` takes kVersionStringSize bytes.
+// The short text. `out` takes kVersionStringSize bytes; null is left alone.
 TESSEL_API void BuildVersStr(int32 version, PStr out);
 
 // Returns the length of the text. A buffer (null or of size 0: none) is zeroed, and filled when it is longer than the
