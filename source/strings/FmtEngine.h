@@ -2,6 +2,7 @@
 #ifndef TESSEL_STRINGS_FMTENGINE_H
 #define TESSEL_STRINGS_FMTENGINE_H
 
+#include "strings/FmtArguments.h"
 #include <tessel/base/MgErr.h>
 
 #include <cstdarg>
@@ -16,7 +17,10 @@ struct Formatted {
     bool good;  // false: stopped, and reported, at what is wrong with the format
 };
 
-// As SPrintfv.
+// As SPrintfv. The arguments are used up.
+Formatted FormatText(char* dst, int32 size, const char* format, size_t length, FmtArgumentList& args);
+
+// The same with a list of the caller's, which stays as it is.
 Formatted FormatText(char* dst, int32 size, const char* format, int32 formatLength, va_list args);
 
 // A formatted text in storage of its own, so that the arguments may lie in the text that it is to replace or to extend.
