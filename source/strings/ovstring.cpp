@@ -2,12 +2,10 @@
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"
 #include "strings/CPStrWalk.h"
-#include "strings/FmtEngine.h"
 #include "strings/HandleOps.h"
 #include "strings/LStrView.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/strings/StringCPStr.h>
-#include <tessel/strings/StringFmtPrint.h>
 #include <tessel/strings/StringPStr.h>
 #include <tessel/strings/ovstring.h>
 
@@ -588,95 +586,6 @@ MgErr OVSubString::CopyToNarrowString(std::string& out) const {
         out.assign(reinterpret_cast<const char*>(bytes_), static_cast<size_t>(length_));
         return kNoErr;
     });
-}
-
-// ---- printing -------------------------------------------------------------------------------------------------------
-
-MgErr OVSubStringPrintf(OVSubString* string, bool append, CStr format, va_list args) {
-    if (!string) {
-        TESSEL_REPORT(kDebugError, 0x83E51D29u) << "Bad string ptr";
-        return kArgErr;
-    }
-    FormattedText text;
-    MgErr err = text.Format(format, static_cast<size_t>(LengthOf(format)), args);
-    if (err == kGenericErr) {
-        TESSEL_REPORT(kDebugError, 0x2CB470E8u) << "OVSubStringPrintf error";
-        return kArgErr;
-    }
-    const int32 start = append ? string->length_ : 0;
-    const auto added = static_cast<int32>(text.Length());
-    if (added > INT32_MAX - start) return kArgErr;
-    if (!err) err = string->Resize(start + added);
-    if (!err && added != 0) std::memcpy(string->bytes_ + start, text.Bytes(), text.Length());
-    return err;
-}
-
-MgErr OVString::Printf(CStr format, ...) {
-    OVSubString view(this);
-    va_list args;
-    va_start(args, format);
-    const MgErr err = OVSubStringPrintf(&view, false, format, args);
-    va_end(args);
-    return err;
-}
-
-MgErr OVString::Printf(const unsigned char* format, ...) {
-    OVSubString view(this);
-    va_list args;
-    va_start(args, format);
-    const MgErr err = OVSubStringPrintf(&view, false, reinterpret_cast<CStr>(format), args);
-    va_end(args);
-    return err;
-}
-
-MgErr OVString::AppendPrintf(CStr format, ...) {
-    OVSubString view(this);
-    va_list args;
-    va_start(args, format);
-    const MgErr err = OVSubStringPrintf(&view, true, format, args);
-    va_end(args);
-    return err;
-}
-
-MgErr OVString::AppendPrintf(const unsigned char* format, ...) {
-    OVSubString view(this);
-    va_list args;
-    va_start(args, format);
-    const MgErr err = OVSubStringPrintf(&view, true, reinterpret_cast<CStr>(format), args);
-    va_end(args);
-    return err;
-}
-
-MgErr OVSubString::Printf(CStr format, ...) {
-    va_list args;
-    va_start(args, format);
-    const MgErr err = OVSubStringPrintf(this, false, format, args);
-    va_end(args);
-    return err;
-}
-
-MgErr OVSubString::Printf(const unsigned char* format, ...) {
-    va_list args;
-    va_start(args, format);
-    const MgErr err = OVSubStringPrintf(this, false, reinterpret_cast<CStr>(format), args);
-    va_end(args);
-    return err;
-}
-
-MgErr OVSubString::AppendPrintf(CStr format, ...) {
-    va_list args;
-    va_start(args, format);
-    const MgErr err = OVSubStringPrintf(this, true, format, args);
-    va_end(args);
-    return err;
-}
-
-MgErr OVSubString::AppendPrintf(const unsigned char* format, ...) {
-    va_list args;
-    va_start(args, format);
-    const MgErr err = OVSubStringPrintf(this, true, reinterpret_cast<CStr>(format), args);
-    va_end(args);
-    return err;
 }
 
 }  // namespace tessel
