@@ -66,6 +66,10 @@ inline void WriteDecimalDigits(char* end, uint64 value) {
     }
 }
 
+inline uint64 Magnitude(int64 value) {
+    return value < 0 ? uint64{0} - static_cast<uint64>(value) : static_cast<uint64>(value);
+}
+
 // Writes a decimal integer, at most 20 characters, and returns where it ends.
 inline char* WriteDecimal(char* out, uint64 magnitude, bool negative) {
     *out = '-';

@@ -126,10 +126,6 @@ private:
     size_t limit_;
 };
 
-inline uint64 Magnitude(int64 value) {
-    return value < 0 ? uint64{0} - static_cast<uint64>(value) : static_cast<uint64>(value);
-}
-
 }  // namespace tessel
 
 #endif

@@ -88,12 +88,8 @@ int32 RenderIntegerFormat(const void* value, int16 type, int32 code, char* buffe
     const IntegerImage image =
         isInteger ? IntegerImage{ReadInteger(type, value), IntegerBits(type)} : ImageOfReal(type, value, code);
     if (code == kFormatDecimal && (!isInteger || IsSignedType(type))) {
-        const bool negative = static_cast<int64>(image.bits) < 0;
-        const uint64 magnitude = negative ? 0 - image.bits : image.bits;
-        if (size <= kLongestDecimal) return NumToStr(magnitude, negative, 10, buffer, size);
-        char* const end = WriteDecimal(buffer, magnitude, negative);
-        *end = 0;
-        return static_cast<int32>(end - buffer);
+        const auto number = static_cast<int64>(image.bits);
+        return NumToStr(Magnitude(number), number < 0, 10, buffer, size);
     }
     return NumToStr(image.bits & (~uint64{0} >> (64 - image.width)), false, RadixOf(code), buffer, size);
 }
@@ -229,8 +225,7 @@ RealSource SourceOf(int16 type, const void* value) {
     switch (type) {
         case kNumInt64: {
             const auto number = ReadAs<int64>(value);
-            const auto bits = static_cast<uint64>(number);
-            return {{0, 0, RealKind::kFinite, number < 0}, true, number < 0 ? 0 - bits : bits};
+            return {{0, 0, RealKind::kFinite, number < 0}, true, Magnitude(number)};
         }
         case kNumUInt64:
             return {{0, 0, RealKind::kFinite, false}, true, ReadAs<uint64>(value)};

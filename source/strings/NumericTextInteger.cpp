@@ -24,7 +24,7 @@ void ReportCut(bool digitsCut, bool signLost, int32 radix) {
 }
 
 // The low-order digits that fit, and the sign if there is still room.
-int32 WriteLowDigits(uint64 magnitude, bool negative, int32 radix, char* buffer, int32 size, bool* complete) {
+int32 WriteLowDigits(uint64 magnitude, bool negative, int32 radix, char* buffer, int32 size) {
     char work[kMostDigits + 1];
     char* const end = work + sizeof work;
     char* const limit = end - std::min<int32>(size - 1, sizeof work);
@@ -39,22 +39,13 @@ int32 WriteLowDigits(uint64 magnitude, bool negative, int32 radix, char* buffer,
     const auto length = static_cast<int32>(end - at);
     std::memcpy(buffer, at, static_cast<size_t>(length));
     buffer[length] = 0;
-    if (complete == nullptr) {
-        ReportCut(digitsCut, signLost, radix);
-    } else if (digitsCut || signLost) {
-        *complete = false;
-    }
+    ReportCut(digitsCut, signLost, radix);
     return length;
 }
 
 }  // namespace
 
-int32 NumToStr(uint64 magnitude, bool negative, int32 radix, char* buffer, int32 size, bool* complete) {
-    if (radix == 10 && size > kLongestDecimal) {
-        char* const end = WriteDecimal(buffer, magnitude, negative);
-        *end = 0;
-        return static_cast<int32>(end - buffer);
-    }
+int32 RenderDigits(uint64 magnitude, bool negative, int32 radix, char* buffer, int32 size) {
     if (size < 2) {
         TESSEL_REPORT(kDebugWarning, 0xD40A5E72u) << "NumToStr requires at least 2 bytes in the input buffer.";
         if (size == 1) buffer[0] = 0;
@@ -64,7 +55,7 @@ int32 NumToStr(uint64 magnitude, bool negative, int32 radix, char* buffer, int32
         buffer[0] = 0;
         return 0;
     }
-    return WriteLowDigits(magnitude, negative, radix, buffer, size, complete);
+    return WriteLowDigits(magnitude, negative, radix, buffer, size);
 }
 
 int32 WriteExponent(int32 exponent, char* out) {
@@ -92,11 +83,7 @@ int32 NumToIntString(const void* value, char* buffer, int32 size, int32 radix, b
     const int32 width = IntegerBits(type);
     if (isSigned && radix == 10) {
         const int64 number = width == 64 ? static_cast<int64>(bits) : static_cast<int32>(bits);
-        const uint64 magnitude = number < 0 ? 0 - static_cast<uint64>(number) : static_cast<uint64>(number);
-        if (size <= kLongestDecimal) return NumToStr(magnitude, number < 0, radix, buffer, size);
-        char* const end = WriteDecimal(buffer, magnitude, number < 0);
-        *end = 0;
-        return static_cast<int32>(end - buffer);
+        return NumToStr(Magnitude(number), number < 0, 10, buffer, size);
     }
     return NumToStr(bits & (~uint64{0} >> (64 - width)), false, radix, buffer, size);
 }

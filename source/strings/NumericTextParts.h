@@ -119,8 +119,15 @@ int32 Terminate(char* buffer, int32 size, int32 length);
 inline constexpr int32 kLongestDecimal = 20;  // of 64 bits, or of 63 and a sign
 
 // Renders an integer, terminated; a minus sign stands before the magnitude of a negative one. What does not fit is cut
-// at the front: that is reported, or tells `complete` where it is given. Returns the length; 0 for a radix other than
-// 2, 8, 10 and 16.
-int32 NumToStr(uint64 magnitude, bool negative, int32 radix, char* buffer, int32 size, bool* complete = nullptr);
+// at the front, which is reported. Returns the length; 0 for a radix other than 2, 8, 10 and 16.
+int32 RenderDigits(uint64 magnitude, bool negative, int32 radix, char* buffer, int32 size);
+
+// The same; most are decimal and have room.
+inline int32 NumToStr(uint64 magnitude, bool negative, int32 radix, char* buffer, int32 size) {
+    if (radix != 10 || size <= kLongestDecimal) return RenderDigits(magnitude, negative, radix, buffer, size);
+    char* const end = WriteDecimal(buffer, magnitude, negative);
+    *end = 0;
+    return static_cast<int32>(end - buffer);
+}
 
 }  // namespace tessel
