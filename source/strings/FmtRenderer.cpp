@@ -26,10 +26,8 @@ constexpr int32 kSpecialTextLength = 3;   // "NaN", "Inf"
 
 LStrView TextOf(FmtItem item, const void* argument) {
     switch (item) {
-        case FmtItem::kPString: {
-            const auto* text = static_cast<ConstPStr>(argument);
-            return text ? LStrView(text + 1, text[0]) : LStrView(nullptr, 0);
-        }
+        case FmtItem::kPString:
+            return LStrView(static_cast<ConstPStr>(argument));
         case FmtItem::kLString:
             return LStrView(static_cast<const LStr*>(argument));
         case FmtItem::kLHandle:
@@ -157,10 +155,7 @@ void FmtRenderer::RenderInteger(FmtItem item, const FmtSpec& spec, int64 value) 
 // For an output that has no room for all of it, or only counts.
 void FmtRenderer::RenderDecimalInPieces(const FmtSpec& spec, uint64 magnitude, bool negative) {
     char text[kMaxDecimalDigits + 1];
-    const size_t length = CountDecimalDigits(magnitude) + negative;
-    WriteDecimalDigits(text + length, magnitude);
-    if (negative) text[0] = '-';
-    PutNumber(spec, text, length);
+    PutNumber(spec, text, static_cast<size_t>(WriteDecimal(text, magnitude, negative) - text));
 }
 
 void FmtRenderer::RenderReal(FmtItem item, const FmtSpec& spec, double value) {

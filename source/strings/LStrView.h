@@ -6,8 +6,11 @@
 
 namespace tessel {
 
+constexpr size_t kMaxPStr = 255;  // bytes of the longest PStr
+
 // Null and a length below 0 are the empty text. Not to be kept while a handle is resized.
 struct LStrView {
+    LStrView(ConstPStr text) : LStrView(text ? text + 1 : nullptr, text ? text[0] : 0) {}
     LStrView(const LStr* text) : LStrView(text ? text->bytes : nullptr, text ? text->count : 0) {}
     LStrView(LStrHandle handle) : LStrView(handle ? *handle : nullptr) {}
     LStrView(const void* start, int32 count)

@@ -1,14 +1,13 @@
 // The printing functions over the formatting engine.
 #include "strings/FmtEngine.h"
 #include "strings/HandleOps.h"
+#include "strings/LStrView.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/strings/StringFmtPrint.h>
 
 using namespace tessel;
 
 namespace {
-
-constexpr int32 kMaxPStr = 255;
 
 size_t LengthOf(CStr format) {
     return format ? std::strlen(format) : 0;

@@ -11,8 +11,6 @@ using namespace tessel;
 
 namespace {
 
-constexpr size_t kMaxPStr = 255;
-
 int32 Compare(LStrView a, LStrView b) {
     if (a.bytes == b.bytes) return static_cast<int32>(a.length) - static_cast<int32>(b.length);
     return CompareBytes(a.bytes, a.length, b.bytes, b.length);
@@ -21,10 +19,6 @@ int32 Compare(LStrView a, LStrView b) {
 int32 CompareNoCase(LStrView a, LStrView b) {
     if (a.bytes == b.bytes) return static_cast<int32>(a.length) - static_cast<int32>(b.length);
     return CompareBytesNoCase(a.bytes, a.length, b.bytes, b.length);
-}
-
-LStrView ViewOf(ConstPStr text) {
-    return text ? LStrView(text + 1, text[0]) : LStrView(nullptr, 0);
 }
 
 bool Equal(LStrView a, LStrView b) {
@@ -118,11 +112,11 @@ int32 PtrLenStrCaseCmp(const void* a, int32 aLength, const void* b, int32 bLengt
 }
 
 int32 PLStrCmp(ConstPStr a, const LStr* b) {
-    return Compare(ViewOf(a), b);
+    return Compare(a, b);
 }
 
 int32 PLStrCaseCmp(ConstPStr a, const LStr* b) {
-    return CompareNoCase(ViewOf(a), b);
+    return CompareNoCase(a, b);
 }
 
 // ---- into and out of the caller's buffers ---------------------------------------------------------------------------

@@ -12,7 +12,6 @@ using namespace tessel;
 
 namespace {
 
-constexpr size_t kMaxPStr = 255;
 constexpr int32 kMaxElements = INT32_MAX / static_cast<int32>(sizeof(LStrHandle)) - 1;
 
 int32 ElementCount(LStrArrayHandle array) {

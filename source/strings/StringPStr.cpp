@@ -1,5 +1,6 @@
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"
+#include "strings/LStrView.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/strings/StringPStr.h>
@@ -9,8 +10,6 @@
 using namespace tessel;
 
 namespace {
-
-constexpr size_t kMaxPStr = 255;
 
 constexpr uint8 kEmpty[1] = {0};
 

@@ -16,8 +16,6 @@ namespace tessel {
 namespace StringUtils {
 namespace {
 
-constexpr size_t kMaxPStr = 255;
-
 // ---- the three shapes of a conversion: a new string, a given one, without exceptions --------------------------------
 
 template <class String, class Convert>
@@ -46,10 +44,6 @@ void Release(BSTR source, DeallocationPolicy policy) {
 
 std::string_view TextOf(LStrView text) {
     return {reinterpret_cast<const char*>(text.bytes), text.length};
-}
-
-std::string_view TextOf(ConstPStr text) {
-    return text ? TextOf(LStrView(text + 1, text[0])) : std::string_view();
 }
 
 std::u16string_view TextOf(const char16_t* text) {

@@ -30,7 +30,6 @@ enum : int32 {
     kTemporary = 12,
 };
 
-constexpr int32 kMaxPStr = 255;
 constexpr int32 kMaxTerminatedPStr = 254;
 
 int32 LengthOf(CStr text) {
@@ -283,7 +282,7 @@ MgErr OVSubString::ResizeHandle(int32 n) {
 
 MgErr OVSubString::ResizeElement(int32 n) {
     CPStrHandle list = element_.list;
-    if (n > kMaxPStr || !list || element_.index >= ElementCount(*list)) return kArgErr;
+    if (static_cast<uint32>(n) > kMaxPStr || !list || element_.index >= ElementCount(*list)) return kArgErr;
     PStr element = CPStrIndex(list, element_.index);
     const uint8 stored = element[0];
     if (n < stored) MoveToStart(element + 1);
@@ -577,7 +576,7 @@ void OVSubString::CopyToCStr(char* buffer, int32 size) const {
 }
 
 void OVSubString::CopyToPStr(PStr buffer) const {
-    buffer[0] = static_cast<uint8>(std::min(length_, kMaxPStr));
+    buffer[0] = static_cast<uint8>(std::min(length_, int32{kMaxPStr}));
     if (buffer[0] != 0) std::memmove(buffer + 1, bytes_, buffer[0]);
 }
 
