@@ -1,7 +1,7 @@
 // ReadPath stands with the paths (paths/BinDataPaths.cpp).
 #include "diagnostics/Guarded.h"
 #include "streams/Padding.h"
-#include <tessel/memory/MemoryManager.h>
+#include "strings/HandleOps.h"
 #include <tessel/streams/BinDataReader.h>
 
 #include <cstring>
@@ -165,12 +165,11 @@ LStrHandle BinDataReader::ReadLStr() {
     if (!TakeLStrCount(count)) return nullptr;
     const uint8* bytes = Take(count);
     if (!bytes) return nullptr;
-    LStrHandle text = reinterpret_cast<LStrHandle>(DSNewHandle(LStrSize(count)));
-    if (!text) {
-        SetError(kMemFullErr);
+    LStrHandle text = nullptr;
+    if (const MgErr err = MakeLStr(&text, count)) {
+        SetError(err);
         return nullptr;
     }
-    (*text)->count = static_cast<int32>(count);
     std::memcpy((*text)->bytes, bytes, count);
     return text;
 }

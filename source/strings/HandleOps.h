@@ -2,6 +2,7 @@
 #ifndef TESSEL_STRINGS_HANDLEOPS_H
 #define TESSEL_STRINGS_HANDLEOPS_H
 
+#include <tessel/base/StringTypes.h>
 #include <tessel/memory/MemoryManager.h>
 
 namespace tessel {
@@ -24,6 +25,24 @@ MgErr SizeHandle(T** handle, uint32 needed, bool exact) {
     if (size >= needed && (!exact || size == needed)) return kNoErr;
     const MgErr err = DSSetHandleSize(AsHandle(handle), needed);
     return err == kMemFullErr && size > needed ? MgErr{kNoErr} : err;
+}
+
+constexpr size_t kMaxLStr = INT32_MAX - LStrSize(0);  // bytes of the longest text that a handle can hold
+
+// Makes a handle, null or not, an LStr with a text of `count` bytes. New bytes are not set.
+inline MgErr MakeLStr(LStrHandle* handle, size_t count) {
+    if (count > kMaxLStr) return kMemFullErr;
+    if (MgErr err = DSSetHandleSizeOrNewHandle(AsHandlePtr(handle), LStrSize(count))) return err;
+    (**handle)->count = static_cast<int32>(count);
+    return kNoErr;
+}
+
+// Gives an LStr a text of `count` bytes, in a handle that is brought to it as SizeHandle does.
+inline MgErr ResizeLStr(LStrHandle handle, size_t count, bool exact) {
+    if (count > kMaxLStr) return kMemFullErr;
+    if (MgErr err = SizeHandle(handle, LStrSize(count), exact)) return err;
+    (*handle)->count = static_cast<int32>(count);
+    return kNoErr;
 }
 
 // Where a range stands in the content of a handle's block.

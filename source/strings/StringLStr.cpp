@@ -56,21 +56,17 @@ MgErr Append(LStrHandle dst, const uint8* bytes, size_t n, bool exact) {
     const size_t count = LStrView(*dst).length;
     size_t offset = 0;
     const bool own = OffsetInBlock(dst, bytes, &offset);
-    if (n > static_cast<size_t>(INT32_MAX) - LStrSize(count)) return kMemFullErr;
-
-    if (MgErr err = SizeHandle(dst, LStrSize(count + n), exact)) return err;
+    if (MgErr err = ResizeLStr(dst, count + n, exact)) return err;
     if (n != 0) std::memcpy((*dst)->bytes + count, own ? reinterpret_cast<const uint8*>(*dst) + offset : bytes, n);
-    (*dst)->count = static_cast<int32>(count + n);
     return kNoErr;
 }
 
 MgErr AppendOrCreate(LStrHandle* dst, const void* bytes, size_t n) {
     if (!dst) return kArgErr;
     if (*dst) return Append(*dst, static_cast<const uint8*>(bytes), n, true);
-    *dst = reinterpret_cast<LStrHandle>(DSNewHandle(LStrSize(n)));
-    if (!*dst) return kMemFullErr;
-    Store(bytes, n, **dst);
-    return kNoErr;
+    const MgErr err = MakeLStr(dst, n);
+    if (!err && n != 0) std::memcpy((**dst)->bytes, bytes, n);
+    return err;
 }
 
 }  // namespace
@@ -172,9 +168,9 @@ MgErr LStrFromPtr(LStrHandle* handle, int32 length, const void* src) {
         Store(reinterpret_cast<const uint8*>(**handle) + offset, static_cast<size_t>(length), **handle);
         return SizeHandle(*handle, LStrSize(length), true);
     }
-    if (MgErr err = DSSetHandleSizeOrNewHandle(AsHandlePtr(handle), LStrSize(length))) return err;
-    Store(src, static_cast<size_t>(length), **handle);
-    return kNoErr;
+    const MgErr err = MakeLStr(handle, static_cast<size_t>(length));
+    if (!err) std::memcpy((**handle)->bytes, src, static_cast<size_t>(length));
+    return err;
 }
 
 MgErr PToLHStr(ConstPStr src, LStrHandle* handle) {
@@ -229,14 +225,12 @@ MgErr LStrPrependCStr(LStrHandle* dst, CStr src) {
     if (!dst || !*dst || !src) return kNoErr;
     const size_t added = std::strlen(src);
     const size_t count = LStrView(*dst).length;
-    if (added > static_cast<size_t>(INT32_MAX) - LStrSize(count)) return kMemFullErr;
     size_t offset = 0;
     const bool own = OffsetInBlock(*dst, src, &offset);
-    if (MgErr err = SizeHandle(*dst, LStrSize(count + added), false)) return err;
+    if (MgErr err = ResizeLStr(*dst, count + added, false)) return err;
     LStrPtr text = **dst;
     std::memmove(text->bytes + added, text->bytes, count);
     std::memcpy(text->bytes, own ? reinterpret_cast<CStr>(text) + offset + added : src, added);
-    text->count = static_cast<int32>(count + added);
     return kNoErr;
 }
 

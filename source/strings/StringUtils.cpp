@@ -424,11 +424,9 @@ LStrHandle ToLStrHandle(const std::string& source, LStrHandle* handle) {
 
 MgErr ToLStrHandleNoThrow(const std::string& source, LStrHandle* handle) {
     if (!handle) return kArgErr;
-    if (source.size() > INT32_MAX - LStrSize(0)) return kMemFullErr;
-    if (MgErr err = DSSetHandleSizeOrNewHandle(AsHandlePtr(handle), LStrSize(source.size()))) return err;
-    (**handle)->count = static_cast<int32>(source.size());
-    std::memcpy((**handle)->bytes, source.data(), source.size());
-    return kNoErr;
+    const MgErr err = MakeLStr(handle, source.size());
+    if (!err) std::memcpy((**handle)->bytes, source.data(), source.size());
+    return err;
 }
 
 MgErr ToLStrArrayHandleNoThrow(const std::vector<std::string>& source, LStrArrayHandle* array) {

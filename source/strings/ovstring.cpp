@@ -46,14 +46,10 @@ bool IsTrimmed(uint8 byte) {
 }
 
 // Brings an LStr handle to n bytes of text; n of 0 releases it.
-MgErr ResizeLStr(LStrHandle* handle, int32 n) {
+MgErr ResizeOrRelease(LStrHandle* handle, int32 n) {
     if (n == 0) return DSDisposeHandleAndNull(AsHandlePtr(handle));
-    if (static_cast<uint32>(n) > INT32_MAX - LStrSize(0)) return kMemFullErr;
-    const MgErr err =
-        *handle ? SizeHandle(*handle, LStrSize(n), true) : DSSetHandleSizeOrNewHandle(AsHandlePtr(handle), LStrSize(n));
-    if (err) return err;
-    (**handle)->count = n;
-    return kNoErr;
+    const auto count = static_cast<uint32>(n);
+    return *handle ? ResizeLStr(*handle, count, true) : MakeLStr(handle, count);
 }
 
 std::string_view CharactersOf(const uint8* bytes, int32 length) {
@@ -270,7 +266,7 @@ MgErr OVSubString::ResizeBuffer(int32 n) {
 MgErr OVSubString::ResizeHandle(int32 n) {
     const auto stored = static_cast<int32>(LStrView(*handle_).length);
     if (n < stored) MoveToStart((**handle_)->bytes);
-    if (MgErr err = ResizeLStr(handle_, n)) return err;
+    if (MgErr err = ResizeOrRelease(handle_, n)) return err;
     if (*handle_) {
         MoveToStart((**handle_)->bytes);
     } else {
