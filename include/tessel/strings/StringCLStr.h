@@ -17,8 +17,8 @@ TESSEL_API uint32 CLStrSize(const CLStr* list);
 // the list. Null is reported (fatal) and gives null.
 TESSEL_API LStrPtr CLStrIndex(CLStrPtr list, int32 i);
 
-// Inserts before element `index`; at or beyond the count it appends, and a negative index is 0. The element may not lie
-// in the list. Null inputs are reported (fatal) and give kGenericErr.
+// Inserts before element `index`; at or beyond the count it appends, and a negative index is 0. The element may lie in
+// the list. Null inputs are reported (fatal) and give kGenericErr.
 TESSEL_API MgErr CLStrInsert(CLStrHandle list, const LStr* element, int32 index, bool exact);
 
 // Inserts into a sorted list before the first element that is not below the new one by LStrCmp, and stores that index.

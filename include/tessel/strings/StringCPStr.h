@@ -28,7 +28,7 @@ TESSEL_API MgErr CPStrClear(CPStrHandle list);
 // a negative n.
 TESSEL_API MgErr CPStrSetToNEmptyStrings(CPStrHandle* list, int32 n);
 
-// Inserts before element `index`, brought into 0 ... count. CPStrInsert is exact. The element may not lie in the list.
+// Inserts before element `index`, brought into 0 ... count. CPStrInsert is exact. The element may lie in the list.
 // Null inputs are reported and give kGenericErr.
 TESSEL_API MgErr CPStrInsert(CPStrHandle list, ConstPStr element, int32 index);
 TESSEL_API MgErr CPStrInsertEfficient(CPStrHandle list, ConstPStr element, int32 index, bool exact);

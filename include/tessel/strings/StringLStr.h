@@ -1,9 +1,9 @@
 // Counted text (LStr), usually held in a handle.
 //
 // A null LStr, PStr, CStr or handle counts as the empty text wherever text is read; with a null destination nothing is
-// written and the length is 0. Bytes are compared unsigned; case is
-// mapped a byte at a time with the tables of the active code page. Texts appended or inserted may lie in the handle
-// that they are put into. All functions may be called from any thread on distinct data.
+// written and the length is 0. Bytes are compared unsigned; case is mapped a byte at a time with the tables of the
+// active code page. Texts appended or inserted may lie in the handle that they are put into. All functions may be
+// called from any thread on distinct data.
 #ifndef TESSEL_STRINGS_STRINGLSTR_H
 #define TESSEL_STRINGS_STRINGLSTR_H
 

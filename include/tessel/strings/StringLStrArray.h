@@ -22,8 +22,8 @@ TESSEL_API MgErr ReallocLStrArrayHandle(LStrArrayHandle* array, int32 n);
 TESSEL_API MgErr CPStrPtrToLStrArray(const CPStr* list, int32 n, LStrArrayHandle* array);
 
 // Makes *list hold the first n elements, each cut at 255 bytes, creating it when it is null; n of 0 or a null array
-// disposes of it and stores null. kArgErr when the array has no n elements or for a null pointer, kMemFullErr when
-// memory is short.
+// disposes of it and stores null. kArgErr for a null pointer, a negative n and an array of fewer elements; kMemFullErr
+// when *list cannot be made that large.
 TESSEL_API MgErr LStrArrayToCPStrHandle(LStrArrayHandle array, int32 n, CPStrHandle* list);
 
 TESSEL_END_C
