@@ -29,14 +29,14 @@ struct FloatingPointUnit {
     uint16 status;
 };
 
-[[gnu::tls_model("initial-exec")]] thread_local FloatingPointUnit tUnit{};
+[[gnu::tls_model("initial-exec")]] thread_local FloatingPointUnit threadUnit{};
 
 // The one save area of the process.
 struct SaveArea {
     FloatingPointUnit unit;
     std::fenv_t environment;
 };
-SaveArea gSaveArea{};
+SaveArea saveArea{};
 
 // The exceptions of the host's unit, as bits of the status word.
 uint16 HostExceptions() {
@@ -51,7 +51,7 @@ uint16 HostExceptions() {
 }
 
 void Push(Register value) {
-    FloatingPointUnit& unit = tUnit;
+    FloatingPointUnit& unit = threadUnit;
     unit.top = (unit.top + kRegisters - 1) % kRegisters;
     if (unit.depth == kRegisters) {
         unit.status |= kFPStatInvalid | kFPStatStackFault | kFPStatStackOverflow;
@@ -63,7 +63,7 @@ void Push(Register value) {
 }
 
 Register Pop() {
-    FloatingPointUnit& unit = tUnit;
+    FloatingPointUnit& unit = threadUnit;
     if (unit.depth == 0) {
         unit.status = static_cast<uint16>((unit.status | kFPStatInvalid | kFPStatStackFault) & ~kFPStatStackOverflow);
         return kNaN;
@@ -76,7 +76,7 @@ Register Pop() {
 
 // The denormal bit, when a value that is loaded or stored is one.
 void NoteDenormal(bool isDenormal) {
-    if (isDenormal) tUnit.status |= kFPStatDenormal;
+    if (isDenormal) threadUnit.status |= kFPStatDenormal;
 }
 
 bool IsDenormal(const floatExt& x) {
@@ -84,7 +84,7 @@ bool IsDenormal(const floatExt& x) {
 }
 
 // A double's bits as those of an extended real.
-Register Widen(double x) {
+Register RegisterOf(double x) {
     constexpr int32 kSpecial = 0x7FF;
     constexpr int32 kRebias = kExtendedBias - 1023;
     const auto bits = std::bit_cast<uint64>(x);
@@ -178,7 +178,7 @@ Real Narrow(const Register& from) {
         }
     }
     if (bits != 0 && bits < Format::kSmallestNormal) status |= kFPStatDenormal;
-    tUnit.status |= status;
+    threadUnit.status |= status;
     const uint64 sign = static_cast<uint64>(negative) << Format::kSignBit;
     return std::bit_cast<Real>(static_cast<typename Format::Bits>(sign | bits));
 }
@@ -186,7 +186,7 @@ Real Narrow(const Register& from) {
 template <class Real>
 Real PopNarrow() {
     const Register top = Pop();
-    if (IsSignaling(top)) tUnit.status |= kFPStatInvalid;
+    if (IsSignaling(top)) threadUnit.status |= kFPStatInvalid;
     return Narrow<Real>(top);
 }
 
@@ -271,22 +271,22 @@ using namespace tessel;
 // ---- state ----------------------------------------------------------------------------------------------------------
 
 void FPInit(void) {
-    tUnit = FloatingPointUnit{};
+    threadUnit = FloatingPointUnit{};
     std::fesetenv(FE_DFL_ENV);
 }
 
 void FPSave(void) {
-    gSaveArea.unit = tUnit;
-    std::fegetenv(&gSaveArea.environment);
+    saveArea.unit = threadUnit;
+    std::fegetenv(&saveArea.environment);
 }
 
 int32 FPCheck(void) {
     FPSave();
-    return gSaveArea.unit.depth == 0 ? 1 : 0;
+    return saveArea.unit.depth == 0 ? 1 : 0;
 }
 
 uint16 CheckFPStat(void) {
-    return static_cast<uint16>(tUnit.status | HostExceptions() | tUnit.top << kTopShift);
+    return static_cast<uint16>(threadUnit.status | HostExceptions() | threadUnit.top << kTopShift);
 }
 
 // ---- loads ----------------------------------------------------------------------------------------------------------
@@ -311,7 +311,7 @@ void FPLoadFlt32(const float* value) {
 }
 
 void FPLoadFlt64(const double* value) {
-    Push(Widen(*value));
+    Push(RegisterOf(*value));
 }
 
 void FPLoadExt(const floatExt* value) {
@@ -343,7 +343,7 @@ void NumToFPR(int16 code, const void* value) {
 }
 
 void FPPush(void) {
-    const bool wasEmpty = tUnit.depth == 0;
+    const bool wasEmpty = threadUnit.depth == 0;
     const Register top = Pop();
     if (!wasEmpty) Push(top);
     Push(top);
@@ -389,11 +389,11 @@ void FPStorePDR(int32 digits, PackedDecimal* record) {
 int32 FPRToNum(int16 code, void* value) {
     const int16 type = TypeOfCode(code);
     if (NumClass(type) == kNumClassNone) return 0;
-    const uint16 before = tUnit.status;
-    tUnit.status &= static_cast<uint16>(~kFPStatInvalid);
+    const uint16 before = threadUnit.status;
+    threadUnit.status &= static_cast<uint16>(~kFPStatInvalid);
     PopInto(type, value);
-    const bool valid = (tUnit.status & kFPStatInvalid) == 0;
-    tUnit.status |= before;
+    const bool valid = (threadUnit.status & kFPStatInvalid) == 0;
+    threadUnit.status |= before;
     return valid ? 1 : 0;
 }
 

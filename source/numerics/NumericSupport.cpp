@@ -10,7 +10,7 @@ namespace {
 constexpr int kTypes = 16;
 
 // By type code. The sizes of the extended types can be set.
-int32 gNumSizes[kTypes] = {0, 1, 2, 4, 8, 1, 2, 4, 8, 4, 8, 10, 8, 16, 20, 0};
+int32 numSizes[kTypes] = {0, 1, 2, 4, 8, 1, 2, 4, 8, 4, 8, 10, 8, 16, 20, 0};
 
 constexpr uint8 kNumClasses[kTypes] = {
     kNumClassNone,     kNumClassSigned,   kNumClassSigned,   kNumClassSigned, kNumClassSigned, kNumClassUnsigned,
@@ -26,7 +26,7 @@ bool IsNumericCode(int16 code) {
 }
 
 const void* ImaginaryExtended(const void* value) {
-    return static_cast<const uint8*>(value) + gNumSizes[kNumExtended];
+    return static_cast<const uint8*>(value) + numSizes[kNumExtended];
 }
 
 }  // namespace
@@ -113,7 +113,7 @@ void WriteNumber(int16 type, const ExtendedComplex& value, void* destination) {
             return WriteAs(destination, cmplx128{static_cast<double>(value.re), static_cast<double>(value.im)});
         case kNumComplexExtended:
             WriteAs(destination, FromExtended(value.re));
-            return WriteAs(static_cast<uint8*>(destination) + gNumSizes[kNumExtended], FromExtended(value.im));
+            return WriteAs(static_cast<uint8*>(destination) + numSizes[kNumExtended], FromExtended(value.im));
         default:
             return;
     }
@@ -124,7 +124,7 @@ void WriteNumber(int16 type, const ExtendedComplex& value, void* destination) {
 using namespace tessel;
 
 int32 NumSize(int16 code) {
-    return gNumSizes[TypeOfCode(code)];
+    return numSizes[TypeOfCode(code)];
 }
 
 int32 NumClass(int16 code) {
@@ -132,9 +132,9 @@ int32 NumClass(int16 code) {
 }
 
 uint8 SetFxSize(uint8 size) {
-    const auto previous = static_cast<uint8>(gNumSizes[kNumExtended]);
-    gNumSizes[kNumExtended] = size;
-    gNumSizes[kNumComplexExtended] = 2 * size;
+    const auto previous = static_cast<uint8>(numSizes[kNumExtended]);
+    numSizes[kNumExtended] = size;
+    numSizes[kNumComplexExtended] = 2 * size;
     return previous;
 }
 

@@ -6,7 +6,7 @@
 
 namespace tessel {
 
-extern uint8 g_decimalPoint;
+extern uint8 systemDecimalPoint;
 
 }  // namespace tessel
 

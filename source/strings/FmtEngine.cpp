@@ -99,7 +99,7 @@ private:
 bool Formatter::Pass() {
     const char* p = start_;
     FmtOutput output = output_.Twin();
-    decimalPoint_ = g_decimalPoint;
+    decimalPoint_ = systemDecimalPoint;
     while (p < end_ && (output.HasRoom() || recording_)) {
         const char* special = byCharacters_ ? FindSpecialByCharacters(p, end_) : FindSpecial(p, end_);
         output.Put(p, static_cast<size_t>(special - p));

@@ -8,8 +8,8 @@
 namespace tessel {
 namespace {
 
-std::atomic<CStr> gNaNText{"NaN"};
-std::atomic<CStr> gInfText{"Inf"};
+std::atomic<CStr> nanText{"NaN"};
+std::atomic<CStr> infText{"Inf"};
 
 constexpr int32 kMostDecimals = 63;
 constexpr int32 kFirstLeadNotFixed = 308;
@@ -18,7 +18,7 @@ constexpr int32 kFixedRoom = 4;      // what a fixed text may need beside its di
 constexpr int32 kExponentRoom = 8;   // what an exponential text may need beside its digits
 
 CStr SpecialText(RealKind kind) {
-    return (kind == RealKind::kNaN ? gNaNText : gInfText).load(std::memory_order_relaxed);
+    return (kind == RealKind::kNaN ? nanText : infText).load(std::memory_order_relaxed);
 }
 
 // ---- digits to text -------------------------------------------------------------------------------------------------
@@ -190,9 +190,9 @@ int32 PackedToString(const PackedDecimal* record, int16 formatCode, char* buffer
 }
 
 CStr NumSetNaNText(CStr text) {
-    return gNaNText.exchange(text != nullptr ? text : "NaN");
+    return nanText.exchange(text != nullptr ? text : "NaN");
 }
 
 CStr NumSetInfText(CStr text) {
-    return gInfText.exchange(text != nullptr ? text : "Inf");
+    return infText.exchange(text != nullptr ? text : "Inf");
 }

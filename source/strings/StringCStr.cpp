@@ -8,7 +8,7 @@
 
 using namespace tessel;
 
-uint8 tessel::g_decimalPoint = '.';
+uint8 tessel::systemDecimalPoint = '.';
 
 namespace {
 
@@ -210,9 +210,9 @@ char HexChar(int32 n) {
 // ---- decimal point --------------------------------------------------------------------------------------------------
 
 uint8 StrGetDecimalPoint(void) {
-    return g_decimalPoint;
+    return systemDecimalPoint;
 }
 
 uint8 StrSetDecimalPoint(uint8 decimalPoint) {
-    return g_decimalPoint = decimalPoint;
+    return systemDecimalPoint = decimalPoint;
 }

@@ -16,9 +16,9 @@ namespace tessel {
 namespace {
 
 // The "StringOutputWinConsole" lock. A plain mutex, since an output may be made before the library starts.
-platform::Mutex theConsoleLock;  // guards the two below
-int32 theConsoleCount = 0;
-bool theConsoleIsOurs = false;
+platform::Mutex consoleLock;  // guards the two below
+int32 consoleCount = 0;
+bool consoleIsOurs = false;
 
 FILE* Stream(void* stream) {
     return static_cast<FILE*>(stream);
@@ -67,16 +67,16 @@ int32 StringOutputBase::vsnprintf(char* buffer, int32 size, CStr format, va_list
 // ---- StringOutputWinConsole -----------------------------------------------------------------------------------------
 
 StringOutputWinConsole::StringOutputWinConsole() {
-    platform::MutexHolder hold(theConsoleLock);
-    ++theConsoleCount;
-    if (platform::ConsoleAllocate()) theConsoleIsOurs = true;
+    platform::MutexHolder hold(consoleLock);
+    ++consoleCount;
+    if (platform::ConsoleAllocate()) consoleIsOurs = true;
 }
 
 StringOutputWinConsole::~StringOutputWinConsole() {
-    platform::MutexHolder hold(theConsoleLock);
-    if (--theConsoleCount > 0) return;
-    if (theConsoleIsOurs) platform::ConsoleFree();
-    theConsoleIsOurs = false;
+    platform::MutexHolder hold(consoleLock);
+    if (--consoleCount > 0) return;
+    if (consoleIsOurs) platform::ConsoleFree();
+    consoleIsOurs = false;
 }
 
 void StringOutputWinConsole::WriteFormatted(CStr format, va_list arguments) {

@@ -8,8 +8,8 @@ struct Seeds {
     int32 s[3];
 };
 
-ThMutex gRandomMutex = nullptr;  // guards gSeeds; nothing is taken inside
-Seeds gSeeds = {};
+ThMutex randomMutex = nullptr;  // guards currentSeeds; nothing is taken inside
+Seeds currentSeeds = {};
 
 // 15 bits a step, from a first seed that is not 0.
 Seeds SeedsFrom(int32 first) {
@@ -44,15 +44,15 @@ double Number(const Seeds& seeds) {
 
 MgErr InitRandomGen() {
     constexpr uint32 kMask = 0x3FFF;
-    gSeeds = SeedsFrom(static_cast<int32>(MilliSecs() & kMask));
-    if (gRandomMutex) return kNoErr;
-    return ThMutexCreate(&gRandomMutex, "RandomGen");
+    currentSeeds = SeedsFrom(static_cast<int32>(MilliSecs() & kMask));
+    if (randomMutex) return kNoErr;
+    return ThMutexCreate(&randomMutex, "RandomGen");
 }
 
 MgErr UninitRandomGen() {
-    ThMutexDestroy(gRandomMutex);
-    gRandomMutex = nullptr;
-    gSeeds = {};
+    ThMutexDestroy(randomMutex);
+    randomMutex = nullptr;
+    currentSeeds = {};
     return kNoErr;
 }
 
@@ -60,8 +60,8 @@ void RandomGen(double* out) {
     if (!out) return;
     Seeds seeds;
     {
-        tessel::ThMutexHolder holder(gRandomMutex);
-        seeds = gSeeds = Next(gSeeds);
+        tessel::ThMutexHolder holder(randomMutex);
+        seeds = currentSeeds = Next(currentSeeds);
     }
     *out = Number(seeds);
 }

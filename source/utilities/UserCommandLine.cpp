@@ -11,9 +11,9 @@ struct Arguments {
 };
 
 // Set by the host before other threads look; no lock.
-Arguments gRaw, gUser, gApp;
-int32 gIgnore;
-char* gPrefsPath;
+Arguments rawArguments, userArguments, appArguments;
+int32 ignoresArguments;
+char* prefsPath;
 
 constexpr char kSeparator[] = "--";
 constexpr char kPrefsArgument[] = "-pref";
@@ -28,13 +28,13 @@ bool BeginsWith(const char* arg, const char* what) {
 
 // Gives the user the program's name and the arguments from `first` on.
 MgErr SetUserArguments(int32 first) {
-    int32 count = gRaw.count - first + 1;
-    gUser.count = 0;
-    gUser.args = static_cast<char**>(std::malloc(static_cast<size_t>(count) * sizeof(char*)));
-    if (!gUser.args) return kMemFullErr;
-    gUser.count = count;
-    gUser.args[0] = gRaw.args[0];
-    for (int32 i = 1; i < count; ++i) gUser.args[i] = gRaw.args[first + i - 1];
+    int32 count = rawArguments.count - first + 1;
+    userArguments.count = 0;
+    userArguments.args = static_cast<char**>(std::malloc(static_cast<size_t>(count) * sizeof(char*)));
+    if (!userArguments.args) return kMemFullErr;
+    userArguments.count = count;
+    userArguments.args[0] = rawArguments.args[0];
+    for (int32 i = 1; i < count; ++i) userArguments.args[i] = rawArguments.args[first + i - 1];
     return kNoErr;
 }
 
@@ -48,37 +48,37 @@ void Get(const Arguments& from, int32* count, char*** args) {
 // ---- the process's command line -------------------------------------------------------------------------------------
 
 MgErr InitUserCommandLine(int32 count, char** args) {
-    gRaw = gApp = {count, args};
-    if (count <= 0 || !args || gUser.args) return kArgErr;
+    rawArguments = appArguments = {count, args};
+    if (count <= 0 || !args || userArguments.args) return kArgErr;
     int32 separator = 0;
-    if (!gIgnore) {
+    if (!ignoresArguments) {
         while (separator < count && !Is(args[separator], kSeparator)) ++separator;
     }
-    gApp.count = separator;
+    appArguments.count = separator;
     return SetUserArguments(separator < count ? separator + 1 : count);
 }
 
 MgErr UninitUserCommandLine() {
-    std::free(gUser.args);
-    gRaw = gUser = gApp = {};
-    gIgnore = 0;
+    std::free(userArguments.args);
+    rawArguments = userArguments = appArguments = {};
+    ignoresArguments = 0;
     return kNoErr;
 }
 
 void SetIgnoreCommandLine(int32 ignore) {
-    gIgnore = ignore;
+    ignoresArguments = ignore;
 }
 
 void GetRawCommandLine(int32* count, char*** args) {
-    Get(gRaw, count, args);
+    Get(rawArguments, count, args);
 }
 
 void GetUserCommandLine(int32* count, char*** args) {
-    Get(gUser, count, args);
+    Get(userArguments, count, args);
 }
 
 void GetAppCommandLine(int32* count, char*** args) {
-    Get(gApp, count, args);
+    Get(appArguments, count, args);
 }
 
 // ---- the preference path --------------------------------------------------------------------------------------------
@@ -87,16 +87,16 @@ MgErr SetPrefsPath(CStr path) {
     size_t size = path ? std::strlen(path) + 1 : 0;
     char* copy = path ? static_cast<char*>(std::malloc(size)) : nullptr;
     if (copy) std::memcpy(copy, path, size);
-    std::free(gPrefsPath);
-    gPrefsPath = copy;
+    std::free(prefsPath);
+    prefsPath = copy;
     return path && !copy ? kMemFullErr : kNoErr;
 }
 
 CStr GetPrefsPath() {
-    if (gPrefsPath) return gPrefsPath;
+    if (prefsPath) return prefsPath;
     CStr found = nullptr;
-    for (int32 i = 0; i < gApp.count && !Is(gApp.args[i], kSeparator); ++i) {
-        if (Is(gApp.args[i], kPrefsArgument) && i + 1 < gApp.count) found = gApp.args[++i];
+    for (int32 i = 0; i < appArguments.count && !Is(appArguments.args[i], kSeparator); ++i) {
+        if (Is(appArguments.args[i], kPrefsArgument) && i + 1 < appArguments.count) found = appArguments.args[++i];
     }
     return found;
 }
