@@ -1,3 +1,4 @@
+// Decimal digits of a real, and the real nearest to decimal digits.
 #include "numerics/DecimalConversion.h"
 
 #include "numerics/WideArithmetic.h"

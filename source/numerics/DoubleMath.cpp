@@ -1,3 +1,4 @@
+// Functions of doubles computed in two parts and rounded once.
 #include "numerics/DoubleMath.h"
 
 #include "numerics/Extended.h"

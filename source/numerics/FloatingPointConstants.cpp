@@ -1,3 +1,4 @@
+// Constants in every precision.
 #include "numerics/Extended.h"
 #include "numerics/Service.h"
 #include <tessel/numerics/FloatingPointConstants.h>

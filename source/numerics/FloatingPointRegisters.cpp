@@ -1,3 +1,4 @@
+// A floating-point unit with a stack of registers, one for each thread.
 #include "numerics/DecimalConversion.h"
 #include "numerics/Registers.h"
 #include <tessel/numerics/FloatingPointRegisters.h>

@@ -1,3 +1,4 @@
+// Quotients and remainders of integers.
 #include <tessel/numerics/IntegerMath.h>
 
 #include <limits>

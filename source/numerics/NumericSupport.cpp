@@ -1,3 +1,4 @@
+// Sizes, classes and conversions of the numeric types.
 #include "numerics/NumericAccess.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/numerics/NumericSupport.h>

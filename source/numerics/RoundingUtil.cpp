@@ -1,3 +1,4 @@
+// Rounding to integers and to multiples.
 #include "numerics/NumericAccess.h"
 #include <tessel/numerics/RoundingUtil.h>
 

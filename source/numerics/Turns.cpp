@@ -1,3 +1,4 @@
+// How far powers of 2 and 10 with an imaginary exponent turn.
 #include "numerics/Turns.h"
 
 #include "numerics/WideArithmetic.h"

@@ -1,3 +1,4 @@
+// The conversions between the byte order of a stream and the host's.
 #include <tessel/streams/Endianizer.h>
 
 #include <cstring>

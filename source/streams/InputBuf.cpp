@@ -1,3 +1,4 @@
+// Input from a block of memory and from a text handle.
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/streams/InputBuf.h>

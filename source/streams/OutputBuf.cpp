@@ -1,3 +1,4 @@
+// Output into a block, into growing handles, and into nothing but a count.
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/streams/OutputBuf.h>

@@ -1,3 +1,4 @@
+// The bytes between a value and the next aligned place.
 #ifndef TESSEL_SOURCE_STREAMS_PADDING_H
 #define TESSEL_SOURCE_STREAMS_PADDING_H
 

@@ -1,3 +1,4 @@
+// Counted wide texts: a block holds their size and then the text.
 #include <tessel/memory/TrackedMallocFree.h>
 #include <tessel/strings/BSTR.h>
 

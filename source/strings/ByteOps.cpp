@@ -1,3 +1,4 @@
+// The wide steps of a comparison without case.
 #include "strings/ByteOps.h"
 
 #if defined(__x86_64__) || defined(__i386__)

@@ -1,3 +1,4 @@
+// CPStrList, a list of PStrs as an object.
 #include "strings/CPStrWalk.h"
 #include "strings/HandleOps.h"
 #include <tessel/strings/CPStrList.h>

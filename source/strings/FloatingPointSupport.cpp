@@ -1,3 +1,4 @@
+// Whether a number is finite, infinite or none.
 #include "numerics/DecimalConversion.h"
 #include "numerics/NumericAccess.h"
 #include <tessel/strings/NumericText.h>

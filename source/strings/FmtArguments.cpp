@@ -1,3 +1,4 @@
+// The table of positional parameters.
 #include "strings/FmtArguments.h"
 
 #include <tessel/diagnostics/DebugStream.h>

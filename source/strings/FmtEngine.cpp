@@ -1,3 +1,4 @@
+// Goes over a format and renders what its specifiers ask for.
 #include "strings/FmtEngine.h"
 
 #include "diagnostics/Guarded.h"

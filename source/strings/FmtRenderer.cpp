@@ -1,3 +1,4 @@
+// Renders one conversion: numbers, texts, points, rectangles and paths.
 #include "strings/FmtRenderer.h"
 
 #include "numerics/NumericAccess.h"

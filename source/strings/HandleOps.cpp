@@ -1,3 +1,4 @@
+// Edits inside a handle's block.
 #include "strings/HandleOps.h"
 
 #include <cstring>

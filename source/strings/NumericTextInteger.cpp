@@ -1,3 +1,4 @@
+// Integers as text, in radix 2, 8, 10 and 16.
 #include "numerics/NumericAccess.h"
 #include "strings/NumericTextParts.h"
 #include <tessel/diagnostics/DebugStream.h>

@@ -1,3 +1,4 @@
+// Lists of LStrs laid end to end.
 #include "strings/HandleOps.h"
 #include "strings/LStrView.h"
 #include <tessel/diagnostics/DebugStream.h>

@@ -1,3 +1,4 @@
+// Lists of PStrs laid end to end.
 #include "strings/CPStrWalk.h"
 #include "strings/HandleOps.h"
 #include <tessel/diagnostics/DebugStream.h>

@@ -1,3 +1,4 @@
+// Texts that end with a zero byte.
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"
 #include "strings/DecimalPoint.h"

@@ -1,3 +1,4 @@
+// The escapes and the decimal point marks of the format language.
 #include <tessel/strings/StringCStr.h>
 #include <tessel/strings/StringFmtScan.h>
 

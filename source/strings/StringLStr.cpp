@@ -1,3 +1,4 @@
+// Counted texts, in buffers and in handles.
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"
 #include "strings/HandleOps.h"

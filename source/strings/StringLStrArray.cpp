@@ -1,3 +1,4 @@
+// Arrays of text handles.
 #include "strings/CPStrWalk.h"
 #include "strings/HandleOps.h"
 #include "strings/LStrView.h"

@@ -1,3 +1,4 @@
+// The destinations of printed text: console, debugger, file, and two at once.
 #include "diagnostics/Guarded.h"
 #include "platform/Debugger.h"
 #include "platform/DriveTable.h"

@@ -1,3 +1,4 @@
+// Texts of up to 255 bytes behind a count byte.
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"
 #include "strings/LStrView.h"

@@ -1,3 +1,4 @@
+// std::string and std::u16string: conversions from and to every form of text, and common operations.
 #include "diagnostics/Guarded.h"
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"

@@ -1,3 +1,4 @@
+// OVHandle, a handle that belongs to an object.
 #include "strings/HandleOps.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/strings/ovhandle.h>

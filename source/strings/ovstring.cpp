@@ -1,3 +1,4 @@
+// OVString and the views that edit a text where it lies.
 #include "diagnostics/Guarded.h"
 #include "platform/CodePage.h"
 #include "strings/ByteOps.h"

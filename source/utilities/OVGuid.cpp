@@ -1,3 +1,4 @@
+// Class identifiers: made, written and read.
 #include "platform/System.h"
 #include <tessel/utilities/OVGuid.h>
 #include <tessel/utilities/RandomGen.h>

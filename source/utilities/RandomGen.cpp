@@ -1,3 +1,4 @@
+// The random generator of the process, and those with a state of the caller's.
 #include <tessel/sync/ThMutex.h>
 #include <tessel/time/Millisecs.h>
 #include <tessel/utilities/RandomGen.h>

@@ -1,3 +1,4 @@
+// Sorting in place and binary search over records of any size.
 #include <tessel/utilities/SortSearch.h>
 
 #include <cstddef>

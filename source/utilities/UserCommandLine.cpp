@@ -1,3 +1,4 @@
+// What of the command line is the host's and what the user's.
 #include <tessel/utilities/UserCommandLine.h>
 
 #include <cstdlib>

@@ -1,3 +1,4 @@
+// Packed version numbers as text.
 #include <tessel/utilities/VersionUtil.h>
 
 #include <cstring>

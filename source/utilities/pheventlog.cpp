@@ -1,3 +1,4 @@
+// The event log, which records nothing.
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/utilities/pheventlog.h>
 
