@@ -83,27 +83,23 @@ void ExpectWrapAround(int16 from, int16 to) {
     }
 }
 
-template <class From>
-void ExpectWrapAroundIntoAll(int16 from) {
-    ExpectWrapAround<From, int8>(from, kNumInt8);
-    ExpectWrapAround<From, int16>(from, kNumInt16);
-    ExpectWrapAround<From, int32>(from, kNumInt32);
-    ExpectWrapAround<From, int64>(from, kNumInt64);
-    ExpectWrapAround<From, uint8>(from, kNumUInt8);
-    ExpectWrapAround<From, uint16>(from, kNumUInt16);
-    ExpectWrapAround<From, uint32>(from, kNumUInt32);
-    ExpectWrapAround<From, uint64>(from, kNumUInt64);
+template <class... Ints>
+struct Types {};
+
+template <class From, class... To>
+void ExpectWrapAroundIntoAll(int16 from, Types<To...>) {
+    int16 to = 0;
+    (ExpectWrapAround<From, To>(from, ++to), ...);
+}
+
+template <class... From>
+void ExpectWrapAroundFromAll(Types<From...> all) {
+    int16 from = 0;
+    (ExpectWrapAroundIntoAll<From>(++from, all), ...);
 }
 
 TEST(ConvertNum, IntegersWrapAround) {
-    ExpectWrapAroundIntoAll<int8>(kNumInt8);
-    ExpectWrapAroundIntoAll<int16>(kNumInt16);
-    ExpectWrapAroundIntoAll<int32>(kNumInt32);
-    ExpectWrapAroundIntoAll<int64>(kNumInt64);
-    ExpectWrapAroundIntoAll<uint8>(kNumUInt8);
-    ExpectWrapAroundIntoAll<uint16>(kNumUInt16);
-    ExpectWrapAroundIntoAll<uint32>(kNumUInt32);
-    ExpectWrapAroundIntoAll<uint64>(kNumUInt64);
+    ExpectWrapAroundFromAll(Types<int8, int16, int32, int64, uint8, uint16, uint32, uint64>());
 }
 
 // ---- reals into integers --------------------------------------------------------------------------------------------

@@ -12,6 +12,8 @@
 #include <gtest/gtest.h>
 #include <limits>
 #include <ostream>
+#include <utility>
+#include <vector>
 
 namespace {
 
@@ -26,7 +28,7 @@ bool Same(double a, double b) {
     return std::isnan(a) ? std::isnan(b) : a == b && std::signbit(a) == std::signbit(b);
 }
 
-#define ALL(NAME) NAME##S, NAME##D, NAME##X
+#define ALL(NAME) #NAME, NAME##S, NAME##D, NAME##X
 
 using UnaryS = void (*)(const float*, float*);
 using UnaryD = void (*)(const double*, double*);
@@ -40,70 +42,54 @@ struct UnaryCase {
     UnaryS single;
     UnaryD real;
     UnaryX extended;
-    double x;
-    double result;  // representable in a single
+    std::vector<std::pair<double, double>> values;  // an argument and its result, representable in a single
 };
 
 TEST(RealMath, SpecialValuesInEveryPrecision) {
     const UnaryCase cases[] = {
-        {"abs", ALL(RTfAbs), -2.5, 2.5},
-        {"neg", ALL(RTfNeg), 0.0, -0.0},
-        {"sqrt", ALL(RTfSqrt), 6.25, 2.5},
-        {"sqrt", ALL(RTfSqrt), -1, kNaN},
-        {"round", ALL(RTfRound), 2.5, 2},
-        {"round", ALL(RTfRound), 3.5, 4},
-        {"round", ALL(RTfRound), -2.5, -2},
-        {"ceil", ALL(RTfCeil), -2.5, -2},
-        {"floor", ALL(RTfFloor), -2.5, -3},
-        {"inc", ALL(RTfInc), -2.5, -1.5},
-        {"dec", ALL(RTfDec), -2.5, -3.5},
-        {"recip", ALL(RTfRecip), -0.0, -kInf},
-        {"sign", ALL(RTfSign), -3, -1},
-        {"sign", ALL(RTfSign), 0, 0},
-        {"sign", ALL(RTfSign), kInf, 1},
-        {"sign", ALL(RTfSign), kNaN, kNaN},
-        {"logn", ALL(RTfLogn), 1, 0},
-        {"logn", ALL(RTfLogn), 0, -kInf},
-        {"logn", ALL(RTfLogn), -0.0, -kInf},
-        {"logn", ALL(RTfLogn), -1, kNaN},
-        {"logn", ALL(RTfLogn), kNaN, kNaN},
-        {"logn", ALL(RTfLogn), kInf, kInf},
-        {"log10", ALL(RTfLog10), 1000, 3},
-        {"log10", ALL(RTfLog10), 0, -kInf},
-        {"log10", ALL(RTfLog10), -kInf, kNaN},
-        {"log2", ALL(RTfLog2), 0.125, -3},
-        {"log2", ALL(RTfLog2), 0, -kInf},
-        {"lognp1", ALL(RTfLognp1), -1, -kInf},
-        {"lognp1", ALL(RTfLognp1), -1.5, kNaN},
-        {"lognp1", ALL(RTfLognp1), 0, 0},
-        {"exp", ALL(RTfExp), -kInf, 0},
-        {"expm1", ALL(RTfExpm1), -kInf, -1},
-        {"pow10", ALL(RTfPow10), 3, 1000},
-        {"pow10", ALL(RTfPow10), 5000, kInf},
-        {"pow2", ALL(RTfPow2), -3, 0.125},
-        {"sin", ALL(RTfSin), kInf, kNaN},
-        {"sec", ALL(RTfSec), 0, 1},
-        {"csc", ALL(RTfCsc), 0, kInf},
-        {"cot", ALL(RTfCot), -0.0, -kInf},
-        {"sinc", ALL(RTfSinc), 0, 1},
-        {"asin", ALL(RTfAsin), 2, kNaN},
-        {"acos", ALL(RTfAcos), 1, 0},
-        {"tanh", ALL(RTfTanh), -kInf, -1},
-        {"acosh", ALL(RTfAcosh), 0.5, kNaN},
-        {"atanh", ALL(RTfAtanh), 1, kInf},
+        {ALL(RTfAbs), {{-2.5, 2.5}}},
+        {ALL(RTfNeg), {{0.0, -0.0}}},
+        {ALL(RTfSqrt), {{6.25, 2.5}, {-1, kNaN}}},
+        {ALL(RTfRound), {{2.5, 2}, {3.5, 4}, {-2.5, -2}}},
+        {ALL(RTfCeil), {{-2.5, -2}}},
+        {ALL(RTfFloor), {{-2.5, -3}}},
+        {ALL(RTfInc), {{-2.5, -1.5}}},
+        {ALL(RTfDec), {{-2.5, -3.5}}},
+        {ALL(RTfRecip), {{-0.0, -kInf}}},
+        {ALL(RTfSign), {{-3, -1}, {0, 0}, {kInf, 1}, {kNaN, kNaN}}},
+        {ALL(RTfLogn), {{1, 0}, {0, -kInf}, {-0.0, -kInf}, {-1, kNaN}, {kNaN, kNaN}, {kInf, kInf}}},
+        {ALL(RTfLog10), {{1000, 3}, {0, -kInf}, {-kInf, kNaN}}},
+        {ALL(RTfLog2), {{0.125, -3}, {0, -kInf}}},
+        {ALL(RTfLognp1), {{-1, -kInf}, {-1.5, kNaN}, {0, 0}}},
+        {ALL(RTfExp), {{-kInf, 0}}},
+        {ALL(RTfExpm1), {{-kInf, -1}}},
+        {ALL(RTfPow10), {{3, 1000}, {5000, kInf}}},
+        {ALL(RTfPow2), {{-3, 0.125}}},
+        {ALL(RTfSin), {{kInf, kNaN}}},
+        {ALL(RTfSec), {{0, 1}}},
+        {ALL(RTfCsc), {{0, kInf}}},
+        {ALL(RTfCot), {{-0.0, -kInf}}},
+        {ALL(RTfSinc), {{0, 1}}},
+        {ALL(RTfAsin), {{2, kNaN}}},
+        {ALL(RTfAcos), {{1, 0}}},
+        {ALL(RTfTanh), {{-kInf, -1}}},
+        {ALL(RTfAcosh), {{0.5, kNaN}}},
+        {ALL(RTfAtanh), {{1, kInf}}},
     };
     for (const UnaryCase& c : cases) {
-        const auto x = static_cast<float>(c.x);
-        const floatExt extendedX = FromExtended(c.x);
-        float single = 99;
-        double real = 99;
-        floatExt extended{};
-        c.single(&x, &single);
-        c.real(&c.x, &real);
-        c.extended(&extendedX, &extended);
-        EXPECT_TRUE(Same(single, c.result)) << c.name << "S of " << c.x << ": " << single;
-        EXPECT_TRUE(Same(real, c.result)) << c.name << "D of " << c.x << ": " << real;
-        EXPECT_TRUE(Same(static_cast<double>(ToExtended(extended)), c.result)) << c.name << "X of " << c.x;
+        for (const auto& [argument, result] : c.values) {
+            const auto x = static_cast<float>(argument);
+            const floatExt extendedX = FromExtended(argument);
+            float single = 99;
+            double real = 99;
+            floatExt extended{};
+            c.single(&x, &single);
+            c.real(&argument, &real);
+            c.extended(&extendedX, &extended);
+            EXPECT_TRUE(Same(single, result)) << c.name << "S of " << argument << ": " << single;
+            EXPECT_TRUE(Same(real, result)) << c.name << "D of " << argument << ": " << real;
+            EXPECT_TRUE(Same(static_cast<double>(ToExtended(extended)), result)) << c.name << "X of " << argument;
+        }
     }
 }
 
@@ -119,18 +105,14 @@ struct BinaryCase {
 
 TEST(RealMath, TwoOperandsInEveryPrecision) {
     const BinaryCase cases[] = {
-        {"add", ALL(RTfAdd), 1.5, 2, 3.5},       {"sub", ALL(RTfSub), 1.5, 2, -0.5},
-        {"mul", ALL(RTfMul), 1.5, -2, -3},       {"div", ALL(RTfDiv), 1.5, 0, kInf},
-        {"mod", ALL(RTfMod), -7, 3, 2},          {"mod", ALL(RTfMod), 7, -3, -2},
-        {"mod", ALL(RTfMod), 6, -3, 0.0},        {"mod", ALL(RTfMod), -6, 3, 0.0},
-        {"mod", ALL(RTfMod), 6, 0, kNaN},        {"mod", ALL(RTfMod), 5, kInf, kNaN},
-        {"mod", ALL(RTfMod), 16777216, 3, 1},    {"logx", ALL(RTfLogx), 2, 8, 3},
-        {"logx", ALL(RTfLogx), 10, 1000, 3},     {"logx", ALL(RTfLogx), 10, 0, -kInf},
-        {"logx", ALL(RTfLogx), 10, -1, kNaN},    {"powx", ALL(RTfPowx), -2, 3, -8},
-        {"powx", ALL(RTfPowx), -2, 0.5, kNaN},   {"atan2", ALL(RTfAtan2), 1, 0, 0},
-        {"atan2", ALL(RTfAtan2), 1, -0.0, -0.0}, {"scale", ALL(RTfiScale), 3, 2.9, 12},
-        {"scale", ALL(RTfiScale), 3, -1.9, 1.5}, {"scale", ALL(RTfiScale), -3, 1e9, -kInf},
-        {"scale", ALL(RTfiScale), 3, -kInf, 0},  {"scale", ALL(RTfiScale), 3, kNaN, kNaN},
+        {ALL(RTfAdd), 1.5, 2, 3.5},       {ALL(RTfSub), 1.5, 2, -0.5},   {ALL(RTfMul), 1.5, -2, -3},
+        {ALL(RTfDiv), 1.5, 0, kInf},      {ALL(RTfMod), -7, 3, 2},       {ALL(RTfMod), 7, -3, -2},
+        {ALL(RTfMod), 6, -3, 0.0},        {ALL(RTfMod), -6, 3, 0.0},     {ALL(RTfMod), 6, 0, kNaN},
+        {ALL(RTfMod), 5, kInf, kNaN},     {ALL(RTfMod), 16777216, 3, 1}, {ALL(RTfLogx), 2, 8, 3},
+        {ALL(RTfLogx), 10, 1000, 3},      {ALL(RTfLogx), 10, 0, -kInf},  {ALL(RTfLogx), 10, -1, kNaN},
+        {ALL(RTfPowx), -2, 3, -8},        {ALL(RTfPowx), -2, 0.5, kNaN}, {ALL(RTfAtan2), 1, 0, 0},
+        {ALL(RTfAtan2), 1, -0.0, -0.0},   {ALL(RTfiScale), 3, 2.9, 12},  {ALL(RTfiScale), 3, -1.9, 1.5},
+        {ALL(RTfiScale), -3, 1e9, -kInf}, {ALL(RTfiScale), 3, -kInf, 0}, {ALL(RTfiScale), 3, kNaN, kNaN},
     };
     for (const BinaryCase& c : cases) {
         const auto x = static_cast<float>(c.x);
@@ -280,55 +262,49 @@ TEST(ComplexMath, EdgesAndBranchCuts) {
     const struct {
         const char* name;
         ComplexUnary function;
-        cmplx128 z;
-        cmplx128 result;
+        std::vector<std::pair<cmplx128, cmplx128>> values;
     } cases[] = {
-        {"neg", RTcNegD, {1, -2}, {-1, 2}},
-        {"conj", RTcConjD, {1, 0.0}, {1, -0.0}},
-        {"inc", RTcIncD, {1, -2}, {2, -2}},
-        {"dec", RTcDecD, {1, -2}, {0, -2}},
-        {"round", RTcRoundD, {2.5, -3.5}, {2, -4}},
-        {"ceil", RTcCeilD, {2.5, -3.5}, {3, -3}},
-        {"floor", RTcFloorD, {2.5, -3.5}, {2, -4}},
-        {"recip", RTcRecipD, {0, -2}, {0, 0.5}},
-        {"recip", RTcRecipD, {0, 0}, {kInf, -0.0}},
-        {"recip", RTcRecipD, {-kInf, 1}, {-0.0, -0.0}},
-        {"recip", RTcRecipD, {0x1p-1023, 0x1p-1023}, {0x1p1022, -0x1p1022}},
-        {"sign", RTcSignD, {0, 0}, {0, 0}},
-        {"sign", RTcSignD, {3, -4}, {0.6, -0.8}},
-        {"sign", RTcSignD, {-kInf, 7}, {-1, 0}},
-        {"sqrt", RTcSqrtD, {-4, 0.0}, {0, 2}},
-        {"sqrt", RTcSqrtD, {-4, -0.0}, {0, -2}},
-        {"sqrt", RTcSqrtD, {3e300, 4e300}, {2e150, 1e150}},
-        {"logn", RTcLognD, {0, 0}, {-kInf, 0}},
-        {"logn", RTcLognD, {-1, 0.0}, {0, kPi}},
-        {"logn", RTcLognD, {-1, -0.0}, {0, -kPi}},
-        {"log10", RTcLog10D, {1000, 0}, {3, 0}},
-        {"log2", RTcLog2D, {0.125, 0}, {-3, 0}},
-        {"lognp1", RTcLognp1D, {1e-300, 1e-300}, {1e-300, 1e-300}},
-        {"lognp1", RTcLognp1D, {-1, 0}, {-kInf, 0}},
-        {"exp", RTcExpD, {-kInf, 1}, {0, 0}},
-        {"expm1", RTcExpm1D, {1e-300, -1e-300}, {1e-300, -1e-300}},
-        {"pow10", RTcPow10D, {3, 0}, {1000, 0}},
-        {"pow2", RTcPow2D, {-3, -0.0}, {0.125, -0.0}},
-        {"polar", RTcRToPD, {-0.0, 0}, {-0.0, 0}},
-        {"polar", RTcRToPD, {0, -3}, {3, -kPi / 2}},
-        {"rectangular", RTcPToRD, {5, 0}, {5, 0}},
-        {"tan", RTcTanD, {1, 1000}, {0, 1}},
-        {"cot", RTcCotD, {0, 1000}, {0, -1}},
-        {"sec", RTcSecD, {0, 0}, {1, 0}},
-        {"sinc", RTcSincD, {0, 0}, {1, 0}},
-        {"sinc", RTcSincD, {1, 12000}, {kInf, -kInf}},
-        {"asin", RTcAsinD, {0, 0}, {0, 0}},
-        {"acos", RTcAcosD, {1, 0.0}, {0, -0.0}},
-        {"atanh", RTcAtanhD, {1, 0}, {kInf, 0}},
-        {"sin", RTcSinD, {0, 0}, {0, 0}},
-        {"cos", RTcCosD, {0, 0.0}, {1, -0.0}},
+        {"neg", RTcNegD, {{{1, -2}, {-1, 2}}}},
+        {"conj", RTcConjD, {{{1, 0.0}, {1, -0.0}}}},
+        {"inc", RTcIncD, {{{1, -2}, {2, -2}}}},
+        {"dec", RTcDecD, {{{1, -2}, {0, -2}}}},
+        {"round", RTcRoundD, {{{2.5, -3.5}, {2, -4}}}},
+        {"ceil", RTcCeilD, {{{2.5, -3.5}, {3, -3}}}},
+        {"floor", RTcFloorD, {{{2.5, -3.5}, {2, -4}}}},
+        {"recip",
+         RTcRecipD,
+         {{{0, -2}, {0, 0.5}},
+          {{0, 0}, {kInf, -0.0}},
+          {{-kInf, 1}, {-0.0, -0.0}},
+          {{0x1p-1023, 0x1p-1023}, {0x1p1022, -0x1p1022}}}},
+        {"sign", RTcSignD, {{{0, 0}, {0, 0}}, {{3, -4}, {0.6, -0.8}}, {{-kInf, 7}, {-1, 0}}}},
+        {"sqrt", RTcSqrtD, {{{-4, 0.0}, {0, 2}}, {{-4, -0.0}, {0, -2}}, {{3e300, 4e300}, {2e150, 1e150}}}},
+        {"logn", RTcLognD, {{{0, 0}, {-kInf, 0}}, {{-1, 0.0}, {0, kPi}}, {{-1, -0.0}, {0, -kPi}}}},
+        {"log10", RTcLog10D, {{{1000, 0}, {3, 0}}}},
+        {"log2", RTcLog2D, {{{0.125, 0}, {-3, 0}}}},
+        {"lognp1", RTcLognp1D, {{{1e-300, 1e-300}, {1e-300, 1e-300}}, {{-1, 0}, {-kInf, 0}}}},
+        {"exp", RTcExpD, {{{-kInf, 1}, {0, 0}}}},
+        {"expm1", RTcExpm1D, {{{1e-300, -1e-300}, {1e-300, -1e-300}}}},
+        {"pow10", RTcPow10D, {{{3, 0}, {1000, 0}}}},
+        {"pow2", RTcPow2D, {{{-3, -0.0}, {0.125, -0.0}}}},
+        {"polar", RTcRToPD, {{{-0.0, 0}, {-0.0, 0}}, {{0, -3}, {3, -kPi / 2}}}},
+        {"rectangular", RTcPToRD, {{{5, 0}, {5, 0}}}},
+        {"tan", RTcTanD, {{{1, 1000}, {0, 1}}}},
+        {"cot", RTcCotD, {{{0, 1000}, {0, -1}}}},
+        {"sec", RTcSecD, {{{0, 0}, {1, 0}}}},
+        {"sinc", RTcSincD, {{{0, 0}, {1, 0}}, {{1, 12000}, {kInf, -kInf}}}},
+        {"asin", RTcAsinD, {{{0, 0}, {0, 0}}}},
+        {"acos", RTcAcosD, {{{1, 0.0}, {0, -0.0}}}},
+        {"atanh", RTcAtanhD, {{{1, 0}, {kInf, 0}}}},
+        {"sin", RTcSinD, {{{0, 0}, {0, 0}}}},
+        {"cos", RTcCosD, {{{0, 0.0}, {1, -0.0}}}},
     };
     for (const auto& c : cases) {
-        cmplx128 result{99, 99};
-        c.function(&c.z, &result);
-        ExpectSame(c.name, c.z, result, c.result);
+        for (const auto& [z, expected] : c.values) {
+            cmplx128 result{99, 99};
+            c.function(&z, &result);
+            ExpectSame(c.name, z, result, expected);
+        }
     }
     double magnitude = 0;
     const cmplx128 large = {3e307, -4e307};

@@ -40,39 +40,30 @@ protected:
     void TearDown() override { FPInit(); }
 };
 
-TEST_F(Registers, StackOfEight) {
+TEST_F(Registers, StackOfEightAndItsFaults) {
     EXPECT_EQ(FPCheck(), 1);
     for (int i = 1; i <= 8; ++i) Push(i);
     EXPECT_EQ(FPCheck(), 0);
     EXPECT_EQ(CheckFPStat() & kFPStatStackFault, 0);
     for (int i = 8; i >= 1; --i) EXPECT_EQ(Pop(), i);
     EXPECT_EQ(FPCheck(), 1);
-}
-
-TEST_F(Registers, FaultsOfTheStack) {
     EXPECT_TRUE(std::isnan(Pop()));
     EXPECT_EQ(CheckFPStat() & 0x3FF, kFPStatInvalid | kFPStatStackFault);
+    std::fesetround(FE_UPWARD);
     FPInit();
+    EXPECT_EQ(std::fegetround(), FE_TONEAREST);
     EXPECT_EQ(CheckFPStat(), 0);
     for (int i = 1; i <= 9; ++i) Push(i);
     EXPECT_EQ(CheckFPStat() & 0x3FF, kFPStatInvalid | kFPStatStackFault | kFPStatStackOverflow);
     EXPECT_TRUE(std::isnan(Pop())) << "the value pushed on a full stack is lost";
     EXPECT_EQ(Pop(), 8);
-}
-
-TEST_F(Registers, StatusShowsTopAndExceptions) {
+    FPInit();
     Push(1);
-    EXPECT_EQ(CheckFPStat() >> 11 & 7, 7);
+    EXPECT_EQ(CheckFPStat() >> 11 & 7, 7) << "the top";
     Push(0);
     RecipX();
     EXPECT_EQ(CheckFPStat() & 0x7F, kFPStatZeroDivide);
     EXPECT_EQ(Pop(), INFINITY);
-}
-
-TEST_F(Registers, InitSetsTheUnit) {
-    std::fesetround(FE_UPWARD);
-    FPInit();
-    EXPECT_EQ(std::fegetround(), FE_TONEAREST);
 }
 
 TEST_F(Registers, EveryThreadHasItsOwnStack) {

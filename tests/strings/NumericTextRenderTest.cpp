@@ -4,7 +4,7 @@
 #include <tessel/numerics/NumericSupport.h>
 #include <tessel/strings/NumericText.h>
 
-#include <charconv>
+#include <bit>
 #include <cinttypes>
 #include <cmath>
 #include <cstdio>
@@ -14,6 +14,7 @@
 #include <random>
 #include <string>
 #include <tuple>
+#include <type_traits>
 #include <vector>
 
 namespace {
@@ -21,27 +22,11 @@ namespace {
 using tessel::test::ReportRecorder;
 
 template <class T>
-constexpr int16 kCode = 0;
-template <>
-constexpr int16 kCode<int8> = kNumInt8;
-template <>
-constexpr int16 kCode<int16> = kNumInt16;
-template <>
-constexpr int16 kCode<int32> = kNumInt32;
-template <>
-constexpr int16 kCode<int64> = kNumInt64;
-template <>
-constexpr int16 kCode<uint8> = kNumUInt8;
-template <>
-constexpr int16 kCode<uint16> = kNumUInt16;
-template <>
-constexpr int16 kCode<uint64> = kNumUInt64;
-template <>
-constexpr int16 kCode<float> = kNumSingle;
-template <>
-constexpr int16 kCode<double> = kNumDouble;
-template <>
-constexpr int16 kCode<cmplx128> = kNumComplexDouble;
+constexpr int16 kCode = std::is_class_v<T>         ? kNumComplexDouble
+                        : std::is_same_v<T, float> ? kNumSingle
+                        : std::is_same_v<T, double>
+                            ? kNumDouble
+                            : (std::is_signed_v<T> ? kNumInt8 : kNumUInt8) + std::bit_width(sizeof(T)) - 1;
 
 constexpr int32 kSize = 256;
 
