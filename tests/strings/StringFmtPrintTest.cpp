@@ -262,7 +262,7 @@ TEST(StringFmtPrint, FillsPStrsAndHandles) {
     NumSetNaNText(nan);
 }
 
-std::string g_growing;
+std::string growing;
 
 TEST(StringFmtPrint, PrintsATextIntoItself) {
     L text("abc");
@@ -273,11 +273,11 @@ TEST(StringFmtPrint, PrintsATextIntoItself) {
 
     // A text that grows between the measuring and the writing of a long one: when it is reported what is wrong in
     // between.
-    g_growing.reserve(10);
-    g_growing = "x";
-    const auto grow = [](CStr, int32, CStr, int32, uint32, CStr) { g_growing += "x"; };
+    growing.reserve(10);
+    growing = "x";
+    const auto grow = [](CStr, int32, CStr, int32, uint32, CStr) { growing += "x"; };
     const auto before = DebugOutputSetHandler(grow);
-    EXPECT_EQ(kGenericErr, LStrPrintf(text, "%600d%s%y", 1, g_growing.c_str()));
+    EXPECT_EQ(kGenericErr, LStrPrintf(text, "%600d%s%y", 1, growing.c_str()));
     DebugOutputSetHandler(before);
     EXPECT_EQ(606u, text.Text().size());
 }

@@ -164,8 +164,8 @@ struct Row {
     double single, real, extended;
     std::string arguments;
 };
-std::vector<Row> gRealRows;
-std::vector<Row> gComplexRows;
+std::vector<Row> realRows;
+std::vector<Row> complexRows;
 
 void WriteRows(std::ofstream& out, const std::vector<Row>& rows) {
     out << "| member | arguments | single | double | extended |\n|---|---|---|---|---|\n";
@@ -181,20 +181,20 @@ class MathAccuracy : public testing::Test {
 public:
     static void TearDownTestSuite() {
         const char* const file = TableFile();
-        if (file == nullptr || gRealRows.empty() || gComplexRows.empty()) return;
+        if (file == nullptr || realRows.empty() || complexRows.empty()) return;
         std::ofstream out(file);
         out << "# Accuracy of the math family\n\n"
                "The largest error in units in the last place over "
             << kArguments << " random arguments each, measured\nagainst MPFR and MPC at " << kPrecision
             << " bits on x86-64 with the C library of the build. 0.50 is correct rounding. Made by\n"
                "`./dev accuracy`; members that are exact or round once by definition are left out.\n\n## Real\n\n";
-        WriteRows(out, gRealRows);
+        WriteRows(out, realRows);
         out << "\n## Complex\n\nThe larger error of the two parts. A part below a thousandth of the magnitude, which "
                "comes\nabout by "
                "cancellation, is measured as if it were that large; an extended one, for which there is nothing\nwider "
                "to compute in, in units of the magnitude. Powers lose as many digits as y ln x has before the\npoint, "
                "and the arctangent of a quotient near i, where it has its pole, as the quotient loses there.\n\n";
-        WriteRows(out, gComplexRows);
+        WriteRows(out, complexRows);
     }
 };
 
@@ -325,7 +325,7 @@ TEST_F(MathAccuracy, RealMembers) {
         const Row row{m.name, Largest<float>(m.single, m.reference, m.range),
                       Largest<double>(m.real, m.reference, m.range),
                       Largest<floatExt>(m.extended, m.reference, m.range), Text(m.range)};
-        ExpectWithin(gRealRows, row, m.bounds);
+        ExpectWithin(realRows, row, m.bounds);
     }
     const struct {
         const char* name;
@@ -344,7 +344,7 @@ TEST_F(MathAccuracy, RealMembers) {
         const Row row{m.name, Largest<float>(m.single, m.reference, m.x, m.y),
                       Largest<double>(m.real, m.reference, m.x, m.y),
                       Largest<floatExt>(m.extended, m.reference, m.x, m.y), Text(m.x) + "; " + Text(m.y)};
-        ExpectWithin(gRealRows, row, m.bounds);
+        ExpectWithin(realRows, row, m.bounds);
     }
 }
 
@@ -532,7 +532,7 @@ TEST_F(MathAccuracy, ComplexMembers) {
                       LargestComplex<double>(m.real, m.reference, m.range, m.imaginary),
                       LargestComplex<floatExt>(m.extended, m.reference, m.range, m.imaginary),
                       "parts " + Text(m.range) + (m.imaginary.most == m.range.most ? "" : "; " + Text(m.imaginary))};
-        ExpectWithin(gComplexRows, row, m.bounds);
+        ExpectWithin(complexRows, row, m.bounds);
     }
     const struct {
         const char* name;
@@ -553,7 +553,7 @@ TEST_F(MathAccuracy, ComplexMembers) {
         const Row row{m.name, LargestComplex<float>(m.single, m.reference, m.range),
                       LargestComplex<double>(m.real, m.reference, m.range),
                       LargestComplex<floatExt>(m.extended, m.reference, m.range), "parts " + Text(m.range)};
-        ExpectWithin(gComplexRows, row, m.bounds);
+        ExpectWithin(complexRows, row, m.bounds);
     }
 }
 
