@@ -17,6 +17,7 @@
 
 namespace {
 
+using tessel::Extended;
 using tessel::FromExtended;
 using tessel::ToExtended;
 
@@ -383,21 +384,20 @@ TEST(ComplexMath, FormsScalesAndPredicates) {
 }
 
 TEST(ComplexMath, ExtendedQuotientsStayInRange) {
-    const cmplxExt x = {FromExtended(3e4900L), FromExtended(-4e4900L)};
+    const Extended quotients[][6] = {{3e4900L, -4e4900L, 3e4900L, -4e4900L, 1, 0},
+                                     {3e-4920L, 4e-4920L, 3e-4920L, 4e-4920L, 1, 0},
+                                     {0x1p9000L, 0x1p-9000L, 1, 0, 0x1p9000L, 0x1p-9000L}};
     cmplxExt result{};
-    RTcDivX(&x, &x, &result);
-    EXPECT_EQ(ToExtended(result.re), 1);
-    EXPECT_EQ(ToExtended(result.im), 0);
-    const cmplxExt tiny = {FromExtended(3e-4920L), FromExtended(4e-4920L)};
-    RTcDivX(&tiny, &tiny, &result);
-    EXPECT_EQ(ToExtended(result.re), 1);
+    for (const auto& q : quotients) {
+        const cmplxExt x = {FromExtended(q[0]), FromExtended(q[1])};
+        const cmplxExt y = {FromExtended(q[2]), FromExtended(q[3])};
+        RTcDivX(&x, &y, &result);
+        EXPECT_EQ(ToExtended(result.re), q[4]) << q[0];
+        EXPECT_EQ(ToExtended(result.im), q[5]) << q[0];
+    }
+    const cmplxExt x = {FromExtended(3e4900L), FromExtended(-4e4900L)};
     RTcSignX(&x, &result);
     EXPECT_EQ(ToExtended(result.im), -0.8L);
-    const cmplxExt apart = {FromExtended(0x1p9000L), FromExtended(0x1p-9000L)};
-    const cmplxExt one = {FromExtended(1), FromExtended(0)};
-    RTcDivX(&apart, &one, &result);
-    EXPECT_EQ(ToExtended(result.re), 0x1p9000L);
-    EXPECT_EQ(ToExtended(result.im), 0x1p-9000L);
     const cmplxExt large = {FromExtended(11356.6L), FromExtended(1.5707L)};
     RTcExpX(&large, &result);
     cmplxExt less1{};

@@ -232,6 +232,9 @@ TEST_F(Registers, DecimalsAreRoundedOnce) {
     ExpectStoredAsText(record);
     ExpectStoredAsText({{0x97, 0x82, 0x14, 0x00, 0x32, 0x75, 0x57, 0x43, 0x29}, 0, -19, 17});
     ExpectStoredAsText({{0x39, 0x79, 0x60, 0x09, 0x52, 0x18, 0x93, 0x71, 0x10}, 0, 291, 17});  // the largest exponent
+    // Just below 2^-64 and 2^501, nearest to which they are: the mantissa carries.
+    ExpectStoredAsText({{0x17, 0x22, 0x75, 0x42, 0x62, 0x08, 0x01, 0x21, 0x54}, 0, -37, 17});
+    ExpectStoredAsText({{0x74, 0x83, 0x22, 0x79, 0x15, 0x12, 0x78, 0x46, 0x65}, 0, 133, 17});
     std::mt19937_64 random(41);
     for (int i = 0; i < 5000; ++i) {
         for (uint8& byte : record.mantissa) byte = static_cast<uint8>(random() % 10 << 4 | random() % 10);

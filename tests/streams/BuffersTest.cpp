@@ -108,9 +108,11 @@ TEST_F(Buffers, AHandleGrowsByAQuarterWithinBounds) {
 }
 
 TEST_F(Buffers, AStringHandleGrowsBehindItsCount) {
-    LStrOutputBuf buffer(Text("room"), 0);
+    LStrHandle room = Text("room");
+    LStrOutputBuf buffer(room, 0);
     std::memcpy(buffer.GetDataPointer(3, err_), "abc", 3);
     std::memset(buffer.GetDataPointer(2, err_), '!', 2);
+    EXPECT_LE(9u, DSGetHandleSize(reinterpret_cast<UHandle>(room)));
     LStrHandle text = buffer.GetHandle(1);
     EXPECT_EQ(5, (*text)->count);
     EXPECT_EQ(9u, DSGetHandleSize(reinterpret_cast<UHandle>(text)));

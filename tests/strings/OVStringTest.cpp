@@ -131,6 +131,11 @@ TEST(OVSubString, RefusesWhatDoesNotFit) {
     EXPECT_EQ(kArgErr, buffer.AssignCStr("abcd"));
     EXPECT_STREQ("abc", four);
     EXPECT_EQ(kArgErr, buffer.Printf("%d", 1234));
+    for (const auto& [length, taken] : {std::pair{-1, 0}, {2, 2}, {3, 3}, {4, 3}}) {
+        char bytes[4] = {'a', 'b', 'c', 'd'};
+        EXPECT_EQ(std::string("abc", static_cast<size_t>(taken)), TextOf(OVSubString(4, bytes, length)));
+        EXPECT_EQ(0, bytes[taken]);
+    }
 
     P p;
     OVSubString pstr = OVSubString::OnPStr(p);

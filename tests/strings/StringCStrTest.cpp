@@ -127,6 +127,7 @@ TEST(StringCStr, StepsOverWholeCharacters) {
     EXPECT_EQ(7, StrNextChar(utf8, 3));
     EXPECT_EQ(3, StrPrevChar(utf8, 7));
     EXPECT_EQ(0, StrPrevChar(utf8, 0));
+    EXPECT_EQ(0, StrPrevChar(nullptr, 3));
     EXPECT_EQ(0u, reports.Count());
     EXPECT_EQ(0, StrPrevChar(utf8, -1));
     EXPECT_TRUE(reports.Has(kDebugWarning, "Negative index into string in StrPrevChar"));
