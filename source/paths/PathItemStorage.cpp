@@ -1,7 +1,10 @@
 #include "paths/PathItemStorage.h"
 
 #include "paths/PathItemElement.h"
+#include "paths/PathLock.h"
 #include <tessel/diagnostics/DebugStream.h>
+#include <tessel/memory/TrackedMallocFree.h>
+#include <tessel/sync/ThMutex.h>
 
 #include <bit>
 #include <map>

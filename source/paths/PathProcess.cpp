@@ -3,6 +3,7 @@
 
 #include "diagnostics/Guarded.h"
 #include "paths/PathItemStorage.h"
+#include "paths/PathLock.h"
 #include "paths/PathRefAccess.h"
 #include "paths/PathSteps.h"
 #include "paths/Service.h"
