@@ -60,8 +60,37 @@ void PathRef::CachedItem::Attached() {
 
 // ---- items with a value ---------------------------------------------------------------------------------------------
 
-PathRef::CachedBool::CachedBool(uint32 lifetime, RelationToMetaData relation, bool value)
+template <class Item, class Value>
+PathRef::CachedValue<Item, Value>::CachedValue(uint32 lifetime, RelationToMetaData relation, Argument value)
     : CachedItem(lifetime, relation), value_(value) {
+}
+
+template <class Item, class Value>
+PathRef::CachedValue<Item, Value>::~CachedValue() = default;
+
+template <class Item, class Value>
+bool PathRef::CachedValue<Item, Value>::IsA(const char* className) const {
+    return std::strcmp(className, Item::ClassName()) == 0 || CachedItem::IsA(className);
+}
+
+template <class Item, class Value>
+uint32 PathRef::CachedValue<Item, Value>::Size() const {
+    return sizeof(Item);
+}
+
+template <class Item, class Value>
+void PathRef::CachedValue<Item, Value>::ResetValue(uint32 lifetime, Argument value) {
+    Reset(lifetime);
+    value_ = value;
+}
+
+template class PathRef::CachedValue<PathRef::CachedBool, bool>;
+template class PathRef::CachedValue<PathRef::CachedInt32, int32>;
+template class PathRef::CachedValue<PathRef::CachedPathString, PathRef::StringType>;
+template class PathRef::CachedValue<PathRef::CachedPath, PathRef>;
+
+PathRef::CachedBool::CachedBool(uint32 lifetime, RelationToMetaData relation, bool value)
+    : CachedValue(lifetime, relation, value) {
 }
 
 PathRef::CachedBool::~CachedBool() = default;
@@ -70,21 +99,12 @@ const char* PathRef::CachedBool::ClassName() {
     return "CachedBool";
 }
 
-bool PathRef::CachedBool::IsA(const char* className) const {
-    return std::strcmp(className, ClassName()) == 0 || CachedItem::IsA(className);
-}
-
-uint32 PathRef::CachedBool::Size() const {
-    return sizeof *this;
-}
-
 void PathRef::CachedBool::ResetBool(uint32 lifetime, bool value) {
-    Reset(lifetime);
-    value_ = value;
+    ResetValue(lifetime, value);
 }
 
 PathRef::CachedInt32::CachedInt32(uint32 lifetime, RelationToMetaData relation, int32 value)
-    : CachedItem(lifetime, relation), value_(value) {
+    : CachedValue(lifetime, relation, value) {
 }
 
 PathRef::CachedInt32::~CachedInt32() = default;
@@ -93,21 +113,12 @@ const char* PathRef::CachedInt32::ClassName() {
     return "CachedInt32";
 }
 
-bool PathRef::CachedInt32::IsA(const char* className) const {
-    return std::strcmp(className, ClassName()) == 0 || CachedItem::IsA(className);
-}
-
-uint32 PathRef::CachedInt32::Size() const {
-    return sizeof *this;
-}
-
 void PathRef::CachedInt32::ResetInt32(uint32 lifetime, int32 value) {
-    Reset(lifetime);
-    value_ = value;
+    ResetValue(lifetime, value);
 }
 
 PathRef::CachedPathString::CachedPathString(uint32 lifetime, RelationToMetaData relation, const StringType& value)
-    : CachedItem(lifetime, relation), value_(value) {
+    : CachedValue(lifetime, relation, value) {
 }
 
 PathRef::CachedPathString::~CachedPathString() = default;
@@ -116,21 +127,16 @@ const char* PathRef::CachedPathString::ClassName() {
     return "CachedPathString";
 }
 
-bool PathRef::CachedPathString::IsA(const char* className) const {
-    return std::strcmp(className, ClassName()) == 0 || CachedItem::IsA(className);
+void PathRef::CachedPathString::ResetString(uint32 lifetime, const StringType& value) {
+    ResetValue(lifetime, value);
 }
 
 uint32 PathRef::CachedPathString::Size() const {
-    return static_cast<uint32>(sizeof *this + value_.capacity());
-}
-
-void PathRef::CachedPathString::ResetString(uint32 lifetime, const StringType& value) {
-    Reset(lifetime);
-    value_ = value;
+    return static_cast<uint32>(sizeof *this + Get().capacity());
 }
 
 PathRef::CachedPath::CachedPath(uint32 lifetime, RelationToMetaData relation, const PathRef& value)
-    : CachedItem(lifetime, relation), value_(value) {
+    : CachedValue(lifetime, relation, value) {
 }
 
 PathRef::CachedPath::~CachedPath() = default;
@@ -139,17 +145,8 @@ const char* PathRef::CachedPath::ClassName() {
     return "CachedPath";
 }
 
-bool PathRef::CachedPath::IsA(const char* className) const {
-    return std::strcmp(className, ClassName()) == 0 || CachedItem::IsA(className);
-}
-
-uint32 PathRef::CachedPath::Size() const {
-    return sizeof *this;
-}
-
 void PathRef::CachedPath::ResetPath(uint32 lifetime, const PathRef& value) {
-    Reset(lifetime);
-    value_ = value;
+    ResetValue(lifetime, value);
 }
 
 }  // namespace tessel

@@ -2,9 +2,9 @@
 #include "paths/PathFlattening.h"
 
 #include "diagnostics/Guarded.h"
+#include "paths/PathItemList.h"
 #include "paths/PathItemStorage.h"
 #include "paths/PathProcess.h"
-#include "paths/PathItemList.h"
 #include "paths/PathRefAccess.h"
 #include "platform/CodePage.h"
 #include <tessel/base/OVExcept.h>

@@ -1,10 +1,10 @@
 // PathRef: construction, names, relations, comparison and checks. Texts, the flattened form, extensions, cached
 // attributes and the file system have files of their own.
 #include "diagnostics/Guarded.h"
-#include "paths/PathLock.h"
-#include "paths/PathItemStorage.h"
-#include "paths/PathProcess.h"
 #include "paths/PathItemList.h"
+#include "paths/PathItemStorage.h"
+#include "paths/PathLock.h"
+#include "paths/PathProcess.h"
 #include "paths/PathRefAccess.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/AllocTracker.h>

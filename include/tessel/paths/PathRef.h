@@ -64,6 +64,8 @@ public:
     };
 
     class CachedItem;  // paths/PathCachedItem.h
+    template <class Item, class Value>
+    class CachedValue;
     class CachedBool;
     class CachedInt32;
     class CachedPathString;
