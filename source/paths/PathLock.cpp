@@ -1,32 +1,33 @@
 #include "paths/PathLock.h"
 
+#include "sync/RecursiveMutex.h"
+
 namespace tessel {
 namespace {
 
-ThMutex gPathMutex = nullptr;
-thread_local uint32 tPathLockDepth = 0;
+RecursiveMutex pathMutex;
+thread_local uint32 pathMutexHeld = 0;
 
 }  // namespace
 
 void PathLock::Acquire() {
-    if (tPathLockDepth++ == 0) ThMutexAcquire(gPathMutex);
+    pathMutex.Acquire(pathMutexHeld);
 }
 
 void PathLock::Release() {
-    if (--tPathLockDepth == 0) ThMutexRelease(gPathMutex);
+    pathMutex.Release(pathMutexHeld);
 }
 
 MgErr PathLock::CreateMutex() {
-    return ThMutexCreate(&gPathMutex, "PathMutex");
+    return pathMutex.Create("PathMutex");
 }
 
 void PathLock::DestroyMutex() {
-    ThMutexDestroy(gPathMutex);
-    gPathMutex = nullptr;
+    pathMutex.Destroy();
 }
 
 ThMutex PathLock::Mutex() {
-    return gPathMutex;
+    return pathMutex.Get();
 }
 
 }  // namespace tessel
