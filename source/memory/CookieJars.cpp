@@ -50,69 +50,69 @@ bool AcquireRights(JarRecord& record, MagicCookie cookie, void* infoOut) {
 }  // namespace
 
 CookieList::~CookieList() {
-    DSDisposeHandle(fCookies);
+    DSDisposeHandle(cookies_);
 }
 
 MagicCookie CookieList::GetCookie(int32 i) const {
-    return fCookies && i >= 0 && i < fCount ? reinterpret_cast<MagicCookie*>(*fCookies)[i] : 0;
+    return cookies_ && i >= 0 && i < count_ ? reinterpret_cast<MagicCookie*>(*cookies_)[i] : 0;
 }
 
 MgErr CookieList::SetCookie(int32 i, MagicCookie cookie) {
-    if (!fCookies || i < 0 || i >= fCount) return kArgErr;
-    reinterpret_cast<MagicCookie*>(*fCookies)[i] = cookie;
+    if (!cookies_ || i < 0 || i >= count_) return kArgErr;
+    reinterpret_cast<MagicCookie*>(*cookies_)[i] = cookie;
     return kNoErr;
 }
 
 MgErr CookieList::SetCount(int32 count) {
     if (count < 0) return kArgErr;
-    int32 known = fCount;
-    fCount = 0;
-    if (count == 0) return DSDisposeHandleAndNull(&fCookies);
+    int32 known = count_;
+    count_ = 0;
+    if (count == 0) return DSDisposeHandleAndNull(&cookies_);
     if (count > INT32_MAX / static_cast<int32>(sizeof(MagicCookie))) return kMemFullErr;
-    MgErr err = DSSetHandleSizeOrNewHandle(&fCookies, static_cast<uint32>(count) * sizeof(MagicCookie));
+    MgErr err = DSSetHandleSizeOrNewHandle(&cookies_, static_cast<uint32>(count) * sizeof(MagicCookie));
     if (err != kNoErr) return err;
     if (count > known)
-        ClearMem(reinterpret_cast<MagicCookie*>(*fCookies) + known,
+        ClearMem(reinterpret_cast<MagicCookie*>(*cookies_) + known,
                  static_cast<size_t>(count - known) * sizeof(MagicCookie));
-    fCount = count;
+    count_ = count;
     return kNoErr;
 }
 
 MgErr BaseCookieJar::Init(uint32 infoSize, int32 rightsMode) {
-    fJar = NewJar(infoSize, rightsMode);
-    return fJar ? kNoErr : kMemFullErr;
+    jar_ = NewJar(infoSize, rightsMode);
+    return jar_ ? kNoErr : kMemFullErr;
 }
 
 MgErr BaseCookieJar::Uninit() {
-    MgErr err = MCDisposeJar(fJar);
-    fJar = nullptr;
+    MgErr err = MCDisposeJar(jar_);
+    jar_ = nullptr;
     return err;
 }
 
 MagicCookie BaseCookieJar::NewCookie(const void* info) {
-    return MCNewCookie(fJar, info);
+    return MCNewCookie(jar_, info);
 }
 
 MgErr BaseCookieJar::DisposeCookie(const MagicCookie& cookie, void* infoOut) {
-    return fJar ? MCDisposeCookie(fJar, cookie, infoOut) : kArgErr;
+    return jar_ ? MCDisposeCookie(jar_, cookie, infoOut) : kArgErr;
 }
 
 MgErr BaseCookieJar::SetCookieInfo(const MagicCookie& cookie, const void* info) {
-    return fJar ? MCSetCookieInfo(fJar, cookie, info) : kArgErr;
+    return jar_ ? MCSetCookieInfo(jar_, cookie, info) : kArgErr;
 }
 
 MgErr BaseCookieJar::GetCookieInfo(const MagicCookie& cookie, void* infoOut) {
-    return MCGetCookieInfo(fJar, cookie, infoOut);
+    return MCGetCookieInfo(jar_, cookie, infoOut);
 }
 
 bool BaseCookieJar::IsACookie(const MagicCookie& cookie) {
-    return MCIsACookie(fJar, cookie);
+    return MCIsACookie(jar_, cookie);
 }
 
 MgErr BaseCookieJar::GetCookieList(CookieList* list) {
     if (!list) return kArgErr;
     UHandle cookies = nullptr;
-    MgErr err = fJar ? MCGetCookieList(fJar, &cookies) : kNoErr;
+    MgErr err = jar_ ? MCGetCookieList(jar_, &cookies) : kNoErr;
     int32 count = cookies && err == kNoErr ? *reinterpret_cast<const int32*>(*cookies) : 0;
     MgErr listErr = list->SetCount(count);
     for (int32 i = 0; listErr == kNoErr && i < count; ++i)
@@ -122,24 +122,24 @@ MgErr BaseCookieJar::GetCookieList(CookieList* list) {
 }
 
 MagicCookie BaseCookieJar::GetCookieForInfo(const void* info) {
-    return fJar ? MCGetCookieForInfo(fJar, info) : 0;
+    return jar_ ? MCGetCookieForInfo(jar_, info) : 0;
 }
 
 int32 BaseCookieJar::AcquireCookieRights(const MagicCookie& cookie, void* infoOut) {
-    if (fJar && AcquireRights(Record(fJar), cookie, infoOut)) return 1;
-    if (fJar && infoOut) std::memset(infoOut, 0, std::min(Record(fJar).infoSize, kWord));
+    if (jar_ && AcquireRights(Record(jar_), cookie, infoOut)) return 1;
+    if (jar_ && infoOut) std::memset(infoOut, 0, std::min(Record(jar_).infoSize, kWord));
     return 0;
 }
 
 int32 BaseCookieJar::ReleaseCookieRights(const MagicCookie& cookie) {
-    if (!fJar || !Record(fJar).rightsMode) return 0;
-    JarRecord& record = Record(fJar);
+    if (!jar_ || !Record(jar_).rightsMode) return 0;
+    JarRecord& record = Record(jar_);
     CookieEntry* entry = Find(record, cookie);
     return entry ? static_cast<int32>(ReleaseEntry(record, entry, cookie)) : 0;
 }
 
 MgErr BaseCookieJar::GetNumCookies(int32* count) {
-    return MCJarSize(fJar, count);
+    return MCJarSize(jar_, count);
 }
 
 }  // namespace tessel
