@@ -284,7 +284,7 @@ private:
     StringType& TextCache();
 
     PathItemElement* mPathElement = nullptr;
-    StringType* mTextCache = nullptr;
+    StringType* textCache_ = nullptr;
 };
 
 // Where SplitOn splits a path.
