@@ -1,3 +1,4 @@
+// Tracked allocation: what new and delete of the library's classes, and TrackedMalloc, come to.
 #include "diagnostics/ObjectTracker.h"
 #include "memory/HandleBlock.h"
 #include "memory/MemorySettings.h"

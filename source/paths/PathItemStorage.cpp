@@ -14,14 +14,14 @@
 namespace tessel {
 namespace {
 
-constexpr uint32 kSlotsPerBlock = 512;
+constexpr uint32 kElementsPerBlock = 512;
 constexpr int kBaseCount = 5;
 
 struct Block {
     Block* next = this;
-    uint32 cursor = kSlotsPerBlock - 1;
-    std::atomic<uint32> freeSlots{kSlotsPerBlock};
-    PathItemElement slots[kSlotsPerBlock];
+    uint32 cursor = kElementsPerBlock - 1;
+    std::atomic<uint32> freeSlots{kElementsPerBlock};
+    PathItemElement slots[kElementsPerBlock];
 };
 
 // A block lies at a multiple of this, so that the address of a slot gives that of its block.
@@ -164,14 +164,14 @@ void ForEachBlock(Visitor visit) {
 }
 
 bool IsUnused(const Block& block) {
-    return block.freeSlots.load(std::memory_order_acquire) == kSlotsPerBlock;
+    return block.freeSlots.load(std::memory_order_acquire) == kElementsPerBlock;
 }
 
 PathItemElement* ClaimSlot(Block& block) {
     if (block.freeSlots.load(std::memory_order_acquire) == 0) return nullptr;
-    for (uint32 i = 0; i < kSlotsPerBlock; ++i) {
+    for (uint32 i = 0; i < kElementsPerBlock; ++i) {
         PathItemElement& slot = block.slots[block.cursor];
-        block.cursor = block.cursor ? block.cursor - 1 : kSlotsPerBlock - 1;
+        block.cursor = block.cursor ? block.cursor - 1 : kElementsPerBlock - 1;
         if (slot.Claim()) {
             block.freeSlots.fetch_sub(1, std::memory_order_relaxed);
             return &slot;
@@ -216,7 +216,7 @@ void ForEachLiveElement(Block& block, Visitor visit) {
 }
 
 void ReportLiveElements(Block& block) {
-    const uint32 live = kSlotsPerBlock - block.freeSlots.load(std::memory_order_relaxed);
+    const uint32 live = kElementsPerBlock - block.freeSlots.load(std::memory_order_relaxed);
     TESSEL_REPORT(kDebugWarning, 0x7A10D2C4u) << "Killing a storage buffer with " << live << " live object(s)";
     ForEachLiveElement(block, [](const PathItemElement& element) {
         TESSEL_REPORT(kDebugWarning, 0x7A10D2C5u) << "element= " << DbgFmtPtr(&element);

@@ -1,3 +1,4 @@
+// Paths and lists of file names in formatted text.
 #include "strings/PathText.h"
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathText.h>
