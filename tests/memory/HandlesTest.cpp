@@ -1,4 +1,5 @@
 #include "diagnostics/AllocTracking.h"
+#include "memory/Heap.h"
 #include "support/StartedMemory.h"
 #include <tessel/memory/MemoryManager.h>
 
@@ -142,10 +143,12 @@ TEST_P(Handles, MoveOnlyWhenTheyMust) {
 }
 
 TEST_P(Handles, AreRecognised) {
+    const uint64 before = heap::TotalAllocated();
     UHandle first = DSNewHandle(1), second = DSNewHandle(2);
     EXPECT_EQ(1, IsDSHandle(first));
     EXPECT_EQ(kNoErr, DSDisposeHandle(first));
     EXPECT_EQ(kNoErr, DSDisposeHandle(second));
+    EXPECT_EQ(before, heap::TotalAllocated());
     EXPECT_EQ(0, IsDSHandle(first));  // a free slot
     EXPECT_EQ(kHandleErr, DSCheckHandle(first));
     EXPECT_EQ(second, DSNewHandle(5));  // last freed, first reused
