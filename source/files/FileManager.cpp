@@ -9,7 +9,7 @@
 #include <tessel/files/FileManager.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathManager.h>
-#include <tessel/paths/PathTextFormat.h>
+#include <tessel/paths/PathText.h>
 #include <tessel/strings/StringFmtPrint.h>
 #include <tessel/sync/ThMutex.h>
 

@@ -1,3 +1,4 @@
+// Lists of objects in a handle.
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/HObjList.h>
 #include <tessel/memory/MemoryManager.h>

@@ -1,3 +1,4 @@
+// Handles and pointer blocks through the flat interface.
 #include "memory/HandleBlock.h"
 #include "memory/Handles.h"
 #include "memory/Heap.h"

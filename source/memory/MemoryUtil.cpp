@@ -1,3 +1,4 @@
+// Moving, comparing, swapping and clearing blocks of memory.
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/memory/MemoryUtil.h>
 

@@ -1,3 +1,4 @@
+// What was allocated while a scope was tracked, and is left at its end.
 #include "diagnostics/CallStackWalk.h"
 #include "diagnostics/Guarded.h"
 #include "memory/MemorySettings.h"

@@ -1,11 +1,11 @@
+// Tracked allocation: what new and delete of the library's classes, and TrackedMalloc, come to.
+#include "diagnostics/ObjectTracker.h"
 #include "memory/HandleBlock.h"
 #include "memory/MemorySettings.h"
 #include "memory/Service.h"
-#include <tessel/diagnostics/DumpLeakInfo.h>
 #include <tessel/memory/TrackedMallocFree.h>
 
 #include <algorithm>
-#include <atomic>
 
 namespace tessel {
 namespace {
@@ -14,16 +14,15 @@ constexpr int32 kStackSkip = 4;     // the tracker's own, and the function that 
 constexpr int32 kRecordLine = 140;  // the line that reports name for every tracked block
 constexpr char kLeakFile[] = "ovnewdelleaks.txt";
 
-std::atomic<AllocTracker*> tracker{nullptr};
+ObjectTracker tracker;
 
 // Called by every function that allocates, itself called by the host. Not inlined, so that its frame tells where from.
 __attribute__((noinline)) void* Allocate(size_t size) {
     NeedMemorySettings();
     void* address = NewGuardedBlock(size, GuardKind::kNewDelete);
-    AllocTracker* own = address ? tracker.load(std::memory_order_acquire) : nullptr;
-    if (own)
-        own->AddRecordFrom(__builtin_frame_address(0), address, static_cast<uint32>(std::min<size_t>(size, UINT32_MAX)),
-                           __FILE__, kRecordLine);
+    if (address)
+        tracker.Add(__builtin_frame_address(0), address, static_cast<uint32>(std::min<size_t>(size, UINT32_MAX)),
+                    __FILE__, kRecordLine);
     return address;
 }
 
@@ -35,14 +34,12 @@ public:
 }  // namespace
 
 MgErr TrackedMallocFreeStart() {
-    tracker.store(CreateAllocTrackerSpecifySkip(kStackSkip));
+    tracker.Start(CreateAllocTrackerSpecifySkip(kStackSkip));
     return kNoErr;
 }
 
 MgErr TrackedMallocFreeStop() {
-    AllocTracker* own = tracker.exchange(nullptr);
-    DumpLeakInfo(own, 0, "new/delete leaks", kLeakFile);
-    DestroyAllocTracker(own);
+    tracker.StopAndReport(0, "new/delete leaks", kLeakFile);
     return kNoErr;
 }
 
@@ -67,16 +64,15 @@ void* TrackedMalloc(size_t size) {
 void TrackedFree(void* address) {
     if (!address) return;
     if (ChecksGuards(GuardKind::kNewDelete)) CheckGuards(address, GuardKind::kNewDelete);
-    if (AllocTracker* own = tracker.load(std::memory_order_acquire)) own->RemoveRecord(address);
+    tracker.Remove(address);
     DisposeGuardedBlock(address, GuardKind::kNewDelete);
 }
 
 void TrackedMallocDumpTracker(void) {
     constexpr int32 kExpected = 330;
-    if (AllocTracker* own = tracker.load(std::memory_order_acquire))
-        DumpLeakInfo(own, kExpected, "new/delete leaks -- 330 is arbitrary to avoid known reported leaks.", kLeakFile);
+    tracker.Report(kExpected, "new/delete leaks -- 330 is arbitrary to avoid known reported leaks.", kLeakFile);
 }
 
 void TrackedMallocResetTracker(void) {
-    if (AllocTracker* own = tracker.load(std::memory_order_acquire)) own->MarkAllReported();
+    tracker.MarkAllReported();
 }

@@ -2,12 +2,11 @@
 
 #include "diagnostics/AllocTracking.h"
 #include "diagnostics/NumberText.h"
+#include "diagnostics/ObjectTracker.h"
 #include "memory/HandleBlock.h"
 #include "memory/MasterPointers.h"
 #include "memory/MemorySettings.h"
 #include "platform/MemoryRead.h"
-
-#include <atomic>
 
 namespace tessel {
 namespace {
@@ -18,47 +17,43 @@ constexpr char kHandleLeakFile[] = "ovHandleLeaks.txt";
 constexpr char kPointerLeaks[] = "Pointer Leaks";
 constexpr char kPointerLeakFile[] = "ovPointerLeaks.txt";
 
-std::atomic<AllocTracker*> handleTracker{nullptr};
-std::atomic<AllocTracker*> pointerTracker{nullptr};
-
-AllocTracker* Get(const std::atomic<AllocTracker*>& tracker) {
-    return tracker.load(std::memory_order_acquire);
-}
+ObjectTracker handleTracker;
+ObjectTracker pointerTracker;
 
 }  // namespace
 
 void StartTrackers() {
-    handleTracker.store(CreateAllocTracker());
-    pointerTracker.store(CreateAllocTracker());
+    handleTracker.Start();
+    pointerTracker.Start();
     SetDetour(kHandlesTracked, IsAllocTrackingOn());
 }
 
 void WriteLeakReports() {
-    if (AllocTracker* tracker = Get(handleTracker))
+    if (AllocTracker* tracker = handleTracker.Get())
         HandleLeakDumper(kExpected, kHandleLeaks, kHandleLeakFile).DumpLeaks(*tracker);
-    if (AllocTracker* tracker = Get(pointerTracker)) DumpLeakInfo(tracker, kExpected, kPointerLeaks, kPointerLeakFile);
+    pointerTracker.Report(kExpected, kPointerLeaks, kPointerLeakFile);
 }
 
 void StopTrackers() {
     SetDetour(kHandlesTracked, false);
-    DestroyAllocTracker(handleTracker.exchange(nullptr));
-    DestroyAllocTracker(pointerTracker.exchange(nullptr));
+    handleTracker.Stop();
+    pointerTracker.Stop();
 }
 
 void TrackHandle(UHandle h, uint32 size, const void* frame) {
-    if (AllocTracker* tracker = Get(handleTracker)) tracker->AddRecordFrom(frame, h, size, __FILE__, __LINE__);
+    handleTracker.Add(frame, h, size, __FILE__, __LINE__);
 }
 
 void TrackPointer(const void* p, uint32 size, const void* frame) {
-    if (AllocTracker* tracker = Get(pointerTracker)) tracker->AddRecordFrom(frame, p, size, __FILE__, __LINE__);
+    pointerTracker.Add(frame, p, size, __FILE__, __LINE__);
 }
 
 void UntrackHandle(UHandle h) {
-    if (AllocTracker* tracker = Get(handleTracker)) tracker->RemoveRecord(h);
+    handleTracker.Remove(h);
 }
 
 void UntrackPointer(const void* p) {
-    if (AllocTracker* tracker = Get(pointerTracker)) tracker->RemoveRecord(p);
+    pointerTracker.Remove(p);
 }
 
 // The size recorded is that at creation; the handle knows its own. The handle may be damaged, and other threads may
@@ -85,6 +80,6 @@ void MemDumpTracker(void) {
 }
 
 void MemResetTracker(void) {
-    if (AllocTracker* tracker = Get(handleTracker)) tracker->MarkAllReported();
-    if (AllocTracker* tracker = Get(pointerTracker)) tracker->MarkAllReported();
+    handleTracker.MarkAllReported();
+    pointerTracker.MarkAllReported();
 }

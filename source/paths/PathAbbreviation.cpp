@@ -2,7 +2,7 @@
 #include "diagnostics/Guarded.h"
 #include "paths/PathRefAccess.h"
 #include "paths/PathSteps.h"
-#include "paths/PathTextWriters.h"
+#include "paths/PathTextFormat.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/paths/PathAbbreviation.h>
 #include <tessel/strings/StringUtils.h>

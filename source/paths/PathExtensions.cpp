@@ -14,7 +14,7 @@ namespace {
 using Entry = PathRef::ExtensionEntry;
 
 // The primary and the secondary list, searched in this order. Set during start-up.
-const PathRef::ExtensionList** gExtensionLists[2] = {};
+const PathRef::ExtensionList** extensionLists[2] = {};
 
 // Entries of a list that its handle really holds.
 int32 EntryCount(const PathRef::ExtensionList** list) {
@@ -32,7 +32,7 @@ std::string ExtensionOf(const Entry& entry) {
 // The first entry that fits, or null.
 template <class Predicate>
 const Entry* FindEntry(Predicate fits) {
-    for (const PathRef::ExtensionList** list : gExtensionLists) {
+    for (const PathRef::ExtensionList** list : extensionLists) {
         const int32 count = EntryCount(list);
         for (int32 i = 0; i < count; ++i)
             if (fits((*list)->entries[i])) return &(*list)->entries[i];
@@ -48,16 +48,16 @@ void ReleaseList(const PathRef::ExtensionList**& list) {
 }  // namespace
 
 void PathRef::SetExtensionList(const ExtensionList** primary, const ExtensionList** secondary) {
-    if (gExtensionLists[0] || gExtensionLists[1]) {
+    if (extensionLists[0] || extensionLists[1]) {
         TESSEL_REPORT(kDebugWarning, 0xB7C21E94u) << "The extension lists should only be set once";
         ReleaseExtensionLists();
     }
-    gExtensionLists[0] = primary;
-    gExtensionLists[1] = secondary;
+    extensionLists[0] = primary;
+    extensionLists[1] = secondary;
 }
 
 void ReleaseExtensionLists() {
-    for (const PathRef::ExtensionList**& list : gExtensionLists) ReleaseList(list);
+    for (const PathRef::ExtensionList**& list : extensionLists) ReleaseList(list);
 }
 
 // ---- names by themselves --------------------------------------------------------------------------------------------

@@ -2,6 +2,7 @@
 #include "paths/PathFlattening.h"
 
 #include "diagnostics/Guarded.h"
+#include "paths/PathItemList.h"
 #include "paths/PathItemStorage.h"
 #include "paths/PathProcess.h"
 #include "paths/PathRefAccess.h"

@@ -6,7 +6,6 @@
 #include <tessel/base/OVExcept.h>
 
 #include <algorithm>
-#include <cstring>
 
 namespace tessel {
 namespace WidePathFormat {
@@ -219,31 +218,4 @@ PathRef ReadByGuessing(std::string_view text) {
 }
 
 }  // namespace WidePathFormat
-
-// ---- the constructor ------------------------------------------------------------------------------------------------
-
-namespace {
-
-PathRef ReadText(const std::string& text, const char* format) {
-    using namespace WidePathFormat;
-    const auto is = [&](const char* name) { return std::strcmp(format, name) == 0; };
-    if (is(PathRef::StringCommandLine()) && text.empty())
-        TESSEL_THROW(kArgErr, "Empty command line strings cannot be converted to Path");
-    if (is(PathRef::StringDisplay()) || is(PathRef::StringDOS()) || is(PathRef::StringCommandLine()))
-        return PathFormatReaderWin(text).Read();
-    if (is(PathRef::StringUnix())) return PathFormatReaderUnix(text).Read();
-    if (is(PathRef::StringPlatformIndependent())) return PathFormatReaderPlatformIndependent(text).Read();
-    if (is(PathRef::StringPlatformAgnostic())) return ReadByGuessing(text);
-    std::string detail =
-        "PathRef from string constructor: unknown format \"" + std::string(format, strnlen(format, 64));
-    throw OVExcept(kUnsupportedErr, (detail + "\"").c_str(), __FILE__, __LINE__);
-}
-
-}  // namespace
-
-PathRef::PathRef(const StringType& text, const char* format) {
-    if (!format) TESSEL_THROW(kArgErr, "PathRef from string constructor");
-    *this = ReadText(text, format);
-}
-
 }  // namespace tessel

@@ -1,6 +1,7 @@
 #include "paths/PathItemElement.h"
 
 #include "paths/PathItemStorage.h"
+#include "paths/PathLock.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/strings/StringUtils.h>
 
@@ -8,35 +9,6 @@
 #include <new>
 
 namespace tessel {
-namespace {
-
-ThMutex gPathMutex = nullptr;
-thread_local uint32 tPathLockDepth = 0;
-
-}  // namespace
-
-// ---- the path mutex -------------------------------------------------------------------------------------------------
-
-void PathLock::Acquire() {
-    if (tPathLockDepth++ == 0) ThMutexAcquire(gPathMutex);
-}
-
-void PathLock::Release() {
-    if (--tPathLockDepth == 0) ThMutexRelease(gPathMutex);
-}
-
-MgErr PathLock::CreateMutex() {
-    return ThMutexCreate(&gPathMutex, "PathMutex");
-}
-
-void PathLock::DestroyMutex() {
-    ThMutexDestroy(gPathMutex);
-    gPathMutex = nullptr;
-}
-
-ThMutex PathLock::Mutex() {
-    return gPathMutex;
-}
 
 // ---- walking --------------------------------------------------------------------------------------------------------
 
@@ -50,12 +22,6 @@ PathItemElement* PathItemElement::AtDepth(int32 depth) const {
     PathItemElement* element = const_cast<PathItemElement*>(this);
     while (element->depth_ > depth) element = element->parent_;
     return element;
-}
-
-PathItemList::PathItemList(const PathItemElement* last) : count_(last ? last->Depth() : 0) {
-    if (static_cast<size_t>(count_) > few_.size()) many_.resize(static_cast<size_t>(count_));
-    items_ = many_.empty() ? few_.data() : many_.data();
-    for (; last && last->Depth() > 0; last = last->Parent()) items_[last->Depth() - 1] = last;
 }
 
 // ---- children -------------------------------------------------------------------------------------------------------

@@ -2,67 +2,15 @@
 #ifndef TESSEL_SOURCE_PATHS_PATHITEMELEMENT_H
 #define TESSEL_SOURCE_PATHS_PATHITEMELEMENT_H
 
+#include "paths/PathItemCache.h"
 #include <tessel/memory/TrackedMallocFree.h>
-#include <tessel/paths/PathCachedItem.h>
-#include <tessel/sync/ThMutex.h>
 
-#include <array>
 #include <atomic>
-#include <functional>
-#include <map>
 #include <memory>
 #include <string>
 #include <vector>
 
 namespace tessel {
-
-// The path mutex guards the children and the cached items of every element, and the end of elements. The storage mutex
-// may be taken inside. A thread may hold it more than once, so that what is called with it held can use paths.
-class PathLock {
-public:
-    PathLock() { Acquire(); }
-    ~PathLock() { Release(); }
-    PathLock(const PathLock&) = delete;
-    PathLock& operator=(const PathLock&) = delete;
-
-    static void Acquire();
-    static void Release();
-    static MgErr CreateMutex();
-    static void DestroyMutex();
-    static ThMutex Mutex();
-};
-
-// Cached items are the host's: they are asked and destroyed without the path mutex, held by a reference meanwhile.
-using SharedCachedItem = std::shared_ptr<PathRef::CachedItem>;
-
-// What is cached on one element.
-struct PathItemCache : TrackedObject {
-    using Map = std::map<std::string, SharedCachedItem, std::less<>,
-                         TrackedAllocator<std::pair<const std::string, SharedCachedItem>>>;
-    Map items;
-    std::unique_ptr<PathItemCache> next;
-};
-
-// Caches that were taken off their elements with the path mutex held, to be destroyed without it: the items are the
-// host's.
-class PathItemCacheList {
-public:
-    PathItemCacheList() = default;
-    ~PathItemCacheList() {
-        while (first_) first_ = std::move(first_->next);
-    }
-    PathItemCacheList(const PathItemCacheList&) = delete;
-    PathItemCacheList& operator=(const PathItemCacheList&) = delete;
-
-    void Add(std::unique_ptr<PathItemCache>& cache) {
-        if (!cache) return;
-        cache->next = std::move(first_);
-        first_ = std::move(cache);
-    }
-
-private:
-    std::unique_ptr<PathItemCache> first_;
-};
 
 // An element is a slot of PathItemStorage. Name, parent and depth do not change while it is in use, and it is in use as
 // long as somebody retains it: a path, a child, or the table of bases and standard locations. They are read without a
@@ -131,22 +79,6 @@ private:
     int32 depth_ = 0;
     int32 hash_ = 0;
     bool checked_ = false;  // whether the order of the children has been verified since one was added
-};
-
-// The elements of a path, the one of its first name first.
-class PathItemList {
-public:
-    explicit PathItemList(const PathItemElement* last);
-    int32 Count() const { return count_; }
-    const PathItemElement& operator[](int32 index) const { return *items_[index]; }
-    PathItemList(const PathItemList&) = delete;
-    PathItemList& operator=(const PathItemList&) = delete;
-
-private:
-    int32 count_;
-    const PathItemElement** items_;
-    std::array<const PathItemElement*, 32> few_;
-    std::vector<const PathItemElement*, TrackedAllocator<const PathItemElement*>> many_;
 };
 
 }  // namespace tessel

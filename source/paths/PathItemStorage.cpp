@@ -1,23 +1,27 @@
 #include "paths/PathItemStorage.h"
 
 #include "paths/PathItemElement.h"
+#include "paths/PathLock.h"
 #include <tessel/diagnostics/DebugStream.h>
+#include <tessel/memory/TrackedMallocFree.h>
+#include <tessel/sync/ThMutex.h>
 
 #include <bit>
 #include <map>
 #include <new>
+#include <utility>
 
 namespace tessel {
 namespace {
 
-constexpr uint32 kSlotsPerBlock = 512;
+constexpr uint32 kElementsPerBlock = 512;
 constexpr int kBaseCount = 5;
 
 struct Block {
     Block* next = this;
-    uint32 cursor = kSlotsPerBlock - 1;
-    std::atomic<uint32> freeSlots{kSlotsPerBlock};
-    PathItemElement slots[kSlotsPerBlock];
+    uint32 cursor = kElementsPerBlock - 1;
+    std::atomic<uint32> freeSlots{kElementsPerBlock};
+    PathItemElement slots[kElementsPerBlock];
 };
 
 // A block lies at a multiple of this, so that the address of a slot gives that of its block.
@@ -114,28 +118,28 @@ private:
 using Locations = std::map<std::string, PathItemElement*, std::less<>,
                            TrackedAllocator<std::pair<const std::string, PathItemElement*>>>;
 
-ThMutex gStorageMutex = nullptr;
-Block* gCurrentBlock = nullptr;
-BlockSet gBlocks;
-Locations* gLocations = nullptr;
+ThMutex storageMutex = nullptr;
+Block* currentBlock = nullptr;
+BlockSet blocks;
+Locations* locations = nullptr;
 
-std::atomic<PathItemElement*> gStandards[kBaseCount];
-std::atomic<bool> gStandardsRead{false};
+std::atomic<PathItemElement*> standards[kBaseCount];
+std::atomic<bool> standardsRead{false};
 
 Block* NewBlock() {
     void* room = ::operator new (sizeof(Block), std::align_val_t{kBlockAlignment}, std::nothrow);
     if (!room) return nullptr;
     Block* block = new (room) Block;
-    if (!gBlocks.Add(block)) {
+    if (!blocks.Add(block)) {
         block->~Block();
         ::operator delete (room, std::align_val_t{kBlockAlignment});
         return nullptr;
     }
-    if (gCurrentBlock) {
-        block->next = gCurrentBlock->next;
-        gCurrentBlock->next = block;
+    if (currentBlock) {
+        block->next = currentBlock->next;
+        currentBlock->next = block;
     }
-    gCurrentBlock = block;
+    currentBlock = block;
     return block;
 }
 
@@ -143,31 +147,31 @@ Block* NewBlock() {
 void FreeBlockAfter(Block* before) {
     Block* block = before->next;
     before->next = block->next;
-    if (gCurrentBlock == block) gCurrentBlock = before == block ? nullptr : before;
-    gBlocks.Remove(block);
+    if (currentBlock == block) currentBlock = before == block ? nullptr : before;
+    blocks.Remove(block);
     block->~Block();
     ::operator delete (block, std::align_val_t{kBlockAlignment});
 }
 
 template <class Visitor>
 void ForEachBlock(Visitor visit) {
-    Block* block = gCurrentBlock;
+    Block* block = currentBlock;
     if (!block) return;
     do {
         visit(*block);
         block = block->next;
-    } while (block != gCurrentBlock);
+    } while (block != currentBlock);
 }
 
 bool IsUnused(const Block& block) {
-    return block.freeSlots.load(std::memory_order_acquire) == kSlotsPerBlock;
+    return block.freeSlots.load(std::memory_order_acquire) == kElementsPerBlock;
 }
 
 PathItemElement* ClaimSlot(Block& block) {
     if (block.freeSlots.load(std::memory_order_acquire) == 0) return nullptr;
-    for (uint32 i = 0; i < kSlotsPerBlock; ++i) {
+    for (uint32 i = 0; i < kElementsPerBlock; ++i) {
         PathItemElement& slot = block.slots[block.cursor];
-        block.cursor = block.cursor ? block.cursor - 1 : kSlotsPerBlock - 1;
+        block.cursor = block.cursor ? block.cursor - 1 : kElementsPerBlock - 1;
         if (slot.Claim()) {
             block.freeSlots.fetch_sub(1, std::memory_order_relaxed);
             return &slot;
@@ -178,15 +182,15 @@ PathItemElement* ClaimSlot(Block& block) {
 
 // The first free slot from the current block on. That block becomes the current one.
 PathItemElement* ClaimAnySlot() {
-    Block* block = gCurrentBlock;
+    Block* block = currentBlock;
     if (!block) return nullptr;
     do {
         if (PathItemElement* slot = ClaimSlot(*block)) {
-            gCurrentBlock = block;
+            currentBlock = block;
             return slot;
         }
         block = block->next;
-    } while (block != gCurrentBlock);
+    } while (block != currentBlock);
     return nullptr;
 }
 
@@ -194,7 +198,7 @@ uint32 FreeUnusedBlocks() {
     uint32 unvisited = 0;
     ForEachBlock([&](Block&) { ++unvisited; });
     uint32 bytes = 0;
-    for (Block* before = gCurrentBlock; unvisited > 0; --unvisited) {
+    for (Block* before = currentBlock; unvisited > 0; --unvisited) {
         if (IsUnused(*before->next)) {
             FreeBlockAfter(before);
             bytes += sizeof(Block);
@@ -212,7 +216,7 @@ void ForEachLiveElement(Block& block, Visitor visit) {
 }
 
 void ReportLiveElements(Block& block) {
-    const uint32 live = kSlotsPerBlock - block.freeSlots.load(std::memory_order_relaxed);
+    const uint32 live = kElementsPerBlock - block.freeSlots.load(std::memory_order_relaxed);
     TESSEL_REPORT(kDebugWarning, 0x7A10D2C4u) << "Killing a storage buffer with " << live << " live object(s)";
     ForEachLiveElement(block, [](const PathItemElement& element) {
         TESSEL_REPORT(kDebugWarning, 0x7A10D2C5u) << "element= " << DbgFmtPtr(&element);
@@ -244,24 +248,24 @@ LeakedElements FindLeakedElements() {
 // ---- start and stop -------------------------------------------------------------------------------------------------
 
 MgErr PathItemStorage::Start() {
-    return ThMutexCreate(&gStorageMutex, "PathStorageMutex");
+    return ThMutexCreate(&storageMutex, "PathStorageMutex");
 }
 
 void PathItemStorage::Stop() {
     FreeUnusedBlocks();
     ForEachBlock(ReportLiveElements);
-    if (!gCurrentBlock) gBlocks.Clear();
-    gStandardsRead.store(false, std::memory_order_relaxed);
-    ThMutexDestroy(gStorageMutex);
-    gStorageMutex = nullptr;
+    if (!currentBlock) blocks.Clear();
+    standardsRead.store(false, std::memory_order_relaxed);
+    ThMutexDestroy(storageMutex);
+    storageMutex = nullptr;
 }
 
 // ---- slots ----------------------------------------------------------------------------------------------------------
 
 PathItemElement* PathItemStorage::Allocate() {
-    ThMutexHolder lock(gStorageMutex);
+    ThMutexHolder lock(storageMutex);
     PathItemElement* element = ClaimAnySlot();
-    if (!element && NewBlock()) element = ClaimSlot(*gCurrentBlock);
+    if (!element && NewBlock()) element = ClaimSlot(*currentBlock);
     return element;
 }
 
@@ -271,7 +275,7 @@ void PathItemStorage::SlotVacated(const PathItemElement* element) {
 
 bool PathItemStorage::Owns(const PathItemElement* element) {
     const Block* block = BlockOf(element);
-    if (!block || !gBlocks.Contains(block)) return false;
+    if (!block || !blocks.Contains(block)) return false;
     const uintptr_t offset = reinterpret_cast<uintptr_t>(element) - reinterpret_cast<uintptr_t>(block->slots);
     return offset < sizeof block->slots && offset % sizeof(PathItemElement) == 0;
 }
@@ -279,48 +283,47 @@ bool PathItemStorage::Owns(const PathItemElement* element) {
 // ---- bases ----------------------------------------------------------------------------------------------------------
 
 void PathItemStorage::SetStandard(PathRef::PathBase base, PathItemElement* element) {
-    if (gStandardsRead.load(std::memory_order_relaxed) && element)
+    if (standardsRead.load(std::memory_order_relaxed) && element)
         TESSEL_REPORT(kDebugWarning, 0x90C3F1A8u)
             << "Possible threading issue, see documentation note for PathItemStorage::SetStandard!";
     if (element) element->Retain();
-    if (PathItemElement* previous = gStandards[base].exchange(element)) previous->Release();
+    if (PathItemElement* previous = standards[base].exchange(element)) previous->Release();
 }
 
 PathItemElement* PathItemStorage::Standard(PathRef::PathBase base) {
-    if (!gStandardsRead.load(std::memory_order_relaxed)) gStandardsRead.store(true, std::memory_order_relaxed);
-    return gStandards[base].load(std::memory_order_acquire);
+    if (!standardsRead.load(std::memory_order_relaxed)) standardsRead.store(true, std::memory_order_relaxed);
+    return standards[base].load(std::memory_order_acquire);
 }
 
 // ---- standard locations ---------------------------------------------------------------------------------------------
 
 MgErr PathItemStorage::AddLocation(const char* name, PathItemElement* element) {
-    ThMutexHolder lock(gStorageMutex);
-    if (!gLocations) gLocations = new (TrackedNew(sizeof(Locations))) Locations;
-    if (!gLocations->emplace(name, element).second) return kArgErr;
+    ThMutexHolder lock(storageMutex);
+    if (!locations) locations = new (TrackedNew(sizeof(Locations))) Locations;
+    if (!locations->emplace(name, element).second) return kArgErr;
     element->Retain();
     return kNoErr;
 }
 
 PathItemElement* PathItemStorage::FindLocation(const char* name) {
-    ThMutexHolder lock(gStorageMutex);
-    if (!gLocations) return nullptr;
-    const auto found = gLocations->find(std::string_view(name));
-    if (found == gLocations->end()) return nullptr;
+    ThMutexHolder lock(storageMutex);
+    if (!locations) return nullptr;
+    const auto found = locations->find(std::string_view(name));
+    if (found == locations->end()) return nullptr;
     found->second->Retain();
     return found->second;
 }
 
 void PathItemStorage::ForgetLocations() {
-    Locations* locations;
+    Locations* forgotten;
     {
-        ThMutexHolder lock(gStorageMutex);
-        locations = gLocations;
-        gLocations = nullptr;
+        ThMutexHolder lock(storageMutex);
+        forgotten = std::exchange(locations, nullptr);
     }
-    if (!locations) return;
-    for (const auto& entry : *locations) entry.second->Release();
-    locations->~Locations();
-    TrackedFree(locations);
+    if (!forgotten) return;
+    for (const auto& entry : *forgotten) entry.second->Release();
+    forgotten->~Locations();
+    TrackedFree(forgotten);
 }
 
 // ---- garbage collection ---------------------------------------------------------------------------------------------
@@ -330,7 +333,7 @@ uint32 PathItemStorage::GarbageCollect(PathRef::OptimizationMethod method) {
     LeakedElements leaked;
     {
         PathLock pathLock;
-        ThMutexHolder lock(gStorageMutex);
+        ThMutexHolder lock(storageMutex);
         if (method == PathRef::kFreeUnusedAndReport) leaked = FindLeakedElements();
         if (method != PathRef::kCountOnly) bytes = FreeUnusedBlocks();
     }

@@ -22,8 +22,8 @@ namespace {
 constexpr size_t kLongestPStr = 255;
 
 // For start-up.
-Str255 gNotAPathText = {};
-Str255 gPathTooLongText = {};
+Str255 notAPathText = {};
+Str255 pathTooLongText = {};
 
 std::optional<PathRef::PathBase> BaseOfType(int32 type) {
     switch (type) {
@@ -377,23 +377,23 @@ MgErr FVolName(Path path, Path result) {
 // ---- texts for what has no text -------------------------------------------------------------------------------------
 
 void FGetNotAPathString(PStr text) {
-    if (text) PStrCpy(text, gNotAPathText);
+    if (text) PStrCpy(text, notAPathText);
 }
 
 void FSetNotAPathString(ConstPStr text) {
     if (text)
-        PStrCpy(gNotAPathText, text);
+        PStrCpy(notAPathText, text);
     else
-        gNotAPathText[0] = 0;
+        notAPathText[0] = 0;
 }
 
 void FGetPathTooLongString(PStr text) {
-    if (text) PStrCpy(text, gPathTooLongText);
+    if (text) PStrCpy(text, pathTooLongText);
 }
 
 void FSetPathTooLongString(ConstPStr text) {
     if (text)
-        PStrCpy(gPathTooLongText, text);
+        PStrCpy(pathTooLongText, text);
     else
-        gPathTooLongText[0] = 0;
+        pathTooLongText[0] = 0;
 }

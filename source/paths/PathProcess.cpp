@@ -2,7 +2,9 @@
 #include "paths/PathProcess.h"
 
 #include "diagnostics/Guarded.h"
+#include "diagnostics/ObjectTracker.h"
 #include "paths/PathItemStorage.h"
+#include "paths/PathLock.h"
 #include "paths/PathRefAccess.h"
 #include "paths/PathSteps.h"
 #include "paths/Service.h"
@@ -27,14 +29,14 @@ constexpr BaseName kBaseNames[] = {{PathRef::kAbsolute, "[absolute]"},
 static_assert(kSeparatorNotFound == PathRef::StringType::npos,
               "kSeparatorNotFoundConstantDoNotUse is not the same as PathRef::StringType::npos");
 
-std::atomic<bool> gStarted{false};
-std::atomic<AllocTracker*> gPathTracker{nullptr};
+std::atomic<bool> started{false};
+ObjectTracker pathTracker;
 
 // Set during start-up.
-bool gDebugMode = false;
-bool gAlwaysUtf8 = false;
-std::string gNotAPathString;
-std::string gPathTooLongString;
+bool debugMode = false;
+bool alwaysUtf8 = false;
+std::string notAPathString;
+std::string pathTooLongString;
 
 void MakeBases() {
     for (const BaseName& entry : kBaseNames) {
@@ -79,7 +81,7 @@ public:
 };
 
 void ReportPathLeaks() {
-    AllocTracker* tracker = gPathTracker.load();
+    AllocTracker* tracker = pathTracker.Get();
     if (!tracker || tracker->CountLive() == 0) return;
     PathLeakDumper dumper;
     dumper.DumpLeaks(*tracker);
@@ -91,7 +93,7 @@ void TearDown() {
     ReleaseExtensionLists();
     PathItemStorage::Stop();
     PathLock::DestroyMutex();
-    DestroyAllocTracker(gPathTracker.exchange(nullptr));
+    pathTracker.Stop();
 }
 
 }  // namespace
@@ -99,8 +101,8 @@ void TearDown() {
 // ---- start and stop -------------------------------------------------------------------------------------------------
 
 void PathRef::Init() {
-    if (gStarted) return;
-    gPathTracker = CreateAllocTracker();
+    if (started) return;
+    pathTracker.Start();
     try {
         MgErr err = PathLock::CreateMutex();
         if (!err) err = PathItemStorage::Start();
@@ -110,13 +112,13 @@ void PathRef::Init() {
         TearDown();
         throw;
     }
-    gStarted = true;
+    started = true;
 }
 
 void PathRef::UnInit() {
-    if (!gStarted) return;
+    if (!started) return;
     ReportPathLeaks();
-    gStarted = false;
+    started = false;
     TearDown();
 }
 
@@ -135,17 +137,16 @@ MgErr PathManagerStop() {
 }
 
 void TrackPathObject(const void* frame, const void* object, size_t size) {
-    if (AllocTracker* tracker = gPathTracker.load(std::memory_order_acquire))
-        tracker->AddRecordFrom(frame, object, static_cast<uint32>(size), __FILE__, __LINE__);
+    pathTracker.Add(frame, object, static_cast<uint32>(size), __FILE__, __LINE__);
 }
 
 void UntrackPathObject(const void* object) {
-    if (AllocTracker* tracker = gPathTracker.load(std::memory_order_acquire)) tracker->RemoveRecord(object);
+    pathTracker.Remove(object);
 }
 
 const PathRef& PathRef::NotAPath() {
     static const PathRef notAPath;
-    if (!gStarted)
+    if (!started)
         TESSEL_REPORT(kDebugWarning, 0x8E2D6C53u)
             << "Call to GetNotAPath before PathRef::Init() or after PathRef::Uninit()?";
     return notAPath;
@@ -155,22 +156,22 @@ const PathRef& PathRef::NotAPath() {
 
 void PathRef::Setting(const char* setting) {
     if (!setting) return;
-    if (std::strcmp(setting, "debug") == 0) gDebugMode = true;
-    if (std::strcmp(setting, "nodebug") == 0) gDebugMode = false;
-    if (std::strcmp(setting, "utf8") == 0) gAlwaysUtf8 = true;
-    if (std::strcmp(setting, "sysenc") == 0) gAlwaysUtf8 = false;
+    if (std::strcmp(setting, "debug") == 0) debugMode = true;
+    if (std::strcmp(setting, "nodebug") == 0) debugMode = false;
+    if (std::strcmp(setting, "utf8") == 0) alwaysUtf8 = true;
+    if (std::strcmp(setting, "sysenc") == 0) alwaysUtf8 = false;
 }
 
 bool& PathRef::DebugModeEnabled() {
-    return gDebugMode;
+    return debugMode;
 }
 
 bool FlattensAlwaysAsUtf8() {
-    return gAlwaysUtf8;
+    return alwaysUtf8;
 }
 
 bool StepsByCharacters() {
-    return gStarted.load(std::memory_order_relaxed);
+    return started.load(std::memory_order_relaxed);
 }
 
 uint32 PathRef::GarbageCollect(OptimizationMethod method) {
@@ -178,19 +179,19 @@ uint32 PathRef::GarbageCollect(OptimizationMethod method) {
 }
 
 const PathRef::StringType& PathRef::GetNotAPathString() {
-    return gNotAPathString;
+    return notAPathString;
 }
 
 void PathRef::SetNotAPathString(const StringType& text) {
-    gNotAPathString = text;
+    notAPathString = text;
 }
 
 const PathRef::StringType& PathRef::GetPathTooLongString() {
-    return gPathTooLongString;
+    return pathTooLongString;
 }
 
 void PathRef::SetPathTooLongString(const StringType& text) {
-    gPathTooLongString = text;
+    pathTooLongString = text;
 }
 
 }  // namespace tessel

@@ -1,7 +1,9 @@
 // PathRef: construction, names, relations, comparison and checks. Texts, the flattened form, extensions, cached
 // attributes and the file system have files of their own.
 #include "diagnostics/Guarded.h"
+#include "paths/PathItemList.h"
 #include "paths/PathItemStorage.h"
+#include "paths/PathLock.h"
 #include "paths/PathProcess.h"
 #include "paths/PathRefAccess.h"
 #include <tessel/base/OVExcept.h>
@@ -105,7 +107,7 @@ PathRef::PathRef(const PathRef& other) noexcept {
 }
 
 PathRef::PathRef(PathRef&& other) noexcept
-    : mPathElement(std::exchange(other.mPathElement, nullptr)), mTextCache(std::exchange(other.mTextCache, nullptr)) {
+    : mPathElement(std::exchange(other.mPathElement, nullptr)), textCache_(std::exchange(other.textCache_, nullptr)) {
 }
 
 PathRef& PathRef::operator=(const PathRef& other) {
@@ -125,9 +127,9 @@ PathRef& PathRef::operator=(PathRef&& other) noexcept {
 
 PathRef::~PathRef() {
     if (mPathElement) mPathElement->Release();
-    if (!mTextCache) return;
-    mTextCache->~StringType();
-    TrackedFree(mTextCache);
+    if (!textCache_) return;
+    textCache_->~StringType();
+    TrackedFree(textCache_);
 }
 
 PathRef::PathRef(const char* standardLocationName) {
@@ -188,8 +190,8 @@ void PathRef::TakeOver(PathItemElement* element) noexcept {
 }
 
 PathRef::StringType& PathRef::TextCache() {
-    if (!mTextCache) mTextCache = ::new (TrackedNew(sizeof(StringType))) StringType;
-    return *mTextCache;
+    if (!textCache_) textCache_ = ::new (TrackedNew(sizeof(StringType))) StringType;
+    return *textCache_;
 }
 
 uint32 PathRef::MemorySize() {

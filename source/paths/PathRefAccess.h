@@ -7,6 +7,8 @@
 
 namespace tessel {
 
+class PathItemList;
+
 struct PathRefAccess {
     static PathItemElement* Element(const PathRef& path) { return path.mPathElement; }
     // What GetCachedProxy finds, held so that it stays while it is used. No lock is held while items are asked.

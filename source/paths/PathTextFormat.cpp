@@ -1,70 +1,10 @@
-// Paths as text: the formats, and the writers.
-#include "diagnostics/Guarded.h"
+#include "paths/PathTextFormat.h"
+
+#include "paths/PathItemList.h"
 #include "paths/PathRefAccess.h"
 #include "paths/PathSteps.h"
-#include "paths/PathTextWriters.h"
-#include <tessel/base/OVExcept.h>
-#include <tessel/paths/PathCachedItem.h>
-
-#include <cstring>
-#include <new>
 
 namespace tessel {
-namespace {
-
-constexpr uint32 kForever = 2147483647;  // the longest lifetime, in milliseconds
-
-enum class Writer { kWindows, kUnix, kPlatformIndependent };
-
-struct TextFormat {
-    const char* name;
-    const char* cacheKey;  // of the finished text
-    Writer writer;
-};
-constexpr TextFormat kDisplay = {"pathref_display", "internal_display", Writer::kWindows};
-constexpr TextFormat kCommandLine = {"pathref_commandline", "internal_commandline", Writer::kWindows};
-constexpr TextFormat kDOS = {"pathref_dos", "internal_dos", Writer::kWindows};
-constexpr TextFormat kUnix = {"pathref_unix", "internal_unix", Writer::kUnix};
-constexpr TextFormat kIndependent = {"pathref_platformindependent", "internal_platformindependent",
-                                     Writer::kPlatformIndependent};
-constexpr TextFormat kAgnostic = {"pathref_platformagnostic", "internal_platformindependent",
-                                  Writer::kPlatformIndependent};
-
-const TextFormat* FindFormat(const char* name) {
-    for (const TextFormat* format : {&kDisplay, &kCommandLine, &kDOS, &kUnix, &kIndependent, &kAgnostic})
-        if (std::strcmp(format->name, name) == 0) return format;
-    return nullptr;
-}
-
-bool ReadCachedText(const PathRef& path, const TextFormat& format, std::string& text) {
-    const SharedCachedItem item =
-        PathRefAccess::CachedItem(path, format.cacheKey, PathRef::CachedPathString::ClassName(), PathRef::kSearchHere);
-    if (item) text = static_cast<const PathRef::CachedPathString*>(item.get())->Get();
-    return item != nullptr;
-}
-
-void CacheText(const PathRef& path, const TextFormat& format, const std::string& text) {
-    path.Cache(format.cacheKey, new PathRef::CachedPathString(kForever, PathRef::CachedItem::kIndependent, text));
-}
-
-MgErr WriteWith(Writer writer, const PathRef& path, std::string& text) {
-    switch (writer) {
-        case Writer::kWindows: {
-            PathTextFormatWin format;
-            return WritePathText(path, format, 0, text);
-        }
-        case Writer::kUnix: {
-            PathTextFormatUNIX format;
-            return WritePathText(path, format, 0, text);
-        }
-        case Writer::kPlatformIndependent:
-            break;
-    }
-    PathTextFormatPlatformIndependent format;
-    return WritePathText(path, format, 0, text);
-}
-
-}  // namespace
 
 // ---- the base writer ------------------------------------------------------------------------------------------------
 
@@ -191,45 +131,6 @@ MgErr WritePathText(const PathRef& path, PathTextFormat& format, int32 elided, s
             format.Finish(text, names.Count());
     }
     return kNoErr;
-}
-
-const char* PathRef::StringDisplay() {
-    return kDisplay.name;
-}
-const char* PathRef::StringCommandLine() {
-    return kCommandLine.name;
-}
-const char* PathRef::StringDOS() {
-    return kDOS.name;
-}
-const char* PathRef::StringUnix() {
-    return kUnix.name;
-}
-const char* PathRef::StringPlatformIndependent() {
-    return kIndependent.name;
-}
-const char* PathRef::StringPlatformAgnostic() {
-    return kAgnostic.name;
-}
-
-MgErr PathRef::ConvertToString(StringType* out, const char* formatName) const {
-    if (!out || !formatName) return kArgErr;
-    const TextFormat* format = FindFormat(formatName);
-    if (!format) return kUnsupportedErr;
-    if (format == &kCommandLine && (ItemCount() == 0 || !IsValid())) return kArgErr;
-    return Guarded([&]() -> MgErr {
-        if (ReadCachedText(*this, *format, *out)) return kNoErr;
-        const MgErr err = WriteWith(format->writer, *this, *out);
-        if (!err && mPathElement) CacheText(*this, *format, *out);
-        return err;
-    });
-}
-
-const PathRef::StringType& PathRef::ToString(const char* format) {
-    StringType& text = TextCache();
-    const MgErr err = ConvertToString(&text, format);
-    if (err) TESSEL_THROW(err, "PathRef ToString");
-    return text;
 }
 
 }  // namespace tessel

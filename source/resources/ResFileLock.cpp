@@ -1,6 +1,6 @@
 #include "resources/ResFileLock.h"
 
-#include <tessel/sync/ThMutex.h>
+#include "sync/RecursiveMutex.h"
 
 #include <algorithm>
 
@@ -8,8 +8,8 @@ namespace tessel {
 
 namespace {
 
-ThMutex gResFileMutex = nullptr;
-thread_local int32 tHeld = 0;  // how often this thread holds the lock
+RecursiveMutex resFileMutex;
+thread_local uint32 held = 0;  // how often this thread holds the lock
 
 using Report = void (*)();
 
@@ -30,27 +30,23 @@ void MakeReports() {
 }  // namespace
 
 ResFileLock::ResFileLock() {
-    if (tHeld++ == 0) ThMutexAcquire(gResFileMutex);
+    resFileMutex.Acquire(held);
 }
 
 ResFileLock::~ResFileLock() {
-    if (--tHeld != 0) return;
-    ThMutexRelease(gResFileMutex);
-    if (tReportCount) MakeReports();
+    if (resFileMutex.Release(held) && tReportCount) MakeReports();
 }
 
 MgErr ResFileLock::Create() {
-    if (gResFileMutex) return kNoErr;
-    return ThMutexCreate(&gResFileMutex, "ResourceFile");
+    return resFileMutex.Create("ResourceFile");
 }
 
 void ResFileLock::Destroy() {
-    ThMutexDestroy(gResFileMutex);
-    gResFileMutex = nullptr;
+    resFileMutex.Destroy();
 }
 
 void ReportUnlocked(Report report) {
-    if (tHeld == 0) return report();
+    if (held == 0) return report();
     Report* const end = tReports + tReportCount;
     if (std::find(tReports, end, report) == end && tReportCount < kMostReports) tReports[tReportCount++] = report;
 }

@@ -1,9 +1,9 @@
+#include "diagnostics/ObjectTracker.h"
 #include "platform/LastError.h"
 #include "platform/MessageEvent.h"
 #include "sync/HostEvent.h"
 #include "sync/PlainAllocation.h"
 #include "sync/Service.h"
-#include "sync/SyncTracker.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/sync/ThEvent.h>
 
@@ -13,7 +13,7 @@ namespace tessel {
 namespace {
 
 constexpr int32 kExpectedEvents = 1;  // left over without a report; a start and stop leaves none
-SyncTracker eventTracker;
+ObjectTracker eventTracker;
 
 struct EventRecord : THEVENTREC, PlainAllocation {};
 
@@ -73,7 +73,7 @@ MgErr ThEventStart() {
 }
 
 MgErr ThEventStop() {
-    eventTracker.Stop(kExpectedEvents, "Event Leaks", "ovEventLeaks.txt");
+    eventTracker.StopAndReport(kExpectedEvents, "Event Leaks", "ovEventLeaks.txt");
     return kNoErr;
 }
 

@@ -1,7 +1,7 @@
+#include "diagnostics/ObjectTracker.h"
 #include "platform/Thread.h"
 #include "sync/PlainAllocation.h"
 #include "sync/Service.h"
-#include "sync/SyncTracker.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/sync/ThMutex.h>
 
@@ -12,7 +12,7 @@ namespace {
 
 constexpr int32 kFree = -1;
 constexpr int32 kExpectedMutexes = 1;  // left over without a report; a start and stop leaves none
-SyncTracker mutexTracker;
+ObjectTracker mutexTracker;
 
 struct MutexRecord : THMUTEXREC, PlainAllocation {};
 
@@ -54,7 +54,7 @@ MgErr ThMutexStart() {
 }
 
 MgErr ThMutexStop() {
-    mutexTracker.Stop(kExpectedMutexes, "Mutex Leaks", "ovMutexLeaks.txt");
+    mutexTracker.StopAndReport(kExpectedMutexes, "Mutex Leaks", "ovMutexLeaks.txt");
     return kNoErr;
 }
 

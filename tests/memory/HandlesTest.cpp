@@ -1,3 +1,5 @@
+#include "diagnostics/AllocTracking.h"
+#include "memory/Heap.h"
 #include "support/StartedMemory.h"
 #include <tessel/memory/MemoryManager.h>
 
@@ -11,9 +13,17 @@ namespace {
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
-struct Handles : ::testing::Test {
+struct Tracking {
+    explicit Tracking(bool on) { SetAllocTracking(on); }
+    ~Tracking() { SetAllocTracking(true); }
+};
+
+// Handles that are tracked, and those that go the short ways.
+struct Handles : ::testing::TestWithParam<bool> {
+    Tracking tracking{GetParam()};
     test::StartedMemory memory;
 };
+INSTANTIATE_TEST_SUITE_P(Tracked, Handles, ::testing::Bool());
 
 std::string Content(UHandle h) {
     return std::string(reinterpret_cast<const char*>(*h), DSGetHandleSize(h));
@@ -29,7 +39,7 @@ bool IsAligned(UHandle h, uint32 alignment, uint32 offset) {
     return (reinterpret_cast<uintptr_t>(*h) + offset) % alignment == 0;
 }
 
-TEST_F(Handles, AreAlignedByTheirSize) {
+TEST_P(Handles, AreAlignedByTheirSize) {
     struct Case {
         uint32 size, alignment, offset;
     };
@@ -47,7 +57,7 @@ TEST_F(Handles, AreAlignedByTheirSize) {
 }
 
 // A step that is large for the size places the data by the size; small steps rarely move them.
-TEST_F(Handles, GrowInSmallStepsWithoutMovingEachTime) {
+TEST_P(Handles, GrowInSmallStepsWithoutMovingEachTime) {
     UHandle h = DSNewHandle(4096);
     uint32 moves = 0;
     for (uint32 size = 4097; size <= 300000; ++size) {
@@ -65,7 +75,7 @@ TEST_F(Handles, GrowInSmallStepsWithoutMovingEachTime) {
     EXPECT_EQ(kNoErr, DSDisposeHandle(h));
 }
 
-TEST_F(Handles, KeepTheirBytesAndAlignmentThroughResizes) {
+TEST_P(Handles, KeepTheirBytesAndAlignmentThroughResizes) {
     std::mt19937 random(1);
     const uint32 sizes[] = {0, 3, 17, 100, 1000, 5000, 70000, 300000};
     for (uint32 alignment : {0u, 8u, 9u, 64u, 100u, 4096u}) {
@@ -92,7 +102,7 @@ TEST_F(Handles, KeepTheirBytesAndAlignmentThroughResizes) {
     }
 }
 
-TEST_F(Handles, MoveOnlyWhenTheyMust) {
+TEST_P(Handles, MoveOnlyWhenTheyMust) {
     uint32 counters[4] = {0, 0, 0, 0};
     UHandle h = DSNewHandle(17);
     UPtr data = *h;
@@ -132,11 +142,13 @@ TEST_F(Handles, MoveOnlyWhenTheyMust) {
     DSDisposeHandle(eights);
 }
 
-TEST_F(Handles, AreRecognised) {
+TEST_P(Handles, AreRecognised) {
+    const uint64 before = heap::TotalAllocated();
     UHandle first = DSNewHandle(1), second = DSNewHandle(2);
     EXPECT_EQ(1, IsDSHandle(first));
     EXPECT_EQ(kNoErr, DSDisposeHandle(first));
     EXPECT_EQ(kNoErr, DSDisposeHandle(second));
+    EXPECT_EQ(before, heap::TotalAllocated());
     EXPECT_EQ(0, IsDSHandle(first));  // a free slot
     EXPECT_EQ(kHandleErr, DSCheckHandle(first));
     EXPECT_EQ(second, DSNewHandle(5));  // last freed, first reused
@@ -172,7 +184,7 @@ TEST_F(Handles, AreRecognised) {
     DSDisposeHandle(second);
 }
 
-TEST_F(Handles, AreMadeResizedAndDroppedThroughTheirAddress) {
+TEST_P(Handles, AreMadeResizedAndDroppedThroughTheirAddress) {
     UHandle h = nullptr;
     EXPECT_EQ(kNoErr, DataSetHandleSizeOrNewHandle(&h, 0));
     EXPECT_EQ(nullptr, h);
@@ -197,7 +209,7 @@ TEST_F(Handles, AreMadeResizedAndDroppedThroughTheirAddress) {
     EXPECT_THAT(memory.reports.Texts(), ElementsAre("Memory error 1 in DSDisposePtr"));
 }
 
-TEST_F(Handles, AreCopiedAndAppended) {
+TEST_P(Handles, AreCopiedAndAppended) {
     UHandle source = Make("source"), copy = nullptr;
     EXPECT_EQ(kNoErr, DSCopyHandle(&copy, source));
     EXPECT_EQ("source", Content(copy));
@@ -243,7 +255,7 @@ void TraceCall(int32 kind, MgErr err, UHandle h, uint32 newSize, uint32 oldSize)
                     std::to_string(newSize) + ' ' + std::to_string(oldSize));
 }
 
-TEST_F(Handles, AreTracedAndTellWhenMemoryIsFull) {
+TEST_P(Handles, AreTracedAndTellWhenMemoryIsFull) {
     calls.clear();
     SetMemEventTraceProc(TraceCall);
     EXPECT_EQ(nullptr, SetMemFullProc([](uint32 size) { calls.push_back("full " + std::to_string(size)); }));
@@ -263,14 +275,15 @@ TEST_F(Handles, AreTracedAndTellWhenMemoryIsFull) {
     EXPECT_EQ(nullptr, SetMemFullProc(nullptr));  // the stop removed it
 }
 
-TEST_F(Handles, AreRecoveredAtTheStop) {
+TEST_P(Handles, AreRecoveredAtTheStop) {
     Make("twelve bytes");
     DSDisposeHandle(Make("gone"));
     Make("abc");
     EXPECT_TRUE(GetMemoryManagerInitialized());
     memory.Stop();
     EXPECT_FALSE(GetMemoryManagerInitialized());
-    EXPECT_THAT(memory.reports.Texts(), ::testing::Contains(::testing::EndsWith("2 Handle Leaks (0 expected)")));
+    EXPECT_THAT(memory.reports.Texts(),
+                ::testing::Contains(::testing::EndsWith("2 Handle Leaks (0 expected)")).Times(GetParam()));
     EXPECT_TRUE(memory.reports.Has(kDebugInfo, "Recovered 2 Handles for 15 bytes."));
     EXPECT_THAT(memory.reports.Texts(), ::testing::Contains(::testing::EndsWith(", size 3 still allocated.")));
 }

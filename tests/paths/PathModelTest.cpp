@@ -1,4 +1,5 @@
 // The elements of paths, their names and their relations.
+#include "paths/PathLock.h"
 #include "paths/PathRefAccess.h"
 #include "paths/PathTestSupport.h"
 #include <tessel/memory/MemoryManager.h>

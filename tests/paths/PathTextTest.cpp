@@ -3,7 +3,7 @@
 #include "platform/CodePage.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathAbbreviation.h>
-#include <tessel/paths/PathTextFormat.h>
+#include <tessel/paths/PathText.h>
 
 namespace tessel {
 namespace {

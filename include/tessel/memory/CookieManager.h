@@ -71,7 +71,7 @@ public:
     CookieList(const CookieList&) = delete;
     CookieList& operator=(const CookieList&) = delete;
 
-    int32 GetCount() const { return fCount; }
+    int32 GetCount() const { return count_; }
     // 0 when i is out of range.
     MagicCookie GetCookie(int32 i) const;
     // kArgErr when i is out of range.
@@ -80,8 +80,8 @@ public:
     MgErr SetCount(int32 count);
 
 private:
-    int32 fCount = 0;
-    UHandle fCookies = nullptr;
+    int32 count_ = 0;
+    UHandle cookies_ = nullptr;
 };
 
 // A jar as an object. Its methods are the flat functions above, called with its jar. Infos are `infoSize` bytes.
@@ -113,11 +113,11 @@ public:
     // Lowers the count and returns what it was: 1 when the cookie has ended now. 0: nothing to release.
     int32 ReleaseCookieRights(const MagicCookie& cookie);
 
-    bool IsAValidJar() const { return fJar != nullptr; }
+    bool IsAValidJar() const { return jar_ != nullptr; }
     MgErr GetNumCookies(int32* count);
 
 private:
-    MagicCookieJar fJar = nullptr;
+    MagicCookieJar jar_ = nullptr;
 };
 
 // A jar of pointers: T is a pointer type.

@@ -11,6 +11,8 @@
 #ifdef __cplusplus
 #    include <tessel/memory/TrackedMallocFree.h>
 
+#    include <type_traits>
+
 namespace tessel {
 
 class TESSEL_API PathRef::CachedItem : public TrackedObject {
@@ -41,60 +43,62 @@ private:
     uint8 invalidate_;
 };
 
-class TESSEL_API PathRef::CachedBool : public PathRef::CachedItem {
+// What the items that hold a value have in common. `Item` is the class that derives from it.
+template <class Item, class Value>
+class TESSEL_API PathRef::CachedValue : public PathRef::CachedItem {
+public:
+    using Argument = std::conditional_t<std::is_scalar_v<Value>, Value, const Value&>;
+
+    bool IsA(const char* className) const override;
+    uint32 Size() const override;
+    Argument Get() const { return value_; }
+
+protected:
+    CachedValue(uint32 lifetime, RelationToMetaData relation, Argument value);
+    ~CachedValue() override;
+    void ResetValue(uint32 lifetime, Argument value);
+
+private:
+    Value value_;
+};
+
+extern template class PathRef::CachedValue<PathRef::CachedBool, bool>;
+extern template class PathRef::CachedValue<PathRef::CachedInt32, int32>;
+extern template class PathRef::CachedValue<PathRef::CachedPathString, PathRef::StringType>;
+extern template class PathRef::CachedValue<PathRef::CachedPath, PathRef>;
+
+class TESSEL_API PathRef::CachedBool : public PathRef::CachedValue<PathRef::CachedBool, bool> {
 public:
     CachedBool(uint32 lifetime, RelationToMetaData relation, bool value);
     ~CachedBool() override;
-    bool IsA(const char* className) const override;
-    uint32 Size() const override;
     virtual void ResetBool(uint32 lifetime, bool value);
-    bool Get() const { return value_; }
     static const char* ClassName();
-
-private:
-    bool value_;
 };
 
-class TESSEL_API PathRef::CachedInt32 : public PathRef::CachedItem {
+class TESSEL_API PathRef::CachedInt32 : public PathRef::CachedValue<PathRef::CachedInt32, int32> {
 public:
     CachedInt32(uint32 lifetime, RelationToMetaData relation, int32 value);
     ~CachedInt32() override;
-    bool IsA(const char* className) const override;
-    uint32 Size() const override;
     virtual void ResetInt32(uint32 lifetime, int32 value);
-    int32 Get() const { return value_; }
     static const char* ClassName();
-
-private:
-    int32 value_;
 };
 
-class TESSEL_API PathRef::CachedPathString : public PathRef::CachedItem {
+class TESSEL_API PathRef::CachedPathString
+    : public PathRef::CachedValue<PathRef::CachedPathString, PathRef::StringType> {
 public:
     CachedPathString(uint32 lifetime, RelationToMetaData relation, const StringType& value);
     ~CachedPathString() override;
-    bool IsA(const char* className) const override;
     uint32 Size() const override;
     virtual void ResetString(uint32 lifetime, const StringType& value);
-    const StringType& Get() const { return value_; }
     static const char* ClassName();
-
-private:
-    StringType value_;
 };
 
-class TESSEL_API PathRef::CachedPath : public PathRef::CachedItem {
+class TESSEL_API PathRef::CachedPath : public PathRef::CachedValue<PathRef::CachedPath, PathRef> {
 public:
     CachedPath(uint32 lifetime, RelationToMetaData relation, const PathRef& value);
     ~CachedPath() override;
-    bool IsA(const char* className) const override;
-    uint32 Size() const override;
     virtual void ResetPath(uint32 lifetime, const PathRef& value);
-    const PathRef& Get() const { return value_; }
     static const char* ClassName();
-
-private:
-    PathRef value_;
 };
 
 }  // namespace tessel

@@ -64,6 +64,8 @@ public:
     };
 
     class CachedItem;  // paths/PathCachedItem.h
+    template <class Item, class Value>
+    class CachedValue;
     class CachedBool;
     class CachedInt32;
     class CachedPathString;
@@ -282,7 +284,7 @@ private:
     StringType& TextCache();
 
     PathItemElement* mPathElement = nullptr;
-    StringType* mTextCache = nullptr;
+    StringType* textCache_ = nullptr;
 };
 
 // Where SplitOn splits a path.

@@ -1,15 +1,16 @@
 // Names for the system, and which names a file can have.
-#include "paths/FileNames.h"
-
 #include "diagnostics/Guarded.h"
+#include "paths/PathItemList.h"
 #include "paths/PathRefAccess.h"
 #include "paths/PathSteps.h"
 #include "paths/ShortcutResolver.h"
 #include <tessel/paths/PathManager.h>
-#include <tessel/paths/PathTextFormat.h>
+#include <tessel/paths/PathText.h>
 
 #include <algorithm>
 #include <cstring>
+#include <string>
+#include <string_view>
 
 namespace tessel {
 namespace {
@@ -46,6 +47,22 @@ bool IsReserved(std::string_view name) {
 bool IsShortcutName(std::string_view name) {
     return name.size() >= kShortcutSuffix.size() &&
            EqualIgnoringCase(name.substr(name.size() - kShortcutSuffix.size()), kShortcutSuffix);
+}
+
+// What is wrong with a name that is not empty: 0, or kFileName... flags. Offending characters are appended to `bad`,
+// which may be null.
+int32 CheckFileName(std::string_view name, std::string* bad) {
+    int32 flags = IsReserved(name) ? kFileNameReserved : 0;
+    for (size_t i = 0; i < name.size();) {
+        const size_t next = NextCharacter(name, i);
+        if (next == i + 1 && kBadCharacters.find(name[i]) != std::string_view::npos) {
+            flags |= kFileNameBadChar;
+            if (bad) bad->push_back(name[i]);
+        }
+        i = next;
+    }
+    if (!name.empty() && name.back() == '.') flags |= kFileNameEndsInDot;
+    return flags;
 }
 
 // Whether the name is two backslashes, a server and a share, which may be empty. Without them, or with steps up in
@@ -87,20 +104,6 @@ MgErr MakeName(const PathRef& path, std::string& text, bool& shortcut) {
 }
 
 }  // namespace
-
-int32 CheckFileName(std::string_view name, std::string* bad) {
-    int32 flags = IsReserved(name) ? kFileNameReserved : 0;
-    for (size_t i = 0; i < name.size();) {
-        const size_t next = NextCharacter(name, i);
-        if (next == i + 1 && kBadCharacters.find(name[i]) != std::string_view::npos) {
-            flags |= kFileNameBadChar;
-            if (bad) bad->push_back(name[i]);
-        }
-        i = next;
-    }
-    if (!name.empty() && name.back() == '.') flags |= kFileNameEndsInDot;
-    return flags;
-}
 
 }  // namespace tessel
 

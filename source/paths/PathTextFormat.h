@@ -1,6 +1,6 @@
 // How the names of a path become text: one writer for each kind of text.
-#ifndef TESSEL_SOURCE_PATHS_PATHTEXTWRITERS_H
-#define TESSEL_SOURCE_PATHS_PATHTEXTWRITERS_H
+#ifndef TESSEL_SOURCE_PATHS_PATHTEXTFORMAT_H
+#define TESSEL_SOURCE_PATHS_PATHTEXTFORMAT_H
 
 #include <tessel/paths/PathRef.h>
 

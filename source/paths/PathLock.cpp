@@ -1,0 +1,33 @@
+#include "paths/PathLock.h"
+
+#include "sync/RecursiveMutex.h"
+
+namespace tessel {
+namespace {
+
+RecursiveMutex pathMutex;
+thread_local uint32 pathMutexHeld = 0;
+
+}  // namespace
+
+void PathLock::Acquire() {
+    pathMutex.Acquire(pathMutexHeld);
+}
+
+void PathLock::Release() {
+    pathMutex.Release(pathMutexHeld);
+}
+
+MgErr PathLock::CreateMutex() {
+    return pathMutex.Create("PathMutex");
+}
+
+void PathLock::DestroyMutex() {
+    pathMutex.Destroy();
+}
+
+ThMutex PathLock::Mutex() {
+    return pathMutex.Get();
+}
+
+}  // namespace tessel
