@@ -6,6 +6,7 @@
 #include <tessel/sync/ThEvent.h>
 #include <tessel/threads/ThThread.h>
 
+#include <algorithm>
 #include <atomic>
 #include <cstdlib>
 #include <errno.h>
@@ -15,7 +16,9 @@
 #include <pthread.h>
 #include <string>
 #include <sys/resource.h>
+#include <sys/syscall.h>
 #include <thread>
+#include <unistd.h>
 #include <vector>
 
 namespace {
@@ -381,6 +384,63 @@ TEST_F(ThThreadTest, ReportsWhatTheHostRefuses) {
                 ElementsAre(testing::MatchesRegex("unable to get priority for thread [0-9]+, syserr = [0-9]+, "
                                                   "assuming normal")));
     ThThreadDestroy(thread);
+}
+
+// The capabilities are the host's of each thread: this one gives its own away.
+TEST_F(ThThreadTest, RaisesItsOwnAsFarAsTheHostLets) {
+    if (::getpriority(PRIO_PROCESS, 0) != 0) GTEST_SKIP() << "the process itself does not have the priority 0";
+    static std::atomic<int32> levelReached;
+    rlimit before{};
+    ::getrlimit(RLIMIT_NICE, &before);
+    const ThThreadProc raise = [](void*) -> int32 {
+        ::syscall(SYS_setresuid, -1, 65534, -1);
+        tessel::RaiseThreadPriority(ThThreadGetId(), kThPriorityTimeCritical);
+        return levelReached = ThThreadGetPriority(ThThreadGetId());
+    };
+    const struct {
+        rlim_t limit;  // 20 is the ordinary priority, 40 the most urgent
+        int32 level;
+        CStr given;
+    } rows[] = {{0, kThPriorityNormal, "normal"},
+                {30, kThPriorityVeryHigh, "very high (high)"},
+                {40, kThPriorityTimeCritical, ""}};
+    for (const auto& row : rows) {
+        const rlimit limit{row.limit, std::max(row.limit, before.rlim_max)};
+        if (::setrlimit(RLIMIT_NICE, &limit) != 0) continue;  // more than this process may have
+        reports_.Clear();
+        ThThreadDestroy(StartThread(raise));
+        const std::string text = "the process may not make a thread time critical, thread ";
+        EXPECT_EQ(levelReached, row.level);
+        EXPECT_EQ(reports_.Count(), *row.given ? 1u : 0u);
+        for (const std::string& told : reports_.Texts(kDebugInfo))
+            EXPECT_THAT(told,
+                        testing::AllOf(testing::StartsWith(text), testing::EndsWith(std::string(" is ") + row.given)));
+    }
+    ::setrlimit(RLIMIT_NICE, &before);
+}
+
+// Threads are destroyed while they begin, run or end.
+TEST_F(ThThreadTest, AreDestroyedAtAnyMoment) {
+    std::vector<std::thread> makers;
+    static std::atomic<int> ran;
+    ran = 0;
+    for (int m = 0; m < 3; ++m) {
+        makers.emplace_back([m, this] {
+            for (int i = 0; i < 150; ++i) {
+                ThThread thread = StartThread(
+                    [](void* spins) -> int32 {
+                        for (intptr_t s = reinterpret_cast<intptr_t>(spins); s > 0; --s) ThThreadGetIndex(nullptr);
+                        return ++ran;
+                    },
+                    reinterpret_cast<void*>(static_cast<intptr_t>(i % 8 * 50 * m)));
+                for (int spin = 0; spin < i % 5 * 100; ++spin) ThThreadActive(thread);
+                ThThreadDestroy(thread);
+            }
+        });
+    }
+    for (std::thread& maker : makers) maker.join();
+    EXPECT_EQ(ran, 450);
+    EXPECT_THAT(reports_.Texts(), IsEmpty());
 }
 
 TEST_F(ThThreadTest, TellsOfTheThreadAndTheMachine) {
