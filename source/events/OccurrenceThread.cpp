@@ -4,6 +4,7 @@
 #include "events/ThTmoEvent.h"
 #include "events/ThreadGroups.h"
 #include "platform/Thread.h"
+#include "threads/Service.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/sync/ThSleep.h>
 #include <tessel/threads/ThThread.h>
@@ -101,7 +102,7 @@ void ServeWhatIsDue() {
 }
 
 int32 RunOccurrenceThread(void*) {
-    ThThreadSetPriority(occurrenceThread, threadPriority);
+    RaiseThreadPriority(occurrenceThread, threadPriority);
     platform::WakeOnTime();
     while (!mustStop) {
         ThTmoEventWait(*timedEvent);

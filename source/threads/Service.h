@@ -1,8 +1,9 @@
-// Start and stop of the threads, for the service object.
+// Start and stop of the threads, for the service object, and what other services ask of them.
 #ifndef TESSEL_SOURCE_THREADS_SERVICE_H
 #define TESSEL_SOURCE_THREADS_SERVICE_H
 
 #include <tessel/base/MgErr.h>
+#include <tessel/threads/ThThread.h>
 
 namespace tessel {
 
@@ -13,6 +14,10 @@ using ThreadPriorityReader = bool (*)(CStr key, int32& value);
 // and "thpri_tcrit", the platform priorities of the five levels. Stop reports the threads that are left.
 MgErr ThThreadStart(ThreadPriorityReader configured = nullptr);
 MgErr ThThreadStop();
+
+// For the library's own threads, above normal: sets the level, or the highest below it that the process may give, as
+// most users' processes may give none. That is worth an information, where ThThreadSetPriority reports an error.
+void RaiseThreadPriority(ThThread thread, int32 level);
 
 }  // namespace tessel
 

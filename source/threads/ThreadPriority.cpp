@@ -40,16 +40,21 @@ void ReportPriorities() {
 
 // What became of setting a priority, told once the lock is given back.
 struct PriorityChange {
-    bool isThread, set;
+    bool isThread, set, isForbidden;
     ThPlatformThread handle;
     uint32 id;
 };
 
 PriorityChange ChangePriority(ThThread thread, int32 level) {
     ThMutexHolder holder(gCreateThread);
-    if (!IsThread(thread)) return {false, false, nullptr, 0};
+    if (!IsThread(thread)) return {};
     bool set = platform::ThreadSetPriority(HandleOf(thread), priorities[level]);
-    return {true, set, thread->platformThread, thread->platformId};
+    const bool isForbidden = !set && platform::LastError() == platform::kErrorAccessDenied;
+    return {true, set, isForbidden, thread->platformThread, thread->platformId};
+}
+
+void TellHost(ThThread thread, const PriorityChange& change, int32 level) {
+    if (ThThreadPrioritySetProc procedure = prioritySetProc) procedure(thread, change.handle, change.id, level);
 }
 
 }  // namespace
@@ -63,6 +68,19 @@ void BuildPriorityTable(ThreadPriorityReader configured) {
     distinct[kThPriorityBackground] = priorities[kThPriorityBackground] < priorities[kThPriorityNormal];
     distinct[kThPriorityNormal] = 1;
     for (int i = kThPriorityHigh; i < kNumThPriorities; ++i) distinct[i] = priorities[i - 1] < priorities[i];
+}
+
+void RaiseThreadPriority(ThThread thread, int32 level) {
+    const PriorityChange change = ChangePriority(thread, level);
+    if (!change.isForbidden) {
+        ThThreadSetPriority(thread, level);
+        return;
+    }
+    int32 given = level - 1;
+    while (given > kThPriorityNormal && !ChangePriority(thread, given).set) --given;
+    TESSEL_REPORT(kDebugInfo, 0x1E8E9A71u) << "the process may not make a thread " << kLevels[level].name << ", thread "
+                                           << change.id << " is " << kLevels[given].name;
+    TellHost(thread, change, given);
 }
 
 }  // namespace tessel
@@ -80,7 +98,7 @@ MgErr ThThreadSetPriority(ThThread thread, int32 level) {
     }
     if (negative) TESSEL_REPORT(kDebugError, 0x7C19E46Au);
     if (!change.set) TESSEL_REPORT(kDebugError, 0x48A2D71Fu) << "SetThreadPriority failed";
-    if (ThThreadPrioritySetProc procedure = prioritySetProc) procedure(thread, change.handle, change.id, level);
+    TellHost(thread, change, level);
     return kNoErr;
 }
 

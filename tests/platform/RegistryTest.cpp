@@ -6,6 +6,7 @@
 #include <cerrno>
 #include <cstdlib>
 #include <filesystem>
+#include <fstream>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -190,9 +191,9 @@ TEST_F(Registry, WhatIsNoneOfItsOwnIsLeftAlone) {
 TEST_F(Registry, NamesMayBeLongAndFilesLeftBehind) {
     RegistryKey* key = Create("Key");
     const std::string name(250, 'n');
-    FailingPlatform failing("open", 2, EEXIST, 3);  // the first call is for the lock
+    FailingPlatform failing("openat", 3, EEXIST, 3);  // the first calls are for the key and its listing
     EXPECT_EQ(kErrorSuccess, RegistrySetValue(key, name.c_str(), 1, "x", 1));
-    EXPECT_EQ(5, failing.Calls());
+    EXPECT_EQ(6, failing.Calls());
     EXPECT_EQ(kErrorSuccess, RegistryDeleteValue(key, name.c_str()));
     std::uint32_t type = 0;
     std::string data, found;
@@ -212,6 +213,64 @@ TEST_F(Registry, NamesMayBeLongAndFilesLeftBehind) {
     }
     EXPECT_EQ(kErrorSuccess, RegistrySetValue(key, (name + "\xC3\xA4" + name).c_str(), 1, "x", 1));
     EXPECT_EQ(kErrorSuccess, RegistryQueryValue(key, (std::string(250, 'N') + "\xC3\x84" + name).c_str(), type, data));
+    RegistryClose(key);
+}
+
+// Each name in another spelling when it is made and when it is looked for.
+TEST_F(Registry, KeysMayLieDeep) {
+    constexpr int kDepth = 200;
+    const std::string plain(255, 'k'), hashed(255, '/'), PLAIN(255, 'K');
+    std::string made, asked;
+    for (int i = 0; i < kDepth; ++i) {
+        made += "\\" + (i % 2 ? plain : hashed);
+        asked += "\\" + (i % 2 ? PLAIN : hashed);
+    }
+    RegistryKey *key = Create(made.c_str()), *opened = nullptr;
+    EXPECT_EQ(kErrorSuccess, RegistrySetValue(key, "Value", 1, "data", 4));
+    EXPECT_EQ(kErrorSuccess, RegistrySetValue(key, hashed.c_str(), 1, "x", 1));
+    EXPECT_EQ(kErrorSuccess, RegistryDeleteValue(key, hashed.c_str()));
+    EXPECT_EQ(kErrorSuccess, RegistryFlush(key));
+    RegistryClose(key);
+    ASSERT_EQ(kErrorSuccess, RegistryOpen(root_, asked.c_str(), false, opened));
+    std::uint32_t type = 0, keys = 9, values = 9;
+    std::string data, name;
+    EXPECT_EQ(kErrorSuccess, RegistryQueryValue(opened, "VALUE", type, data));
+    EXPECT_EQ("data", data);
+    EXPECT_EQ(kErrorSuccess, RegistryCounts(opened, keys, values));
+    EXPECT_TRUE(keys == 0 && values == 1);
+    RegistryClose(opened);
+    for (int i = kDepth; i-- > 0;) {
+        asked.resize(static_cast<std::size_t>(i) * 256);
+        ASSERT_EQ(kErrorSuccess, RegistryOpen(root_, asked.c_str(), false, opened));
+        EXPECT_EQ(kErrorSuccess, RegistryEnumerateKey(opened, 0, name));
+        EXPECT_EQ(i % 2 ? plain : hashed, name);
+        EXPECT_EQ(kErrorSuccess, RegistryDelete(opened, name.c_str()));
+        RegistryClose(opened);
+    }
+}
+
+// The folder of a key with a long name has its name as soon as it is there, and what a broken-off making left behind
+// stands in nobody's way.
+TEST_F(Registry, NoKeyIsThereWithoutItsName) {
+    const std::string name(255, '/');
+    RegistryKey *key = Create("Key"), *made = nullptr;
+    for (const char* call : {"write", "renameat2"}) {
+        FailingPlatform failing(call, 1, ENOSPC);
+        EXPECT_EQ(kErrorDiskFull, RegistryCreate(key, name.c_str(), made)) << call;
+        EXPECT_EQ(kErrorFileNotFound, TryOpen(("Key\\" + name).c_str()));
+    }
+    RegistryClose(Create(("Key\\" + name).c_str()));
+    const std::filesystem::path folder = drive_.Native("store/HKEY_LOCAL_MACHINE/Key");
+    const std::filesystem::path leftBehind =
+        folder / (".making" + std::filesystem::directory_iterator(folder)->path().filename().string());
+    EXPECT_EQ(kErrorSuccess, RegistryDelete(key, name.c_str()));
+    std::filesystem::create_directory(leftBehind);
+    std::ofstream(leftBehind / ".name") << "half";
+    RegistryClose(Create(("Key\\" + name).c_str()));
+    EXPECT_FALSE(std::filesystem::exists(leftBehind));
+    std::filesystem::create_directory(leftBehind);
+    EXPECT_EQ(kErrorSuccess, RegistryDelete(key, name.c_str()));
+    EXPECT_EQ(kErrorSuccess, RegistryDelete(root_, "Key"));
     RegistryClose(key);
 }
 

@@ -187,7 +187,7 @@ TEST_F(Registry, DeletingTakesAllThatIsBelow) {
     below.Reset(nullptr);
     ASSERT_EQ(key_->SetSubKeyDefaultValue("A\\1\\x", "value"), kNoErr);
     {
-        test::FailingPlatform failing("rmdir", 2, EACCES);  // of y
+        test::FailingPlatform failing("unlinkat", 3, EACCES);  // of y, behind a value and x
         EXPECT_EQ(key_->DeleteSubKey("A"), kRegistryErr);
         EXPECT_EQ(key_->GetLastError(), 5u);
     }

@@ -77,7 +77,7 @@ TEST(CPUInformation, TellsOfThisHost) {
     EXPECT_EQ("Invalid CPUInformation", TextOf(static_cast<const CPUInformation*>(nullptr)));
     UninitCPUInformation();
     test::ReportRecorder reports;
-    test::FailingPlatform failing("open", 1, EACCES);
+    test::FailingPlatform failing("openat", 1, EACCES);
     info = PlatformInfo()->GetCPUInfo();  // built anew
     EXPECT_EQ(platform::NumberOfProcessors(), info->GetNumLogicalCPUs());
     EXPECT_EQ(2u, info->GetNumCores() + info->GetNumPackages());

@@ -6,6 +6,7 @@
 #include <tessel/sync/ThEvent.h>
 #include <tessel/threads/ThThread.h>
 
+#include <algorithm>
 #include <atomic>
 #include <cstdlib>
 #include <errno.h>
@@ -15,7 +16,9 @@
 #include <pthread.h>
 #include <string>
 #include <sys/resource.h>
+#include <sys/syscall.h>
 #include <thread>
+#include <unistd.h>
 #include <vector>
 
 namespace {
@@ -154,20 +157,24 @@ TEST_F(ThThreadTest, GivesEachOfManyThreadsAPlaceOfItsOwn) {
     std::vector<std::thread> creators;
     for (int i = 0; i < 4; ++i) {
         creators.emplace_back([this] {
-            for (int round = 0; round < 40; ++round) {
+            for (int round = 0; round < 100; ++round) {
                 ThThread thread = StartThread([](void*) -> int32 {
                     std::atomic<int>& mine = users[ThThreadGetIndex(nullptr)];
                     if (mine++ != 0) ++collisions;
                     --mine;
                     return ++ended;
                 });
+                ThThread hasty =
+                    StartThread([](void*) -> int32 { return ThThreadGetIndex(nullptr) != 0 ? ++ended : 0; });
+                for (int spin = 0; spin < round % 5 * 100; ++spin) ThThreadActive(hasty);
+                ThThreadDestroy(hasty);                                    // while it begins, runs or ends
                 while (ThThreadActive(thread)) std::this_thread::yield();  // its place is taken as long as it uses it
                 ThThreadDestroy(thread);
             }
         });
     }
     for (std::thread& creator : creators) creator.join();
-    EXPECT_EQ(ended, 4 * 40);
+    EXPECT_EQ(ended, 4 * 100 * 2);
     EXPECT_EQ(collisions, 0);
     EXPECT_THAT(reports_.Texts(), IsEmpty());
 }
@@ -381,6 +388,39 @@ TEST_F(ThThreadTest, ReportsWhatTheHostRefuses) {
                 ElementsAre(testing::MatchesRegex("unable to get priority for thread [0-9]+, syserr = [0-9]+, "
                                                   "assuming normal")));
     ThThreadDestroy(thread);
+}
+
+// The capabilities are the host's of each thread: this one gives its own away.
+TEST_F(ThThreadTest, RaisesItsOwnAsFarAsTheHostLets) {
+    if (::getpriority(PRIO_PROCESS, 0) != 0) GTEST_SKIP() << "the process itself does not have the priority 0";
+    static std::atomic<int32> levelReached;
+    rlimit before{};
+    ::getrlimit(RLIMIT_NICE, &before);
+    const ThThreadProc raise = [](void*) -> int32 {
+        ::syscall(SYS_setresuid, -1, 65534, -1);
+        tessel::RaiseThreadPriority(ThThreadGetId(), kThPriorityTimeCritical);
+        return levelReached = ThThreadGetPriority(ThThreadGetId());
+    };
+    const struct {
+        rlim_t limit;  // 20 is the ordinary priority, 40 the most urgent
+        int32 level;
+        CStr given;
+    } rows[] = {{0, kThPriorityNormal, "normal"},
+                {30, kThPriorityVeryHigh, "very high (high)"},
+                {40, kThPriorityTimeCritical, ""}};
+    for (const auto& row : rows) {
+        const rlimit limit{row.limit, std::max(row.limit, before.rlim_max)};
+        if (::setrlimit(RLIMIT_NICE, &limit) != 0) continue;  // more than this process may have
+        reports_.Clear();
+        ThThreadDestroy(StartThread(raise));
+        const std::string text = "the process may not make a thread time critical, thread ";
+        EXPECT_EQ(levelReached, row.level);
+        EXPECT_EQ(reports_.Count(), *row.given ? 1u : 0u);
+        for (const std::string& told : reports_.Texts(kDebugInfo))
+            EXPECT_THAT(told,
+                        testing::AllOf(testing::StartsWith(text), testing::EndsWith(std::string(" is ") + row.given)));
+    }
+    ::setrlimit(RLIMIT_NICE, &before);
 }
 
 TEST_F(ThThreadTest, TellsOfTheThreadAndTheMachine) {

@@ -8,6 +8,7 @@
 
 #include <algorithm>
 #include <charconv>
+#include <climits>
 #include <cstdio>
 #include <cstdlib>
 #include <dirent.h>
@@ -15,6 +16,7 @@
 #include <memory>
 #include <string_view>
 #include <unistd.h>
+#include <utility>
 #include <vector>
 
 // On the disk:
@@ -27,7 +29,8 @@
 // the folder `.view64`.
 //
 // A name too long for the host is `%~` and a hash of the name without regard to case; the name itself is in the file
-// `.name` of the key's folder, or in the value's file before the data.
+// `.name` of the key's folder, or in the value's file before the data. Keys may lie deeper than the host's longest path
+// reaches: what is in a key's folder is named from there.
 //
 // A value's file holds `REG `, the type in decimal digits, a line feed, and the raw data; behind the type of one with a
 // long name stand a blank and the length of the name. What a folder holds otherwise, links to other folders too, is
@@ -93,7 +96,7 @@ std::string FromDisk(const std::string& text) {
 }
 
 constexpr std::string_view kHashed = "%~";  // no escaped byte begins so
-constexpr const char* kNameFile = "/.name";
+constexpr const char* kNameFile = ".name";
 
 bool IsHashed(std::string_view diskName) {
     return diskName.substr(0, kHashed.size()) == kHashed;
@@ -182,73 +185,157 @@ private:
     int file_ = -1;
 };
 
-bool Exists(const std::string& native) {
-    struct statx status;
-    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0;
-}
+// ---- folders --------------------------------------------------------------------------------------------------------
 
-// Whether it is a folder itself: a link might lead out of the store, and what is deleted must lie within.
-bool IsFolder(const std::string& native) {
-    struct statx status;
-    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0 &&
-           S_ISDIR(status.stx_mode);
-}
-
-// 1018 when somebody has deleted the key meanwhile. A root is always there, if only by name.
-ErrorNumber CheckThere(const RegistryKey* key) {
-    return key->root || IsFolder(key->folder) ? kErrorSuccess : kErrorKeyDeleted;
-}
-
-// The item of `folder` with that name, in whatever case; the name as given where there is none.
-std::string ItemIn(const std::string& folder, const std::string& diskName) {
-    std::string native = folder + "/" + diskName, found;
-    if (!Exists(native) && FindInFolder(folder, diskName, found)) native = folder + "/" + found;
-    return native;
-}
-
-std::string KeyFolder(const RegistryKey* parent, const char* path) {
-    std::string folder = parent->folder;
-    for (const KeyName& part : PathParts(path)) folder = ItemIn(folder, part.disk);
-    return folder;
-}
-
-// Writes the long names of a key that was just made, and of those above it.
-bool KeepNames(const RegistryKey* parent, const char* path) {
-    std::string folder = parent->folder;
-    for (const KeyName& part : PathParts(path)) {
-        folder = ItemIn(folder, part.disk);
-        if (IsHashed(part.disk) && !Exists(folder + kNameFile) && !ReplaceFile(folder + kNameFile, part.name))
-            return false;
+// A folder that is held open, to name what is in it from there. Without one, `Number` is -1 and errno said why.
+class Folder {
+public:
+    Folder() = default;
+    Folder(int from, const char* name, int flags)
+        : number_(systemCalls.openat(from, name, flags | O_DIRECTORY | O_CLOEXEC, 0)) {}
+    Folder(Folder&& other) noexcept : number_(std::exchange(other.number_, -1)) {}
+    Folder& operator=(Folder&& other) noexcept {
+        std::swap(number_, other.number_);
+        return *this;
     }
-    return true;
+    ~Folder() {
+        const int error = errno;
+        if (number_ >= 0) systemCalls.close(number_);
+        errno = error;
+    }
+
+    explicit operator bool() const { return number_ >= 0; }
+    int Number() const { return number_; }
+
+    // A key's folder in this one. It is a folder itself: a link might lead out of the store, and what is deleted must
+    // lie within.
+    Folder Key(const std::string& name) const { return Folder(number_, name.c_str(), O_PATH | O_NOFOLLOW); }
+
+private:
+    int number_ = -1;
+};
+
+// Of a key, in steps of what the host takes at once. The user may have put a root elsewhere by a link.
+Folder FolderOf(const RegistryKey* key) {
+    std::string_view path = key->folder;
+    Folder folder;
+    int from = AT_FDCWD;
+    while (path.size() >= PATH_MAX) {
+        const std::size_t length = path.rfind('/', PATH_MAX - 1);
+        folder = Folder(from, std::string(path.substr(0, length)).c_str(), O_PATH | O_NOFOLLOW);
+        if (!folder) return folder;
+        from = folder.Number();
+        path.remove_prefix(length + 1);
+    }
+    return Folder(from, std::string(path).c_str(), key->root ? O_PATH : O_PATH | O_NOFOLLOW);
+}
+
+bool IsMissing(int error) {
+    return error == ENOENT || error == ENOTDIR || error == ELOOP;
+}
+
+// Of a key whose folder could not be opened: 1018 when somebody has deleted it meanwhile.
+ErrorNumber LostNumber() {
+    return IsMissing(errno) ? kErrorKeyDeleted : ErrnoNumber();
+}
+
+bool Exists(const Folder& folder, const std::string& name) {
+    struct statx status;
+    return systemCalls.statx(folder.Number(), name.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0;
 }
 
 enum class Kind { kKey, kValue, kOther };
 
-Kind KindOf(const std::string& folder, const dirent& entry) {
+Kind KindOf(const Folder& folder, const dirent& entry) {
     if (entry.d_name[0] == kValueMark) return Kind::kValue;
     if (entry.d_name[0] == '.') return Kind::kOther;
-    bool isFolder = entry.d_type == DT_DIR || (entry.d_type == DT_UNKNOWN && IsFolder(folder + "/" + entry.d_name));
+    const bool isFolder = entry.d_type == DT_DIR || (entry.d_type == DT_UNKNOWN && folder.Key(entry.d_name));
     return isFolder ? Kind::kKey : Kind::kOther;
 }
 
 // Calls visit(name on the disk, kind) for all that a key's folder holds.
 template <typename Visitor>
-ErrorNumber VisitFolder(const std::string& folder, Visitor visit) {
-    std::unique_ptr<DIR, int (*)(DIR*)> listing(opendir(folder.c_str()), closedir);
-    if (!listing) return ErrnoNumber();
+ErrorNumber VisitFolder(const Folder& folder, Visitor visit) {
+    const int number = systemCalls.openat(folder.Number(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC, 0);
+    if (number < 0) return ErrnoNumber();
+    std::unique_ptr<DIR, int (*)(DIR*)> listing(fdopendir(number), closedir);
+    if (!listing) {
+        const ErrorNumber error = ErrnoNumber();
+        systemCalls.close(number);
+        return error;
+    }
     for (errno = 0; const dirent* entry = readdir(listing.get()); errno = 0) {
-        std::string_view name = entry->d_name;
+        const std::string_view name = entry->d_name;
         if (name != "." && name != "..") visit(name, KindOf(folder, *entry));
     }
     return errno == 0 ? kErrorSuccess : ErrnoNumber();
 }
 
+// Calls visit(folder, name on the disk, kind) for all that a key holds. A root is always there, if only by name.
 template <typename Visitor>
 ErrorNumber VisitKey(const RegistryKey* key, Visitor visit) {
-    ErrorNumber number = VisitFolder(key->folder, visit);
-    if (number != kErrorFileNotFound) return number;
-    return key->root ? kErrorSuccess : kErrorKeyDeleted;
+    const Folder folder = FolderOf(key);
+    if (!folder) return key->root && IsMissing(errno) ? kErrorSuccess : LostNumber();
+    return VisitFolder(folder, [&](std::string_view name, Kind kind) { visit(folder, name, kind); });
+}
+
+// The item of `folder` with that name, in whatever case; the name as given where there is none. The first in byte order
+// where several are, so that the answer does not hang on the order of the listing.
+std::string ItemIn(const Folder& folder, const std::string& diskName) {
+    if (Exists(folder, diskName)) return diskName;
+    std::string found;
+    VisitFolder(folder, [&](std::string_view name, Kind) {
+        if (EqualNames(name, diskName) && (found.empty() || found > name)) found = name;
+    });
+    return found.empty() ? diskName : found;
+}
+
+// Deletes a folder with all that is in it. False with errno.
+bool DeleteFolder(const Folder& parent, const std::string& name) {
+    const Folder folder = parent.Key(name);
+    if (!folder) return false;
+    std::vector<std::string> items;
+    VisitFolder(folder, [&](std::string_view item, Kind) { items.emplace_back(item); });
+    for (const std::string& item : items) {
+        const bool deleted = systemCalls.unlinkat(folder.Number(), item.c_str(), 0) == 0 || errno == ENOENT ||
+                             (errno == EISDIR && DeleteFolder(folder, item));
+        if (!deleted) return false;
+    }
+    return systemCalls.unlinkat(parent.Number(), name.c_str(), AT_REMOVEDIR) == 0;
+}
+
+// Makes a key's folder. One with a long name is made under another, and takes its own when that stands in it: nobody
+// ever sees a key without its name.
+bool MakeKeyFolder(const Folder& parent, const KeyName& part) {
+    if (!IsHashed(part.disk)) return systemCalls.mkdirat(parent.Number(), part.disk.c_str(), 0777) == 0;
+    const std::string unfinished = ".making" + part.disk;
+    DeleteFolder(parent, unfinished);  // of a process that ended on the way
+    if (systemCalls.mkdirat(parent.Number(), unfinished.c_str(), 0777) != 0) return false;
+    const Folder folder = parent.Key(unfinished);
+    if (folder && ReplaceFile(kNameFile, part.name, folder.Number()) &&
+        systemCalls.renameat2(parent.Number(), unfinished.c_str(), parent.Number(), part.disk.c_str(), 0) == 0)
+        return true;
+    const int error = errno;
+    DeleteFolder(parent, unfinished);
+    errno = error;
+    return false;
+}
+
+// Goes from a key down, and makes what is missing where `make` asks for it. `path` becomes that of what was found, in
+// the spelling of the disk.
+Folder Descend(const RegistryKey* key, const std::vector<KeyName>& parts, bool make, std::string& path) {
+    Folder folder = FolderOf(key);
+    path = key->folder;
+    for (const KeyName& part : parts) {
+        if (!folder) break;
+        const std::string item = ItemIn(folder, part.disk);
+        Folder next = folder.Key(item);
+        if (!next && errno == ENOENT && make && (MakeKeyFolder(folder, part) || errno == EEXIST || errno == ENOTEMPTY))
+            next = folder.Key(item);
+        (path += '/') += item;
+        folder = std::move(next);
+    }
+    return folder;
 }
 
 }  // namespace
@@ -271,13 +358,15 @@ ErrorNumber RegistryOpenRoot(RegistryRoot root, std::uint32_t view, RegistryKey*
 ErrorNumber RegistryOpen(const RegistryKey* parent, const char* path, bool write, RegistryKey*& key) {
     key = nullptr;
     if (!parent) return kErrorInvalidHandle;
-    std::string folder = KeyFolder(parent, path);
-    const bool root = parent->root && folder == parent->folder;
+    const std::vector<KeyName> parts = PathParts(path);
+    std::string name = parent->folder;
+    const bool root = parent->root && parts.empty();
     if (!root) {
-        if (!IsFolder(folder)) return kErrorFileNotFound;
-        if (write && ::access(folder.c_str(), W_OK) != 0) return ErrnoNumber();
+        const Folder folder = Descend(parent, parts, false, name);
+        if (!folder) return IsMissing(errno) ? kErrorFileNotFound : ErrnoNumber();
+        if (write && ::faccessat(folder.Number(), ".", W_OK, 0) != 0) return ErrnoNumber();
     }
-    key = new RegistryKey{parent->store, std::move(folder), root, write, {}};
+    key = new RegistryKey{parent->store, std::move(name), root, write, {}};
     return kErrorSuccess;
 }
 
@@ -285,13 +374,12 @@ ErrorNumber RegistryCreate(const RegistryKey* parent, const char* path, Registry
     key = nullptr;
     if (!parent) return kErrorInvalidHandle;
     StoreLock lock(parent->store);
-    if (ErrorNumber gone = CheckThere(parent)) return gone;
-    std::string folder = KeyFolder(parent, path);
-    if (!MakeFolders(folder)) return ErrnoNumber();
-    if (!IsFolder(folder)) return kErrorAccessDenied;
-    if (!KeepNames(parent, path)) return ErrnoNumber();
-    const bool root = parent->root && folder == parent->folder;
-    key = new RegistryKey{parent->store, std::move(folder), root, true, {}};
+    if (parent->root && !MakeFolders(parent->folder)) return ErrnoNumber();
+    if (!FolderOf(parent)) return LostNumber();
+    const std::vector<KeyName> parts = PathParts(path);
+    std::string name;
+    if (!Descend(parent, parts, true, name)) return IsMissing(errno) ? kErrorAccessDenied : ErrnoNumber();
+    key = new RegistryKey{parent->store, std::move(name), parent->root && parts.empty(), true, {}};
     return kErrorSuccess;
 }
 
@@ -303,26 +391,27 @@ ErrorNumber RegistryClose(RegistryKey* key) {
 
 ErrorNumber RegistryDelete(const RegistryKey* parent, const char* path) {
     if (!parent) return kErrorInvalidHandle;
+    std::vector<KeyName> parts = PathParts(path);
+    if (parts.empty()) return kErrorInvalidParameter;
     StoreLock lock(parent->store);
-    std::string folder = KeyFolder(parent, path);
-    if (folder == parent->folder) return kErrorInvalidParameter;
-    if (!IsFolder(folder)) return kErrorFileNotFound;
+    const std::string last = parts.back().disk;
+    parts.pop_back();
+    std::string above;
+    const Folder folder = Descend(parent, parts, false, above);
+    const std::string item = folder ? ItemIn(folder, last) : last;
+    const Folder key = folder ? folder.Key(item) : Folder();
+    if (!key) return IsMissing(errno) ? kErrorFileNotFound : ErrnoNumber();
     bool hasSubKeys = false;
-    std::vector<std::string> files;
-    ErrorNumber number = VisitFolder(folder, [&](std::string_view name, Kind kind) {
-        if (kind == Kind::kKey) hasSubKeys = true;
-        files.push_back(folder + "/" + std::string(name));
-    });
+    const ErrorNumber number = VisitFolder(key, [&](std::string_view, Kind kind) { hasSubKeys |= kind == Kind::kKey; });
     if (number != kErrorSuccess) return number;
     if (hasSubKeys) return kErrorAccessDenied;
-    for (const std::string& file : files) systemCalls.unlink(file.c_str());
-    return systemCalls.rmdir(folder.c_str()) == 0 ? kErrorSuccess : ErrnoNumber();
+    return DeleteFolder(folder, item) ? kErrorSuccess : ErrnoNumber();
 }
 
 ErrorNumber RegistryCounts(const RegistryKey* key, std::uint32_t& subKeys, std::uint32_t& values) {
     subKeys = values = 0;
     if (!key) return kErrorInvalidHandle;
-    return VisitKey(key, [&](std::string_view, Kind kind) {
+    return VisitKey(key, [&](const Folder&, std::string_view, Kind kind) {
         if (kind == Kind::kKey) ++subKeys;
         if (kind == Kind::kValue) ++values;
     });
@@ -351,15 +440,15 @@ bool ParseHeader(const std::string& text, bool hashed, ValueHeader& header) {
 }
 
 // The name of what stands in a key's folder, in UTF-8. False when it cannot be read: then it is none of ours.
-bool NameOfItem(const std::string& folder, std::string_view item, Kind kind, std::string& name) {
+bool NameOfItem(const Folder& folder, std::string_view item, Kind kind, std::string& name) {
     constexpr std::size_t kMost = 1024 * 1024;
     const std::string_view disk = item.substr(kind == Kind::kValue ? 1 : 0);
     name = Unescaped(disk);
     if (!IsHashed(disk)) return true;
-    const std::string native = folder + "/" + std::string(item);
-    if (kind == Kind::kKey) return ReadTextFile((native + kNameFile).c_str(), name, kMost);
+    std::string file(item);
+    if (kind == Kind::kKey) return ReadTextFile(((file += '/') += kNameFile).c_str(), name, kMost, folder.Number());
     ValueHeader header;
-    if (!ReadTextFile(native.c_str(), name, kMost) || !ParseHeader(name, true, header)) return false;
+    if (!ReadTextFile(file.c_str(), name, kMost, folder.Number()) || !ParseHeader(name, true, header)) return false;
     name = name.substr(header.size, header.length);
     return true;
 }
@@ -369,9 +458,9 @@ ErrorNumber Enumerate(const RegistryKey* key, Kind kind, std::uint32_t index, st
     if (!key) return kErrorInvalidHandle;
     if (index == 0) {
         key->listing.clear();
-        ErrorNumber number = VisitKey(key, [&](std::string_view item, Kind itemKind) {
+        ErrorNumber number = VisitKey(key, [&](const Folder& folder, std::string_view item, Kind itemKind) {
             std::string found;
-            if (itemKind == kind && NameOfItem(key->folder, item, kind, found)) key->listing.push_back(FromDisk(found));
+            if (itemKind == kind && NameOfItem(folder, item, kind, found)) key->listing.push_back(FromDisk(found));
         });
         if (number != kErrorSuccess) return number;
         std::sort(key->listing.begin(), key->listing.end());
@@ -399,14 +488,12 @@ constexpr std::size_t kLongestName = 1024 * 1024;  // bytes of a value's name be
 
 // As the name is spelled first: a name that fits costs no look at the folder. False with errno. No more is read than
 // a value may have, and a byte: a damaged store must not take all memory.
-bool ReadValueFile(const std::string& folder, const std::string& diskName, std::string& text) {
+bool ReadValueFile(const RegistryKey* key, const std::string& diskName, std::string& text) {
     constexpr std::size_t kMost = kLongestHeader + kLongestName + kLargestRegistryValue + 1;
-    std::string found;
-    if (ReadTextFile((folder + "/" + diskName).c_str(), text, kMost)) return true;
-    if (errno != ENOENT) return false;
-    if (FindInFolder(folder, diskName, found)) return ReadTextFile((folder + "/" + found).c_str(), text, kMost);
-    errno = ENOENT;
-    return false;
+    if (ReadTextFile((key->folder + "/" + diskName).c_str(), text, kMost)) return true;
+    if (errno != ENOENT && errno != ENAMETOOLONG) return false;
+    const Folder folder = FolderOf(key);
+    return folder && ReadTextFile(ItemIn(folder, diskName).c_str(), text, kMost, folder.Number());
 }
 
 bool ParseValue(std::string& text, bool hashed, std::uint32_t& type) {
@@ -422,7 +509,7 @@ bool ParseValue(std::string& text, bool hashed, std::uint32_t& type) {
 ErrorNumber RegistryQueryValue(const RegistryKey* key, const char* name, std::uint32_t& type, std::string& data) {
     if (!key) return kErrorInvalidHandle;
     const std::string file = ValueFileName(name);
-    if (!ReadValueFile(key->folder, file, data)) return ErrnoNumber();
+    if (!ReadValueFile(key, file, data)) return ErrnoNumber();
     return ParseValue(data, IsHashed(std::string_view(file).substr(1)), type) ? kErrorSuccess : kErrorRegistryCorrupt;
 }
 
@@ -438,23 +525,26 @@ ErrorNumber RegistrySetValue(const RegistryKey* key, const char* name, std::uint
     text += std::to_string(type) + (hashed ? " " + std::to_string(utf8.size()) + "\n" + utf8 : "\n");
     if (size != 0) text.append(static_cast<const char*>(data), size);
     StoreLock lock(key->store);
-    if (ErrorNumber gone = CheckThere(key)) return gone;
     if (key->root && !MakeFolders(key->folder)) return ErrnoNumber();
-    return ReplaceFile(ItemIn(key->folder, file), text) ? kErrorSuccess : ErrnoNumber();
+    const Folder folder = FolderOf(key);
+    if (!folder) return LostNumber();
+    return ReplaceFile(ItemIn(folder, file), text, folder.Number()) ? kErrorSuccess : ErrnoNumber();
 }
 
 ErrorNumber RegistryDeleteValue(const RegistryKey* key, const char* name) {
     if (!key) return kErrorInvalidHandle;
     if (!key->write) return kErrorAccessDenied;
     StoreLock lock(key->store);
-    std::string file = ItemIn(key->folder, ValueFileName(name));
-    return systemCalls.unlink(file.c_str()) == 0 ? kErrorSuccess : ErrnoNumber();
+    const Folder folder = FolderOf(key);
+    if (!folder) return ErrnoNumber();
+    const std::string file = ItemIn(folder, ValueFileName(name));
+    return systemCalls.unlinkat(folder.Number(), file.c_str(), 0) == 0 ? kErrorSuccess : ErrnoNumber();
 }
 
 namespace {
 
-ErrorNumber Synchronize(const std::string& native) {
-    int file = systemCalls.open(native.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK, 0);
+ErrorNumber Synchronize(const Folder& folder, const std::string& name) {
+    int file = systemCalls.openat(folder.Number(), name.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK, 0);
     if (file < 0) return errno == ENOENT ? kErrorSuccess : ErrnoNumber();
     ErrorNumber number = kErrorSuccess;
     if (systemCalls.fsync(file) != 0 && errno != EINVAL) number = ErrnoNumber();
@@ -470,10 +560,12 @@ ErrorNumber RegistryFlush(const RegistryKey* key) {
     auto keep = [&first](ErrorNumber number) {
         if (first == kErrorSuccess) first = number;
     };
-    keep(VisitKey(key, [&](std::string_view name, Kind kind) {
-        if (kind == Kind::kValue) keep(Synchronize(key->folder + "/" + std::string(name)));
+    const Folder folder = FolderOf(key);
+    if (!folder) return key->root && IsMissing(errno) ? kErrorSuccess : LostNumber();
+    keep(VisitFolder(folder, [&](std::string_view name, Kind kind) {
+        if (kind == Kind::kValue) keep(Synchronize(folder, std::string(name)));
     }));
-    keep(Synchronize(key->folder));
+    keep(Synchronize(folder, "."));
     return first;
 }
 

@@ -16,6 +16,9 @@ namespace {
 int Open(const char* name, int flags, mode_t mode) {
     return ::open(name, flags, mode);
 }
+int OpenAt(int folder, const char* name, int flags, mode_t mode) {
+    return ::openat(folder, name, flags, mode);
+}
 int Lock(int file, int command, struct flock* range) {
     return ::fcntl(file, command, range);
 }
@@ -45,6 +48,7 @@ int ClockNanosleep(clockid_t clock, int flags, const struct timespec* time, stru
 
 constinit SystemCalls systemCalls = {
     .open = Open,
+    .openat = OpenAt,
     .close = ::close,
     .read = ::read,
     .write = ::write,
@@ -63,8 +67,10 @@ constinit SystemCalls systemCalls = {
     .renameat2 = ::renameat2,
     .link = ::link,
     .unlink = ::unlink,
+    .unlinkat = ::unlinkat,
     .rmdir = ::rmdir,
     .mkdir = ::mkdir,
+    .mkdirat = ::mkdirat,
     .chmod = ::chmod,
     .fchmod = ::fchmod,
     .chdir = ::chdir,

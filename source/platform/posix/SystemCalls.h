@@ -17,6 +17,7 @@ namespace tessel::platform {
 // X(result, name, parameters): all return -1 (mmap: MAP_FAILED) and set errno on failure.
 #define TESSEL_SYSTEM_CALLS(X)                                                                                     \
     X(int, open, (const char* name, int flags, mode_t mode))                                                       \
+    X(int, openat, (int folder, const char* name, int flags, mode_t mode))                                         \
     X(int, close, (int file))                                                                                      \
     X(ssize_t, read, (int file, void* buffer, std::size_t count))                                                  \
     X(ssize_t, write, (int file, const void* data, std::size_t count))                                             \
@@ -35,8 +36,10 @@ namespace tessel::platform {
     X(int, renameat2, (int fromFolder, const char* from, int toFolder, const char* to, unsigned flags))            \
     X(int, link, (const char* from, const char* to))                                                               \
     X(int, unlink, (const char* name))                                                                             \
+    X(int, unlinkat, (int folder, const char* name, int flags))                                                    \
     X(int, rmdir, (const char* name))                                                                              \
     X(int, mkdir, (const char* name, mode_t mode))                                                                 \
+    X(int, mkdirat, (int folder, const char* name, mode_t mode))                                                   \
     X(int, chmod, (const char* name, mode_t mode))                                                                 \
     X(int, fchmod, (int file, mode_t mode))                                                                        \
     X(int, chdir, (const char* name))                                                                              \

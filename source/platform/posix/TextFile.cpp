@@ -13,10 +13,10 @@ namespace tessel::platform {
 
 namespace {
 
-int OpenRetrying(const char* native, int flags, mode_t mode) {
+int OpenRetrying(int folder, const char* native, int flags, mode_t mode) {
     int file;
     do {
-        file = systemCalls.open(native, flags | O_CLOEXEC, mode);
+        file = systemCalls.openat(folder, native, flags | O_CLOEXEC, mode);
     } while (file < 0 && errno == EINTR);
     return file;
 }
@@ -43,9 +43,9 @@ std::string TemporaryName(const std::string& native) {
 
 }  // namespace
 
-bool ReadTextFile(const char* native, std::string& text, std::size_t most) {
+bool ReadTextFile(const char* native, std::string& text, std::size_t most, int folder) {
     text.clear();
-    int file = OpenRetrying(native, O_RDONLY | O_NONBLOCK, 0);  // a pipe of that name must not make us wait
+    int file = OpenRetrying(folder, native, O_RDONLY | O_NONBLOCK, 0);  // a pipe of that name must not make us wait
     if (file < 0) return false;
     char buffer[4096];
     ssize_t moved = 1;
@@ -60,8 +60,8 @@ bool ReadTextFile(const char* native, std::string& text, std::size_t most) {
     return moved >= 0;
 }
 
-bool CreateTextFile(const std::string& native, const std::string& data) {
-    int file = OpenRetrying(native.c_str(), O_WRONLY | O_CREAT | O_EXCL, 0666);
+bool CreateTextFile(const std::string& native, const std::string& data, int folder) {
+    int file = OpenRetrying(folder, native.c_str(), O_WRONLY | O_CREAT | O_EXCL, 0666);
     if (file < 0) return false;
     bool written = WriteAll(file, data);
     int error = errno;
@@ -69,24 +69,24 @@ bool CreateTextFile(const std::string& native, const std::string& data) {
         written = false;
         error = errno;
     }
-    if (!written) systemCalls.unlink(native.c_str());
+    if (!written) systemCalls.unlinkat(folder, native.c_str(), 0);
     errno = error;
     return written;
 }
 
-bool ReplaceFile(const std::string& native, const std::string& data) {
+bool ReplaceFile(const std::string& native, const std::string& data, int folder) {
     constexpr int kTries = 100;  // a process of our number may have ended and left its files behind
     std::string temporary;
     bool made = false;
     for (int i = 0; i < kTries && !made; ++i) {
         temporary = TemporaryName(native);
-        made = CreateTextFile(temporary, data);
+        made = CreateTextFile(temporary, data, folder);
         if (!made && errno != EEXIST) return false;
     }
     if (!made) return false;
-    if (systemCalls.renameat2(AT_FDCWD, temporary.c_str(), AT_FDCWD, native.c_str(), 0) == 0) return true;
+    if (systemCalls.renameat2(folder, temporary.c_str(), folder, native.c_str(), 0) == 0) return true;
     int error = errno;
-    systemCalls.unlink(temporary.c_str());
+    systemCalls.unlinkat(folder, temporary.c_str(), 0);
     errno = error;
     return false;
 }
