@@ -7,10 +7,8 @@
 #include "strings/FmtEngine.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/FileManager.h>
-#include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathText.h>
-#include <tessel/strings/StringFmtPrint.h>
 #include <tessel/sync/ThMutex.h>
 
 #include <cstring>
@@ -52,27 +50,17 @@ MgErr MoveTo(File_t* file, int64 position) {
     return ErrUnless(platform::FileSeek(HandleOf(file), position, platform::SeekFrom::kStart));
 }
 
-// Formats into a pointer block of its own and writes it. *written is what went to the file.
-// What stands before the fault of a bad format is written only on request.
+// Formats and writes. *written is what went to the file. What stands before the fault of a bad format is written only
+// on request.
 enum class BadFormat { kWriteStart, kWriteNothing };
 
 MgErr PrintToFile(File_t* file, CStr format, va_list args, BadFormat bad, uint32* written) {
     *written = 0;
     if (!file || !format) return kArgErr;
-    const auto length = static_cast<int32>(std::strlen(format));
-    va_list measured;
-    va_copy(measured, args);
-    const Formatted needed = FormatText(nullptr, 0, format, length, measured);
-    va_end(measured);
-    if (!needed.good && bad == BadFormat::kWriteNothing) return kFormatErr;
-
-    const auto size = static_cast<uint32>(needed.length);
-    UPtr text = DSNewPtr(size);
-    if (!text) return kMemFullErr;
-    SPrintfv(reinterpret_cast<char*>(text), needed.length, format, length, args);
-    const MgErr err = FMWrite(file, size, written, text);
-    DSDisposePtr(text);
-    return err;
+    FormattedText text;
+    if (const MgErr err = text.Format(format, std::strlen(format), args)) return err;
+    if (!text.Good() && bad == BadFormat::kWriteNothing) return kFormatErr;
+    return FMWrite(file, static_cast<uint32>(text.Length()), written, text.Bytes());
 }
 
 MgErr TranslateModes(int32 openMode, int32 denyMode, OpenAccess* out) {
