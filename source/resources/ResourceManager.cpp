@@ -33,11 +33,11 @@ class ResFileMap : public TrackedObject {
 public:
     // Throws kMemFullErr when there is no memory for the table.
     ResFileMap() {
-        if (fJar.Init()) TESSEL_THROW(kMemFullErr, "ResFileMap");
+        if (jar_.Init()) TESSEL_THROW(kMemFullErr, "ResFileMap");
     }
     ~ResFileMap() {
         int32 left = 0;
-        if (fJar.GetNumCookies(&left))
+        if (jar_.GetNumCookies(&left))
             TESSEL_REPORT(kDebugError, 0x61D7A04Bu) << "ResFileMap::~ResFileMap. Bad Cookie Jar()";
         else if (left)
             TESSEL_REPORT(kDebugWarning, 0x18F3BC26u) << "The Resource Manager is being shut down with open files!";
@@ -45,24 +45,24 @@ public:
             delete storage;
             return false;
         });
-        fJar.Uninit();
+        jar_.Uninit();
     }
     ResFileMap(const ResFileMap&) = delete;
     ResFileMap& operator=(const ResFileMap&) = delete;
 
     RsrcFile Add(Kind kind, ResChain* chain) {
         auto storage = std::make_unique<ResClassStorage>(kind, chain);
-        const RsrcFile refnum = fJar.NewCookie(storage.get());
+        const RsrcFile refnum = jar_.NewCookie(storage.get());
         if (refnum) static_cast<void>(storage.release());
         return refnum;
     }
     ResClassStorage* Find(RsrcFile refnum) {
         ResClassStorage* storage = nullptr;
-        return fJar.GetCookieInfo(refnum, &storage) ? nullptr : storage;
+        return jar_.GetCookieInfo(refnum, &storage) ? nullptr : storage;
     }
     MgErr Remove(RsrcFile refnum) {
         ResClassStorage* storage = nullptr;
-        if (fJar.DisposeCookie(refnum, &storage)) return kNotResFileErr;
+        if (jar_.DisposeCookie(refnum, &storage)) return kNotResFileErr;
         delete storage;
         return kNoErr;
     }
@@ -70,7 +70,7 @@ public:
     template <class Visit>
     void ForEach(Visit visit) {
         CookieList list;
-        if (fJar.GetCookieList(&list)) return;
+        if (jar_.GetCookieList(&list)) return;
         for (int32 i = 0; i < list.GetCount(); ++i) {
             ResClassStorage* storage = Find(list.GetCookie(i));
             if (storage && visit(list.GetCookie(i), storage)) return;
@@ -78,53 +78,53 @@ public:
     }
 
 private:
-    CookieJar<ResClassStorage*> fJar;
+    CookieJar<ResClassStorage*> jar_;
 };
 
-ResFileMap* gResFileMap = nullptr;
+ResFileMap* resFileMap = nullptr;
 
 // The last pairs of a data handle and its resource that were handed out, most recent first.
 class HandleCache {
 public:
     void Put(UHandle handle, Resource* resource) {
-        if (fPairs[0].handle == handle) return;
-        fPairs[1] = fPairs[0];
-        fPairs[0] = {handle, resource};
+        if (pairs_[0].handle == handle) return;
+        pairs_[1] = pairs_[0];
+        pairs_[0] = {handle, resource};
     }
     Resource* Find(UHandle handle) const {
-        for (const Pair& pair : fPairs) {
+        for (const Pair& pair : pairs_) {
             if (pair.handle && pair.handle == handle) return pair.resource;
         }
         return nullptr;
     }
-    void Empty() { fPairs[0] = fPairs[1] = {}; }
+    void Empty() { pairs_[0] = pairs_[1] = {}; }
 
 private:
     struct Pair {
         UHandle handle;
         Resource* resource;
     };
-    Pair fPairs[2] = {};
+    Pair pairs_[2] = {};
 };
 
-HandleCache gHandleCache;
+HandleCache handleCache;
 
 RsrcFile NewRefnum(Kind kind, ResChain* chain) {
-    if (!gResFileMap || !chain) return 0;
-    return GuardedOr<RsrcFile>(0, [&] { return gResFileMap->Add(kind, chain); });
+    if (!resFileMap || !chain) return 0;
+    return GuardedOr<RsrcFile>(0, [&] { return resFileMap->Add(kind, chain); });
 }
 
 // The resource of a handle that was handed out, or the null one. The lock is held.
 Resource* ResourceOf(UHandle handle) {
-    if (!handle || !gResFileMap) return NULLResource();
-    if (Resource* cached = gHandleCache.Find(handle)) return cached;
+    if (!handle || !resFileMap) return NULLResource();
+    if (Resource* cached = handleCache.Find(handle)) return cached;
     Resource* found = nullptr;
-    gResFileMap->ForEach([&](RsrcFile, ResClassStorage* storage) {
+    resFileMap->ForEach([&](RsrcFile, ResClassStorage* storage) {
         found = storage->chain->GetResourceForHandle(handle);
         return found != nullptr;
     });
     if (!found) return NULLResource();
-    gHandleCache.Put(handle, found);
+    handleCache.Put(handle, found);
     return found;
 }
 
@@ -132,7 +132,7 @@ Resource* ResourceOf(UHandle handle) {
 MgErr ShareHandle(Resource* resource, UHandle* data) {
     *data = resource->GetSharedDSHandle();
     if (!*data) return kMemFullErr;
-    gHandleCache.Put(*data, resource);
+    handleCache.Put(*data, resource);
     return kNoErr;
 }
 
@@ -156,31 +156,31 @@ MgErr OpenWithRefnum(RsrcFile* refnum, Open open) {
 }  // namespace
 
 MgErr ResourceManagerStart() {
-    gResFileMap = new ResFileMap();
+    resFileMap = new ResFileMap();
     const MgErr err = ResFileFactory::InitResourceMgr();
     if (err) {
-        delete gResFileMap;
-        gResFileMap = nullptr;
+        delete resFileMap;
+        resFileMap = nullptr;
     }
     return err;
 }
 
 MgErr ResourceManagerStop() {
-    delete gResFileMap;
-    gResFileMap = nullptr;
-    gHandleCache.Empty();
+    delete resFileMap;
+    resFileMap = nullptr;
+    handleCache.Empty();
     return ResFileFactory::UninitResourceMgr();
 }
 
 void EmptyHandleCache() {
-    gHandleCache.Empty();
+    handleCache.Empty();
 }
 
 void ForgetRefnumsOf(const ResChain* chain) {
     OVResChain::Forget(chain);
-    if (!gResFileMap) return;
-    gResFileMap->ForEach([&](RsrcFile refnum, const ResClassStorage* storage) {
-        if (storage->chain == chain) gResFileMap->Remove(refnum);
+    if (!resFileMap) return;
+    resFileMap->ForEach([&](RsrcFile refnum, const ResClassStorage* storage) {
+        if (storage->chain == chain) resFileMap->Remove(refnum);
         return false;
     });
 }
@@ -194,12 +194,12 @@ RsrcFile RMapResBaseToRsrcFile(ResChain* chain) {
 }
 
 ResChain* RsrcFileToRMapResChain(RsrcFile refnum) {
-    const ResClassStorage* storage = gResFileMap ? gResFileMap->Find(refnum) : nullptr;
+    const ResClassStorage* storage = resFileMap ? resFileMap->Find(refnum) : nullptr;
     return storage ? storage->chain : NULLResFile();
 }
 
 ResFile* RsrcFileToRMapResFile(RsrcFile refnum) {
-    const ResClassStorage* storage = gResFileMap ? gResFileMap->Find(refnum) : nullptr;
+    const ResClassStorage* storage = resFileMap ? resFileMap->Find(refnum) : nullptr;
     return storage && storage->kind == Kind::kFile ? static_cast<ResFile*>(storage->chain) : NULLResFile();
 }
 
@@ -489,7 +489,7 @@ MgErr RChain(RsrcFile* refnum, int32 count, const RsrcFile* files) {
 
 MgErr RDestroyChain(RsrcFile refnum) {
     ResFileLock lock;
-    const ResClassStorage* storage = gResFileMap ? gResFileMap->Find(refnum) : nullptr;
+    const ResClassStorage* storage = resFileMap ? resFileMap->Find(refnum) : nullptr;
     if (!storage || storage->kind != Kind::kChain) return kNotResFileErr;
     ResChain* chain = storage->chain;
     ForgetRefnumsOf(chain);
@@ -499,6 +499,6 @@ MgErr RDestroyChain(RsrcFile refnum) {
 
 MgErr RReleaseRsrcFileRefnum(RsrcFile refnum) {
     ResFileLock lock;
-    gHandleCache.Empty();
-    return gResFileMap ? gResFileMap->Remove(refnum) : kNotResFileErr;
+    handleCache.Empty();
+    return resFileMap ? resFileMap->Remove(refnum) : kNotResFileErr;
 }

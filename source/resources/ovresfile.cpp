@@ -22,7 +22,7 @@ namespace {
 // IDs that RUniqueID gives out.
 constexpr int32 kFirstUniqueID = 128;
 constexpr int32 kLastUniqueID = 0x7FFFFFF;
-int32 gNextUniqueID = kFirstUniqueID;
+int32 nextUniqueID = kFirstUniqueID;
 
 void CopyName(ConstPStr from, PStr to) {
     std::memcpy(to, from, from[0] + 1u);
@@ -66,20 +66,20 @@ MgErr ReadRsrcHeader(OVResfileIO& io, RsrcHeader* header, uint64* base) {
 // ---- the lookup cache -----------------------------------------------------------------------------------------------
 
 void ResCache::Set(const OVResource* resource, ResType type, uint32 position) {
-    fResource = resource;
-    fType = type;
-    fPosition = position;
+    resource_ = resource;
+    type_ = type;
+    position_ = position;
 }
 
-bool ResCache::FindRL(const OVResource* resource, const ResourceMap& map, ResType* type, RsrcList** entry) const {
+bool ResCache::FindRL(const OVResource* resource, const ResourceMap& map, ResType* type, ResourceEntry** entry) const {
     if (!type || !entry) {
         ReportUnlocked(
             [] { TESSEL_REPORT(kDebugError, 0x4D2B86F1u) << "ResCache::FindRL, outType or outRLEntry are NULL"; });
         return false;
     }
-    if (fPosition == kNothing || fResource != resource) return false;
-    *type = fType;
-    *entry = map.EntryAt(fPosition);
+    if (position_ == kNothing || resource_ != resource) return false;
+    *type = type_;
+    *entry = map.EntryAt(position_);
     if ((*entry)->loaded == 0)
         ReportUnlocked([] {
             TESSEL_REPORT(kDebugError, 0x7A90C35Eu) << "ResCache::FindRL, Error in cache logic. Hit on stale entry.";
@@ -91,7 +91,7 @@ bool ResCache::FindRL(const OVResource* resource, const ResourceMap& map, ResTyp
 
 OVResFile::~OVResFile() {
     ResFileLock lock;
-    const bool lost = fOpen && fIO && fIO->CanWrite() && (fMap.Head()->fileAttrs & kRFileChanged);
+    const bool lost = open_ && io_ && io_->CanWrite() && (map_.Head()->fileAttrs & kRFileChanged);
     if (lost) {
         ReportUnlocked([] {
             TESSEL_REPORT(kDebugError, 0x3D94B7E6u) << "A resource file goes with changes that are not written!";
@@ -108,57 +108,57 @@ MgErr OVResFile::Open(OVResfileIO* io, _FMFileType* type, _FMFileCreator* creato
         return kArgErr;
     }
     std::unique_ptr<OVResfileIO> source(io);
-    if (fOpen) return kGenericErr;
-    fIO = std::move(source);
+    if (open_) return kGenericErr;
+    io_ = std::move(source);
     if (const MgErr err = Guarded([&] { return OpenSource(sorts); })) {
         Dispose();
         return err;
     }
-    fOpen = true;
-    if (type) *type = fMap.Head()->header.type;
-    if (creator) *creator = fMap.Head()->header.creator;
+    open_ = true;
+    if (type) *type = map_.Head()->header.type;
+    if (creator) *creator = map_.Head()->header.creator;
     return kNoErr;
 }
 
 MgErr OVResFile::OpenSource(bool sorts) {
-    if (const MgErr err = fIO->Prepare()) return err;
+    if (const MgErr err = io_->Prepare()) return err;
     RsrcHeader header;
-    if (const MgErr err = ReadRsrcHeader(*fIO, &header, &fBase)) return err;
-    if (const MgErr err = ReadMap(header, fBase)) return err;
-    RsrcMap* head = fMap.Head();
-    head->fileAttrs = fIO->IsReadOnly() ? kRFileReadOnly : 0;
+    if (const MgErr err = ReadRsrcHeader(*io_, &header, &base_)) return err;
+    if (const MgErr err = ReadMap(header, base_)) return err;
+    RsrcMap* head = map_.Head();
+    head->fileAttrs = io_->IsReadOnly() ? kRFileReadOnly : 0;
     if (head->header.version == kOldestRsrcVersion) std::memcpy(head->header.eol, kRsrcEol, sizeof kRsrcEol);
-    if (sorts) fMap.Sort();
+    if (sorts) map_.Sort();
     head->header.version = kRsrcVersion;
     return kNoErr;
 }
 
 MgErr OVResFile::ReadMap(const RsrcHeader& header, uint64 base) {
-    if (header.mapLength <= kHeaderSize) return fMap.MakeEmpty(header);
+    if (header.mapLength <= kHeaderSize) return map_.MakeEmpty(header);
     // A length that the source does not have must not cost the memory for it.
     uint64 size = 0;
-    if (const MgErr err = fIO->Size(&size)) return err;
+    if (const MgErr err = io_->Size(&size)) return err;
     const uint64 start = base + header.mapOffset;
     if (start > size || header.mapLength > size - start) return kEOFErr;
     UHandle bytes = DSNewHandle(header.mapLength);
     if (!bytes) return kMemFullErr;
-    if (const MgErr err = fIO->Read(start, *bytes, header.mapLength)) {
+    if (const MgErr err = io_->Read(start, *bytes, header.mapLength)) {
         DSDisposeHandle(bytes);
         return err;
     }
-    return fMap.FromDisk(bytes, header);
+    return map_.FromDisk(bytes, header);
 }
 
 MgErr OVResFile::CreateInMemory(_FMFileType type, _FMFileCreator creator) {
     ResFileLock lock;
-    if (const MgErr err = fMap.MakeEmpty(EmptyHeader(type, creator))) return err;
-    fOpen = true;
+    if (const MgErr err = map_.MakeEmpty(EmptyHeader(type, creator))) return err;
+    open_ = true;
     return kNoErr;
 }
 
 MgErr OVResFile::RCloseFile() {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (const MgErr err = RUpdateFile()) return err;
     Dispose();
     return kNoErr;
@@ -166,38 +166,38 @@ MgErr OVResFile::RCloseFile() {
 
 void OVResFile::Dispose() {
     OVResChain::Forget(this);
-    for (OVResource* resource : fLoaded) delete resource;
-    fLoaded.clear();
-    fFreeSlots.clear();
-    fCache.Empty();
-    fMap.Dispose();
-    fIO.reset();
-    fOpen = false;
+    for (OVResource* resource : loaded_) delete resource;
+    loaded_.clear();
+    freeSlots_.clear();
+    cache_.Empty();
+    map_.Dispose();
+    io_.reset();
+    open_ = false;
 }
 
 // ---- loading --------------------------------------------------------------------------------------------------------
 
 // The length word of an entry, which must lie in the data section with all it counts.
-MgErr OVResFile::DataLengthAt(const RsrcList& entry, uint32* length) {
-    const uint64 dataLength = fMap.Head()->header.dataLength;
+MgErr OVResFile::DataLengthAt(const ResourceEntry& entry, uint32* length) {
+    const uint64 dataLength = map_.Head()->header.dataLength;
     const uint64 start = entry.data;
-    if (start + 4 > dataLength || !fIO) return kEOFErr;
+    if (start + 4 > dataLength || !io_) return kEOFErr;
     uint32 word = 0;
-    if (fIO->Read(DataStart() + start, &word, 4)) return kNotResFileErr;
+    if (io_->Read(DataStart() + start, &word, 4)) return kNotResFileErr;
     *length = ToBig32(word);
     return start + 4 + *length > dataLength ? kEOFErr : kNoErr;
 }
 
-MgErr OVResFile::LoadData(const RsrcList& entry, std::unique_ptr<ResourceData>* data) {
+MgErr OVResFile::LoadData(const ResourceEntry& entry, std::unique_ptr<ResourceData>* data) {
     uint32 length = 0;
     if (const MgErr err = DataLengthAt(entry, &length)) return err;
     // Nor may a data section that the source does not have.
     const uint64 start = DataStart() + entry.data + 4;
     uint64 size = 0;
-    if (const MgErr err = fIO->Size(&size)) return err;
+    if (const MgErr err = io_->Size(&size)) return err;
     if (start > size || length > size - start) return kEOFErr;
 
-    if (const uint8* place = fIO->InPlace(start)) {
+    if (const uint8* place = io_->InPlace(start)) {
         *data = std::make_unique<MappedResource>(place, length);
         return kNoErr;
     }
@@ -209,68 +209,68 @@ MgErr OVResFile::LoadData(const RsrcList& entry, std::unique_ptr<ResourceData>* 
         return err;
     }
     *data = std::move(loaded);
-    return fIO->Read(start, *handle, length);
+    return io_->Read(start, *handle, length);
 }
 
-OVResource* OVResFile::LoadedAt(const RsrcList& entry) const {
-    return entry.loaded ? fLoaded[entry.loaded - 1] : nullptr;
+OVResource* OVResFile::LoadedAt(const ResourceEntry& entry) const {
+    return entry.loaded ? loaded_[entry.loaded - 1] : nullptr;
 }
 
-bool OVResFile::IsChanged(const RsrcList& entry) const {
+bool OVResFile::IsChanged(const ResourceEntry& entry) const {
     const OVResource* loaded = LoadedAt(entry);
-    return (entry.attrs & kRChangedAttr) || (loaded && loaded->fUnwritten);
+    return (entry.attrs & kRChangedAttr) || (loaded && loaded->unwritten_);
 }
 
-MgErr OVResFile::Load(ResType type, RsrcList* entry, OVResource** resource) {
+MgErr OVResFile::Load(ResType type, ResourceEntry* entry, OVResource** resource) {
     OVResource* loaded = LoadedAt(*entry);
-    if (!loaded || !loaded->fData) {
+    if (!loaded || !loaded->data_) {
         std::unique_ptr<ResourceData> data;
         if (const MgErr err = LoadData(*entry, &data)) return err;
         if (loaded) {
-            loaded->fData = std::move(data);
+            loaded->data_ = std::move(data);
         } else {
             auto made = std::make_unique<OVResource>(this, std::move(data));
             if (const MgErr err = Attach(made.get())) return err;
             loaded = made.release();
-            entry->loaded = loaded->fSlot;
+            entry->loaded = loaded->slot_;
         }
     }
-    fCache.Set(loaded, type, fMap.PositionOf(entry));
+    cache_.Set(loaded, type, map_.PositionOf(entry));
     *resource = loaded;
     return kNoErr;
 }
 
 MgErr OVResFile::Attach(OVResource* resource) {
-    if (!fFreeSlots.empty()) {
-        resource->fSlot = fFreeSlots.back();
-        fFreeSlots.pop_back();
-        fLoaded[resource->fSlot - 1] = resource;
+    if (!freeSlots_.empty()) {
+        resource->slot_ = freeSlots_.back();
+        freeSlots_.pop_back();
+        loaded_[resource->slot_ - 1] = resource;
         return kNoErr;
     }
     // Room for every slot to be given back, so that giving one back cannot fail.
-    fFreeSlots.reserve(fLoaded.size() + 1);
-    fLoaded.push_back(resource);
-    resource->fSlot = static_cast<uint32>(fLoaded.size());
+    freeSlots_.reserve(loaded_.size() + 1);
+    loaded_.push_back(resource);
+    resource->slot_ = static_cast<uint32>(loaded_.size());
     return kNoErr;
 }
 
 void OVResFile::Forget(OVResource* resource) {
-    fLoaded[resource->fSlot - 1] = nullptr;
-    fFreeSlots.push_back(resource->fSlot);
-    resource->fSlot = 0;
-    resource->fFile = nullptr;
-    fCache.Empty();
+    loaded_[resource->slot_ - 1] = nullptr;
+    freeSlots_.push_back(resource->slot_);
+    resource->slot_ = 0;
+    resource->file_ = nullptr;
+    cache_.Empty();
 }
 
-MgErr OVResFile::FindRL(const OVResource* resource, ResType* type, RsrcList** entry) {
-    if (fCache.FindRL(resource, fMap, type, entry)) return kNoErr;
-    for (int32 i = 0, types = fMap.TypeCount(); i < types; ++i) {
-        RsrcList* entries = fMap.Entries(fMap.TypeAt(i));
-        for (int32 k = 0, count = ResourceMap::CountOf(fMap.TypeAt(i)); k < count; ++k) {
-            if (entries[k].loaded != resource->fSlot) continue;
-            *type = fMap.TypeAt(i)->type;
+MgErr OVResFile::FindRL(const OVResource* resource, ResType* type, ResourceEntry** entry) {
+    if (cache_.FindRL(resource, map_, type, entry)) return kNoErr;
+    for (int32 i = 0, types = map_.TypeCount(); i < types; ++i) {
+        ResourceEntry* entries = map_.Entries(map_.TypeAt(i));
+        for (int32 k = 0, count = ResourceMap::CountOf(map_.TypeAt(i)); k < count; ++k) {
+            if (entries[k].loaded != resource->slot_) continue;
+            *type = map_.TypeAt(i)->type;
             *entry = &entries[k];
-            fCache.Set(resource, *type, fMap.PositionOf(*entry));
+            cache_.Set(resource, *type, map_.PositionOf(*entry));
             return kNoErr;
         }
     }
@@ -283,8 +283,8 @@ MgErr OVResFile::RGet(ResType type, int32 id, Resource** resource) {
     ResFileLock lock;
     if (!resource) return kArgErr;
     *resource = nullptr;
-    if (!fOpen) return kNotResFileErr;
-    RsrcList* entry = fMap.FindEntry(type, id);
+    if (!open_) return kNotResFileErr;
+    ResourceEntry* entry = map_.FindEntry(type, id);
     if (!entry) return kResNotFoundErr;
     return Guarded([&]() -> MgErr {
         OVResource* loaded = nullptr;
@@ -298,8 +298,8 @@ MgErr OVResFile::RExists(ResType type, int32 id, int32* exists) {
     ResFileLock lock;
     if (!exists) return kArgErr;
     *exists = 0;
-    if (!fOpen) return kNotResFileErr;
-    if (!fMap.FindEntry(type, id)) return kResNotFoundErr;
+    if (!open_) return kNotResFileErr;
+    if (!map_.FindEntry(type, id)) return kResNotFoundErr;
     *exists = 1;
     return kNoErr;
 }
@@ -308,12 +308,12 @@ MgErr OVResFile::RGetNamed(ResType type, ConstPStr name, Resource** resource) {
     ResFileLock lock;
     if (!resource || !name) return kArgErr;
     *resource = nullptr;
-    if (!fOpen) return kNotResFileErr;
-    const TypeList* list = fMap.FindType(type);
+    if (!open_) return kNotResFileErr;
+    const TypeEntry* list = map_.FindType(type);
     if (!list) return kResNotFoundErr;
-    RsrcList* entries = fMap.Entries(list);
+    ResourceEntry* entries = map_.Entries(list);
     for (int32 i = 0, count = ResourceMap::CountOf(list); i < count; ++i) {
-        if (entries[i].name == kNoName || !FileNameEqual(fMap.NameOf(&entries[i]), name)) continue;
+        if (entries[i].name == kNoName || !FileNameEqual(map_.NameOf(&entries[i]), name)) continue;
         return Guarded([&]() -> MgErr {
             OVResource* loaded = nullptr;
             const MgErr err = Load(type, &entries[i], &loaded);
@@ -328,11 +328,11 @@ MgErr OVResFile::RIsLoaded(ResType type, int32 id, bool* loaded) {
     ResFileLock lock;
     if (!loaded) return kArgErr;
     *loaded = false;
-    if (!fOpen) return kNotResFileErr;
-    const RsrcList* entry = fMap.FindEntry(type, id);
+    if (!open_) return kNotResFileErr;
+    const ResourceEntry* entry = map_.FindEntry(type, id);
     if (!entry) return kResNotFoundErr;
     const OVResource* resource = LoadedAt(*entry);
-    *loaded = resource && resource->fData;
+    *loaded = resource && resource->data_;
     return kNoErr;
 }
 
@@ -361,8 +361,8 @@ MgErr OVResFile::RGetIndStringPtr(ConstPStr* string, int32 id, int32 index, ResT
 
 Resource* OVResFile::GetResourceForHandle(UHandle data) {
     ResFileLock lock;
-    for (OVResource* resource : fLoaded) {
-        if (resource && resource->fData && resource->fData->ContainsHandle(data)) return resource;
+    for (OVResource* resource : loaded_) {
+        if (resource && resource->data_ && resource->data_->ContainsHandle(data)) return resource;
     }
     return nullptr;
 }
@@ -371,8 +371,8 @@ MgErr OVResFile::RCount(ResType type, int32* count) {
     ResFileLock lock;
     if (!count) return kArgErr;
     *count = 0;
-    if (!fOpen) return kNotResFileErr;
-    if (const TypeList* list = fMap.FindType(type)) *count = ResourceMap::CountOf(list);
+    if (!open_) return kNotResFileErr;
+    if (const TypeEntry* list = map_.FindType(type)) *count = ResourceMap::CountOf(list);
     return kNoErr;
 }
 
@@ -380,8 +380,8 @@ MgErr OVResFile::RCountTypes(int32* count) {
     ResFileLock lock;
     if (!count) return kArgErr;
     *count = 0;
-    if (!fOpen) return kNotResFileErr;
-    *count = fMap.TypeCount();
+    if (!open_) return kNotResFileErr;
+    *count = map_.TypeCount();
     return kNoErr;
 }
 
@@ -389,12 +389,12 @@ MgErr OVResFile::RGetInd(ResType type, int32 index, Resource** resource) {
     ResFileLock lock;
     if (!resource) return kArgErr;
     *resource = nullptr;
-    if (!fOpen) return kNotResFileErr;
-    const TypeList* list = fMap.FindType(type);
+    if (!open_) return kNotResFileErr;
+    const TypeEntry* list = map_.FindType(type);
     if (!list || index < 1 || index > ResourceMap::CountOf(list)) return kResNotFoundErr;
     return Guarded([&]() -> MgErr {
         OVResource* loaded = nullptr;
-        const MgErr err = Load(type, fMap.Entries(list) + (index - 1), &loaded);
+        const MgErr err = Load(type, map_.Entries(list) + (index - 1), &loaded);
         *resource = loaded;
         return err;
     });
@@ -404,23 +404,23 @@ MgErr OVResFile::RGetIndType(ResType* type, int32 index) {
     ResFileLock lock;
     if (!type) return kArgErr;
     *type = 0;
-    if (!fOpen) return kNotResFileErr;
-    if (index < 1 || index > fMap.TypeCount()) return kResNotFoundErr;
-    *type = fMap.TypeAt(index - 1)->type;
+    if (!open_) return kNotResFileErr;
+    if (index < 1 || index > map_.TypeCount()) return kResNotFoundErr;
+    *type = map_.TypeAt(index - 1)->type;
     return kNoErr;
 }
 
 int32 OVResFile::RUniqueID(ResType type) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
-    if (fMap.IsEmpty()) return kFirstUniqueID;
-    int32 id = gNextUniqueID;
-    if (fMap.FindType(type)) {
-        while (id <= kLastUniqueID && fMap.FindEntry(type, id)) ++id;
+    if (!open_) return kNotResFileErr;
+    if (map_.IsEmpty()) return kFirstUniqueID;
+    int32 id = nextUniqueID;
+    if (map_.FindType(type)) {
+        while (id <= kLastUniqueID && map_.FindEntry(type, id)) ++id;
         if (id > kLastUniqueID) return 0;
     }
-    const auto next = static_cast<int32>(static_cast<uint32>(gNextUniqueID) + 1);
-    gNextUniqueID = next <= kFirstUniqueID ? kFirstUniqueID : next;
+    const auto next = static_cast<int32>(static_cast<uint32>(nextUniqueID) + 1);
+    nextUniqueID = next <= kFirstUniqueID ? kFirstUniqueID : next;
     return id;
 }
 
@@ -430,15 +430,15 @@ MgErr OVResFile::RGetModDate(Path path, uint32* date, int32* readOnly) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x39F7D01Au) << "OVResFile::RGetModDate modDate is NULL"; });
         return kArgErr;
     }
-    if (!fOpen) return kNotResFileErr;
-    return FMGetModDate(path, fIO ? fIO->File() : nullptr, date, readOnly);
+    if (!open_) return kNotResFileErr;
+    return FMGetModDate(path, io_ ? io_->File() : nullptr, date, readOnly);
 }
 
 MgErr OVResFile::RGetFileAttrs(uint32* attrs) {
     ResFileLock lock;
     if (!attrs) return kArgErr;
-    if (!fOpen) return kNotResFileErr;
-    *attrs = fMap.Head()->fileAttrs;
+    if (!open_) return kNotResFileErr;
+    *attrs = map_.Head()->fileAttrs;
     return kNoErr;
 }
 
@@ -446,13 +446,13 @@ MgErr OVResFile::RGetFileAttrs(uint32* attrs) {
 
 MgErr OVResFile::RSetFileAttrs(uint32 attrs) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (IsReadOnly()) {
         ReportUnlocked(
             [] { TESSEL_REPORT(kDebugWarning, 0x0B74E9A2u) << "Tried to call RSetFileAttrs on a readonly file"; });
         return kPermissionErr;
     }
-    fMap.Head()->fileAttrs = attrs;
+    map_.Head()->fileAttrs = attrs;
     return kNoErr;
 }
 
@@ -464,22 +464,22 @@ MgErr OVResFile::AddHandle(UHandle data, ResType type, int32 id, ConstPStr name)
     if (const MgErr err = Attach(resource.get())) return err;
     uint32 position = 0;
     MgErr err = held->Adopt(data);
-    if (!err) err = fMap.Insert(type, id, name, &position);
+    if (!err) err = map_.Insert(type, id, name, &position);
     if (err) {
         held->DetachHandle();
         Forget(resource.get());
         return err;
     }
-    resource->fUnwritten = true;
-    fMap.EntryAt(position)->loaded = resource->fSlot;
-    fCache.Set(resource.release(), type, position);
+    resource->unwritten_ = true;
+    map_.EntryAt(position)->loaded = resource->slot_;
+    cache_.Set(resource.release(), type, position);
     Touch();
     return kNoErr;
 }
 
 MgErr OVResFile::RAdd(UHandle data, ResType type, int32 id, ConstPStr name) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (!data) return kResIDExistsErr;
     if (const MgErr err = DSCheckHandle(data)) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x56A3C7D8u) << "RAdd of non-DS Handle"; });
@@ -491,7 +491,7 @@ MgErr OVResFile::RAdd(UHandle data, ResType type, int32 id, ConstPStr name) {
 
 MgErr OVResFile::RAddPtr(const void* data, uint32 size, ResType type, int32 id, ConstPStr name) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (!data) return kResIDExistsErr;
     UHandle copy = nullptr;
     if (const MgErr err = DSPtrToHand(data, &copy, size)) return err;
@@ -501,7 +501,7 @@ MgErr OVResFile::RAddPtr(const void* data, uint32 size, ResType type, int32 id, 
 }
 
 // What the entry's resource held is replaced by a copy. The handle of loaded data stays the same.
-MgErr OVResFile::ReplaceWith(const void* bytes, uint32 size, ResType type, RsrcList* entry) {
+MgErr OVResFile::ReplaceWith(const void* bytes, uint32 size, ResType type, ResourceEntry* entry) {
     auto data = std::make_unique<DSHandleResource>();
     UHandle copy = nullptr;
     if (const MgErr err = DSPtrToHand(bytes, &copy, size)) return err;
@@ -513,22 +513,22 @@ MgErr OVResFile::ReplaceWith(const void* bytes, uint32 size, ResType type, RsrcL
     if (!loaded) {
         auto resource = std::make_unique<OVResource>(this, std::move(data));
         if (const MgErr err = Attach(resource.get())) return err;
-        entry->loaded = resource->fSlot;
+        entry->loaded = resource->slot_;
         loaded = resource.release();
-    } else if (UHandle own = loaded->fData ? loaded->fData->GetSharedDSHandle() : nullptr) {
+    } else if (UHandle own = loaded->data_ ? loaded->data_->GetSharedDSHandle() : nullptr) {
         if (const MgErr err = DSSwapHandles(own, copy)) return err;
     } else {
-        loaded->fData = std::move(data);
+        loaded->data_ = std::move(data);
     }
-    fCache.Set(loaded, type, fMap.PositionOf(entry));
+    cache_.Set(loaded, type, map_.PositionOf(entry));
     return MarkChanged(loaded);
 }
 
 MgErr OVResFile::RReplacePtr(const void* data, uint32 size, ResType type, int32 id) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (IsReadOnly()) return kPermissionErr;
-    RsrcList* entry = fMap.FindEntry(type, id);
+    ResourceEntry* entry = map_.FindEntry(type, id);
     if (!data || !entry) return kResIDExistsErr;
     return Guarded([&] { return ReplaceWith(data, size, type, entry); }) ? kResIDExistsErr : kNoErr;
 }
@@ -540,25 +540,25 @@ MgErr OVResFile::RReplaceDSHandle(UHandle data, ResType type, int32 id) {
 
 MgErr OVResFile::RRemove(Resource* resource) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (IsReadOnly()) return kPermissionErr;
     OVResource* own = OwnResource(resource);
     ResType type = 0;
-    RsrcList* entry = nullptr;
+    ResourceEntry* entry = nullptr;
     if (!own) return kResNotFoundErr;
     if (const MgErr err = FindRL(own, &type, &entry)) return err;
     if (entry->attrs & kRProtectedAttr) return kResNotFoundErr;
-    const uint32 position = fMap.PositionOf(entry);
+    const uint32 position = map_.PositionOf(entry);
     Forget(own);
     delete own;
-    fMap.Remove(type, position);
+    map_.Remove(type, position);
     Touch();
     return kNoErr;
 }
 
 // `resource` if it is loaded in this file, else null.
 OVResource* OVResFile::OwnResource(Resource* resource) const {
-    for (OVResource* loaded : fLoaded) {
+    for (OVResource* loaded : loaded_) {
         if (loaded && loaded == resource) return loaded;
     }
     return nullptr;
@@ -568,21 +568,21 @@ OVResource* OVResFile::OwnResource(Resource* resource) const {
 
 MgErr OVResFile::RPreAllocFile(uint32 size) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (IsReadOnly()) {
         ReportUnlocked(
             [] { TESSEL_REPORT(kDebugWarning, 0x6F14B02Du) << "Tried to call RPreAllocFile on a readonly file"; });
         return kPermissionErr;
     }
-    return fIO ? fIO->Extend(size) : kPermissionErr;
+    return io_ ? io_->Extend(size) : kPermissionErr;
 }
 
 MgErr OVResFile::RGetUHandleOwnership(UHandle* handle) {
     ResFileLock lock;
     if (!handle) return kArgErr;
     *handle = nullptr;
-    if (!fOpen) return kNotResFileErr;
-    *handle = fIO ? fIO->ReleaseHandle() : nullptr;
+    if (!open_) return kNotResFileErr;
+    *handle = io_ ? io_->ReleaseHandle() : nullptr;
     return *handle ? kNoErr : kGenericErr;
 }
 
@@ -590,7 +590,7 @@ MgErr OVResFile::RGetUHandleOwnership(UHandle* handle) {
 
 MgErr OVResFile::Release(OVResource* resource) {
     ResType type = 0;
-    RsrcList* entry = nullptr;
+    ResourceEntry* entry = nullptr;
     if (const MgErr err = FindRL(resource, &type, &entry)) return err;
     if (IsChanged(*entry)) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugWarning, 0x28D5E16Au) << "!!! Tried to release a changed resource"; });
@@ -604,18 +604,18 @@ MgErr OVResFile::Release(OVResource* resource) {
 
 MgErr OVResFile::MarkChanged(OVResource* resource) {
     ResType type = 0;
-    RsrcList* entry = nullptr;
+    ResourceEntry* entry = nullptr;
     if (IsReadOnly()) return kPermissionErr;
     if (const MgErr err = FindRL(resource, &type, &entry)) return err;
     entry->attrs |= kRChangedAttr;
-    resource->fUnwritten = true;
+    resource->unwritten_ = true;
     Touch();
     return kNoErr;
 }
 
 MgErr OVResFile::Detach(OVResource* resource) {
     ResType type = 0;
-    RsrcList* entry = nullptr;
+    ResourceEntry* entry = nullptr;
     if (const MgErr err = FindRL(resource, &type, &entry)) return err;
     if (IsChanged(*entry)) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugWarning, 0x43BC97F0u) << "!!! Tried to detach a changed resource"; });
@@ -628,7 +628,7 @@ MgErr OVResFile::Detach(OVResource* resource) {
 
 MgErr OVResFile::SetAttrs(const OVResource* resource, uint32 attrs) {
     ResType type = 0;
-    RsrcList* entry = nullptr;
+    ResourceEntry* entry = nullptr;
     if (IsReadOnly()) return kPermissionErr;
     if (const MgErr err = FindRL(resource, &type, &entry)) return err;
     entry->attrs = attrs;
@@ -638,17 +638,17 @@ MgErr OVResFile::SetAttrs(const OVResource* resource, uint32 attrs) {
 
 MgErr OVResFile::GetInfo(const OVResource* resource, int32* id, ResType* type, PStr name) {
     ResType ownType = 0;
-    RsrcList* entry = nullptr;
+    ResourceEntry* entry = nullptr;
     if (const MgErr err = FindRL(resource, &ownType, &entry)) return err;
     if (id) *id = entry->id;
     if (type) *type = ownType;
-    if (name) CopyName(fMap.NameOf(entry), name);
+    if (name) CopyName(map_.NameOf(entry), name);
     return kNoErr;
 }
 
 MgErr OVResFile::GetAttrs(const OVResource* resource, uint32* attrs) {
     ResType type = 0;
-    RsrcList* entry = nullptr;
+    ResourceEntry* entry = nullptr;
     if (const MgErr err = FindRL(resource, &type, &entry)) return err;
     *attrs = entry->attrs;
     return kNoErr;
@@ -659,27 +659,27 @@ MgErr OVResFile::GetAttrs(const OVResource* resource, uint32* attrs) {
 OVResource::~OVResource() {
     ResFileLock lock;
     EmptyHandleCache();
-    fData.reset();
+    data_.reset();
 }
 
 MgErr OVResource::RRelease() {
     ResFileLock lock;
-    return fFile ? fFile->Release(this) : kResNotFoundErr;
+    return file_ ? file_->Release(this) : kResNotFoundErr;
 }
 
 MgErr OVResource::RChanged() {
     ResFileLock lock;
-    return fFile ? fFile->MarkChanged(this) : kResNotFoundErr;
+    return file_ ? file_->MarkChanged(this) : kResNotFoundErr;
 }
 
 MgErr OVResource::DetachResource() {
     ResFileLock lock;
-    return fFile ? fFile->Detach(this) : kResNotFoundErr;
+    return file_ ? file_->Detach(this) : kResNotFoundErr;
 }
 
 MgErr OVResource::RSetAttrs(uint32 attrs) {
     ResFileLock lock;
-    return fFile ? fFile->SetAttrs(this, attrs) : kResNotFoundErr;
+    return file_ ? file_->SetAttrs(this, attrs) : kResNotFoundErr;
 }
 
 MgErr OVResource::RSize(uint32* size) {
@@ -690,45 +690,45 @@ MgErr OVResource::RSize(uint32* size) {
 
 MgErr OVResource::RGetInfo(int32* id, ResType* type, PStr name) {
     ResFileLock lock;
-    return fFile ? fFile->GetInfo(this, id, type, name) : kResNotFoundErr;
+    return file_ ? file_->GetInfo(this, id, type, name) : kResNotFoundErr;
 }
 
 MgErr OVResource::RGetAttrs(uint32* attrs) {
     ResFileLock lock;
     if (!attrs) return kArgErr;
-    return fFile ? fFile->GetAttrs(this, attrs) : kResNotFoundErr;
+    return file_ ? file_->GetAttrs(this, attrs) : kResNotFoundErr;
 }
 
 UHandle OVResource::GetSharedDSHandle() {
     ResFileLock lock;
-    return fData ? fData->GetSharedDSHandle() : nullptr;
+    return data_ ? data_->GetSharedDSHandle() : nullptr;
 }
 
 MgErr OVResource::DetachHandle(UHandle* data) {
     ResFileLock lock;
     if (!data) return kArgErr;
     *data = GetSharedDSHandle();
-    if (!*data) return fData ? kMemFullErr : kResNotFoundErr;
-    fData->DetachHandle();
-    fData.reset();
+    if (!*data) return data_ ? kMemFullErr : kResNotFoundErr;
+    data_->DetachHandle();
+    data_.reset();
     EmptyHandleCache();
-    if (fFile) fFile->fCache.Empty();
+    if (file_) file_->cache_.Empty();
     return kNoErr;
 }
 
 uint32 OVResource::GetSize() {
     ResFileLock lock;
-    return fData ? fData->GetSize() : 0;
+    return data_ ? data_->GetSize() : 0;
 }
 
 const uint8* OVResource::GetData() {
     ResFileLock lock;
-    return fData ? fData->GetData() : nullptr;
+    return data_ ? data_->GetData() : nullptr;
 }
 
 bool OVResource::ContainsHandle(UHandle data) {
     ResFileLock lock;
-    return fData && fData->ContainsHandle(data);
+    return data_ && data_->ContainsHandle(data);
 }
 
 }  // namespace tessel
