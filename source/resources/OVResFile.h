@@ -45,13 +45,19 @@ private:
     bool unwritten_ = false;  // the data are only here, whatever the attributes say
 };
 
+// Where a resource stands in the map, and under which type. Without an entry it was not found.
+struct FoundEntry {
+    ResType type = 0;
+    ResourceEntry* entry = nullptr;
+};
+
 // The last resource found in a file, where its entry stands, and its type.
 class ResCache {
 public:
     void Set(const OVResource* resource, ResType type, uint32 position);
     void Empty() { position_ = kNothing; }
     // Answers when `resource` is the cached one.
-    bool FindRL(const OVResource* resource, const ResourceMap& map, ResType* type, ResourceEntry** entry) const;
+    FoundEntry Find(const OVResource* resource, const ResourceMap& map) const;
 
 private:
     static constexpr uint32 kNothing = ~uint32{0};
@@ -118,7 +124,7 @@ private:
     void Forget(OVResource* resource);   // takes the slot back
 
     // the entry of a resource
-    MgErr FindRL(const OVResource* resource, ResType* type, ResourceEntry** entry);
+    FoundEntry FindEntry(const OVResource* resource);
     bool IsChanged(const ResourceEntry& entry) const;
     void Touch() { map_.Head()->fileAttrs |= kRFileChanged; }
     bool IsReadOnly() const { return (map_.Head()->fileAttrs & kRFileReadOnly) != 0; }

@@ -71,20 +71,14 @@ void ResCache::Set(const OVResource* resource, ResType type, uint32 position) {
     position_ = position;
 }
 
-bool ResCache::FindRL(const OVResource* resource, const ResourceMap& map, ResType* type, ResourceEntry** entry) const {
-    if (!type || !entry) {
-        ReportUnlocked(
-            [] { TESSEL_REPORT(kDebugError, 0x4D2B86F1u) << "ResCache::FindRL, outType or outRLEntry are NULL"; });
-        return false;
-    }
-    if (position_ == kNothing || resource_ != resource) return false;
-    *type = type_;
-    *entry = map.EntryAt(position_);
-    if ((*entry)->loaded == 0)
+FoundEntry ResCache::Find(const OVResource* resource, const ResourceMap& map) const {
+    if (position_ == kNothing || resource_ != resource) return {};
+    ResourceEntry* entry = map.EntryAt(position_);
+    if (entry->loaded == 0)
         ReportUnlocked([] {
             TESSEL_REPORT(kDebugError, 0x7A90C35Eu) << "ResCache::FindRL, Error in cache logic. Hit on stale entry.";
         });
-    return true;
+    return {type_, entry};
 }
 
 // ---- opening and closing --------------------------------------------------------------------------------------------
@@ -262,19 +256,18 @@ void OVResFile::Forget(OVResource* resource) {
     cache_.Empty();
 }
 
-MgErr OVResFile::FindRL(const OVResource* resource, ResType* type, ResourceEntry** entry) {
-    if (cache_.FindRL(resource, map_, type, entry)) return kNoErr;
+FoundEntry OVResFile::FindEntry(const OVResource* resource) {
+    if (const FoundEntry cached = cache_.Find(resource, map_); cached.entry) return cached;
     for (int32 i = 0, types = map_.TypeCount(); i < types; ++i) {
-        ResourceEntry* entries = map_.Entries(map_.TypeAt(i));
-        for (int32 k = 0, count = ResourceMap::CountOf(map_.TypeAt(i)); k < count; ++k) {
+        const TypeEntry* type = map_.TypeAt(i);
+        ResourceEntry* entries = map_.Entries(type);
+        for (int32 k = 0, count = ResourceMap::CountOf(type); k < count; ++k) {
             if (entries[k].loaded != resource->slot_) continue;
-            *type = map_.TypeAt(i)->type;
-            *entry = &entries[k];
-            cache_.Set(resource, *type, map_.PositionOf(*entry));
-            return kNoErr;
+            cache_.Set(resource, type->type, map_.PositionOf(&entries[k]));
+            return {type->type, &entries[k]};
         }
     }
-    return kResNotFoundErr;
+    return {};
 }
 
 // ---- reading --------------------------------------------------------------------------------------------------------
@@ -543,15 +536,14 @@ MgErr OVResFile::RRemove(Resource* resource) {
     if (!open_) return kNotResFileErr;
     if (IsReadOnly()) return kPermissionErr;
     OVResource* own = OwnResource(resource);
-    ResType type = 0;
-    ResourceEntry* entry = nullptr;
     if (!own) return kResNotFoundErr;
-    if (const MgErr err = FindRL(own, &type, &entry)) return err;
-    if (entry->attrs & kRProtectedAttr) return kResNotFoundErr;
-    const uint32 position = map_.PositionOf(entry);
+    const FoundEntry found = FindEntry(own);
+    if (!found.entry) return kResNotFoundErr;
+    if (found.entry->attrs & kRProtectedAttr) return kResNotFoundErr;
+    const uint32 position = map_.PositionOf(found.entry);
     Forget(own);
     delete own;
-    map_.Remove(type, position);
+    map_.Remove(found.type, position);
     Touch();
     return kNoErr;
 }
@@ -589,68 +581,62 @@ MgErr OVResFile::RGetUHandleOwnership(UHandle* handle) {
 // ---- what the resources ask their file ------------------------------------------------------------------------------
 
 MgErr OVResFile::Release(OVResource* resource) {
-    ResType type = 0;
-    ResourceEntry* entry = nullptr;
-    if (const MgErr err = FindRL(resource, &type, &entry)) return err;
-    if (IsChanged(*entry)) {
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    if (IsChanged(*found.entry)) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugWarning, 0x28D5E16Au) << "!!! Tried to release a changed resource"; });
         return kArgErr;
     }
-    entry->loaded = 0;
+    found.entry->loaded = 0;
     Forget(resource);
     delete resource;
     return kNoErr;
 }
 
 MgErr OVResFile::MarkChanged(OVResource* resource) {
-    ResType type = 0;
-    ResourceEntry* entry = nullptr;
     if (IsReadOnly()) return kPermissionErr;
-    if (const MgErr err = FindRL(resource, &type, &entry)) return err;
-    entry->attrs |= kRChangedAttr;
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    found.entry->attrs |= kRChangedAttr;
     resource->unwritten_ = true;
     Touch();
     return kNoErr;
 }
 
 MgErr OVResFile::Detach(OVResource* resource) {
-    ResType type = 0;
-    ResourceEntry* entry = nullptr;
-    if (const MgErr err = FindRL(resource, &type, &entry)) return err;
-    if (IsChanged(*entry)) {
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    if (IsChanged(*found.entry)) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugWarning, 0x43BC97F0u) << "!!! Tried to detach a changed resource"; });
         return kResNotFoundErr;
     }
-    entry->loaded = 0;
+    found.entry->loaded = 0;
     Forget(resource);
     return kNoErr;
 }
 
 MgErr OVResFile::SetAttrs(const OVResource* resource, uint32 attrs) {
-    ResType type = 0;
-    ResourceEntry* entry = nullptr;
     if (IsReadOnly()) return kPermissionErr;
-    if (const MgErr err = FindRL(resource, &type, &entry)) return err;
-    entry->attrs = attrs;
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    found.entry->attrs = attrs;
     Touch();
     return kNoErr;
 }
 
 MgErr OVResFile::GetInfo(const OVResource* resource, int32* id, ResType* type, PStr name) {
-    ResType ownType = 0;
-    ResourceEntry* entry = nullptr;
-    if (const MgErr err = FindRL(resource, &ownType, &entry)) return err;
-    if (id) *id = entry->id;
-    if (type) *type = ownType;
-    if (name) CopyName(map_.NameOf(entry), name);
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    if (id) *id = found.entry->id;
+    if (type) *type = found.type;
+    if (name) CopyName(map_.NameOf(found.entry), name);
     return kNoErr;
 }
 
 MgErr OVResFile::GetAttrs(const OVResource* resource, uint32* attrs) {
-    ResType type = 0;
-    ResourceEntry* entry = nullptr;
-    if (const MgErr err = FindRL(resource, &type, &entry)) return err;
-    *attrs = entry->attrs;
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    *attrs = found.entry->attrs;
     return kNoErr;
 }
 
