@@ -1,9 +1,9 @@
-// An open resource file, its resources, and the cache of the last one found.
+// An open resource file, and the cache of the last one found.
 #ifndef TESSEL_SOURCE_RESOURCES_OVRESFILE_H
 #define TESSEL_SOURCE_RESOURCES_OVRESFILE_H
 
 #include "resources/OVResfileIO.h"
-#include "resources/ResourceData.h"
+#include "resources/OVResource.h"
 #include "resources/ResourceMap.h"
 #include <tessel/memory/TrackedMallocFree.h>
 #include <tessel/resources/ovresfile.h>
@@ -12,38 +12,6 @@
 #include <vector>
 
 namespace tessel {
-
-class OVResFile;
-
-// A loaded resource. Belongs to its file until it is detached; without a file its map side fails with kResNotFoundErr.
-class OVResource final : public Resource, public TrackedObject {
-public:
-    OVResource(OVResFile* file, std::unique_ptr<ResourceData> data) : file_(file), data_(std::move(data)) {}
-    ~OVResource() override;
-    OVResource(const OVResource&) = delete;
-    OVResource& operator=(const OVResource&) = delete;
-
-    MgErr RRelease() override;
-    MgErr RChanged() override;
-    MgErr DetachResource() override;
-    MgErr RSetAttrs(uint32 attrs) override;
-    MgErr RSize(uint32* size) override;
-    MgErr RGetInfo(int32* id, ResType* type, PStr name) override;
-    MgErr RGetAttrs(uint32* attrs) override;
-    UHandle GetSharedDSHandle() override;
-    MgErr DetachHandle(UHandle* data) override;
-    uint32 GetSize() override;
-    const uint8* GetData() override;
-    bool ContainsHandle(UHandle data) override;
-
-private:
-    friend class OVResFile;
-
-    OVResFile* file_;
-    std::unique_ptr<ResourceData> data_;
-    uint32 slot_ = 0;         // in the file's table of loaded resources, plus one
-    bool unwritten_ = false;  // the data are only here, whatever the attributes say
-};
 
 // Where a resource stands in the map, and under which type. Without an entry it was not found.
 struct FoundEntry {

@@ -15,8 +15,7 @@ namespace tessel {
 //
 // Once FromDisk has accepted a map, the counts, lists and names in it lie inside it and do not overlap: the header, the
 // type list, the reference lists (in any order, possibly with gaps), the names; no type is there twice. Every change
-// keeps it so. A map without
-// types is always the 52 bytes of an empty one.
+// keeps it so. A map without types is always the 52 bytes of an empty one.
 //
 // Positions are offsets from the map start; pointers are good until the next change.
 class ResourceMap {
@@ -91,14 +90,6 @@ private:
     UHandle handle_ = nullptr;
     uint32 size_ = 0;
 };
-
-// Converts a map in place between file and host order and, coming from disk, checks it against the header and itself.
-// kIOErr: it does not pass. `header` is in host order.
-enum class MapDirection { kFromDisk, kToDisk };
-MgErr StandardizeAndSanityChkRsrcMap(uint8* map, uint32 size, MapDirection direction, const RsrcHeader& header);
-
-// Whether two headers, the file's and the map's copy, belong together.
-bool SanityCheckRsrcMap(const RsrcHeader& copy, const RsrcHeader& header);
 
 }  // namespace tessel
 
