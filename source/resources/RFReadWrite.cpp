@@ -107,6 +107,39 @@ MgErr AssignText(const Bytes& text, std::string* out) {
     return kNoErr;
 }
 
+// The data of a resource in place. `find` looks for the resource.
+template <class Find>
+MgErr PointToData(const uint8** data, uint32* size, Find find) {
+    if (!data) return kArgErr;
+    *data = nullptr;
+    if (size) *size = 0;
+    ResFileLock lock;
+    Resource* resource = nullptr;
+    if (const MgErr err = find(&resource)) return err;
+    *data = resource->GetData();
+    if (size) *size = resource->GetSize();
+    return kNoErr;
+}
+
+// Hands the data of a resource over to the caller and ends the resource. With changes that are not written it stays.
+MgErr TakeData(Resource* resource, UHandle* data) {
+    if (!resource->GetSharedDSHandle()) return kMemFullErr;
+    if (const MgErr err = resource->DetachResource()) return err;
+    const MgErr err = resource->DetachHandle(data);
+    delete resource;
+    return err;
+}
+
+template <class Find>
+MgErr TakeFoundData(UHandle* data, Find find) {
+    if (!data) return kArgErr;
+    *data = nullptr;
+    ResFileLock lock;
+    Resource* resource = nullptr;
+    if (const MgErr err = find(&resource)) return err;
+    return TakeData(resource, data);
+}
+
 }  // namespace
 
 // ---- the reader -----------------------------------------------------------------------------------------------------
@@ -160,62 +193,27 @@ MgErr RFReader::Close() {
 }
 
 MgErr RFReader::PtrToResDataInternal(ResType type, int32 id, const uint8** data, uint32* size) {
-    if (!data) return kArgErr;
-    *data = nullptr;
-    if (size) *size = 0;
-    if (!chain_) return kResNotFoundErr;
-    ResFileLock lock;
-    Resource* resource = nullptr;
-    if (const MgErr err = chain_->RGet(type, id, &resource)) return err;
-    *data = resource->GetData();
-    if (size) *size = resource->GetSize();
-    return kNoErr;
+    return PointToData(data, size, [&](Resource** resource) -> MgErr {
+        return chain_ ? chain_->RGet(type, id, resource) : kResNotFoundErr;
+    });
 }
 
 MgErr RFReader::PtrToResDataByNameInternal(ResType type, ConstPStr name, const uint8** data, uint32* size) {
-    if (!data) return kArgErr;
-    *data = nullptr;
-    if (size) *size = 0;
-    if (!chain_) return kResNotFoundErr;
-    ResFileLock lock;
-    Resource* resource = nullptr;
-    if (const MgErr err = chain_->RGetNamed(type, name, &resource)) return err;
-    *data = resource->GetData();
-    if (size) *size = resource->GetSize();
-    return kNoErr;
+    return PointToData(data, size, [&](Resource** resource) -> MgErr {
+        return chain_ ? chain_->RGetNamed(type, name, resource) : kResNotFoundErr;
+    });
 }
-
-namespace {
-
-// Hands the data of a resource over to the caller and ends the resource. With changes that are not written it stays.
-MgErr TakeData(Resource* resource, UHandle* data) {
-    if (!resource->GetSharedDSHandle()) return kMemFullErr;
-    if (const MgErr err = resource->DetachResource()) return err;
-    const MgErr err = resource->DetachHandle(data);
-    delete resource;
-    return err;
-}
-
-}  // namespace
 
 MgErr RFReader::AllocDSHandle(ResType type, int32 id, UHandle* data) {
-    if (!data) return kArgErr;
-    *data = nullptr;
-    if (!chain_) return kResNotFoundErr;
-    ResFileLock lock;
-    Resource* resource = nullptr;
-    if (const MgErr err = chain_->RGet(type, id, &resource)) return err;
-    return TakeData(resource, data);
+    return TakeFoundData(data, [&](Resource** resource) -> MgErr {
+        return chain_ ? chain_->RGet(type, id, resource) : kResNotFoundErr;
+    });
 }
 
 MgErr RFReader::AllocDSHandleByName(ResType type, ConstPStr name, UHandle* data) {
-    if (!data) return kArgErr;
-    *data = nullptr;
-    if (!chain_) return kResNotFoundErr;
-    ResFileLock lock;
-    Resource* resource = nullptr;
-    if (const MgErr err = chain_->RGetNamed(type, name, &resource)) return err;
-    return TakeData(resource, data);
+    return TakeFoundData(data, [&](Resource** resource) -> MgErr {
+        return chain_ ? chain_->RGetNamed(type, name, resource) : kResNotFoundErr;
+    });
 }
 
 MgErr RFReader::GetString(int32 id, UHandle* data) {
