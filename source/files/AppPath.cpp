@@ -1,3 +1,4 @@
+// The folders of the running program and of the library.
 #include "diagnostics/Guarded.h"
 #include "files/FileSupport.h"
 #include <tessel/base/MGAppInterface.h>

@@ -27,10 +27,6 @@ constexpr int32 kAnyWrite = 0222;
 constexpr int64 kEpochOffset = 95616288000000000;
 constexpr int64 kTicksPerSecond = 10000000;
 
-MgErr ErrUnless(bool ok) {
-    return ok ? kNoErr : Win32ToOVFileErr();
-}
-
 // The list of volumes: what a path without names stands for.
 void DescribeVolumeList(FInfo64Rec* info) {
     info->type = info->creator = kUnknownCode;
@@ -52,6 +48,13 @@ MgErr DescribeFolder(const char* name, uint8 mask, FInfo64Rec* info) {
     info->folder = 1;
     if (mask & kFInfoSize) return ErrUnless(platform::FolderCount(name, info->size));
     return kNoErr;
+}
+
+// Seconds since 1904 of 100 ns ticks since 1601, to the nearest; 0 for dates before, the last second for dates beyond.
+uint32 FileTimeToSeconds(int64 fileTime) {
+    if (fileTime < kEpochOffset) return 0;
+    const int64 seconds = (fileTime - kEpochOffset + kTicksPerSecond / 2) / kTicksPerSecond;
+    return static_cast<uint32>(std::min<int64>(seconds, std::numeric_limits<uint32>::max()));
 }
 
 void DescribeDates(const platform::ItemInfo& item, uint8 mask, FInfo64Rec* info) {
@@ -166,18 +169,13 @@ bool HasShortcutName(const std::string& name) {
            });
 }
 
-}  // namespace
-
-uint32 FileTimeToSeconds(int64 fileTime) {
-    if (fileTime < kEpochOffset) return 0;
-    const int64 seconds = (fileTime - kEpochOffset + kTicksPerSecond / 2) / kTicksPerSecond;
-    return static_cast<uint32>(std::min<int64>(seconds, std::numeric_limits<uint32>::max()));
-}
-
+// The permissions that are reported for an item.
 int32 ReportedPermissions(bool folder, bool readOnly) {
     if (folder) return readOnly ? 0555 : 0777;
     return readOnly ? 0444 : 0666;
 }
+
+}  // namespace
 
 }  // namespace tessel
 

@@ -1,17 +1,11 @@
-// Open files: access, reading and writing, position and size, and the service.
+// Open files: access, reading and writing, position and size.
 #include "diagnostics/Guarded.h"
 #include "files/FileSupport.h"
-#include "files/Service.h"
 #include "platform/Clock.h"
 #include "platform/LastError.h"
 #include "strings/FmtEngine.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/FileManager.h>
-#include <tessel/memory/MemoryManager.h>
-#include <tessel/paths/PathManager.h>
-#include <tessel/paths/PathText.h>
-#include <tessel/strings/StringFmtPrint.h>
-#include <tessel/sync/ThMutex.h>
 
 #include <cstring>
 
@@ -19,20 +13,13 @@ namespace tessel {
 
 namespace {
 
-ThMutex gFileManagerMutex = nullptr;
-
 constexpr int32 kShareAttempts = 3;
 constexpr uint32 kShareWaitMs = 50;
 
-// The last failure of the system, for a call that returned `ok`.
-MgErr ErrUnless(bool ok) {
-    return ok ? kNoErr : Win32ToOVFileErr();
-}
-
 // Opens an existing file, waiting a little while someone else holds it.
-platform::FileHandle OpenPatiently(const char* name, const OpenAccess& modes, platform::Disposition disposition) {
+platform::FileHandle OpenPatiently(const OpenRequest& request, platform::Disposition disposition) {
     for (int32 attempt = 1;; ++attempt) {
-        const platform::FileHandle handle = platform::FileOpen(name, modes.access, modes.denied, disposition);
+        const platform::FileHandle handle = request.Open(disposition);
         if (handle != platform::kNoFile || attempt == kShareAttempts ||
             platform::LastError() != platform::kErrorSharingViolation)
             return handle;
@@ -52,83 +39,20 @@ MgErr MoveTo(File_t* file, int64 position) {
     return ErrUnless(platform::FileSeek(HandleOf(file), position, platform::SeekFrom::kStart));
 }
 
-// Formats into a pointer block of its own and writes it. *written is what went to the file.
-// What stands before the fault of a bad format is written only on request.
+// Formats and writes. *written is what went to the file. What stands before the fault of a bad format is written only
+// on request.
 enum class BadFormat { kWriteStart, kWriteNothing };
 
 MgErr PrintToFile(File_t* file, CStr format, va_list args, BadFormat bad, uint32* written) {
     *written = 0;
     if (!file || !format) return kArgErr;
-    const auto length = static_cast<int32>(std::strlen(format));
-    va_list measured;
-    va_copy(measured, args);
-    const Formatted needed = FormatText(nullptr, 0, format, length, measured);
-    va_end(measured);
-    if (!needed.good && bad == BadFormat::kWriteNothing) return kFormatErr;
-
-    const auto size = static_cast<uint32>(needed.length);
-    UPtr text = DSNewPtr(size);
-    if (!text) return kMemFullErr;
-    SPrintfv(reinterpret_cast<char*>(text), needed.length, format, length, args);
-    const MgErr err = FMWrite(file, size, written, text);
-    DSDisposePtr(text);
-    return err;
-}
-
-MgErr TranslateModes(int32 openMode, int32 denyMode, OpenAccess* out) {
-    static constexpr uint32 kAccess[] = {platform::kRead | platform::kWrite, platform::kRead, platform::kWrite,
-                                         platform::kWrite};
-    static constexpr uint32 kDenied[] = {platform::kRead | platform::kWrite, platform::kWrite, 0};
-    if (openMode < kFOpenReadWrite || openMode > kFOpenWriteTruncDirect) return kArgErr;
-    if (denyMode < kFDenyReadWrite || denyMode > kFDenyNone) return kArgErr;
-    out->access = kAccess[openMode % 4];
-    out->denied = kDenied[denyMode];
-    return kNoErr;
+    FormattedText text;
+    if (const MgErr err = text.Format(format, std::strlen(format), args)) return err;
+    if (!text.Good() && bad == BadFormat::kWriteNothing) return kFormatErr;
+    return FMWrite(file, static_cast<uint32>(text.Length()), written, text.Bytes());
 }
 
 }  // namespace
-
-// ---- shared by the file functions -----------------------------------------------------------------------------------
-
-MgErr PlatformName::Make(Path path, bool resolveShortcuts) {
-    return MakeDOSPathName(path, text_, resolveShortcuts ? 1 : 0);
-}
-
-MgErr OpenWith(File_t** file, Path path, int32 openMode, int32 denyMode,
-               const std::function<platform::FileHandle(const char* name, const OpenAccess& access)>& open) {
-    if (!file) return kArgErr;
-    return Guarded([&]() -> MgErr {
-        FlushPathCache(path);
-        *file = nullptr;
-        OpenAccess modes;
-        if (!FIsAbsPath(path)) return kArgErr;
-        if (const MgErr err = TranslateModes(openMode, denyMode, &modes)) return err;
-        PlatformName name;
-        if (const MgErr err = name.Make(path, true)) return err;
-        if (IsVolume(path)) return kArgErr;
-        const platform::FileHandle handle = open(name.Text(), modes);
-        if (handle == platform::kNoFile) return Win32ToOVFileErr();
-        *file = FileOf(handle);
-        return kNoErr;
-    });
-}
-
-FileManagerLock::FileManagerLock() {
-    ThMutexAcquire(gFileManagerMutex);
-}
-FileManagerLock::~FileManagerLock() {
-    ThMutexRelease(gFileManagerMutex);
-}
-
-MgErr FileManagerStart() {
-    return ThMutexCreate(&gFileManagerMutex, "FileManager");
-}
-
-MgErr FileManagerStop() {
-    ThMutexDestroy(gFileManagerMutex);
-    gFileManagerMutex = nullptr;
-    return kNoErr;
-}
 
 }  // namespace tessel
 
@@ -137,10 +61,14 @@ using namespace tessel;
 // ---- opening and closing --------------------------------------------------------------------------------------------
 
 MgErr FMOpen(File_t** file, Path path, int32 openMode, int32 denyMode) {
-    const auto disposition =
-        openMode == kFOpenWriteTrunc ? platform::Disposition::kTruncateExisting : platform::Disposition::kOpenExisting;
-    return OpenWith(file, path, openMode, denyMode, [=](const char* name, const OpenAccess& access) {
-        return OpenPatiently(name, access, disposition);
+    if (!file) return kArgErr;
+    *file = nullptr;
+    return Guarded([&]() -> MgErr {
+        OpenRequest request;
+        if (const MgErr err = request.Check(path, openMode, denyMode)) return err;
+        const auto disposition = openMode == kFOpenWriteTrunc ? platform::Disposition::kTruncateExisting
+                                                              : platform::Disposition::kOpenExisting;
+        return OpenedFile(OpenPatiently(request, disposition), file);
     });
 }
 

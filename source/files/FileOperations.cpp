@@ -17,10 +17,6 @@ namespace {
 constexpr uint32 kCopyBlock = 8192;
 constexpr int32 kNewFolderPermissions = 0777;
 
-MgErr ErrUnless(bool ok) {
-    return ok ? kNoErr : Win32ToOVFileErr();
-}
-
 // An open file that closes itself.
 class OpenFile {
 public:
@@ -72,17 +68,7 @@ MgErr CopyInto(Path from, Path to) {
     return sourceErr || destinationErr ? kIOErr : kNoErr;
 }
 
-// Removes the item that `name` names, which is also `path`.
-MgErr RemoveItem(Path path, const char* name) {
-    platform::ItemInfo info;
-    if (!platform::ItemGetInfo(name, info)) return Win32ToOVFileErr();
-    if (!info.folder) return ErrUnless(platform::FileDelete(name));
-    LeaveFolder(path);
-    return ErrUnless(platform::FolderRemove(name));
-}
-
-}  // namespace
-
+// When the current directory lies inside `path`, goes to the parent of `path`. A failure is only reported.
 void LeaveFolder(Path path) {
     MgErr err = kNoErr;
     try {
@@ -102,6 +88,17 @@ void LeaveFolder(Path path) {
         TESSEL_REPORT(kDebugWarning, 0x2F9D6C18u) << "failed to preprocess move file " << path << ", error " << err;
 }
 
+// Removes the item that `name` names, which is also `path`.
+MgErr RemoveItem(Path path, const char* name) {
+    platform::ItemInfo info;
+    if (!platform::ItemGetInfo(name, info)) return Win32ToOVFileErr();
+    if (!info.folder) return ErrUnless(platform::FileDelete(name));
+    LeaveFolder(path);
+    return ErrUnless(platform::FolderRemove(name));
+}
+
+}  // namespace
+
 }  // namespace tessel
 
 using namespace tessel;
@@ -109,9 +106,13 @@ using namespace tessel;
 // ---- creating -------------------------------------------------------------------------------------------------------
 
 MgErr FGenericCreate(File_t** file, Path path, int32, int32 openMode, int32 denyMode, int32, int32 always) {
-    const auto disposition = always ? platform::Disposition::kCreateAlways : platform::Disposition::kCreateNew;
-    return OpenWith(file, path, openMode, denyMode, [=](const char* name, const OpenAccess& access) {
-        return platform::FileOpen(name, access.access, access.denied, disposition);
+    if (!file) return kArgErr;
+    *file = nullptr;
+    return Guarded([&]() -> MgErr {
+        OpenRequest request;
+        if (const MgErr err = request.Check(path, openMode, denyMode)) return err;
+        const auto disposition = always ? platform::Disposition::kCreateAlways : platform::Disposition::kCreateNew;
+        return OpenedFile(request.Open(disposition), file);
     });
 }
 

@@ -1,12 +1,12 @@
-// What the file functions share: names for the system, access flags, dates.
+// What the file functions share: names for the system, what was asked of a file, results.
 #ifndef TESSEL_SOURCE_FILES_FILESUPPORT_H
 #define TESSEL_SOURCE_FILES_FILESUPPORT_H
 
 #include "platform/File.h"
 #include <tessel/base/MgErr.h>
 #include <tessel/base/StringTypes.h>
+#include <tessel/files/FileManager.h>
 
-#include <functional>
 #include <string>
 
 namespace tessel {
@@ -31,15 +31,29 @@ inline File_t* FileOf(platform::FileHandle handle) {
     return reinterpret_cast<File_t*>(handle);
 }
 
-// The open and deny modes as the system's access and denied access.
-struct OpenAccess {
-    uint32 access = 0;
-    uint32 denied = 0;
+// What was asked of a file that is to be opened or created.
+class OpenRequest {
+public:
+    // kArgErr for a path that cannot be a file's, and for unknown modes. Drops what the path has cached about its item.
+    MgErr Check(Path path, int32 openMode, int32 denyMode);
+    // kNoFile: the last failure of the system says why.
+    platform::FileHandle Open(platform::Disposition disposition) const {
+        return platform::FileOpen(name_.Text(), access_, denied_, disposition);
+    }
+
+private:
+    PlatformName name_;
+    uint32 access_ = 0;
+    uint32 denied_ = 0;
 };
-// What opening and creating have in common: checks the path and the modes, then lets `open` have the name and the
-// access.
-MgErr OpenWith(File_t** file, Path path, int32 openMode, int32 denyMode,
-               const std::function<platform::FileHandle(const char* name, const OpenAccess& access)>& open);
+
+// Hands out what was opened, or says why it was not.
+MgErr OpenedFile(platform::FileHandle handle, File_t** file);
+
+// The last failure of the system, for a call that returned `ok`.
+inline MgErr ErrUnless(bool ok) {
+    return ok ? kNoErr : Win32ToOVFileErr();
+}
 
 // Drops what a path has cached about its item. Nothing for null.
 void FlushPathCache(Path path);
@@ -49,15 +63,6 @@ bool IsVolume(Path path);
 
 // Sets *path, made when it is null, to the path of a name.
 MgErr NameToPath(const std::string& name, Path* path);
-
-// Seconds since 1904 of 100 ns ticks since 1601, to the nearest; 0 for dates before, the last second for dates beyond.
-uint32 FileTimeToSeconds(int64 fileTime);
-
-// The permissions that are reported for an item.
-int32 ReportedPermissions(bool folder, bool readOnly);
-
-// When the current directory lies inside `path`, goes to the parent of `path`. A failure is only reported.
-void LeaveFolder(Path path);
 
 // The process-wide mutex around what the system only lets us read by replacing it.
 class FileManagerLock {

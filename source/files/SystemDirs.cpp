@@ -1,3 +1,4 @@
+// The well-known folders of the system and of its users.
 #include "files/FileSupport.h"
 #include "platform/FileSystem.h"
 #include "platform/LastError.h"

@@ -4,24 +4,24 @@
 
 namespace tessel {
 
-OVResChain* OVResChain::gFirst = nullptr;
+OVResChain* OVResChain::first_ = nullptr;
 
-OVResChain::OVResChain(Files files, bool owns) : fFiles(std::move(files)), fOwns(owns) {
+OVResChain::OVResChain(Files files, bool owns) : files_(std::move(files)), owns_(owns) {
     ResFileLock lock;
-    fNext = gFirst;
-    gFirst = this;
+    next_ = first_;
+    first_ = this;
 }
 
 OVResChain::~OVResChain() {
     ResFileLock lock;
-    OVResChain** link = &gFirst;
-    while (*link != this) link = &(*link)->fNext;
-    *link = fNext;
+    OVResChain** link = &first_;
+    while (*link != this) link = &(*link)->next_;
+    *link = next_;
 }
 
 void OVResChain::Forget(const ResChain* file) {
-    for (OVResChain* chain = gFirst; chain; chain = chain->fNext)
-        chain->fFiles.erase(std::remove(chain->fFiles.begin(), chain->fFiles.end(), file), chain->fFiles.end());
+    for (OVResChain* chain = first_; chain; chain = chain->next_)
+        chain->files_.erase(std::remove(chain->files_.begin(), chain->files_.end(), file), chain->files_.end());
 }
 
 }  // namespace tessel

@@ -28,9 +28,9 @@ public:
     MgErr RCloseFile() override {
         ResFileLock lock;
         Files files;
-        files.swap(fFiles);
+        files.swap(files_);
         for (ResFile* file : files) {
-            if (!fOwns) break;
+            if (!owns_) break;
             file->RCloseFile();
             delete file;
         }
@@ -53,7 +53,7 @@ public:
     }
     Resource* GetResourceForHandle(UHandle data) override {
         ResFileLock lock;
-        for (ResFile* file : fFiles) {
+        for (ResFile* file : files_) {
             if (Resource* resource = file->GetResourceForHandle(data)) return resource;
         }
         return nullptr;
@@ -65,17 +65,17 @@ private:
         ResFileLock lock;
         if (!output) return kArgErr;
         *output = {};
-        for (ResFile* file : fFiles) {
+        for (ResFile* file : files_) {
             const MgErr err = operation(file);
             if (err != kResNotFoundErr) return err;
         }
         return kResNotFoundErr;
     }
 
-    static OVResChain* gFirst;  // of all chains
-    OVResChain* fNext;
-    Files fFiles;
-    bool fOwns;
+    static OVResChain* first_;  // of all chains
+    OVResChain* next_;
+    Files files_;
+    bool owns_;
 };
 
 }  // namespace tessel

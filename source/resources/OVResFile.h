@@ -1,9 +1,9 @@
-// An open resource file, its resources, and the cache of the last one found.
+// An open resource file, and the cache of the last one found.
 #ifndef TESSEL_SOURCE_RESOURCES_OVRESFILE_H
 #define TESSEL_SOURCE_RESOURCES_OVRESFILE_H
 
 #include "resources/OVResfileIO.h"
-#include "resources/ResourceData.h"
+#include "resources/OVResource.h"
 #include "resources/ResourceMap.h"
 #include <tessel/memory/TrackedMallocFree.h>
 #include <tessel/resources/ovresfile.h>
@@ -13,52 +13,26 @@
 
 namespace tessel {
 
-class OVResFile;
-
-// A loaded resource. Belongs to its file until it is detached; without a file its map side fails with kResNotFoundErr.
-class OVResource final : public Resource, public TrackedObject {
-public:
-    OVResource(OVResFile* file, std::unique_ptr<ResourceData> data) : fFile(file), fData(std::move(data)) {}
-    ~OVResource() override;
-    OVResource(const OVResource&) = delete;
-    OVResource& operator=(const OVResource&) = delete;
-
-    MgErr RRelease() override;
-    MgErr RChanged() override;
-    MgErr DetachResource() override;
-    MgErr RSetAttrs(uint32 attrs) override;
-    MgErr RSize(uint32* size) override;
-    MgErr RGetInfo(int32* id, ResType* type, PStr name) override;
-    MgErr RGetAttrs(uint32* attrs) override;
-    UHandle GetSharedDSHandle() override;
-    MgErr DetachHandle(UHandle* data) override;
-    uint32 GetSize() override;
-    const uint8* GetData() override;
-    bool ContainsHandle(UHandle data) override;
-
-private:
-    friend class OVResFile;
-
-    OVResFile* fFile;
-    std::unique_ptr<ResourceData> fData;
-    uint32 fSlot = 0;         // in the file's table of loaded resources, plus one
-    bool fUnwritten = false;  // the data are only here, whatever the attributes say
+// Where a resource stands in the map, and under which type. Without an entry it was not found.
+struct FoundEntry {
+    ResType type = 0;
+    ResourceEntry* entry = nullptr;
 };
 
 // The last resource found in a file, where its entry stands, and its type.
 class ResCache {
 public:
     void Set(const OVResource* resource, ResType type, uint32 position);
-    void Empty() { fPosition = kNothing; }
+    void Empty() { position_ = kNothing; }
     // Answers when `resource` is the cached one.
-    bool FindRL(const OVResource* resource, const ResourceMap& map, ResType* type, RsrcList** entry) const;
+    FoundEntry Find(const OVResource* resource, const ResourceMap& map) const;
 
 private:
     static constexpr uint32 kNothing = ~uint32{0};
 
-    const OVResource* fResource = nullptr;
-    ResType fType = 0;
-    uint32 fPosition = kNothing;
+    const OVResource* resource_ = nullptr;
+    ResType type_ = 0;
+    uint32 position_ = kNothing;
 };
 
 class OVResFile final : public ResFile, public TrackedObject {
@@ -109,22 +83,22 @@ private:
     void Dispose();
 
     // loading
-    uint64 DataStart() const { return fBase + fMap.Head()->header.dataOffset; }
-    MgErr DataLengthAt(const RsrcList& entry, uint32* length);
-    MgErr LoadData(const RsrcList& entry, std::unique_ptr<ResourceData>* data);
-    MgErr Load(ResType type, RsrcList* entry, OVResource** resource);
-    OVResource* LoadedAt(const RsrcList& entry) const;
+    uint64 DataStart() const { return base_ + map_.Head()->header.dataOffset; }
+    MgErr DataLengthAt(const ResourceEntry& entry, uint32* length);
+    MgErr LoadData(const ResourceEntry& entry, std::unique_ptr<ResourceData>* data);
+    MgErr Load(ResType type, ResourceEntry* entry, OVResource** resource);
+    OVResource* LoadedAt(const ResourceEntry& entry) const;
     MgErr Attach(OVResource* resource);  // gives it a slot
     void Forget(OVResource* resource);   // takes the slot back
 
     // the entry of a resource
-    MgErr FindRL(const OVResource* resource, ResType* type, RsrcList** entry);
-    bool IsChanged(const RsrcList& entry) const;
-    void Touch() { fMap.Head()->fileAttrs |= kRFileChanged; }
-    bool IsReadOnly() const { return (fMap.Head()->fileAttrs & kRFileReadOnly) != 0; }
+    FoundEntry FindEntry(const OVResource* resource);
+    bool IsChanged(const ResourceEntry& entry) const;
+    void Touch() { map_.Head()->fileAttrs |= kRFileChanged; }
+    bool IsReadOnly() const { return (map_.Head()->fileAttrs & kRFileReadOnly) != 0; }
 
     MgErr AddHandle(UHandle data, ResType type, int32 id, ConstPStr name);
-    MgErr ReplaceWith(const void* bytes, uint32 size, ResType type, RsrcList* entry);
+    MgErr ReplaceWith(const void* bytes, uint32 size, ResType type, ResourceEntry* entry);
     OVResource* OwnResource(Resource* resource) const;
 
     // what the resources ask their file
@@ -143,13 +117,13 @@ private:
     MgErr MeasureLoaded(const Positions& positions, uint64* dataLength) const;
     void LayOut(ResourceMap* map, const Positions& positions, uint32 dataLength, uint8* image) const;
 
-    std::unique_ptr<OVResfileIO> fIO;  // null for a file made in memory
-    ResourceMap fMap;
-    uint64 fBase = 0;  // where the resource file starts in its source
-    std::vector<OVResource*, TrackedAllocator<OVResource*>> fLoaded;
-    std::vector<uint32, TrackedAllocator<uint32>> fFreeSlots;
-    ResCache fCache;
-    bool fOpen = false;
+    std::unique_ptr<OVResfileIO> io_;  // null for a file made in memory
+    ResourceMap map_;
+    uint64 base_ = 0;  // where the resource file starts in its source
+    std::vector<OVResource*, TrackedAllocator<OVResource*>> loaded_;
+    std::vector<uint32, TrackedAllocator<uint32>> freeSlots_;
+    ResCache cache_;
+    bool open_ = false;
 };
 
 // Reads the header at the start of the source or, in a read-only one, behind a trailer; in host order, its offsets from

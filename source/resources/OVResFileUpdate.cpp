@@ -74,7 +74,7 @@ struct OVResFile::Entry {
 // may have spoilt on disk is marked changed, and is written again from memory by the next update.
 class OVResFile::Updating {
 public:
-    explicit Updating(OVResFile* file) : file_(*file), map_(file->fMap), io_(*file->fIO) {}
+    explicit Updating(OVResFile* file) : file_(*file), map_(file->map_), io_(*file->io_) {}
     ~Updating() { DropLoaded(); }
 
     MgErr Run() {
@@ -92,7 +92,7 @@ public:
 private:
     using Entries = std::vector<Entry, TrackedAllocator<Entry>>;
 
-    RsrcList* At(const Entry& entry) const { return map_.EntryAt(entry.position); }
+    ResourceEntry* At(const Entry& entry) const { return map_.EntryAt(entry.position); }
 
     // Lists every entry, unchanged ones first, those by where their data are.
     MgErr Collect() {
@@ -108,7 +108,7 @@ private:
         entries_.reserve(positions.size());
         loadedHere_.reserve(positions.size());
         for (const uint32 position : positions) {
-            const RsrcList* entry = map_.EntryAt(position);
+            const ResourceEntry* entry = map_.EntryAt(position);
             entries_.push_back({position, entry->data, 0, file_.IsChanged(*entry)});
         }
         const auto firstChanged =
@@ -142,7 +142,7 @@ private:
 
     uint64 SizeToWrite(const Entry& entry) const {
         const OVResource* loaded = file_.LoadedAt(*At(entry));
-        return loaded && loaded->fData ? DiskSize(loaded->fData->GetSize()) : entry.diskSize;
+        return loaded && loaded->data_ ? DiskSize(loaded->data_->GetSize()) : entry.diskSize;
     }
 
     // Entries move down, so that each is read before anything is written over it. Where they overlap, or one grew in
@@ -168,24 +168,24 @@ private:
     }
 
     MgErr EnsureLoaded(const Entry& entry) {
-        RsrcList* reference = At(entry);
+        ResourceEntry* reference = At(entry);
         const OVResource* loaded = file_.LoadedAt(*reference);
-        if (loaded && loaded->fData) return kNoErr;
+        if (loaded && loaded->data_) return kNoErr;
         if (loaded && entry.changed) return kResNotFoundErr;  // its data were taken away
         OVResource* made = nullptr;
         if (const MgErr err = file_.Load(0, reference, &made)) return err;
-        file_.fCache.Empty();
+        file_.cache_.Empty();
         if (!loaded) loadedHere_.push_back(entry.position);
         return kNoErr;
     }
 
     MgErr Move(Entry* entry) {
         if (const MgErr err = EnsureLoaded(*entry)) return err;
-        RsrcList* reference = At(*entry);
+        ResourceEntry* reference = At(*entry);
         OVResource* resource = file_.LoadedAt(*reference);
-        const ResourceData* data = resource->fData.get();
+        const ResourceData* data = resource->data_.get();
         const MgErr err = WriteEntry(io_, file_.DataStart() + end_, data->GetData(), data->GetSize());
-        resource->fUnwritten = err != kNoErr;
+        resource->unwritten_ = err != kNoErr;
         if (err) {
             reference->attrs |= kRChangedAttr;
             return err;
@@ -201,7 +201,7 @@ private:
     // What was loaded only to be moved goes again, except what a failed write left in memory alone.
     void DropLoaded() {
         for (const uint32 position : loadedHere_) {
-            RsrcList* reference = map_.EntryAt(position);
+            ResourceEntry* reference = map_.EntryAt(position);
             if (file_.IsChanged(*reference)) continue;
             OVResource* resource = file_.LoadedAt(*reference);
             reference->loaded = 0;
@@ -222,37 +222,37 @@ private:
 
 MgErr OVResFile::RUpdateFile() {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
-    if (!(fMap.Head()->fileAttrs & kRFileChanged)) return kNoErr;
-    if (!fIO || !fIO->CanWrite()) return kNoErr;
+    if (!open_) return kNotResFileErr;
+    if (!(map_.Head()->fileAttrs & kRFileChanged)) return kNoErr;
+    if (!io_ || !io_->CanWrite()) return kNoErr;
     const MgErr err = Guarded([&]() -> MgErr {
-        if (fMap.IsEmpty()) return WriteEmpty();
+        if (map_.IsEmpty()) return WriteEmpty();
         if (const MgErr rebaseErr = RebaseData()) return rebaseErr;
         return Updating(this).Run();
     });
-    if (!err) fMap.Head()->fileAttrs &= ~uint32{kRFileChanged};
+    if (!err) map_.Head()->fileAttrs &= ~uint32{kRFileChanged};
     return err;
 }
 
 MgErr OVResFile::WriteEmpty() {
-    RsrcHeader header = fMap.Head()->header;
+    RsrcHeader header = map_.Head()->header;
     SwapHeader(&header);
-    if (const MgErr err = fIO->Write(0, &header, kHeaderSize)) return err;
-    if (const MgErr err = fIO->SetSize(kHeaderSize)) return err;
-    return fIO->Flush();
+    if (const MgErr err = io_->Write(0, &header, kHeaderSize)) return err;
+    if (const MgErr err = io_->SetSize(kHeaderSize)) return err;
+    return io_->Flush();
 }
 
 // Counts data offsets from where an update puts the data section. The data stay where they are.
 MgErr OVResFile::RebaseData() {
-    RsrcHeader& header = fMap.Head()->header;
+    RsrcHeader& header = map_.Head()->header;
     if (header.dataOffset == kHeaderSize) return kNoErr;
     if (header.dataOffset < kHeaderSize) return kIOErr;
     const uint64 by = header.dataOffset - kHeaderSize;
     if (by + header.dataLength > kLongestFile) return kEOFErr;
     Positions positions;
-    fMap.CollectEntries(&positions);
+    map_.CollectEntries(&positions);
     for (const uint32 position : positions) {
-        RsrcList* entry = fMap.EntryAt(position);
+        ResourceEntry* entry = map_.EntryAt(position);
         // An entry outside the data section stays outside.
         entry->data = static_cast<uint32>(std::min(entry->data + by, kLongestFile));
     }
@@ -263,18 +263,18 @@ MgErr OVResFile::RebaseData() {
 
 MgErr OVResFile::UpdateMap(uint64 dataLength) {
     // The map is converted in a copy: the one in memory keeps its numbers and its loaded resources.
-    Block bytes(fMap.Size());
+    Block bytes(map_.Size());
     if (!bytes.get()) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x174DB8E3u) << "Could not allocate temp handle storage."; });
         return kMemFullErr;
     }
-    fMap.SetLayout(static_cast<uint32>(dataLength));
-    fMap.ToDisk(bytes.get());
-    const RsrcHeader& header = fMap.Head()->header;
-    if (const MgErr err = fIO->Write(header.mapOffset, bytes.get(), header.mapLength)) return err;
-    if (const MgErr err = fIO->SetSize(header.mapOffset + header.mapLength)) return err;
-    if (const MgErr err = fIO->Write(0, bytes.get(), kHeaderSize)) return err;
-    return fIO->Flush();
+    map_.SetLayout(static_cast<uint32>(dataLength));
+    map_.ToDisk(bytes.get());
+    const RsrcHeader& header = map_.Head()->header;
+    if (const MgErr err = io_->Write(header.mapOffset, bytes.get(), header.mapLength)) return err;
+    if (const MgErr err = io_->SetSize(header.mapOffset + header.mapLength)) return err;
+    if (const MgErr err = io_->Write(0, bytes.get(), kHeaderSize)) return err;
+    return io_->Flush();
 }
 
 // ---- the image of a whole file --------------------------------------------------------------------------------------
@@ -283,8 +283,8 @@ MgErr OVResFile::RGetMemFileHandle(UHandle* image) {
     ResFileLock lock;
     if (!image) return kArgErr;
     *image = nullptr;
-    if (!fOpen) return kNotResFileErr;
-    if (fIO && fIO->Handle()) {
+    if (!open_) return kNotResFileErr;
+    if (io_ && io_->Handle()) {
         if (const MgErr err = RUpdateFile()) return err;
         return RGetUHandleOwnership(image);
     }
@@ -295,9 +295,9 @@ MgErr OVResFile::RGetMemFileHandle(UHandle* image) {
 MgErr OVResFile::MeasureLoaded(const Positions& positions, uint64* dataLength) const {
     *dataLength = 0;
     for (const uint32 position : positions) {
-        const OVResource* loaded = LoadedAt(*fMap.EntryAt(position));
-        if (!loaded || !loaded->fData) return kArgErr;
-        *dataLength += DiskSize(loaded->fData->GetSize());
+        const OVResource* loaded = LoadedAt(*map_.EntryAt(position));
+        if (!loaded || !loaded->data_) return kArgErr;
+        *dataLength += DiskSize(loaded->data_->GetSize());
     }
     return kNoErr;
 }
@@ -306,19 +306,19 @@ MgErr OVResFile::MeasureLoaded(const Positions& positions, uint64* dataLength) c
 // nothing to load them from. A file that has a source keeps its own map.
 MgErr OVResFile::BuildImage(UHandle* image) {
     Positions positions;
-    fMap.CollectEntries(&positions);
+    map_.CollectEntries(&positions);
     uint64 dataLength = 0;
     if (const MgErr err = MeasureLoaded(positions, &dataLength)) return err;
-    const uint64 size = kHeaderSize + dataLength + (fMap.IsEmpty() ? 0 : fMap.Size());
+    const uint64 size = kHeaderSize + dataLength + (map_.IsEmpty() ? 0 : map_.Size());
     if (size > kLongestFile) return kMemFullErr;
 
     ResourceMap copy;
-    if (fIO) {
-        if (const MgErr err = copy.CopyOf(fMap)) return err;
+    if (io_) {
+        if (const MgErr err = copy.CopyOf(map_)) return err;
     }
     *image = DSNewHandle(static_cast<uint32>(size));
     if (!*image) return kMemFullErr;
-    LayOut(fIO ? &copy : &fMap, positions, static_cast<uint32>(dataLength), **image);
+    LayOut(io_ ? &copy : &map_, positions, static_cast<uint32>(dataLength), **image);
     return kNoErr;
 }
 
@@ -327,8 +327,8 @@ void OVResFile::LayOut(ResourceMap* map, const Positions& positions, uint32 data
     uint8* const start = image + kHeaderSize;
     uint8* to = start;
     for (const uint32 position : positions) {
-        RsrcList* entry = map->EntryAt(position);
-        const ResourceData* data = LoadedAt(*entry)->fData.get();
+        ResourceEntry* entry = map->EntryAt(position);
+        const ResourceData* data = LoadedAt(*entry)->data_.get();
         entry->data = static_cast<uint32>(to - start);
         entry->attrs &= ~uint32{kRChangedAttr};
         to = PutEntry(to, data->GetData(), data->GetSize());

@@ -23,7 +23,7 @@ constexpr uint32 kSmallRead = 64;
 
 constexpr uint32 kExtendBlock = 10240;
 
-std::atomic<IsFileAlreadyInCacheProc> gIsFileAlreadyInCache{nullptr};
+std::atomic<IsFileAlreadyInCacheProc> isFileAlreadyInCache{nullptr};
 
 }  // namespace
 
@@ -34,52 +34,52 @@ OVResfileIO::~OVResfileIO() {
 // ---- kinds of source ------------------------------------------------------------------------------------------------
 
 MgErr OVResfileIO::OpenPath(Path path, bool readOnly, int32 denyMode) {
-    fReadOnly = readOnly;
-    const IsFileAlreadyInCacheProc hook = readOnly ? gIsFileAlreadyInCache.load() : nullptr;
+    readOnly_ = readOnly;
+    const IsFileAlreadyInCacheProc hook = readOnly ? isFileAlreadyInCache.load() : nullptr;
     if (hook) {
         uint32 size = 0;
-        fFromCacheHook = hook(path, &fFile, &fView, &fData, &size) != 0;
-        fLength = size;
-        if (fFromCacheHook) return kNoErr;
-        fFile = nullptr;
-        fView = nullptr;
-        fData = nullptr;
+        fromCacheHook_ = hook(path, &file_, &view_, &data_, &size) != 0;
+        length_ = size;
+        if (fromCacheHook_) return kNoErr;
+        file_ = nullptr;
+        view_ = nullptr;
+        data_ = nullptr;
     }
-    const MgErr err = FMOpen(&fFile, path, readOnly ? kFOpenRead : kFOpenReadWrite, denyMode);
-    fOpenedByPath = !err;
+    const MgErr err = FMOpen(&file_, path, readOnly ? kFOpenRead : kFOpenReadWrite, denyMode);
+    openedByPath_ = !err;
     return err;
 }
 
 void OVResfileIO::UseFile(File_t* file, bool readOnly) {
-    fFile = file;
-    fReadOnly = readOnly;
+    file_ = file;
+    readOnly_ = readOnly;
 }
 
 void OVResfileIO::UseHandle(UHandle handle, bool readOnly) {
-    fHandle = handle;
-    fReadOnly = readOnly;
-    fLength = DSGetHandleSize(handle);
+    handle_ = handle;
+    readOnly_ = readOnly;
+    length_ = DSGetHandleSize(handle);
 }
 
 void OVResfileIO::UseMemory(const void* data, uint32 size) {
-    fData = static_cast<const uint8*>(data);
-    fLength = size;
-    fReadOnly = true;
+    data_ = static_cast<const uint8*>(data);
+    length_ = size;
+    readOnly_ = true;
 }
 
 MgErr OVResfileIO::Prepare() {
-    if (fFromCacheHook) return kNoErr;
-    if (InMemory() && fFile) {
+    if (fromCacheHook_) return kNoErr;
+    if (InMemory() && file_) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x2E57A1D3u) << "Cannot memory map the resource file"; });
         return kArgErr;
     }
-    if (!fFile) return kNoErr;
-    if (const MgErr err = FMSeek64(fFile, 0, kFSeekStart)) {
+    if (!file_) return kNoErr;
+    if (const MgErr err = FMSeek64(file_, 0, kFSeekStart)) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x60C3F85Bu) << "cannot seek to start of resource file"; });
         return err;
     }
     uint64 size = 0;
-    if (!fReadOnly || FGetEOF64(fFile, &size) || size == 0 || size > kReadWholeLimit) return kNoErr;
+    if (!readOnly_ || FGetEOF64(file_, &size) || size == 0 || size > kReadWholeLimit) return kNoErr;
     return ReadWhole(static_cast<uint32>(size));
 }
 
@@ -87,114 +87,114 @@ MgErr OVResfileIO::Prepare() {
 MgErr OVResfileIO::ReadWhole(uint32 size) {
     UPtr data = DSNewPtr(size);
     if (!data) return kNoErr;
-    if (FMRead(fFile, size, nullptr, data)) {
+    if (FMRead(file_, size, nullptr, data)) {
         DSDisposePtr(data);
         return kNoErr;
     }
-    fData = data;
-    fLength = size;
-    fOwnsData = true;
+    data_ = data;
+    length_ = size;
+    ownsData_ = true;
     return kNoErr;
 }
 
 // ---- reading and writing --------------------------------------------------------------------------------------------
 
 MgErr OVResfileIO::SeekTo(uint64 position) {
-    if (fPosition == position && fOpenedByPath) return kNoErr;
-    fPosition = kUnknownPosition;
+    if (position_ == position && openedByPath_) return kNoErr;
+    position_ = kUnknownPosition;
     if (position > static_cast<uint64>(std::numeric_limits<int64>::max())) return kEOFErr;
-    return FMSeek64(fFile, static_cast<int64>(position), kFSeekStart);
+    return FMSeek64(file_, static_cast<int64>(position), kFSeekStart);
 }
 
 MgErr OVResfileIO::Read(uint64 position, void* buffer, uint32 count) {
     if (InMemory()) {
-        if (position > fLength || count > fLength - position) return kEOFErr;
+        if (position > length_ || count > length_ - position) return kEOFErr;
         if (count) std::memcpy(buffer, Bytes() + position, count);
         return kNoErr;
     }
-    if (!fFile) return kEOFErr;
-    return fOpenedByPath && count <= kSmallRead ? ReadAhead(position, buffer, count)
+    if (!file_) return kEOFErr;
+    return openedByPath_ && count <= kSmallRead ? ReadAhead(position, buffer, count)
                                                 : ReadFile(position, buffer, count);
 }
 
 MgErr OVResfileIO::ReadFile(uint64 position, void* buffer, uint32 count) {
     if (const MgErr err = SeekTo(position)) return err;
-    const MgErr err = FMRead(fFile, count, nullptr, buffer);
-    fPosition = err ? kUnknownPosition : position + count;
+    const MgErr err = FMRead(file_, count, nullptr, buffer);
+    position_ = err ? kUnknownPosition : position + count;
     return err;
 }
 
 MgErr OVResfileIO::ReadAhead(uint64 position, void* buffer, uint32 count) {
-    if (position < fAheadStart || position + count > fAheadStart + fAheadLength) {
-        fAheadLength = 0;
+    if (position < aheadStart_ || position + count > aheadStart_ + aheadLength_) {
+        aheadLength_ = 0;
         if (const MgErr err = SeekTo(position)) return err;
-        const MgErr err = FMRead(fFile, kAhead, &fAheadLength, fAhead);
-        fPosition = err ? kUnknownPosition : position + fAheadLength;
+        const MgErr err = FMRead(file_, kAhead, &aheadLength_, ahead_);
+        position_ = err ? kUnknownPosition : position + aheadLength_;
         if (err && err != kEOFErr) {
-            fAheadLength = 0;
+            aheadLength_ = 0;
             return err;
         }
-        fAheadStart = position;
-        if (count > fAheadLength) return kEOFErr;
+        aheadStart_ = position;
+        if (count > aheadLength_) return kEOFErr;
     }
-    std::memcpy(buffer, fAhead + (position - fAheadStart), count);
+    std::memcpy(buffer, ahead_ + (position - aheadStart_), count);
     return kNoErr;
 }
 
 MgErr OVResfileIO::Write(uint64 position, const void* data, uint32 count) {
     if (!CanWrite()) return kPermissionErr;
-    if (fHandle) {
-        if (position > fLength) return kEOFErr;
+    if (handle_) {
+        if (position > length_) return kEOFErr;
         const uint64 end = position + count;
-        if (end > fLength) {
+        if (end > length_) {
             if (end > std::numeric_limits<uint32>::max()) return kMemFullErr;
             if (const MgErr err = SetSize(static_cast<uint32>(end))) return err;
         }
-        if (count) std::memcpy(*fHandle + position, data, count);
+        if (count) std::memcpy(*handle_ + position, data, count);
         return kNoErr;
     }
-    fAheadLength = 0;
+    aheadLength_ = 0;
     if (const MgErr err = SeekTo(position)) return err;
-    const MgErr err = FMWrite(fFile, count, nullptr, data);
-    fPosition = err ? kUnknownPosition : position + count;
+    const MgErr err = FMWrite(file_, count, nullptr, data);
+    position_ = err ? kUnknownPosition : position + count;
     return err;
 }
 
 MgErr OVResfileIO::Size(uint64* size) {
-    if (InMemory() || !fFile) {
-        *size = fLength;
+    if (InMemory() || !file_) {
+        *size = length_;
         return kNoErr;
     }
-    return FGetEOF64(fFile, size);
+    return FGetEOF64(file_, size);
 }
 
 MgErr OVResfileIO::SetSize(uint32 size) {
-    if (fHandle) {
-        const MgErr err = DSSetHSzClr(fHandle, size);
-        if (!err) fLength = size;
+    if (handle_) {
+        const MgErr err = DSSetHSzClr(handle_, size);
+        if (!err) length_ = size;
         return err;
     }
-    fPosition = kUnknownPosition;
-    fAheadLength = 0;
-    return FSetEOF64(fFile, size);
+    position_ = kUnknownPosition;
+    aheadLength_ = 0;
+    return FSetEOF64(file_, size);
 }
 
 MgErr OVResfileIO::Reserve(uint32 size) {
     uint64 end = 0;
     if (const MgErr err = Size(&end)) return err;
     if (size <= end) return kNoErr;
-    if (fHandle) return SetSize(size);
-    fPosition = kUnknownPosition;
-    fAheadLength = 0;
-    return platform::FileReserve(HandleOf(fFile), static_cast<int64>(size)) ? kNoErr : Win32ToOVFileErr();
+    if (handle_) return SetSize(size);
+    position_ = kUnknownPosition;
+    aheadLength_ = 0;
+    return platform::FileReserve(HandleOf(file_), static_cast<int64>(size)) ? kNoErr : Win32ToOVFileErr();
 }
 
 MgErr OVResfileIO::Extend(uint32 count) {
     if (!CanWrite()) return kPermissionErr;
     uint64 end = 0;
     if (const MgErr err = Size(&end)) return err;
-    if (end + count > std::numeric_limits<uint32>::max()) return fHandle ? kMemFullErr : kDiskFullErr;
-    if (fHandle) return SetSize(static_cast<uint32>(end + count));
+    if (end + count > std::numeric_limits<uint32>::max()) return handle_ ? kMemFullErr : kDiskFullErr;
+    if (handle_) return SetSize(static_cast<uint32>(end + count));
 
     static const uint8 kZeros[kExtendBlock] = {};
     MgErr err = kNoErr;
@@ -209,36 +209,36 @@ MgErr OVResfileIO::Extend(uint32 count) {
 }
 
 MgErr OVResfileIO::Flush() {
-    return fFile ? FFlush(fFile) : kNoErr;
+    return file_ ? FFlush(file_) : kNoErr;
 }
 
 MgErr OVResfileIO::Close() {
-    if (fOwnsHandle && fHandle) DSDisposeHandle(fHandle);
-    if (fOwnsData) DSDisposePtr(const_cast<uint8*>(fData));
-    const MgErr err = fOpenedByPath && fFile ? FMClose(fFile) : kNoErr;
-    fOwnsHandle = fOwnsData = fOpenedByPath = false;
-    fFile = nullptr;
-    fView = nullptr;
-    fHandle = nullptr;
-    fData = nullptr;
-    fLength = 0;
+    if (ownsHandle_ && handle_) DSDisposeHandle(handle_);
+    if (ownsData_) DSDisposePtr(const_cast<uint8*>(data_));
+    const MgErr err = openedByPath_ && file_ ? FMClose(file_) : kNoErr;
+    ownsHandle_ = ownsData_ = openedByPath_ = false;
+    file_ = nullptr;
+    view_ = nullptr;
+    handle_ = nullptr;
+    data_ = nullptr;
+    length_ = 0;
     return err;
 }
 
 const uint8* OVResfileIO::InPlace(uint64 position) const {
     // A handle's bytes move when it is resized, which a writable one is.
-    if (!InMemory() || (fHandle && !fReadOnly)) return nullptr;
+    if (!InMemory() || (handle_ && !readOnly_)) return nullptr;
     return Bytes() + position;
 }
 
 UHandle OVResfileIO::ReleaseHandle() {
-    if (!fOwnsHandle) return nullptr;
-    fOwnsHandle = false;
-    return fHandle;
+    if (!ownsHandle_) return nullptr;
+    ownsHandle_ = false;
+    return handle_;
 }
 
 }  // namespace tessel
 
 void Set_IsFileAlreadyInCache(IsFileAlreadyInCacheProc proc) {
-    tessel::gIsFileAlreadyInCache.store(proc);
+    tessel::isFileAlreadyInCache.store(proc);
 }

@@ -21,7 +21,7 @@ public:
     MgErr OpenPath(Path path, bool readOnly, int32 denyMode);
     void UseFile(File_t* file, bool readOnly);
     void UseHandle(UHandle handle, bool readOnly);
-    void OwnHandle() { fOwnsHandle = true; }  // from now on
+    void OwnHandle() { ownsHandle_ = true; }  // from now on
     void UseMemory(const void* data, uint32 size);
 
     // Brings a read-only file on disk into memory if that pays. Checks that the source is of one kind.
@@ -44,10 +44,10 @@ public:
     // The bytes in place, when they stay where they are; else null.
     const uint8* InPlace(uint64 position) const;
 
-    bool IsReadOnly() const { return fReadOnly; }
-    bool CanWrite() const { return !fReadOnly && (fFile || fHandle); }
-    File_t* File() const { return fFile; }
-    UHandle Handle() const { return fHandle; }
+    bool IsReadOnly() const { return readOnly_; }
+    bool CanWrite() const { return !readOnly_ && (file_ || handle_); }
+    File_t* File() const { return file_; }
+    UHandle Handle() const { return handle_; }
     // The handle if it is owned, which it is not any more afterwards; else null.
     UHandle ReleaseHandle();
 
@@ -55,29 +55,29 @@ private:
     MgErr SeekTo(uint64 position);
     MgErr ReadFile(uint64 position, void* buffer, uint32 count);
     MgErr ReadAhead(uint64 position, void* buffer, uint32 count);
-    const uint8* Bytes() const { return fHandle ? *fHandle : fData; }
-    bool InMemory() const { return fHandle || fData; }
+    const uint8* Bytes() const { return handle_ ? *handle_ : data_; }
+    bool InMemory() const { return handle_ || data_; }
     MgErr ReadWhole(uint32 size);
 
-    bool fFromCacheHook = false;
-    bool fOpenedByPath = false;
-    bool fReadOnly = false;
-    bool fOwnsHandle = false;
-    bool fOwnsData = false;
-    File_t* fFile = nullptr;
-    void* fView = nullptr;  // the hook's
-    UHandle fHandle = nullptr;
-    const uint8* fData = nullptr;
-    uint64 fLength = 0;                   // of what is in memory
-    uint64 fPosition = kUnknownPosition;  // of a file that only we move
+    bool fromCacheHook_ = false;
+    bool openedByPath_ = false;
+    bool readOnly_ = false;
+    bool ownsHandle_ = false;
+    bool ownsData_ = false;
+    File_t* file_ = nullptr;
+    void* view_ = nullptr;  // the hook's
+    UHandle handle_ = nullptr;
+    const uint8* data_ = nullptr;
+    uint64 length_ = 0;                   // of what is in memory
+    uint64 position_ = kUnknownPosition;  // of a file that only we move
 
     static constexpr uint64 kUnknownPosition = ~uint64{0};
     static constexpr uint32 kAhead = 4096;
 
     // The bytes around the last small read of a file that only we change: length words of neighbours come with it.
-    uint64 fAheadStart = 0;
-    uint32 fAheadLength = 0;
-    uint8 fAhead[kAhead];
+    uint64 aheadStart_ = 0;
+    uint32 aheadLength_ = 0;
+    uint8 ahead_[kAhead];
 };
 
 }  // namespace tessel

@@ -107,85 +107,19 @@ MgErr AssignText(const Bytes& text, std::string* out) {
     return kNoErr;
 }
 
-}  // namespace
-
-// ---- the reader -----------------------------------------------------------------------------------------------------
-
-RFReader::RFReader(ResChain* chain) : fChain(chain) {
-}
-
-RFReader::RFReader(RsrcFile refnum) : fChain(RsrcFileToRMapResChain(refnum)) {
-}
-
-RFReader::~RFReader() {
-    ReleaseRsrcFileRefnum();
-    if (!fOwnsChain || !fChain) return;
-    ResFileLock lock;
-    fChain->RCloseFile();
-    ForgetRefnumsOf(fChain);
-    delete fChain;
-}
-
-// Takes over a chain in the place of the one before.
-MgErr RFReader::Adopt(ResChain* chain) {
-    if (fOwnsChain && fChain) {
-        if (const MgErr err = Close()) {
-            chain->RCloseFile();
-            delete chain;
-            return err;
-        }
-    }
-    ReleaseRsrcFileRefnum();
-    fChain = chain;
-    fOwnsChain = true;
-    return kNoErr;
-}
-
-MgErr RFReader::OpenPath(Path path, int32 mode, _FMFileType* type, _FMFileCreator* creator) {
-    ResFile* file = nullptr;
-    if (const MgErr err = ResFileFactory::ROpenPath(path, mode, &file, type, creator)) return err;
-    return Adopt(file);
-}
-
-MgErr RFReader::Close() {
-    if (!fChain) return kNotFoundErr;
-    ResFileLock lock;
-    if (const MgErr err = fChain->RCloseFile()) return err;
-    ForgetRefnumsOf(fChain);
-    delete fChain;
-    fChain = nullptr;
-    fRefnum = 0;
-    fOwnsChain = false;
-    return kNoErr;
-}
-
-MgErr RFReader::PtrToResDataInternal(ResType type, int32 id, const uint8** data, uint32* size) {
+// The data of a resource in place. `find` looks for the resource.
+template <class Find>
+MgErr PointToData(const uint8** data, uint32* size, Find find) {
     if (!data) return kArgErr;
     *data = nullptr;
     if (size) *size = 0;
-    if (!fChain) return kResNotFoundErr;
     ResFileLock lock;
     Resource* resource = nullptr;
-    if (const MgErr err = fChain->RGet(type, id, &resource)) return err;
+    if (const MgErr err = find(&resource)) return err;
     *data = resource->GetData();
     if (size) *size = resource->GetSize();
     return kNoErr;
 }
-
-MgErr RFReader::PtrToResDataByNameInternal(ResType type, ConstPStr name, const uint8** data, uint32* size) {
-    if (!data) return kArgErr;
-    *data = nullptr;
-    if (size) *size = 0;
-    if (!fChain) return kResNotFoundErr;
-    ResFileLock lock;
-    Resource* resource = nullptr;
-    if (const MgErr err = fChain->RGetNamed(type, name, &resource)) return err;
-    *data = resource->GetData();
-    if (size) *size = resource->GetSize();
-    return kNoErr;
-}
-
-namespace {
 
 // Hands the data of a resource over to the caller and ends the resource. With changes that are not written it stays.
 MgErr TakeData(Resource* resource, UHandle* data) {
@@ -196,35 +130,99 @@ MgErr TakeData(Resource* resource, UHandle* data) {
     return err;
 }
 
-}  // namespace
-
-MgErr RFReader::AllocDSHandle(ResType type, int32 id, UHandle* data) {
+template <class Find>
+MgErr TakeFoundData(UHandle* data, Find find) {
     if (!data) return kArgErr;
     *data = nullptr;
-    if (!fChain) return kResNotFoundErr;
     ResFileLock lock;
     Resource* resource = nullptr;
-    if (const MgErr err = fChain->RGet(type, id, &resource)) return err;
+    if (const MgErr err = find(&resource)) return err;
     return TakeData(resource, data);
 }
 
-MgErr RFReader::AllocDSHandleByName(ResType type, ConstPStr name, UHandle* data) {
-    if (!data) return kArgErr;
-    *data = nullptr;
-    if (!fChain) return kResNotFoundErr;
+}  // namespace
+
+// ---- the reader -----------------------------------------------------------------------------------------------------
+
+RFReader::RFReader(ResChain* chain) : chain_(chain) {
+}
+
+RFReader::RFReader(RsrcFile refnum) : chain_(RsrcFileToRMapResChain(refnum)) {
+}
+
+RFReader::~RFReader() {
+    ReleaseRsrcFileRefnum();
+    if (!ownsChain_ || !chain_) return;
     ResFileLock lock;
-    Resource* resource = nullptr;
-    if (const MgErr err = fChain->RGetNamed(type, name, &resource)) return err;
-    return TakeData(resource, data);
+    chain_->RCloseFile();
+    ForgetRefnumsOf(chain_);
+    delete chain_;
+}
+
+// Takes over a chain in the place of the one before.
+MgErr RFReader::Adopt(ResChain* chain) {
+    if (ownsChain_ && chain_) {
+        if (const MgErr err = Close()) {
+            chain->RCloseFile();
+            delete chain;
+            return err;
+        }
+    }
+    ReleaseRsrcFileRefnum();
+    chain_ = chain;
+    ownsChain_ = true;
+    return kNoErr;
+}
+
+MgErr RFReader::OpenPath(Path path, int32 mode, _FMFileType* type, _FMFileCreator* creator) {
+    ResFile* file = nullptr;
+    if (const MgErr err = ResFileFactory::ROpenPath(path, mode, &file, type, creator)) return err;
+    return Adopt(file);
+}
+
+MgErr RFReader::Close() {
+    if (!chain_) return kNotFoundErr;
+    ResFileLock lock;
+    if (const MgErr err = chain_->RCloseFile()) return err;
+    ForgetRefnumsOf(chain_);
+    delete chain_;
+    chain_ = nullptr;
+    refnum_ = 0;
+    ownsChain_ = false;
+    return kNoErr;
+}
+
+MgErr RFReader::PtrToResDataInternal(ResType type, int32 id, const uint8** data, uint32* size) {
+    return PointToData(data, size, [&](Resource** resource) -> MgErr {
+        return chain_ ? chain_->RGet(type, id, resource) : kResNotFoundErr;
+    });
+}
+
+MgErr RFReader::PtrToResDataByNameInternal(ResType type, ConstPStr name, const uint8** data, uint32* size) {
+    return PointToData(data, size, [&](Resource** resource) -> MgErr {
+        return chain_ ? chain_->RGetNamed(type, name, resource) : kResNotFoundErr;
+    });
+}
+
+MgErr RFReader::AllocDSHandle(ResType type, int32 id, UHandle* data) {
+    return TakeFoundData(data, [&](Resource** resource) -> MgErr {
+        return chain_ ? chain_->RGet(type, id, resource) : kResNotFoundErr;
+    });
+}
+
+MgErr RFReader::AllocDSHandleByName(ResType type, ConstPStr name, UHandle* data) {
+    return TakeFoundData(data, [&](Resource** resource) -> MgErr {
+        return chain_ ? chain_->RGetNamed(type, name, resource) : kResNotFoundErr;
+    });
 }
 
 MgErr RFReader::GetString(int32 id, UHandle* data) {
     if (!data) return kArgErr;
     *data = nullptr;
-    if (!fChain) return kResNotFoundErr;
+    if (!chain_) return kResNotFoundErr;
     ResFileLock lock;
     Resource* resource = nullptr;
-    if (const MgErr err = fChain->RGet(kStringType, id, &resource)) return err;
+    if (const MgErr err = chain_->RGet(kStringType, id, &resource)) return err;
     *data = resource->GetSharedDSHandle();
     return *data ? kNoErr : kMemFullErr;
 }
@@ -245,10 +243,10 @@ MgErr RFReader::GetPStr(int32 id, PStr string) {
 MgErr RFReader::GetIndString(PStr string, int32 id, int32 index) {
     if (!string) return kArgErr;
     string[0] = 0;
-    if (!fChain) return kResNotFoundErr;
+    if (!chain_) return kResNotFoundErr;
     ResFileLock lock;
     ConstPStr found = nullptr;
-    if (const MgErr err = fChain->RGetIndStringPtr(&found, id, index, kStringListType)) return err;
+    if (const MgErr err = chain_->RGetIndStringPtr(&found, id, index, kStringListType)) return err;
     std::memcpy(string, found, found[0] + 1u);
     return kNoErr;
 }
@@ -292,20 +290,20 @@ MgErr RFReader::GetIndPath(Path* path, int32 id, int32 index) {
 }
 
 RsrcFile RFReader::MapToObsoleteRsrcFile() {
-    if (!fRefnum && fChain) fRefnum = RMapResBaseToRsrcFile(fChain);
-    return fRefnum;
+    if (!refnum_ && chain_) refnum_ = RMapResBaseToRsrcFile(chain_);
+    return refnum_;
 }
 
 MgErr RFReader::ReleaseRsrcFileRefnum() {
-    if (!fRefnum) return kNoErr;
-    const MgErr err = RReleaseRsrcFileRefnum(fRefnum);
-    fRefnum = 0;
+    if (!refnum_) return kNoErr;
+    const MgErr err = RReleaseRsrcFileRefnum(refnum_);
+    refnum_ = 0;
     return err;
 }
 
 ResChain* RFReader::LowLevelResChain() {
-    if (!fChain) TESSEL_REPORT(kDebugWarning, 0x0FA6C2B7u) << "Uninitialized RFReader";
-    return fChain;
+    if (!chain_) TESSEL_REPORT(kDebugWarning, 0x0FA6C2B7u) << "Uninitialized RFReader";
+    return chain_;
 }
 
 // ---- the writer -----------------------------------------------------------------------------------------------------
@@ -332,43 +330,43 @@ MgErr RFReadWrite::AddFromHandle(UHandle data, int32 mode, ResType type, int32 i
         TESSEL_REPORT(kDebugWarning, 0x65B03D9Fu) << "Do not pass NULL to RFReadWrite::AddFromHandle";
         return kGenericErr;
     }
-    if (!fChain) return kResNotFoundErr;
+    if (!chain_) return kResNotFoundErr;
     if (mode) return File()->RAdd(data, type, id, name);
     return File()->RAddPtr(*data, DSGetHandleSize(data), type, id, name);
 }
 
 MgErr RFReadWrite::AddFromPtr(const void* data, uint32 size, ResType type, int32 id, ConstPStr name) {
-    return fChain ? File()->RAddPtr(data, size, type, id, name) : kResNotFoundErr;
+    return chain_ ? File()->RAddPtr(data, size, type, id, name) : kResNotFoundErr;
 }
 
 MgErr RFReadWrite::Remove(ResType type, int32 id) {
-    if (!fChain) return kResNotFoundErr;
+    if (!chain_) return kResNotFoundErr;
     ResFileLock lock;
     Resource* resource = nullptr;
-    MgErr err = fChain->RGet(type, id, &resource);
+    MgErr err = chain_->RGet(type, id, &resource);
     if (err == kResNotFoundErr) return kNoErr;
     if (!err) err = File()->RRemove(resource);
     return err;
 }
 
 MgErr RFReadWrite::ReplaceFromHandle(UHandle data, int32 mode, ResType type, int32 id, ConstPStr name) {
-    if (!fChain) return kResNotFoundErr;
+    if (!chain_) return kResNotFoundErr;
     ResFileLock lock;
     if (const MgErr err = Remove(type, id)) return err;
     return AddFromHandle(data, mode, type, id, name);
 }
 
 MgErr RFReadWrite::UpdateFile() {
-    return fChain ? File()->RUpdateFile() : kResNotFoundErr;
+    return chain_ ? File()->RUpdateFile() : kResNotFoundErr;
 }
 
 RsrcFile RFReadWrite::MapToObsoleteRsrcFile() {
-    if (!fRefnum && fChain) fRefnum = RMapResFileToRsrcFile(File());
-    return fRefnum;
+    if (!refnum_ && chain_) refnum_ = RMapResFileToRsrcFile(File());
+    return refnum_;
 }
 
 ResFile* RFReadWrite::LowLevelResFile() {
-    if (!fChain) TESSEL_REPORT(kDebugWarning, 0x37CE18A4u) << "Uninitialized RFReadWrite";
+    if (!chain_) TESSEL_REPORT(kDebugWarning, 0x37CE18A4u) << "Uninitialized RFReadWrite";
     return File();
 }
 

@@ -1,4 +1,5 @@
-// What the objects behind refnums and handles tell the flat interface, so that it never reaches one that has gone.
+// What refnums and data handles stand for, and what the objects behind them tell when they go, so that the flat
+// interface never reaches one that has gone.
 #ifndef TESSEL_SOURCE_RESOURCES_REFNUMS_H
 #define TESSEL_SOURCE_RESOURCES_REFNUMS_H
 
@@ -10,6 +11,18 @@ namespace tessel {
 
 // A resource gave its handle away, or ends: forgets the handles that were handed out last.
 void EmptyHandleCache();
+
+// The resource of a handle that was handed out, or the null one. The lock is held.
+Resource* ResourceOf(UHandle handle);
+
+// Hands out the data of a resource. The lock is held.
+MgErr ShareHandle(Resource* resource, UHandle* data);
+
+// Takes a refnum back; what it stands for stays. kNotResFileErr: there is none. The lock is held.
+MgErr ForgetRefnum(RsrcFile refnum);
+
+// What a refnum for a chain stands for; null for that of a file, and for none. The lock is held.
+ResChain* MadeChain(RsrcFile refnum);
 
 // A file or chain is about to be destroyed: forgets its refnums, and takes it out of the chains.
 void ForgetRefnumsOf(const ResChain* chain);

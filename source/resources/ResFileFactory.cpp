@@ -3,6 +3,7 @@
 #include "resources/OVResChain.h"
 #include "resources/OVResFile.h"
 #include "resources/ResFileLock.h"
+#include "resources/UncheckedMap.h"
 #include <tessel/base/MGModule.h>
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/FileManager.h>

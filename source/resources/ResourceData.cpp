@@ -38,42 +38,42 @@ void OwnedHandles::Free() {
 }
 
 DSHandleResource::~DSHandleResource() {
-    Dispose(fHandle);
+    Dispose(handle_);
 }
 
 MgErr DSHandleResource::Adopt(UHandle handle) {
     const MgErr err = OwnedHandles::Add(handle);
-    if (!err) fHandle = handle;
+    if (!err) handle_ = handle;
     return err;
 }
 
 void DSHandleResource::DetachHandle() {
-    if (fHandle) OwnedHandles::Remove(fHandle);
-    fHandle = nullptr;
+    if (handle_) OwnedHandles::Remove(handle_);
+    handle_ = nullptr;
 }
 
 uint32 DSHandleResource::GetSize() const {
-    return fHandle ? DSGetHandleSize(fHandle) : 0;
+    return handle_ ? DSGetHandleSize(handle_) : 0;
 }
 
 MappedResource::~MappedResource() {
-    Dispose(fCopy);
+    Dispose(copy_);
 }
 
 void MappedResource::DetachHandle() {
-    if (fCopy) OwnedHandles::Remove(fCopy);
-    fData = nullptr;
-    fSize = 0;
-    fCopy = nullptr;
+    if (copy_) OwnedHandles::Remove(copy_);
+    data_ = nullptr;
+    size_ = 0;
+    copy_ = nullptr;
 }
 
 UHandle MappedResource::GetSharedDSHandle() {
-    if (fCopy || !fData || DSPtrToHand(fData, &fCopy, fSize)) return fCopy;
-    if (OwnedHandles::Add(fCopy)) {
-        DSDisposeHandle(fCopy);
-        fCopy = nullptr;
+    if (copy_ || !data_ || DSPtrToHand(data_, &copy_, size_)) return copy_;
+    if (OwnedHandles::Add(copy_)) {
+        DSDisposeHandle(copy_);
+        copy_ = nullptr;
     }
-    return fCopy;
+    return copy_;
 }
 
 }  // namespace tessel

@@ -41,30 +41,30 @@ public:
     MgErr Adopt(UHandle handle);
     void DetachHandle() override;
     uint32 GetSize() const override;
-    const uint8* GetData() const override { return fHandle ? *fHandle : nullptr; }
-    UHandle GetSharedDSHandle() override { return fHandle; }
-    bool ContainsHandle(UHandle handle) const override { return handle && handle == fHandle; }
+    const uint8* GetData() const override { return handle_ ? *handle_ : nullptr; }
+    UHandle GetSharedDSHandle() override { return handle_; }
+    bool ContainsHandle(UHandle handle) const override { return handle && handle == handle_; }
 
 private:
-    UHandle fHandle = nullptr;
+    UHandle handle_ = nullptr;
 };
 
 // Points into memory of its file, and copies it into a handle when one is asked for.
 class MappedResource final : public ResourceData {
 public:
-    MappedResource(const uint8* data, uint32 size) : fData(data), fSize(size) {}
+    MappedResource(const uint8* data, uint32 size) : data_(data), size_(size) {}
     ~MappedResource() override;
 
     void DetachHandle() override;
-    uint32 GetSize() const override { return fSize; }
-    const uint8* GetData() const override { return fData; }
+    uint32 GetSize() const override { return size_; }
+    const uint8* GetData() const override { return data_; }
     UHandle GetSharedDSHandle() override;
-    bool ContainsHandle(UHandle handle) const override { return handle && handle == fCopy; }
+    bool ContainsHandle(UHandle handle) const override { return handle && handle == copy_; }
 
 private:
-    const uint8* fData;
-    uint32 fSize;
-    UHandle fCopy = nullptr;
+    const uint8* data_;
+    uint32 size_;
+    UHandle copy_ = nullptr;
 };
 
 }  // namespace tessel

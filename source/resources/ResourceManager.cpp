@@ -1,140 +1,18 @@
-// The flat interface: refnums for files and chains, and resources found by their data handles.
+// The flat interface to resource files and their resources.
 #include "diagnostics/Guarded.h"
 #include "resources/NullObjects.h"
-#include "resources/OVResChain.h"
 #include "resources/Refnums.h"
 #include "resources/ResFileLock.h"
-#include "resources/Service.h"
-#include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/DebugStream.h>
-#include <tessel/memory/CookieManager.h>
 #include <tessel/resources/RFReadWrite.h>
 #include <tessel/resources/ResourceManager.h>
 #include <tessel/resources/ovresfile.h>
 
-#include <memory>
 #include <vector>
 
 namespace tessel {
 
 namespace {
-
-enum class Kind : int32 { kChain = 0, kFile = 1 };
-
-// What a refnum stands for.
-struct ResClassStorage : TrackedObject {
-    ResClassStorage(Kind itsKind, ResChain* itsChain) : kind(itsKind), chain(itsChain) {}
-    Kind kind;
-    ResChain* chain;
-};
-
-// The table of refnums.
-class ResFileMap : public TrackedObject {
-public:
-    // Throws kMemFullErr when there is no memory for the table.
-    ResFileMap() {
-        if (fJar.Init()) TESSEL_THROW(kMemFullErr, "ResFileMap");
-    }
-    ~ResFileMap() {
-        int32 left = 0;
-        if (fJar.GetNumCookies(&left))
-            TESSEL_REPORT(kDebugError, 0x61D7A04Bu) << "ResFileMap::~ResFileMap. Bad Cookie Jar()";
-        else if (left)
-            TESSEL_REPORT(kDebugWarning, 0x18F3BC26u) << "The Resource Manager is being shut down with open files!";
-        ForEach([](RsrcFile, ResClassStorage* storage) {
-            delete storage;
-            return false;
-        });
-        fJar.Uninit();
-    }
-    ResFileMap(const ResFileMap&) = delete;
-    ResFileMap& operator=(const ResFileMap&) = delete;
-
-    RsrcFile Add(Kind kind, ResChain* chain) {
-        auto storage = std::make_unique<ResClassStorage>(kind, chain);
-        const RsrcFile refnum = fJar.NewCookie(storage.get());
-        if (refnum) static_cast<void>(storage.release());
-        return refnum;
-    }
-    ResClassStorage* Find(RsrcFile refnum) {
-        ResClassStorage* storage = nullptr;
-        return fJar.GetCookieInfo(refnum, &storage) ? nullptr : storage;
-    }
-    MgErr Remove(RsrcFile refnum) {
-        ResClassStorage* storage = nullptr;
-        if (fJar.DisposeCookie(refnum, &storage)) return kNotResFileErr;
-        delete storage;
-        return kNoErr;
-    }
-    // Until `visit`, given a refnum and what it stands for, returns true.
-    template <class Visit>
-    void ForEach(Visit visit) {
-        CookieList list;
-        if (fJar.GetCookieList(&list)) return;
-        for (int32 i = 0; i < list.GetCount(); ++i) {
-            ResClassStorage* storage = Find(list.GetCookie(i));
-            if (storage && visit(list.GetCookie(i), storage)) return;
-        }
-    }
-
-private:
-    CookieJar<ResClassStorage*> fJar;
-};
-
-ResFileMap* gResFileMap = nullptr;
-
-// The last pairs of a data handle and its resource that were handed out, most recent first.
-class HandleCache {
-public:
-    void Put(UHandle handle, Resource* resource) {
-        if (fPairs[0].handle == handle) return;
-        fPairs[1] = fPairs[0];
-        fPairs[0] = {handle, resource};
-    }
-    Resource* Find(UHandle handle) const {
-        for (const Pair& pair : fPairs) {
-            if (pair.handle && pair.handle == handle) return pair.resource;
-        }
-        return nullptr;
-    }
-    void Empty() { fPairs[0] = fPairs[1] = {}; }
-
-private:
-    struct Pair {
-        UHandle handle;
-        Resource* resource;
-    };
-    Pair fPairs[2] = {};
-};
-
-HandleCache gHandleCache;
-
-RsrcFile NewRefnum(Kind kind, ResChain* chain) {
-    if (!gResFileMap || !chain) return 0;
-    return GuardedOr<RsrcFile>(0, [&] { return gResFileMap->Add(kind, chain); });
-}
-
-// The resource of a handle that was handed out, or the null one. The lock is held.
-Resource* ResourceOf(UHandle handle) {
-    if (!handle || !gResFileMap) return NULLResource();
-    if (Resource* cached = gHandleCache.Find(handle)) return cached;
-    Resource* found = nullptr;
-    gResFileMap->ForEach([&](RsrcFile, ResClassStorage* storage) {
-        found = storage->chain->GetResourceForHandle(handle);
-        return found != nullptr;
-    });
-    if (!found) return NULLResource();
-    gHandleCache.Put(handle, found);
-    return found;
-}
-
-// Hands out the data of a resource.
-MgErr ShareHandle(Resource* resource, UHandle* data) {
-    *data = resource->GetSharedDSHandle();
-    if (!*data) return kMemFullErr;
-    gHandleCache.Put(*data, resource);
-    return kNoErr;
-}
 
 // Runs `open`, which makes a file, and gives the file a refnum. The lock is not held meanwhile: the host's file system
 // may take its time.
@@ -144,7 +22,7 @@ MgErr OpenWithRefnum(RsrcFile* refnum, Open open) {
     *refnum = 0;
     ResFile* file = nullptr;
     if (const MgErr err = open(&file)) return err;
-    *refnum = NewRefnum(Kind::kFile, file);
+    *refnum = RMapResFileToRsrcFile(file);
     if (*refnum) return kNoErr;
     // A memory handle goes back to its owner.
     UHandle handle = nullptr;
@@ -154,54 +32,6 @@ MgErr OpenWithRefnum(RsrcFile* refnum, Open open) {
 }
 
 }  // namespace
-
-MgErr ResourceManagerStart() {
-    gResFileMap = new ResFileMap();
-    const MgErr err = ResFileFactory::InitResourceMgr();
-    if (err) {
-        delete gResFileMap;
-        gResFileMap = nullptr;
-    }
-    return err;
-}
-
-MgErr ResourceManagerStop() {
-    delete gResFileMap;
-    gResFileMap = nullptr;
-    gHandleCache.Empty();
-    return ResFileFactory::UninitResourceMgr();
-}
-
-void EmptyHandleCache() {
-    gHandleCache.Empty();
-}
-
-void ForgetRefnumsOf(const ResChain* chain) {
-    OVResChain::Forget(chain);
-    if (!gResFileMap) return;
-    gResFileMap->ForEach([&](RsrcFile refnum, const ResClassStorage* storage) {
-        if (storage->chain == chain) gResFileMap->Remove(refnum);
-        return false;
-    });
-}
-
-RsrcFile RMapResFileToRsrcFile(ResFile* file) {
-    return NewRefnum(Kind::kFile, file);
-}
-
-RsrcFile RMapResBaseToRsrcFile(ResChain* chain) {
-    return NewRefnum(Kind::kChain, chain);
-}
-
-ResChain* RsrcFileToRMapResChain(RsrcFile refnum) {
-    const ResClassStorage* storage = gResFileMap ? gResFileMap->Find(refnum) : nullptr;
-    return storage ? storage->chain : NULLResFile();
-}
-
-ResFile* RsrcFileToRMapResFile(RsrcFile refnum) {
-    const ResClassStorage* storage = gResFileMap ? gResFileMap->Find(refnum) : nullptr;
-    return storage && storage->kind == Kind::kFile ? static_cast<ResFile*>(storage->chain) : NULLResFile();
-}
 
 }  // namespace tessel
 
@@ -481,7 +311,7 @@ MgErr RChain(RsrcFile* refnum, int32 count, const RsrcFile* files) {
         }
         ResChain* chain = nullptr;
         if (const MgErr err = ResFileFactory::RChain(&chain, count, open.data(), false)) return err;
-        *refnum = NewRefnum(Kind::kChain, chain);
+        *refnum = RMapResBaseToRsrcFile(chain);
         if (!*refnum) delete chain;
         return *refnum ? kNoErr : kMemFullErr;
     });
@@ -489,9 +319,8 @@ MgErr RChain(RsrcFile* refnum, int32 count, const RsrcFile* files) {
 
 MgErr RDestroyChain(RsrcFile refnum) {
     ResFileLock lock;
-    const ResClassStorage* storage = gResFileMap ? gResFileMap->Find(refnum) : nullptr;
-    if (!storage || storage->kind != Kind::kChain) return kNotResFileErr;
-    ResChain* chain = storage->chain;
+    ResChain* chain = MadeChain(refnum);
+    if (!chain) return kNotResFileErr;
     ForgetRefnumsOf(chain);
     delete chain;
     return kNoErr;
@@ -499,6 +328,5 @@ MgErr RDestroyChain(RsrcFile refnum) {
 
 MgErr RReleaseRsrcFileRefnum(RsrcFile refnum) {
     ResFileLock lock;
-    gHandleCache.Empty();
-    return gResFileMap ? gResFileMap->Remove(refnum) : kNotResFileErr;
+    return ForgetRefnum(refnum);
 }

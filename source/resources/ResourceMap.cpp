@@ -1,5 +1,6 @@
 #include "resources/ResourceMap.h"
 
+#include "resources/UncheckedMap.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/resources/ResourceManager.h>
 
@@ -15,177 +16,28 @@ uint32 NameSize(ConstPStr name) {
     return name && name[0] ? name[0] + 1u : 0;
 }
 
-RsrcList NewEntry(int32 id, int32 name) {
+ResourceEntry NewEntry(int32 id, int32 name) {
     return {id, name, kRChangedAttr, 0, 0};
 }
 
-bool LessID(const RsrcList& a, const RsrcList& b) {
+bool LessID(const ResourceEntry& a, const ResourceEntry& b) {
     return a.id < b.id;
 }
 
-void SwapWord(uint8* word) {
-    uint32 value;
-    std::memcpy(&value, word, sizeof value);
-    value = ToBig32(value);
-    std::memcpy(word, &value, sizeof value);
-}
-
-uint32 HostWord(const uint8* word) {
-    uint32 value;
-    std::memcpy(&value, word, sizeof value);
-    return value;
-}
-
-// A part of a map, as offsets from its start.
-struct Extent {
-    uint64 begin;
-    uint64 end;
-};
-using Extents = std::vector<Extent, TrackedAllocator<Extent>>;
-
-bool Overlap(Extents* extents) {
-    std::sort(extents->begin(), extents->end(), [](const Extent& a, const Extent& b) { return a.begin < b.begin; });
-    for (size_t i = 1; i < extents->size(); ++i) {
-        if ((*extents)[i].begin < (*extents)[i - 1].end) return true;
-    }
-    return false;
-}
-
-// A walk over the lists of a map whose counts and offsets nobody has checked yet. Nothing outside `size` is touched.
-class UncheckedMap {
-public:
-    UncheckedMap(uint8* map, uint32 size) : map_(map), size_(size) {}
-
-    MgErr Standardize(MapDirection direction) {
-        RsrcMap* head = reinterpret_cast<RsrcMap*>(map_);
-        const bool fromDisk = direction == MapDirection::kFromDisk;
-        if (!fromDisk) ReadHead(*head);
-        SwapHeader(&head->header);
-        for (size_t at = offsetof(RsrcMap, fileAttrs); at < sizeof(RsrcMap); at += 4) SwapWord(map_ + at);
-        if (fromDisk) ReadHead(*head);
-        if (size_ <= kEmptyMapSize) return kNoErr;
-        if (!Fits(typeList_, kTypeCountSize) || typeList_ < kEmptyMapSize) return kIOErr;
-        return StandardizeTypes(fromDisk);
-    }
-
-    // Whether names and lists lie apart and names end inside the map. Host order.
-    MgErr CheckExtents() {
-        if (Overlap(&lists_) || TypeTwice()) return kIOErr;
-        const uint64 listsEnd = lists_.empty() ? typeList_ : lists_.back().end;
-        if (nameList_ != 0 && (nameList_ < listsEnd || nameList_ > size_)) return kIOErr;
-        if (!CollectNames()) return kIOErr;
-        return Overlap(&names_) ? kIOErr : kNoErr;
-    }
-
-private:
-    bool Fits(uint64 at, uint64 length) const { return at <= size_ && length <= size_ - at; }
-
-    void ReadHead(const RsrcMap& head) {
-        typeList_ = head.typeList;
-        nameList_ = head.nameList;
-    }
-
-    // The count of a list in host order, which is stored as one less.
-    int64 TakeCount(uint8* word, bool fromDisk) {
-        if (fromDisk) SwapWord(word);
-        const auto lastIndex = static_cast<int32>(HostWord(word));
-        if (!fromDisk) SwapWord(word);
-        return int64{lastIndex} + 1;
-    }
-
-    MgErr StandardizeTypes(bool fromDisk) {
-        const int64 count = TakeCount(map_ + typeList_, fromDisk);
-        const uint64 first = typeList_ + kTypeCountSize;
-        if (count < 0 || !Fits(first, static_cast<uint64>(count) * kTypeEntrySize)) return kIOErr;
-        typesEnd_ = first + static_cast<uint64>(count) * kTypeEntrySize;
-        if (fromDisk) lists_.reserve(static_cast<size_t>(count));
-        for (uint64 at = first; at < typesEnd_; at += kTypeEntrySize) {
-            if (const MgErr err = StandardizeList(map_ + at, fromDisk)) return err;
-        }
-        return kNoErr;
-    }
-
-    MgErr StandardizeList(uint8* typeEntry, bool fromDisk) {
-        const int64 count = TakeCount(typeEntry + offsetof(TypeList, lastIndex), fromDisk);
-        uint8* offsetWord = typeEntry + offsetof(TypeList, list);
-        if (fromDisk) SwapWord(offsetWord);
-        const uint64 begin = typeList_ + uint64{HostWord(offsetWord)};
-        if (!fromDisk) SwapWord(offsetWord);
-        const uint64 length = static_cast<uint64>(count) * kRefEntrySize;
-        if (count < 1 || begin < typesEnd_ || !Fits(begin, length)) return kIOErr;
-        // Lists that overlap must not cost more than the map is long; Overlap refuses them later.
-        listBytes_ += length;
-        if (listBytes_ > size_) return kIOErr;
-        if (fromDisk) lists_.push_back({begin, begin + length});
-        for (uint64 at = begin; at < begin + length; at += kRefEntrySize) {
-            for (uint64 word = 0; word < offsetof(RsrcList, loaded); word += 4) SwapWord(map_ + at + word);
-        }
-        return kNoErr;
-    }
-
-    bool TypeTwice() const {
-        std::vector<ResType, TrackedAllocator<ResType>> types;
-        for (uint64 at = typeList_ + kTypeCountSize; at < typesEnd_; at += kTypeEntrySize)
-            types.push_back(HostWord(map_ + at));
-        std::sort(types.begin(), types.end());
-        return std::adjacent_find(types.begin(), types.end()) != types.end();
-    }
-
-    bool CollectNames() {
-        for (const Extent& list : lists_) {
-            for (uint64 at = list.begin; at < list.end; at += kRefEntrySize) {
-                const auto name = static_cast<int32>(HostWord(map_ + at + offsetof(RsrcList, name)));
-                if (name == kNoName) continue;
-                const uint64 begin = nameList_ + uint64{static_cast<uint32>(name)};
-                if (nameList_ == 0 || name < 0 || !Fits(begin, 1)) return false;
-                const uint64 length = 1u + map_[begin];
-                if (!Fits(begin, length)) return false;
-                names_.push_back({begin, begin + length});
-            }
-        }
-        return true;
-    }
-
-    uint8* map_;
-    uint64 size_;
-    uint64 typeList_ = 0;
-    uint64 nameList_ = 0;
-    uint64 typesEnd_ = 0;
-    uint64 listBytes_ = 0;
-    Extents lists_;
-    Extents names_;
-};
-
 }  // namespace
 
-bool SanityCheckRsrcMap(const RsrcHeader& copy, const RsrcHeader& header) {
-    return copy.magic == header.magic && std::memcmp(copy.eol, header.eol, sizeof copy.eol) == 0 &&
-           copy.version == header.version && copy.type == header.type && copy.creator == header.creator;
-}
-
-MgErr StandardizeAndSanityChkRsrcMap(uint8* map, uint32 size, MapDirection direction, const RsrcHeader& header) {
-    UncheckedMap unchecked(map, size);
-    if (const MgErr err = unchecked.Standardize(direction)) return err;
-    if (direction == MapDirection::kToDisk) return kNoErr;
-    const RsrcMap* head = reinterpret_cast<const RsrcMap*>(map);
-    if (!SanityCheckRsrcMap(head->header, header)) return kIOErr;
-    const auto length = static_cast<int32>(size);
-    if (static_cast<int32>(head->typeList) > length || static_cast<int32>(head->nameList) > length) return kIOErr;
-    return unchecked.CheckExtents();
-}
-
 void ResourceMap::Dispose() {
-    if (fHandle) DSDisposeHandle(fHandle);
-    fHandle = nullptr;
-    fSize = 0;
+    if (handle_) DSDisposeHandle(handle_);
+    handle_ = nullptr;
+    size_ = 0;
 }
 
 // ---- coming and going -----------------------------------------------------------------------------------------------
 
 MgErr ResourceMap::MakeEmpty(const RsrcHeader& header) {
-    fHandle = DSNewHClr(kEmptyMapSize);
-    if (!fHandle) return kMemFullErr;
-    fSize = kEmptyMapSize;
+    handle_ = DSNewHClr(kEmptyMapSize);
+    if (!handle_) return kMemFullErr;
+    size_ = kEmptyMapSize;
     Head()->header = header;
     MakeBlank();
     return kNoErr;
@@ -203,14 +55,14 @@ void ResourceMap::MakeBlank() {
 }
 
 MgErr ResourceMap::FromDisk(UHandle bytes, const RsrcHeader& header) {
-    fHandle = bytes;
-    fSize = DSGetHandleSize(bytes);
-    const uint32 mapLength = fSize;
-    if (fSize < kEmptyMapSize) {
+    handle_ = bytes;
+    size_ = DSGetHandleSize(bytes);
+    const uint32 mapLength = size_;
+    if (size_ < kEmptyMapSize) {
         if (const MgErr err = DSSetHSzClr(bytes, kEmptyMapSize)) return err;
-        fSize = kEmptyMapSize;
+        size_ = kEmptyMapSize;
     }
-    const MgErr err = StandardizeAndSanityChkRsrcMap(*bytes, fSize, MapDirection::kFromDisk, header);
+    const MgErr err = StandardizeAndSanityChkRsrcMap(*bytes, size_, MapDirection::kFromDisk, header);
     if (err) return err;
     Head()->header = header;
     if (mapLength <= kEmptyMapSize || TypeCount() == 0) {
@@ -219,15 +71,15 @@ MgErr ResourceMap::FromDisk(UHandle bytes, const RsrcHeader& header) {
         return kNoErr;
     }
     for (int32 i = 0; i < TypeCount(); ++i) {
-        RsrcList* entries = Entries(TypeAt(i));
+        ResourceEntry* entries = Entries(TypeAt(i));
         for (int32 k = 0; k < CountOf(TypeAt(i)); ++k) entries[k].loaded = 0;
     }
     return kNoErr;
 }
 
 MgErr ResourceMap::CopyOf(const ResourceMap& other) {
-    fSize = other.fSize;
-    return DSPtrToHand(*other.fHandle, &fHandle, fSize);
+    size_ = other.size_;
+    return DSPtrToHand(*other.handle_, &handle_, size_);
 }
 
 void ResourceMap::SetLayout(uint32 dataLength) {
@@ -236,24 +88,24 @@ void ResourceMap::SetLayout(uint32 dataLength) {
     header.dataOffset = kHeaderSize;
     header.dataLength = dataLength;
     header.mapOffset = kHeaderSize + dataLength;
-    header.mapLength = empty ? 0 : fSize;
+    header.mapLength = empty ? 0 : size_;
 }
 
 void ResourceMap::ToDisk(uint8* bytes) const {
-    std::memcpy(bytes, *fHandle, fSize);
-    const uint8* start = *fHandle;
+    std::memcpy(bytes, *handle_, size_);
+    const uint8* start = *handle_;
     for (int32 i = 0, types = TypeCount(); i < types; ++i) {
-        const RsrcList* entries = Entries(TypeAt(i));
-        auto* copies = reinterpret_cast<RsrcList*>(bytes + (reinterpret_cast<const uint8*>(entries) - start));
+        const ResourceEntry* entries = Entries(TypeAt(i));
+        auto* copies = reinterpret_cast<ResourceEntry*>(bytes + (reinterpret_cast<const uint8*>(entries) - start));
         for (int32 k = 0, count = CountOf(TypeAt(i)); k < count; ++k) copies[k].loaded = 0;
     }
-    StandardizeAndSanityChkRsrcMap(bytes, fSize, MapDirection::kToDisk, Head()->header);
+    StandardizeAndSanityChkRsrcMap(bytes, size_, MapDirection::kToDisk, Head()->header);
 }
 
 void ResourceMap::Sort() {
     for (int32 i = 0, types = TypeCount(); i < types; ++i) {
-        RsrcList* first = Entries(TypeAt(i));
-        RsrcList* last = first + CountOf(TypeAt(i));
+        ResourceEntry* first = Entries(TypeAt(i));
+        ResourceEntry* last = first + CountOf(TypeAt(i));
         if (!std::is_sorted(first, last, LessID)) std::stable_sort(first, last, LessID);
     }
 }
@@ -261,10 +113,10 @@ void ResourceMap::Sort() {
 // ---- finding --------------------------------------------------------------------------------------------------------
 
 int32 ResourceMap::TypeCount() const {
-    return fSize <= kEmptyMapSize ? 0 : Types()->lastIndex + 1;
+    return size_ <= kEmptyMapSize ? 0 : Types()->lastIndex + 1;
 }
 
-TypeList* ResourceMap::FindType(ResType type) const {
+TypeEntry* ResourceMap::FindType(ResType type) const {
     for (int32 i = 0, types = TypeCount(); i < types; ++i) {
         if (TypeAt(i)->type == type) return TypeAt(i);
     }
@@ -277,22 +129,22 @@ int64 ResourceMap::ReferenceCount() const {
     return sum;
 }
 
-RsrcList* ResourceMap::Entries(const TypeList* type) const {
-    return reinterpret_cast<RsrcList*>(reinterpret_cast<uint8*>(Types()) + type->list);
+ResourceEntry* ResourceMap::Entries(const TypeEntry* type) const {
+    return reinterpret_cast<ResourceEntry*>(reinterpret_cast<uint8*>(Types()) + type->list);
 }
 
-RsrcList* ResourceMap::FindEntry(ResType type, int32 id) const {
-    const TypeList* list = FindType(type);
+ResourceEntry* ResourceMap::FindEntry(ResType type, int32 id) const {
+    const TypeEntry* list = FindType(type);
     if (!list) return nullptr;
-    RsrcList* first = Entries(list);
-    RsrcList* last = first + CountOf(list);
-    RsrcList* found =
-        std::lower_bound(first, last, id, [](const RsrcList& entry, int32 key) { return entry.id < key; });
+    ResourceEntry* first = Entries(list);
+    ResourceEntry* last = first + CountOf(list);
+    ResourceEntry* found =
+        std::lower_bound(first, last, id, [](const ResourceEntry& entry, int32 key) { return entry.id < key; });
     return found != last && found->id == id ? found : nullptr;
 }
 
-uint32 ResourceMap::PositionOf(const RsrcList* entry) const {
-    return static_cast<uint32>(reinterpret_cast<const uint8*>(entry) - *fHandle);
+uint32 ResourceMap::PositionOf(const ResourceEntry* entry) const {
+    return static_cast<uint32>(reinterpret_cast<const uint8*>(entry) - *handle_);
 }
 
 void ResourceMap::CollectEntries(Positions* positions) const {
@@ -300,49 +152,49 @@ void ResourceMap::CollectEntries(Positions* positions) const {
         const uint64 begin = uint64{Head()->typeList} + TypeAt(i)->list;
         for (int32 k = 0, count = CountOf(TypeAt(i)); k < count; ++k) {
             const uint64 at = begin + static_cast<uint64>(k) * kRefEntrySize;
-            if (at + kRefEntrySize > fSize) break;
+            if (at + kRefEntrySize > size_) break;
             positions->push_back(static_cast<uint32>(at));
         }
     }
 }
 
-ConstPStr ResourceMap::NameOf(const RsrcList* entry) const {
+ConstPStr ResourceMap::NameOf(const ResourceEntry* entry) const {
     static constexpr uint8 kEmptyName[1] = {0};
     if (entry->name == kNoName) return kEmptyName;
-    return *fHandle + Head()->nameList + static_cast<uint32>(entry->name);
+    return *handle_ + Head()->nameList + static_cast<uint32>(entry->name);
 }
 
 // ---- changing -------------------------------------------------------------------------------------------------------
 
 MgErr ResourceMap::Resize(uint64 size) {
     if (size > static_cast<uint64>(std::numeric_limits<int32>::max())) return kMemFullErr;
-    if (const MgErr err = DSSetHandleSize(fHandle, static_cast<uint32>(size))) return err;
-    fSize = static_cast<uint32>(size);
+    if (const MgErr err = DSSetHandleSize(handle_, static_cast<uint32>(size))) return err;
+    size_ = static_cast<uint32>(size);
     return kNoErr;
 }
 
 // A handle that stays too large does no harm.
 void ResourceMap::Shrink(uint32 size) {
-    fSize = size;
-    DSSetHandleSize(fHandle, size);
+    size_ = size;
+    DSSetHandleSize(handle_, size);
 }
 
 // Moves what lies from `at` to the end of the first `used` bytes up. The room for it is there already.
 void ResourceMap::OpenGap(uint32 at, uint32 size, uint32 used) {
-    uint8* map = *fHandle;
+    uint8* map = *handle_;
     std::memmove(map + at + size, map + at, used - at);
 }
 
 void ResourceMap::CloseGap(uint32 at, uint32 size) {
-    uint8* map = *fHandle;
-    std::memmove(map + at, map + at + size, fSize - at - size);
-    fSize -= size;
+    uint8* map = *handle_;
+    std::memmove(map + at, map + at + size, size_ - at - size);
+    size_ -= size;
 }
 
 // Moves the lists that begin at `fromOffset` (from the type list start) or later.
 void ResourceMap::ShiftLists(uint32 fromOffset, int32 by) {
     for (int32 i = 0, types = TypeCount(); i < types; ++i) {
-        TypeList* type = TypeAt(i);
+        TypeEntry* type = TypeAt(i);
         if (type->list >= fromOffset) type->list += static_cast<uint32>(by);
     }
 }
@@ -356,16 +208,16 @@ int32 ResourceMap::AppendName(ConstPStr name, uint32 end) {
     if (!NameSize(name)) return kNoName;
     RsrcMap* head = Head();
     if (head->nameList == 0) head->nameList = end;
-    std::memcpy(*fHandle + end, name, NameSize(name));
+    std::memcpy(*handle_ + end, name, NameSize(name));
     return static_cast<int32>(end - head->nameList);
 }
 
 MgErr ResourceMap::Insert(ResType type, int32 id, ConstPStr name, uint32* position) {
     if (IsEmpty()) return InsertFirst(type, id, name, position);
     if (FindEntry(type, id)) return kResIDExistsErr;
-    TypeList* list = FindType(type);
+    TypeEntry* list = FindType(type);
     const MgErr err = list ? InsertEntry(list, id, name, position) : InsertType(type, id, name, position);
-    if (!err) Head()->header.mapLength = fSize;
+    if (!err) Head()->header.mapLength = size_;
     return err;
 }
 
@@ -377,19 +229,19 @@ MgErr ResourceMap::InsertFirst(ResType type, int32 id, ConstPStr name, uint32* p
     *TypeAt(0) = {type, 0, kListOffset};
     *position = kEmptyMapSize + kListOffset;
     *EntryAt(*position) = NewEntry(id, AppendName(name, kEnd));
-    Head()->header.mapLength = fSize;
+    Head()->header.mapLength = size_;
     return kNoErr;
 }
 
-MgErr ResourceMap::InsertEntry(TypeList* type, int32 id, ConstPStr name, uint32* position) {
-    const uint32 oldSize = fSize;
-    const auto typePosition = static_cast<uint32>(reinterpret_cast<uint8*>(type) - *fHandle);
-    RsrcList* first = Entries(type);
-    const RsrcList* after = std::upper_bound(first, first + CountOf(type), NewEntry(id, kNoName), LessID);
+MgErr ResourceMap::InsertEntry(TypeEntry* type, int32 id, ConstPStr name, uint32* position) {
+    const uint32 oldSize = size_;
+    const auto typePosition = static_cast<uint32>(reinterpret_cast<uint8*>(type) - *handle_);
+    ResourceEntry* first = Entries(type);
+    const ResourceEntry* after = std::upper_bound(first, first + CountOf(type), NewEntry(id, kNoName), LessID);
     *position = PositionOf(after);
 
     if (const MgErr err = Resize(uint64{oldSize} + kRefEntrySize + NameSize(name))) return err;
-    type = reinterpret_cast<TypeList*>(*fHandle + typePosition);
+    type = reinterpret_cast<TypeEntry*>(*handle_ + typePosition);
     OpenGap(*position, kRefEntrySize, oldSize);
     ShiftLists(type->list + 1, kRefEntrySize);
     ++type->lastIndex;
@@ -399,7 +251,7 @@ MgErr ResourceMap::InsertEntry(TypeList* type, int32 id, ConstPStr name, uint32*
 }
 
 MgErr ResourceMap::InsertType(ResType type, int32 id, ConstPStr name, uint32* position) {
-    const uint32 oldSize = fSize;
+    const uint32 oldSize = size_;
     const uint32 listsEnd = Head()->nameList != 0 ? Head()->nameList : oldSize;
     constexpr uint32 kGrowth = kTypeEntrySize + kRefEntrySize;
     if (const MgErr err = Resize(uint64{oldSize} + kGrowth + NameSize(name))) return err;
@@ -409,7 +261,7 @@ MgErr ResourceMap::InsertType(ResType type, int32 id, ConstPStr name, uint32* po
     OpenGap(typePosition, kTypeEntrySize, oldSize + kRefEntrySize);
     ShiftLists(0, kTypeEntrySize);
     *position = listsEnd + kTypeEntrySize;
-    *reinterpret_cast<TypeList*>(*fHandle + typePosition) = {type, 0, *position - Head()->typeList};
+    *reinterpret_cast<TypeEntry*>(*handle_ + typePosition) = {type, 0, *position - Head()->typeList};
     ++Types()->lastIndex;
     if (Head()->nameList != 0) Head()->nameList += kGrowth;
     *EntryAt(*position) = NewEntry(id, AppendName(name, oldSize + kGrowth));
@@ -417,7 +269,7 @@ MgErr ResourceMap::InsertType(ResType type, int32 id, ConstPStr name, uint32* po
 }
 
 MgErr ResourceMap::Remove(ResType type, uint32 position) {
-    TypeList* list = FindType(type);
+    TypeEntry* list = FindType(type);
     if (CountOf(list) == 1 && TypeCount() == 1) {
         MakeBlank();
         Shrink(kEmptyMapSize);
@@ -431,7 +283,7 @@ MgErr ResourceMap::Remove(ResType type, uint32 position) {
     ShiftLists(listOffset + 1, -static_cast<int32>(kRefEntrySize));
     uint32 removed = kRefEntrySize;
     if (CountOf(list) == 1) {
-        CloseGap(static_cast<uint32>(reinterpret_cast<uint8*>(list) - *fHandle), kTypeEntrySize);
+        CloseGap(static_cast<uint32>(reinterpret_cast<uint8*>(list) - *handle_), kTypeEntrySize);
         --Types()->lastIndex;
         ShiftLists(0, -static_cast<int32>(kTypeEntrySize));
         removed += kTypeEntrySize;
@@ -439,17 +291,17 @@ MgErr ResourceMap::Remove(ResType type, uint32 position) {
         --list->lastIndex;
     }
     if (Head()->nameList != 0) Head()->nameList -= removed;
-    Head()->header.mapLength = fSize;
-    Shrink(fSize);
+    Head()->header.mapLength = size_;
+    Shrink(size_);
     return kNoErr;
 }
 
 void ResourceMap::RemoveName(uint32 nameOffset) {
     const uint32 at = Head()->nameList + nameOffset;
-    const uint32 size = (*fHandle)[at] + 1u;
+    const uint32 size = (*handle_)[at] + 1u;
     CloseGap(at, size);
     for (int32 i = 0, types = TypeCount(); i < types; ++i) {
-        RsrcList* entries = Entries(TypeAt(i));
+        ResourceEntry* entries = Entries(TypeAt(i));
         for (int32 k = 0, count = CountOf(TypeAt(i)); k < count; ++k) {
             if (entries[k].name > static_cast<int32>(nameOffset)) entries[k].name -= static_cast<int32>(size);
         }

@@ -15,8 +15,7 @@ namespace tessel {
 //
 // Once FromDisk has accepted a map, the counts, lists and names in it lie inside it and do not overlap: the header, the
 // type list, the reference lists (in any order, possibly with gaps), the names; no type is there twice. Every change
-// keeps it so. A map without
-// types is always the 52 bytes of an empty one.
+// keeps it so. A map without types is always the 52 bytes of an empty one.
 //
 // Positions are offsets from the map start; pointers are good until the next change.
 class ResourceMap {
@@ -47,34 +46,34 @@ public:
     // Sorts every list that is not in the order of ascending IDs.
     void Sort();
 
-    bool Exists() const { return fHandle != nullptr; }
+    bool Exists() const { return handle_ != nullptr; }
     bool IsEmpty() const { return Head()->header.mapLength <= kHeaderSize; }
-    uint32 Size() const { return fSize; }
-    RsrcMap* Head() const { return reinterpret_cast<RsrcMap*>(*fHandle); }
-    UHandle Handle() const { return fHandle; }
+    uint32 Size() const { return size_; }
+    RsrcMap* Head() const { return reinterpret_cast<RsrcMap*>(*handle_); }
+    UHandle Handle() const { return handle_; }
 
     int32 TypeCount() const;
-    TypeList* TypeAt(int32 index) const { return &Types()->types[index]; }
-    TypeList* FindType(ResType type) const;
-    static int32 CountOf(const TypeList* type) { return type->lastIndex + 1; }
+    TypeEntry* TypeAt(int32 index) const { return &Types()->types[index]; }
+    TypeEntry* FindType(ResType type) const;
+    static int32 CountOf(const TypeEntry* type) { return type->lastIndex + 1; }
     int64 ReferenceCount() const;
 
-    RsrcList* Entries(const TypeList* type) const;
-    RsrcList* FindEntry(ResType type, int32 id) const;
-    RsrcList* EntryAt(uint32 position) const { return reinterpret_cast<RsrcList*>(*fHandle + position); }
-    uint32 PositionOf(const RsrcList* entry) const;
+    ResourceEntry* Entries(const TypeEntry* type) const;
+    ResourceEntry* FindEntry(ResType type, int32 id) const;
+    ResourceEntry* EntryAt(uint32 position) const { return reinterpret_cast<ResourceEntry*>(*handle_ + position); }
+    uint32 PositionOf(const ResourceEntry* entry) const;
     // Every reference entry, type by type. Fewer than ReferenceCount says when the lists do not fit the map any more.
     void CollectEntries(Positions* positions) const;
 
     // The name of an entry, or the empty one.
-    ConstPStr NameOf(const RsrcList* entry) const;
+    ConstPStr NameOf(const ResourceEntry* entry) const;
 
     // Adds an entry that is marked changed; *position is where it stands. kResIDExistsErr: the ID is taken.
     MgErr Insert(ResType type, int32 id, ConstPStr name, uint32* position);
     MgErr Remove(ResType type, uint32 position);
 
 private:
-    TypeMap* Types() const { return reinterpret_cast<TypeMap*>(*fHandle + Head()->typeList); }
+    TypeMap* Types() const { return reinterpret_cast<TypeMap*>(*handle_ + Head()->typeList); }
     uint32 TypesEnd() const;
     MgErr Resize(uint64 size);
     void Shrink(uint32 size);
@@ -83,22 +82,14 @@ private:
     void ShiftLists(uint32 fromOffset, int32 by);
     int32 AppendName(ConstPStr name, uint32 end);
     MgErr InsertFirst(ResType type, int32 id, ConstPStr name, uint32* position);
-    MgErr InsertEntry(TypeList* type, int32 id, ConstPStr name, uint32* position);
+    MgErr InsertEntry(TypeEntry* type, int32 id, ConstPStr name, uint32* position);
     MgErr InsertType(ResType type, int32 id, ConstPStr name, uint32* position);
     void RemoveName(uint32 nameOffset);
     void MakeBlank();
 
-    UHandle fHandle = nullptr;
-    uint32 fSize = 0;
+    UHandle handle_ = nullptr;
+    uint32 size_ = 0;
 };
-
-// Converts a map in place between file and host order and, coming from disk, checks it against the header and itself.
-// kIOErr: it does not pass. `header` is in host order.
-enum class MapDirection { kFromDisk, kToDisk };
-MgErr StandardizeAndSanityChkRsrcMap(uint8* map, uint32 size, MapDirection direction, const RsrcHeader& header);
-
-// Whether two headers, the file's and the map's copy, belong together.
-bool SanityCheckRsrcMap(const RsrcHeader& copy, const RsrcHeader& header);
 
 }  // namespace tessel
 

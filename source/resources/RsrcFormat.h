@@ -30,26 +30,26 @@ struct [[gnu::packed]] RsrcMap {
 };
 static_assert(sizeof(RsrcMap) == 52);
 
-struct [[gnu::packed]] TypeList {
+struct [[gnu::packed]] TypeEntry {
     ResType type;
     int32 lastIndex;  // number of resources minus one
     uint32 list;      // of its reference entries, from the type list start
 };
-static_assert(sizeof(TypeList) == 12);
+static_assert(sizeof(TypeEntry) == 12);
 
 struct [[gnu::packed]] TypeMap {
     int32 lastIndex;  // number of types minus one
-    TypeList types[1];
+    TypeEntry types[1];
 };
 
-struct [[gnu::packed]] RsrcList {
+struct [[gnu::packed]] ResourceEntry {
     int32 id;
     int32 name;  // offset from the name list start; kNoName
     uint32 attrs;
     uint32 data;    // offset from the data section start
     uint32 loaded;  // 0 on disk; in memory the slot of the loaded resource plus one
 };
-static_assert(sizeof(RsrcList) == 20);
+static_assert(sizeof(ResourceEntry) == 20);
 
 constexpr FourCC kRsrcMagic = TESSEL_FOURCC('R', 'S', 'R', 'C');
 constexpr uint16 kRsrcVersion = 3;
@@ -60,8 +60,8 @@ constexpr int32 kNoName = -1;
 constexpr uint32 kHeaderSize = sizeof(RsrcHeader);
 constexpr uint32 kEmptyMapSize = sizeof(RsrcMap);
 constexpr uint32 kTypeCountSize = 4;
-constexpr uint32 kTypeEntrySize = sizeof(TypeList);
-constexpr uint32 kRefEntrySize = sizeof(RsrcList);
+constexpr uint32 kTypeEntrySize = sizeof(TypeEntry);
+constexpr uint32 kRefEntrySize = sizeof(ResourceEntry);
 constexpr uint32 kTrailerSize = 4;
 
 // What a data entry with n bytes takes up: the length word, the bytes, zeros up to a multiple of 4.

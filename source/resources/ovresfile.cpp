@@ -22,7 +22,7 @@ namespace {
 // IDs that RUniqueID gives out.
 constexpr int32 kFirstUniqueID = 128;
 constexpr int32 kLastUniqueID = 0x7FFFFFF;
-int32 gNextUniqueID = kFirstUniqueID;
+int32 nextUniqueID = kFirstUniqueID;
 
 void CopyName(ConstPStr from, PStr to) {
     std::memcpy(to, from, from[0] + 1u);
@@ -66,32 +66,26 @@ MgErr ReadRsrcHeader(OVResfileIO& io, RsrcHeader* header, uint64* base) {
 // ---- the lookup cache -----------------------------------------------------------------------------------------------
 
 void ResCache::Set(const OVResource* resource, ResType type, uint32 position) {
-    fResource = resource;
-    fType = type;
-    fPosition = position;
+    resource_ = resource;
+    type_ = type;
+    position_ = position;
 }
 
-bool ResCache::FindRL(const OVResource* resource, const ResourceMap& map, ResType* type, RsrcList** entry) const {
-    if (!type || !entry) {
-        ReportUnlocked(
-            [] { TESSEL_REPORT(kDebugError, 0x4D2B86F1u) << "ResCache::FindRL, outType or outRLEntry are NULL"; });
-        return false;
-    }
-    if (fPosition == kNothing || fResource != resource) return false;
-    *type = fType;
-    *entry = map.EntryAt(fPosition);
-    if ((*entry)->loaded == 0)
+FoundEntry ResCache::Find(const OVResource* resource, const ResourceMap& map) const {
+    if (position_ == kNothing || resource_ != resource) return {};
+    ResourceEntry* entry = map.EntryAt(position_);
+    if (entry->loaded == 0)
         ReportUnlocked([] {
             TESSEL_REPORT(kDebugError, 0x7A90C35Eu) << "ResCache::FindRL, Error in cache logic. Hit on stale entry.";
         });
-    return true;
+    return {type_, entry};
 }
 
 // ---- opening and closing --------------------------------------------------------------------------------------------
 
 OVResFile::~OVResFile() {
     ResFileLock lock;
-    const bool lost = fOpen && fIO && fIO->CanWrite() && (fMap.Head()->fileAttrs & kRFileChanged);
+    const bool lost = open_ && io_ && io_->CanWrite() && (map_.Head()->fileAttrs & kRFileChanged);
     if (lost) {
         ReportUnlocked([] {
             TESSEL_REPORT(kDebugError, 0x3D94B7E6u) << "A resource file goes with changes that are not written!";
@@ -108,57 +102,57 @@ MgErr OVResFile::Open(OVResfileIO* io, _FMFileType* type, _FMFileCreator* creato
         return kArgErr;
     }
     std::unique_ptr<OVResfileIO> source(io);
-    if (fOpen) return kGenericErr;
-    fIO = std::move(source);
+    if (open_) return kGenericErr;
+    io_ = std::move(source);
     if (const MgErr err = Guarded([&] { return OpenSource(sorts); })) {
         Dispose();
         return err;
     }
-    fOpen = true;
-    if (type) *type = fMap.Head()->header.type;
-    if (creator) *creator = fMap.Head()->header.creator;
+    open_ = true;
+    if (type) *type = map_.Head()->header.type;
+    if (creator) *creator = map_.Head()->header.creator;
     return kNoErr;
 }
 
 MgErr OVResFile::OpenSource(bool sorts) {
-    if (const MgErr err = fIO->Prepare()) return err;
+    if (const MgErr err = io_->Prepare()) return err;
     RsrcHeader header;
-    if (const MgErr err = ReadRsrcHeader(*fIO, &header, &fBase)) return err;
-    if (const MgErr err = ReadMap(header, fBase)) return err;
-    RsrcMap* head = fMap.Head();
-    head->fileAttrs = fIO->IsReadOnly() ? kRFileReadOnly : 0;
+    if (const MgErr err = ReadRsrcHeader(*io_, &header, &base_)) return err;
+    if (const MgErr err = ReadMap(header, base_)) return err;
+    RsrcMap* head = map_.Head();
+    head->fileAttrs = io_->IsReadOnly() ? kRFileReadOnly : 0;
     if (head->header.version == kOldestRsrcVersion) std::memcpy(head->header.eol, kRsrcEol, sizeof kRsrcEol);
-    if (sorts) fMap.Sort();
+    if (sorts) map_.Sort();
     head->header.version = kRsrcVersion;
     return kNoErr;
 }
 
 MgErr OVResFile::ReadMap(const RsrcHeader& header, uint64 base) {
-    if (header.mapLength <= kHeaderSize) return fMap.MakeEmpty(header);
+    if (header.mapLength <= kHeaderSize) return map_.MakeEmpty(header);
     // A length that the source does not have must not cost the memory for it.
     uint64 size = 0;
-    if (const MgErr err = fIO->Size(&size)) return err;
+    if (const MgErr err = io_->Size(&size)) return err;
     const uint64 start = base + header.mapOffset;
     if (start > size || header.mapLength > size - start) return kEOFErr;
     UHandle bytes = DSNewHandle(header.mapLength);
     if (!bytes) return kMemFullErr;
-    if (const MgErr err = fIO->Read(start, *bytes, header.mapLength)) {
+    if (const MgErr err = io_->Read(start, *bytes, header.mapLength)) {
         DSDisposeHandle(bytes);
         return err;
     }
-    return fMap.FromDisk(bytes, header);
+    return map_.FromDisk(bytes, header);
 }
 
 MgErr OVResFile::CreateInMemory(_FMFileType type, _FMFileCreator creator) {
     ResFileLock lock;
-    if (const MgErr err = fMap.MakeEmpty(EmptyHeader(type, creator))) return err;
-    fOpen = true;
+    if (const MgErr err = map_.MakeEmpty(EmptyHeader(type, creator))) return err;
+    open_ = true;
     return kNoErr;
 }
 
 MgErr OVResFile::RCloseFile() {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (const MgErr err = RUpdateFile()) return err;
     Dispose();
     return kNoErr;
@@ -166,38 +160,38 @@ MgErr OVResFile::RCloseFile() {
 
 void OVResFile::Dispose() {
     OVResChain::Forget(this);
-    for (OVResource* resource : fLoaded) delete resource;
-    fLoaded.clear();
-    fFreeSlots.clear();
-    fCache.Empty();
-    fMap.Dispose();
-    fIO.reset();
-    fOpen = false;
+    for (OVResource* resource : loaded_) delete resource;
+    loaded_.clear();
+    freeSlots_.clear();
+    cache_.Empty();
+    map_.Dispose();
+    io_.reset();
+    open_ = false;
 }
 
 // ---- loading --------------------------------------------------------------------------------------------------------
 
 // The length word of an entry, which must lie in the data section with all it counts.
-MgErr OVResFile::DataLengthAt(const RsrcList& entry, uint32* length) {
-    const uint64 dataLength = fMap.Head()->header.dataLength;
+MgErr OVResFile::DataLengthAt(const ResourceEntry& entry, uint32* length) {
+    const uint64 dataLength = map_.Head()->header.dataLength;
     const uint64 start = entry.data;
-    if (start + 4 > dataLength || !fIO) return kEOFErr;
+    if (start + 4 > dataLength || !io_) return kEOFErr;
     uint32 word = 0;
-    if (fIO->Read(DataStart() + start, &word, 4)) return kNotResFileErr;
+    if (io_->Read(DataStart() + start, &word, 4)) return kNotResFileErr;
     *length = ToBig32(word);
     return start + 4 + *length > dataLength ? kEOFErr : kNoErr;
 }
 
-MgErr OVResFile::LoadData(const RsrcList& entry, std::unique_ptr<ResourceData>* data) {
+MgErr OVResFile::LoadData(const ResourceEntry& entry, std::unique_ptr<ResourceData>* data) {
     uint32 length = 0;
     if (const MgErr err = DataLengthAt(entry, &length)) return err;
     // Nor may a data section that the source does not have.
     const uint64 start = DataStart() + entry.data + 4;
     uint64 size = 0;
-    if (const MgErr err = fIO->Size(&size)) return err;
+    if (const MgErr err = io_->Size(&size)) return err;
     if (start > size || length > size - start) return kEOFErr;
 
-    if (const uint8* place = fIO->InPlace(start)) {
+    if (const uint8* place = io_->InPlace(start)) {
         *data = std::make_unique<MappedResource>(place, length);
         return kNoErr;
     }
@@ -209,72 +203,71 @@ MgErr OVResFile::LoadData(const RsrcList& entry, std::unique_ptr<ResourceData>* 
         return err;
     }
     *data = std::move(loaded);
-    return fIO->Read(start, *handle, length);
+    return io_->Read(start, *handle, length);
 }
 
-OVResource* OVResFile::LoadedAt(const RsrcList& entry) const {
-    return entry.loaded ? fLoaded[entry.loaded - 1] : nullptr;
+OVResource* OVResFile::LoadedAt(const ResourceEntry& entry) const {
+    return entry.loaded ? loaded_[entry.loaded - 1] : nullptr;
 }
 
-bool OVResFile::IsChanged(const RsrcList& entry) const {
+bool OVResFile::IsChanged(const ResourceEntry& entry) const {
     const OVResource* loaded = LoadedAt(entry);
-    return (entry.attrs & kRChangedAttr) || (loaded && loaded->fUnwritten);
+    return (entry.attrs & kRChangedAttr) || (loaded && loaded->unwritten_);
 }
 
-MgErr OVResFile::Load(ResType type, RsrcList* entry, OVResource** resource) {
+MgErr OVResFile::Load(ResType type, ResourceEntry* entry, OVResource** resource) {
     OVResource* loaded = LoadedAt(*entry);
-    if (!loaded || !loaded->fData) {
+    if (!loaded || !loaded->data_) {
         std::unique_ptr<ResourceData> data;
         if (const MgErr err = LoadData(*entry, &data)) return err;
         if (loaded) {
-            loaded->fData = std::move(data);
+            loaded->data_ = std::move(data);
         } else {
             auto made = std::make_unique<OVResource>(this, std::move(data));
             if (const MgErr err = Attach(made.get())) return err;
             loaded = made.release();
-            entry->loaded = loaded->fSlot;
+            entry->loaded = loaded->slot_;
         }
     }
-    fCache.Set(loaded, type, fMap.PositionOf(entry));
+    cache_.Set(loaded, type, map_.PositionOf(entry));
     *resource = loaded;
     return kNoErr;
 }
 
 MgErr OVResFile::Attach(OVResource* resource) {
-    if (!fFreeSlots.empty()) {
-        resource->fSlot = fFreeSlots.back();
-        fFreeSlots.pop_back();
-        fLoaded[resource->fSlot - 1] = resource;
+    if (!freeSlots_.empty()) {
+        resource->slot_ = freeSlots_.back();
+        freeSlots_.pop_back();
+        loaded_[resource->slot_ - 1] = resource;
         return kNoErr;
     }
     // Room for every slot to be given back, so that giving one back cannot fail.
-    fFreeSlots.reserve(fLoaded.size() + 1);
-    fLoaded.push_back(resource);
-    resource->fSlot = static_cast<uint32>(fLoaded.size());
+    freeSlots_.reserve(loaded_.size() + 1);
+    loaded_.push_back(resource);
+    resource->slot_ = static_cast<uint32>(loaded_.size());
     return kNoErr;
 }
 
 void OVResFile::Forget(OVResource* resource) {
-    fLoaded[resource->fSlot - 1] = nullptr;
-    fFreeSlots.push_back(resource->fSlot);
-    resource->fSlot = 0;
-    resource->fFile = nullptr;
-    fCache.Empty();
+    loaded_[resource->slot_ - 1] = nullptr;
+    freeSlots_.push_back(resource->slot_);
+    resource->slot_ = 0;
+    resource->file_ = nullptr;
+    cache_.Empty();
 }
 
-MgErr OVResFile::FindRL(const OVResource* resource, ResType* type, RsrcList** entry) {
-    if (fCache.FindRL(resource, fMap, type, entry)) return kNoErr;
-    for (int32 i = 0, types = fMap.TypeCount(); i < types; ++i) {
-        RsrcList* entries = fMap.Entries(fMap.TypeAt(i));
-        for (int32 k = 0, count = ResourceMap::CountOf(fMap.TypeAt(i)); k < count; ++k) {
-            if (entries[k].loaded != resource->fSlot) continue;
-            *type = fMap.TypeAt(i)->type;
-            *entry = &entries[k];
-            fCache.Set(resource, *type, fMap.PositionOf(*entry));
-            return kNoErr;
+FoundEntry OVResFile::FindEntry(const OVResource* resource) {
+    if (const FoundEntry cached = cache_.Find(resource, map_); cached.entry) return cached;
+    for (int32 i = 0, types = map_.TypeCount(); i < types; ++i) {
+        const TypeEntry* type = map_.TypeAt(i);
+        ResourceEntry* entries = map_.Entries(type);
+        for (int32 k = 0, count = ResourceMap::CountOf(type); k < count; ++k) {
+            if (entries[k].loaded != resource->slot_) continue;
+            cache_.Set(resource, type->type, map_.PositionOf(&entries[k]));
+            return {type->type, &entries[k]};
         }
     }
-    return kResNotFoundErr;
+    return {};
 }
 
 // ---- reading --------------------------------------------------------------------------------------------------------
@@ -283,8 +276,8 @@ MgErr OVResFile::RGet(ResType type, int32 id, Resource** resource) {
     ResFileLock lock;
     if (!resource) return kArgErr;
     *resource = nullptr;
-    if (!fOpen) return kNotResFileErr;
-    RsrcList* entry = fMap.FindEntry(type, id);
+    if (!open_) return kNotResFileErr;
+    ResourceEntry* entry = map_.FindEntry(type, id);
     if (!entry) return kResNotFoundErr;
     return Guarded([&]() -> MgErr {
         OVResource* loaded = nullptr;
@@ -298,8 +291,8 @@ MgErr OVResFile::RExists(ResType type, int32 id, int32* exists) {
     ResFileLock lock;
     if (!exists) return kArgErr;
     *exists = 0;
-    if (!fOpen) return kNotResFileErr;
-    if (!fMap.FindEntry(type, id)) return kResNotFoundErr;
+    if (!open_) return kNotResFileErr;
+    if (!map_.FindEntry(type, id)) return kResNotFoundErr;
     *exists = 1;
     return kNoErr;
 }
@@ -308,12 +301,12 @@ MgErr OVResFile::RGetNamed(ResType type, ConstPStr name, Resource** resource) {
     ResFileLock lock;
     if (!resource || !name) return kArgErr;
     *resource = nullptr;
-    if (!fOpen) return kNotResFileErr;
-    const TypeList* list = fMap.FindType(type);
+    if (!open_) return kNotResFileErr;
+    const TypeEntry* list = map_.FindType(type);
     if (!list) return kResNotFoundErr;
-    RsrcList* entries = fMap.Entries(list);
+    ResourceEntry* entries = map_.Entries(list);
     for (int32 i = 0, count = ResourceMap::CountOf(list); i < count; ++i) {
-        if (entries[i].name == kNoName || !FileNameEqual(fMap.NameOf(&entries[i]), name)) continue;
+        if (entries[i].name == kNoName || !FileNameEqual(map_.NameOf(&entries[i]), name)) continue;
         return Guarded([&]() -> MgErr {
             OVResource* loaded = nullptr;
             const MgErr err = Load(type, &entries[i], &loaded);
@@ -328,11 +321,11 @@ MgErr OVResFile::RIsLoaded(ResType type, int32 id, bool* loaded) {
     ResFileLock lock;
     if (!loaded) return kArgErr;
     *loaded = false;
-    if (!fOpen) return kNotResFileErr;
-    const RsrcList* entry = fMap.FindEntry(type, id);
+    if (!open_) return kNotResFileErr;
+    const ResourceEntry* entry = map_.FindEntry(type, id);
     if (!entry) return kResNotFoundErr;
     const OVResource* resource = LoadedAt(*entry);
-    *loaded = resource && resource->fData;
+    *loaded = resource && resource->data_;
     return kNoErr;
 }
 
@@ -361,8 +354,8 @@ MgErr OVResFile::RGetIndStringPtr(ConstPStr* string, int32 id, int32 index, ResT
 
 Resource* OVResFile::GetResourceForHandle(UHandle data) {
     ResFileLock lock;
-    for (OVResource* resource : fLoaded) {
-        if (resource && resource->fData && resource->fData->ContainsHandle(data)) return resource;
+    for (OVResource* resource : loaded_) {
+        if (resource && resource->data_ && resource->data_->ContainsHandle(data)) return resource;
     }
     return nullptr;
 }
@@ -371,8 +364,8 @@ MgErr OVResFile::RCount(ResType type, int32* count) {
     ResFileLock lock;
     if (!count) return kArgErr;
     *count = 0;
-    if (!fOpen) return kNotResFileErr;
-    if (const TypeList* list = fMap.FindType(type)) *count = ResourceMap::CountOf(list);
+    if (!open_) return kNotResFileErr;
+    if (const TypeEntry* list = map_.FindType(type)) *count = ResourceMap::CountOf(list);
     return kNoErr;
 }
 
@@ -380,8 +373,8 @@ MgErr OVResFile::RCountTypes(int32* count) {
     ResFileLock lock;
     if (!count) return kArgErr;
     *count = 0;
-    if (!fOpen) return kNotResFileErr;
-    *count = fMap.TypeCount();
+    if (!open_) return kNotResFileErr;
+    *count = map_.TypeCount();
     return kNoErr;
 }
 
@@ -389,12 +382,12 @@ MgErr OVResFile::RGetInd(ResType type, int32 index, Resource** resource) {
     ResFileLock lock;
     if (!resource) return kArgErr;
     *resource = nullptr;
-    if (!fOpen) return kNotResFileErr;
-    const TypeList* list = fMap.FindType(type);
+    if (!open_) return kNotResFileErr;
+    const TypeEntry* list = map_.FindType(type);
     if (!list || index < 1 || index > ResourceMap::CountOf(list)) return kResNotFoundErr;
     return Guarded([&]() -> MgErr {
         OVResource* loaded = nullptr;
-        const MgErr err = Load(type, fMap.Entries(list) + (index - 1), &loaded);
+        const MgErr err = Load(type, map_.Entries(list) + (index - 1), &loaded);
         *resource = loaded;
         return err;
     });
@@ -404,23 +397,23 @@ MgErr OVResFile::RGetIndType(ResType* type, int32 index) {
     ResFileLock lock;
     if (!type) return kArgErr;
     *type = 0;
-    if (!fOpen) return kNotResFileErr;
-    if (index < 1 || index > fMap.TypeCount()) return kResNotFoundErr;
-    *type = fMap.TypeAt(index - 1)->type;
+    if (!open_) return kNotResFileErr;
+    if (index < 1 || index > map_.TypeCount()) return kResNotFoundErr;
+    *type = map_.TypeAt(index - 1)->type;
     return kNoErr;
 }
 
 int32 OVResFile::RUniqueID(ResType type) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
-    if (fMap.IsEmpty()) return kFirstUniqueID;
-    int32 id = gNextUniqueID;
-    if (fMap.FindType(type)) {
-        while (id <= kLastUniqueID && fMap.FindEntry(type, id)) ++id;
+    if (!open_) return kNotResFileErr;
+    if (map_.IsEmpty()) return kFirstUniqueID;
+    int32 id = nextUniqueID;
+    if (map_.FindType(type)) {
+        while (id <= kLastUniqueID && map_.FindEntry(type, id)) ++id;
         if (id > kLastUniqueID) return 0;
     }
-    const auto next = static_cast<int32>(static_cast<uint32>(gNextUniqueID) + 1);
-    gNextUniqueID = next <= kFirstUniqueID ? kFirstUniqueID : next;
+    const auto next = static_cast<int32>(static_cast<uint32>(nextUniqueID) + 1);
+    nextUniqueID = next <= kFirstUniqueID ? kFirstUniqueID : next;
     return id;
 }
 
@@ -430,15 +423,15 @@ MgErr OVResFile::RGetModDate(Path path, uint32* date, int32* readOnly) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x39F7D01Au) << "OVResFile::RGetModDate modDate is NULL"; });
         return kArgErr;
     }
-    if (!fOpen) return kNotResFileErr;
-    return FMGetModDate(path, fIO ? fIO->File() : nullptr, date, readOnly);
+    if (!open_) return kNotResFileErr;
+    return FMGetModDate(path, io_ ? io_->File() : nullptr, date, readOnly);
 }
 
 MgErr OVResFile::RGetFileAttrs(uint32* attrs) {
     ResFileLock lock;
     if (!attrs) return kArgErr;
-    if (!fOpen) return kNotResFileErr;
-    *attrs = fMap.Head()->fileAttrs;
+    if (!open_) return kNotResFileErr;
+    *attrs = map_.Head()->fileAttrs;
     return kNoErr;
 }
 
@@ -446,13 +439,13 @@ MgErr OVResFile::RGetFileAttrs(uint32* attrs) {
 
 MgErr OVResFile::RSetFileAttrs(uint32 attrs) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (IsReadOnly()) {
         ReportUnlocked(
             [] { TESSEL_REPORT(kDebugWarning, 0x0B74E9A2u) << "Tried to call RSetFileAttrs on a readonly file"; });
         return kPermissionErr;
     }
-    fMap.Head()->fileAttrs = attrs;
+    map_.Head()->fileAttrs = attrs;
     return kNoErr;
 }
 
@@ -464,22 +457,22 @@ MgErr OVResFile::AddHandle(UHandle data, ResType type, int32 id, ConstPStr name)
     if (const MgErr err = Attach(resource.get())) return err;
     uint32 position = 0;
     MgErr err = held->Adopt(data);
-    if (!err) err = fMap.Insert(type, id, name, &position);
+    if (!err) err = map_.Insert(type, id, name, &position);
     if (err) {
         held->DetachHandle();
         Forget(resource.get());
         return err;
     }
-    resource->fUnwritten = true;
-    fMap.EntryAt(position)->loaded = resource->fSlot;
-    fCache.Set(resource.release(), type, position);
+    resource->unwritten_ = true;
+    map_.EntryAt(position)->loaded = resource->slot_;
+    cache_.Set(resource.release(), type, position);
     Touch();
     return kNoErr;
 }
 
 MgErr OVResFile::RAdd(UHandle data, ResType type, int32 id, ConstPStr name) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (!data) return kResIDExistsErr;
     if (const MgErr err = DSCheckHandle(data)) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x56A3C7D8u) << "RAdd of non-DS Handle"; });
@@ -491,7 +484,7 @@ MgErr OVResFile::RAdd(UHandle data, ResType type, int32 id, ConstPStr name) {
 
 MgErr OVResFile::RAddPtr(const void* data, uint32 size, ResType type, int32 id, ConstPStr name) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (!data) return kResIDExistsErr;
     UHandle copy = nullptr;
     if (const MgErr err = DSPtrToHand(data, &copy, size)) return err;
@@ -501,7 +494,7 @@ MgErr OVResFile::RAddPtr(const void* data, uint32 size, ResType type, int32 id, 
 }
 
 // What the entry's resource held is replaced by a copy. The handle of loaded data stays the same.
-MgErr OVResFile::ReplaceWith(const void* bytes, uint32 size, ResType type, RsrcList* entry) {
+MgErr OVResFile::ReplaceWith(const void* bytes, uint32 size, ResType type, ResourceEntry* entry) {
     auto data = std::make_unique<DSHandleResource>();
     UHandle copy = nullptr;
     if (const MgErr err = DSPtrToHand(bytes, &copy, size)) return err;
@@ -513,22 +506,22 @@ MgErr OVResFile::ReplaceWith(const void* bytes, uint32 size, ResType type, RsrcL
     if (!loaded) {
         auto resource = std::make_unique<OVResource>(this, std::move(data));
         if (const MgErr err = Attach(resource.get())) return err;
-        entry->loaded = resource->fSlot;
+        entry->loaded = resource->slot_;
         loaded = resource.release();
-    } else if (UHandle own = loaded->fData ? loaded->fData->GetSharedDSHandle() : nullptr) {
+    } else if (UHandle own = loaded->data_ ? loaded->data_->GetSharedDSHandle() : nullptr) {
         if (const MgErr err = DSSwapHandles(own, copy)) return err;
     } else {
-        loaded->fData = std::move(data);
+        loaded->data_ = std::move(data);
     }
-    fCache.Set(loaded, type, fMap.PositionOf(entry));
+    cache_.Set(loaded, type, map_.PositionOf(entry));
     return MarkChanged(loaded);
 }
 
 MgErr OVResFile::RReplacePtr(const void* data, uint32 size, ResType type, int32 id) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (IsReadOnly()) return kPermissionErr;
-    RsrcList* entry = fMap.FindEntry(type, id);
+    ResourceEntry* entry = map_.FindEntry(type, id);
     if (!data || !entry) return kResIDExistsErr;
     return Guarded([&] { return ReplaceWith(data, size, type, entry); }) ? kResIDExistsErr : kNoErr;
 }
@@ -540,25 +533,24 @@ MgErr OVResFile::RReplaceDSHandle(UHandle data, ResType type, int32 id) {
 
 MgErr OVResFile::RRemove(Resource* resource) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (IsReadOnly()) return kPermissionErr;
     OVResource* own = OwnResource(resource);
-    ResType type = 0;
-    RsrcList* entry = nullptr;
     if (!own) return kResNotFoundErr;
-    if (const MgErr err = FindRL(own, &type, &entry)) return err;
-    if (entry->attrs & kRProtectedAttr) return kResNotFoundErr;
-    const uint32 position = fMap.PositionOf(entry);
+    const FoundEntry found = FindEntry(own);
+    if (!found.entry) return kResNotFoundErr;
+    if (found.entry->attrs & kRProtectedAttr) return kResNotFoundErr;
+    const uint32 position = map_.PositionOf(found.entry);
     Forget(own);
     delete own;
-    fMap.Remove(type, position);
+    map_.Remove(found.type, position);
     Touch();
     return kNoErr;
 }
 
 // `resource` if it is loaded in this file, else null.
 OVResource* OVResFile::OwnResource(Resource* resource) const {
-    for (OVResource* loaded : fLoaded) {
+    for (OVResource* loaded : loaded_) {
         if (loaded && loaded == resource) return loaded;
     }
     return nullptr;
@@ -568,167 +560,84 @@ OVResource* OVResFile::OwnResource(Resource* resource) const {
 
 MgErr OVResFile::RPreAllocFile(uint32 size) {
     ResFileLock lock;
-    if (!fOpen) return kNotResFileErr;
+    if (!open_) return kNotResFileErr;
     if (IsReadOnly()) {
         ReportUnlocked(
             [] { TESSEL_REPORT(kDebugWarning, 0x6F14B02Du) << "Tried to call RPreAllocFile on a readonly file"; });
         return kPermissionErr;
     }
-    return fIO ? fIO->Extend(size) : kPermissionErr;
+    return io_ ? io_->Extend(size) : kPermissionErr;
 }
 
 MgErr OVResFile::RGetUHandleOwnership(UHandle* handle) {
     ResFileLock lock;
     if (!handle) return kArgErr;
     *handle = nullptr;
-    if (!fOpen) return kNotResFileErr;
-    *handle = fIO ? fIO->ReleaseHandle() : nullptr;
+    if (!open_) return kNotResFileErr;
+    *handle = io_ ? io_->ReleaseHandle() : nullptr;
     return *handle ? kNoErr : kGenericErr;
 }
 
 // ---- what the resources ask their file ------------------------------------------------------------------------------
 
 MgErr OVResFile::Release(OVResource* resource) {
-    ResType type = 0;
-    RsrcList* entry = nullptr;
-    if (const MgErr err = FindRL(resource, &type, &entry)) return err;
-    if (IsChanged(*entry)) {
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    if (IsChanged(*found.entry)) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugWarning, 0x28D5E16Au) << "!!! Tried to release a changed resource"; });
         return kArgErr;
     }
-    entry->loaded = 0;
+    found.entry->loaded = 0;
     Forget(resource);
     delete resource;
     return kNoErr;
 }
 
 MgErr OVResFile::MarkChanged(OVResource* resource) {
-    ResType type = 0;
-    RsrcList* entry = nullptr;
     if (IsReadOnly()) return kPermissionErr;
-    if (const MgErr err = FindRL(resource, &type, &entry)) return err;
-    entry->attrs |= kRChangedAttr;
-    resource->fUnwritten = true;
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    found.entry->attrs |= kRChangedAttr;
+    resource->unwritten_ = true;
     Touch();
     return kNoErr;
 }
 
 MgErr OVResFile::Detach(OVResource* resource) {
-    ResType type = 0;
-    RsrcList* entry = nullptr;
-    if (const MgErr err = FindRL(resource, &type, &entry)) return err;
-    if (IsChanged(*entry)) {
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    if (IsChanged(*found.entry)) {
         ReportUnlocked([] { TESSEL_REPORT(kDebugWarning, 0x43BC97F0u) << "!!! Tried to detach a changed resource"; });
         return kResNotFoundErr;
     }
-    entry->loaded = 0;
+    found.entry->loaded = 0;
     Forget(resource);
     return kNoErr;
 }
 
 MgErr OVResFile::SetAttrs(const OVResource* resource, uint32 attrs) {
-    ResType type = 0;
-    RsrcList* entry = nullptr;
     if (IsReadOnly()) return kPermissionErr;
-    if (const MgErr err = FindRL(resource, &type, &entry)) return err;
-    entry->attrs = attrs;
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    found.entry->attrs = attrs;
     Touch();
     return kNoErr;
 }
 
 MgErr OVResFile::GetInfo(const OVResource* resource, int32* id, ResType* type, PStr name) {
-    ResType ownType = 0;
-    RsrcList* entry = nullptr;
-    if (const MgErr err = FindRL(resource, &ownType, &entry)) return err;
-    if (id) *id = entry->id;
-    if (type) *type = ownType;
-    if (name) CopyName(fMap.NameOf(entry), name);
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    if (id) *id = found.entry->id;
+    if (type) *type = found.type;
+    if (name) CopyName(map_.NameOf(found.entry), name);
     return kNoErr;
 }
 
 MgErr OVResFile::GetAttrs(const OVResource* resource, uint32* attrs) {
-    ResType type = 0;
-    RsrcList* entry = nullptr;
-    if (const MgErr err = FindRL(resource, &type, &entry)) return err;
-    *attrs = entry->attrs;
+    const FoundEntry found = FindEntry(resource);
+    if (!found.entry) return kResNotFoundErr;
+    *attrs = found.entry->attrs;
     return kNoErr;
-}
-
-// ---- resources ------------------------------------------------------------------------------------------------------
-
-OVResource::~OVResource() {
-    ResFileLock lock;
-    EmptyHandleCache();
-    fData.reset();
-}
-
-MgErr OVResource::RRelease() {
-    ResFileLock lock;
-    return fFile ? fFile->Release(this) : kResNotFoundErr;
-}
-
-MgErr OVResource::RChanged() {
-    ResFileLock lock;
-    return fFile ? fFile->MarkChanged(this) : kResNotFoundErr;
-}
-
-MgErr OVResource::DetachResource() {
-    ResFileLock lock;
-    return fFile ? fFile->Detach(this) : kResNotFoundErr;
-}
-
-MgErr OVResource::RSetAttrs(uint32 attrs) {
-    ResFileLock lock;
-    return fFile ? fFile->SetAttrs(this, attrs) : kResNotFoundErr;
-}
-
-MgErr OVResource::RSize(uint32* size) {
-    if (!size) return kArgErr;
-    *size = GetSize();
-    return kNoErr;
-}
-
-MgErr OVResource::RGetInfo(int32* id, ResType* type, PStr name) {
-    ResFileLock lock;
-    return fFile ? fFile->GetInfo(this, id, type, name) : kResNotFoundErr;
-}
-
-MgErr OVResource::RGetAttrs(uint32* attrs) {
-    ResFileLock lock;
-    if (!attrs) return kArgErr;
-    return fFile ? fFile->GetAttrs(this, attrs) : kResNotFoundErr;
-}
-
-UHandle OVResource::GetSharedDSHandle() {
-    ResFileLock lock;
-    return fData ? fData->GetSharedDSHandle() : nullptr;
-}
-
-MgErr OVResource::DetachHandle(UHandle* data) {
-    ResFileLock lock;
-    if (!data) return kArgErr;
-    *data = GetSharedDSHandle();
-    if (!*data) return fData ? kMemFullErr : kResNotFoundErr;
-    fData->DetachHandle();
-    fData.reset();
-    EmptyHandleCache();
-    if (fFile) fFile->fCache.Empty();
-    return kNoErr;
-}
-
-uint32 OVResource::GetSize() {
-    ResFileLock lock;
-    return fData ? fData->GetSize() : 0;
-}
-
-const uint8* OVResource::GetData() {
-    ResFileLock lock;
-    return fData ? fData->GetData() : nullptr;
-}
-
-bool OVResource::ContainsHandle(UHandle data) {
-    ResFileLock lock;
-    return fData && fData->ContainsHandle(data);
 }
 
 }  // namespace tessel

@@ -224,9 +224,10 @@ MgErr FormattedText::Format(const char* format, size_t length, va_list args) {
     const auto run = [&](char* dst, size_t size) {
         FmtArgumentList copy;
         va_copy(copy.list, args);
-        const int32 reached = FormatText(dst, static_cast<int32>(size), format, length, copy).length;
+        const Formatted result = FormatText(dst, static_cast<int32>(size), format, length, copy);
         va_end(copy.list);
-        return static_cast<size_t>(reached);
+        good_ = result.good;
+        return static_cast<size_t>(result.length);
     };
     length_ = run(short_, sizeof short_);
     if (length_ < sizeof short_) return kNoErr;

@@ -31,11 +31,13 @@ public:
 
     const char* Bytes() const { return long_.empty() ? short_ : long_.data(); }
     size_t Length() const { return length_; }
+    bool Good() const { return good_; }  // false: stopped, and reported, at what is wrong with the format
 
 private:
     char short_[512];
     std::string long_;  // what is too long for that
     size_t length_ = 0;
+    bool good_ = false;
 };
 
 }  // namespace tessel

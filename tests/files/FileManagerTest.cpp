@@ -8,6 +8,7 @@
 
 #include <cerrno>
 #include <climits>
+#include <cstring>
 #include <string>
 #include <sys/stat.h>
 
@@ -169,6 +170,8 @@ TEST_F(FileManagerTest, RangesAreLockedFromTheirBase) {
     FMClose(two);
 }
 
+char growing[10] = "x";
+
 TEST_F(FileManagerTest, PrintsInTheLibrarysFormat) {
     started.drive.Put("f", "");
     File_t* file = Open("f", kFOpenReadWrite);
@@ -180,6 +183,11 @@ TEST_F(FileManagerTest, PrintsInTheLibrarysFormat) {
         EXPECT_EQ(kFormatErr, FPrintfWErr(file, "lost %y"));
         EXPECT_EQ(kFormatErr, FPrintfWErr(file, "%2$d", 1, 2));
         EXPECT_EQ(5, FPrintf(file, "kept %y"));
+        // A text that grows between the measuring and the writing of a long one is not cut.
+        const auto grow = [](CStr, int32, CStr, int32, uint32, CStr) { std::strcat(growing, "x"); };
+        const auto before = DebugOutputSetHandler(grow);
+        EXPECT_EQ(-1, FPrintf(file, "%600d%s%y", 1, growing));
+        DebugOutputSetHandler(before);
     }
     FMClose(file);
     EXPECT_EQ("00042;textkept ", started.drive.Get("f"));

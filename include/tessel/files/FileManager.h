@@ -145,7 +145,8 @@ TESSEL_API MgErr FLockOrUnlockRange(File_t* file, int32 mode, int32 offset, int3
 // Writes text in the library's own format language (strings/StringFmtPrint.h), and returns the bytes written or -1.
 TESSEL_API int32 FPrintf(File_t* file, CStr format, ...);
 
-// The same with a result: kFormatErr for a bad format, kMemFullErr, else that of the write.
+// The same with a result: kFormatErr for a bad format, kMemFullErr, kGenericErr when the arguments' texts changed
+// meanwhile (nothing is written then), else that of the write.
 TESSEL_API MgErr FPrintfWErr(File_t* file, CStr format, ...);
 TESSEL_API MgErr FPrintfWErrv(File_t* file, CStr format, va_list args);
 

@@ -51,9 +51,9 @@ public:
 protected:
     MgErr Adopt(ResChain* chain);
 
-    bool fOwnsChain = false;
-    RsrcFile fRefnum = 0;
-    ResChain* fChain = nullptr;
+    bool ownsChain_ = false;
+    RsrcFile refnum_ = 0;
+    ResChain* chain_ = nullptr;
 };
 
 // Also changes a file.
@@ -81,7 +81,7 @@ public:
     ResFile* LowLevelResFile();
 
 private:
-    ResFile* File() const { return static_cast<ResFile*>(fChain); }
+    ResFile* File() const { return static_cast<ResFile*>(chain_); }
 };
 
 // On the heap, for the caller to delete; null when memory is full.

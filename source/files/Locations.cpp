@@ -39,18 +39,6 @@ bool AbsoluteNative(CStr native, std::string* absolute) {
 
 }  // namespace
 
-void FlushPathCache(Path path) {
-    if (path) path->FlushCache();
-}
-
-bool IsVolume(Path path) {
-    return FIsAbsPath(path) && FDepth(path) == 1;
-}
-
-MgErr NameToPath(const std::string& name, Path* path) {
-    return PathRef(name, PathRef::StringDisplay()).ConvertToPath(path);
-}
-
 }  // namespace tessel
 
 using namespace tessel;
