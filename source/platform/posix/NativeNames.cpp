@@ -1,12 +1,11 @@
 #include "platform/posix/NativeNames.h"
 
 #include "platform/CodePage.h"
-#include "platform/posix/SystemCalls.h"
+#include "platform/posix/Interrupted.h"
 #include "platform/posix/Utf8.h"
 
 #include <algorithm>
 #include <cstdlib>
-#include <dirent.h>
 #include <locale.h>
 #include <memory>
 #include <unistd.h>
@@ -27,7 +26,7 @@ std::string_view NativeLast(std::string_view native) {
 }
 
 std::string NativeCurrentFolder() {
-    std::unique_ptr<char, decltype(&std::free)> folder(::getcwd(nullptr, 0), std::free);
+    std::unique_ptr<char, decltype(&std::free)> folder(systemCalls.getcwd(nullptr, 0), std::free);
     return folder ? folder.get() : "/";
 }
 
@@ -71,31 +70,13 @@ bool EqualNames(std::string_view a, std::string_view b) noexcept {
 
 // ---- matching on the disk -------------------------------------------------------------------------------------------
 
-namespace {
-
-bool Exists(const std::string& native) {
-    struct statx status;
-    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0;
-}
-
-bool IsFolder(const std::string& native) {
-    struct statx status;
-    return systemCalls.statx(AT_FDCWD, native.c_str(), 0, STATX_TYPE, &status) == 0 && S_ISDIR(status.stx_mode);
-}
-
-}  // namespace
-
 bool FindInFolder(const std::string& folder, std::string_view name, std::string& found) {
-    std::unique_ptr<DIR, int (*)(DIR*)> listing(opendir(folder.c_str()), closedir);
-    if (!listing) return false;
     found.clear();
-    while (const dirent* entry = readdir(listing.get())) {
-        if (name == entry->d_name) {
-            found = name;
-            return true;
-        }
-        if (EqualNames(name, entry->d_name) && (found.empty() || found > entry->d_name)) found = entry->d_name;
-    }
+    VisitFolder(folder, [&](DIR*, const dirent& entry) {
+        const bool exact = name == entry.d_name;
+        if (exact || (EqualNames(name, entry.d_name) && (found.empty() || found > entry.d_name))) found = entry.d_name;
+        return !exact;
+    });
     return !found.empty();
 }
 
@@ -111,7 +92,7 @@ Match MatchOnDisk(std::string& native) {
     native = !hasFolder ? "" : parent == "/" ? parent : parent + "/";
     native += there ? found : last;
     if (there) return Match::kAll;
-    return parentThere && IsFolder(parent) ? Match::kLastMissing : Match::kParentMissing;
+    return parentThere && IsFolder(parent, Links::kFollowed) ? Match::kLastMissing : Match::kParentMissing;
 }
 
 bool NameToAbsoluteText(std::string_view name, std::string& native) {
