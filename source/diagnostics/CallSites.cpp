@@ -1,5 +1,6 @@
 #include "diagnostics/CallSites.h"
 
+#include "base/Compiler.h"
 #include "platform/Module.h"
 #include "platform/Thread.h"
 
@@ -53,8 +54,8 @@ struct ThreadMemory {
     RememberedWalk walks[kWalksRemembered];
 };
 
-[[gnu::tls_model("initial-exec")]] thread_local ThreadMemory* theMemory = nullptr;
-[[gnu::tls_model("initial-exec")]] thread_local bool theThreadEnds = false;
+TESSEL_FAST_THREAD_LOCAL ThreadMemory* theMemory = nullptr;
+TESSEL_FAST_THREAD_LOCAL bool theThreadEnds = false;
 
 struct ThreadMemoryOwner {
     ~ThreadMemoryOwner() {
@@ -65,7 +66,7 @@ struct ThreadMemoryOwner {
 };
 thread_local ThreadMemoryOwner theOwner;
 
-__attribute__((noinline)) ThreadMemory* MakeThreadMemory() {
+TESSEL_NOT_INLINE ThreadMemory* MakeThreadMemory() {
     if (theThreadEnds || !theOwner.alive) return nullptr;
     return theMemory = static_cast<ThreadMemory*>(std::calloc(1, sizeof(ThreadMemory)));
 }
@@ -81,7 +82,7 @@ RememberedWalk& WalkFrom(ThreadMemory& memory, const StackFrame* frame, uint64 s
 }
 
 // The frames lie in the stack of this thread above the innermost one, so that they can be read whatever became of them.
-__attribute__((no_sanitize("address"), no_sanitize("thread"))) bool IsSameWalk(const RememberedWalk& walk) {
+TESSEL_NOT_SANITIZED bool IsSameWalk(const RememberedWalk& walk) {
     const StackFrame* frame = walk.first;
     uintptr_t difference = 0;
 #pragma GCC unroll 4
@@ -97,8 +98,7 @@ __attribute__((no_sanitize("address"), no_sanitize("thread"))) bool IsSameWalk(c
 
 // Copies the frames from `frame` outwards, at most `most`; returns how many there are. The first is there in any case:
 // it is that of a function that is running.
-__attribute__((no_sanitize("address"), no_sanitize("thread"))) int32 CopyFrames(const StackFrame* frame,
-                                                                                StackFrame* frames, int32 most) {
+TESSEL_NOT_SANITIZED int32 CopyFrames(const StackFrame* frame, StackFrame* frames, int32 most) {
     const platform::StackBounds bounds = platform::CurrentStackBounds();
     auto at = reinterpret_cast<uintptr_t>(frame);
     if (at < bounds.low) most = 1;

@@ -1,3 +1,4 @@
+#include "base/Compiler.h"
 #include "diagnostics/NumberText.h"
 #include "platform/Debugger.h"
 #include "platform/MemoryRead.h"
@@ -19,7 +20,7 @@ constexpr size_t kMessageSize = 1024;
 std::atomic<DebugOutputHandler> theHandler{nullptr};
 std::atomic<int32> theEventCounts[kNumDebugLevels];
 volatile int32 theStopHereResult = 0;
-[[gnu::tls_model("initial-exec")]] thread_local int theNestedReports = 0;
+TESSEL_FAST_THREAD_LOCAL int theNestedReports = 0;
 
 struct NestedReport {
     NestedReport() { ++theNestedReports; }

@@ -1,3 +1,4 @@
+#include "base/Compiler.h"
 #include "diagnostics/NumberText.h"
 #include "diagnostics/Service.h"
 #include "platform/Thread.h"
@@ -26,7 +27,7 @@ std::atomic<int32> theFailedCheckouts{0};
 
 // For a thread that can get no memory, so it is there from the start. One stream of the thread has it, the others go
 // without text.
-[[gnu::tls_model("initial-exec")]] thread_local Slot theLastResort;
+TESSEL_FAST_THREAD_LOCAL Slot theLastResort;
 char theNoText[1];
 
 bool Claim(Slot& slot) {

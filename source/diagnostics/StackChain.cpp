@@ -1,3 +1,4 @@
+#include "base/Compiler.h"
 #include "diagnostics/CallStackWalk.h"
 #include "platform/Module.h"
 #include "platform/Thread.h"
@@ -19,8 +20,9 @@ const char* OrUnknown(const std::string& name) {
 }  // namespace
 
 // Reads frames that belong to other functions, which a sanitizer would take for an error.
-__attribute__((no_sanitize("address"), no_sanitize("thread"), noinline)) int32 WalkCallStack(
-    const void** addresses, int32 capacity, const void* framePointer, const void* returnAddress, int32 skip) noexcept {
+TESSEL_NOT_SANITIZED TESSEL_NOT_INLINE int32 WalkCallStack(const void** addresses, int32 capacity,
+                                                           const void* framePointer, const void* returnAddress,
+                                                           int32 skip) noexcept {
     const auto [low, high] = platform::CurrentStackBounds();
     auto below = std::max(low, reinterpret_cast<uintptr_t>(__builtin_frame_address(0)));
     auto frame = reinterpret_cast<uintptr_t>(framePointer);

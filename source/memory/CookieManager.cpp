@@ -1,4 +1,5 @@
 // Cookies through the flat interface: making and ending them, and what they stand for.
+#include "base/Compiler.h"
 #include "memory/JarRecord.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/CookieManager.h>
@@ -149,8 +150,7 @@ MgErr MCSetCookieInfo(MagicCookieJar jar, MagicCookie cookie, const void* info) 
 
 namespace {
 
-__attribute__((noinline)) MgErr CopyInfoUnderMutex(JarRecord& record, CookieEntry* entry, MagicCookie cookie,
-                                                   void* infoOut) {
+TESSEL_NOT_INLINE MgErr CopyInfoUnderMutex(JarRecord& record, CookieEntry* entry, MagicCookie cookie, void* infoOut) {
     ThMutexHolder hold(record.mutex);
     if (!IsValid(entry, cookie)) return kArgErr;
     LoadInfo(record, entry, infoOut);

@@ -8,6 +8,7 @@
 #ifndef TESSEL_SOURCE_MEMORY_HANDLEBLOCK_H
 #define TESSEL_SOURCE_MEMORY_HANDLEBLOCK_H
 
+#include "base/Compiler.h"
 #include "memory/GuardBytes.h"
 #include <tessel/base/Types.h>
 
@@ -52,7 +53,7 @@ public:
     // Heap bytes for a handle; 0 when they do not fit in 32 bits.
     uint32 BlockSize(uint32 size, Alignment alignment) const {
         uint64 bytes = uint64{size} + 2 * room_ + sizeof(HandleHeader);
-        if (__builtin_expect(!alignment.IsDefault(), false)) {
+        if (TESSEL_UNLIKELY(!alignment.IsDefault())) {
             bytes += sizeof(Alignment);
             if (alignment.alignment > 8)
                 bytes += ((alignment.offset & 4) ? 0u : 4u) + alignment.alignment + alignment.offset;
@@ -90,7 +91,7 @@ public:
     // Where the data goes in a heap block.
     UPtr PlaceData(void* block, Alignment alignment) const {
         uintptr_t data = reinterpret_cast<uintptr_t>(block) + HeaderRoom();
-        if (__builtin_expect(!alignment.IsDefault(), false)) {
+        if (TESSEL_UNLIKELY(!alignment.IsDefault())) {
             uintptr_t least = data + sizeof(Alignment) + alignment.offset;
             data = ((least + alignment.alignment - 1) & ~uintptr_t{alignment.alignment - 1u}) - alignment.offset;
         }
@@ -103,7 +104,7 @@ public:
         header->size = size;
         header->distance = static_cast<uint32>(reinterpret_cast<char*>(header) - static_cast<char*>(block));
         if (!alignment.IsDefault()) *static_cast<Alignment*>(block) = alignment;
-        if (__builtin_expect(room_ != 0, false) && WritesGuards(GuardKind::kHandle)) WriteGuards(data, size);
+        if (TESSEL_UNLIKELY(room_ != 0) && WritesGuards(GuardKind::kHandle)) WriteGuards(data, size);
     }
 
 private:

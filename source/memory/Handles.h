@@ -2,6 +2,7 @@
 #ifndef TESSEL_SOURCE_MEMORY_HANDLES_H
 #define TESSEL_SOURCE_MEMORY_HANDLES_H
 
+#include "base/Compiler.h"
 #include "memory/GuardBytes.h"
 #include "memory/MasterPointers.h"
 #include "memory/MemorySettings.h"
@@ -20,8 +21,8 @@ inline bool IsLiveHandle(UHandle h, CheckFrom from) {
 
 // Live, and its guard bytes, when they are checked, intact.
 inline bool IsGoodHandle(UHandle h, CheckFrom from) {
-    return __builtin_expect(IsLiveHandle(h, from), true) &&
-           (__builtin_expect(!ChecksGuards(GuardKind::kHandle), true) || CheckGuards(*h, GuardKind::kHandle));
+    return TESSEL_LIKELY(IsLiveHandle(h, from)) &&
+           (TESSEL_LIKELY(!ChecksGuards(GuardKind::kHandle)) || CheckGuards(*h, GuardKind::kHandle));
 }
 
 // Creation for the caller of an operation of the interface, which gives its frame, TESSEL_THIS_FRAME: that caller is

@@ -6,6 +6,7 @@
 #ifndef TESSEL_SOURCE_MEMORY_HEAP_H
 #define TESSEL_SOURCE_MEMORY_HEAP_H
 
+#include "base/Compiler.h"
 #include "memory/ThreadMemory.h"
 #include "platform/Allocator.h"
 #include <tessel/base/Types.h>
@@ -39,12 +40,12 @@ void* OutOfMemory();  // calls the error callback; null
 
 inline bool MayAllocate(size_t size) {
     AllocationFilter filter = allocationFilter.load(std::memory_order_relaxed);
-    return __builtin_expect(filter == nullptr, true) || filter(size);
+    return TESSEL_LIKELY(filter == nullptr) || filter(size);
 }
 
 inline void* AllocateHandleBlock(ThreadMemory* mine, size_t size) {
     void* block = MayAllocate(size) ? std::malloc(size) : nullptr;
-    if (__builtin_expect(block == nullptr, false)) return OutOfMemory();
+    if (TESSEL_UNLIKELY(block == nullptr)) return OutOfMemory();
     ThreadMemory::Count(mine, &MemoryCounters::bytes, static_cast<int64>(size));
     return block;
 }

@@ -5,6 +5,7 @@
 #ifndef TESSEL_SOURCE_MEMORY_MASTERPOINTERS_H
 #define TESSEL_SOURCE_MEMORY_MASTERPOINTERS_H
 
+#include "base/Compiler.h"
 #include "memory/ThreadMemory.h"
 #include <tessel/base/MgErr.h>
 #include <tessel/base/Types.h>
@@ -38,7 +39,7 @@ class MasterPointerSet {
 public:
     bool Contains(const void* address) const {
         const Table* table = table_.load(std::memory_order_acquire);
-        if (__builtin_expect(table == nullptr, false)) return false;
+        if (TESSEL_UNLIKELY(table == nullptr)) return false;
         uintptr_t at = reinterpret_cast<uintptr_t>(address);
         for (uint32 i = table->Start(at);; ++i) {
             uintptr_t block = table->entries[i & table->mask].load(std::memory_order_acquire);

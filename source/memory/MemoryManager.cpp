@@ -1,4 +1,5 @@
 // Handles and pointer blocks through the flat interface.
+#include "base/Compiler.h"
 #include "memory/HandleBlock.h"
 #include "memory/Handles.h"
 #include "memory/Heap.h"
@@ -8,10 +9,6 @@
 
 #include <algorithm>
 #include <cstring>
-
-#define TESSEL_ALWAYS_INLINE inline __attribute__((always_inline))
-#define TESSEL_NOT_INLINE __attribute__((noinline))
-#define TESSEL_UNLIKELY(condition) __builtin_expect(!!(condition), false)
 
 namespace tessel {
 namespace {

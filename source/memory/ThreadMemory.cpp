@@ -1,5 +1,6 @@
 #include "memory/ThreadMemory.h"
 
+#include "base/Compiler.h"
 #include "memory/MasterPointers.h"
 #include "platform/Mutex.h"
 #include "platform/Thread.h"
@@ -28,7 +29,7 @@ void Accumulate(MemoryTotals& totals, const MemoryCounters& counters) {
 }  // namespace
 
 MemoryCounters ThreadMemory::shared;
-thread_local constinit ThreadMemory* ThreadMemory::current __attribute__((tls_model("initial-exec"))) = nullptr;
+TESSEL_FAST_THREAD_LOCAL constinit ThreadMemory* ThreadMemory::current = nullptr;
 
 struct ThreadMemory::AtThreadExit {
     ~AtThreadExit() {

@@ -3,6 +3,7 @@
 #ifndef TESSEL_SOURCE_MEMORY_THREADMEMORY_H
 #define TESSEL_SOURCE_MEMORY_THREADMEMORY_H
 
+#include "base/Compiler.h"
 #include <tessel/base/Types.h>
 
 #include <atomic>
@@ -47,7 +48,7 @@ public:
     // state serves, under its locks.
     static ThreadMemory* Mine() {
         ThreadMemory* mine = current;
-        return __builtin_expect(mine != nullptr, true) ? mine : Adopt();
+        return TESSEL_LIKELY(mine != nullptr) ? mine : Adopt();
     }
 
     // The same for the short ways, which leave the making to others.
@@ -56,7 +57,7 @@ public:
     // Counts for the calling thread, whose `mine` may be null.
     template <class T>
     static void Count(ThreadMemory* mine, OwnCounter<T> MemoryCounters::*counter, T n) {
-        if (__builtin_expect(mine != nullptr, true))
+        if (TESSEL_LIKELY(mine != nullptr))
             (mine->counters.*counter).Add(n);
         else
             (shared.*counter).AddShared(n);
@@ -83,7 +84,7 @@ private:
     static MemoryCounters shared;  // of threads that have none of their own, or are gone
 
     // Reached directly: this runs on every handle operation.
-    static thread_local constinit ThreadMemory* current __attribute__((tls_model("initial-exec")));
+    TESSEL_FAST_THREAD_LOCAL static constinit ThreadMemory* current;
 
     std::atomic<uint32> inside_{0};  // 1 while the thread is in a HandleGate
     ThreadMemory* next_ = nullptr;
@@ -113,7 +114,7 @@ public:
     static bool TryEnter(ThreadMemory* mine) {
         mine->inside_.store(1, std::memory_order_relaxed);
         std::atomic_signal_fence(std::memory_order_seq_cst);
-        if (__builtin_expect(state.load(std::memory_order_acquire) == 0, true)) return true;
+        if (TESSEL_LIKELY(state.load(std::memory_order_acquire) == 0)) return true;
         Leave(mine);
         return false;
     }

@@ -1,4 +1,5 @@
 // Tracked allocation: what new and delete of the library's classes, and TrackedMalloc, come to.
+#include "base/Compiler.h"
 #include "diagnostics/ObjectTracker.h"
 #include "memory/HandleBlock.h"
 #include "memory/MemorySettings.h"
@@ -17,7 +18,7 @@ constexpr char kLeakFile[] = "ovnewdelleaks.txt";
 ObjectTracker tracker;
 
 // Called by every function that allocates, itself called by the host. Not inlined, so that its frame tells where from.
-__attribute__((noinline)) void* Allocate(size_t size) {
+TESSEL_NOT_INLINE void* Allocate(size_t size) {
     NeedMemorySettings();
     void* address = NewGuardedBlock(size, GuardKind::kNewDelete);
     if (address)

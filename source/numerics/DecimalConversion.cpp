@@ -1,6 +1,7 @@
 // Decimal digits of a real, and the real nearest to decimal digits.
 #include "numerics/DecimalConversion.h"
 
+#include "base/Compiler.h"
 #include "numerics/WideArithmetic.h"
 
 #include <algorithm>
@@ -78,7 +79,7 @@ Uint128 NormalizedProduct(const Uint128& a, const Uint128& b) {
     return {(high << 1) | (low >> 63), (low << 1) | (lowest >> 63)};
 }
 
-[[gnu::noinline]] Power DistantPowerOfTen(int32 n) {
+TESSEL_NOT_INLINE Power DistantPowerOfTen(int32 n) {
     const int32 step = n > 0 ? kTablePower : -kTablePower;
     int32 rest = n;
     Uint128 bits = kPowerTable[kTablePower];
@@ -90,7 +91,7 @@ Uint128 NormalizedProduct(const Uint128& a, const Uint128& b) {
     return {bits, FloorLog2OfPower(n) - 127, 64};
 }
 
-[[gnu::always_inline]] inline Power PowerOfTen(int32 n) {
+TESSEL_ALWAYS_INLINE Power PowerOfTen(int32 n) {
     if (n < -kTablePower || n > kTablePower) return DistantPowerOfTen(n);
     const uint32 error = n >= 0 && n <= kLastExactPower ? 0 : 1;
     return {kPowerTable[kTablePower + n], FloorLog2OfPower(n) - 127, error};
@@ -103,7 +104,7 @@ using Exact = BigUnsigned<400>;
 
 // a * 2^aExponent * 10^power compared with b * 2^bExponent, or with (b + 1/2) * 2^bExponent: -1, 0 or 1. The two must
 // be of about the same size.
-[[gnu::noinline]] int CompareExactly(uint64 a, int32 aExponent, int32 power, uint64 b, int32 bExponent, bool plusHalf) {
+TESSEL_NOT_INLINE int CompareExactly(uint64 a, int32 aExponent, int32 power, uint64 b, int32 bExponent, bool plusHalf) {
     Exact left(a);
     Exact right(b);
     if (plusHalf) {
@@ -133,7 +134,7 @@ struct Scaled {
     uint32 error;
 };
 
-[[gnu::always_inline]] inline Scaled Scale(uint64 mantissa, int32 exponent, const Power& power) {
+TESSEL_ALWAYS_INLINE Scaled Scale(uint64 mantissa, int32 exponent, const Power& power) {
     const Uint128 top = Multiply64(mantissa, power.bits.high);
     const Uint128 bottom = Multiply64(mantissa, power.bits.low);
     const uint64 middle = top.low + bottom.high;
@@ -143,7 +144,7 @@ struct Scaled {
 enum class Tail { kBelowHalf, kHalf, kAboveHalf, kUnclear };
 
 // How what lies below bit `position` of the high word compares with half of that bit. position is 0 to 64.
-[[gnu::always_inline]] inline Tail ClassifyTail(const Scaled& x, int32 position) {
+TESSEL_ALWAYS_INLINE Tail ClassifyTail(const Scaled& x, int32 position) {
     const uint64 half = uint64{1} << (position == 0 ? 63 : position - 1);
     uint64 tail = x.middle;
     bool more = x.low != 0;

@@ -1,4 +1,5 @@
 // A floating-point unit with a stack of registers, one for each thread.
+#include "base/Compiler.h"
 #include "numerics/DecimalConversion.h"
 #include "numerics/Registers.h"
 #include <tessel/numerics/FloatingPointRegisters.h>
@@ -30,7 +31,7 @@ struct FloatingPointUnit {
     uint16 status;
 };
 
-[[gnu::tls_model("initial-exec")]] thread_local FloatingPointUnit threadUnit{};
+TESSEL_FAST_THREAD_LOCAL FloatingPointUnit threadUnit{};
 
 // The one save area of the process.
 struct SaveArea {

@@ -83,6 +83,10 @@ bool FromUtf8(std::string_view utf8, std::string& text);
 bool ToUtf16(std::string_view text, std::u16string& utf16);
 bool FromUtf16(std::u16string_view utf16, std::string& text);
 
+// Whatever the active page. A surrogate that stands alone becomes U+FFFD, and the result is false. May throw
+// std::bad_alloc.
+bool Utf16ToUtf8(std::u16string_view utf16, std::string& utf8);
+
 }  // namespace tessel::platform
 
 #endif

@@ -2,6 +2,7 @@
 #ifndef TESSEL_STRINGS_FMTOUTPUT_H
 #define TESSEL_STRINGS_FMTOUTPUT_H
 
+#include "base/Compiler.h"
 #include "strings/DecimalDigits.h"
 #include <tessel/base/Types.h>
 
@@ -93,7 +94,7 @@ public:
         if (dst_) FillFew(dst_ + used_, byte, n);
         used_ += n;
     }
-    [[gnu::always_inline]] void PutDecimal(uint64 magnitude, bool negative) {
+    TESSEL_ALWAYS_INLINE void PutDecimal(uint64 magnitude, bool negative) {
         const size_t length = CountDecimalDigits(magnitude) + negative;
         char* place = Take(length);
         char text[kMaxDecimalDigits + 1];

@@ -2,6 +2,7 @@
 #ifndef TESSEL_STRINGS_FMTSPEC_H
 #define TESSEL_STRINGS_FMTSPEC_H
 
+#include "base/Compiler.h"
 #include <tessel/base/NumericTypes.h>
 #include <tessel/base/Types.h>
 
@@ -36,7 +37,7 @@ public:
 
     // False when the specifier is cut off by the end, or its position or type prefix is none of the language's. Whether
     // there is such a conversion is not looked at.
-    [[gnu::always_inline]] bool Read(FmtSpec& spec) {
+    TESSEL_ALWAYS_INLINE bool Read(FmtSpec& spec) {
         bool digits = ReadFlagsAndWidth(spec);
         if (digits && !spec.left && Peek() == '$') {
             ++cursor_;

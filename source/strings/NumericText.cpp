@@ -1,4 +1,5 @@
 // Any number in any format: the format codes, engineering and SI notation, complex values.
+#include "base/Compiler.h"
 #include "numerics/NumericAccess.h"
 #include "strings/NumericTextParts.h"
 #include <tessel/diagnostics/DebugStream.h>
@@ -72,7 +73,7 @@ IntegerImage ConvertTo(const ExtendedComplex& value) {
 }
 
 // Reals and complex values in an integer format.
-[[gnu::noinline]] IntegerImage ImageOfReal(int16 type, const void* value, int32 code) {
+TESSEL_NOT_INLINE IntegerImage ImageOfReal(int16 type, const void* value, int32 code) {
     const ExtendedComplex number = ReadNumber(type, value);
     if (code == kFormatDecimal) return ConvertTo<int32>(number);
     if (code == kFormatUnsigned) return ConvertTo<uint32>(number);
@@ -269,13 +270,13 @@ int32 RenderComplex(const ExtendedComplex& value, int32 code, char* buffer, int3
     return out.Length();
 }
 
-[[gnu::noinline]] int32 RenderNull(int16 type, char* buffer, int32 size) {
+TESSEL_NOT_INLINE int32 RenderNull(int16 type, char* buffer, int32 size) {
     TextOut out(buffer, size);
     out.Put(NumClass(type) == kNumClassComplex ? "0 + 0i" : "0");
     return Terminate(buffer, size, out.Length());
 }
 
-[[gnu::noinline]] int32 RenderNumber(const void* value, int16 type, int32 code, char* buffer, int32 size,
+TESSEL_NOT_INLINE int32 RenderNumber(const void* value, int16 type, int32 code, char* buffer, int32 size,
                                      char decimalPoint, int32* slot) {
     const FormatClass format = Classify(code);
     if (format == FormatClass::kUnknown) TESSEL_REPORT(kDebugWarning, 0x83C7E15Au) << "Bad k_code: " << code;

@@ -1,4 +1,5 @@
 // Text to numbers: reals into decimal records, integers in any radix.
+#include "base/Compiler.h"
 #include "numerics/NumericAccess.h"
 #include "strings/NumericTextParts.h"
 #include <tessel/strings/NumericText.h>
@@ -313,7 +314,7 @@ uint32 DigitAt(const Text& text) {
 }
 
 template <class Text>
-[[gnu::always_inline]] inline bool TakeSign(Text& text) {
+TESSEL_ALWAYS_INLINE bool TakeSign(Text& text) {
     if (text.AtEnd()) return false;
     const uint8 c = text.Current();
     if (c == '+' || c == '-') text.Advance();
@@ -322,7 +323,7 @@ template <class Text>
 
 // Reads spaces, sign and digits. The text is left where it was when there is no digit.
 template <class Word, class Text>
-[[gnu::always_inline]] inline Parsed<Word> ScanInteger(Text& text, bool isSigned, uint32 radix, bool noSign) {
+TESSEL_ALWAYS_INLINE Parsed<Word> ScanInteger(Text& text, bool isSigned, uint32 radix, bool noSign) {
     while (!text.AtEnd() && text.Current() == ' ') text.Advance();
     const bool negative = !noSign && TakeSign(text);
     Word limit = std::numeric_limits<Word>::max();
@@ -343,7 +344,7 @@ template <class Word, class Text>
 
 // In radix 10: the number, held at the limits of the type.
 template <class Word>
-[[gnu::always_inline]] inline Word FitNumber(const Parsed<Word>& parsed, const IntegerType& type) {
+TESSEL_ALWAYS_INLINE Word FitNumber(const Parsed<Word>& parsed, const IntegerType& type) {
     const Word unsignedMaximum =
         std::numeric_limits<Word>::max() >> (8 * sizeof(Word) - static_cast<size_t>(type.bits));
     if (!type.isSigned) return parsed.negative ? 0 : std::min(parsed.value, unsignedMaximum);
@@ -353,7 +354,7 @@ template <class Word>
 
 // In another radix: the bits, or the largest value of the type when there are too many.
 template <class Word>
-[[gnu::always_inline]] inline Word FitBits(const Parsed<Word>& parsed, const IntegerType& type) {
+TESSEL_ALWAYS_INLINE Word FitBits(const Parsed<Word>& parsed, const IntegerType& type) {
     const Word mask = std::numeric_limits<Word>::max() >> (8 * sizeof(Word) - static_cast<size_t>(type.bits));
     Word bits = parsed.value;
     if (bits > mask) bits = type.isSigned ? mask >> 1 : mask;
@@ -361,19 +362,19 @@ template <class Word>
 }
 
 template <class Word, class Text>
-[[gnu::always_inline]] inline Word ParseInteger(Text& text, const IntegerType& type, int32 radix, bool noSign) {
+TESSEL_ALWAYS_INLINE Word ParseInteger(Text& text, const IntegerType& type, int32 radix, bool noSign) {
     if (radix == 10) return FitNumber(ScanInteger<Word>(text, type.isSigned, 10, noSign), type);
     if (radix < 2 || radix > 36) return 0;
     return FitBits(ScanInteger<Word>(text, type.isSigned, static_cast<uint32>(radix), noSign), type);
 }
 
 template <class Text>
-[[gnu::always_inline]] inline int32 Parse32(Text& text, int16 typeCode, int32 radix, bool noSign) {
+TESSEL_ALWAYS_INLINE int32 Parse32(Text& text, int16 typeCode, int32 radix, bool noSign) {
     return static_cast<int32>(ParseInteger<uint32>(text, IntegerTypeOf(typeCode, 32), radix, noSign));
 }
 
 template <class Text>
-[[gnu::always_inline]] inline int64 Parse64(Text& text, int16 typeCode, int32 radix, bool noSign) {
+TESSEL_ALWAYS_INLINE int64 Parse64(Text& text, int16 typeCode, int32 radix, bool noSign) {
     const IntegerType type = IntegerTypeOf(typeCode, 64);
     if (type.bits == 64) return static_cast<int64>(ParseInteger<uint64>(text, type, radix, noSign));
     const auto value = ParseInteger<uint32>(text, type, radix, noSign);

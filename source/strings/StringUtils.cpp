@@ -55,48 +55,9 @@ void ThrowIf(MgErr err) {
     if (err) throw std::bad_alloc();
 }
 
-// ---- UTF-16 to UTF-8 ------------------------------------------------------------------------------------------------
-
-constexpr char32_t kReplacementCharacter = 0xFFFD;
-
-bool IsHighSurrogate(char16_t unit) {
-    return (unit & 0xFC00) == 0xD800;
-}
-
-bool IsLowSurrogate(char16_t unit) {
-    return (unit & 0xFC00) == 0xDC00;
-}
-
-void AppendUtf8(char32_t character, std::string* out) {
-    const auto byte = [&](char32_t mark, int shift, char32_t mask) {
-        out->push_back(static_cast<char>(mark | (character >> shift & mask)));
-    };
-    if (character < 0x80) return byte(0, 0, 0x7F);
-    if (character < 0x800) {
-        byte(0xC0, 6, 0x1F);
-    } else if (character < 0x10000) {
-        byte(0xE0, 12, 0x0F);
-        byte(0x80, 6, 0x3F);
-    } else {
-        byte(0xF0, 18, 0x07);
-        byte(0x80, 12, 0x3F);
-        byte(0x80, 6, 0x3F);
-    }
-    byte(0x80, 0, 0x3F);
-}
-
 void ConvertToUtf8(const std::u16string& source, std::string* out) {
     std::string utf8;
-    utf8.reserve(source.size());
-    for (size_t i = 0; i < source.size(); ++i) {
-        char32_t character = source[i];
-        if (IsHighSurrogate(source[i]) && i + 1 < source.size() && IsLowSurrogate(source[i + 1])) {
-            character = 0x10000 + ((character & 0x3FF) << 10) + (source[++i] & 0x3FF);
-        } else if (IsHighSurrogate(source[i]) || IsLowSurrogate(source[i])) {
-            character = kReplacementCharacter;
-        }
-        AppendUtf8(character, &utf8);
-    }
+    platform::Utf16ToUtf8(source, utf8);
     out->swap(utf8);
 }
 

@@ -1,3 +1,4 @@
+#include "base/Compiler.h"
 #include "diagnostics/ObjectTracker.h"
 #include "platform/LastError.h"
 #include "platform/MessageEvent.h"
@@ -18,7 +19,7 @@ ObjectTracker eventTracker;
 struct EventRecord : THEVENTREC, PlainAllocation {};
 
 bool HasVerifier(ThEvent event) {
-    return __builtin_expect(event->verifier == kThEventVerifier, true);
+    return TESSEL_LIKELY(event->verifier == kThEventVerifier);
 }
 
 // The events of the interface are HostEvents: known without a virtual call.

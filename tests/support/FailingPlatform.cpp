@@ -35,7 +35,8 @@ struct Stand<kCall> {
         if (!IsDue()) return (original.*kCall)(arguments...);
         if (failure != 0) {
             errno = failure;
-            return (Result)-1;  // also of a pointer: MAP_FAILED
+            if constexpr (std::is_pointer_v<Result> && !std::is_void_v<std::remove_pointer_t<Result>>) return nullptr;
+            return (Result)-1;  // also of mmap: MAP_FAILED
         }
         if constexpr (std::is_same_v<std::tuple_element_t<sizeof...(Arguments) - 1, std::tuple<Arguments...>>,
                                      std::size_t> &&

@@ -35,7 +35,7 @@ constexpr void FillAscii(CodePageTables& tables) {
 constexpr CodePageTables MakeUtf8Tables() {
     CodePageTables tables{kCodePageUtf8, true, true, {}, {}, {}};
     FillAscii(tables);
-    for (unsigned byte = 0xC2; byte <= 0xF4; ++byte) tables.length[byte] = byte < 0xE0 ? 2 : byte < 0xF0 ? 3 : 4;
+    for (unsigned byte = 0; byte < 256; ++byte) tables.length[byte] = kUtf8Lengths[byte];
     return tables;
 }
 
@@ -398,52 +398,7 @@ void LowerText(char* text, std::size_t count) noexcept {
 
 // ---- conversions ----------------------------------------------------------------------------------------------------
 
-std::size_t DecodeUtf8(const char* text, const char* end, char32_t& character) noexcept {
-    std::uint8_t lead = static_cast<std::uint8_t>(*text);
-    std::size_t length = utf8Tables.length[lead];
-    if (length == 1) {
-        character = lead;
-        return lead < 0x80 ? 1 : 0;
-    }
-    if (static_cast<std::size_t>(end - text) < length) return 0;
-    character = lead & (0x7Fu >> length);
-    for (std::size_t i = 1; i < length; ++i) {
-        std::uint8_t next = static_cast<std::uint8_t>(text[i]);
-        if ((next & 0xC0) != 0x80) return 0;
-        character = character << 6 | (next & 0x3Fu);
-    }
-    constexpr char32_t kLeast[5] = {0, 0, 0x80, 0x800, 0x10000};
-    bool surrogate = character >= 0xD800 && character <= 0xDFFF;
-    return character < kLeast[length] || surrogate || character > 0x10FFFF ? 0 : length;
-}
-
-void AppendUtf8(std::string& text, char32_t character) {
-    if (character < 0x80) {
-        text += static_cast<char>(character);
-        return;
-    }
-    int followers = character < 0x800 ? 1 : character < 0x10000 ? 2 : 3;
-    unsigned lead = 0xFF00u >> (followers + 1);
-    text += static_cast<char>(lead | character >> (6 * followers));
-    while (followers-- > 0) text += static_cast<char>(0x80 | (character >> (6 * followers) & 0x3F));
-}
-
 namespace {
-
-// Calls take(character, valid) for each character of UTF-8. True when all were valid.
-template <typename Taker>
-bool ForEachUtf8(std::string_view utf8, Taker take) {
-    bool valid = true;
-    const char* end = utf8.data() + utf8.size();
-    for (const char* at = utf8.data(); at < end;) {
-        char32_t character;
-        std::size_t length = DecodeUtf8(at, end, character);
-        take(length ? character : kReplacementCharacter);
-        if (length == 0) valid = false;
-        at += length ? length : 1;
-    }
-    return valid;
-}
 
 // Converters are for one thread and dear to open: each thread keeps its last one in each direction.
 struct ThreadConverters {
@@ -507,10 +462,10 @@ bool Converted(bool complete) {
 }  // namespace
 
 bool ToUtf8(std::string_view text, std::string& utf8) {
+    const CodePageTables& page = ActiveCodePage();
+    if (page.utf8) return Converted(CopyUtf8(text, utf8));
     utf8.clear();
     utf8.reserve(text.size());
-    const CodePageTables& page = ActiveCodePage();
-    if (page.utf8) return Converted(ForEachUtf8(text, [&](char32_t c) { AppendUtf8(utf8, c); }));
     return Converted(Convert(*Converters(page).toUtf8, text, utf8, [&](std::string_view rest, std::string& out) {
         std::uint8_t byte = static_cast<std::uint8_t>(rest[0]);
         bool control = IsControl(page, byte);
@@ -520,12 +475,10 @@ bool ToUtf8(std::string_view text, std::string& utf8) {
 }
 
 bool FromUtf8(std::string_view utf8, std::string& text) {
+    const CodePageTables& page = ActiveCodePage();
+    if (page.utf8) return Converted(CopyUtf8(utf8, text));
     text.clear();
     text.reserve(utf8.size());
-    const CodePageTables& page = ActiveCodePage();
-    if (page.utf8) {
-        return Converted(ForEachUtf8(utf8, [&](char32_t c) { AppendUtf8(text, c); }));
-    }
     return Converted(Convert(*Converters(page).fromUtf8, utf8, text, [&](std::string_view rest, std::string& out) {
         char32_t character = 0;
         std::size_t length = DecodeUtf8(rest.data(), rest.data() + rest.size(), character);
@@ -537,30 +490,14 @@ bool FromUtf8(std::string_view utf8, std::string& text) {
 
 bool ToUtf16(std::string_view text, std::u16string& utf16) {
     std::string utf8;
-    bool complete = ToUtf8(text, utf8);
-    utf16.clear();
-    utf16.reserve(utf8.size());
-    ForEachUtf8(utf8, [&](char32_t c) {
-        if (c >= 0x10000) utf16 += static_cast<char16_t>(0xD7C0 + (c >> 10));
-        utf16 += static_cast<char16_t>(c >= 0x10000 ? 0xDC00 | (c & 0x3FF) : c);
-    });
+    const bool complete = ToUtf8(text, utf8);
+    Utf8ToUtf16(utf8, utf16);
     return complete;
 }
 
 bool FromUtf16(std::u16string_view utf16, std::string& text) {
     std::string utf8;
-    bool valid = true;
-    for (std::size_t i = 0; i < utf16.size(); ++i) {
-        char32_t c = utf16[i];
-        bool high = c >= 0xD800 && c < 0xDC00;
-        if (high && i + 1 < utf16.size() && utf16[i + 1] >= 0xDC00 && utf16[i + 1] < 0xE000) {
-            c = ((c - 0xD7C0) << 10) | (utf16[++i] & 0x3FFu);
-        } else if (c >= 0xD800 && c < 0xE000) {
-            c = kReplacementCharacter;
-            valid = false;
-        }
-        AppendUtf8(utf8, c);
-    }
+    const bool valid = Utf16ToUtf8(utf16, utf8);
     return FromUtf8(utf8, text) && Converted(valid);
 }
 

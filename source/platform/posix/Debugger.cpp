@@ -1,11 +1,10 @@
 #include "platform/Debugger.h"
 
-#include "platform/posix/SystemCalls.h"
+#include "platform/posix/Interrupted.h"
 
 #include <cstdlib>
 #include <cstring>
 #include <errno.h>
-#include <fcntl.h>
 #include <signal.h>
 #include <unistd.h>
 
@@ -13,15 +12,10 @@ namespace tessel::platform {
 
 namespace {
 
-void WriteAll(int file, const char* text, std::size_t count) {
-    int savedError = errno;
-    while (count > 0) {
-        ssize_t moved = systemCalls.write(file, text, count);
-        if (moved < 0 && errno == EINTR) continue;
-        if (moved <= 0) break;
-        text += moved;
-        count -= static_cast<std::size_t>(moved);
-    }
+void Put(int file, const char* text, std::size_t count) {
+    const int savedError = errno;
+    std::size_t done = 0;
+    WriteAll(file, text, count, done);
     errno = savedError;
 }
 
@@ -29,9 +23,9 @@ void WriteAll(int file, const char* text, std::size_t count) {
 
 bool DebuggerAttached() noexcept {
     char status[2048];  // the line stands near the top
-    int file = systemCalls.open("/proc/self/status", O_RDONLY | O_CLOEXEC, 0);
+    int file = OpenRetrying("/proc/self/status", O_RDONLY);
     if (file < 0) return false;
-    ssize_t count = systemCalls.read(file, status, sizeof status - 1);
+    const ssize_t count = Retry([&] { return systemCalls.read(file, status, sizeof status - 1); });
     systemCalls.close(file);
     if (count <= 0) return false;
     status[count] = 0;
@@ -45,11 +39,11 @@ void DebuggerBreak() noexcept {
 }
 
 void DebuggerOutput(const char* text) noexcept {
-    if (text) WriteAll(STDERR_FILENO, text, std::strlen(text));
+    if (text) Put(STDERR_FILENO, text, std::strlen(text));
 }
 
 void ConsoleOutput(const char* text, std::size_t count) noexcept {
-    WriteAll(STDOUT_FILENO, text, count);
+    Put(STDOUT_FILENO, text, count);
 }
 
 bool ConsoleAllocate() noexcept {

@@ -1,11 +1,10 @@
 #include "platform/posix/ElfSymbols.h"
 
 #include "platform/Mutex.h"
-#include "platform/posix/SystemCalls.h"
+#include "platform/posix/Interrupted.h"
 
 #include <algorithm>
 #include <cstring>
-#include <errno.h>
 #include <link.h>
 #include <map>
 #include <string>
@@ -35,7 +34,7 @@ struct Names {
 // A file read in pieces: of one with debugging information only a small part is wanted.
 class ElfFile {
 public:
-    explicit ElfFile(const char* native) : file_(systemCalls.open(native, O_RDONLY | O_CLOEXEC, 0)) {}
+    explicit ElfFile(const char* native) : file_(OpenRetrying(native, O_RDONLY)) {}
     ~ElfFile() {
         if (file_ >= 0) systemCalls.close(file_);
     }
@@ -45,12 +44,8 @@ public:
     // False unless all of it is there.
     bool Read(std::uint64_t at, void* to, std::size_t count) const {
         if (file_ < 0 || systemCalls.lseek(file_, static_cast<off_t>(at), SEEK_SET) < 0) return false;
-        for (std::size_t done = 0; done < count;) {
-            ssize_t moved = systemCalls.read(file_, static_cast<char*>(to) + done, count - done);
-            if (moved == 0 || (moved < 0 && errno != EINTR)) return false;
-            if (moved > 0) done += static_cast<std::size_t>(moved);
-        }
-        return true;
+        std::size_t done = 0;
+        return ReadAll(file_, to, count, done) && done == count;
     }
 
     template <typename Record>

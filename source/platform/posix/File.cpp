@@ -2,8 +2,8 @@
 
 #include "platform/posix/Errors.h"
 #include "platform/posix/FileHandles.h"
+#include "platform/posix/Interrupted.h"
 #include "platform/posix/NativeNames.h"
-#include "platform/posix/SystemCalls.h"
 
 #include <algorithm>
 #include <cstdio>
@@ -47,11 +47,7 @@ int LockBytes(int descriptor, int command, short type, std::int64_t start, std::
     range.l_whence = SEEK_SET;
     range.l_start = static_cast<off_t>(start);
     range.l_len = static_cast<off_t>(count);
-    int result;
-    do {
-        result = systemCalls.lock(descriptor, command, &range);
-    } while (result != 0 && errno == EINTR);
-    return result;
+    return Retry([&] { return systemCalls.lock(descriptor, command, &range); });
 }
 
 enum class Marking { kDone, kRefused, kNoLocks };
@@ -102,28 +98,25 @@ bool ShareAllows(int descriptor, std::uint32_t access, std::uint32_t deny, bool 
 
 // ---- opening --------------------------------------------------------------------------------------------------------
 
-int OpenRetrying(const char* native, int flags, mode_t mode = 0666) {
-    int descriptor;
-    do {
-        descriptor = systemCalls.open(native, flags | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, mode);
-    } while (descriptor < 0 && errno == EINTR);
-    return descriptor;
+// Neither a device nor a pipe makes it wait, and no terminal becomes the process's own.
+int OpenAtOnce(const char* native, int flags, mode_t mode = 0666) {
+    return OpenRetrying(native, flags | O_NOCTTY | O_NONBLOCK, mode);
 }
 
 // Marks are set by reading, so files are opened for reading too wherever they may be read.
 int OpenDescriptor(const char* native, std::uint32_t access, int flags, bool& readable) {
     readable = true;
-    if (access == kRead) return OpenRetrying(native, O_RDONLY | flags);
-    int descriptor = OpenRetrying(native, O_RDWR | flags);
+    if (access == kRead) return OpenAtOnce(native, O_RDONLY | flags);
+    int descriptor = OpenAtOnce(native, O_RDWR | flags);
     if (descriptor >= 0 || errno != EACCES || access != kWrite) return descriptor;
     readable = false;
-    return OpenRetrying(native, O_WRONLY | flags);
+    return OpenAtOnce(native, O_WRONLY | flags);
 }
 
 // Opening never waits, but the later reads and writes of a device do, as those of a file.
 bool MakeWaiting(int descriptor) {
-    int flags = fcntl(descriptor, F_GETFL);
-    return flags >= 0 && fcntl(descriptor, F_SETFL, flags & ~O_NONBLOCK) == 0;
+    const int flags = systemCalls.fcntl(descriptor, F_GETFL, 0);
+    return flags >= 0 && systemCalls.fcntl(descriptor, F_SETFL, flags & ~O_NONBLOCK) == 0;
 }
 
 // Folders, pipes and sockets have no bytes at positions. A device may be opened.
@@ -136,11 +129,7 @@ bool CheckKind(int descriptor) {
 }
 
 bool Truncate(int descriptor, std::int64_t size) {
-    int result;
-    do {
-        result = systemCalls.ftruncate(descriptor, static_cast<off_t>(size));
-    } while (result != 0 && errno == EINTR);
-    return result == 0;
+    return Retry([&] { return systemCalls.ftruncate(descriptor, static_cast<off_t>(size)); }) == 0;
 }
 
 // What has to hold of a descriptor before it is handed out.
@@ -154,8 +143,7 @@ bool Admit(int descriptor, std::uint32_t access, std::uint32_t deny, bool readab
 // Removes what has the name, when it is this user's and no folder. True also when there is nothing.
 bool RemoveOwn(const char* native) {
     struct statx status;
-    if (systemCalls.statx(AT_FDCWD, native, AT_SYMLINK_NOFOLLOW, STATX_TYPE | STATX_UID, &status) != 0)
-        return errno == ENOENT || FailErrno();
+    if (!StatusOf(native, Links::kThemselves, STATX_TYPE | STATX_UID, status)) return errno == ENOENT || FailErrno();
     if (S_ISDIR(status.stx_mode) || status.stx_uid != ::geteuid()) return FailWith(kErrorAccessDenied);
     return systemCalls.unlink(native) == 0 || errno == ENOENT || FailErrno();
 }
@@ -201,7 +189,7 @@ FileHandle FileCreatePrivate(const char* name, std::uint32_t access) {
     MatchOnDisk(native);
     if (!RemoveOwn(native.c_str())) return kNoFile;
     // Whoever puts something there in between is refused, a link too.
-    const int descriptor = OpenRetrying(native.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
+    const int descriptor = OpenAtOnce(native.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
     if (descriptor >= 0) return HandleOf(descriptor, access);
     FailWith(errno == EEXIST ? kErrorAccessDenied : ErrorOfErrno(errno));
     return kNoFile;
@@ -217,31 +205,13 @@ bool FileClose(FileHandle file) {
 bool FileRead(FileHandle file, void* buffer, std::size_t count, std::size_t& actual) {
     actual = 0;
     if (!HasAccess(file, kRead)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
-    while (actual < count) {
-        ssize_t moved = systemCalls.read(DescriptorOf(file), static_cast<char*>(buffer) + actual, count - actual);
-        if (moved == 0) break;
-        if (moved > 0) {
-            actual += static_cast<std::size_t>(moved);
-        } else if (errno != EINTR) {
-            return FailErrno();
-        }
-    }
-    return true;
+    return ReadAll(DescriptorOf(file), buffer, count, actual) || FailErrno();
 }
 
 bool FileWrite(FileHandle file, const void* data, std::size_t count, std::size_t& actual) {
     actual = 0;
     if (!HasAccess(file, kWrite)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
-    while (actual < count) {
-        const char* from = static_cast<const char*>(data) + actual;
-        ssize_t moved = systemCalls.write(DescriptorOf(file), from, count - actual);
-        if (moved > 0) {
-            actual += static_cast<std::size_t>(moved);
-        } else if (moved == 0 || errno != EINTR) {
-            return moved == 0 ? FailWith(kErrorDiskFull) : FailErrno();
-        }
-    }
-    return true;
+    return WriteAll(DescriptorOf(file), data, count, actual) || FailErrno();
 }
 
 bool FileSeek(FileHandle file, std::int64_t offset, SeekFrom from) {
@@ -273,10 +243,7 @@ bool FileReserve(FileHandle file, std::int64_t size) {
     if (!HasAccess(file, kWrite)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
     std::int64_t before = 0;
     if (!FileSize(file, before)) return false;
-    int result;
-    do {
-        result = systemCalls.fallocate(DescriptorOf(file), 0, 0, static_cast<off_t>(size));
-    } while (result != 0 && errno == EINTR);
+    const int result = Retry([&] { return systemCalls.fallocate(DescriptorOf(file), 0, 0, static_cast<off_t>(size)); });
     if (result == 0 || errno == EOPNOTSUPP || errno == ENOSYS || errno == ENODEV) return true;
     ErrorNumber reason = ErrorOfErrno(errno);
     Truncate(DescriptorOf(file), before);  // a part may have been had
@@ -284,10 +251,7 @@ bool FileReserve(FileHandle file, std::int64_t size) {
 }
 
 bool FileFlush(FileHandle file) {
-    int result;
-    do {
-        result = systemCalls.fsync(DescriptorOf(file));
-    } while (result != 0 && errno == EINTR);
+    const int result = Retry([&] { return systemCalls.fsync(DescriptorOf(file)); });
     return result == 0 || errno == EINVAL || errno == EROFS || FailErrno();  // both: there is no device to wait for
 }
 
@@ -357,7 +321,7 @@ bool FileUnlock(FileHandle file, std::int64_t offset, std::int64_t count) {
     // A handle does not see its own locks. A second one on the same file does.
     char self[40];
     std::snprintf(self, sizeof self, "/proc/self/fd/%d", DescriptorOf(file));
-    int other = OpenRetrying(self, O_RDONLY);
+    int other = OpenAtOnce(self, O_RDONLY);
     bool locked = other < 0 || HeldByOther(other, offset, count);
     if (other >= 0) systemCalls.close(other);
     // What another handle holds is not this one's to unlock.

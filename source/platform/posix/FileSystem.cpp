@@ -1,13 +1,12 @@
 #include "platform/FileSystem.h"
 
 #include "platform/posix/FileHandles.h"
+#include "platform/posix/Interrupted.h"
 #include "platform/posix/NativeNames.h"
-#include "platform/posix/SystemCalls.h"
 
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <dirent.h>
 #include <errno.h>
 #include <linux/fs.h>
 #include <memory>
@@ -37,8 +36,7 @@ namespace {
 // A link whose end cannot be reached (it leads nowhere, in a circle, into a closed folder) is described itself, so that
 // it can be seen and deleted.
 bool GetStatus(const std::string& native, unsigned mask, struct statx& status) {
-    if (systemCalls.statx(AT_FDCWD, native.c_str(), 0, mask, &status) == 0) return true;
-    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, mask, &status) == 0;
+    return StatusOf(native, Links::kFollowed, mask, status) || StatusOf(native, Links::kThemselves, mask, status);
 }
 
 void TakeCreated(const unsigned char (&bytes)[8], ssize_t count, ItemInfo& info) {
@@ -106,19 +104,15 @@ bool EntryIsFolder(DIR* listing, const dirent& entry) {
     return systemCalls.statx(dirfd(listing), entry.d_name, 0, STATX_TYPE, &status) == 0 && S_ISDIR(status.stx_mode);
 }
 
+// Calls visit(listing, entry) for all that a folder holds.
 template <typename Visitor>
-bool VisitFolder(const char* name, Visitor visit) {
+bool VisitItems(const char* name, Visitor visit) {
     return OnExistingItem(name, [&](const std::string& native) {
-        std::unique_ptr<DIR, int (*)(DIR*)> listing(opendir(native.c_str()), closedir);
-        if (!listing) return false;
-        errno = 0;
-        while (const dirent* entry = readdir(listing.get())) {
-            if (std::strcmp(entry->d_name, ".") != 0 && std::strcmp(entry->d_name, "..") != 0) {
-                visit(listing.get(), *entry);
-            }
-            errno = 0;
-        }
-        return errno == 0;
+        return VisitFolder(native, [&](DIR* listing, const dirent& entry) {
+            const bool dots = std::strcmp(entry.d_name, ".") == 0 || std::strcmp(entry.d_name, "..") == 0;
+            if (!dots) visit(listing, entry);
+            return true;
+        });
     });
 }
 
@@ -126,14 +120,14 @@ bool VisitFolder(const char* name, Visitor visit) {
 
 bool FolderList(const char* name, std::vector<FolderEntry>& entries) {
     entries.clear();
-    return VisitFolder(name, [&](DIR* listing, const dirent& entry) {
+    return VisitItems(name, [&](DIR* listing, const dirent& entry) {
         entries.push_back({NameFromDisk(entry.d_name), EntryIsFolder(listing, entry)});
     });
 }
 
 bool FolderCount(const char* name, std::int64_t& count) {
     count = 0;
-    return VisitFolder(name, [&](DIR*, const dirent&) { ++count; });
+    return VisitItems(name, [&](DIR*, const dirent&) { ++count; });
 }
 
 bool FolderCreate(const char* name) {
@@ -149,14 +143,7 @@ namespace {
 
 bool IsLink(const std::string& native) {
     struct statx status;
-    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0 &&
-           S_ISLNK(status.stx_mode);
-}
-
-bool IsFolderItself(const std::string& native) {
-    struct statx status;
-    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0 &&
-           S_ISDIR(status.stx_mode);
+    return StatusOf(native, Links::kThemselves, STATX_TYPE, status) && S_ISLNK(status.stx_mode);
 }
 
 }  // namespace
@@ -166,9 +153,7 @@ bool FolderRemove(const char* name) {
         if (systemCalls.rmdir(native.c_str()) == 0) return true;
         if (errno != ENOTDIR) return false;
         // A link to a folder goes like a folder; what it leads to stays.
-        struct statx status;
-        bool link = IsLink(native) && GetStatus(native, STATX_TYPE, status) && S_ISDIR(status.stx_mode);
-        if (link) return systemCalls.unlink(native.c_str()) == 0;
+        if (IsLink(native) && IsFolder(native, Links::kFollowed)) return systemCalls.unlink(native.c_str()) == 0;
         errno = ENOTDIR;
         return false;
     });
@@ -189,8 +174,7 @@ bool RenameWithoutReplacing(const std::string& from, const std::string& to) {
     if (errno != EINVAL && errno != ENOSYS) return false;
     if (systemCalls.link(from.c_str(), to.c_str()) == 0) return systemCalls.unlink(from.c_str()) == 0;
     if (errno == EEXIST || errno == EXDEV) return false;
-    struct statx status;
-    if (systemCalls.statx(AT_FDCWD, to.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0) {
+    if (Exists(to)) {
         errno = EEXIST;
         return false;
     }
@@ -200,14 +184,13 @@ bool RenameWithoutReplacing(const std::string& from, const std::string& to) {
 bool SameItem(const std::string& a, const std::string& b) {
     struct statx first, second;
     constexpr unsigned mask = STATX_INO;
-    if (systemCalls.statx(AT_FDCWD, a.c_str(), AT_SYMLINK_NOFOLLOW, mask, &first) != 0) return false;
-    if (systemCalls.statx(AT_FDCWD, b.c_str(), AT_SYMLINK_NOFOLLOW, mask, &second) != 0) return false;
+    if (!StatusOf(a, Links::kThemselves, mask, first) || !StatusOf(b, Links::kThemselves, mask, second)) return false;
     return first.stx_ino == second.stx_ino && first.stx_dev_major == second.stx_dev_major &&
            first.stx_dev_minor == second.stx_dev_minor;
 }
 
 bool MoveAcross(const std::string& native, const char* from, const char* to) {
-    if (IsFolderItself(native)) return FailWith(kErrorNotSameDevice);
+    if (IsFolder(native, Links::kThemselves)) return FailWith(kErrorNotSameDevice);
     return FileCopy(from, to) && FileDelete(from);
 }
 
@@ -337,7 +320,7 @@ std::uint32_t PermissionMask() {
 // ---- places ---------------------------------------------------------------------------------------------------------
 
 bool CurrentFolder(std::string& name) {
-    std::unique_ptr<char, decltype(&std::free)> folder(::getcwd(nullptr, 0), std::free);
+    std::unique_ptr<char, decltype(&std::free)> folder(systemCalls.getcwd(nullptr, 0), std::free);
     return folder ? NativeToName(folder.get(), name) : FailErrno();
 }
 

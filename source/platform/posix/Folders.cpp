@@ -1,7 +1,7 @@
 #include "platform/posix/Folders.h"
 
+#include "platform/posix/Interrupted.h"
 #include "platform/posix/NativeNames.h"
-#include "platform/posix/SystemCalls.h"
 
 #include <cstdlib>
 #include <errno.h>
@@ -41,10 +41,8 @@ std::string XdgFolder(const char* variable, const char* underHome) {
 
 bool MakeFolders(const std::string& native, unsigned mode) {
     if (systemCalls.mkdir(native.c_str(), static_cast<mode_t>(mode)) == 0) return true;
-    struct statx status;
     if (errno == EEXIST) {
-        bool folder = systemCalls.statx(AT_FDCWD, native.c_str(), 0, STATX_TYPE, &status) == 0;
-        if (folder && S_ISDIR(status.stx_mode)) return true;
+        if (IsFolder(native, Links::kFollowed)) return true;
         errno = ENOTDIR;
         return false;
     }

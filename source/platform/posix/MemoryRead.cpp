@@ -1,6 +1,6 @@
 #include "platform/MemoryRead.h"
 
-#include "platform/posix/SystemCalls.h"
+#include "platform/posix/Interrupted.h"
 
 #include <algorithm>
 #include <atomic>
@@ -61,8 +61,8 @@ std::size_t ReadThroughPipe(const char* from, char* to, std::size_t count) {
     std::size_t done = 0;
     while (done < count) {
         std::size_t toBound = kPage - reinterpret_cast<std::uintptr_t>(from + done) % kPage;
-        ssize_t put = systemCalls.write(ends[1], from + done, std::min(toBound, count - done));
-        if (put < 0 && errno == EINTR) continue;
+        const ssize_t put =
+            Retry([&] { return systemCalls.write(ends[1], from + done, std::min(toBound, count - done)); });
         if (put <= 0) break;
         ssize_t got = systemCalls.read(ends[0], to + done, static_cast<std::size_t>(put));
         if (got != put) break;

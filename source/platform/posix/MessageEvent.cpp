@@ -2,13 +2,12 @@
 
 #include "platform/Mutex.h"
 #include "platform/posix/Errors.h"
-#include "platform/posix/SystemCalls.h"
+#include "platform/posix/Interrupted.h"
 #include "platform/posix/Threads.h"
 
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <fcntl.h>
 #include <new>
 #include <unistd.h>
 
@@ -27,9 +26,9 @@ struct Source {
 std::uint64_t StartOf(ThreadId thread) {
     char name[48], text[512];
     std::snprintf(name, sizeof name, "/proc/self/task/%u/stat", static_cast<unsigned>(thread));
-    int file = systemCalls.open(name, O_RDONLY | O_CLOEXEC, 0);
+    int file = OpenRetrying(name, O_RDONLY);
     if (file < 0) return 0;
-    ssize_t got = systemCalls.read(file, text, sizeof text - 1);
+    const ssize_t got = Retry([&] { return systemCalls.read(file, text, sizeof text - 1); });
     systemCalls.close(file);
     if (got <= 0) return 0;
     text[got] = 0;

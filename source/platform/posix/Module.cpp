@@ -2,6 +2,7 @@
 
 #include "platform/posix/ElfSymbols.h"
 #include "platform/posix/NativeNames.h"
+#include "platform/posix/SystemCalls.h"
 
 #include <cstdlib>
 #include <cxxabi.h>
@@ -18,7 +19,7 @@ namespace {
 std::string ExecutableFile() {
     std::string name(256, 0);
     for (;;) {
-        ssize_t length = ::readlink("/proc/self/exe", name.data(), name.size());
+        ssize_t length = systemCalls.readlink("/proc/self/exe", name.data(), name.size());
         if (length < 0) return {};
         if (static_cast<std::size_t>(length) < name.size()) {
             name.resize(static_cast<std::size_t>(length));

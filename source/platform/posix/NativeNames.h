@@ -35,6 +35,9 @@ char32_t TakeUpper(std::string_view& text) noexcept;
 // A name on the disk as the library sees it: in the code page, with `?` for what a name cannot hold.
 std::string NameFromDisk(std::string_view diskName);
 
+// The current folder, absolute; "/" when the host does not tell.
+std::string NativeCurrentFolder();
+
 // Splits off the last component. "/" for the parent of a top one, "." for that of a relative one.
 std::string NativeParent(std::string_view native);
 std::string_view NativeLast(std::string_view native);

@@ -3,8 +3,8 @@
 #include "platform/CodePage.h"
 #include "platform/Process.h"
 #include "platform/posix/Folders.h"
+#include "platform/posix/Interrupted.h"
 #include "platform/posix/NativeNames.h"
-#include "platform/posix/SystemCalls.h"
 #include "platform/posix/TextFile.h"
 
 #include <algorithm>
@@ -88,8 +88,7 @@ std::string NativeShellFolder(ShellFolder kind) {
 
 bool ShellFolderName(ShellFolder kind, bool create, std::string& name) {
     std::string native = NativeShellFolder(kind);
-    struct statx status;
-    bool there = systemCalls.statx(AT_FDCWD, native.c_str(), 0, STATX_TYPE, &status) == 0 && S_ISDIR(status.stx_mode);
+    const bool there = IsFolder(native, Links::kFollowed);
     if (!there && !create) return FailWith(kErrorFileNotFound);
     if (!there && !MakeFolders(native, 0700)) return FailErrno();  // new folders of the user's are private
     return NativeToName(native, name);
@@ -105,7 +104,7 @@ struct Trash {
 };
 
 bool GetStatus(const std::string& native, struct statx& status) {
-    return systemCalls.statx(AT_FDCWD, native.c_str(), AT_SYMLINK_NOFOLLOW, STATX_BASIC_STATS, &status) == 0;
+    return StatusOf(native, Links::kThemselves, STATX_BASIC_STATS, status);
 }
 
 bool SameDevice(const struct statx& a, const struct statx& b) {

@@ -1,7 +1,6 @@
 #include "platform/System.h"
 
 #include <errno.h>
-#include <sys/utsname.h>
 
 #if defined(__x86_64__) || defined(__i386__)
 #    include <cpuid.h>
@@ -9,7 +8,7 @@
 
 #include "platform/Thread.h"
 #include "platform/posix/Errors.h"
-#include "platform/posix/SystemCalls.h"
+#include "platform/posix/Interrupted.h"
 #include "platform/posix/TextFile.h"
 
 #include <algorithm>
@@ -67,7 +66,7 @@ SystemVersion GetSystemVersion() {
     SystemVersion version{};
     version.family = "Linux";
     utsname host{};
-    if (::uname(&host) == 0) {
+    if (systemCalls.uname(&host) == 0) {
         version.family = host.sysname;
         version.version = host.release;
         std::sscanf(host.release, "%u.%u.%u", &version.major, &version.minor, &version.patch);
@@ -100,8 +99,7 @@ ProcessorFacts GetProcessorFacts() {
 bool RandomBytes(void* buffer, std::size_t count) noexcept {
     char* to = static_cast<char*>(buffer);
     while (count > 0) {
-        ssize_t got = systemCalls.getrandom(to, count, 0);
-        if (got < 0 && errno == EINTR) continue;
+        const ssize_t got = Retry([&] { return systemCalls.getrandom(to, count, 0); });
         if (got <= 0) return FailErrno();
         to += got;
         count -= static_cast<std::size_t>(got);

@@ -19,6 +19,9 @@ int Open(const char* name, int flags, mode_t mode) {
 int OpenAt(int folder, const char* name, int flags, mode_t mode) {
     return ::openat(folder, name, flags, mode);
 }
+int Fcntl(int file, int command, int value) {
+    return ::fcntl(file, command, value);
+}
 int Lock(int file, int command, struct flock* range) {
     return ::fcntl(file, command, range);
 }
@@ -57,6 +60,7 @@ constinit SystemCalls systemCalls = {
     .fallocate = ::fallocate,
     .fsync = ::fsync,
     .lock = Lock,
+    .fcntl = Fcntl,
     .mmap = ::mmap,
     .munmap = ::munmap,
     .statx = ::statx,
@@ -73,6 +77,12 @@ constinit SystemCalls systemCalls = {
     .mkdirat = ::mkdirat,
     .chmod = ::chmod,
     .fchmod = ::fchmod,
+    .opendir = ::opendir,
+    .readdir = ::readdir,
+    .closedir = ::closedir,
+    .getcwd = ::getcwd,
+    .readlink = ::readlink,
+    .uname = ::uname,
     .chdir = ::chdir,
     .statfs = ::statfs,
     .copy_file_range = ::copy_file_range,

@@ -1,20 +1,23 @@
-// Every call that this backend makes of the kernel, by name, in one table that tests replace parts of: a short write,
-// an interruption, a full disk, a clock moved by hand.
+// The calls that this backend makes of the kernel, by name, in one table that tests replace parts of: a short write, an
+// interruption, a full disk, a clock moved by hand.
 #ifndef TESSEL_PLATFORM_POSIX_SYSTEMCALLS_H
 #define TESSEL_PLATFORM_POSIX_SYSTEMCALLS_H
 
 #include <cstddef>
 #include <cstdint>
+#include <dirent.h>
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <sys/statfs.h>
 #include <sys/types.h>
 #include <sys/uio.h>
+#include <sys/utsname.h>
 #include <time.h>
 
 namespace tessel::platform {
 
-// X(result, name, parameters): all return -1 (mmap: MAP_FAILED) and set errno on failure.
+// X(result, name, parameters): all return -1 (mmap: MAP_FAILED; opendir, readdir and getcwd: null) and set errno on
+// failure.
 #define TESSEL_SYSTEM_CALLS(X)                                                                                     \
     X(int, open, (const char* name, int flags, mode_t mode))                                                       \
     X(int, openat, (int folder, const char* name, int flags, mode_t mode))                                         \
@@ -26,6 +29,7 @@ namespace tessel::platform {
     X(int, fallocate, (int file, int mode, off_t offset, off_t size))                                              \
     X(int, fsync, (int file))                                                                                      \
     X(int, lock, (int file, int command, struct flock* range))                                                     \
+    X(int, fcntl, (int file, int command, int value))                                                              \
     X(void*, mmap, (void* address, std::size_t size, int protection, int flags, int file, off_t offset))           \
     X(int, munmap, (void* address, std::size_t size))                                                              \
     X(int, statx, (int folder, const char* name, int flags, unsigned mask, struct statx* result))                  \
@@ -42,6 +46,12 @@ namespace tessel::platform {
     X(int, mkdirat, (int folder, const char* name, mode_t mode))                                                   \
     X(int, chmod, (const char* name, mode_t mode))                                                                 \
     X(int, fchmod, (int file, mode_t mode))                                                                        \
+    X(DIR*, opendir, (const char* name))                                                                           \
+    X(dirent*, readdir, (DIR * listing))                                                                           \
+    X(int, closedir, (DIR * listing))                                                                              \
+    X(char*, getcwd, (char* buffer, std::size_t size))                                                             \
+    X(ssize_t, readlink, (const char* name, char* buffer, std::size_t size))                                       \
+    X(int, uname, (struct utsname * host))                                                                         \
     X(int, chdir, (const char* name))                                                                              \
     X(int, statfs, (const char* name, struct statfs* result))                                                      \
     X(ssize_t, copy_file_range,                                                                                    \

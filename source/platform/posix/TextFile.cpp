@@ -1,35 +1,16 @@
 #include "platform/posix/TextFile.h"
 
-#include "platform/posix/SystemCalls.h"
+#include "platform/posix/Interrupted.h"
 
 #include <algorithm>
 #include <atomic>
 #include <cstdio>
 #include <errno.h>
-#include <fcntl.h>
 #include <unistd.h>
 
 namespace tessel::platform {
 
 namespace {
-
-int OpenRetrying(int folder, const char* native, int flags, mode_t mode) {
-    int file;
-    do {
-        file = systemCalls.openat(folder, native, flags | O_CLOEXEC, mode);
-    } while (file < 0 && errno == EINTR);
-    return file;
-}
-
-bool WriteAll(int file, const std::string& data) {
-    for (std::size_t done = 0; done < data.size();) {
-        ssize_t moved = systemCalls.write(file, data.data() + done, data.size() - done);
-        if (moved < 0 && errno == EINTR) continue;
-        if (moved <= 0) return false;
-        done += static_cast<std::size_t>(moved);
-    }
-    return true;
-}
 
 // Unlike any other's, in this process or another: who made it, and which it is. Hidden, beside the file it will be.
 // Short, as that file's name may be as long as a name can be.
@@ -45,14 +26,14 @@ std::string TemporaryName(const std::string& native) {
 
 bool ReadTextFile(const char* native, std::string& text, std::size_t most, int folder) {
     text.clear();
-    int file = OpenRetrying(folder, native, O_RDONLY | O_NONBLOCK, 0);  // a pipe of that name must not make us wait
+    int file = OpenAtRetrying(folder, native, O_RDONLY | O_NONBLOCK);  // a pipe of that name must not make us wait
     if (file < 0) return false;
     char buffer[4096];
     ssize_t moved = 1;
     while (moved != 0 && text.size() < most) {
-        moved = systemCalls.read(file, buffer, std::min(sizeof buffer, most - text.size()));
-        if (moved < 0 && errno != EINTR) break;
-        if (moved > 0) text.append(buffer, static_cast<std::size_t>(moved));
+        moved = Retry([&] { return systemCalls.read(file, buffer, std::min(sizeof buffer, most - text.size())); });
+        if (moved < 0) break;
+        text.append(buffer, static_cast<std::size_t>(moved));
     }
     int error = errno;
     systemCalls.close(file);
@@ -61,9 +42,10 @@ bool ReadTextFile(const char* native, std::string& text, std::size_t most, int f
 }
 
 bool CreateTextFile(const std::string& native, const std::string& data, int folder) {
-    int file = OpenRetrying(folder, native.c_str(), O_WRONLY | O_CREAT | O_EXCL, 0666);
+    int file = OpenAtRetrying(folder, native.c_str(), O_WRONLY | O_CREAT | O_EXCL);
     if (file < 0) return false;
-    bool written = WriteAll(file, data);
+    std::size_t done = 0;
+    bool written = WriteAll(file, data.data(), data.size(), done);
     int error = errno;
     if (systemCalls.close(file) != 0 && written) {
         written = false;
