@@ -97,7 +97,7 @@ MgErr PlatformName::Make(Path path, bool resolveShortcuts) {
 MgErr OpenWith(File_t** file, Path path, int32 openMode, int32 denyMode,
                const std::function<platform::FileHandle(const char* name, const OpenAccess& access)>& open) {
     if (!file) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         FlushPathCache(path);
         *file = nullptr;
         OpenAccess modes;

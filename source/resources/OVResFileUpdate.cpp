@@ -225,7 +225,7 @@ MgErr OVResFile::RUpdateFile() {
     if (!fOpen) return kNotResFileErr;
     if (!(fMap.Head()->fileAttrs & kRFileChanged)) return kNoErr;
     if (!fIO || !fIO->CanWrite()) return kNoErr;
-    const MgErr err = Guarded([&]() -> MgErr {
+    const MgErr err = Guarded([&] {
         if (fMap.IsEmpty()) return WriteEmpty();
         if (const MgErr rebaseErr = RebaseData()) return rebaseErr;
         return Updating(this).Run();

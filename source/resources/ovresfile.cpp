@@ -286,7 +286,7 @@ MgErr OVResFile::RGet(ResType type, int32 id, Resource** resource) {
     if (!fOpen) return kNotResFileErr;
     RsrcList* entry = fMap.FindEntry(type, id);
     if (!entry) return kResNotFoundErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         OVResource* loaded = nullptr;
         const MgErr err = Load(type, entry, &loaded);
         *resource = loaded;
@@ -314,7 +314,7 @@ MgErr OVResFile::RGetNamed(ResType type, ConstPStr name, Resource** resource) {
     RsrcList* entries = fMap.Entries(list);
     for (int32 i = 0, count = ResourceMap::CountOf(list); i < count; ++i) {
         if (entries[i].name == kNoName || !FileNameEqual(fMap.NameOf(&entries[i]), name)) continue;
-        return Guarded([&]() -> MgErr {
+        return Guarded([&] {
             OVResource* loaded = nullptr;
             const MgErr err = Load(type, &entries[i], &loaded);
             *resource = loaded;
@@ -392,7 +392,7 @@ MgErr OVResFile::RGetInd(ResType type, int32 index, Resource** resource) {
     if (!fOpen) return kNotResFileErr;
     const TypeList* list = fMap.FindType(type);
     if (!list || index < 1 || index > ResourceMap::CountOf(list)) return kResNotFoundErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         OVResource* loaded = nullptr;
         const MgErr err = Load(type, fMap.Entries(list) + (index - 1), &loaded);
         *resource = loaded;
