@@ -123,7 +123,7 @@ TESSEL_API uint64 FloatExtToUInt64(const floatExt* value);
 
 // ---- real operations ------------------------------------------------------------------------------------------------
 
-// A, b: ln b / ln a.
+// a, b: ln b / ln a.
 TESSEL_API void LogX(void);
 // Base-2 logarithm; of 0 -infinity, of a negative value or NaN the NaN ENaN (all logs).
 TESSEL_API void Log2(void);
@@ -133,7 +133,7 @@ TESSEL_API void Log10(void);
 TESSEL_API void LogN(void);
 // ln (1 + x).
 TESSEL_API void Lognp1(void);
-// E to the power x.
+// e to the power x.
 TESSEL_API void ExpX(void);
 // 2 to the power x.
 TESSEL_API void _F2X(void);
@@ -143,9 +143,9 @@ TESSEL_API void _F2XM1(void);
 TESSEL_API void Pow10X(void);
 // 2 to the power x.
 TESSEL_API void Pow2X(void);
-// A, b: a to the power b.
+// a, b: a to the power b.
 TESSEL_API void PowerX(void);
-// A, b: a times 2 to the power trunc b.
+// a, b: a times 2 to the power trunc b.
 TESSEL_API void ScaleX(void);
 // Largest integer not above x.
 TESSEL_API void FloorX(void);
@@ -159,9 +159,9 @@ TESSEL_API void SinX(void);
 TESSEL_API void CosX(void);
 // Tangent.
 TESSEL_API void TanX(void);
-// A, b: angle of the point (a, b), -pi to pi.
+// a, b: angle of the point (a, b), -pi to pi.
 TESSEL_API void ATanX(void);
-// Sin x / x; 1 at 0.
+// sin x / x; 1 at 0.
 TESSEL_API void SincX(void);
 // 1 / x.
 TESSEL_API void RecipX(void);
@@ -185,7 +185,7 @@ TESSEL_API void ASinX(void);
 TESSEL_API void ACosX(void);
 // 1 when x is an integer, else 0.
 TESSEL_API void FPIsInt(void);
-// A, b: -1 when a < b, 0 when equal, 1 when a > b, NaN when one of them is a NaN.
+// a, b: -1 when a < b, 0 when equal, 1 when a > b, NaN when one of them is a NaN.
 TESSEL_API void FPCompareExt(void);
 
 // ---- complex operations ---------------------------------------------------------------------------------------------
@@ -194,7 +194,7 @@ TESSEL_API void FPCompareExt(void);
 TESSEL_API void ComplexRToP(void);
 // The reverse: magnitude on top of the angle to real on top of imaginary.
 TESSEL_API void ComplexPToR(void);
-// A, b: a / b.
+// a, b: a / b.
 TESSEL_API void ComplexDivide(void);
 // 1 / z.
 TESSEL_API void ComplexRecip(void);
@@ -214,7 +214,7 @@ TESSEL_API void ComplexCosh(void);
 TESSEL_API void ComplexTanh(void);
 // Two results: the sine on top of the cosine.
 TESSEL_API void ComplexSincos(void);
-// Sin z / z; 1 at 0.
+// sin z / z; 1 at 0.
 TESSEL_API void ComplexSinc(void);
 // Arcsine, complex, in radians.
 TESSEL_API void ComplexAsin(void);
