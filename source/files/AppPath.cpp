@@ -55,7 +55,7 @@ using namespace tessel;
 
 MgErr FAppCStr(char* buffer, int32 size) {
     if (!buffer || size <= 0) return kNoErr;
-    return GuardedOr<MgErr>(kNoErr, [&]() -> MgErr {
+    return GuardedOr<MgErr>(kNoErr, [&] {
         const std::string name = ModuleName(MGModuleGetInstance());
         buffer[name.copy(buffer, static_cast<size_t>(size) - 1)] = 0;
         return kNoErr;
@@ -81,7 +81,7 @@ MgErr FMGPath(Path* path) {
 MgErr FResDir(Path* path) {
     if (const MgErr err = FMGPath(path)) return err;
     if (IsRunTimeEngine()) return kNoErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         (*path)->Append("resource");
         return kNoErr;
     });

@@ -204,7 +204,7 @@ int32 FExists(Path path) {
 MgErr FGetInfoResolve(Path path, FInfo64Rec* info, int32 resolve, uint8 mask) {
     if (!info || !FIsAbsPath(path)) return kArgErr;
     *info = {};
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (FDepth(path) == 0) {
             DescribeVolumeList(info);
             return kNoErr;
@@ -230,7 +230,7 @@ MgErr FGetInfo(Path path, FInfoRec* info) {
 
 MgErr FGetAccessRights(Path path, PStr owner, PStr group, int32* permissions) {
     if (!FIsAbsPath(path)) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (owner) owner[0] = 0;
         if (group) group[0] = 0;
         if (permissions) *permissions = 0;
@@ -266,7 +266,7 @@ MgErr FIsHiddenFile(Path path, int32* isHidden) {
         TESSEL_REPORT(kDebugWarning, 0x1A6B5F93u) << "FIsHiddenFile: NULL isHidden passed in!";
         return kArgErr;
     }
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         *isHidden = 0;
         PlatformName name;
         if (const MgErr err = name.Make(path, false)) return err;
@@ -286,7 +286,7 @@ MgErr FIsShortcut(Path path, int32* isShortcut) {
         TESSEL_REPORT(kDebugWarning, 0x20C5D86Fu) << "FIsShortcut: NULL isShortcut passed in!";
         return kArgErr;
     }
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         *isShortcut = 0;
         std::string last;
         if (FDepth(path) < 1 || path->CopyItemAt(-1, &last)) return kNoErr;
@@ -309,7 +309,7 @@ int32 FEject(Path) {
 
 MgErr FMGetModDate(Path path, File_t* file, uint32* seconds, int32* readOnly) {
     if (!seconds) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         *seconds = 0;
         if (readOnly) *readOnly = 0;
         platform::ItemInfo item;
@@ -336,7 +336,7 @@ int64 SecsToWin32FileTime(uint32 seconds, int64* fileTime) {
 
 MgErr FSetInfo64(Path path, FInfo64Rec* info) {
     if (!info || !FIsAbsPath(path)) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         FlushPathCache(path);
         if (info->folder) return kNoErr;
         // The dates need a file that may be written: a file that becomes read-only gets them first.
@@ -361,7 +361,7 @@ MgErr FSetInfo(Path path, FInfoRec* info) {
 MgErr FSetAccessRights(Path path, PStr owner, PStr group, int32* permissions) {
     if (!FIsAbsPath(path)) return kArgErr;
     if (!owner && !group && !permissions) return kNoErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         FlushPathCache(path);
         if (FDepth(path) == 0) return kIOErr;
         PlatformName name;
@@ -376,7 +376,7 @@ MgErr FMakeFileNotReadOnly(Path path) {
     TESSEL_REPORT(kDebugWarning, 0x5B17E2D9u)
         << "FMakeFileNotReadOnly is DEPRECATED and may be removed as early as Orvane 2011";
     if (!FIsAbsPath(path)) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         FlushPathCache(path);
         PlatformName name;
         if (const MgErr err = name.Make(path, true)) return err;

@@ -125,7 +125,7 @@ MgErr FCreateAlways(File_t** file, Path path, int32 unused1, int32 openMode, int
 }
 
 MgErr FNewDir(Path path, int32) {
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (!FIsAbsPath(path)) return kArgErr;
         FlushPathCache(path);
         PlatformName name;
@@ -135,7 +135,7 @@ MgErr FNewDir(Path path, int32) {
 }
 
 MgErr FNewDirHier(Path path) {
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (!FIsAbsPath(path)) return kArgErr;
         switch (FExists(path)) {
             case 1:
@@ -156,7 +156,7 @@ MgErr FNewDirHier(Path path) {
 // ---- copying and moving ---------------------------------------------------------------------------------------------
 
 MgErr FCopyResolve(Path from, Path to, int32 resolve) {
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (!FIsAbsPath(from) || !FIsAbsPath(to) || IsVolume(from)) return kArgErr;
         FlushPathCache(to);
         PlatformName source, destination;
@@ -171,7 +171,7 @@ MgErr FCopy(Path from, Path to) {
 }
 
 MgErr FMoveResolve(Path from, Path to, int32 resolve) {
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (!FIsAbsPath(from) || !FIsAbsPath(to)) return kArgErr;
         FlushPathCache(from);
         FlushPathCache(to);
@@ -189,7 +189,7 @@ MgErr FMove(Path from, Path to) {
 }
 
 MgErr FMoveInto(Path from, Path to) {
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (!FIsAbsPath(from) || !FIsAbsPath(to)) return kArgErr;
         if (const MgErr err = CopyInto(from, to)) return err;
         FRemove(from);
@@ -200,7 +200,7 @@ MgErr FMoveInto(Path from, Path to) {
 // ---- removing -------------------------------------------------------------------------------------------------------
 
 MgErr FRemove(Path path) {
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (!FIsAbsPath(path)) return kArgErr;
         FlushPathCache(path);
         PlatformName name;
@@ -210,7 +210,7 @@ MgErr FRemove(Path path) {
 }
 
 MgErr FRemoveToRecycle(Path path, int32) {
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (!FIsAbsPath(path)) return kArgErr;
         FlushPathCache(path);
         PlatformName name;

@@ -64,7 +64,7 @@ MgErr FGetCanonicalPath(Path path, Path* out) {
         TESSEL_REPORT(kDebugWarning, 0x68F91D05u) << "FGetCanonicalPath: NULL resolvedPath passed in!";
         return kArgErr;
     }
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         PathRef resolved(*path);
         if (resolved.ItemCount() != 0) {
             PlatformName name;
@@ -77,7 +77,7 @@ MgErr FGetCanonicalPath(Path path, Path* out) {
 
 MgErr Win32GetLongFileName(Path path) {
     if (!FIsAbsPath(path)) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (FDepth(path) == 0) return kNoErr;
         PlatformName name;
         if (const MgErr err = name.Make(path, false)) return err;
@@ -89,7 +89,7 @@ MgErr Win32GetLongFileName(Path path) {
 
 MgErr FDirName(Path path, Path out) {
     if (!path || !out) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         const PathRef parent = path->GetParentDirectory();
         if (!parent.IsValid()) return kArgErr;
         *out = parent;
@@ -101,7 +101,7 @@ MgErr FDirName(Path path, Path out) {
 
 MgErr GetWorkingDir(Path* path) {
     if (!path) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         std::string name;
         if (!platform::CurrentFolder(name)) return kNotFoundErr;
         return NameToPath(name, path);
@@ -110,7 +110,7 @@ MgErr GetWorkingDir(Path* path) {
 
 MgErr FGetStdTmpDirPath(Path* path) {
     if (!path) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         std::string name, real;
         if (!platform::TemporaryFolder(name) || name.empty()) return kNotFoundErr;
         if (platform::ItemExists(name.c_str()) != platform::ItemKind::kFolder) return FAppPath(path);
@@ -136,7 +136,7 @@ _FMFileType PStrHasRezExt(ConstPStr name) {
 
 MgErr PStrAppendRezExt(PStr name, _FMFileType type) {
     if (!name) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         std::string text = StringOf(name);
         PathRef::NameAppendExtension(&text, type);
         if (text.size() > 255) return kArgErr;
@@ -161,7 +161,7 @@ int32 PStrStripRezExt(PStr name, _FMFileType type) {
 
 MgErr NativeToPath(CStr native, Path* path) {
     if (!native || !*native || !path) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         std::string absolute, name;
         if (!AbsoluteNative(native, &absolute)) return Win32ToOVFileErr();
         if (absolute.find('\\') != std::string::npos) return kArgErr;  // would read as a separator
@@ -173,7 +173,7 @@ MgErr NativeToPath(CStr native, Path* path) {
 MgErr PathToNative(Path path, char* buffer, uint32 size) {
     if (!buffer || !size) return kArgErr;
     *buffer = 0;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         PlatformName name;
         if (const MgErr err = name.Make(path, false)) return err;
         std::string native;

@@ -107,7 +107,7 @@ using namespace tessel;
 
 MgErr FListDesktop(CPStrHandle names, UHandle kinds) {
     if (!names) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         const auto drives = platform::DrivesPresent();
         if (kinds) {
             if (const MgErr err = DSSetHandleSize(kinds, static_cast<uint32>(drives.size() * sizeof(VolKindRec))))
@@ -125,7 +125,7 @@ MgErr FListDesktop(CPStrHandle names, UHandle kinds) {
 
 MgErr FMGetVolInfo64(Path path, uint64* freeBytes, uint64* totalBytes, uint32* sectorSize) {
     platform::VolumeSpace space = {};
-    const MgErr err = Guarded([&]() -> MgErr {
+    const MgErr err = Guarded([&] {
         std::string root;
         if (const MgErr rootErr = VolumeRoot(path, &root)) return rootErr;
         return platform::VolumeGetSpace(root.c_str(), space) ? kNoErr : Win32ToOVFileErr();
@@ -156,7 +156,7 @@ MgErr FGetVolInfo(Path path, VolInfoRec* info) {
 
 MgErr FMGetVolPath(Path path, Path* volume) {
     if (!volume || !FIsAbsPath(path) || FDepth(path) < 1) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         PathRef root(path->StartsWith(PathRef::kUNC) ? PathRef::kUNC : PathRef::kAbsolute);
         root.Append(path->ItemAt(0));
         return root.ConvertToPath(volume);
@@ -165,7 +165,7 @@ MgErr FMGetVolPath(Path path, Path* volume) {
 
 MgErr LSort(CPStrHandle names, UHandle entries) {
     if (!names) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (!NamesLieInside(names)) return kArgErr;
         const auto count = static_cast<uint64>((*names)->count);
         if (entries && DSGetHandleSize(entries) < count * sizeof(VolKindRec)) return kArgErr;

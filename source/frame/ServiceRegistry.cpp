@@ -149,7 +149,7 @@ void ServiceRegistry::Place(Items work) {
 MgErr ServiceRegistry::InitServices() {
     if (IsInUse()) return kGenericErr;
     Busy busy(busy_);
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         Order();
         for (const auto& item : startOrder_)
             if (const MgErr err = Start(*item)) return err;

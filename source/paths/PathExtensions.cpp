@@ -76,7 +76,7 @@ void PathRef::NameRemoveExtension(StringType* name) {
 
 MgErr PathRef::NameAppendExtension(StringType* name, const StringType& extension) {
     if (!name) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         name->reserve(name->size() + 1 + extension.size());
         name->append(1, '.').append(extension);
         return kNoErr;
@@ -109,7 +109,7 @@ bool PathRef::NameHasExtension(const StringType& name, _FMFileType type) {
 
 MgErr PathRef::CopyExtension(StringType* extension) const {
     if (!extension || ItemCount() == 0) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         *extension = NameGetExtension(mPathElement->Name());
         return kNoErr;
     });

@@ -230,7 +230,7 @@ PathRef::PathRef(InputBuf* buffer, const Endianizer* endianizer) {
 MgErr PathRef::Flatten(OutputBuf* buffer, FlattenFormat format, uint32* size, const Endianizer* endianizer) const {
     if (size) *size = 0;
     if (!endianizer) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         std::string bytes;
         const MgErr err = MakeFlattened(bytes, *this, format, *endianizer);
         return err ? err : Write(bytes, buffer, size);
@@ -254,7 +254,7 @@ MgErr FlattenPath(Path path, OutputBuf* buffer, const Endianizer* endianizer, ui
         const bool utf8 = FlattensAlwaysAsUtf8() || !FitsPTH0(names);
         return path->Flatten(buffer, utf8 ? PathRef::kPTH1 : PathRef::kPTH0, size, endianizer);
     }
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         std::string bytes;
         MakeFlattenedNull(bytes);
         return Write(bytes, buffer, size);
@@ -271,7 +271,7 @@ int32 FFlattenPath2(Path path, OutputBuf* buffer, const Endianizer* endianizer) 
 
 MgErr FUnFlattenPath2(InputBuf* buffer, Path* path, const Endianizer* endianizer) {
     if (!path) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         const PathRef read(buffer, endianizer);
         if (read.StartsWith(PathRef::kNullPath)) return *path ? kArgErr : kNoErr;
         return read.ConvertToPath(path);

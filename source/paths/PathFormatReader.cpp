@@ -203,7 +203,7 @@ PathRef ReadByGuessing(std::string_view text) {
     for (const PathFormatReader* reader :
          {static_cast<const PathFormatReader*>(&windows), static_cast<const PathFormatReader*>(&mac),
           static_cast<const PathFormatReader*>(&unixReader)}) {
-        const MgErr err = Guarded([&]() -> MgErr {
+        const MgErr err = Guarded([&] {
             PathRef path = reader->Read();
             if (path.ItemCount() > mostNames) {
                 mostNames = path.ItemCount();

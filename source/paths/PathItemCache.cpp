@@ -108,7 +108,7 @@ SharedCachedItem PathRefAccess::CachedItem(const PathRef& path, const char* key,
 MgErr PathRef::Cache(const char* key, CachedItem* item) const {
     std::unique_ptr<CachedItem> owned(item);
     if (!mPathElement || !key) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         SharedCachedItem previous;  // deleted without the lock
         if (!owned) {
             previous = Remove(*mPathElement, key);
@@ -136,7 +136,7 @@ uint32 PathRef::FlushCache() const {
         mPathElement->GiveBackUnusedRoom();
         std::unique_ptr<PathItemCache>& cache = mPathElement->Cache();
         if (!cache) return 0;
-        const MgErr err = Guarded([&]() -> MgErr {
+        const MgErr err = Guarded([&] {
             items = cache->items;
             return kNoErr;
         });

@@ -72,7 +72,7 @@ MgErr Reroot(Path path, int32 type) {
     const std::optional<PathRef::PathBase> base = BaseOfType(type);
     if (!base) return kArgErr;
     if (path->StartsWith(*base)) return kNoErr;
-    const MgErr err = Guarded([&]() -> MgErr {
+    const MgErr err = Guarded([&] {
         *path = Rerooted(*path, *base);
         return kNoErr;
     });
@@ -128,7 +128,7 @@ Path FMakePath(Path path, int32 type, ConstPStr name, ...) {
 MgErr FAppendName(Path path, ConstPStr name) {
     if (!FIsAPath(path)) return kArgErr;
     if ((!name || name[0] == 0) && FIsAbsPath(path)) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         path->Append(StringUtils::ToNarrowString(name));
         return kNoErr;
     });
@@ -136,7 +136,7 @@ MgErr FAppendName(Path path, ConstPStr name) {
 
 MgErr FPathCpy(Path dst, Path src) {
     if (!dst || !src) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         *dst = *src;
         return kNoErr;
     });
@@ -170,7 +170,7 @@ MgErr FSetPathType(Path path, int32 type) {
 
 MgErr FNormalizePath(Path path) {
     if (!path) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (path->ItemCount() == 0 || !StringUtils::StartsWith(path->ItemAt(0), '\\')) return kNoErr;
         const MgErr err = Reroot(path, kPathUNC);
         if (err) return err;
@@ -270,7 +270,7 @@ PStr PathCopyElt(Path path, int32 index, PStr name) {
 
 MgErr PathReplaceElt(Path path, ConstPStr name, int32 index) {
     if (!path || !name) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         path->Replace(index, StringUtils::ToNarrowString(name));
         return kNoErr;
     });
@@ -344,7 +344,7 @@ bool FileNameCStrEqual(CStr a, CStr b) {
 
 MgErr FAddPath(Path base, Path rel, Path result) {
     if (!base || !rel || !result) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         *result = Combined(*base, *rel);
         return FNormalizePath(result);
     });
@@ -352,7 +352,7 @@ MgErr FAddPath(Path base, Path rel, Path result) {
 
 MgErr FRelPath(Path from, Path to, Path result) {
     if (!from || !to || !result) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         *result = from->GetRelativePathFromThisToThat(*to, PathRef::kIgnoreCase);
         return kNoErr;
     });
@@ -360,7 +360,7 @@ MgErr FRelPath(Path from, Path to, Path result) {
 
 MgErr FCommonPath(Path a, Path b) {
     if (!a || !b) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         *a = a->GetInCommonWith(*b, PathRef::kIgnoreCase);
         return a->IsValid() || FEmptyPath(a) ? kNoErr : kMemFullErr;
     });
@@ -368,7 +368,7 @@ MgErr FCommonPath(Path a, Path b) {
 
 MgErr FVolName(Path path, Path result) {
     if (!path || !result) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         *result = path->Volume();
         return kNoErr;
     });

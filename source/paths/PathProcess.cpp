@@ -123,14 +123,14 @@ void PathRef::UnInit() {
 }
 
 MgErr PathManagerStart() {
-    return Guarded([]() -> MgErr {
+    return Guarded([] {
         PathRef::Init();
         return kNoErr;
     });
 }
 
 MgErr PathManagerStop() {
-    return Guarded([]() -> MgErr {
+    return Guarded([] {
         PathRef::UnInit();
         return kNoErr;
     });

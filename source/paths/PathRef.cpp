@@ -186,7 +186,7 @@ void PathRef::Assign(PathItemElement* element) {
 
 void PathRef::TakeOver(PathItemElement* element) noexcept {
     if (PathItemElement* previous = std::exchange(mPathElement, element)) previous->Release();
-    if (DebugModeEnabled()) Guarded([&]() -> MgErr { return ConvertToString(&TextCache(), StringDisplay()); });
+    if (DebugModeEnabled()) Guarded([&] { return ConvertToString(&TextCache(), StringDisplay()); });
 }
 
 PathRef::StringType& PathRef::TextCache() {

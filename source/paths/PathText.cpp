@@ -47,7 +47,7 @@ MgErr StoreText(const std::string& text, bool terminated, LStrHandle* handle) {
 
 MgErr StorePathText(Path path, const char* format, bool terminated, LStrHandle* handle) {
     if (!handle) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         std::string text;
         const MgErr err = TextOf(path, format, text);
         return err ? err : StoreText(text, terminated, handle);
@@ -106,7 +106,7 @@ MgErr ConvertPlatformIndependentTextToPath(Path* path, CStr text) {
 
 MgErr FPathToText(Path path, LStrPtr text) {
     if (!text) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         std::string converted;
         const MgErr err = TextOf(path, PathRef::StringDisplay(), converted);
         if (err) return err;
@@ -139,7 +139,7 @@ MgErr ConvertPathToPlatformIndependentText(Path path, LStrHandle* text) {
 
 MgErr FPathToStringRTF(Path path, LStrHandle* text) {
     if (!text) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         std::string converted;
         const MgErr err = TextOf(path, PathRef::StringDisplay(), converted);
         return err ? err : StoreText(WithDoubledBackslashes(converted), false, text);
@@ -162,7 +162,7 @@ UHandle PathToCStringEx(Path path, int32) {
 
 MgErr FPathToMaxCString(Path path, UPtr* text) {
     if (!text) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         std::string converted;
         const MgErr err = TextOf(path, PathRef::StringDisplay(), converted);
         if (err) return err;

@@ -113,7 +113,7 @@ MgErr MakeDOSPathName(Path path, char* name, int32 resolve) {
     if (!name) return kArgErr;
     name[0] = 0;
     if (!FIsAbsPath(path)) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         std::string text;
         bool shortcut = false;
         const MgErr err = MakeName(*path, text, shortcut);

@@ -106,7 +106,7 @@ MgErr PathRef::ConvertToString(StringType* out, const char* formatName) const {
     const TextFormat* format = FindFormat(formatName);
     if (!format) return kUnsupportedErr;
     if (format == &kCommandLine && (ItemCount() == 0 || !IsValid())) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         if (ReadCachedText(*this, *format, *out)) return kNoErr;
         const MgErr err = format->write(*this, *out);
         if (!err && mPathElement) CacheText(*this, *format, *out);

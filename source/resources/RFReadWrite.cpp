@@ -382,7 +382,7 @@ RFReadWrite* CreateRFReadWrite() {
 
 MgErr RGetStringStd(RsrcFile refnum, std::string* text, int32 id) {
     if (!text) return kArgErr;
-    return ReadLocked(refnum, [&](RFReader& reader) -> MgErr {
+    return ReadLocked(refnum, [&](RFReader& reader) {
         Str255 string;
         if (const MgErr err = reader.GetPStr(id, string)) return err;
         return AssignText({string + 1, string[0]}, text);
@@ -391,7 +391,7 @@ MgErr RGetStringStd(RsrcFile refnum, std::string* text, int32 id) {
 
 MgErr RGetIndexStringStd(RsrcFile refnum, std::string* text, int32 id, int32 index) {
     if (!text) return kArgErr;
-    return ReadLocked(refnum, [&](RFReader& reader) -> MgErr {
+    return ReadLocked(refnum, [&](RFReader& reader) {
         Str255 string;
         if (const MgErr err = reader.GetIndString(string, id, index)) return err;
         return AssignText({string + 1, string[0]}, text);
@@ -400,7 +400,7 @@ MgErr RGetIndexStringStd(RsrcFile refnum, std::string* text, int32 id, int32 ind
 
 MgErr RGetIndexLongStringStd(RsrcFile refnum, std::string* text, int32 id, int32 index, ResType type) {
     if (!text) return kArgErr;
-    return ReadLocked(refnum, [&](RFReader& reader) -> MgErr {
+    return ReadLocked(refnum, [&](RFReader& reader) {
         Bytes list;
         if (const MgErr err = FindBytes(reader, type, id, &list)) return err;
         if (const MgErr err = FindLongString(&list, index)) return err;
@@ -410,7 +410,7 @@ MgErr RGetIndexLongStringStd(RsrcFile refnum, std::string* text, int32 id, int32
 
 MgErr RGetLongStringStd(RsrcFile refnum, std::string* text, int32 id) {
     if (!text) return kArgErr;
-    return ReadLocked(refnum, [&](RFReader& reader) -> MgErr {
+    return ReadLocked(refnum, [&](RFReader& reader) {
         Bytes data;
         if (const MgErr err = FindBytes(reader, kStringType, id, &data)) return err;
         int32 count = 0;

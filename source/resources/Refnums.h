@@ -31,7 +31,7 @@ void ForgetRefnumsOf(const ResChain* chain);
 // other thread closes the file in between.
 template <class Read>
 MgErr ReadLocked(RsrcFile refnum, Read read) {
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         ResFileLock lock;
         RFReader reader(refnum);
         return read(reader);

@@ -129,7 +129,7 @@ MgErr ResFileFactory::ROpenPath(Path path, int32 mode, ResFile** file, _FMFileTy
     if (!file) return kArgErr;
     *file = nullptr;
     if (const MgErr err = CheckMode(mode)) return err;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         auto io = std::make_unique<OVResfileIO>();
         if (const MgErr err = io->OpenPath(path, mode == kROpenReadOnly, kFDenyWrite)) return err;
         return OpenOver(std::move(io), file, type, creator);
@@ -141,7 +141,7 @@ MgErr ResFileFactory::ROpenFileref(File_t* fileRef, int32 mode, ResFile** file, 
     if (!file) return kArgErr;
     *file = nullptr;
     if (!fileRef || CheckMode(mode)) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         auto io = std::make_unique<OVResfileIO>();
         io->UseFile(fileRef, mode == kROpenReadOnly);
         return OpenOver(std::move(io), file, type, creator);
@@ -154,7 +154,7 @@ MgErr ResFileFactory::ROpenMemFile(UHandle image, int32 mode, ResFile** file, _F
     *file = nullptr;
     if (!image || CheckMode(mode)) return kArgErr;
     if (const MgErr err = DSCheckHandle(image)) return err;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         auto io = std::make_unique<OVResfileIO>();
         io->UseHandle(image, mode == kROpenReadOnly);
         OVResfileIO* source = io.get();
@@ -171,7 +171,7 @@ MgErr ResFileFactory::ROpenMemFile(const void* image, uint32 size, ResFile** fil
     if (!file) return kArgErr;
     *file = nullptr;
     if (!image) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         auto io = std::make_unique<OVResfileIO>();
         io->UseMemory(image, size);
         return OpenOver(std::move(io), file, type, creator);
@@ -181,7 +181,7 @@ MgErr ResFileFactory::ROpenMemFile(const void* image, uint32 size, ResFile** fil
 MgErr ResFileFactory::RCreateMemFile(ResFile** file, _FMFileCreator creator, _FMFileType type) {
     if (!file) return kArgErr;
     *file = nullptr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         auto made = std::make_unique<OVResFile>();
         if (const MgErr err = made->CreateInMemory(type, creator)) return err;
         *file = made.release();
@@ -204,7 +204,7 @@ MgErr ResFileFactory::RChain(ResChain** chain, int32 count, ResFile* const* file
     if (!chain) return kArgErr;
     *chain = nullptr;
     if (count < 0 || (count && !files)) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         OVResChain::Files list;
         for (int32 i = 0; i < count; ++i) {
             if (files[i]) list.push_back(files[i]);

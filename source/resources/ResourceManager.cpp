@@ -296,7 +296,7 @@ MgErr RChain(RsrcFile* refnum, int32 count, const RsrcFile* files) {
     if (!refnum) return kArgErr;
     *refnum = 0;
     if (count < 0 || (count && !files)) return kArgErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         ResFileLock lock;
         std::vector<ResFile*, TrackedAllocator<ResFile*>> open;
         for (int32 i = 0; i < count; ++i) {

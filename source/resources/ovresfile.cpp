@@ -279,7 +279,7 @@ MgErr OVResFile::RGet(ResType type, int32 id, Resource** resource) {
     if (!open_) return kNotResFileErr;
     ResourceEntry* entry = map_.FindEntry(type, id);
     if (!entry) return kResNotFoundErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         OVResource* loaded = nullptr;
         const MgErr err = Load(type, entry, &loaded);
         *resource = loaded;
@@ -385,7 +385,7 @@ MgErr OVResFile::RGetInd(ResType type, int32 index, Resource** resource) {
     if (!open_) return kNotResFileErr;
     const TypeEntry* list = map_.FindType(type);
     if (!list || index < 1 || index > ResourceMap::CountOf(list)) return kResNotFoundErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         OVResource* loaded = nullptr;
         const MgErr err = Load(type, map_.Entries(list) + (index - 1), &loaded);
         *resource = loaded;

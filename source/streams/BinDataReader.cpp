@@ -143,7 +143,7 @@ void BinDataReader::ReadPStrAsNarrow(std::string& out, uint32 align) {
 void BinDataReader::Store(std::string& out, const uint8* bytes, uint32 count) {
     out.clear();
     if (!bytes) return;
-    SetError(Guarded([&]() -> MgErr {
+    SetError(Guarded([&] {
         out.assign(reinterpret_cast<const char*>(bytes), count);
         return kNoErr;
     }));

@@ -231,7 +231,7 @@ MgErr FormattedText::Format(const char* format, size_t length, va_list args) {
     };
     length_ = run(short_, sizeof short_);
     if (length_ < sizeof short_) return kNoErr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         const size_t needed = run(nullptr, 0);
         if (needed > INT32_MAX - LStrSize(1)) return kMemFullErr;
         long_.resize(needed + 1);  // one more, which shows that the text has grown

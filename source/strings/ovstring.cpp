@@ -467,7 +467,7 @@ MgErr OVSubString::AppendBSTR(const char16_t* source, int32 length) {
 
 MgErr OVSubString::SearchReplace(const OVSubString& find, const OVSubString& replacement, int32* count) {
     int32 found = 0;
-    const MgErr err = Search(find, 0) < 0 ? kNoErr : Guarded([&]() -> MgErr {
+    const MgErr err = Search(find, 0) < 0 ? kNoErr : Guarded([&] {
         std::string result;
         found = ReplaceEvery(CharactersOf(bytes_, length_), CharactersOf(find.bytes_, find.length_),
                              CharactersOf(replacement.bytes_, replacement.length_), result);

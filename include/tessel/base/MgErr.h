@@ -44,11 +44,16 @@ typedef int32 MgErr;
     X(kRegistryErr, 4000, "a registry call failed")                                            \
     X(kRegistryTypeErr, 4011, "registry value is not of a string type")
 
-enum {
-#define TESSEL_MGERR_CONSTANT(name, code, meaning) name = code,
-    TESSEL_MGERR_LIST(TESSEL_MGERR_CONSTANT)
+// The constants have the type of a result in C++, so that what returns one needs no result type of its own; C, which
+// has no typed constants, gets an enumeration.
+#ifdef __cplusplus
+#    define TESSEL_MGERR_CONSTANT(name, code, meaning) inline constexpr MgErr name = code;
+TESSEL_MGERR_LIST(TESSEL_MGERR_CONSTANT)
+#else
+#    define TESSEL_MGERR_CONSTANT(name, code, meaning) name = code,
+enum { TESSEL_MGERR_LIST(TESSEL_MGERR_CONSTANT) };
+#endif
 #undef TESSEL_MGERR_CONSTANT
-};
 
 TESSEL_BEGIN_C
 

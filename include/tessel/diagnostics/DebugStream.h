@@ -61,10 +61,14 @@ private:
 TESSEL_API void ToDebugStream(DebugStream& stream, char byte);
 TESSEL_API void ToDebugStream(DebugStream& stream, CStr text);
 TESSEL_API void ToDebugStream(DebugStream& stream, std::string_view text);
-TESSEL_API void ToDebugStream(DebugStream& stream, const LStr* text);        // the bytes; null appends nothing
-TESSEL_API void ToDebugStream(DebugStream& stream, LStrHandle text);         // the bytes; null appends nothing
-TESSEL_API void ToDebugStream(DebugStream& stream, const LStrHandle* text);  // the bytes; null appends nothing
-TESSEL_API void ToDebugStream(DebugStream& stream, short value);             // decimal, as all integers
+// The bytes; null appends nothing.
+TESSEL_API void ToDebugStream(DebugStream& stream, const LStr* text);
+// The bytes; null appends nothing.
+TESSEL_API void ToDebugStream(DebugStream& stream, LStrHandle text);
+// The bytes; null appends nothing.
+TESSEL_API void ToDebugStream(DebugStream& stream, const LStrHandle* text);
+// Decimal, as all integers.
+TESSEL_API void ToDebugStream(DebugStream& stream, short value);
 TESSEL_API void ToDebugStream(DebugStream& stream, int value);
 TESSEL_API void ToDebugStream(DebugStream& stream, long value);
 TESSEL_API void ToDebugStream(DebugStream& stream, long long value);
@@ -73,11 +77,14 @@ TESSEL_API void ToDebugStream(DebugStream& stream, unsigned short value);
 TESSEL_API void ToDebugStream(DebugStream& stream, unsigned int value);
 TESSEL_API void ToDebugStream(DebugStream& stream, unsigned long value);
 TESSEL_API void ToDebugStream(DebugStream& stream, unsigned long long value);
-TESSEL_API void ToDebugStream(DebugStream& stream, float value);            // six digits after the point
-TESSEL_API void ToDebugStream(DebugStream& stream, double value);           // six digits after the point
+// Six digits after the point.
+TESSEL_API void ToDebugStream(DebugStream& stream, float value);
+// Six digits after the point.
+TESSEL_API void ToDebugStream(DebugStream& stream, double value);
 TESSEL_API void ToDebugStream(DebugStream& stream, const cmplx64& value);   ///< "(re, im)"
 TESSEL_API void ToDebugStream(DebugStream& stream, const cmplx128& value);  ///< "(re, im)"
-TESSEL_API void ToDebugStream(DebugStream& stream, void (*function)());     // the address, upper-case hexadecimal
+// The address, upper-case hexadecimal.
+TESSEL_API void ToDebugStream(DebugStream& stream, void (*function)());
 
 template <class R, class... A>
 void ToDebugStream(DebugStream& stream, R (*function)(A...)) {

@@ -106,6 +106,7 @@ TESSEL_BEGIN_C
 // kFileInUseErr. kArgErr: an unknown mode, a volume, or a path that is not absolute. *file is null on failure. Close
 // with FMClose.
 TESSEL_API MgErr FMOpen(File_t** file, Path path, int32 openMode, int32 denyMode);
+// Closes the file; the pointer is dead then. kArgErr for null.
 TESSEL_API MgErr FMClose(File_t* file);
 
 // Reads up to `count` bytes. *actual (may be null) receives what was read, also on failure. kEOFErr: fewer than asked.
@@ -125,16 +126,21 @@ TESSEL_API MgErr FFlush(File_t* file);
 // Moves the position. kEOFErr when it would fall before the start (it is then 0) or beyond the end (it is then the
 // end).
 TESSEL_API MgErr FMSeek64(File_t* file, int64 offset, int32 mode);
+// Moves the position, as FMSeek64 with a 32-bit offset.
 TESSEL_API MgErr FMSeek(File_t* file, int32 offset, int32 mode);
 
 // The position, and the size; the 32-bit forms give the low half.
 TESSEL_API MgErr FMTell64(File_t* file, int64* position);
+// The low 32 bits of the position.
 TESSEL_API MgErr FMTell(File_t* file, uint32* position);
+// The size in bytes.
 TESSEL_API MgErr FGetEOF64(File_t* file, uint64* size);
+// The low 32 bits of the size in bytes.
 TESSEL_API MgErr FGetEOF(File_t* file, uint32* size);
 
 // Cuts or extends (with zero bytes) the file. The position stays, unless it would lie beyond the new end.
 TESSEL_API MgErr FSetEOF64(File_t* file, int64 size);
+// Cuts or extends (with zero bytes) the file, as FSetEOF64.
 TESSEL_API MgErr FSetEOF(File_t* file, int32 size);
 
 // Locks (`lock` not 0) or unlocks a range of bytes against other processes. `mode`: what the offset is measured from.
@@ -148,6 +154,7 @@ TESSEL_API int32 FPrintf(File_t* file, CStr format, ...);
 // The same with a result: kFormatErr for a bad format, kMemFullErr, kGenericErr when the arguments' texts changed
 // meanwhile (nothing is written then), else that of the write.
 TESSEL_API MgErr FPrintfWErr(File_t* file, CStr format, ...);
+// The same from an argument list.
 TESSEL_API MgErr FPrintfWErrv(File_t* file, CStr format, va_list args);
 
 // ---- errors ---------------------------------------------------------------------------------------------------------
@@ -167,6 +174,7 @@ TESSEL_API MgErr FCreateAlways(File_t** file, Path path, int32 unused1, int32 op
 // Copies a file; kExistsErr when `to` exists, kArgErr when `from` is a volume. FCopy follows shortcuts in `from`, the
 // other form only when `resolve` is not 0.
 TESSEL_API MgErr FCopy(Path from, Path to);
+// Copies a file; shortcuts in `from` are followed when `resolve` is not 0.
 TESSEL_API MgErr FCopyResolve(Path from, Path to, int32 resolve);
 
 // Renames or moves a file or folder; `to` must not exist. When the current directory lies inside `from`, the parent of
@@ -198,7 +206,9 @@ TESSEL_API int32 FExists(Path path);
 // What is known about an item; `mask` says which fields are wanted (kFInfo...). Shortcuts are followed by FGetInfo64
 // and FGetInfo, and by FGetInfoResolve when `resolve` is not 0. FGetInfo fills all, and reports sizes that do not fit.
 TESSEL_API MgErr FGetInfoResolve(Path path, FInfo64Rec* info, int32 resolve, uint8 mask);
+// What is known about an item, shortcuts followed; `mask` says which fields (kFInfo...).
 TESSEL_API MgErr FGetInfo64(Path path, FInfo64Rec* info, int32 mask);
+// All that is known about an item, shortcuts followed; sizes that do not fit are reported.
 TESSEL_API MgErr FGetInfo(Path path, FInfoRec* info);
 
 // Applies the permissions and both dates of a file. A record of a folder changes nothing.
@@ -221,10 +231,12 @@ TESSEL_API MgErr FMakeFileNotReadOnly(Path path);
 
 // *isHidden or *isShortcut become 1 or 0. A shortcut is a file whose name ends in ".lnk".
 TESSEL_API MgErr FIsHiddenFile(Path path, int32* isHidden);
+// *isShortcut becomes 1 for a file whose name ends in ".lnk", else 0.
 TESSEL_API MgErr FIsShortcut(Path path, int32* isShortcut);
 
 // Always 0.
 TESSEL_API int32 FIsSpecialFile(Path path);
+// Always 0.
 TESSEL_API int32 FEject(Path path);
 
 // Modification date in seconds since 1904-01-01 UTC, and 1 in *readOnly (may be null) for a read-only item. From `file`
@@ -265,6 +277,7 @@ TESSEL_API MgErr Win32GetLongFileName(Path path);
 // The current directory of the process, and the system's temporary folder (the application's when there is none).
 // path is made when it is null.
 TESSEL_API MgErr GetWorkingDir(Path* path);
+// The system's temporary folder, or the application's when there is none. *path is made when it is null.
 TESSEL_API MgErr FGetStdTmpDirPath(Path* path);
 
 // `out` becomes the parent of `path`. kArgErr for a path without names, or that is only a server.
@@ -273,8 +286,11 @@ TESSEL_API MgErr FDirName(Path path, Path out);
 // The file type that belongs to the extension of a name, 0 for none; adding the extension of a type; and taking one off
 // (of any type when `type` is 0), which returns the number of bytes removed.
 TESSEL_API _FMFileType HasRezExt(Path path);
+// The file type that belongs to the extension of a name, 0 for none.
 TESSEL_API _FMFileType PStrHasRezExt(ConstPStr name);
+// Adds the extension of a file type to the name.
 TESSEL_API MgErr PStrAppendRezExt(PStr name, _FMFileType type);
+// Takes the extension of a type (0: of any) off, and returns the number of bytes removed.
 TESSEL_API int32 PStrStripRezExt(PStr name, _FMFileType type);
 
 // ---- names of the host system ---------------------------------------------------------------------------------------

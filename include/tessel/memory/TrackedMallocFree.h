@@ -33,6 +33,7 @@ namespace tessel {
 // operator new and operator delete over the functions above: 0 bytes give a block of their own, out of memory throws
 // std::bad_alloc whose text is "bad allocation". The forms of a class or a program that replaces its own.
 TESSEL_API void* TrackedNew(size_t size);
+// The same without raising: null when there is no memory.
 TESSEL_API void* TrackedNewNoThrow(size_t size) noexcept;
 
 // Base of classes whose objects are tracked when made with new.

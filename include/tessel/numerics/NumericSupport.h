@@ -36,7 +36,9 @@ TESSEL_API uint8 SetFxSize(uint8 size);
 // is stored. Any thread.
 TESSEL_API void ConvertNum(int16 sourceCode, const void* source, int16 destinationCode, void* destination);
 
+// The smaller of two.
 TESSEL_API int32 Min(int32 a, int32 b);
+// The larger of two.
 TESSEL_API int32 Max(int32 a, int32 b);
 
 // |a|; of -2147483648 it is -2147483648.

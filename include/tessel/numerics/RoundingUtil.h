@@ -30,8 +30,11 @@ TESSEL_API int32 RndToInc(int32 x, int32 increment);
 // The nearest integer, halves to the even neighbour. A value outside the range gives the nearer limit, a NaN the
 // maximum.
 TESSEL_API int32 RndToNearest(double x);
+// The nearest 64-bit integer, halves to even, saturating; the maximum for a NaN.
 TESSEL_API int64 RndToNearestI64(double x);
+// The nearest unsigned integer, halves to even; 0 below the range, the maximum above it and for a NaN.
 TESSEL_API uint32 RndToNearestU32(double x);
+// The nearest unsigned 64-bit integer, halves to even; 0 below the range, the maximum above it and for a NaN.
 TESSEL_API uint64 RndToNearestU64(double x);
 
 // The value, rounded as every real result is.
@@ -39,12 +42,19 @@ TESSEL_API double UInt64ToFloat64(uint64 value);
 
 // The same rule as RndToNearest, for every width: nearest, halves to even, saturating, a NaN gives the maximum.
 TESSEL_API int8 Float64ToInt8(double x);
+// The nearest int16, halves to even, saturating; the maximum for a NaN.
 TESSEL_API int16 Float64ToInt16(double x);
+// The nearest int32, halves to even, saturating; the maximum for a NaN.
 TESSEL_API int32 Float64ToInt32(double x);
+// The nearest int64, halves to even, saturating; the maximum for a NaN.
 TESSEL_API int64 Float64ToInt64(double x);
+// The nearest uint8, halves to even, saturating; the maximum for a NaN.
 TESSEL_API uint8 Float64ToUInt8(double x);
+// The nearest uint16, halves to even, saturating; the maximum for a NaN.
 TESSEL_API uint16 Float64ToUInt16(double x);
+// The nearest uint32, halves to even, saturating; the maximum for a NaN.
 TESSEL_API uint32 Float64ToUInt32(double x);
+// The nearest uint64, halves to even, saturating; the maximum for a NaN.
 TESSEL_API uint64 Float64ToUInt64(double x);
 
 TESSEL_END_C

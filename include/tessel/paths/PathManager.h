@@ -33,11 +33,13 @@ TESSEL_API Path FMakePath(Path path, int32 type, ConstPStr name, ...);
 TESSEL_API MgErr FAppendName(Path path, ConstPStr name);
 
 TESSEL_API MgErr FPathCpy(Path dst, Path src);
-TESSEL_API MgErr FPathToPath(Path* path);  // replaces *path by a new copy; the old one stays its owner's
+// Replaces *path by a new copy; the old one stays its owner's.
+TESSEL_API MgErr FPathToPath(Path* path);
 
 // Destroys *path and sets it to null.
 TESSEL_API void FDestroyPath(Path* path);
-TESSEL_API MgErr FDisposePath(Path path);  // deprecated
+// Deprecated.
+TESSEL_API MgErr FDisposePath(Path path);
 
 // Puts the names under another base; any type but not-a-path.
 TESSEL_API MgErr FSetPathType(Path path, int32 type);
@@ -48,15 +50,19 @@ TESSEL_API MgErr FNormalizePath(Path path);
 // ---- inspection -----------------------------------------------------------------------------------------------------
 
 TESSEL_API MgErr FGetPathType(Path path, int32* type);
-TESSEL_API int16 PathType(Path path);  // kPathNotAPath for null
+// kPathNotAPath for null.
+TESSEL_API int16 PathType(Path path);
 
 TESSEL_API bool FIsAPath(Path path);
 TESSEL_API bool FIsAPathOrNotAPath(Path path);
 TESSEL_API bool FIsAPathOfType(Path path, int32 type);
-TESSEL_API bool FIsAbsPath(Path path);  // absolute or UNC
+// Absolute or UNC.
+TESSEL_API bool FIsAbsPath(Path path);
 TESSEL_API bool FIsEmptyPath(Path path);
-TESSEL_API bool FIsSanePath(Path path);  // checks every element, and reports what is wrong
-TESSEL_API bool FIsCDUp(Path path);      // holds an up-directory element
+// Checks every element, and reports what is wrong.
+TESSEL_API bool FIsSanePath(Path path);
+// Holds an up-directory element.
+TESSEL_API bool FIsCDUp(Path path);
 
 // Number of names. For null FDepth is -1, as for an invalid path, and PathCnt is 0.
 TESSEL_API int32 FDepth(Path path);
@@ -86,7 +92,8 @@ TESSEL_API void FGetFileExtension(CStr name, char* extension);
 
 // ---- comparison -----------------------------------------------------------------------------------------------------
 
-TESSEL_API bool FPathEqual(Path a, Path b);  // ignores case; false if either is null, unless they are the same
+// Ignores case; false if either is null, unless they are the same.
+TESSEL_API bool FPathEqual(Path a, Path b);
 
 // 0 when equal; on one base the magnitude is one more than the number of leading names in common, and it is negative
 // when a comes first. FPathCmpLexical ignores case, and has null come last; FPathCmpExact has it come first.

@@ -44,8 +44,10 @@ TESSEL_API MgErr FPathToText(Path path, LStrPtr text);
 TESSEL_API MgErr FPathToDSString(Path path, LStrHandle* text);
 TESSEL_API MgErr FPathToAZString(Path path, LStrHandle* text);
 TESSEL_API MgErr FPathToFileSystemDSString(Path path, LStrHandle* text);
-TESSEL_API MgErr FPathToUnixString(Path path, LStrHandle* text);  // /C/dir/file; a zero byte follows
-TESSEL_API MgErr FPathToStringRTF(Path path, LStrHandle* text);   // display text with every backslash doubled
+// /C/dir/file; a zero byte follows.
+TESSEL_API MgErr FPathToUnixString(Path path, LStrHandle* text);
+// Display text with every backslash doubled.
+TESSEL_API MgErr FPathToStringRTF(Path path, LStrHandle* text);
 
 // Display text as a terminated string: in a new handle (null on failure), or in a new pointer block of 264 bytes
 // (kMemFullErr when it is longer than 260). The caller disposes of it.
@@ -53,7 +55,8 @@ TESSEL_API UHandle PathToCString(Path path);
 TESSEL_API UHandle PathToCStringEx(Path path, int32 unused);
 TESSEL_API MgErr FPathToMaxCString(Path path, UPtr* text);
 
-TESSEL_API MgErr FPathToURL(Path path, LStrHandle* text);  // kNotFoundErr, always
+// kNotFoundErr, always.
+TESSEL_API MgErr FPathToURL(Path path, LStrHandle* text);
 
 // The form that is the same on every host: /C/dir/file. Null text reads as the empty path.
 TESSEL_API MgErr ConvertPathToPlatformIndependentText(Path path, LStrHandle* text);

@@ -10,9 +10,12 @@ TESSEL_BEGIN_C
 
 // In place; the value may lie at any address. A null pointer is not allowed. Any thread.
 TESSEL_API void SwapBW(void* value16);  // exchanges the two bytes of a 16-bit value
-TESSEL_API void SwapWL(void* value32);  // exchanges the two 16-bit halves of a 32-bit value
-TESSEL_API void RevBL(void* value32);   // reverses the four bytes of a 32-bit value
-TESSEL_API void RevBQ(void* value64);   // reverses the eight bytes of a 64-bit value
+// Exchanges the two 16-bit halves of a 32-bit value.
+TESSEL_API void SwapWL(void* value32);
+// Reverses the four bytes of a 32-bit value.
+TESSEL_API void RevBL(void* value32);
+// Reverses the eight bytes of a 64-bit value.
+TESSEL_API void RevBQ(void* value64);
 
 TESSEL_END_C
 

@@ -13,6 +13,7 @@ using BSTR = char16_t*;
 // A new string of `length` units, copied from text (null leaves them unset). The caller frees it with BSTRFree. Null
 // when memory is short.
 TESSEL_API BSTR BSTRAlloc(const char16_t* text, uint32 length);
+// Frees a string that BSTRAlloc made.
 TESSEL_API void BSTRFree(BSTR text);
 
 // Length in 16-bit units.

@@ -19,6 +19,7 @@ TESSEL_API PStr CPStrIndex(CPStrHandle list, int32 i);
 
 // Compares element by element with PStrCmp, then the counts.
 TESSEL_API int32 CPStrCmp(const CPStr* a, const CPStr* b);
+// Whether counts and elements are the same.
 TESSEL_API bool CPStrEqual(const CPStr* a, const CPStr* b);
 
 // Empties the list. kArgErr for null.
@@ -31,10 +32,12 @@ TESSEL_API MgErr CPStrSetToNEmptyStrings(CPStrHandle* list, int32 n);
 // Inserts before element `index`, brought into 0 ... count. CPStrInsert is exact. The element may lie in the list.
 // Null inputs are reported and give kGenericErr.
 TESSEL_API MgErr CPStrInsert(CPStrHandle list, ConstPStr element, int32 index);
+// The same; `exact` says whether the handle is left exactly as large as the list.
 TESSEL_API MgErr CPStrInsertEfficient(CPStrHandle list, ConstPStr element, int32 index, bool exact);
 
 // Removes or replaces element `index`, brought into 0 ... count - 1. kArgErr for null inputs and for an empty list.
 TESSEL_API MgErr CPStrRemove(CPStrHandle list, int32 index);
+// Replaces element `index`, brought into 0 ... count - 1. kArgErr for null inputs and for an empty list.
 TESSEL_API MgErr CPStrReplace(CPStrHandle list, ConstPStr element, int32 index);
 
 // A comparison of a key with an element, for example PStrCmp or PStrCaseCmp; 0 means that they match.

@@ -17,11 +17,14 @@ TESSEL_BEGIN_C
 // The first difference of bytes, else of lengths. A null pointer is below every text that is not empty (-1, 1). The
 // Case forms compare a differing pair after ToLower.
 TESSEL_API int32 LStrCmp(const LStr* a, const LStr* b);
+// As LStrCmp, but a differing pair is compared after ToLower.
 TESSEL_API int32 LStrCaseCmp(const LStr* a, const LStr* b);
+// Whether lengths and bytes are the same.
 TESSEL_API bool LStrEqual(const LStr* a, const LStr* b);
 
 // The same on handles; when either text is empty, the difference of lengths.
 TESSEL_API int32 LHStrCmp(LStrHandle a, LStrHandle b);
+// As LHStrCmp, but a differing pair is compared after ToLower.
 TESSEL_API int32 LHStrCaseCmp(LStrHandle a, LStrHandle b);
 TESSEL_API bool LHStrEqual(LStrHandle a, LStrHandle b);
 
@@ -83,6 +86,7 @@ TESSEL_API MgErr LStrHNullTerminate(LStrHandle handle);
 
 // Map the text in place. A null handle is left alone.
 TESSEL_API void LStrToUpper(LStrHandle handle);
+// Maps the text in place to lower case. A null handle is left alone.
 TESSEL_API void LStrToLower(LStrHandle handle);
 
 TESSEL_END_C

@@ -28,11 +28,13 @@ TESSEL_API PStr PStrDup(ConstPStr s);
 
 // Conversions; both return the length. PToCStr writes up to 256 bytes; CToPStr cuts at 255.
 TESSEL_API int32 PToCStr(ConstPStr src, char* dst);
+// Copies a terminated text, cut at 255 bytes; returns the length.
 TESSEL_API int32 CToPStr(CStr src, PStr dst);
 
 // Writes a 0 after the text and returns the length. Of a 255-byte text PStrNullTerminate overwrites the last byte, its
 // length byte unchanged; PStrTerminateIfPossible leaves it alone.
 TESSEL_API int32 PStrNullTerminate(PStr s);
+// Writes a 0 after the text unless it has 255 bytes; returns the length.
 TESSEL_API int32 PStrTerminateIfPossible(PStr s);
 
 // ---- comparison -----------------------------------------------------------------------------------------------------
@@ -40,12 +42,19 @@ TESSEL_API int32 PStrTerminateIfPossible(PStr s);
 // The first difference of bytes, else of lengths. The Case forms compare a differing pair after ToLower. The PPStr
 // forms take pointers to PStrs, as a sort over an array of them does.
 TESSEL_API int32 PStrCmp(ConstPStr a, ConstPStr b);
+// As PStrCmp, but a differing pair is compared after ToLower.
 TESSEL_API int32 PStrCaseCmp(ConstPStr a, ConstPStr b);
+// Whether lengths and bytes are the same.
 TESSEL_API bool PStrEqual(ConstPStr a, ConstPStr b);
+// Whether the texts are equal after ToLower.
 TESSEL_API bool PStrCaseEqual(ConstPStr a, ConstPStr b);
+// PStrCmp of what the pointers point to.
 TESSEL_API int32 PPStrCmp(const ConstPStr* a, const ConstPStr* b);
+// PStrCaseCmp of what the pointers point to.
 TESSEL_API int32 PPStrCaseCmp(const ConstPStr* a, const ConstPStr* b);
+// PStrEqual of what the pointers point to.
 TESSEL_API bool PPStrEqual(const ConstPStr* a, const ConstPStr* b);
+// PStrCaseEqual of what the pointers point to.
 TESSEL_API bool PPStrCaseEqual(const ConstPStr* a, const ConstPStr* b);
 
 // ---- searching and splitting ----------------------------------------------------------------------------------------

@@ -15,8 +15,10 @@ TESSEL_BEGIN_C
 // The name of an architecture (0 to 10), "<unknown value>" for any other. Constant text.
 TESSEL_API CStr GetCPUArchName(int32 arch);
 
-TESSEL_API void InitCPUInformation(void);    // nothing: CPUInfo builds it
-TESSEL_API void UninitCPUInformation(void);  // destroys what CPUInfo built
+// Nothing: CPUInfo builds it.
+TESSEL_API void InitCPUInformation(void);
+// Destroys what CPUInfo built.
+TESSEL_API void UninitCPUInformation(void);
 
 TESSEL_END_C
 

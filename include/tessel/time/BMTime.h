@@ -69,6 +69,7 @@ private:
 
 // From a count of 100 ns since 1601; to double precision, about half a microsecond these days.
 TESSEL_API ATime128 ATime128FromHILOTime(const uint32& high, const uint32& low);
+// From a FILETIME, to double precision.
 TESSEL_API ATime128 ATime128FromFILETIME(const FILETIME& fileTime);
 
 // Rounded down to 100 ns.

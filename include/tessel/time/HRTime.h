@@ -20,6 +20,7 @@ TESSEL_API void HRTimeZero(_HRTime* t);
 
 // *out = a + b, or a - b, modulo 2^64. `out` may be an operand.
 TESSEL_API void HRTimeAdd(const _HRTime* a, const _HRTime* b, _HRTime* out);
+// *out = a - b, modulo 2^64. `out` may be an operand.
 TESSEL_API void HRTimeSubtract(const _HRTime* a, const _HRTime* b, _HRTime* out);
 
 // 1 when a > b, -1 when a < b, else 0; as unsigned counts.

@@ -11,7 +11,8 @@ TESSEL_BEGIN_C
 // Seeds the process-wide generator from the clock and makes its lock; before and after all its numbers are 0.
 // kMemFullErr when the lock cannot be made. Both for start and stop: no other thread may be using the generator.
 TESSEL_API MgErr InitRandomGen(void);
-TESSEL_API MgErr UninitRandomGen(void);  // always kNoErr
+// Always kNoErr.
+TESSEL_API MgErr UninitRandomGen(void);
 
 // The next number of the process-wide generator. Any thread.
 TESSEL_API void RandomGen(double* out);

@@ -39,7 +39,8 @@ TESSEL_API CStr GetPrefsPath(void);
 // args (not `first`) and frees it with the other function; null and a count of 0 when there is no memory, and
 //    nothing is made where one of the outputs is null. A null line is empty.
 TESSEL_API void NewCommandLineArgsFromSingleLine(CStr line, char* first, int32* count, char*** args);
-TESSEL_API void DeleteCommandLineArgsFromSingleLine(int32 count, char** args);  // null is fine
+// Null is fine.
+TESSEL_API void DeleteCommandLineArgsFromSingleLine(int32 count, char** args);
 
 // Whether an argument is the library's own, for hosts that walk their arguments. For "-pref", *index moves on to the
 // value, which is to be skipped too.
