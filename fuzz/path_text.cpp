@@ -8,7 +8,7 @@
 #include <tessel/frame/TesselInit.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 
 #include <cstdlib>
 #include <memory>

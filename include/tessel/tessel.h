@@ -49,7 +49,7 @@
 #include <tessel/paths/PathCachedItem.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 #include <tessel/registry/WinRegistry.h>
 #include <tessel/resources/RFReadWrite.h>
 #include <tessel/resources/ResourceManager.h>

@@ -63,7 +63,7 @@ using namespace tessel;
 MgErr FMOpen(File_t** file, Path path, int32 openMode, int32 denyMode) {
     if (!file) return kArgErr;
     *file = nullptr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         OpenRequest request;
         if (const MgErr err = request.Check(path, openMode, denyMode)) return err;
         const auto disposition = openMode == kFOpenWriteTrunc ? platform::Disposition::kTruncateExisting

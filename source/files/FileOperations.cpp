@@ -8,7 +8,7 @@
 #include <tessel/files/FileManager.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 
 namespace tessel {
 
@@ -108,7 +108,7 @@ using namespace tessel;
 MgErr FGenericCreate(File_t** file, Path path, int32, int32 openMode, int32 denyMode, int32, int32 always) {
     if (!file) return kArgErr;
     *file = nullptr;
-    return Guarded([&]() -> MgErr {
+    return Guarded([&] {
         OpenRequest request;
         if (const MgErr err = request.Check(path, openMode, denyMode)) return err;
         const auto disposition = always ? platform::Disposition::kCreateAlways : platform::Disposition::kCreateNew;

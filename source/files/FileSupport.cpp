@@ -3,7 +3,7 @@
 #include "files/Service.h"
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 #include <tessel/sync/ThMutex.h>
 
 namespace tessel {

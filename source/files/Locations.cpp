@@ -9,7 +9,7 @@
 #include <tessel/files/shortcut.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 #include <tessel/strings/StringPStr.h>
 
 #include <algorithm>

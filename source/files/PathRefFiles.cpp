@@ -10,7 +10,7 @@
 #include <tessel/paths/PathCachedItem.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 
 #include <memory>
 #include <vector>

@@ -2,7 +2,7 @@
 #include "diagnostics/Guarded.h"
 #include "paths/PathSteps.h"
 #include <tessel/paths/PathRef.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 
 #include <string_view>
 #include <vector>

@@ -1,7 +1,7 @@
 // Paths and lists of file names in formatted text.
 #include "strings/PathText.h"
 #include <tessel/paths/PathManager.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 #include <tessel/strings/StringLStr.h>
 #include <tessel/strings/StringPStr.h>
 

@@ -6,7 +6,7 @@
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathManager.h>
 #include <tessel/paths/PathRef.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 
 #include <algorithm>
 #include <cstring>

@@ -5,7 +5,7 @@
 #include "paths/PathSteps.h"
 #include "paths/ShortcutResolver.h"
 #include <tessel/paths/PathManager.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 
 #include <algorithm>
 #include <cstring>

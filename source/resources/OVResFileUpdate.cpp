@@ -225,7 +225,7 @@ MgErr OVResFile::RUpdateFile() {
     if (!open_) return kNotResFileErr;
     if (!(map_.Head()->fileAttrs & kRFileChanged)) return kNoErr;
     if (!io_ || !io_->CanWrite()) return kNoErr;
-    const MgErr err = Guarded([&]() -> MgErr {
+    const MgErr err = Guarded([&] {
         if (map_.IsEmpty()) return WriteEmpty();
         if (const MgErr rebaseErr = RebaseData()) return rebaseErr;
         return Updating(this).Run();

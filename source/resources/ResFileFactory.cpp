@@ -9,7 +9,7 @@
 #include <tessel/files/FileManager.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathManager.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 #include <tessel/resources/ovresfile.h>
 
 #include <cstring>

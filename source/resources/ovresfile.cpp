@@ -307,7 +307,7 @@ MgErr OVResFile::RGetNamed(ResType type, ConstPStr name, Resource** resource) {
     ResourceEntry* entries = map_.Entries(list);
     for (int32 i = 0, count = ResourceMap::CountOf(list); i < count; ++i) {
         if (entries[i].name == kNoName || !FileNameEqual(map_.NameOf(&entries[i]), name)) continue;
-        return Guarded([&]() -> MgErr {
+        return Guarded([&] {
             OVResource* loaded = nullptr;
             const MgErr err = Load(type, &entries[i], &loaded);
             *resource = loaded;

@@ -5,7 +5,7 @@
 #include <tessel/files/FileManager.h>
 #include <tessel/files/SystemDirs.h>
 #include <tessel/files/shortcut.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 
 #include <cstdlib>
 #include <cstring>

@@ -3,7 +3,7 @@
 #include "platform/CodePage.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathAbbreviation.h>
-#include <tessel/paths/PathText.h>
+#include <tessel/paths/PathTextFormat.h>
 
 namespace tessel {
 namespace {

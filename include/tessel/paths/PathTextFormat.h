@@ -2,8 +2,8 @@
 //
 // Text is in the active code page, and is stepped through by whole characters. Display text is what this library's
 // paths look like: C:\dir\file, ..\file, \\server\share\file. Reading it never looks at the disk. Any thread.
-#ifndef TESSEL_PATHS_PATHTEXT_H
-#define TESSEL_PATHS_PATHTEXT_H
+#ifndef TESSEL_PATHS_PATHTEXTFORMAT_H
+#define TESSEL_PATHS_PATHTEXTFORMAT_H
 
 #include <tessel/base/MgErr.h>
 #include <tessel/base/StringTypes.h>
