@@ -2,6 +2,7 @@
 #ifndef TESSEL_SOURCE_MEMORY_JARRECORD_H
 #define TESSEL_SOURCE_MEMORY_JARRECORD_H
 
+#include "base/Compiler.h"
 #include "memory/PouchTree.h"
 #include <tessel/memory/CookieManager.h>
 #include <tessel/sync/ThMutex.h>
@@ -53,7 +54,7 @@ inline bool IsValid(const CookieEntry* entry, MagicCookie cookie) {
 }
 
 // The entry of a valid cookie, or null.
-inline __attribute__((always_inline)) CookieEntry* Find(const JarRecord& record, MagicCookie cookie) {
+TESSEL_ALWAYS_INLINE CookieEntry* Find(const JarRecord& record, MagicCookie cookie) {
     CookieEntry* entry = record.tree->Find(IndexOf(cookie));
     return entry && IsValid(entry, cookie) ? entry : nullptr;
 }

@@ -1,6 +1,7 @@
 // Goes over a format and renders what its specifiers ask for.
 #include "strings/FmtEngine.h"
 
+#include "base/Compiler.h"
 #include "diagnostics/Guarded.h"
 #include "numerics/NumericAccess.h"
 #include "platform/CodePage.h"
@@ -125,7 +126,7 @@ bool Formatter::Pass() {
 }
 
 // Does what is most frequent; false for everything else. Inlined, so that the output stays in registers.
-[[gnu::always_inline]] inline bool Formatter::PlainConversion(const char* p, FmtOutput& output) {
+TESSEL_ALWAYS_INLINE bool Formatter::PlainConversion(const char* p, FmtOutput& output) {
     if (*p != '%' || end_ - p < 2 || mode_ == Mode::kPositional) return false;
     if (p[1] == 'd' || p[1] == 'u') {
         const int64 value = arguments_.Next(FmtArgType::kInt).integer;
