@@ -1,6 +1,7 @@
 #include "memory/HandleBlock.h"
 
 #include "memory/Heap.h"
+#include "platform/Allocator.h"
 
 #include <algorithm>
 #include <bit>
@@ -22,21 +23,27 @@ Alignment AlignmentFor(uint32 alignment, uint32 offset) {
     return {static_cast<uint16>(power), static_cast<uint16>(rounded)};
 }
 
-// A distance that no block can have is told without following it.
-bool HandleLayout::IsPlaced(UPtr data) const {
+// Whether the header leads back to where the data would be placed there. A distance that no block can have is told
+// without following it.
+bool HandleLayout::IsPlaced(UPtr data, platform::ReadablePages& pages) const {
     constexpr uint32 kMostDistance = sizeof(Alignment) + UINT16_MAX + kMostAlignment;
     const uint32 distance = HeaderOf(data)->distance;
     if (distance == 0) return true;
     if (distance > kMostDistance || distance % sizeof(Alignment) != 0) return false;
+    if (!pages.Cover(BlockOf(data), sizeof(Alignment))) return false;
     const Alignment alignment = AlignmentOf(data);
     return std::has_single_bit(alignment.alignment) && PlaceData(BlockOf(data), alignment) == data;
 }
 
-bool HandleLayout::IsSound(UPtr data) const {
+bool HandleLayout::IsSound(UPtr data, platform::ReadablePages& pages) const {
+    constexpr size_t kMostUnused = 4 << 20;  // a mapped block ends with its last page, which may be a large one
+    if (reinterpret_cast<uintptr_t>(data) % alignof(HandleHeader) != 0) return false;
+    if (!pages.Cover(HeaderOf(data), HeaderRoom())) return false;
     if (room_ != 0 && WritesGuards(GuardKind::kHandle) && !LeadingGuardIsIntact(data)) return false;
-    if (!IsPlaced(data)) return false;
+    if (!IsPlaced(data, pages)) return false;
     const uint32 bytes = BlockSize(SizeOf(data), AlignmentOf(data));
-    return bytes != 0 && bytes <= platform::AllocatedSize(BlockOf(data));
+    const size_t room = platform::AllocatedSizeIfAny(BlockOf(data), pages);
+    return bytes != 0 && bytes <= room && room - bytes <= bytes / 7 + kMostUnused;
 }
 
 UPtr NewGuardedBlock(size_t size, GuardKind kind) {

@@ -92,4 +92,22 @@ std::size_t ReadMemory(const void* from, void* to, std::size_t count) noexcept {
     return total;
 }
 
+bool ReadablePages::CoverPage(std::uintptr_t page) noexcept {
+    std::uintptr_t& known = known_[page % known_.size()];
+    char byte;
+    if (page == 0 || (known != page && ReadMemory(reinterpret_cast<const void*>(page * kPage), &byte, 1) != 1))
+        return false;
+    known = page;
+    return true;
+}
+
+bool ReadablePages::Cover(const void* from, std::size_t count) noexcept {
+    const auto first = reinterpret_cast<std::uintptr_t>(from);
+    if (count == 0) return true;
+    if (first + (count - 1) < first) return false;
+    for (std::uintptr_t page = first / kPage; page <= (first + (count - 1)) / kPage; ++page)
+        if (!CoverPage(page)) return false;
+    return true;
+}
+
 }  // namespace tessel::platform
