@@ -106,7 +106,11 @@ public:
     }
 
 private:
-    bool IsPlaced(UPtr data, platform::ReadablePages& pages) const;
+    struct FoundBlock {
+        void* block;
+        Alignment alignment;
+    };
+    bool FindBlock(UPtr data, uint32 distance, FoundBlock& found, platform::ReadablePages& pages) const;
 
     uint32 room_;
 };

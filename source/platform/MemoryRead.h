@@ -12,13 +12,20 @@ namespace tessel::platform {
 // Goes through the kernel and never traps; about one system call a call. Any thread.
 std::size_t ReadMemory(const void* from, void* to, std::size_t count) noexcept;
 
-// Answers whether memory can be read for a walk over much of it: a page that could be is not asked for again. One for a
-// walk, while nothing is given back to the system. Not shared by threads.
+// The same for a walk over much memory: a page that could be read is not asked for again. One for a walk, while nothing
+// is given back to the system. Not shared by threads.
 class ReadablePages {
 public:
-    bool Cover(const void* from, std::size_t count) noexcept;
+    // All of it or, with the answer false, nothing.
+    bool Read(const void* from, void* to, std::size_t count) noexcept;
+
+    template <class Record>
+    bool Read(const void* from, Record& to) noexcept {
+        return Read(from, &to, sizeof to);
+    }
 
 private:
+    bool Cover(const void* from, std::size_t count) noexcept;
     bool CoverPage(std::uintptr_t page) noexcept;
 
     std::array<std::uintptr_t, 256> known_{};  // numbers of pages, each in the place of its last bits

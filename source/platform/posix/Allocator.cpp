@@ -16,18 +16,13 @@ constexpr std::size_t kWord = sizeof(std::size_t);
 constexpr std::size_t kBlockAlignment = 2 * kWord;
 constexpr std::size_t kBeforeInUse = 1, kMapped = 2, kFlags = 7;  // in the word in front of a block
 
-std::size_t WordAt(const char* address) {
-    return *reinterpret_cast<const std::size_t*>(address);
-}
-
 // Whether the host's allocator keeps the size of a block, with three flags, in the word in front of it.
 bool SizesStandInFront() {
     static const bool inFront = [] {
-        void* volatile made = std::malloc(100);  // volatile: the compiler holds the word in front to be outside
-        void* const block = made;
-        if (!block) return false;
-        const std::size_t word = WordAt(static_cast<const char*>(block) - kWord);
-        const bool stands = (word & ~kFlags) == malloc_usable_size(block) + kWord;
+        void* const block = std::calloc(1, 100);
+        std::size_t word = 0;
+        const bool isRead = block && ReadablePages().Read(static_cast<char*>(block) - kWord, word);
+        const bool stands = isRead && (word & ~kFlags) == malloc_usable_size(block) + kWord;
         std::free(block);
         return stands;
     }();
@@ -36,14 +31,11 @@ bool SizesStandInFront() {
 
 // Whether the words around a block are what the allocator writes there.
 bool WordsAreRight(const char* block, ReadablePages& pages) {
-    if (!pages.Cover(block - kWord, kWord)) return false;
-    const std::size_t word = WordAt(block - kWord), size = word & ~kFlags;
+    std::size_t word = 0, next = 0;
+    if (!pages.Read(block - kWord, word)) return false;
+    const std::size_t size = word & ~kFlags;
     if (size < 4 * kWord || size % kBlockAlignment != 0) return false;
-    if ((word & kMapped) != 0) return true;
-    const std::uintptr_t after = reinterpret_cast<std::uintptr_t>(block) + size - kWord;
-    const auto next = reinterpret_cast<const char*>(after);
-    return after > reinterpret_cast<std::uintptr_t>(block) && pages.Cover(next, kWord) &&
-           (WordAt(next) & kBeforeInUse) != 0;
+    return (word & kMapped) != 0 || (pages.Read(block + size - kWord, next) && (next & kBeforeInUse) != 0);
 }
 
 }  // namespace
@@ -56,7 +48,8 @@ std::size_t AllocatedSizeIfAny(void* block, ReadablePages& pages) noexcept {
     if (reinterpret_cast<std::uintptr_t>(block) % kBlockAlignment != 0) return 0;
     if (__sanitizer_get_ownership) return __sanitizer_get_ownership(block) ? malloc_usable_size(block) : 0;
     if (SizesStandInFront() && !WordsAreRight(static_cast<const char*>(block), pages)) return 0;
-    return pages.Cover(block, 1) ? malloc_usable_size(block) : 0;
+    char byte;
+    return pages.Read(block, byte) ? malloc_usable_size(block) : 0;
 }
 
 void ReturnFreeMemory() noexcept {
