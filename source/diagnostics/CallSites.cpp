@@ -48,37 +48,37 @@ struct RememberedWalk {
 
 namespace {
 
-// What a thread remembers. All its own, so that no lock is needed.
-struct ThreadMemory {
+// What a thread remembers: the walks it did last, and for whom it is reporting. All its own, so that no lock is needed.
+struct RememberedWalks {
     const CallSites* reporting;
     RememberedWalk walks[kWalksRemembered];
 };
 
-TESSEL_FAST_THREAD_LOCAL ThreadMemory* theMemory = nullptr;
+TESSEL_FAST_THREAD_LOCAL RememberedWalks* theWalks = nullptr;
 TESSEL_FAST_THREAD_LOCAL bool theThreadEnds = false;
 
-struct ThreadMemoryOwner {
-    ~ThreadMemoryOwner() {
+struct RememberedWalksOwner {
+    ~RememberedWalksOwner() {
         theThreadEnds = true;
-        std::free(std::exchange(theMemory, nullptr));
+        std::free(std::exchange(theWalks, nullptr));
     }
     bool alive = true;
 };
-thread_local ThreadMemoryOwner theOwner;
+thread_local RememberedWalksOwner theOwner;
 
-TESSEL_NOT_INLINE ThreadMemory* MakeThreadMemory() {
+TESSEL_NOT_INLINE RememberedWalks* MakeWalks() {
     if (theThreadEnds || !theOwner.alive) return nullptr;
-    return theMemory = static_cast<ThreadMemory*>(std::calloc(1, sizeof(ThreadMemory)));
+    return theWalks = static_cast<RememberedWalks*>(std::calloc(1, sizeof(RememberedWalks)));
 }
 
 // Null while the thread ends, and when there is no memory.
-ThreadMemory* MemoryOfThread() {
-    return theMemory ? theMemory : MakeThreadMemory();
+RememberedWalks* WalksOfThread() {
+    return theWalks ? theWalks : MakeWalks();
 }
 
-RememberedWalk& WalkFrom(ThreadMemory& memory, const StackFrame* frame, uint64 serial) {
+RememberedWalk& WalkFrom(RememberedWalks& mine, const StackFrame* frame, uint64 serial) {
     const auto hash = (reinterpret_cast<uintptr_t>(frame) >> 4) + serial * 5;
-    return memory.walks[(hash ^ (hash >> 4)) % kWalksRemembered];
+    return mine.walks[(hash ^ (hash >> 4)) % kWalksRemembered];
 }
 
 // The frames lie in the stack of this thread above the innermost one, so that they can be read whatever became of them.
@@ -152,10 +152,10 @@ void CallSites::SetSkip(int32 skip) {
 }
 
 const CallSite* CallSites::Enter(const char* file, int32 line, const StackFrame* frame, TrackerFailure& failure) {
-    ThreadMemory* const memory = MemoryOfThread();
-    if (!memory) return Walk(file, line, frame, nullptr, failure);
-    if (memory->reporting == this) return nullptr;
-    RememberedWalk& walk = WalkFrom(*memory, frame, serial_);
+    RememberedWalks* const mine = WalksOfThread();
+    if (!mine) return Walk(file, line, frame, nullptr, failure);
+    if (mine->reporting == this) return nullptr;
+    RememberedWalk& walk = WalkFrom(*mine, frame, serial_);
     if (walk.first == frame && walk.serial == serial_ && walk.file == file && walk.line == line &&
         walk.skip == skip_.load(std::memory_order_relaxed) && IsSameWalk(walk))
         return walk.site;
@@ -271,16 +271,16 @@ const char* CallSites::CopyText(const char* text, TrackerFailure& failure) {
     return copy ? static_cast<const char*>(std::memcpy(copy, text, size)) : nullptr;
 }
 
-CallSites::Reporting::Reporting(const CallSites& sites) : outer_(theMemory ? theMemory->reporting : nullptr) {
-    if (ThreadMemory* memory = MemoryOfThread()) memory->reporting = &sites;
+CallSites::Reporting::Reporting(const CallSites& sites) : outer_(theWalks ? theWalks->reporting : nullptr) {
+    if (RememberedWalks* mine = WalksOfThread()) mine->reporting = &sites;
 }
 
 CallSites::Reporting::~Reporting() {
-    if (theMemory) theMemory->reporting = outer_;
+    if (theWalks) theWalks->reporting = outer_;
 }
 
 bool CallSites::IsReporting() const {
-    return theMemory && theMemory->reporting == this;
+    return theWalks && theWalks->reporting == this;
 }
 
 }  // namespace tessel

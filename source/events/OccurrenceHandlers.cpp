@@ -1,3 +1,4 @@
+// What becomes of a handler: the lists it is on, bound, armed, fired and run.
 #include "events/OccurrenceThread.h"
 #include "events/Occurrences.h"
 #include "events/ThreadGroups.h"

@@ -1,3 +1,4 @@
+// The levels of priority, what they are on the host, and the procedure that is told of a change.
 #include "platform/LastError.h"
 #include "threads/ThreadTable.h"
 #include <tessel/diagnostics/DebugStream.h>
