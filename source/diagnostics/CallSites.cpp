@@ -13,7 +13,6 @@
 namespace tessel {
 namespace {
 
-constexpr uint32 kFirstSlots = 64;
 constexpr size_t kChunkSize = 16 * 1024;
 constexpr int32 kMostSkipRemembered = 8;
 constexpr int32 kMostFrames = CallStack::kCapacity + kMostSkipRemembered;
@@ -190,19 +189,13 @@ const CallSite* CallSites::Walk(const char* file, int32 line, const StackFrame* 
 }
 
 const CallSite* CallSites::Find(const Key& key) const {
-    const Table* const table = table_.load(std::memory_order_acquire);
-    if (!table) return nullptr;
-    for (auto slot = static_cast<uint32>(key.hash >> 32);; ++slot) {
-        const CallSite* const site = table->slots[slot & table->mask].load(std::memory_order_acquire);
-        if (!site || key.Is(*site)) return site;
-    }
+    return sites_.Find(SiteKeys::HashOf(key.hash), [&key](const CallSite* site) { return key.Is(*site); });
 }
 
 const CallSite* CallSites::Add(const Key& key, TrackerFailure& failure) {
     platform::MutexHolder hold(mutex_);
     if (const CallSite* site = Find(key)) return site;
     if (count_ >= kMostStacks && key.count > 1) return nullptr;
-    if (!MakeRoom(failure)) return nullptr;
     const size_t stackSize = static_cast<size_t>(key.count) * sizeof key.addresses[0];
     auto* const site = static_cast<CallSite*>(AllocateSmall(offsetof(CallSite, addresses) + stackSize, failure));
     const char* const file = CopyText(key.file, failure);
@@ -214,10 +207,7 @@ const CallSite* CallSites::Add(const Key& key, TrackerFailure& failure) {
     site->count = key.count;
     std::memcpy(site->addresses, key.addresses, stackSize);
 
-    Table& table = *table_.load(std::memory_order_relaxed);
-    auto slot = static_cast<uint32>(key.hash >> 32);
-    while (table.slots[slot & table.mask].load(std::memory_order_relaxed)) ++slot;
-    table.slots[slot & table.mask].store(site, std::memory_order_release);
+    if (!sites_.Add(site, [&](size_t size) { return heap_.Allocate(size, failure); })) return nullptr;
     ++count_;
     return site;
 }
@@ -225,27 +215,6 @@ const CallSite* CallSites::Add(const Key& key, TrackerFailure& failure) {
 uint32 CallSites::Count() const {
     platform::MutexHolder hold(mutex_);
     return count_;
-}
-
-// Keeps half of the slots free. Readers may still be in the table that is replaced, so it stays until the end; together
-// those before are no larger than the current one.
-bool CallSites::MakeRoom(TrackerFailure& failure) {
-    const Table* const old = table_.load(std::memory_order_relaxed);
-    const uint32 oldSlots = old ? old->mask + 1 : 0;
-    if (old && 2 * (count_ + 1) <= oldSlots) return true;
-    const uint32 slots = old ? 2 * oldSlots : kFirstSlots;
-    auto* const table = static_cast<Table*>(heap_.Allocate(sizeof(Table) + slots * sizeof old->slots[0], failure));
-    if (!table) return false;
-    table->mask = slots - 1;
-    for (uint32 i = 0; i < oldSlots; ++i) {
-        const CallSite* const site = old->slots[i].load(std::memory_order_relaxed);
-        if (!site) continue;
-        auto slot = static_cast<uint32>(site->hash >> 32);
-        while (table->slots[slot & table->mask].load(std::memory_order_relaxed)) ++slot;
-        table->slots[slot & table->mask].store(site, std::memory_order_relaxed);
-    }
-    table_.store(table, std::memory_order_release);
-    return true;
 }
 
 void* CallSites::AllocateSmall(size_t size, TrackerFailure& failure) {

@@ -14,59 +14,12 @@ MasterPointers masterPointers;
 
 // ---- the set --------------------------------------------------------------------------------------------------------
 
-MasterPointerSet::Table* MasterPointerSet::NewTable(uint32 bits, Table* older) {
-    constexpr uint32 kHashBits = 32;
-    size_t entries = size_t{1} << bits;
-    auto* table = static_cast<Table*>(std::calloc(1, offsetof(Table, entries) + entries * sizeof(Table::entries[0])));
-    if (!table) return nullptr;
-    table->older = older;
-    table->mask = static_cast<uint32>(entries - 1);
-    table->shift = kHashBits - bits;
-    return table;
-}
-
-void MasterPointerSet::Insert(Table& table, uintptr_t block) {
-    uintptr_t last = block + sizeof(MasterPointerBlock) - 1;
-    for (uintptr_t stretch = block >> kStretchBits; stretch <= last >> kStretchBits; ++stretch) {
-        uint32 i = table.Start(stretch << kStretchBits);
-        while (table.entries[i & table.mask].load(std::memory_order_relaxed) != 0) ++i;
-        table.entries[i & table.mask].store(block, std::memory_order_release);
-    }
-}
-
-bool MasterPointerSet::Grow() {
-    constexpr uint32 kFirstBits = 8;
-    Table* old = table_.load(std::memory_order_relaxed);
-    Table* table = NewTable(old ? 32 - old->shift + 1 : kFirstBits, old);
-    if (!table) return false;
-    for (uint32 i = 0; old && i <= old->mask; ++i) {
-        uintptr_t block = old->entries[i].load(std::memory_order_relaxed);
-        // Once for each block: at the first of its stretches.
-        if (block != 0 && !IsIn(*table, block)) Insert(*table, block);
-    }
-    table_.store(table, std::memory_order_release);
-    return true;
-}
-
-bool MasterPointerSet::IsIn(const Table& table, uintptr_t block) {
-    for (uint32 i = table.Start(block);; ++i) {
-        uintptr_t entry = table.entries[i & table.mask].load(std::memory_order_relaxed);
-        if (entry == 0 || entry == block) return entry == block;
-    }
-}
-
 bool MasterPointerSet::Add(const MasterPointerBlock* block) {
-    const Table* table = table_.load(std::memory_order_relaxed);
-    if ((!table || (used_ + kMostStretches) * 4 > table->mask) && !Grow()) return false;
-    Insert(*table_.load(std::memory_order_relaxed), reinterpret_cast<uintptr_t>(block));
-    used_ += kMostStretches;
-    return true;
+    return blocks_.Add(block, [](size_t size) { return std::calloc(1, size); });
 }
 
 void MasterPointerSet::Clear() {
-    Table* table = table_.exchange(nullptr, std::memory_order_acq_rel);
-    while (table) std::free(std::exchange(table, table->older));
-    used_ = 0;
+    blocks_.Clear(std::free);
 }
 
 // ---- blocks ---------------------------------------------------------------------------------------------------------

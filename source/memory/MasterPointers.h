@@ -5,13 +5,11 @@
 #ifndef TESSEL_SOURCE_MEMORY_MASTERPOINTERS_H
 #define TESSEL_SOURCE_MEMORY_MASTERPOINTERS_H
 
-#include "base/Compiler.h"
+#include "base/ReadMostlyTable.h"
 #include "memory/ThreadMemory.h"
 #include <tessel/base/MgErr.h>
 #include <tessel/base/Types.h>
 #include <tessel/sync/ThMutex.h>
-
-#include <atomic>
 
 namespace tessel {
 
@@ -32,49 +30,49 @@ inline bool IsLiveContent(uintptr_t content) {
     return content != 0 && (content & 1) == 0;
 }
 
-// The addresses of all blocks, to tell a handle from any other address. A hash table of the stretches of memory that
-// the blocks cover. Lookups take no lock and write nothing: entries are only added, a table that is full is replaced by
-// a larger one, and the old one stays until Clear.
+// All blocks, to tell a handle from any other address. A block stands under each of the stretches of memory that it
+// covers.
 class MasterPointerSet {
 public:
     bool Contains(const void* address) const {
-        const Table* table = table_.load(std::memory_order_acquire);
-        if (TESSEL_UNLIKELY(table == nullptr)) return false;
-        uintptr_t at = reinterpret_cast<uintptr_t>(address);
-        for (uint32 i = table->Start(at);; ++i) {
-            uintptr_t block = table->entries[i & table->mask].load(std::memory_order_acquire);
-            if (block == 0) return false;
-            uintptr_t offset = at - block - offsetof(MasterPointerBlock, slots);
-            if (offset < sizeof(MasterPointerBlock::slots)) return offset % sizeof(UPtr) == 0;
-        }
+        const uintptr_t at = reinterpret_cast<uintptr_t>(address);
+        bool isSlot = false;
+        blocks_.Find(Stretches::HashOf(at >> kStretchBits), [&](const MasterPointerBlock* block) {
+            uintptr_t offset = at - reinterpret_cast<uintptr_t>(block) - offsetof(MasterPointerBlock, slots);
+            if (offset >= sizeof(MasterPointerBlock::slots)) return false;
+            isSlot = offset % sizeof(UPtr) == 0;
+            return true;
+        });
+        return isSlot;
     }
     // Callers serialise. False when there is no memory.
     bool Add(const MasterPointerBlock* block);
+    // When no other thread uses handles.
     void Clear();
 
 private:
     // Short enough that few handles lie in a stretch that belongs to two blocks, where a lookup takes two steps.
     static constexpr uint32 kStretchBits = sizeof(void*) == 8 ? 14 : 13;
-    static constexpr uint32 kMostStretches = 6;  // that a block covers
-    static_assert(sizeof(MasterPointerBlock) <= (kMostStretches - 1) << kStretchBits);
 
-    struct Table {
-        Table* older;
-        uint32 mask;
-        uint32 shift;
-        std::atomic<uintptr_t> entries[1];  // mask + 1 of them, at most a quarter in use
+    struct Stretches {
+        static constexpr uint32 kFirstSlots = 256;
+        static constexpr uint32 kSlotsPerUsed = 4;
+        static constexpr uint32 kMostHashes = 6;
+        static constexpr bool kRemoves = false;
 
-        uint32 Start(uintptr_t address) const {
-            return (static_cast<uint32>(address >> kStretchBits) * 0x9E3779B1u) >> shift;
+        static uintptr_t First(const MasterPointerBlock* block) {
+            return reinterpret_cast<uintptr_t>(block) >> kStretchBits;
         }
+        static uint32 Hashes(const MasterPointerBlock* block) {
+            const uintptr_t last = (reinterpret_cast<uintptr_t>(block + 1) - 1) >> kStretchBits;
+            return static_cast<uint32>(last - First(block)) + 1;
+        }
+        static uint32 Hash(const MasterPointerBlock* block, uint32 n) { return HashOf(First(block) + n); }
+        static uint32 HashOf(uintptr_t stretch) { return static_cast<uint32>(stretch) * 0x9E3779B1u; }
     };
-    static Table* NewTable(uint32 bits, Table* older);
-    static void Insert(Table& table, uintptr_t block);
-    static bool IsIn(const Table& table, uintptr_t block);
-    bool Grow();
+    static_assert(sizeof(MasterPointerBlock) <= (Stretches::kMostHashes - 1) << kStretchBits);
 
-    std::atomic<Table*> table_{nullptr};
-    uint32 used_ = 0;
+    ReadMostlyTable<const MasterPointerBlock, Stretches> blocks_;
 };
 
 class MasterPointers {

@@ -1,5 +1,6 @@
 #include "paths/PathItemStorage.h"
 
+#include "base/ReadMostlyTable.h"
 #include "paths/PathItemElement.h"
 #include "paths/PathLock.h"
 #include <tessel/diagnostics/DebugStream.h>
@@ -7,6 +8,7 @@
 #include <tessel/sync/ThMutex.h>
 
 #include <bit>
+#include <cstdlib>
 #include <map>
 #include <new>
 #include <utility>
@@ -31,89 +33,19 @@ Block* BlockOf(const PathItemElement* element) {
     return reinterpret_cast<Block*>(reinterpret_cast<uintptr_t>(element) & ~uintptr_t{kBlockAlignment - 1});
 }
 
-// The addresses of all blocks: a hash table that is read without a lock, by any number of threads, while one who holds
-// the storage mutex changes it. It grows by being replaced; tables that were replaced stay until the end.
-class BlockSet {
-public:
-    bool Contains(const Block* block) const {
-        const Table* table = table_.load(std::memory_order_acquire);
-        if (!table) return false;
-        for (size_t i = Hash(block);; ++i) {
-            const Block* entry = table->entries[i & table->mask].load(std::memory_order_relaxed);
-            if (entry == block) return true;
-            if (!entry) return false;
-        }
+// All blocks. Read by any thread, changed by one that holds the storage mutex.
+struct BlockKeys {
+    static constexpr uint32 kFirstSlots = 16;
+    static constexpr uint32 kSlotsPerUsed = 2;
+    static constexpr uint32 kMostHashes = 1;
+    static constexpr bool kRemoves = true;
+
+    static uint32 Hashes(const Block*) { return 1; }
+    static uint32 Hash(const Block* block, uint32 = 0) {
+        return static_cast<uint32>(reinterpret_cast<uintptr_t>(block) / kBlockAlignment) * 0x9E3779B1u;
     }
-
-    bool Add(Block* block) {
-        Table* table = table_.load(std::memory_order_relaxed);
-        if (!table || (table->used + 1) * 2 > table->mask + 1) table = Grow(table);
-        if (!table) return false;
-        Put(*table, block);
-        return true;
-    }
-
-    // A removed entry that no other stands behind is empty again, and so are those before it: who looks for a block
-    // ends there either way.
-    void Remove(const Block* block) {
-        Table* table = table_.load(std::memory_order_relaxed);
-        const auto entry = [&](size_t at) -> std::atomic<const Block*>& { return table->entries[at & table->mask]; };
-        size_t i = Hash(block);
-        while (entry(i).load(std::memory_order_relaxed) != block) ++i;
-        entry(i).store(Removed(), std::memory_order_relaxed);
-        if (entry(i + 1).load(std::memory_order_relaxed)) return;
-        for (; entry(i).load(std::memory_order_relaxed) == Removed(); --i, --table->used)
-            entry(i).store(nullptr, std::memory_order_relaxed);
-    }
-
-    // No other thread may be reading.
-    void Clear() {
-        Table* table = table_.exchange(nullptr, std::memory_order_relaxed);
-        while (table) {
-            Table* previous = table->previous;
-            delete[] table->entries;
-            delete table;
-            table = previous;
-        }
-    }
-
-private:
-    struct Table {
-        size_t mask;
-        size_t used;  // entries that are not empty
-        std::atomic<const Block*>* entries;
-        Table* previous;
-    };
-
-    static size_t Hash(const Block* block) { return reinterpret_cast<uintptr_t>(block) / kBlockAlignment; }
-    static const Block* Removed() { return reinterpret_cast<const Block*>(uintptr_t{1}); }
-
-    static void Put(Table& table, const Block* block) {
-        size_t i = Hash(block);
-        while (table.entries[i & table.mask].load(std::memory_order_relaxed)) ++i;
-        table.entries[i & table.mask].store(block, std::memory_order_release);
-        ++table.used;
-    }
-
-    Table* Grow(Table* old) {
-        const size_t size = old ? (old->mask + 1) * 2 : 16;
-        auto* entries = new (std::nothrow) std::atomic<const Block*>[size]();
-        Table* table = new (std::nothrow) Table{size - 1, 0, entries, old};
-        if (!entries || !table) {
-            delete[] entries;
-            delete table;
-            return nullptr;
-        }
-        for (size_t i = 0; old && i <= old->mask; ++i) {
-            const Block* block = old->entries[i].load(std::memory_order_relaxed);
-            if (block && block != Removed()) Put(*table, block);
-        }
-        table_.store(table, std::memory_order_release);
-        return table;
-    }
-
-    std::atomic<Table*> table_{nullptr};
 };
+using BlockSet = ReadMostlyTable<const Block, BlockKeys>;
 
 using Locations = std::map<std::string, PathItemElement*, std::less<>,
                            TrackedAllocator<std::pair<const std::string, PathItemElement*>>>;
@@ -130,7 +62,7 @@ Block* NewBlock() {
     void* room = ::operator new (sizeof(Block), std::align_val_t{kBlockAlignment}, std::nothrow);
     if (!room) return nullptr;
     Block* block = new (room) Block;
-    if (!blocks.Add(block)) {
+    if (!blocks.Add(block, [](size_t size) { return std::calloc(1, size); })) {
         block->~Block();
         ::operator delete (room, std::align_val_t{kBlockAlignment});
         return nullptr;
@@ -254,7 +186,7 @@ MgErr PathItemStorage::Start() {
 void PathItemStorage::Stop() {
     FreeUnusedBlocks();
     ForEachBlock(ReportLiveElements);
-    if (!currentBlock) blocks.Clear();
+    if (!currentBlock) blocks.Clear(std::free);
     standardsRead.store(false, std::memory_order_relaxed);
     ThMutexDestroy(storageMutex);
     storageMutex = nullptr;
@@ -275,7 +207,7 @@ void PathItemStorage::SlotVacated(const PathItemElement* element) {
 
 bool PathItemStorage::Owns(const PathItemElement* element) {
     const Block* block = BlockOf(element);
-    if (!block || !blocks.Contains(block)) return false;
+    if (!blocks.Find(BlockKeys::Hash(block), [block](const Block* there) { return there == block; })) return false;
     const uintptr_t offset = reinterpret_cast<uintptr_t>(element) - reinterpret_cast<uintptr_t>(block->slots);
     return offset < sizeof block->slots && offset % sizeof(PathItemElement) == 0;
 }
