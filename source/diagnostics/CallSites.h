@@ -76,18 +76,18 @@ private:
                          TrackerFailure& failure);
     const CallSite* Find(const Key& key) const;
     const CallSite* Add(const Key& key, TrackerFailure& failure);
-    void* AllocateSmall(size_t size, TrackerFailure& failure);
-    const char* CopyText(const char* text, TrackerFailure& failure);
+    void* AllocateSmall(size_t size, TrackerFailure& failure) TESSEL_REQUIRES(mutex_);
+    const char* CopyText(const char* text, TrackerFailure& failure) TESSEL_REQUIRES(mutex_);
 
     TrackerHeap& heap_;
     const uint64 serial_;  // unlike that of any other table there ever was, for what threads remember
     std::atomic<int32> skip_;
     ReadMostlyTable<const CallSite, SiteKeys> sites_;
 
-    mutable platform::Mutex mutex_;  // guards what follows, and changes of the sites
-    uint32 count_ = 0;
-    char* small_ = nullptr;  // the unused rest of the newest chunk
-    size_t smallLeft_ = 0;
+    mutable platform::Mutex mutex_;  // guards changes of the sites too
+    uint32 count_ TESSEL_GUARDED_BY(mutex_) = 0;
+    char* small_ TESSEL_GUARDED_BY(mutex_) = nullptr;  // the unused rest of the newest chunk
+    size_t smallLeft_ TESSEL_GUARDED_BY(mutex_) = 0;
 };
 
 }  // namespace tessel

@@ -24,7 +24,7 @@ void MasterPointerSet::Clear() {
 
 // ---- blocks ---------------------------------------------------------------------------------------------------------
 
-MgErr MasterPointers::Start() {
+MgErr MasterPointers::Start() TESSEL_LOCKS_UNPROVEN {
     for (int i = 0; i < kFirstBlocks; ++i)
         if (!AddBlock()) {
             Stop();
@@ -34,7 +34,7 @@ MgErr MasterPointers::Start() {
     return kNoErr;
 }
 
-void MasterPointers::Stop() {
+void MasterPointers::Stop() TESSEL_LOCKS_UNPROVEN {
     ThreadMemory::ForgetHandles();
     set_.Clear();
     while (blocks_) DisposePtrBlock(std::exchange(blocks_, blocks_->next));
@@ -66,7 +66,7 @@ bool MasterPointers::AddBlock() {
 
 // Cuts a chain for a thread off the shared one.
 bool MasterPointers::Refill(SlotChain& chain) {
-    ThMutexHolder hold(mutex);
+    LibraryMutexHolder hold(mutex);
     if (!freeHead_ && !AddBlock()) return false;
     chain.head = chain.tail = freeHead_;
     for (chain.count = 1; chain.count < kChainSlots; ++chain.count) {
@@ -106,7 +106,7 @@ void MasterPointers::PutShared(ThreadMemory* mine, UHandle slot) {
 
 void MasterPointers::Return(SlotChain& chain) {
     if (!chain.head) return;
-    ThMutexHolder hold(mutex);
+    LibraryMutexHolder hold(mutex);
     SetSlotContent(chain.tail, reinterpret_cast<uintptr_t>(freeHead_) | 1);
     freeHead_ = chain.head;
     freeCount_ += static_cast<int32>(chain.count);
@@ -137,7 +137,7 @@ bool MasterPointers::IsChain(UHandle head, uint32 count) const {
 bool MasterPointers::CheckChains(ThreadMemory* mine) const {
     bool countIsBad, chainIsBad;
     {
-        ThMutexHolder hold(mutex);
+        LibraryMutexHolder hold(mutex);
         countIsBad = freeCount_ < 0;
         chainIsBad = !countIsBad && !IsChain(freeHead_, static_cast<uint32>(freeCount_));
     }
@@ -152,7 +152,7 @@ bool MasterPointers::CheckChains(ThreadMemory* mine) const {
 MgErr MasterPointers::CheckBlocks() const {
     int32 difference;
     {
-        ThMutexHolder hold(mutex);
+        LibraryMutexHolder hold(mutex);
         int32 count = 0;
         for (MasterPointerBlock* block = blocks_; block && count <= blockCount_; block = block->next) ++count;
         difference = count - blockCount_;

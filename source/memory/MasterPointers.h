@@ -7,9 +7,9 @@
 
 #include "base/ReadMostlyTable.h"
 #include "memory/ThreadMemory.h"
+#include "sync/LibraryMutex.h"
 #include <tessel/base/MgErr.h>
 #include <tessel/base/Types.h>
-#include <tessel/sync/ThMutex.h>
 
 namespace tessel {
 
@@ -77,12 +77,13 @@ private:
 
 class MasterPointers {
 public:
-    MgErr Start();  // adds the first five blocks
-    void Stop();    // frees all blocks; no handle may be live
+    // Adds the first five blocks. While nobody else uses handles, as Stop.
+    MgErr Start();
+    // Frees all blocks; no handle may be live.
+    void Stop();
 
-    // The mutex guards the shared chain, its count, the list of blocks and their count. Nothing is called inside it
-    // that takes another lock of the memory manager, but for the heap's.
-    ThMutex mutex = nullptr;
+    // Nothing is called inside it that takes another lock of the memory manager, but for the heap's.
+    mutable LibraryMutex mutex;
 
     // A slot for a new handle, or null. It is not live before it is given data.
     UHandle Take(ThreadMemory* mine) { return mine && mine->slots.head ? Pop(mine->slots) : TakeShared(mine); }
@@ -109,7 +110,7 @@ public:
     // Visits every live slot until the visitor returns false, which it then returns.
     template <class Visitor>
     bool ForEachLive(Visitor&& visitor) const {
-        ThMutexHolder hold(mutex);
+        LibraryMutexHolder hold(mutex);
         for (MasterPointerBlock* block = blocks_; block; block = block->next)
             for (UPtr& slot : block->slots)
                 if (IsLiveContent(SlotContent(&slot)) && !visitor(&slot)) return false;
@@ -118,7 +119,7 @@ public:
 
     // The same without the mutex, for a visitor that frees what it sees. No other thread may be using handles.
     template <class Visitor>
-    void ForEachLeft(Visitor&& visitor) const {
+    void ForEachLeft(Visitor&& visitor) const TESSEL_LOCKS_UNPROVEN {
         for (MasterPointerBlock* block = blocks_; block; block = block->next)
             for (UPtr& slot : block->slots)
                 if (IsLiveContent(SlotContent(&slot))) visitor(&slot);
@@ -150,13 +151,13 @@ private:
     UHandle TakeShared(ThreadMemory* mine);
     void PutShared(ThreadMemory* mine, UHandle slot);
     bool Refill(SlotChain& chain);
-    bool AddBlock();
+    bool AddBlock() TESSEL_REQUIRES(mutex);
     bool IsChain(UHandle head, uint32 count) const;
 
-    UHandle freeHead_ = nullptr;
-    int32 freeCount_ = 0;
-    MasterPointerBlock* blocks_ = nullptr;
-    int32 blockCount_ = 0;
+    UHandle freeHead_ TESSEL_GUARDED_BY(mutex) = nullptr;
+    int32 freeCount_ TESSEL_GUARDED_BY(mutex) = 0;
+    MasterPointerBlock* blocks_ TESSEL_GUARDED_BY(mutex) = nullptr;
+    int32 blockCount_ TESSEL_GUARDED_BY(mutex) = 0;
     MasterPointerSet set_;
 };
 

@@ -3,9 +3,9 @@
 #include "base/ReadMostlyTable.h"
 #include "paths/PathItemElement.h"
 #include "paths/PathLock.h"
+#include "sync/LibraryMutex.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/TrackedMallocFree.h>
-#include <tessel/sync/ThMutex.h>
 
 #include <bit>
 #include <cstdlib>
@@ -50,15 +50,15 @@ using BlockSet = ReadMostlyTable<const Block, BlockKeys>;
 using Locations = std::map<std::string, PathItemElement*, std::less<>,
                            TrackedAllocator<std::pair<const std::string, PathItemElement*>>>;
 
-ThMutex storageMutex = nullptr;
-Block* currentBlock = nullptr;
+LibraryMutex storageMutex;
+Block* currentBlock TESSEL_GUARDED_BY(storageMutex) = nullptr;
 BlockSet blocks;
-Locations* locations = nullptr;
+Locations* locations TESSEL_GUARDED_BY(storageMutex) = nullptr;
 
 std::atomic<PathItemElement*> standards[kBaseCount];
 std::atomic<bool> standardsRead{false};
 
-Block* NewBlock() {
+Block* NewBlock() TESSEL_REQUIRES(storageMutex) {
     void* room = ::operator new (sizeof(Block), std::align_val_t{kBlockAlignment}, std::nothrow);
     if (!room) return nullptr;
     Block* block = new (room) Block;
@@ -76,7 +76,7 @@ Block* NewBlock() {
 }
 
 // Frees the block after `before`, which may be `before` itself.
-void FreeBlockAfter(Block* before) {
+void FreeBlockAfter(Block* before) TESSEL_REQUIRES(storageMutex) {
     Block* block = before->next;
     before->next = block->next;
     if (currentBlock == block) currentBlock = before == block ? nullptr : before;
@@ -86,7 +86,7 @@ void FreeBlockAfter(Block* before) {
 }
 
 template <class Visitor>
-void ForEachBlock(Visitor visit) {
+void ForEachBlock(Visitor visit) TESSEL_REQUIRES(storageMutex) {
     Block* block = currentBlock;
     if (!block) return;
     do {
@@ -99,7 +99,7 @@ bool IsUnused(const Block& block) {
     return block.freeSlots.load(std::memory_order_acquire) == kElementsPerBlock;
 }
 
-PathItemElement* ClaimSlot(Block& block) {
+PathItemElement* ClaimSlot(Block& block) TESSEL_REQUIRES(storageMutex) {
     if (block.freeSlots.load(std::memory_order_acquire) == 0) return nullptr;
     for (uint32 i = 0; i < kElementsPerBlock; ++i) {
         PathItemElement& slot = block.slots[block.cursor];
@@ -113,7 +113,7 @@ PathItemElement* ClaimSlot(Block& block) {
 }
 
 // The first free slot from the current block on. That block becomes the current one.
-PathItemElement* ClaimAnySlot() {
+PathItemElement* ClaimAnySlot() TESSEL_REQUIRES(storageMutex) {
     Block* block = currentBlock;
     if (!block) return nullptr;
     do {
@@ -126,7 +126,7 @@ PathItemElement* ClaimAnySlot() {
     return nullptr;
 }
 
-uint32 FreeUnusedBlocks() {
+uint32 FreeUnusedBlocks() TESSEL_REQUIRES(storageMutex) {
     uint32 unvisited = 0;
     ForEachBlock([&](Block&) { ++unvisited; });
     uint32 bytes = 0;
@@ -164,10 +164,10 @@ struct LeakedElement {
 using LeakedElements = std::vector<LeakedElement, TrackedAllocator<LeakedElement>>;
 
 // Elements that paths still refer to. The holds of children are no leaks, nor are the bases.
-LeakedElements FindLeakedElements() {
+LeakedElements FindLeakedElements() TESSEL_REQUIRES(pathMutex, storageMutex) {
     LeakedElements leaked;
     ForEachBlock([&](Block& block) {
-        ForEachLiveElement(block, [&](const PathItemElement& element) {
+        ForEachLiveElement(block, [&](const PathItemElement& element) TESSEL_LOCKS_UNPROVEN {  // called at once
             const int32 retains = element.OutsideRetains();
             if (retains > 0 && element.Parent()) leaked.push_back({retains, element.Name()});
         });
@@ -180,22 +180,22 @@ LeakedElements FindLeakedElements() {
 // ---- start and stop -------------------------------------------------------------------------------------------------
 
 MgErr PathItemStorage::Start() {
-    return ThMutexCreate(&storageMutex, "PathStorageMutex");
+    return storageMutex.Create("PathStorageMutex");
 }
 
-void PathItemStorage::Stop() {
+// Alone: nobody uses paths any more.
+void PathItemStorage::Stop() TESSEL_LOCKS_UNPROVEN {
     FreeUnusedBlocks();
     ForEachBlock(ReportLiveElements);
     if (!currentBlock) blocks.Clear(std::free);
     standardsRead.store(false, std::memory_order_relaxed);
-    ThMutexDestroy(storageMutex);
-    storageMutex = nullptr;
+    storageMutex.Destroy();
 }
 
 // ---- slots ----------------------------------------------------------------------------------------------------------
 
 PathItemElement* PathItemStorage::Allocate() {
-    ThMutexHolder lock(storageMutex);
+    LibraryMutexHolder lock(storageMutex);
     PathItemElement* element = ClaimAnySlot();
     if (!element && NewBlock()) element = ClaimSlot(*currentBlock);
     return element;
@@ -230,7 +230,7 @@ PathItemElement* PathItemStorage::Standard(PathRef::PathBase base) {
 // ---- standard locations ---------------------------------------------------------------------------------------------
 
 MgErr PathItemStorage::AddLocation(const char* name, PathItemElement* element) {
-    ThMutexHolder lock(storageMutex);
+    LibraryMutexHolder lock(storageMutex);
     if (!locations) locations = new (TrackedNew(sizeof(Locations))) Locations;
     if (!locations->emplace(name, element).second) return kArgErr;
     element->Retain();
@@ -238,7 +238,7 @@ MgErr PathItemStorage::AddLocation(const char* name, PathItemElement* element) {
 }
 
 PathItemElement* PathItemStorage::FindLocation(const char* name) {
-    ThMutexHolder lock(storageMutex);
+    LibraryMutexHolder lock(storageMutex);
     if (!locations) return nullptr;
     const auto found = locations->find(std::string_view(name));
     if (found == locations->end()) return nullptr;
@@ -249,7 +249,7 @@ PathItemElement* PathItemStorage::FindLocation(const char* name) {
 void PathItemStorage::ForgetLocations() {
     Locations* forgotten;
     {
-        ThMutexHolder lock(storageMutex);
+        LibraryMutexHolder lock(storageMutex);
         forgotten = std::exchange(locations, nullptr);
     }
     if (!forgotten) return;
@@ -265,7 +265,7 @@ uint32 PathItemStorage::GarbageCollect(PathRef::OptimizationMethod method) {
     LeakedElements leaked;
     {
         PathLock pathLock;
-        ThMutexHolder lock(storageMutex);
+        LibraryMutexHolder lock(storageMutex);
         if (method == PathRef::kFreeUnusedAndReport) leaked = FindLeakedElements();
         if (method != PathRef::kCountOnly) bytes = FreeUnusedBlocks();
     }

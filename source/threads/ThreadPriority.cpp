@@ -47,7 +47,7 @@ struct PriorityChange {
 };
 
 PriorityChange ChangePriority(ThThread thread, int32 level) {
-    ThMutexHolder holder(gCreateThread);
+    LibraryMutexHolder holder(gCreateThread);
     if (!IsThread(thread)) return {};
     bool set = platform::ThreadSetPriority(HandleOf(thread), priorities[level]);
     const bool isForbidden = !set && platform::LastError() == platform::kErrorAccessDenied;

@@ -65,7 +65,7 @@ public:
 
 protected:
     CachedValue(uint32 lifetime, RelationToMetaData relation, Argument value);
-    ~CachedValue() override;
+    ~CachedValue() override = default;
     void ResetValue(uint32 lifetime, Argument value);
 
 private:
