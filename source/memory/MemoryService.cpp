@@ -62,7 +62,7 @@ MgErr MemoryManagerStart() {
     previousCallback = heap::SetErrorCallback(PassOnHeapError);
     SetMemoryDebugger(false);
     MgErr err = masterPointers.Start();
-    if (err == kNoErr) err = ThMutexCreate(&masterPointers.mutex, "MemoryManager");
+    if (err == kNoErr) err = masterPointers.mutex.Create("MemoryManager");
     if (err != kNoErr) {
         masterPointers.Stop();
         heap::SetErrorCallback(previousCallback);
@@ -82,8 +82,7 @@ MgErr MemoryManagerStop() {
     WriteLeakReports();
     heap::SetHandleBlocks(nullptr);
     RecoverHandles();
-    ThMutexDestroy(masterPointers.mutex);
-    masterPointers.mutex = nullptr;
+    masterPointers.mutex.Destroy();
     StopTrackers();
     SetMemFullProc(nullptr);
     heap::SetErrorCallback(previousCallback);
