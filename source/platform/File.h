@@ -66,10 +66,6 @@ bool FileReserve(FileHandle file, std::int64_t size);
 // Puts what was written onto the device.
 bool FileFlush(FileHandle file);
 
-// The whole file as read-only memory. 1006 for an empty file. The view outlives the handle.
-bool FileMap(FileHandle file, const void*& data, std::size_t& size);
-bool FileUnmap(const void* data, std::size_t size);
-
 // Exclusive locks of byte ranges, between handles, in this process or another. They bind those who lock, not those who
 // only read and write. FileLock does not wait: 33 when another handle holds a part. FileUnlock gives 158 when nobody
 // holds any of it. A count of 0 does nothing. Closing the handle releases its locks.

@@ -8,9 +8,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <errno.h>
-#include <limits>
 #include <string>
-#include <sys/mman.h>
 #include <unistd.h>
 
 namespace tessel::platform {
@@ -171,8 +169,10 @@ FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, 
         std::string native;
         if (!NameToNativeText(name, native)) return kNoFile;
         Match match = MatchOnDisk(native);
-        if (match == Match::kParentMissing) FailWith(kErrorPathNotFound);
-        if (match == Match::kParentMissing) return kNoFile;
+        if (match != Match::kAll && match != Match::kLastMissing) {
+            FailMatch(match);
+            return kNoFile;
+        }
         if (!open(native)) FailWith(errno == EEXIST ? kErrorFileExists : ErrorOfErrno(errno));
     } else if (!OnExistingItem(name, open)) {
         return kNoFile;
@@ -186,7 +186,11 @@ FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, 
 FileHandle FileCreatePrivate(const char* name, std::uint32_t access) {
     std::string native;
     if (!NameToNativeText(name, native)) return kNoFile;
-    MatchOnDisk(native);
+    Match match = MatchOnDisk(native);
+    if (match != Match::kAll && match != Match::kLastMissing) {
+        FailMatch(match);
+        return kNoFile;
+    }
     if (!RemoveOwn(native.c_str())) return kNoFile;
     // Whoever puts something there in between is refused, a link too.
     const int descriptor = OpenAtOnce(native.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
@@ -253,30 +257,6 @@ bool FileReserve(FileHandle file, std::int64_t size) {
 bool FileFlush(FileHandle file) {
     const int result = Retry([&] { return systemCalls.fsync(DescriptorOf(file)); });
     return result == 0 || errno == EINVAL || errno == EROFS || FailErrno();  // both: there is no device to wait for
-}
-
-// ---- mapping --------------------------------------------------------------------------------------------------------
-
-bool FileMap(FileHandle file, const void*& data, std::size_t& size) {
-    data = nullptr;
-    size = 0;
-    if (!HasAccess(file, kRead)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
-    std::int64_t bytes = 0;
-    if (!FileSize(file, bytes)) return false;
-    if (bytes == 0) return FailWith(kErrorFileInvalid);
-    if (static_cast<std::uint64_t>(bytes) > std::numeric_limits<std::size_t>::max()) {
-        return FailWith(kErrorNotEnoughMemory);
-    }
-    std::size_t count = static_cast<std::size_t>(bytes);
-    void* view = systemCalls.mmap(nullptr, count, PROT_READ, MAP_SHARED, DescriptorOf(file), 0);
-    if (view == MAP_FAILED) return FailErrno();
-    data = view;
-    size = count;
-    return true;
-}
-
-bool FileUnmap(const void* data, std::size_t size) {
-    return systemCalls.munmap(const_cast<void*>(data), size) == 0 || FailErrno();
 }
 
 // ---- range locks ----------------------------------------------------------------------------------------------------

@@ -135,7 +135,7 @@ bool FolderCreate(const char* name) {
     if (!NameToNativeText(name, native)) return false;
     Match match = MatchOnDisk(native);
     if (match == Match::kAll) return FailWith(kErrorAlreadyExists);
-    if (match == Match::kParentMissing) return FailWith(kErrorPathNotFound);
+    if (match != Match::kLastMissing) return FailMatch(match);
     return systemCalls.mkdir(native.c_str(), 0777) == 0 || FailErrno();
 }
 
@@ -174,10 +174,8 @@ bool RenameWithoutReplacing(const std::string& from, const std::string& to) {
     if (errno != EINVAL && errno != ENOSYS) return false;
     if (systemCalls.link(from.c_str(), to.c_str()) == 0) return systemCalls.unlink(from.c_str()) == 0;
     if (errno == EEXIST || errno == EXDEV) return false;
-    if (Exists(to)) {
-        errno = EEXIST;
-        return false;
-    }
+    if (Exists(to)) errno = EEXIST;
+    if (errno != ENOENT) return false;
     return systemCalls.renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), 0) == 0;
 }
 
@@ -201,7 +199,7 @@ bool ItemRename(const char* from, const char* to) {
     if (!NameToAbsoluteNative(from, source) || !NameToAbsoluteText(to, target)) return false;
     respelled = target;
     Match match = MatchOnDisk(respelled);
-    if (match == Match::kParentMissing) return FailWith(kErrorPathNotFound);
+    if (match == Match::kParentMissing || match == Match::kFailed) return FailMatch(match);
     bool otherSpelling = match == Match::kAll && respelled == source;
     if (match == Match::kAll && !otherSpelling) return FailWith(kErrorAlreadyExists);
     // The parent as on the disk, the last part as the caller wants it.

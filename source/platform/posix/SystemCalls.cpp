@@ -2,7 +2,6 @@
 
 #include <errno.h>
 #include <stdio.h>
-#include <sys/mman.h>
 #include <sys/random.h>
 #include <sys/syscall.h>
 #include <sys/xattr.h>
@@ -61,8 +60,6 @@ constinit SystemCalls systemCalls = {
     .fsync = ::fsync,
     .lock = Lock,
     .fcntl = Fcntl,
-    .mmap = ::mmap,
-    .munmap = ::munmap,
     .statx = ::statx,
     .futimens = ::futimens,
     .fsetxattr = ::fsetxattr,
@@ -76,8 +73,10 @@ constinit SystemCalls systemCalls = {
     .mkdir = ::mkdir,
     .mkdirat = ::mkdirat,
     .chmod = ::chmod,
+    .fchown = ::fchown,
     .fchmod = ::fchmod,
     .opendir = ::opendir,
+    .fdopendir = ::fdopendir,
     .readdir = ::readdir,
     .closedir = ::closedir,
     .getcwd = ::getcwd,
