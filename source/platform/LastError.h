@@ -28,6 +28,7 @@ constexpr ErrorNumber kErrorSeek = 25;
 constexpr ErrorNumber kErrorGeneralFailure = 31;
 constexpr ErrorNumber kErrorSharingViolation = 32;
 constexpr ErrorNumber kErrorLockViolation = 33;
+constexpr ErrorNumber kErrorEndOfFile = 38;
 constexpr ErrorNumber kErrorHandleDiskFull = 39;
 constexpr ErrorNumber kErrorNotSupported = 50;
 constexpr ErrorNumber kErrorNetworkPathNotFound = 53;

@@ -2,6 +2,7 @@
 
 #include <errno.h>
 #include <stdio.h>
+#include <sys/file.h>
 #include <sys/random.h>
 #include <sys/syscall.h>
 #include <sys/xattr.h>
@@ -71,13 +72,15 @@ constinit SystemCalls systemCalls = {
     .renameat2 = ::renameat2,
     .link = ::link,
     .linkat = ::linkat,
+    .symlink = ::symlink,
+    .lchown = ::lchown,
+    .flock = ::flock,
     .unlink = ::unlink,
     .unlinkat = ::unlinkat,
     .rmdir = ::rmdir,
     .mkdir = ::mkdir,
     .mkdirat = ::mkdirat,
     .chmod = ::chmod,
-    .fchown = ::fchown,
     .fchmod = ::fchmod,
     .opendir = ::opendir,
     .fdopendir = ::fdopendir,

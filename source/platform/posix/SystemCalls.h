@@ -41,13 +41,15 @@ namespace tessel::platform {
     X(int, renameat2, (int fromFolder, const char* from, int toFolder, const char* to, unsigned flags))            \
     X(int, link, (const char* from, const char* to))                                                               \
     X(int, linkat, (int fromFolder, const char* from, int toFolder, const char* to, int flags))                    \
+    X(int, symlink, (const char* text, const char* name))                                                          \
+    X(int, lchown, (const char* name, uid_t owner, gid_t group))                                                   \
+    X(int, flock, (int file, int operation))                                                                       \
     X(int, unlink, (const char* name))                                                                             \
     X(int, unlinkat, (int folder, const char* name, int flags))                                                    \
     X(int, rmdir, (const char* name))                                                                              \
     X(int, mkdir, (const char* name, mode_t mode))                                                                 \
     X(int, mkdirat, (int folder, const char* name, mode_t mode))                                                   \
     X(int, chmod, (const char* name, mode_t mode))                                                                 \
-    X(int, fchown, (int file, uid_t owner, gid_t group))                                                           \
     X(int, fchmod, (int file, mode_t mode))                                                                        \
     X(DIR*, opendir, (const char* name))                                                                           \
     X(DIR*, fdopendir, (int folder))                                                                               \
