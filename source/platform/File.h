@@ -37,7 +37,8 @@ enum class Disposition {
 FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, Disposition disposition);
 
 // Creates a file afresh that only this user may read or write. What of this user's has the name goes first: a link
-// itself, never what it leads to. 5, and nothing is touched, when it is another user's, or a folder.
+// itself, never what it leads to. 5, and nothing is touched, when it is another user's, or a folder; 32 when another
+// process is writing it so, or has done since this one began.
 FileHandle FileCreatePrivate(const char* name, std::uint32_t access);
 
 bool FileClose(FileHandle file);
