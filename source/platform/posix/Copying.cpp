@@ -144,7 +144,9 @@ FolderTurn::FolderTurn(const std::string& native) {
     constexpr int kMostTries = 2000;
     file_ = OpenRetrying(native.c_str(), O_RDONLY | O_DIRECTORY);
     for (int i = 0; file_ >= 0 && i < kMostTries; ++i) {
-        if (systemCalls.flock(file_, LOCK_EX | LOCK_NB) == 0 || (errno != EWOULDBLOCK && errno != EINTR)) return;
+        held_ = Retry([&] { return systemCalls.flock(file_, LOCK_EX | LOCK_NB); }) == 0;
+        refused_ = !held_ && errno == EWOULDBLOCK;
+        if (!refused_) return;
         SleepMilliseconds(1);
     }
 }

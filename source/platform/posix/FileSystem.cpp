@@ -166,10 +166,7 @@ bool FileDelete(const char* name) {
 
 // ---- moving and copying ---------------------------------------------------------------------------------------------
 
-namespace {
-
-// For file systems that cannot rename without replacing. A file is linked under its new name first, which fails when
-// that is taken; for a folder, which cannot be linked, there is a moment between the look and the renaming.
+// A file is linked under its new name, which fails when that is taken; a folder cannot be linked.
 bool RenameWithoutReplacing(const std::string& from, const std::string& to) {
     if (systemCalls.renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), RENAME_NOREPLACE) == 0) return true;
     if (errno != EINVAL && errno != ENOSYS) return false;
@@ -179,6 +176,8 @@ bool RenameWithoutReplacing(const std::string& from, const std::string& to) {
     if (errno != ENOENT) return false;
     return systemCalls.renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), 0) == 0;
 }
+
+namespace {
 
 bool SameItem(const std::string& a, const std::string& b) {
     struct statx first, second;

@@ -70,9 +70,10 @@ bool MakeFolder(const std::string& native, unsigned mode) {
 bool MakeFolders(const std::string& native, unsigned mode) {
     if (MakeFolder(native, mode)) return true;
     if (errno == EEXIST) {
-        if (IsFolder(native, Links::kFollowed)) return true;
+        struct statx status;
+        if (!StatusOf(native, Links::kFollowed, STATX_TYPE, status)) return false;
         errno = ENOTDIR;
-        return false;
+        return S_ISDIR(status.stx_mode);
     }
     std::string parent = NativeParent(native);
     if (errno != ENOENT || parent == native || !MakeFolders(parent, mode)) return false;
