@@ -162,6 +162,10 @@ TESSEL_API MgErr FPrintfWErrv(File_t* file, CStr format, va_list args);
 // The calling thread's last error of the system as a result code. kIOErr for one without a closer code.
 TESSEL_API MgErr Win32ToOVFileErr(void);
 
+// Why the calling thread's last call failed, for people: what the system said, where `err` comes from it, else what the
+// code means (MgErrMeaning). The text is constant.
+TESSEL_API CStr FErrorText(MgErr err);
+
 // ---- creating, copying, moving, removing ----------------------------------------------------------------------------
 
 // Creates a file and opens it. `always` 0: kExistsErr when it exists; else an existing one is replaced by an empty one.

@@ -132,6 +132,11 @@ CopyResult FileCopyBytes(FileHandle from, FileHandle to, bool keepsHoles, FileVe
         if (result != CopyResult::kDone) return result;
         done = version.size;
     }
+    // Where it was cut there are no holes.
+    if (systemCalls.lseek(source, 0, SEEK_END) < done) {
+        FailWith(kErrorEndOfFile);
+        return CopyResult::kReadFailed;
+    }
     // What is at the end may be a hole, or what the target held before.
     if (Retry([&] { return systemCalls.ftruncate(target, static_cast<off_t>(done)); }) == 0) return CopyResult::kDone;
     FailErrno();
