@@ -11,6 +11,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <cstdio>
 
 namespace tessel::platform {
 
@@ -42,6 +43,10 @@ FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, 
 FileHandle FileCreatePrivate(const char* name, std::uint32_t access);
 
 bool FileClose(FileHandle file);
+
+// A stream of the C library for writing: at the end of the file with `append`, else after emptying it. It is made where
+// there is none. A folder or a pipe is refused (5). Null on failure.
+std::FILE* FileOpenStream(const char* name, bool append);
 
 // Move up to `count` bytes at the position, and the position with them. `actual` is set in every case. Reading ends
 // early only at the end of the file, which is no failure. Interrupted and short transfers go on by themselves. 5

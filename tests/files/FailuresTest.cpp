@@ -1,12 +1,17 @@
 // What copies and moves keep, and what failures say and leave behind.
+#include "platform/Module.h"
 #include "platform/posix/SystemCalls.h"
 #include "support/FailingPlatform.h"
 #include "support/StartedFiles.h"
+#include <tessel/diagnostics/FileLoc.h>
 #include <tessel/files/FileManager.h>
+#include <tessel/resources/ResourceManager.h>
+#include <tessel/strings/StringOutput.h>
 
 #include <cerrno>
 #include <fcntl.h>
 #include <filesystem>
+#include <memory>
 #include <set>
 #include <string>
 #include <sys/stat.h>
@@ -122,6 +127,26 @@ TEST_F(FailuresTest, OnlyRegularFilesAreCopied) {
     }
     EXPECT_EQ("kept", started.drive.Get("f"));
     EXPECT_FALSE(fs::exists(Native("copy")));
+}
+
+// Nor does anything wait for the other end of a pipe, whatever it is called.
+TEST_F(FailuresTest, NothingWaitsForAPipe) {
+    for (const char* name : {"pipe", "pipe.lnk", "pipe.so", "pipe.rsrc"})
+        ASSERT_EQ(0, mkfifo(Native(name).c_str(), 0600));
+    started.drive.Put("f", "kept");
+    File_t* file = nullptr;
+    EXPECT_EQ(kPermissionErr, FCreateAlways(&file, At("pipe"), 0, kFOpenReadWrite, kFDenyNone, 0));
+    EXPECT_EQ(kPermissionErr, FMOpen(&file, At("PIPE"), kFOpenReadWrite, kFDenyNone));
+    EXPECT_EQ(kPermissionErr, FMOpen(&file, At("pipe.lnk"), kFOpenRead, kFDenyNone));
+    const std::unique_ptr<StringOutput> output(
+        StringOutputFactory::CreateFileOutput(CreateFileLoc(1, started.drive.Name("pipe").c_str(), false)));
+    for (const auto mode : {StringOutput::kTruncate, StringOutput::kAppendAtEnd}) output->Open(mode);
+    output->PrintData("lost");
+    EXPECT_EQ(nullptr, platform::LibraryLoad(started.drive.Name("pipe.so").c_str()));
+    RsrcFile resources = 0;
+    EXPECT_NE(kNoErr, ROpenFile(At("pipe.rsrc"), kFOpenRead, &resources, nullptr, nullptr));
+    EXPECT_EQ(kNoErr, FMove(At("pipe"), At("moved")));
+    EXPECT_EQ(kNoErr, FRemove(At("moved")));
 }
 
 // In place where the file cannot be replaced: it has other names.

@@ -310,6 +310,29 @@ FileHandle FileCreatePrivate(const char* name, std::uint32_t access) {
     return HandleOf(descriptor, access);
 }
 
+std::FILE* FileOpenStream(const char* name, bool append) {
+    std::string native;
+    if (!NameToNativeText(name, native)) return nullptr;
+    const Match match = MatchOnDisk(native);
+    if (match != Match::kAll && match != Match::kLastMissing) {
+        FailMatch(match);
+        return nullptr;
+    }
+    const int descriptor = OpenAtOnce(native.c_str(), O_WRONLY | O_CREAT | (append ? O_APPEND : 0));
+    if (descriptor < 0) {
+        FailWith(errno == ENXIO ? kErrorAccessDenied : ErrorOfErrno(errno));  // a pipe that nobody reads
+        return nullptr;
+    }
+    struct statx status;
+    const bool known = systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_TYPE, &status) == 0 || FailErrno();
+    const bool usable = known && CheckKind(descriptor, status.stx_mode) &&
+                        (append || Truncate(descriptor, 0) || errno == EINVAL || FailErrno());
+    std::FILE* stream = usable ? ::fdopen(descriptor, append ? "a" : "w") : nullptr;
+    if (usable && !stream) FailErrno();
+    if (!stream) systemCalls.close(descriptor);
+    return stream;
+}
+
 bool FileClose(FileHandle file) {
     // After EINTR the descriptor is gone all the same; a second close could hit another thread's file.
     return systemCalls.close(DescriptorOf(file)) == 0 || errno == EINTR || FailErrno();
