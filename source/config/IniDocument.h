@@ -58,6 +58,9 @@ public:
     int32 LineOf(std::string_view section, std::string_view key) const;
     int32 FirstUnparsableLine() const { return firstUnparsable_; }
 
+    // What the texts take, those that were replaced and not left yet among them.
+    std::size_t TextBytes() const { return texts_.Used(); }
+
 private:
     friend class IniReader;
     friend class IniWriter;
