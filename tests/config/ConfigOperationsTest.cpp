@@ -10,6 +10,7 @@
 #include <array>
 #include <chrono>
 #include <csignal>
+#include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -438,15 +439,14 @@ TEST_F(PreferenceFile, ProcessesReadWhatOneOfThemWrote) {
             value.replace(0, 4, std::to_string(value.size()) + " ");
             value.resize(std::stoul(value), 'x');
             const std::string key = "k" + std::to_string(random() % kKeys);
-            if (random() % 2) {
-                good = store->SetValue(key, value) == kNoErr;
-            } else {
-                const MgErr err = store->GetValue(key, &value);
-                good = err == kConfigKeyErr || (err == kNoErr && intact(value));
-            }
+            const bool sets = random() % 2;
+            const MgErr err = sets ? store->SetValue(key, value) : store->GetValue(key, &value);
             clock.Advance(500);
             IniModel model;
+            good = sets ? err == kNoErr : err == kConfigKeyErr || (err == kNoErr && intact(value));
             good = good && model.Read(File()) && model.sections.size() == 1 && model.trailing == Names{";last"};
+            if (!good) std::fprintf(stderr, "%d: error %d, %s\n%s\n", process, err, value.c_str(), File().c_str());
+            if (!good) break;
             for (const auto& entry : model.sections.front().keys) good = good && intact(entry.value);
         }
         _exit(good ? 0 : 1);
