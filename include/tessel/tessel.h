@@ -11,6 +11,7 @@
 #include <tessel/base/OVExcept.h>
 #include <tessel/base/StringTypes.h>
 #include <tessel/base/Types.h>
+#include <tessel/config/ConfigOperations.h>
 #include <tessel/diagnostics/AllocTracker.h>
 #include <tessel/diagnostics/DebugOutput.h>
 #include <tessel/diagnostics/DebugStream.h>
