@@ -63,7 +63,8 @@ bool FileSetSize(FileHandle file, std::int64_t size);
 // failure, and where the file system cannot promise room.
 bool FileReserve(FileHandle file, std::int64_t size);
 
-// Puts what was written onto the device.
+// Puts what was written, and the file's size and permissions, onto the device. After a failure nobody knows what is
+// there: flushing again proves nothing, what was written has to be written anew.
 bool FileFlush(FileHandle file);
 
 // The whole file as read-only memory. 1006 for an empty file. The view outlives the handle.

@@ -27,6 +27,20 @@ struct ItemInfo {
 bool ItemGetInfo(const char* name, ItemInfo& info);
 bool FileGetInfo(FileHandle file, ItemInfo& info);
 
+// What shows whether a name still leads to the file and the text that it led to: another file, another size, or another
+// time of the last write, in whatever resolution the host keeps it.
+struct FileVersion {
+    std::uint64_t device, number;  // of the file
+    std::int64_t size;
+    std::int64_t seconds, nanoseconds;
+
+    bool operator==(const FileVersion&) const = default;
+};
+
+// As ItemGetInfo; but 2 for a link that leads nowhere.
+bool ItemGetVersion(const char* name, FileVersion& version);
+bool FileGetVersion(FileHandle file, FileVersion& version);
+
 enum class ItemKind { kNone, kFile, kFolder };
 ItemKind ItemExists(const char* name);
 

@@ -19,11 +19,7 @@ namespace tessel::platform {
 
 namespace {
 
-// Every open file holds locks on some of four bytes, which lie far beyond any data and are never written. The locks
-// belong to the open file description: they are seen between processes and between two opens of one process, and go
-// when the file is closed. All holders lock for reading, so that any number of them can hold the same mark. The order
-// of the marks makes the usual sets contiguous.
-constexpr std::int64_t kMarksAt = std::int64_t{1} << 62;
+// The order of the marks makes the usual sets contiguous.
 constexpr unsigned kHasWrite = 1, kHasRead = 2, kDenyWrite = 4, kDenyRead = 8;
 constexpr int kMarkCount = 4;
 
@@ -50,8 +46,6 @@ int LockBytes(int descriptor, int command, short type, std::int64_t start, std::
     return Retry([&] { return systemCalls.lock(descriptor, command, &range); });
 }
 
-enum class Marking { kDone, kRefused, kNoLocks };
-
 // Calls act(first mark, count) for each run of contiguous marks, until one of them is not kDone.
 template <typename Action>
 Marking ForEachRun(unsigned marks, Action act) {
@@ -70,19 +64,12 @@ Marking ForEachRun(unsigned marks, Action act) {
 // than it must: never too little.
 Marking SetMarks(int descriptor, unsigned marks, bool readable) {
     return ForEachRun(marks, [&](int first, int count) {
-        struct flock range;
-        short type = readable ? F_RDLCK : F_WRLCK;
-        if (LockBytes(descriptor, F_OFD_SETLK, type, kMarksAt + first, count, range) == 0) return Marking::kDone;
-        return errno == EAGAIN || errno == EACCES ? Marking::kRefused : Marking::kNoLocks;
+        return MarkBytes(descriptor, readable ? F_RDLCK : F_WRLCK, kMarksAt + first, count);
     });
 }
 
 Marking TestMarks(int descriptor, unsigned marks) {
-    return ForEachRun(marks, [&](int first, int count) {
-        struct flock range;
-        if (LockBytes(descriptor, F_OFD_GETLK, F_WRLCK, kMarksAt + first, count, range) != 0) return Marking::kNoLocks;
-        return range.l_type == F_UNLCK ? Marking::kDone : Marking::kRefused;
-    });
+    return ForEachRun(marks, [&](int first, int count) { return TestBytes(descriptor, kMarksAt + first, count); });
 }
 
 // Marks first and tests then: of two openers at the same moment at least one sees the other's marks. A file system that
@@ -95,6 +82,26 @@ bool ShareAllows(int descriptor, std::uint32_t access, std::uint32_t deny, bool 
     if (result == Marking::kRefused) result = TestMarks(descriptor, AdverseMarks(marks));
     return result != Marking::kRefused;
 }
+
+}  // namespace
+
+Marking MarkBytes(int descriptor, short type, std::int64_t start, std::int64_t count) {
+    struct flock range;
+    if (LockBytes(descriptor, F_OFD_SETLK, type, start, count, range) == 0) return Marking::kDone;
+    return errno == EAGAIN || errno == EACCES ? Marking::kRefused : Marking::kNoLocks;
+}
+
+Marking TestBytes(int descriptor, std::int64_t start, std::int64_t count) {
+    struct flock range;
+    if (LockBytes(descriptor, F_OFD_GETLK, F_WRLCK, start, count, range) != 0) return Marking::kNoLocks;
+    return range.l_type == F_UNLCK ? Marking::kDone : Marking::kRefused;
+}
+
+Marking MarkShare(int descriptor, std::uint32_t access, std::uint32_t deny) {
+    return SetMarks(descriptor, MarksOf(access, deny), true);
+}
+
+namespace {
 
 // ---- opening --------------------------------------------------------------------------------------------------------
 
@@ -120,11 +127,9 @@ bool MakeWaiting(int descriptor) {
 }
 
 // Folders, pipes and sockets have no bytes at positions. A device may be opened.
-bool CheckKind(int descriptor) {
-    struct statx status;
-    if (systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_TYPE, &status) != 0) return FailErrno();
-    if (S_ISREG(status.stx_mode)) return true;
-    if (S_ISDIR(status.stx_mode) || S_ISFIFO(status.stx_mode)) return FailWith(kErrorAccessDenied);
+bool CheckKind(int descriptor, unsigned mode) {
+    if (S_ISREG(mode)) return true;
+    if (S_ISDIR(mode) || S_ISFIFO(mode)) return FailWith(kErrorAccessDenied);
     return MakeWaiting(descriptor) || FailErrno();
 }
 
@@ -132,12 +137,41 @@ bool Truncate(int descriptor, std::int64_t size) {
     return Retry([&] { return systemCalls.ftruncate(descriptor, static_cast<off_t>(size)); }) == 0;
 }
 
-// What has to hold of a descriptor before it is handed out.
-bool Admit(int descriptor, std::uint32_t access, std::uint32_t deny, bool readable, bool empty) {
-    if (!CheckKind(descriptor)) return false;
-    if (!ShareAllows(descriptor, access, deny, readable)) return FailWith(kErrorSharingViolation);
-    if (empty && !Truncate(descriptor, 0) && errno != EINVAL) return FailErrno();  // EINVAL: a device
-    return true;
+enum class Admission { kGranted, kRefused, kReplaced };
+
+// Who replaces a file lets go of the old one's marks: they are on the new one. A file without a name that was opened by
+// one is such an old file, unless the name still leads to it (as those of open files under /proc do).
+bool WasReplaced(const char* native, const struct statx& status) {
+    if (status.stx_nlink != 0) return false;
+    struct statx named;
+    return !StatusOf(native, Links::kFollowed, STATX_INO, named) || !SameFile(status, named);
+}
+
+// What has to hold of a descriptor before it is handed out. LastError says why it is refused.
+Admission Admit(int descriptor, const char* native, std::uint32_t access, std::uint32_t deny, bool readable) {
+    const bool allowed = ShareAllows(descriptor, access, deny, readable);
+    struct statx status;
+    if (systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_TYPE | STATX_NLINK | STATX_INO, &status) != 0)
+        return FailErrno(), Admission::kRefused;
+    if (!CheckKind(descriptor, status.stx_mode)) return Admission::kRefused;
+    if (WasReplaced(native, status)) return Admission::kReplaced;
+    if (!allowed) FailWith(kErrorSharingViolation);
+    return allowed ? Admission::kGranted : Admission::kRefused;
+}
+
+// A descriptor that may be handed out, or kNotOpened with errno, or kNotAdmitted with LastError.
+constexpr int kNotOpened = -1, kNotAdmitted = -2;
+
+int OpenAdmitted(const std::string& native, std::uint32_t access, std::uint32_t deny, int flags) {
+    for (;;) {
+        bool readable = true;
+        const int descriptor = OpenDescriptor(native.c_str(), access, flags, readable);
+        if (descriptor < 0) return kNotOpened;
+        const Admission admission = Admit(descriptor, native.c_str(), access, deny, readable);
+        if (admission == Admission::kGranted) return descriptor;
+        systemCalls.close(descriptor);
+        if (admission == Admission::kRefused) return kNotAdmitted;
+    }
 }
 
 // Removes what has the name, when it is this user's and no folder. True also when there is nothing.
@@ -161,11 +195,10 @@ FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, 
     int flags = creates ? O_CREAT : 0;
     if (disposition == Disposition::kCreateNew) flags |= O_EXCL;
 
-    int descriptor = -1;
-    bool readable = true;
+    int descriptor = kNotAdmitted;
     auto open = [&](const std::string& native) {
-        descriptor = OpenDescriptor(native.c_str(), access, flags, readable);
-        return descriptor >= 0;
+        descriptor = OpenAdmitted(native, access, deny, flags);
+        return descriptor != kNotOpened;
     };
     if (creates) {
         std::string native;
@@ -178,7 +211,9 @@ FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, 
         return kNoFile;
     }
     if (descriptor < 0) return kNoFile;
-    if (Admit(descriptor, access, deny, readable, empties)) return HandleOf(descriptor, access);
+    if (!empties || Truncate(descriptor, 0) || errno == EINVAL)
+        return HandleOf(descriptor, access);  // EINVAL: a device
+    FailErrno();
     systemCalls.close(descriptor);
     return kNoFile;
 }
@@ -252,7 +287,7 @@ bool FileReserve(FileHandle file, std::int64_t size) {
 
 bool FileFlush(FileHandle file) {
     const int result = Retry([&] { return systemCalls.fsync(DescriptorOf(file)); });
-    return result == 0 || errno == EINVAL || errno == EROFS || FailErrno();  // both: there is no device to wait for
+    return result == 0 || errno == EINVAL || FailErrno();  // EINVAL: there is no device to wait for
 }
 
 // ---- mapping --------------------------------------------------------------------------------------------------------

@@ -35,10 +35,14 @@ namespace tessel::platform {
     X(int, statx, (int folder, const char* name, int flags, unsigned mask, struct statx* result))                  \
     X(int, futimens, (int file, const struct timespec* times))                                                     \
     X(int, fsetxattr, (int file, const char* name, const void* value, std::size_t size, int flags))                \
+    X(int, fchown, (int file, uid_t owner, gid_t group))                                                           \
+    X(ssize_t, flistxattr, (int file, char* names, std::size_t size))                                              \
+    X(int, fremovexattr, (int file, const char* name))                                                             \
     X(ssize_t, getxattr, (const char* path, const char* name, void* value, std::size_t size))                      \
     X(ssize_t, fgetxattr, (int file, const char* name, void* value, std::size_t size))                             \
     X(int, renameat2, (int fromFolder, const char* from, int toFolder, const char* to, unsigned flags))            \
     X(int, link, (const char* from, const char* to))                                                               \
+    X(int, linkat, (int fromFolder, const char* from, int toFolder, const char* to, int flags))                    \
     X(int, unlink, (const char* name))                                                                             \
     X(int, unlinkat, (int folder, const char* name, int flags))                                                    \
     X(int, rmdir, (const char* name))                                                                              \
