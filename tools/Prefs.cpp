@@ -23,7 +23,7 @@ public:
     explicit PrefsFile(const std::string& name) : name_(name), path_(name), store_(*path_.get(), kNoSection) {}
 
     void MustExist() const {
-        if (FExists(path_.get()) != kCfgPathFile) throw Refusal{name_, kNotFoundErr};
+        if (FExists(path_.get()) != tessel::kCfgPathFile) throw Refusal{name_, kNotFoundErr};
     }
     Words Sections() {
         Words names;

@@ -50,7 +50,9 @@ std::string ConfigName(std::string text) {
 }  // namespace
 
 bool CanBeFile(const PathRef& path) {
-    return path.IsValid() && !path.StartsWith(PathRef::kRelative) && path.ItemCount() > 0;
+    // Behind the drive, or the server and the share.
+    int32 names = path.StartsWith(PathRef::kUNC) ? 3 : 2;
+    return path.IsValid() && !path.StartsWith(PathRef::kRelative) && path.ItemCount() >= names;
 }
 
 PathRef PreferencePath(CStr text) {

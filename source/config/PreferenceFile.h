@@ -6,7 +6,7 @@
 
 namespace tessel {
 
-// Whether the path can be that of a file: absolute or on a server, and with a name.
+// Whether the path can be that of a file: a name on a drive or on a share of a server.
 bool CanBeFile(const PathRef& path);
 
 // The path of text of this library or of the host system; not-a-path when it is none of a file.

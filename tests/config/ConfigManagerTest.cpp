@@ -108,14 +108,16 @@ TEST(ConfigManager, StartsOnTheFileThatIsNamed) {
     ScratchDrive drive;
     TestApplication application;
     application.baseName = "tessel-test-" + std::to_string(::getpid());
-    Path folder = nullptr;
+    char native[1024];
+    std::string byDefault;
     {
         StartedLibrary library;
+        Path folder = nullptr;
         ASSERT_EQ(kNoErr, FAppPath(&folder));
+        byDefault = folder->ToString(PathRef::StringDisplay()) + "\\" + application.baseName + ".ini";
+        FDestroyPath(&folder);
     }
-    char native[1024];
-    const std::string byDefault = folder->ToString(PathRef::StringDisplay()) + "\\" + application.baseName + ".ini";
-    StartedLibrary keep;  // for the path
+    ASSERT_EQ(kNoErr, InitTesselBase());
     const std::string nativeName = drive.Native("native.ini");
     const struct {
         const char* set;
@@ -128,8 +130,6 @@ TEST(ConfigManager, StartsOnTheFileThatIsNamed) {
         {nativeName.c_str(), {"app"}, "T:\\native.ini"},
         {"\\\\", {"app"}, byDefault},
     };
-    FDestroyPath(&folder);
-    UninitTesselAppSupport();
     for (const auto& row : rows) {
         std::vector<char*> arguments;
         for (const char* word : row.line) arguments.push_back(const_cast<char*>(word));
@@ -151,11 +151,11 @@ TEST(ConfigManager, StartsOnTheFileThatIsNamed) {
         SetPrefsPath(nullptr);
         EXPECT_EQ(kGenericErr, CfgGetDefault(kConfigI32, Key("n"), &value));
     }
-    InitTesselAppSupport();
+    UninitTesselBase();
 }
 
 TEST(ConfigManager, TakesTheSectionOfTheEdition) {
-    StartedConfig started("[App]\na=1\n[base]\na=2\n[AltRT]\na=3\n[AltFFRT]\na=4\n[]\na=5\n[Other]\na=6\n");
+    StartedConfig started("[App]\na=1\n[base]\na=2\n[AltRT]\na=3\n[AltFFRT]\na=4\n[Other]\na=6\n");
     TestApplication& app = started.application;
     for (const auto& [bound, runTime, full, section, value] : std::vector<std::tuple<int, int, int, std::string, int>>{
              {0, 0, 0, "App", 1}, {1, 1, 1, "base", 2}, {0, 1, 1, "AltRT", 3}, {0, 0, 1, "AltFFRT", 4}}) {
