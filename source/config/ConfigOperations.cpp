@@ -168,12 +168,9 @@ MgErr BMINIConfigOperations::Store::Refresh(News& news, bool& missing) {
 }
 
 MgErr BMINIConfigOperations::Store::Save() {
-    platform::FileVersion version{};
-    const MgErr err = SaveIni(name_, document, version);
-    if (err) return err;
-    version_ = version;
-    loaded_ = true;
-    return kNoErr;
+    const MgErr err = SaveIni(name_, document, version_);
+    if (!err) loaded_ = true;
+    return err;
 }
 
 MgErr BMINIConfigOperations::Store::SaveInFolder() {

@@ -2,6 +2,7 @@
 
 #include "platform/File.h"
 #include "platform/LastError.h"
+#include "platform/Replacement.h"
 
 #include <new>
 #include <utility>
@@ -63,6 +64,57 @@ private:
     platform::FileHandle file_;
 };
 
+// How an attempt to save went.
+enum class Saved {
+    kYes,
+    kNotWritable,  // the file, or where there is none its folder
+    kCannotMake,   // a file beside it
+    kCannotWrite,  // to the device
+    kOvertaken,    // another file has the name now
+    kCannotReplace,
+    kNoMemory
+};
+
+Saved WhyNotBegun(platform::ReplaceFailure failure, bool newFile) {
+    const platform::ErrorNumber error = platform::LastError();
+    if (error == platform::kErrorNotEnoughMemory) return Saved::kNoMemory;
+    if (failure == platform::ReplaceFailure::kCannotRename) return Saved::kOvertaken;
+    return newFile && error == platform::kErrorAccessDenied ? Saved::kNotWritable : Saved::kCannotMake;
+}
+
+Saved WhyNotFinished(platform::ReplaceFailure failure) {
+    if (failure == platform::ReplaceFailure::kCannotFlush) return Saved::kCannotWrite;
+    if (failure == platform::ReplaceFailure::kCannotMake) return Saved::kCannotMake;
+    const platform::ErrorNumber error = platform::LastError();
+    const bool overtaken = error == platform::kErrorFileExists || IsMissing(error);
+    return overtaken ? Saved::kOvertaken : Saved::kCannotReplace;
+}
+
+Saved SaveOnce(const std::string& name, const IniDocument& document, platform::FileVersion& version) {
+    bool newFile = false;
+    {
+        const OpenIni target(name, platform::kRead | platform::kWrite);
+        newFile = !target && IsMissing(platform::LastError());
+        if (!target && !newFile) return Saved::kNotWritable;
+    }
+    platform::Replacement replacement;
+    platform::ReplaceRequest request;
+    request.name = name.c_str();
+    request.pattern = "ini$$%d.TMP";
+    request.limit = 1000;
+    request.breaksLinks = true;
+    request.ownerMayChange = true;
+    if (!replacement.Begin(request)) return WhyNotBegun(replacement.Failure(), newFile);
+    FileOutput output(replacement.File());
+    platform::FileVersion written{};
+    if (!document.Write(output)) return Saved::kCannotWrite;
+    if (!platform::FileGetVersion(replacement.File(), written)) return Saved::kCannotWrite;
+    const bool finished = replacement.Finish();
+    // What has the name is ours, even where it is not known to be on the device.
+    if (replacement.HasName()) version = written;
+    return finished ? Saved::kYes : WhyNotFinished(replacement.Failure());
+}
+
 }  // namespace
 
 MgErr LoadIni(const std::string& name, IniDocument& document, platform::FileVersion& version, bool& missing) {
@@ -81,14 +133,25 @@ MgErr LoadIni(const std::string& name, IniDocument& document, platform::FileVers
 }
 
 MgErr SaveIni(const std::string& name, const IniDocument& document, platform::FileVersion& version) {
+    // Another process may put its file there while this one is written: then that one is replaced.
+    constexpr int kMostAttempts = 1000;
     if (name.empty()) return kGenericErr;
-    const platform::FileHandle file =
-        platform::FileOpen(name.c_str(), platform::kRead | platform::kWrite, 0, platform::Disposition::kCreateAlways);
-    if (file == platform::kNoFile) return kPermissionErr;
-    FileOutput output(file);
-    const bool written = document.Write(output) && platform::FileFlush(file) && platform::FileGetVersion(file, version);
-    platform::FileClose(file);
-    return written ? kNoErr : kDiskFullErr;
+    Saved saved = Saved::kOvertaken;
+    for (int attempt = 0; saved == Saved::kOvertaken && attempt < kMostAttempts; ++attempt) {
+        saved = SaveOnce(name, document, version);
+    }
+    switch (saved) {
+        case Saved::kYes:
+            return kNoErr;
+        case Saved::kCannotMake:
+            return kIOErr;
+        case Saved::kCannotWrite:
+            return kDiskFullErr;
+        case Saved::kNoMemory:
+            return kConfigMemErr;
+        default:
+            return kPermissionErr;
+    }
 }
 
 }  // namespace tessel

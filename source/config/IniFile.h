@@ -16,8 +16,8 @@ MgErr LoadIni(const std::string& name, IniDocument& document, platform::FileVers
 
 // Puts the document in the place of the file, or makes one, and tells which version it is. Atomic and durable.
 // kPermissionErr when the file cannot be written or replaced, kIOErr when no temporary file can be made beside it,
-// kDiskFullErr when what is written does not reach the disk: all leave the file as it was. kGenericErr for an empty
-// name. May raise std::bad_alloc.
+// kDiskFullErr when what is written does not reach the disk: all leave the file as it was, but for a disk that fails
+// when the folder is flushed. kGenericErr for an empty name. May raise std::bad_alloc.
 MgErr SaveIni(const std::string& name, const IniDocument& document, platform::FileVersion& version);
 
 }  // namespace tessel
