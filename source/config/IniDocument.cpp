@@ -1,7 +1,6 @@
 #include "config/IniDocument.h"
 
 #include "config/IniNames.h"
-#include "config/IniTable.h"
 
 #include <new>
 #include <utility>
@@ -18,25 +17,26 @@ bool HoldsLineFeed(std::string_view text) {
 
 }  // namespace
 
-std::uint32_t IniDocument::KeyHash(Index section, std::string_view trimmed) {
-    return IniNameHash(trimmed, section);
+IniDocument::KeyName::KeyName(Index inSection, std::string_view trimmed)
+    : section(inSection), text(trimmed), hash(IniNameHash(trimmed, inSection)) {
 }
 
 // ---- looking up -----------------------------------------------------------------------------------------------------
 
 IniDocument::Index IniDocument::FindSection(std::string_view trimmed) const {
-    return sectionTable_.Find(sections_, IniNameHash(trimmed, kSectionSeed),
-                              [&](const Section& section) { return EqualIniNames(section.name, trimmed); });
+    return sectionTable_.Find(IniNameHash(trimmed, kSectionSeed),
+                              [&](Index index) { return EqualIniNames(sections_[index].name, trimmed); });
 }
 
-IniDocument::Index IniDocument::FindKey(Index section, std::string_view trimmed) const {
-    return keyTable_.Find(keys_, KeyHash(section, trimmed),
-                          [&](const Key& key) { return key.section == section && EqualIniNames(key.name, trimmed); });
+IniDocument::Index IniDocument::FindKey(const KeyName& name) const {
+    return keyTable_.Find(name.hash, [&](Index index) {
+        return keys_[index].section == name.section && EqualIniNames(keys_[index].name, name.text);
+    });
 }
 
 IniDocument::Index IniDocument::FindKey(std::string_view section, std::string_view key) const {
     const Index found = FindSection(TrimmedIni(section));
-    return found == kNone ? kNone : FindKey(found, TrimmedIni(key));
+    return found == kNone ? kNone : FindKey({found, TrimmedIni(key)});
 }
 
 const std::string_view* IniDocument::Find(std::string_view section, std::string_view key) const {
@@ -64,16 +64,15 @@ void IniDocument::ListKeys(std::string_view section, std::vector<std::string>& n
 void IniDocument::MakeRoom() {
     MakeRoomInRecords(keys_);
     MakeRoomInRecords(sections_);
-    keyTable_.MakeRoom(keys_, keys_.size() + 1);
-    sectionTable_.MakeRoom(sections_, sections_.size() + 1);
+    keyTable_.MakeRoom(keys_.size() + 1);
+    sectionTable_.MakeRoom(sections_.size() + 1);
 }
 
 // The keys without a section have no header in the file: they come first, whenever they are added.
 IniDocument::Index IniDocument::AddSection(std::string_view name, bool added) {
     const Index index = static_cast<Index>(sections_.size());
-    sections_.push_back(
-        {name, IniNameHash(name, kSectionSeed), kNone, kNone, kNone, kNone, {}, added, added && HoldsLineFeed(name)});
-    sectionTable_.Insert(sections_, index);
+    sections_.push_back({name, kNone, kNone, kNone, {}, added, added && HoldsLineFeed(name)});
+    sectionTable_.Insert(IniNameHash(name, kSectionSeed), index);
     if (IsNullSection(name)) {
         sections_[index].next = firstSection_;
         firstSection_ = index;
@@ -84,7 +83,7 @@ IniDocument::Index IniDocument::AddSection(std::string_view name, bool added) {
     return index;
 }
 
-IniDocument::Index IniDocument::AddKey(Index section, std::string_view name, std::string_view value, int32 line) {
+IniDocument::Index IniDocument::AddKey(const KeyName& name, std::string_view value, int32 line) {
     Index index = unusedKeys_;
     if (index == kNone) {
         index = static_cast<Index>(keys_.size());
@@ -92,17 +91,17 @@ IniDocument::Index IniDocument::AddKey(Index section, std::string_view name, std
     } else {
         unusedKeys_ = keys_[index].next;
     }
-    keys_[index] = {name, value, KeyHash(section, name), section, kNone, kNone, {}, line, false, false};
-    LinkLast(index);
+    keys_[index] = {name.text, value, name.section, kNone, {}, line, false, false};
+    LinkLast(index, name.hash);
     return index;
 }
 
-void IniDocument::LinkLast(Index key) {
+void IniDocument::LinkLast(Index key, std::uint32_t hash) {
     Section& section = sections_[keys_[key].section];
     keys_[key].next = kNone;
     (section.lastKey == kNone ? section.firstKey : keys_[section.lastKey].next) = key;
     section.lastKey = key;
-    keyTable_.Insert(keys_, key);
+    keyTable_.Insert(hash, key);
 }
 
 MgErr IniDocument::Set(std::string_view section, std::string_view key, std::string_view value) {
@@ -112,12 +111,12 @@ MgErr IniDocument::Set(std::string_view section, std::string_view key, std::stri
     const bool quoted = StripQuotes(text);
     const std::string_view kept = texts_.Keep(text);
     Index inSection = FindSection(sectionName);
-    Index index = inSection == kNone ? kNone : FindKey(inSection, keyName);
+    Index index = inSection == kNone ? kNone : FindKey({inSection, keyName});
     if (index == kNone) {
         MakeRoom();
         const std::string_view newKey = texts_.Keep(keyName);
         if (inSection == kNone) inSection = AddSection(texts_.Keep(sectionName), true);
-        index = AddKey(inSection, newKey, kept, -1);
+        index = AddKey({inSection, newKey}, kept, -1);
     }
     Key& changed = keys_[index];
     changed.value = kept;
@@ -131,7 +130,7 @@ void IniDocument::Unlink(Index key, Index before) {
     Section& section = sections_[keys_[key].section];
     (before == kNone ? section.firstKey : keys_[before].next) = keys_[key].next;
     if (section.lastKey == key) section.lastKey = before;
-    keyTable_.Erase(keys_, key);
+    keyTable_.Erase(NameOf(key).hash, key);
     keys_[key].next = unusedKeys_;
     unusedKeys_ = key;
 }
@@ -154,7 +153,7 @@ MgErr IniDocument::Remove(std::string_view section, std::string_view key, bool& 
     const std::string_view sectionName = TrimmedIni(section), keyName = TrimmedIni(key);
     if (sectionName.empty() || keyName.empty()) return kConfigTypeErr;
     const Index inSection = FindSection(sectionName);
-    const Index found = inSection == kNone ? kNone : FindKey(inSection, keyName);
+    const Index found = inSection == kNone ? kNone : FindKey({inSection, keyName});
     if (found == kNone) return kNoErr;
     removed = true;
     Lines& behind = LinesBehind(keys_[found]);
@@ -172,11 +171,10 @@ bool IniDocument::NameOnlySection(std::string_view name) {
     if (sections_.size() != 1 || !IsNullSection(sections_[0].name)) return false;
     if (trimmed.empty() || IsNullSection(trimmed)) return false;
     const std::string_view kept = texts_.Keep(trimmed);
-    sectionTable_.Erase(sections_, 0);
+    sectionTable_.Erase(IniNameHash(sections_[0].name, kSectionSeed), 0);
     sections_[0].name = kept;
-    sections_[0].hash = IniNameHash(kept, kSectionSeed);
     sections_[0].linesWithin = HoldsLineFeed(kept);
-    sectionTable_.Insert(sections_, 0);
+    sectionTable_.Insert(IniNameHash(kept, kSectionSeed), 0);
     return true;
 }
 

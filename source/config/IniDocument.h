@@ -12,6 +12,7 @@
 #ifndef TESSEL_SOURCE_CONFIG_INIDOCUMENT_H
 #define TESSEL_SOURCE_CONFIG_INIDOCUMENT_H
 
+#include "config/IniTable.h"
 #include "config/IniTexts.h"
 #include <tessel/base/MgErr.h>
 #include <tessel/memory/TrackedMallocFree.h>
@@ -65,8 +66,8 @@ private:
     friend class IniReader;
     friend class IniWriter;
 
-    using Index = std::uint32_t;
-    static constexpr Index kNone = UINT32_MAX;
+    using Index = IniTable::Index;
+    static constexpr Index kNone = IniTable::kNone;
     template <class T>
     using Records = std::vector<T, TrackedAllocator<T>>;
 
@@ -81,10 +82,8 @@ private:
 
     struct Key {
         std::string_view name, value;
-        std::uint32_t hash;
         Index section;
-        Index next;        // in the section; of a record that is not used: the next of those
-        Index sameBucket;  // in the table
+        Index next;  // in the section; of a record that is not used: the next of those
         Lines comments;
         int32 line;
         bool quoted;       // written within double quotes
@@ -93,34 +92,25 @@ private:
 
     struct Section {
         std::string_view name;
-        std::uint32_t hash;
         Index next;
-        Index sameBucket;
         Index firstKey = kNone, lastKey = kNone;
         Lines comments;
         bool added;        // in memory
         bool linesWithin;  // its name holds a line feed
     };
 
-    // Finds records by hash. The records carry the chains.
-    template <class Record>
-    class Table {
-    public:
-        template <class Matches>
-        Index Find(const Records<Record>& records, std::uint32_t hash, Matches matches) const;
-        // Room for so many records. May raise; the others do not.
-        void MakeRoom(Records<Record>& records, std::size_t count);
-        void Insert(Records<Record>& records, Index index);
-        void Erase(Records<Record>& records, Index index);
+    // What a key is found by.
+    struct KeyName {
+        KeyName(Index inSection, std::string_view trimmed);
 
-    private:
-        Index& HeadOf(std::uint32_t hash) { return heads_[hash & (heads_.size() - 1)]; }
-
-        Records<Index> heads_;  // a power of two of them, or none
+        Index section;
+        std::string_view text;
+        std::uint32_t hash;
     };
 
     Index FindSection(std::string_view trimmed) const;
-    Index FindKey(Index section, std::string_view trimmed) const;
+    Index FindKey(const KeyName& name) const;
+    KeyName NameOf(Index key) const { return {keys_[key].section, keys_[key].name}; }
     Index FindKey(std::string_view section, std::string_view key) const;
     // Room for one more: AddSection and AddKey, which come after it, do not raise. Their texts are the document's.
     void MakeRoom();
@@ -130,8 +120,8 @@ private:
         if (records.size() == records.capacity()) records.reserve(records.size() * 2 + 16);
     }
     Index AddSection(std::string_view name, bool added);
-    Index AddKey(Index section, std::string_view name, std::string_view value, int32 line);
-    void LinkLast(Index key);
+    Index AddKey(const KeyName& name, std::string_view value, int32 line);
+    void LinkLast(Index key, std::uint32_t hash);
     // Takes a key out of the table and of its section, where it follows `before` (kNone: it is the first).
     void Unlink(Index key, Index before);
     // `from` behind `to`, in `to`.
@@ -141,15 +131,12 @@ private:
     template <class Visit>
     void ForEachText(Visit visit);
 
-    static std::uint32_t KeyHash(Index section, std::string_view trimmed);
-
     IniTexts texts_;
     std::size_t textsKept_ = 0;  // bytes of texts_ when none was replaced yet
     Records<Section> sections_;
     Records<Key> keys_;
     Records<Line> lines_;
-    Table<Section> sectionTable_;
-    Table<Key> keyTable_;
+    IniTable sectionTable_, keyTable_;
     Index firstSection_ = kNone, lastSection_ = kNone;
     Index unusedKeys_ = kNone;
     Lines trailing_;

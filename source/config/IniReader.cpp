@@ -1,6 +1,5 @@
 #include "config/IniDocument.h"
 #include "config/IniNames.h"
-#include "config/IniTable.h"
 
 #include <array>
 #include <utility>
@@ -119,8 +118,9 @@ bool IniReader::TakeKey(const char* begin, const char* separator, const char* en
     document_.MakeRoom();
     if (section_ == kNone) section_ = document_.FindSection(kNullSection);
     if (section_ == kNone) section_ = document_.AddSection(kNullSection, false);
-    Index index = document_.FindKey(section_, name);
-    if (index == kNone) index = document_.AddKey(section_, name, value, line_);
+    const IniDocument::KeyName keyName(section_, name);
+    Index index = document_.FindKey(keyName);
+    if (index == kNone) index = document_.AddKey(keyName, value, line_);
     IniDocument::Key& key = document_.keys_[index];
     key.value = value;
     key.quoted = quoted;
@@ -156,7 +156,7 @@ MgErr IniReader::Read() {
     if (bytes.substr(0, 3) == "\xEF\xBB\xBF"sv) at_ += 3;
     // About what there will be: nothing is copied while it grows.
     document_.keys_.reserve(bytes.size() / 24);
-    document_.keyTable_.MakeRoom(document_.keys_, bytes.size() / 24);
+    document_.keyTable_.MakeRoom(bytes.size() / 32);
     while (at_ < end_) ReadLine();
     document_.trailing_ = TakePending();
     if (!hasContinuations_) return kNoErr;
@@ -188,15 +188,15 @@ IniDocument::Index IniReader::JoinRun(Index first, std::string_view base) {
         at = next;
     }
     keys[first].name = base;
-    keys[first].hash = IniDocument::KeyHash(keys[first].section, base);
     keys[first].value = {value, size};
     return behind;
 }
 
 void IniReader::Merge(Index key) {
     auto& keys = document_.keys_;
-    const Index there = document_.FindKey(keys[key].section, keys[key].name);
-    if (there == kNone) return document_.LinkLast(key);
+    const IniDocument::KeyName name = document_.NameOf(key);
+    const Index there = document_.FindKey(name);
+    if (there == kNone) return document_.LinkLast(key, name.hash);
     keys[there].value = keys[key].value;
     keys[there].quoted = keys[key].quoted;
     document_.Append(keys[there].comments, keys[key].comments);
@@ -207,7 +207,9 @@ void IniReader::Merge(Index key) {
 void IniReader::JoinContinuations(Index section) {
     auto& keys = document_.keys_;
     IniDocument::Section& joined = document_.sections_[section];
-    for (Index at = joined.firstKey; at != kNone; at = keys[at].next) document_.keyTable_.Erase(keys, at);
+    for (Index at = joined.firstKey; at != kNone; at = keys[at].next) {
+        document_.keyTable_.Erase(document_.NameOf(at).hash, at);
+    }
     Index next = std::exchange(joined.firstKey, kNone);
     joined.lastKey = kNone;
     while (next != kNone) {

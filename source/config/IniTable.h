@@ -1,49 +1,73 @@
-// How IniDocument finds records by hash.
+// Numbers of records, found by hash. The hashes lie with the numbers, side by side, so that a record which is not there
+// is mostly not found with one look at memory.
 #ifndef TESSEL_SOURCE_CONFIG_INITABLE_H
 #define TESSEL_SOURCE_CONFIG_INITABLE_H
 
-#include "config/IniDocument.h"
+#include <tessel/memory/TrackedMallocFree.h>
 
-#include <algorithm>
-#include <utility>
+#include <cstddef>
+#include <cstdint>
+#include <vector>
 
 namespace tessel {
 
-template <class Record>
-template <class Matches>
-IniDocument::Index IniDocument::Table<Record>::Find(const Records<Record>& records, std::uint32_t hash,
-                                                    Matches matches) const {
-    if (heads_.empty()) return kNone;
-    Index at = heads_[hash & (heads_.size() - 1)];
-    while (at != kNone && (records[at].hash != hash || !matches(records[at]))) at = records[at].sameBucket;
-    return at;
-}
+class IniTable {
+public:
+    using Index = std::uint32_t;
+    static constexpr Index kNone = UINT32_MAX;
 
-template <class Record>
-void IniDocument::Table<Record>::MakeRoom(Records<Record>& records, std::size_t count) {
-    if (count <= heads_.size()) return;
-    std::size_t size = 64;
-    while (size < count) size *= 2;
-    Records<Index> old(size, kNone);
-    old.swap(heads_);
-    for (Index next : old) {
-        while (next != kNone) Insert(records, std::exchange(next, records[next].sameBucket));
+    // The first record of that hash for which matches(index) is true, or kNone.
+    template <class Matches>
+    Index Find(std::uint32_t hash, Matches matches) const {
+        if (slots_.empty()) return kNone;
+        for (std::size_t at = hash & mask_; slots_[at].index != kNone; at = (at + 1) & mask_) {
+            if (slots_[at].hash == hash && matches(slots_[at].index)) return slots_[at].index;
+        }
+        return kNone;
     }
-}
 
-template <class Record>
-void IniDocument::Table<Record>::Insert(Records<Record>& records, Index index) {
-    Index& head = HeadOf(records[index].hash);
-    records[index].sameBucket = head;
-    head = index;
-}
+    // Room for so many records. May raise std::bad_alloc; the others do not.
+    void MakeRoom(std::size_t count) {
+        if (count < slots_.size() / 3 * 2) return;
+        std::size_t size = 64;
+        while (size / 3 * 2 <= count) size *= 2;
+        Slots old(size, Slot{0, kNone});
+        old.swap(slots_);
+        mask_ = size - 1;
+        for (const Slot& slot : old) {
+            if (slot.index != kNone) Insert(slot.hash, slot.index);
+        }
+    }
 
-template <class Record>
-void IniDocument::Table<Record>::Erase(Records<Record>& records, Index index) {
-    Index* link = &HeadOf(records[index].hash);
-    while (*link != index) link = &records[*link].sameBucket;
-    *link = records[index].sameBucket;
-}
+    void Insert(std::uint32_t hash, Index index) {
+        std::size_t at = hash & mask_;
+        while (slots_[at].index != kNone) at = (at + 1) & mask_;
+        slots_[at] = {hash, index};
+    }
+
+    // What stands behind it moves up, unless it would come before its own place.
+    void Erase(std::uint32_t hash, Index index) {
+        std::size_t hole = hash & mask_;
+        while (slots_[hole].index != index) hole = (hole + 1) & mask_;
+        for (std::size_t at = (hole + 1) & mask_; slots_[at].index != kNone; at = (at + 1) & mask_) {
+            const std::size_t home = slots_[at].hash & mask_;
+            if (((at - home) & mask_) < ((at - hole) & mask_)) continue;
+            slots_[hole] = slots_[at];
+            hole = at;
+        }
+        slots_[hole].index = kNone;
+    }
+
+private:
+    struct Slot {
+        std::uint32_t hash;
+        Index index;
+    };
+    using Slots = std::vector<Slot, TrackedAllocator<Slot>>;
+
+    Slots slots_;  // a power of two of them, or none; never full
+    std::size_t mask_ = 0;
+};
 
 }  // namespace tessel
 
