@@ -2,7 +2,7 @@
 
 #include <errno.h>
 #include <stdio.h>
-#include <sys/mman.h>
+#include <sys/file.h>
 #include <sys/random.h>
 #include <sys/syscall.h>
 #include <sys/xattr.h>
@@ -62,8 +62,6 @@ constinit SystemCalls systemCalls = {
     .syncfs = ::syncfs,
     .lock = Lock,
     .fcntl = Fcntl,
-    .mmap = ::mmap,
-    .munmap = ::munmap,
     .statx = ::statx,
     .futimens = ::futimens,
     .fsetxattr = ::fsetxattr,
@@ -75,6 +73,9 @@ constinit SystemCalls systemCalls = {
     .renameat2 = ::renameat2,
     .link = ::link,
     .linkat = ::linkat,
+    .symlink = ::symlink,
+    .lchown = ::lchown,
+    .flock = ::flock,
     .unlink = ::unlink,
     .unlinkat = ::unlinkat,
     .rmdir = ::rmdir,
@@ -83,6 +84,7 @@ constinit SystemCalls systemCalls = {
     .chmod = ::chmod,
     .fchmod = ::fchmod,
     .opendir = ::opendir,
+    .fdopendir = ::fdopendir,
     .readdir = ::readdir,
     .closedir = ::closedir,
     .getcwd = ::getcwd,
