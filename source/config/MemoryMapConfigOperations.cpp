@@ -103,4 +103,14 @@ MgErr MemoryMapConfigOperations::GetKeyNames(const std::string& section, std::ve
     });
 }
 
+MgErr MemoryMapConfigOperations::GetAllKeyNames(std::vector<std::string>* names) {
+    if (!names) return kArgErr;
+    names->clear();
+    return Guarded([&] {
+        const ThMutexHolder lock(store_->mutex.Get());
+        for (const auto& entry : store_->values) names->push_back(entry.first);
+        return kNoErr;
+    });
+}
+
 }  // namespace tessel

@@ -146,6 +146,9 @@ public:
     // entries without a ".".
     MgErr GetKeyNames(const std::string& section, std::vector<std::string>* names) override;
 
+    // Every entry as it is kept: section + "." + key, or the key alone.
+    MgErr GetAllKeyNames(std::vector<std::string>* names);
+
 private:
     class Store;
     std::unique_ptr<Store> store_;

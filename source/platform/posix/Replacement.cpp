@@ -182,7 +182,8 @@ bool Replacement::Work::FindFolder() {
     failure = ReplaceFailure::kCannotMake;
     if (!request.name) return FailWith(kErrorInvalidParameter);
     if (!NameToNativeText(request.name, native)) return false;
-    if (MatchOnDisk(native) == Match::kParentMissing) return FailWith(kErrorPathNotFound);
+    const Match match = MatchOnDisk(native);
+    if (match != Match::kAll && match != Match::kLastMissing) return FailMatch(match);
     const bool takenByLink = request.mustNotExist && Exists(native);
     if (takenByLink) return FailNumber(ReplaceFailure::kCannotRename, kErrorFileExists);
     if (!FollowLinks(native)) return FailErrno();
@@ -274,7 +275,8 @@ void Replacement::Work::SetMark(int descriptor, bool on) const {
 bool Replacement::Work::MakeFile() {
     for (int number = 0; number < kSwept && number < request.limit; ++number) RemoveLeftover(NumberedName(number));
     // Without a name nobody else reaches it, so that one like any new file may have their mode at once.
-    const bool plain = target < 0 && request.like == kNoFile;
+    const bool plain = target < 0 && request.like == kNoFile && request.mode < 0;
+    mode = request.mode;
     file = OpenAtRetrying(folder, ".", O_TMPFILE | O_RDWR, plain ? 0666 : 0600);
     if (file >= 0) {
         MarkBytes(file, F_WRLCK, kWriterMark, 1);
