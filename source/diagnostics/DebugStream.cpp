@@ -94,10 +94,6 @@ MgErr DebugStreamStop() {
     return kNoErr;
 }
 
-int32 DebugStreamFailedCheckouts() {
-    return theFailedCheckouts;
-}
-
 DebugStream::DebugStream(CStr file, int32 line, CStr identifier, _DebugOutputLevel level) noexcept
     : file_(file), line_(line), identifier_(identifier), level_(level), inUse_(nullptr) {
     if (Slot* slot = ClaimFromPool()) {

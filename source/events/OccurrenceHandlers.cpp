@@ -1,3 +1,4 @@
+// What becomes of a handler: the lists it is on, bound, armed, fired and run.
 #include "events/OccurrenceThread.h"
 #include "events/Occurrences.h"
 #include "events/ThreadGroups.h"
@@ -25,7 +26,7 @@ void Fire(occh& handler, bool timedOut, OccurrenceReports& reports) {
     handler.armed = 0;
     handler.fired = 1;
     LeaveTimedList(handler);
-    handler.flags = timedOut ? handler.flags | kTimedOut : handler.flags & ~kTimedOut;
+    handler.flags = timedOut ? handler.flags | kHasTimedOut : handler.flags & ~kHasTimedOut;
     if (IsDamaged(handler.firedNode, handler)) reports.Add(OccurrenceReports::kBogusFired);
     ThreadGroup& group = gThreadGroups[handler.group];
     group.fired.PushFront(handler.firedNode);
@@ -132,14 +133,14 @@ Outcome ArmRecord(occh& handler, const Arming& arming, OccurrenceReports& report
     LeaveTimedList(handler);
     const Occ* occurrence = FindOccurrence(handler.occurrence);
     if (!occurrence) {
-        handler.flags |= kTimedOut;
+        handler.flags |= kHasTimedOut;
         return RunNow(handler, kOccurrenceGoneErr);
     }
-    if (arming.withTimeout) handler.flags &= ~kTimedOut;
+    if (arming.withTimeout) handler.flags &= ~kHasTimedOut;
     if (handler.group != kThreadSafeGroup) handler.group = OwnThreadGroup();
     if (arming.reset) handler.seen = occurrence->count;
     if (handler.seen != occurrence->count) {
-        handler.flags &= ~kTimedOut;
+        handler.flags &= ~kHasTimedOut;
         handler.seen = handler.flags & kStrict ? NextCount(handler.seen) : occurrence->count;
         return RunNow(handler, kNoErr);
     }
@@ -246,5 +247,5 @@ MgErr FireOccurHdlr(OccurHdlr handler) {
 bool HandlerTimedOut(OccurHdlr handler) {
     OccurrenceLockHolder holder(gOccMutex);
     const occh* record = FindHandler(handler);
-    return record && (record->flags & kTimedOut);
+    return record && (record->flags & kHasTimedOut);
 }

@@ -33,7 +33,7 @@ int32 RootOf(int32 index) {
 
 // Accounts for what a handler that runs has seen. One that timed out has seen nothing.
 void AccountForOccurrence(occh& handler) TESSEL_REQUIRES(gOccMutex) {
-    if (handler.flags & kTimedOut) return;
+    if (handler.flags & kHasTimedOut) return;
     const Occ* occurrence = FindOccurrence(handler.occurrence);
     if (!occurrence) return;
     handler.seen = handler.flags & kStrict ? NextCount(handler.seen) : occurrence->count;

@@ -20,9 +20,9 @@ struct alignas(kAlignment) Link {
 };
 
 struct alignas(64) Shard {
-    platform::Mutex mutex;  // guards the rest, and the links of the blocks in it
-    Link* first = nullptr;
-    uint64 bytes = 0;
+    platform::Mutex mutex;  // guards the links of the blocks in it too
+    Link* first TESSEL_GUARDED_BY(mutex) = nullptr;
+    uint64 bytes TESSEL_GUARDED_BY(mutex) = 0;
 };
 
 constexpr size_t kShards = 64;
@@ -62,7 +62,7 @@ bool IsPlausible(const Shard& shard, const Link* link) {
     return reinterpret_cast<uintptr_t>(link) % kAlignment == 0 && &ShardOf(link) == &shard;
 }
 
-bool IsSound(const Shard& shard, const Link* link) {
+bool IsSound(const Shard& shard, const Link* link) TESSEL_REQUIRES(shard.mutex) {
     const Link* next = link->next;
     const Link* previous = link->previous;
     bool nextIs = !next || (IsPlausible(shard, next) && next->previous == link);

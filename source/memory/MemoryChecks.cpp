@@ -1,11 +1,11 @@
 // Checks and statistics.
 #include "memory/Handles.h"
 #include "memory/Heap.h"
+#include "platform/Mutex.h"
 #include <tessel/diagnostics/DebugStream.h>
 
 #include <algorithm>
 #include <atomic>
-#include <mutex>
 
 namespace tessel {
 namespace {
@@ -31,8 +31,8 @@ std::atomic<bool> isChecking{false};
 
 // The counters as DSSetCounters set them lie this far from what the threads have counted.
 struct CounterOffsets {
-    std::mutex mutex;  // guards the rest
-    uint32 offsets[4] = {};
+    platform::Mutex mutex;
+    uint32 offsets[4] TESSEL_GUARDED_BY(mutex) = {};
 };
 CounterOffsets counterOffsets;
 
@@ -142,7 +142,7 @@ void DSSetCounters(const uint32 counters[4]) {
     if (!counters) return;
     uint32 raw[4];
     ReadRawCounters(raw);
-    std::lock_guard<std::mutex> hold(counterOffsets.mutex);
+    platform::MutexHolder hold(counterOffsets.mutex);
     for (int i = 0; i < 4; ++i) counterOffsets.offsets[i] = counters[i] - raw[i];
 }
 
@@ -150,6 +150,6 @@ void DSReadCounters(uint32 counters[4]) {
     if (!counters) return;
     uint32 raw[4];
     ReadRawCounters(raw);
-    std::lock_guard<std::mutex> hold(counterOffsets.mutex);
+    platform::MutexHolder hold(counterOffsets.mutex);
     for (int i = 0; i < 4; ++i) counters[i] = raw[i] + counterOffsets.offsets[i];
 }

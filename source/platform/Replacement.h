@@ -45,6 +45,8 @@ struct ReplaceRequest {
     // Whose permissions, owner, attributes and time of creation the new file takes on: by default those of the file
     // that it replaces. Without either it is like any new file.
     FileHandle like = kNoFile;
+    // Permissions of a file that is like no other, 07777 at most; -1: those of any new file.
+    int mode = -1;
     // An owner that cannot be kept is no failure then; the rights to run as that owner go.
     bool ownerMayChange = false;
     // Names of private files, with one %d for a number from 0 to below `limit`. Under a pattern of the caller's only

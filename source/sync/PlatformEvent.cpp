@@ -26,8 +26,8 @@ public:
     }
 
 private:
-    platform::Mutex mutex_;  // guards the list; nothing is taken inside
-    HostEvent* first_ = nullptr;
+    platform::Mutex mutex_;  // nothing is taken inside
+    HostEvent* first_ TESSEL_GUARDED_BY(mutex_) = nullptr;
 };
 
 namespace {

@@ -9,6 +9,7 @@
 
 namespace tessel {
 
+// Collects how long it took from Start to RecordLatency: how often, and the sum, the least and the most of it.
 class TESSEL_API PlatformEventTimer {
 public:
     PlatformEventTimer() = default;

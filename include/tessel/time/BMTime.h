@@ -19,10 +19,13 @@ namespace tessel {
 class TESSEL_API HiResClock {
 public:
     HiResClock() = default;
+    // Reads the performance counter.
     void SetToNow();
     // The count, as an unsigned number, in seconds.
     double ToSeconds() const;
+    // The sum of the counts.
     HiResClock operator+(const HiResClock& other) const;
+    // The difference of the counts.
     HiResClock operator-(const HiResClock& other) const;
 
 private:
@@ -34,17 +37,23 @@ private:
 class TESSEL_API ATime128 {
 public:
     ATime128() = default;
+    // Whole seconds, and a fraction in units of 2^-64 s.
     ATime128(int64 seconds, uint64 fraction) : fFraction(fraction), fSeconds(seconds) {}
     // Exact, truncating toward zero below 2^-64 s. Infinities, NaNs and what is too large give the largest or, with the
     // sign bit set, the smallest value.
     explicit ATime128(double seconds);
+    // The time in seconds, rounded.
     double ToDouble() const;
 
     // Null outputs are skipped.
     void Get(uint32* secondsHigh, uint32* secondsLow, uint32* fractionHigh, uint32* fractionLow) const;
+    // The whole seconds.
     int64 GetInt64Seconds() const { return fSeconds; }
+    // The fraction in units of 2^-64 s.
     uint64 GetUInt64Fraction() const { return fFraction; }
+    // Sets the whole seconds; the fraction stays.
     void SetInt64Seconds(const int64& seconds) { fSeconds = seconds; }
+    // Sets the fraction; the seconds stay.
     void SetUInt64Fraction(const uint64& fraction) { fFraction = fraction; }
 
     // Adds 2^-64 s.
@@ -52,14 +61,20 @@ public:
 
     // Each half alone; the fraction lies in [0, 1).
     double getSeconds() const;
+    // The fraction alone, in [0, 1).
     double getFraction() const;
 
     // Modulo 2^128. The product is rounded half away from zero.
     ATime128 operator+(const ATime128& other) const;
+    // The difference, modulo 2^128.
     ATime128 operator-(const ATime128& other) const;
+    // The time with its sign changed, modulo 2^128.
     ATime128 operator-() const;
+    // The product, modulo 2^128, rounded half away from zero.
     ATime128 operator*(const ATime128& other) const;
+    // Whether the times are the same.
     bool operator==(const ATime128& other) const { return fSeconds == other.fSeconds && fFraction == other.fFraction; }
+    // Whether the times differ.
     bool operator!=(const ATime128& other) const { return !(*this == other); }
 
 private:
@@ -75,6 +90,7 @@ TESSEL_API ATime128 ATime128FromFILETIME(const FILETIME& fileTime);
 // Rounded down to 100 ns.
 TESSEL_API FILETIME FILETIMEFromATime128(const ATime128& time);
 
+// The time of the system's clock.
 TESSEL_API ATime128 GetCurrentATime128();
 
 }  // namespace tessel

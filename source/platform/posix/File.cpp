@@ -1,5 +1,6 @@
 #include "platform/File.h"
 
+#include "platform/Mutex.h"
 #include "platform/posix/Errors.h"
 #include "platform/posix/FileHandles.h"
 #include "platform/posix/Interrupted.h"
@@ -8,9 +9,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <errno.h>
-#include <limits>
 #include <string>
-#include <sys/mman.h>
 #include <unistd.h>
 
 namespace tessel::platform {
@@ -174,13 +173,83 @@ int OpenAdmitted(const std::string& native, std::uint32_t access, std::uint32_t 
     }
 }
 
-// Removes what has the name, when it is this user's and no folder. True also when there is nothing.
-bool RemoveOwn(const char* native) {
-    struct statx status;
-    if (!StatusOf(native, Links::kThemselves, STATX_TYPE | STATX_UID, status)) return errno == ENOENT || FailErrno();
-    if (S_ISDIR(status.stx_mode) || status.stx_uid != ::geteuid()) return FailWith(kErrorAccessDenied);
-    return systemCalls.unlink(native) == 0 || errno == ENOENT || FailErrno();
+// ---- private files --------------------------------------------------------------------------------------------------
+
+// When this process began to use the library, by the clock of the files' times.
+timespec BeginOfProcess() {
+    timespec now{};
+    systemCalls.clock_gettime(CLOCK_REALTIME_COARSE, &now);
+    return now;
 }
+const timespec beginOfProcess = BeginOfProcess();
+
+// The private files that this process made last: its own it may make again.
+struct OwnFile {
+    pid_t process;
+    struct statx file;
+};
+constexpr int kOwnFiles = 16;
+constinit Mutex ownFilesMutex;  // guards both; nothing is taken inside
+OwnFile ownFiles[kOwnFiles];
+unsigned ownFilesMade = 0;
+
+void RememberOwn(int descriptor) {
+    OwnFile made = {::getpid(), {}};
+    if (systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_INO, &made.file) != 0) return;
+    MutexHolder holder(ownFilesMutex);
+    ownFiles[ownFilesMade++ % kOwnFiles] = made;
+}
+
+bool IsOwn(const struct statx& status) {
+    MutexHolder holder(ownFilesMutex);
+    for (const OwnFile& each : ownFiles) {
+        if (each.process == ::getpid() && SameFile(each.file, status)) return true;
+    }
+    return false;
+}
+
+bool IsOfThisTime(const struct statx& status) {
+    const statx_timestamp& time = status.stx_mtime;
+    if (time.tv_sec != beginOfProcess.tv_sec) return time.tv_sec > beginOfProcess.tv_sec;
+    return time.tv_nsec > beginOfProcess.tv_nsec;
+}
+
+// Holds what has a name while it makes way for a new file, so that of two only one removes it, and the other does not
+// take the new one for it.
+class OldFile {
+public:
+    OldFile() = default;
+    ~OldFile() {
+        const int error = errno;
+        if (descriptor_ >= 0) systemCalls.close(descriptor_);
+        errno = error;
+    }
+    OldFile(const OldFile&) = delete;
+    OldFile& operator=(const OldFile&) = delete;
+
+    // Removes what has the name, when it is this user's, no folder, and not in use. True also when there is nothing.
+    bool Remove(const char* native) {
+        struct statx status;
+        if (!StatusOf(native, Links::kThemselves, STATX_BASIC_STATS, status)) return errno == ENOENT || FailErrno();
+        if (S_ISDIR(status.stx_mode) || status.stx_uid != ::geteuid()) return FailWith(kErrorAccessDenied);
+        if (S_ISREG(status.stx_mode) && !Hold(native)) return false;
+        return systemCalls.unlink(native) == 0 || errno == ENOENT || FailErrno();
+    }
+
+private:
+    bool Hold(const char* native) {
+        struct statx held, named;
+        descriptor_ = OpenAtOnce(native, O_RDWR | O_NOFOLLOW);
+        if (descriptor_ < 0) return FailErrno();
+        const bool taken = MarkBytes(descriptor_, F_WRLCK, kWriterMark, 1) == Marking::kRefused;
+        if (systemCalls.statx(descriptor_, "", AT_EMPTY_PATH, STATX_BASIC_STATS, &held) != 0) return FailErrno();
+        if (taken || (IsOfThisTime(held) && !IsOwn(held))) return FailWith(kErrorSharingViolation);
+        const bool same = StatusOf(native, Links::kThemselves, STATX_INO, named) && SameFile(held, named);
+        return same || FailWith(kErrorSharingViolation);
+    }
+
+    int descriptor_ = -1;
+};
 
 }  // namespace
 
@@ -204,8 +273,10 @@ FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, 
         std::string native;
         if (!NameToNativeText(name, native)) return kNoFile;
         Match match = MatchOnDisk(native);
-        if (match == Match::kParentMissing) FailWith(kErrorPathNotFound);
-        if (match == Match::kParentMissing) return kNoFile;
+        if (match != Match::kAll && match != Match::kLastMissing) {
+            FailMatch(match);
+            return kNoFile;
+        }
         if (!open(native)) FailWith(errno == EEXIST ? kErrorFileExists : ErrorOfErrno(errno));
     } else if (!OnExistingItem(name, open)) {
         return kNoFile;
@@ -221,13 +292,45 @@ FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, 
 FileHandle FileCreatePrivate(const char* name, std::uint32_t access) {
     std::string native;
     if (!NameToNativeText(name, native)) return kNoFile;
-    MatchOnDisk(native);
-    if (!RemoveOwn(native.c_str())) return kNoFile;
+    Match match = MatchOnDisk(native);
+    if (match != Match::kAll && match != Match::kLastMissing) {
+        FailMatch(match);
+        return kNoFile;
+    }
+    OldFile old;
+    if (!old.Remove(native.c_str())) return kNoFile;
     // Whoever puts something there in between is refused, a link too.
     const int descriptor = OpenAtOnce(native.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
-    if (descriptor >= 0) return HandleOf(descriptor, access);
-    FailWith(errno == EEXIST ? kErrorAccessDenied : ErrorOfErrno(errno));
-    return kNoFile;
+    if (descriptor < 0) {
+        FailWith(errno == EEXIST ? kErrorSharingViolation : ErrorOfErrno(errno));
+        return kNoFile;
+    }
+    MarkBytes(descriptor, F_WRLCK, kWriterMark, 1);
+    RememberOwn(descriptor);
+    return HandleOf(descriptor, access);
+}
+
+std::FILE* FileOpenStream(const char* name, bool append) {
+    std::string native;
+    if (!NameToNativeText(name, native)) return nullptr;
+    const Match match = MatchOnDisk(native);
+    if (match != Match::kAll && match != Match::kLastMissing) {
+        FailMatch(match);
+        return nullptr;
+    }
+    const int descriptor = OpenAtOnce(native.c_str(), O_WRONLY | O_CREAT | (append ? O_APPEND : 0));
+    if (descriptor < 0) {
+        FailWith(errno == ENXIO ? kErrorAccessDenied : ErrorOfErrno(errno));  // a pipe that nobody reads
+        return nullptr;
+    }
+    struct statx status;
+    const bool known = systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_TYPE, &status) == 0 || FailErrno();
+    const bool usable = known && CheckKind(descriptor, status.stx_mode) &&
+                        (append || Truncate(descriptor, 0) || errno == EINVAL || FailErrno());
+    std::FILE* stream = usable ? ::fdopen(descriptor, append ? "a" : "w") : nullptr;
+    if (usable && !stream) FailErrno();
+    if (!stream) systemCalls.close(descriptor);
+    return stream;
 }
 
 bool FileClose(FileHandle file) {
@@ -288,30 +391,6 @@ bool FileReserve(FileHandle file, std::int64_t size) {
 bool FileFlush(FileHandle file) {
     const int result = Retry([&] { return systemCalls.fsync(DescriptorOf(file)); });
     return result == 0 || errno == EINVAL || FailErrno();  // EINVAL: there is no device to wait for
-}
-
-// ---- mapping --------------------------------------------------------------------------------------------------------
-
-bool FileMap(FileHandle file, const void*& data, std::size_t& size) {
-    data = nullptr;
-    size = 0;
-    if (!HasAccess(file, kRead)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
-    std::int64_t bytes = 0;
-    if (!FileSize(file, bytes)) return false;
-    if (bytes == 0) return FailWith(kErrorFileInvalid);
-    if (static_cast<std::uint64_t>(bytes) > std::numeric_limits<std::size_t>::max()) {
-        return FailWith(kErrorNotEnoughMemory);
-    }
-    std::size_t count = static_cast<std::size_t>(bytes);
-    void* view = systemCalls.mmap(nullptr, count, PROT_READ, MAP_SHARED, DescriptorOf(file), 0);
-    if (view == MAP_FAILED) return FailErrno();
-    data = view;
-    size = count;
-    return true;
-}
-
-bool FileUnmap(const void* data, std::size_t size) {
-    return systemCalls.munmap(const_cast<void*>(data), size) == 0 || FailErrno();
 }
 
 // ---- range locks ----------------------------------------------------------------------------------------------------

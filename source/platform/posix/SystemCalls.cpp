@@ -2,7 +2,7 @@
 
 #include <errno.h>
 #include <stdio.h>
-#include <sys/mman.h>
+#include <sys/file.h>
 #include <sys/random.h>
 #include <sys/syscall.h>
 #include <sys/xattr.h>
@@ -61,8 +61,6 @@ constinit SystemCalls systemCalls = {
     .fsync = ::fsync,
     .lock = Lock,
     .fcntl = Fcntl,
-    .mmap = ::mmap,
-    .munmap = ::munmap,
     .statx = ::statx,
     .futimens = ::futimens,
     .fsetxattr = ::fsetxattr,
@@ -74,6 +72,9 @@ constinit SystemCalls systemCalls = {
     .renameat2 = ::renameat2,
     .link = ::link,
     .linkat = ::linkat,
+    .symlink = ::symlink,
+    .lchown = ::lchown,
+    .flock = ::flock,
     .unlink = ::unlink,
     .unlinkat = ::unlinkat,
     .rmdir = ::rmdir,
@@ -82,6 +83,7 @@ constinit SystemCalls systemCalls = {
     .chmod = ::chmod,
     .fchmod = ::fchmod,
     .opendir = ::opendir,
+    .fdopendir = ::fdopendir,
     .readdir = ::readdir,
     .closedir = ::closedir,
     .getcwd = ::getcwd,

@@ -29,13 +29,13 @@ struct ThreadRecord {
     std::atomic<bool> abandoned{false};  // forced, and its own reference given back
     std::atomic<std::int32_t> exitCode{0};
     bool started = false;  // by this seam
-    bool joined = false;   // nothing of it runs any more; guarded by joinMutex
     pthread_t thread{};
     ThreadProcedure procedure = nullptr;
     void* argument = nullptr;
     Event idKnown;
     Event over;  // signaled for good once the thread has ended: who takes the signal gives it back
     Mutex joinMutex;
+    bool joined TESSEL_GUARDED_BY(joinMutex) = false;  // nothing of it runs any more
 };
 
 // ---- who is who -----------------------------------------------------------------------------------------------------
@@ -48,7 +48,8 @@ constexpr std::int32_t kStillActive = 259;
 constinit thread_local ThreadRecord* currentRecord = nullptr;
 constinit thread_local ThreadId currentId = 0;
 
-void Release(ThreadRecord* record) {
+// Who gives up the last reference is alone with the record.
+void Release(ThreadRecord* record) TESSEL_LOCKS_UNPROVEN {
     if (record->references.fetch_sub(1, std::memory_order_acq_rel) != 1) return;
     if (record->started && !record->joined && !record->forced) pthread_detach(record->thread);
     delete record;
