@@ -131,7 +131,7 @@ bool FindTrash(const std::string& native, const struct statx& item, Trash& trash
     if (MakeTrash(trash.folder) && GetStatus(trash.folder, status) && SameDevice(status, item)) return true;
     trash.top = TopFolder(native, item);
     std::string prefix = trash.top == "/" ? "/" : trash.top + "/";
-    std::string user = std::to_string(::getuid());
+    std::string user = std::to_string(systemCalls.getuid());
     bool shared = GetStatus(prefix + ".Trash", status) && S_ISDIR(status.stx_mode) && (status.stx_mode & S_ISVTX);
     trash.folder = prefix + ".Trash/" + user;
     if (shared && MakeTrash(trash.folder)) return true;

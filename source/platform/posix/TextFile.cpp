@@ -17,7 +17,7 @@ namespace {
 std::string TemporaryName(const std::string& native) {
     static std::atomic<unsigned> number{0};
     char name[48];
-    std::snprintf(name, sizeof name, ".%d.%u.tmp", ::getpid(), number.fetch_add(1));
+    std::snprintf(name, sizeof name, ".%d.%u.tmp", systemCalls.getpid(), number.fetch_add(1));
     std::size_t last = native.rfind('/') + 1;  // 0 when there is no folder
     return native.substr(0, last) + name;
 }
