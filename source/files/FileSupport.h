@@ -55,6 +55,9 @@ inline MgErr ErrUnless(bool ok) {
     return ok ? kNoErr : Win32ToOVFileErr();
 }
 
+// The same while permissions are set, which has codes of its own.
+MgErr AccessRightsErr();
+
 // Drops what a path has cached about its item. Nothing for null.
 void FlushPathCache(Path path);
 

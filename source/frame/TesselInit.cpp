@@ -1,6 +1,10 @@
+#include "diagnostics/Guarded.h"
 #include "frame/CoreServices.h"
 #include "frame/Environment.h"
 #include "frame/ServiceRegistry.h"
+#include "platform/Module.h"
+#include <tessel/config/ConfigCoreTypes.h>
+#include <tessel/config/ConfigManager.h>
 #include <tessel/frame/TesselInit.h>
 
 #include <algorithm>
@@ -16,8 +20,17 @@ bool appSupportIsOn = false;
 // In the order they are started.
 constexpr IServiceObject* (*kAppSupport[])() = {ConfigManagerService, ConfigCoreTypesService, ThThreadService,
                                                 ResourceManagerService};
+constexpr size_t kConfigIsReady = 2;  // when so many are started
 // Those of them that were taken hold of.
 IServiceObject* appServices[std::size(kAppSupport)];
+
+// A library that watches the heap, when the settings ask for it. The library goes on without it.
+void LoadHeapDebugger() {
+    static constexpr uint8 kKey[] = "\20LoadHeapDebugger";
+    int32 isWanted = 0;
+    if (CfgGetDefault(kConfigBool, kKey, &isWanted) == kNoErr && isWanted)
+        GuardedOr<platform::LibraryHandle>(nullptr, [] { return platform::LibraryLoad("HeapDebugger.dll"); });
+}
 
 }  // namespace
 }  // namespace tessel
@@ -62,6 +75,7 @@ MgErr UninitTesselBase(void) {
 MgErr InitTesselAppSupport(void) {
     if (appSupportIsOn || !baseRegistry) return kNoErr;
     for (size_t i = 0; i < std::size(kAppSupport); ++i) {
+        if (i == kConfigIsReady) LoadHeapDebugger();
         appServices[i] = kAppSupport[i]();
         if (appServices[i]) appServices[i]->Init();
     }

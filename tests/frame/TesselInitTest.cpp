@@ -93,8 +93,7 @@ TEST_F(TesselInitTest, SettingsThatAreNotUnderstoodAreReported) {
                                                  {"OV_USE_MALLOC", "0", "yes"},
                                                  {"TESSEL_DRIVES", "C=/;;t=/tmp", "C=/;TT=/tmp"},
                                                  {"TESSEL_UNC", "/srv", "srv"},
-                                                 {"TESSEL_CODEPAGE", "cp932", "klingon"},
-                                                 {"TESSEL_REGISTRY", "/tmp", "registry"}}) {
+                                                 {"TESSEL_CODEPAGE", "cp932", "klingon"}}) {
         for (const char* value : {good, bad}) {
             recorder.Clear();
             setenv(variable, value, 1);

@@ -248,7 +248,7 @@ TEST(FileSystem, CopiesAreWholeOrNotThere) {
         EXPECT_EQ(kErrorFileExists, LastError());
         fs::remove(drive.Native("b"));
     }
-    for (const char* call : {"copy_file_range", "fchmod", "close"}) {
+    for (const char* call : {"copy_file_range", "fchmod", "fsync", "linkat"}) {
         FailingPlatform failing(call, 1, ENOSPC);
         EXPECT_FALSE(FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()));
         EXPECT_EQ(kErrorDiskFull, LastError());

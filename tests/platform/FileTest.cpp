@@ -103,17 +103,6 @@ TEST(File, PositionAndSize) {
     EXPECT_TRUE(FileSize(file, value));
     EXPECT_EQ(4, value);
     EXPECT_TRUE(FileFlush(file));
-
-    const void* data = nullptr;
-    std::size_t size = 0;
-    ASSERT_TRUE(FileMap(file, data, size));
-    FileClose(file);
-    EXPECT_EQ("0123", std::string(static_cast<const char*>(data), size));
-    EXPECT_TRUE(FileUnmap(data, size));
-    drive.Put("empty", "");
-    file = Open(drive.Name("empty"), kRead);
-    EXPECT_FALSE(FileMap(file, data, size));
-    EXPECT_EQ(kErrorFileInvalid, LastError());
     FileClose(file);
 }
 

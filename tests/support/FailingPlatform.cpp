@@ -4,6 +4,7 @@
 
 #include <atomic>
 #include <cerrno>
+#include <csignal>
 #include <cstring>
 #include <stdexcept>
 #include <tuple>
@@ -33,6 +34,7 @@ template <typename Result, typename... Arguments, Result (*SystemCalls::*kCall)(
 struct Stand<kCall> {
     static Result Call(Arguments... arguments) {
         if (!IsDue()) return (original.*kCall)(arguments...);
+        if (failure == FailingPlatform::kKill) std::raise(SIGKILL);
         if (failure != 0) {
             errno = failure;
             if constexpr (std::is_pointer_v<Result> && !std::is_void_v<std::remove_pointer_t<Result>>) return nullptr;
@@ -58,10 +60,10 @@ FailingPlatform::FailingPlatform(const char* call, int n, int error, int times) 
     last = n + times - 1;
     failure = error;
     bool known = false;
-#define TESSEL_STAND_IN(result, name, parameters)           \
-    if (std::strcmp(call, #name) == 0) {                    \
-        systemCalls.name = Stand<&SystemCalls::name>::Call; \
-        known = true;                                       \
+#define TESSEL_STAND_IN(result, name, parameters)                       \
+    if (std::strcmp(call, #name) == 0 || std::strcmp(call, "*") == 0) { \
+        systemCalls.name = Stand<&SystemCalls::name>::Call;             \
+        known = true;                                                   \
     }
     TESSEL_SYSTEM_CALLS(TESSEL_STAND_IN)
 #undef TESSEL_STAND_IN

@@ -10,8 +10,13 @@
 // for no value. A null or empty value name is the key's unnamed value. The uint8 forms take the same names and texts as
 // bytes.
 //
+// Every change is atomic and durable: whenever the process is killed or the power fails, a key or a value is there as
+// it was or as it was to be, and what was reported done is on the device; one that failed changed nothing. Changes of
+// all programs wait for each other, for ten seconds at most (1460). A store that has vanished is an error (1018), not
+// one without values.
+//
 // TESSEL_REGISTRY names the folder that holds all, by an absolute name. With a relative one there is no registry: it is
-// reported when a root is first asked for, and every operation fails with 6.
+// reported once, when a root is first asked for, and every operation fails with 6.
 //
 // A key is for one thread at a time, and may be released before what was made from it. The roots may be used by any
 // thread to open and create keys.
@@ -180,12 +185,12 @@ public:
     // The same for a CStr.
     virtual MgErr SetValue(CStr name, uint32 type, const void* data, uint32 size) = 0;
 
-    // Deletes a subkey and everything below it. Stops at the first key that cannot be deleted.
+    // Deletes a subkey and everything below it, at once; nothing of it when one of the keys may not be deleted.
     virtual MgErr DeleteSubKey(const uint8* name) = 0;
     // The same for a CStr.
     virtual MgErr DeleteSubKey(CStr name) = 0;
 
-    // Puts what was written onto the device.
+    // Puts what the key holds onto the device, whoever wrote it.
     virtual MgErr Flush() = 0;
     // Later operations fail with 6. Roots stay open.
     virtual MgErr Close() = 0;

@@ -29,7 +29,7 @@ bool DebuggerAttached() noexcept {
     systemCalls.close(file);
     if (count <= 0) return false;
     status[count] = 0;
-    constexpr char kLabel[] = "TracerPid:";
+    constexpr char kLabel[] = "\nTracerPid:";  // not within another line: a program may be named so
     const char* line = std::strstr(status, kLabel);
     return line && std::strtol(line + sizeof kLabel - 1, nullptr, 10) != 0;
 }

@@ -188,8 +188,7 @@ bool NameToNativeText(std::string_view name, std::string& native) {
 
 bool NameToNative(std::string_view name, std::string& native) {
     if (!NameToNativeText(name, native)) return false;
-    MatchOnDisk(native);
-    return true;
+    return MatchOnDisk(native) != Match::kFailed || FailErrno();
 }
 
 // ---- names from the host's ------------------------------------------------------------------------------------------

@@ -1,8 +1,8 @@
 #include "platform/Module.h"
 
 #include "platform/posix/ElfSymbols.h"
+#include "platform/posix/Interrupted.h"
 #include "platform/posix/NativeNames.h"
-#include "platform/posix/SystemCalls.h"
 
 #include <cstdlib>
 #include <cxxabi.h>
@@ -122,6 +122,13 @@ LibraryHandle LibraryLoad(const char* name) {
     std::string file = name;
     bool plain = file.find_first_of("\\/:") == std::string::npos;
     if (!plain && !NameToNative(name, file)) return nullptr;
+    // The loader would wait for a pipe.
+    struct statx status;
+    const bool isThere = !plain && StatusOf(file, Links::kFollowed, STATX_TYPE, status);
+    if (isThere && !S_ISREG(status.stx_mode)) {
+        FailWith(kErrorModuleNotFound);
+        return nullptr;
+    }
     void* library = dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL);
     if (!library) FailWith(kErrorModuleNotFound);
     return library;

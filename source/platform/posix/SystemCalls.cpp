@@ -2,7 +2,7 @@
 
 #include <errno.h>
 #include <stdio.h>
-#include <sys/mman.h>
+#include <sys/file.h>
 #include <sys/prctl.h>
 #include <sys/random.h>
 #include <sys/syscall.h>
@@ -80,15 +80,20 @@ constinit SystemCalls systemCalls = {
     .fsync = ::fsync,
     .lock = Lock,
     .fcntl = Fcntl,
-    .mmap = ::mmap,
-    .munmap = ::munmap,
     .statx = ::statx,
     .futimens = ::futimens,
     .fsetxattr = ::fsetxattr,
+    .fchown = ::fchown,
+    .flistxattr = ::flistxattr,
+    .fremovexattr = ::fremovexattr,
     .getxattr = ::getxattr,
     .fgetxattr = ::fgetxattr,
     .renameat2 = ::renameat2,
     .link = ::link,
+    .linkat = ::linkat,
+    .symlink = ::symlink,
+    .lchown = ::lchown,
+    .flock = ::flock,
     .unlink = ::unlink,
     .unlinkat = ::unlinkat,
     .rmdir = ::rmdir,
@@ -97,6 +102,7 @@ constinit SystemCalls systemCalls = {
     .chmod = ::chmod,
     .fchmod = ::fchmod,
     .opendir = ::opendir,
+    .fdopendir = ::fdopendir,
     .readdir = ::readdir,
     .closedir = ::closedir,
     .getcwd = ::getcwd,

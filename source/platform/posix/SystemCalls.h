@@ -21,8 +21,8 @@
 
 namespace tessel::platform {
 
-// X(result, name, parameters): all return -1 (mmap: MAP_FAILED; opendir, readdir and getcwd: null) and set errno on
-// failure. Asking who one is, and umask, cannot fail.
+// X(result, name, parameters): all return -1 (opendir, fdopendir, readdir and getcwd: null) and set errno on failure.
+// Asking who one is, and umask, cannot fail.
 #define TESSEL_SYSTEM_CALLS(X)                                                                                     \
     X(int, open, (const char* name, int flags, mode_t mode))                                                       \
     X(int, openat, (int folder, const char* name, int flags, mode_t mode))                                         \
@@ -35,15 +35,20 @@ namespace tessel::platform {
     X(int, fsync, (int file))                                                                                      \
     X(int, lock, (int file, int command, struct flock* range))                                                     \
     X(int, fcntl, (int file, int command, int value))                                                              \
-    X(void*, mmap, (void* address, std::size_t size, int protection, int flags, int file, off_t offset))           \
-    X(int, munmap, (void* address, std::size_t size))                                                              \
     X(int, statx, (int folder, const char* name, int flags, unsigned mask, struct statx* result))                  \
     X(int, futimens, (int file, const struct timespec* times))                                                     \
     X(int, fsetxattr, (int file, const char* name, const void* value, std::size_t size, int flags))                \
+    X(int, fchown, (int file, uid_t owner, gid_t group))                                                           \
+    X(ssize_t, flistxattr, (int file, char* names, std::size_t size))                                              \
+    X(int, fremovexattr, (int file, const char* name))                                                             \
     X(ssize_t, getxattr, (const char* path, const char* name, void* value, std::size_t size))                      \
     X(ssize_t, fgetxattr, (int file, const char* name, void* value, std::size_t size))                             \
     X(int, renameat2, (int fromFolder, const char* from, int toFolder, const char* to, unsigned flags))            \
     X(int, link, (const char* from, const char* to))                                                               \
+    X(int, linkat, (int fromFolder, const char* from, int toFolder, const char* to, int flags))                    \
+    X(int, symlink, (const char* text, const char* name))                                                          \
+    X(int, lchown, (const char* name, uid_t owner, gid_t group))                                                   \
+    X(int, flock, (int file, int operation))                                                                       \
     X(int, unlink, (const char* name))                                                                             \
     X(int, unlinkat, (int folder, const char* name, int flags))                                                    \
     X(int, rmdir, (const char* name))                                                                              \
@@ -52,6 +57,7 @@ namespace tessel::platform {
     X(int, chmod, (const char* name, mode_t mode))                                                                 \
     X(int, fchmod, (int file, mode_t mode))                                                                        \
     X(DIR*, opendir, (const char* name))                                                                           \
+    X(DIR*, fdopendir, (int folder))                                                                               \
     X(dirent*, readdir, (DIR * listing))                                                                           \
     X(int, closedir, (DIR * listing))                                                                              \
     X(char*, getcwd, (char* buffer, std::size_t size))                                                             \
