@@ -31,7 +31,7 @@ ATime128 Place(uint64 significand, int shift) {
     if (shift < 0) return ATime128(0, significand >> -shift);
     if (shift + kSignificandBits > 127) return Extreme(false);
     if (shift >= 64) return ATime128(static_cast<int64>(significand << (shift - 64)), 0);
-    uint64 seconds = shift == 0 ? 0 : significand >> (64 - shift);
+    const uint64 seconds = shift == 0 ? 0 : significand >> (64 - shift);
     return ATime128(static_cast<int64>(seconds), significand << shift);
 }
 
@@ -39,7 +39,7 @@ ATime128 Place(uint64 significand, int shift) {
 void AddProduct(uint32 (&number)[8], int word, uint32 a, uint32 b) {
     uint64 carry = static_cast<uint64>(a) * b;
     for (; carry != 0 && word < 8; ++word) {
-        uint64 sum = static_cast<uint64>(number[word]) + Low(carry);
+        const uint64 sum = static_cast<uint64>(number[word]) + Low(carry);
         number[word] = Low(sum);
         carry = (carry >> 32) + (sum >> 32);
     }
@@ -74,8 +74,8 @@ ATime128::ATime128(double seconds) {
     constexpr int kInfinityOrNaN = 2047;
     uint64 bits;
     std::memcpy(&bits, &seconds, sizeof bits);
-    bool negative = (bits >> 63) != 0;
-    int exponent = static_cast<int>((bits >> 52) & kInfinityOrNaN);
+    const bool negative = (bits >> 63) != 0;
+    const int exponent = static_cast<int>((bits >> 52) & kInfinityOrNaN);
     if (exponent == kInfinityOrNaN) {
         *this = Extreme(negative);
         return;
@@ -86,14 +86,14 @@ ATime128::ATime128(double seconds) {
 
 double ATime128::ToDouble() const {
     if (seconds_ < 0 && *this != Extreme(true)) return -(-*this).ToDouble();
-    uint64 seconds = static_cast<uint64>(seconds_);  // the smallest value is its own negative: 2^63
+    const uint64 seconds = static_cast<uint64>(seconds_);  // the smallest value is its own negative: 2^63
     double value =
         Low(fraction_) * kTwoToMinus64 + High(fraction_) / kTwoTo32 + Low(seconds) + High(seconds) * kTwoTo32;
     return seconds_ < 0 ? -value : value;
 }
 
 void ATime128::Get(uint32* secondsHigh, uint32* secondsLow, uint32* fractionHigh, uint32* fractionLow) const {
-    uint64 seconds = static_cast<uint64>(seconds_);
+    const uint64 seconds = static_cast<uint64>(seconds_);
     if (secondsHigh) *secondsHigh = High(seconds);
     if (secondsLow) *secondsLow = Low(seconds);
     if (fractionHigh) *fractionHigh = High(fraction_);
@@ -115,14 +115,14 @@ double ATime128::getFraction() const {
 }
 
 ATime128 ATime128::operator+(const ATime128& other) const {
-    uint64 fraction = fraction_ + other.fraction_;
-    uint64 carry = fraction < fraction_ ? 1 : 0;
-    uint64 seconds = static_cast<uint64>(seconds_) + static_cast<uint64>(other.seconds_) + carry;
+    const uint64 fraction = fraction_ + other.fraction_;
+    const uint64 carry = fraction < fraction_ ? 1 : 0;
+    const uint64 seconds = static_cast<uint64>(seconds_) + static_cast<uint64>(other.seconds_) + carry;
     return ATime128(static_cast<int64>(seconds), fraction);
 }
 
 ATime128 ATime128::operator-() const {
-    uint64 seconds = ~static_cast<uint64>(seconds_) + (fraction_ == 0 ? 1 : 0);
+    const uint64 seconds = ~static_cast<uint64>(seconds_) + (fraction_ == 0 ? 1 : 0);
     return ATime128(static_cast<int64>(seconds), ~fraction_ + 1);
 }
 
@@ -144,7 +144,7 @@ ATime128 ATime128::operator*(const ATime128& other) const {
 }
 
 ATime128 ATime128FromHILOTime(const uint32& high, const uint32& low) {
-    uint64 fileTime = (static_cast<uint64>(high) << 32) | low;
+    const uint64 fileTime = (static_cast<uint64>(high) << 32) | low;
     ATime128 sinceEpoch(static_cast<int64>(fileTime - static_cast<uint64>(kEpochOffset)), 0);
     return ATime128(sinceEpoch.ToDouble() / static_cast<double>(kFileTimesPerSecond));
 }
@@ -155,12 +155,12 @@ ATime128 ATime128FromFILETIME(const FILETIME& fileTime) {
 
 FILETIME FILETIMEFromATime128(const ATime128& time) {
     ATime128 fileTime = time * ATime128(kFileTimesPerSecond, 0) + ATime128(kEpochOffset, 0);
-    uint64 count = static_cast<uint64>(fileTime.GetInt64Seconds());
+    const uint64 count = static_cast<uint64>(fileTime.GetInt64Seconds());
     return FILETIME{Low(count), High(count)};
 }
 
 ATime128 GetCurrentATime128() {
-    uint64 now = static_cast<uint64>(platform::SystemFileTime());
+    const uint64 now = static_cast<uint64>(platform::SystemFileTime());
     return ATime128FromHILOTime(High(now), Low(now));
 }
 
