@@ -79,14 +79,6 @@ bool ItemRename(const char* from, const char* to);
 // ends before its size is not copied (38).
 bool FileCopy(const char* from, const char* to);
 
-// What an open file held at a time.
-struct FileVersion {
-    std::int64_t size = 0, modified = 0;
-    friend bool operator!=(const FileVersion& a, const FileVersion& b) {
-        return a.size != b.size || a.modified != b.modified;
-    }
-};
-
 // Copies all that a regular file holds over what another holds, with what is added meanwhile. `version`: which was
 // copied. `keepsHoles`: the other is new, and where it is not written it is to stay empty. Moves both positions. A
 // failure says which side failed; then the other holds a part. Neither atomic nor durable.

@@ -73,23 +73,17 @@ bool FileGetInfo(FileHandle file, ItemInfo& info) {
     return true;
 }
 
-namespace {
-
-constexpr unsigned kVersionMask = STATX_INO | STATX_SIZE | STATX_MTIME;
-
-FileVersion VersionOf(const struct statx& status) {
+FileVersion VersionOfStatus(const struct statx& status) {
     const std::uint64_t device = std::uint64_t{status.stx_dev_major} << 32 | status.stx_dev_minor;
     return {device, status.stx_ino, static_cast<std::int64_t>(status.stx_size), status.stx_mtime.tv_sec,
             status.stx_mtime.tv_nsec};
 }
 
-}  // namespace
-
 bool ItemGetVersion(const char* name, FileVersion& version) {
     return OnExistingItem(name, [&](const std::string& native) {
         struct statx status;
         if (!StatusOf(native, Links::kFollowed, kVersionMask, status)) return false;
-        version = VersionOf(status);
+        version = VersionOfStatus(status);
         return true;
     });
 }
@@ -97,7 +91,7 @@ bool ItemGetVersion(const char* name, FileVersion& version) {
 bool FileGetVersion(FileHandle file, FileVersion& version) {
     struct statx status;
     if (systemCalls.statx(DescriptorOf(file), "", AT_EMPTY_PATH, kVersionMask, &status) != 0) return FailErrno();
-    version = VersionOf(status);
+    version = VersionOfStatus(status);
     return true;
 }
 
