@@ -40,12 +40,12 @@ struct Stand<kCall> {
             if constexpr (std::is_pointer_v<Result> && !std::is_void_v<std::remove_pointer_t<Result>>) return nullptr;
             return (Result)-1;  // also of mmap: MAP_FAILED
         }
-        if constexpr (std::is_same_v<std::tuple_element_t<sizeof...(Arguments) - 1, std::tuple<Arguments...>>,
-                                     std::size_t> &&
-                      std::is_same_v<Result, ssize_t> && sizeof...(Arguments) == 3) {
+        if constexpr (std::is_same_v<Result, ssize_t> && sizeof...(Arguments) == 3) {
             std::tuple<Arguments...> shortened(arguments...);
-            std::get<2>(shortened) = 1;
-            return std::apply(original.*kCall, shortened);
+            if constexpr (std::is_same_v<std::tuple_element_t<2, std::tuple<Arguments...>>, std::size_t>) {
+                std::get<2>(shortened) = 1;
+                return std::apply(original.*kCall, shortened);
+            }
         }
         return (original.*kCall)(arguments...);
     }

@@ -243,7 +243,7 @@ std::string Replacement::Work::NumberedName(int number) const {
 bool Replacement::Work::IsLeftover(int descriptor) const {
     struct statx status;
     if (!StatusOfOpen(descriptor, STATX_BASIC_STATS, status)) return false;
-    const bool own = status.stx_uid == ::geteuid() || (target >= 0 && status.stx_uid == targetStatus.stx_uid);
+    const bool own = status.stx_uid == systemCalls.geteuid() || (target >= 0 && status.stx_uid == targetStatus.stx_uid);
     if (!S_ISREG(status.stx_mode) || status.stx_nlink != 1 || !own) return false;
     if (request.pattern && systemCalls.fgetxattr(descriptor, kTemporaryAttribute, nullptr, 0) < 0) return false;
     return MarkBytes(descriptor, F_RDLCK, kWriterMark, 1) == Marking::kDone &&
