@@ -78,6 +78,7 @@ constinit SystemCalls systemCalls = {
     .ftruncate = ::ftruncate,
     .fallocate = ::fallocate,
     .fsync = ::fsync,
+    .syncfs = ::syncfs,
     .lock = Lock,
     .fcntl = Fcntl,
     .statx = ::statx,

@@ -33,6 +33,7 @@ namespace tessel::platform {
     X(int, ftruncate, (int file, off_t size))                                                                      \
     X(int, fallocate, (int file, int mode, off_t offset, off_t size))                                              \
     X(int, fsync, (int file))                                                                                      \
+    X(int, syncfs, (int file))                                                                                     \
     X(int, lock, (int file, int command, struct flock* range))                                                     \
     X(int, fcntl, (int file, int command, int value))                                                              \
     X(int, statx, (int folder, const char* name, int flags, unsigned mask, struct statx* result))                  \
