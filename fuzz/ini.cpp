@@ -1,6 +1,6 @@
 // Any bytes are a preference file: it is held, found, changed and written as the model says, and what was written and
 // read twice is written again as it is.
-#include "../tests/config/IniModel.h"
+#include "IniModel.h"
 #include "config/IniDocument.h"
 
 #include <cstdint>

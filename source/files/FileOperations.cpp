@@ -42,8 +42,7 @@ MgErr ErrOfCopy(platform::CopyResult result) {
 }
 
 // Deletes the copied source. That it stays is not told, unless it is because it has been written meanwhile.
-MgErr DeleteSource(Path from, const OpenFile& source, const platform::CopiedVersion& version,
-                   platform::FileHandle copy) {
+MgErr DeleteSource(Path from, const OpenFile& source, const platform::FileVersion& version, platform::FileHandle copy) {
     PlatformName name, resolved;
     if (name.Make(from, false) || resolved.Make(from, true)) return kNoErr;
     if (std::strcmp(name.Text(), resolved.Text()) != 0) {
@@ -59,7 +58,7 @@ MgErr OverwriteWith(Path from, const OpenFile& source, const OpenFile& destinati
     int64 size = 0;
     if (!platform::FileSize(source.get(), size)) return kIOErr;
     if (!platform::FileReserve(destination.get(), size)) return Win32ToOVFileErr();
-    platform::CopiedVersion version;
+    platform::FileVersion version;
     if (const MgErr err = ErrOfCopy(platform::FileCopyBytes(source.get(), destination.get(), false, version)))
         return err;
     if (!platform::FileFlush(destination.get())) return Win32ToOVFileErr();
@@ -84,7 +83,7 @@ MgErr MoveInto(Path from, Path to) {
         const bool inPlace = copy.Failure() == platform::ReplaceFailure::kCannotMake;
         return inPlace ? OverwriteWith(from, source, destination) : Win32ToOVFileErr();
     }
-    platform::CopiedVersion version;
+    platform::FileVersion version;
     if (const MgErr err = ErrOfCopy(platform::FileCopyBytes(source.get(), copy.File(), true, version))) return err;
     if (!copy.Finish()) return Win32ToOVFileErr();
     return DeleteSource(from, source, version, copy.File());

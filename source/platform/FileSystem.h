@@ -79,23 +79,15 @@ bool ItemRename(const char* from, const char* to);
 // ends before its size is not copied (38).
 bool FileCopy(const char* from, const char* to);
 
-// What an open file held at a time.
-struct CopiedVersion {
-    std::int64_t size = 0, modified = 0;
-    friend bool operator!=(const CopiedVersion& a, const CopiedVersion& b) {
-        return a.size != b.size || a.modified != b.modified;
-    }
-};
-
 // Copies all that a regular file holds over what another holds, with what is added meanwhile. `version`: which was
 // copied. `keepsHoles`: the other is new, and where it is not written it is to stay empty. Moves both positions. A
 // failure says which side failed; then the other holds a part. Neither atomic nor durable.
 enum class CopyResult { kDone, kReadFailed, kWriteFailed };
-CopyResult FileCopyBytes(FileHandle from, FileHandle to, bool keepsHoles, CopiedVersion& version);
+CopyResult FileCopyBytes(FileHandle from, FileHandle to, bool keepsHoles, FileVersion& version);
 
 // Deletes the file that was copied, for good. 2 when `name` leads to another file than `file`, 32 when it has been
 // written since: nothing is deleted then. What is added to it in the last moment is added to the copy.
-bool FileDeleteCopied(const char* name, FileHandle file, const CopiedVersion& copied, FileHandle copy);
+bool FileDeleteCopied(const char* name, FileHandle file, const FileVersion& copied, FileHandle copy);
 
 bool ItemSetReadOnly(const char* name, bool readOnly);
 bool ItemSetMode(const char* name, std::uint32_t mode);  // 0777 at most

@@ -1,5 +1,5 @@
+#include "../fuzz/IniModel.h"
 #include "config/IniDocument.h"
-#include "config/IniModel.h"
 #include "support/StartedMemory.h"
 #include "support/malloc/FailingMalloc.h"
 
@@ -175,19 +175,17 @@ TEST_F(IniDocumentTest, ManyChangesTakeNoMoreAndMoreMemory) {
 }
 
 TEST_F(IniDocumentTest, NamesASectionOnlyWhenItIsTheOnlyOne) {
-    const struct {
-        const char *read, *name, *written;
-    } rows[] = {{";c\na=b\n", "App", "[App]\r\n;c\r\na=b\r\n"},
-                {"a=b\n", " ", "a=b\r\n"},
-                {"a=b\n[c]\n", "App", "a=b\r\n[c]\r\n"},
-                {"[c]\n", "App", "[c]\r\n"},
-                {"a=b\n", "(Null)", "a=b\r\n"},
-                {";\n", "App", ";\r\n"}};
-    for (const auto& row : rows) {
-        ASSERT_EQ(kNoErr, Read(document, row.read));
-        EXPECT_EQ(std::string(row.written)[0] == '[' && row.read[0] != '[', document.NameOnlySection(row.name));
-        EXPECT_EQ(row.written, Written(document));
-        EXPECT_EQ(row.written[1] == 'A', document.Find("APP", "A") != nullptr);
+    const char* rows[][3] = {{";c\na=b\n", "App", "[App]\r\n;c\r\na=b\r\n"},
+                             {"a=b\n", " ", "a=b\r\n"},
+                             {"a=b\n[c]\n", "App", "a=b\r\n[c]\r\n"},
+                             {"[c]\n", "App", "[c]\r\n"},
+                             {"a=b\n", "(Null)", "a=b\r\n"},
+                             {";\n", "App", ";\r\n"}};
+    for (const auto& [read, name, written] : rows) {
+        ASSERT_EQ(kNoErr, Read(document, read));
+        EXPECT_EQ(written[1] == 'A', document.NameOnlySection(name));
+        EXPECT_EQ(written, Written(document));
+        EXPECT_EQ(written[1] == 'A', document.Find("APP", "A") != nullptr);
     }
 }
 

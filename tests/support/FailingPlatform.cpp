@@ -6,12 +6,12 @@
 #include <atomic>
 #include <cerrno>
 #include <climits>
-#include <csignal>
 #include <cstring>
 #include <iterator>
 #include <stdexcept>
 #include <tuple>
 #include <type_traits>
+#include <unistd.h>
 
 namespace tessel::test {
 
@@ -52,14 +52,14 @@ template <typename Result, typename... Arguments, Result (*SystemCalls::*kCall)(
 struct Stand<kCall> {
     static Result Call(Arguments... arguments) {
         if (!IsDue()) return (original.*kCall)(arguments...);
-        if (failure == FailingPlatform::kKill) std::raise(SIGKILL);
+        if (failure == FailingPlatform::kKill) _exit(99);
         if (failure != 0) {
             // A file is closed whatever the host says.
             if constexpr (Is<kCall, &SystemCalls::close>() || Is<kCall, &SystemCalls::closedir>())
                 (original.*kCall)(arguments...);
             errno = failure;
             if constexpr (std::is_pointer_v<Result> && !std::is_void_v<std::remove_pointer_t<Result>>) return nullptr;
-            return (Result)-1;
+            return (Result)-1;  // also of mmap: MAP_FAILED
         }
         if constexpr (Is<kCall, &SystemCalls::read>() || Is<kCall, &SystemCalls::write>()) {
             std::tuple<Arguments...> shortened(arguments...);

@@ -138,7 +138,8 @@ FaultCount FaultRunner::KilledBeforeCalls() {
         }
         int status = 0;
         waitpid(child, &status, 0);
-        if (!WIFSIGNALED(status)) return count;
+        const bool killed = WIFEXITED(status) && WEXITSTATUS(status) == 99;
+        if (!killed) return count;
         JudgeFailed(count, "killed before call " + std::to_string(n), kGenericErr, false);
     }
 }

@@ -204,6 +204,18 @@ void Store(std::string& bytes, std::uint64_t offset, const std::string& data) {
     bytes.replace(offset, data.size(), data);
 }
 
+// What is in a folder goes with it.
+void RenameFolder(const DiskStep& step, DiskState& state) {
+    if (step.names.size() != 2 || step.names[0].second >= 0 || step.names[1].second < 0) return;
+    const std::string from = step.names[0].first + "/", to = step.names[1].first + "/";
+    std::map<std::string, int> names;
+    for (const auto& [name, id] : state.names) {
+        const bool within = name.compare(0, from.size(), from) == 0;
+        names[within ? to + name.substr(from.size()) : name] = id;
+    }
+    state.names = std::move(names);
+}
+
 void Apply(const DiskStep& step, DiskState& state) {
     switch (step.kind) {
         case DiskStep::kWrite:
@@ -217,6 +229,7 @@ void Apply(const DiskStep& step, DiskState& state) {
             if (S_ISDIR(step.offset)) state.items[step.item].kind = 'd';
             break;
         case DiskStep::kNames:
+            RenameFolder(step, state);
             for (const auto& [name, id] : step.names) {
                 if (id < 0)
                     state.names.erase(name);

@@ -205,6 +205,7 @@ TESSEL_API MgErr FCopyResolve(Path from, Path to, int32 resolve);
 // To another file system a file is copied, with its owner, permissions, dates and attributes as far as they can be
 // kept, and is on the device there before it goes here: it is always whole in one of the two, for a moment in both.
 // kFileInUseErr, and nothing happens, while someone writes it. A link moves itself; a folder does not move (kIOErr).
+// When at last the old folder cannot be brought to the device, the file has moved all the same, with kIOErr.
 TESSEL_API MgErr FMove(Path from, Path to);
 // As FMove, which follows shortcuts in `from`; this one only when `resolve` is not 0.
 TESSEL_API MgErr FMoveResolve(Path from, Path to, int32 resolve);

@@ -23,11 +23,11 @@ namespace tessel::platform {
 
 namespace {
 
-bool VersionOf(int file, CopiedVersion& version) {
+// False with errno; also for what is no regular file.
+bool VersionOf(int file, FileVersion& version) {
     struct statx status;
-    if (systemCalls.statx(file, "", AT_EMPTY_PATH, STATX_SIZE | STATX_MTIME | STATX_TYPE, &status) != 0) return false;
-    version.size = static_cast<std::int64_t>(status.stx_size);
-    version.modified = FileTimeOf(status.stx_mtime.tv_sec, status.stx_mtime.tv_nsec);
+    if (systemCalls.statx(file, "", AT_EMPTY_PATH, kVersionMask | STATX_TYPE, &status) != 0) return false;
+    version = VersionOfStatus(status);
     if (S_ISREG(status.stx_mode)) return true;
     errno = EACCES;
     return false;
@@ -118,7 +118,7 @@ CopyResult CopyStretch(int from, int to, std::int64_t at, std::int64_t end, bool
 
 }  // namespace
 
-CopyResult FileCopyBytes(FileHandle from, FileHandle to, bool keepsHoles, CopiedVersion& version) {
+CopyResult FileCopyBytes(FileHandle from, FileHandle to, bool keepsHoles, FileVersion& version) {
     constexpr int kMostRounds = 100;
     const int source = DescriptorOf(from), target = DescriptorOf(to);
     std::int64_t done = 0;
@@ -232,7 +232,7 @@ bool FileCopy(const char* from, const char* to) {
     request.mode = static_cast<int>(status.stx_mode & 0777u);
     request.deny = kRead | kWrite;
     Replacement copy;
-    CopiedVersion version;
+    FileVersion version;
     if (!copy.Begin(request)) return false;
     return FileCopyBytes(source.Get(), copy.File(), true, version) == CopyResult::kDone &&
            SetTimes(copy.File(), status, false) && FinishNew(copy, to);
@@ -240,9 +240,9 @@ bool FileCopy(const char* from, const char* to) {
 
 // ---- moving ---------------------------------------------------------------------------------------------------------
 
-bool FileDeleteCopied(const char* name, FileHandle file, const CopiedVersion& copied, FileHandle copy) {
+bool FileDeleteCopied(const char* name, FileHandle file, const FileVersion& copied, FileHandle copy) {
     std::string native;
-    CopiedVersion now;
+    FileVersion now;
     struct statx opened, named;
     if (!NameToAbsoluteNative(name, native)) return false;
     const int source = DescriptorOf(file);
@@ -282,14 +282,18 @@ bool MoveFile(const char* from, const char* to) {
     request.ownerMayChange = true;
     request.deny = kRead | kWrite;
     Replacement copy;
-    CopiedVersion version;
+    FileVersion version;
     if (!FileGetInfo(source.Get(), info) || !copy.Begin(request)) return false;
     const bool copied = FileCopyBytes(source.Get(), copy.File(), true, version) == CopyResult::kDone &&
                         FileSetTimes(copy.File(), info.created, 0, 0) && SetTimes(copy.File(), status, true) &&
                         FinishNew(copy, to);
     if (!copied) return false;
     if (FileDeleteCopied(from, source.Get(), version, copy.File())) return true;
-    return ItemExists(from) == ItemKind::kNone ? false : Forsake(to);
+    const ErrorNumber reason = LastError();
+    const bool stays = systemCalls.statx(DescriptorOf(source.Get()), "", AT_EMPTY_PATH, STATX_NLINK, &status) != 0 ||
+                       status.stx_nlink != 0;
+    SetLastError(reason);
+    return stays ? Forsake(to) : false;
 }
 
 // A link itself, not what it leads to.

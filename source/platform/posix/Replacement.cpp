@@ -249,8 +249,8 @@ std::string Replacement::Work::NumberedName(int number) const {
 bool Replacement::Work::IsLeftover(int descriptor) const {
     struct statx status;
     if (!StatusOfOpen(descriptor, STATX_BASIC_STATS, status)) return false;
-    const bool own = status.stx_uid == ::geteuid() || ::geteuid() == 0;
-    if (!S_ISREG(status.stx_mode) || !own) return false;
+    const uid_t user = systemCalls.geteuid();
+    if (!S_ISREG(status.stx_mode) || (user != 0 && status.stx_uid != user)) return false;
     if (request.pattern && systemCalls.fgetxattr(descriptor, kTemporaryAttribute, nullptr, 0) < 0) return false;
     return MarkBytes(descriptor, F_RDLCK, kWriterMark, 1) == Marking::kDone &&
            TestBytes(descriptor, kWriterMark, 1) == Marking::kDone;

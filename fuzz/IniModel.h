@@ -1,6 +1,6 @@
 // What preference files mean, told in the plainest way: lists that are searched from end to end.
-#ifndef TESSEL_TESTS_CONFIG_INIMODEL_H
-#define TESSEL_TESTS_CONFIG_INIMODEL_H
+#ifndef TESSEL_FUZZ_INIMODEL_H
+#define TESSEL_FUZZ_INIMODEL_H
 
 #include <list>
 #include <optional>
