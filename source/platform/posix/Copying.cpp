@@ -289,7 +289,11 @@ bool MoveFile(const char* from, const char* to) {
                         FinishNew(copy, to);
     if (!copied) return false;
     if (FileDeleteCopied(from, source.Get(), version, copy.File())) return true;
-    return ItemExists(from) == ItemKind::kNone ? false : Forsake(to);
+    const ErrorNumber reason = LastError();
+    const bool stays = systemCalls.statx(DescriptorOf(source.Get()), "", AT_EMPTY_PATH, STATX_NLINK, &status) != 0 ||
+                       status.stx_nlink != 0;
+    SetLastError(reason);
+    return stays ? Forsake(to) : false;
 }
 
 // A link itself, not what it leads to.

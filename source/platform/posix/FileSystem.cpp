@@ -5,7 +5,9 @@
 #include "platform/posix/Folders.h"
 #include "platform/posix/Interrupted.h"
 #include "platform/posix/NativeNames.h"
+#include "platform/posix/TextFile.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -265,15 +267,14 @@ bool ItemSetReadOnly(const char* name, bool readOnly) {
 }
 
 std::uint32_t PermissionMask() {
-    std::unique_ptr<FILE, int (*)(FILE*)> status(std::fopen("/proc/self/status", "re"), std::fclose);
-    char line[256];
+    std::string status;
+    ReadTextFile("/proc/self/status", status);
+    const std::size_t line = std::min(status.find("Umask:"), status.size());
     unsigned mask = 0;
-    while (status && std::fgets(line, sizeof line, status.get())) {
-        if (std::sscanf(line, "Umask: %o", &mask) == 1) return mask;
-    }
+    if (std::sscanf(status.c_str() + line, "Umask: %o", &mask) == 1) return mask;
     // Without /proc it can only be read by setting it.
-    mask = ::umask(0);
-    ::umask(static_cast<mode_t>(mask));
+    mask = systemCalls.umask(0);
+    systemCalls.umask(static_cast<mode_t>(mask));
     return mask;
 }
 
