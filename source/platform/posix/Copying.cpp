@@ -23,11 +23,10 @@ namespace tessel::platform {
 
 namespace {
 
-bool VersionOf(int file, FileVersion& version) {
+bool VersionOfRegular(int file, FileVersion& version) {
     struct statx status;
-    if (systemCalls.statx(file, "", AT_EMPTY_PATH, STATX_SIZE | STATX_MTIME | STATX_TYPE, &status) != 0) return false;
-    version.size = static_cast<std::int64_t>(status.stx_size);
-    version.modified = FileTimeOf(status.stx_mtime.tv_sec, status.stx_mtime.tv_nsec);
+    if (systemCalls.statx(file, "", AT_EMPTY_PATH, kVersionMask | STATX_TYPE, &status) != 0) return false;
+    version = VersionOf(status);
     if (S_ISREG(status.stx_mode)) return true;
     errno = EACCES;
     return false;
@@ -123,7 +122,7 @@ CopyResult FileCopyBytes(FileHandle from, FileHandle to, bool keepsHoles, FileVe
     const int source = DescriptorOf(from), target = DescriptorOf(to);
     std::int64_t done = 0;
     for (int round = 0; round < kMostRounds; ++round) {
-        if (!VersionOf(source, version)) {
+        if (!VersionOfRegular(source, version)) {
             FailErrno();
             return CopyResult::kReadFailed;
         }
@@ -249,11 +248,11 @@ bool FileDeleteCopied(const char* name, FileHandle file, const FileVersion& copi
     if (systemCalls.statx(source, "", AT_EMPTY_PATH, STATX_INO, &opened) != 0) return FailErrno();
     if (!StatusOf(native, Links::kFollowed, STATX_INO, named)) return FailErrno();
     if (!SameFile(opened, named)) return FailWith(kErrorFileNotFound);
-    if (!VersionOf(source, now)) return FailErrno();
+    if (!VersionOfRegular(source, now)) return FailErrno();
     if (now != copied) return FailWith(kErrorSharingViolation);
     if (systemCalls.unlink(native.c_str()) != 0) return FailErrno();
     // Who had it open may have written a last time: nobody else finds it any more.
-    const bool grown = VersionOf(source, now) && now.size > copied.size;
+    const bool grown = VersionOfRegular(source, now) && now.size > copied.size;
     if (grown && CopyStretch(source, DescriptorOf(copy), copied.size, now.size, true) != CopyResult::kDone)
         return false;
     if (grown && !FileFlush(copy)) return false;

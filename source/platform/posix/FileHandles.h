@@ -61,6 +61,10 @@ inline bool SameFile(const struct statx& a, const struct statx& b) {
 // All of ItemInfo but `hidden` and a `created` that was set.
 void FillInfo(const struct statx& status, ItemInfo& info);
 
+// What a version is told by.
+constexpr unsigned kVersionMask = STATX_INO | STATX_SIZE | STATX_MTIME;
+FileVersion VersionOf(const struct statx& status);
+
 }  // namespace tessel::platform
 
 #endif

@@ -71,17 +71,11 @@ bool FileGetInfo(FileHandle file, ItemInfo& info) {
     return true;
 }
 
-namespace {
-
-constexpr unsigned kVersionMask = STATX_INO | STATX_SIZE | STATX_MTIME;
-
 FileVersion VersionOf(const struct statx& status) {
     const std::uint64_t device = std::uint64_t{status.stx_dev_major} << 32 | status.stx_dev_minor;
     return {device, status.stx_ino, static_cast<std::int64_t>(status.stx_size), status.stx_mtime.tv_sec,
             status.stx_mtime.tv_nsec};
 }
-
-}  // namespace
 
 bool ItemGetVersion(const char* name, FileVersion& version) {
     return OnExistingItem(name, [&](const std::string& native) {
