@@ -2,6 +2,7 @@
 #include "support/Compare.h"
 #include <tessel/tessel.h>
 
+#include <QSettings>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -153,9 +154,50 @@ void CompareSaving(bench::Table& table, const LargeFile& file) {
     g_key_file_free(theirs);
 }
 
+// A setting of the main preference file, which nobody changes meanwhile.
+void CompareSettings(bench::Table& table) {
+    static constexpr uint8 kKey[] = "\17windowPosition7";
+    Path path = nullptr;
+    char native[1024];
+    int32 value = 12345;
+    Require(CfgWrite(kConfigI32, kKey, &value) == kNoErr, "not written");
+    Require(CfgGetPrefFilePath(&path) == kNoErr && PathToNative(path, native, sizeof native) == kNoErr, "no name");
+    PathRef::DisposePath(path);
+    const QSettings theirs(native, QSettings::IniFormat);
+    const QString theirKey("Bench/windowPosition7");
+    Require(theirs.value(theirKey).toInt() == value, "not read");
+    table.Compare(
+        "CfgGetDefault of an I32 with no file change",
+        [&](std::uint64_t operations) {
+            for (std::uint64_t i = 0; i < operations; ++i)
+                Require(CfgGetDefault(kConfigI32, kKey, &value) == kNoErr, "not read");
+        },
+        "QSettings::value().toInt()",
+        [&](std::uint64_t operations) {
+            for (std::uint64_t i = 0; i < operations; ++i) Keep(theirs.value(theirKey).toInt());
+        },
+        1.0);
+}
+
+// The preferences are in a file of their own.
+struct Application : MGAppInterface {
+    Application() {
+        MGAppInterfaceSet(this);
+        SetPrefsPath(file.c_str());
+    }
+    ~Application() {
+        MGAppInterfaceSet(nullptr);
+        std::filesystem::remove(file);
+    }
+    CStr ApplicationName() override { return "Bench"; }
+
+    const std::string file = std::filesystem::temp_directory_path() / "tessel-bench.ini";
+};
+
 }  // namespace
 
 int main() {
+    const Application application;
     if (InitTesselBase() != kNoErr || InitTesselAppSupport() != kNoErr) return 1;
     {
         const LargeFile file;
@@ -163,6 +205,7 @@ int main() {
         CompareReading(table, file);
         CompareLookingUp(table, file);
         CompareSaving(table, file);
+        CompareSettings(table);
     }
     UninitTesselAppSupport();
     return UninitTesselBase();

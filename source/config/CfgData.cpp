@@ -71,16 +71,24 @@ MgErr CheckPath(Path path, uint32 kind) {
 
 }  // namespace
 
+struct CfgDataAccess {
+    static void SetDefaulted(CfgData& data, bool isDefaulted) { data.isDefaulted_ = isDefaulted; }
+};
+
+namespace {
+
 // The result, once a setting that could not be read has its default.
 MgErr TakeDefault(CfgData& data, MgErr result) {
     MgErr reset = data.ResetToDefault();
-    data.isDefaulted_ = reset == kNoErr;
+    CfgDataAccess::SetDefaulted(data, reset == kNoErr);
     if (result == kConfigKeyErr) return reset;
-    if (data.isDefaulted_)
+    if (data.IsDefaulted())
         TESSEL_REPORT(kDebugWarning, 0xD3186EA5u) << "The setting \"" << NameOf(data) << "\" cannot be read ("
                                                   << MgErrMeaning(result) << "); its default holds.";
     return result;
 }
+
+}  // namespace
 
 CfgData::~CfgData() = default;
 CfgDataValidator::~CfgDataValidator() = default;
@@ -109,7 +117,7 @@ MgErr CfgDataInit(CfgData* data, ConfigManager* manager, CfgDataValidator* valid
     if (!validator) validator = &acceptsAll;
     return Guarded([&] {
         int32 policy = validator->Policy(context);
-        data->isDefaulted_ = false;
+        CfgDataAccess::SetDefaulted(*data, false);
         MgErr readResult = ReadData(*data, manager, policy);
         MgErr result = readResult && data->HasDefault() ? TakeDefault(*data, readResult) : readResult;
         if (!IsChecked(policy, readResult, result)) return result;

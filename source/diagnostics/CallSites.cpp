@@ -18,7 +18,7 @@ constexpr int32 kMostSkipRemembered = 8;
 constexpr int32 kMostFrames = CallStack::kCapacity + kMostSkipRemembered;
 constexpr int kWalksRemembered = 16;
 
-std::atomic<uint64> theNextSerial{1};
+std::atomic<uint64> nextSerial{1};
 
 // One odd factor for each word of a key, so that the products do not wait for each other.
 constexpr auto kFactors = [] {
@@ -53,26 +53,26 @@ struct RememberedWalks {
     RememberedWalk walks[kWalksRemembered];
 };
 
-TESSEL_FAST_THREAD_LOCAL RememberedWalks* theWalks = nullptr;
-TESSEL_FAST_THREAD_LOCAL bool theThreadEnds = false;
+TESSEL_FAST_THREAD_LOCAL RememberedWalks* ownWalks = nullptr;
+TESSEL_FAST_THREAD_LOCAL bool threadEnds = false;
 
 struct RememberedWalksOwner {
     ~RememberedWalksOwner() {
-        theThreadEnds = true;
-        std::free(std::exchange(theWalks, nullptr));
+        threadEnds = true;
+        std::free(std::exchange(ownWalks, nullptr));
     }
     bool alive = true;
 };
-thread_local RememberedWalksOwner theOwner;
+thread_local RememberedWalksOwner walksOwner;
 
 TESSEL_NOT_INLINE RememberedWalks* MakeWalks() {
-    if (theThreadEnds || !theOwner.alive) return nullptr;
-    return theWalks = static_cast<RememberedWalks*>(std::calloc(1, sizeof(RememberedWalks)));
+    if (threadEnds || !walksOwner.alive) return nullptr;
+    return ownWalks = static_cast<RememberedWalks*>(std::calloc(1, sizeof(RememberedWalks)));
 }
 
 // Null while the thread ends, and when there is no memory.
 RememberedWalks* WalksOfThread() {
-    return theWalks ? theWalks : MakeWalks();
+    return ownWalks ? ownWalks : MakeWalks();
 }
 
 RememberedWalk& WalkFrom(RememberedWalks& mine, const StackFrame* frame, uint64 serial) {
@@ -143,7 +143,7 @@ struct CallSites::Key {
     const void* addresses[CallStack::kCapacity];
 };
 
-CallSites::CallSites(TrackerHeap& heap, int32 skip) : heap_(heap), serial_(theNextSerial.fetch_add(1)), skip_(skip) {
+CallSites::CallSites(TrackerHeap& heap, int32 skip) : heap_(heap), serial_(nextSerial.fetch_add(1)), skip_(skip) {
 }
 
 void CallSites::SetSkip(int32 skip) {
@@ -240,16 +240,16 @@ const char* CallSites::CopyText(const char* text, TrackerFailure& failure) {
     return copy ? static_cast<const char*>(std::memcpy(copy, text, size)) : nullptr;
 }
 
-CallSites::Reporting::Reporting(const CallSites& sites) : outer_(theWalks ? theWalks->reporting : nullptr) {
+CallSites::Reporting::Reporting(const CallSites& sites) : outer_(ownWalks ? ownWalks->reporting : nullptr) {
     if (RememberedWalks* mine = WalksOfThread()) mine->reporting = &sites;
 }
 
 CallSites::Reporting::~Reporting() {
-    if (theWalks) theWalks->reporting = outer_;
+    if (ownWalks) ownWalks->reporting = outer_;
 }
 
 bool CallSites::IsReporting() const {
-    return theWalks && theWalks->reporting == this;
+    return ownWalks && ownWalks->reporting == this;
 }
 
 }  // namespace tessel

@@ -13,7 +13,7 @@ void LeaveTimedList(occh& handler) {
     if (!(handler.flags & kOnTimedList)) return;
     handler.flags &= ~kOnTimedList;
     OccurrenceLockHolder timed(gTimedHdlrMutex);
-    gTimedHandlers.Remove(handler.timeout);
+    timedHandlers.Remove(handler.timeout);
 }
 
 void Unbind(occh& handler) {
@@ -28,7 +28,7 @@ void Fire(occh& handler, bool timedOut, OccurrenceReports& reports) {
     LeaveTimedList(handler);
     handler.flags = timedOut ? handler.flags | kHasTimedOut : handler.flags & ~kHasTimedOut;
     if (IsDamaged(handler.firedNode, handler)) reports.Add(OccurrenceReports::kBogusFired);
-    ThreadGroup& group = gThreadGroups[handler.group];
+    ThreadGroup& group = threadGroups[handler.group];
     group.fired.PushFront(handler.firedNode);
     if (group.notify) group.notify(group.argument);
 }
@@ -115,12 +115,12 @@ bool JoinTimedList(occh& handler, int32 milliseconds, OccurrenceReports& reports
     OccurrenceLockHolder timed(gTimedHdlrMutex);
     if (handler.timeout.IsListed() || handler.timeout.GetRefnum() != handler.refnum) {
         reports.Add(OccurrenceReports::kBogusTimed);
-        gTimedHandlers.Remove(handler.timeout);
+        timedHandlers.Remove(handler.timeout);
         handler.timeout.SetRefnum(handler.refnum);
     }
-    gTimedHandlers.Insert(handler.timeout, deadline ? deadline : 1, now, TimeList::Among::kAfterEquals);
+    timedHandlers.Insert(handler.timeout, deadline ? deadline : 1, now, TimeList::Among::kAfterEquals);
     handler.flags |= kOnTimedList;
-    return gTimedHandlers.IsFirst(handler.timeout);
+    return timedHandlers.IsFirst(handler.timeout);
 }
 
 Outcome RunNow(occh& handler, MgErr err) {

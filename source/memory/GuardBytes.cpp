@@ -63,7 +63,7 @@ bool CheckGuards(const void* data, GuardKind kind) {
     }
     const char* leading = static_cast<const char*>(data) - kGuardSize;
     if (!IsGuard(leading)) return Fail(data, kUnderrun, nullptr);
-    uint32 size = kind == GuardKind::kHandle ? HandleLayout().SizeOf(data) : *GuardedPtrSize(data);
+    const uint32 size = kind == GuardKind::kHandle ? HandleLayout().SizeOf(data) : *GuardedPtrSize(data);
     const char* trailing = static_cast<const char*>(data) + size;
     if (!IsGuard(trailing)) return Fail(data, kOverrun, nullptr);
     char version[kTail - kDigits + 1] = {leading[kDigits], leading[kDigits + 1], 0};

@@ -49,11 +49,11 @@ bool HandleLayout::IsSound(UPtr data, platform::ReadablePages& pages) const {
 }
 
 UPtr NewGuardedBlock(size_t size, GuardKind kind) {
-    bool guarded = GuardRoom(kind) != 0;
-    size_t room = guarded ? kPtrHeader + kGuardSize : 0;
-    size_t bytes = (std::max<size_t>(size + room, 1) + 7) & ~size_t{7};
+    const bool guarded = GuardRoom(kind) != 0;
+    const size_t room = guarded ? kPtrHeader + kGuardSize : 0;
+    const size_t bytes = (std::max<size_t>(size + room, 1) + 7) & ~size_t{7};
     if (bytes < size || (guarded && size > UINT32_MAX)) return static_cast<UPtr>(heap::OutOfMemory());
-    auto block = static_cast<UPtr>(heap::Allocate(bytes));
+    const auto block = static_cast<UPtr>(heap::Allocate(bytes));
     if (!block || !guarded) return block;
     UPtr data = block + kPtrHeader;
     *GuardedPtrSize(data) = static_cast<uint32>(size);

@@ -27,7 +27,7 @@ bool NameHandleBlocks(void* context, heap::Visitor visitor) {
     return masterPointers.ForEachLive([&](UHandle h) {
         const UPtr data = *h;
         if (!layout.IsSound(data, pages)) return false;
-        uint32 bytes = layout.BlockSize(layout.SizeOf(data), layout.AlignmentOf(data));
+        const uint32 bytes = layout.BlockSize(layout.SizeOf(data), layout.AlignmentOf(data));
         return visitor(context, layout.BlockOf(data), bytes);
     });
 }
@@ -41,7 +41,7 @@ void RecoverHandles() {
     masterPointers.ForEachLeft([&](UHandle h) {
         platform::ReadablePages pages;
         const bool sound = HandleLayout().IsSound(*h, pages);
-        uint32 size = sound ? HandleLayout().SizeOf(*h) : 0;
+        const uint32 size = sound ? HandleLayout().SizeOf(*h) : 0;
         TESSEL_REPORT(kDebugInfo, 0x66B5D82Cu) << "handle " << DbgFmtPtr(h) << ", size " << size << " still allocated.";
         UntrackHandle(h);
         if (!sound) return heap::CallErrorCallback(heap::Error::kDamagedBlock, *h);

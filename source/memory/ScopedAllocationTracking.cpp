@@ -51,7 +51,7 @@ void ReportAllocation(const ScopedAllocation& allocation) {
 // Takes what is left out of the record and ends tracking. False when it was not on.
 bool EndTracking(ScopedMap& left) {
     LibraryMutexHolder hold(record->mutex);
-    bool was = record->active;
+    const bool was = record->active;
     record->active = false;
     SetDetour(kScopeTracked, false);
     left.swap(record->map);

@@ -118,7 +118,7 @@ void HandleGate::UnlockShared() TESSEL_LOCKS_UNPROVEN {
 // Holds the mutex until its end.
 GateClosed::GateClosed() TESSEL_LOCKS_UNPROVEN {
     threadsMutex.Lock();
-    uint32 before = HandleGate::state.fetch_or(HandleGate::kClosed, std::memory_order_seq_cst);
+    const uint32 before = HandleGate::state.fetch_or(HandleGate::kClosed, std::memory_order_seq_cst);
     if (!(before & HandleGate::kOwnFences)) platform::FenceEveryThread();
     for (ThreadMemory* thread = threads; thread; thread = thread->next_)
         while (thread->inside_.load(std::memory_order_seq_cst) != 0) platform::YieldThread();

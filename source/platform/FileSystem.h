@@ -30,9 +30,9 @@ bool FileGetInfo(FileHandle file, ItemInfo& info);
 // What shows whether a name still leads to the file and the text that it led to: another file, another size, or another
 // time of the last write, in whatever resolution the host keeps it.
 struct FileVersion {
-    std::uint64_t device = 0, number = 0;  // of the file
-    std::int64_t size = 0;
-    std::int64_t seconds = 0, nanoseconds = 0;
+    std::uint64_t device, number;  // of the file
+    std::int64_t size;
+    std::int64_t seconds, nanoseconds;
 
     bool operator==(const FileVersion&) const = default;
 };

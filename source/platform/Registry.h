@@ -45,7 +45,8 @@ ErrorNumber RegistryOpenRoot(RegistryRoot root, std::uint32_t view, RegistryKey*
 // when it may not be written and `write` asks for it.
 ErrorNumber RegistryOpen(const RegistryKey* parent, const char* path, bool write, RegistryKey*& key);
 
-// Opens with write access, and makes what is missing.
+// Opens with write access, and makes what is missing, one key after the other. After a failure a key that was made may
+// be there.
 ErrorNumber RegistryCreate(const RegistryKey* parent, const char* path, RegistryKey*& key);
 
 ErrorNumber RegistryClose(RegistryKey* key);

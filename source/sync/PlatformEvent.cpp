@@ -76,7 +76,7 @@ PlatformEvent* CreatePlatformEvent(bool signaled) {
 
 MgErr DestroyPlatformEvent(PlatformEvent* event) {
     if (!event) return kNoErr;
-    MgErr err = event->Uninit();
+    const MgErr err = event->Uninit();
     if (auto* own = dynamic_cast<HostEvent*>(event))
         spareEvents.Keep(own);
     else

@@ -35,7 +35,7 @@ PlatformMutex* CreatePlatformMutex() {
 
 MgErr DestroyPlatformMutex(PlatformMutex* mutex) {
     if (!mutex) return kNoErr;
-    MgErr err = mutex->Uninit();
+    const MgErr err = mutex->Uninit();
     delete mutex;
     return err;
 }

@@ -215,7 +215,7 @@ MgErr ThPseudoThreadCreate(ThThread* thread) {
     if (!thread) return kArgErr;
     *thread = NewRecord();
     if (!*thread) return kMemFullErr;
-    MgErr err = Conclude(AdoptCallingThread(*thread), thread);
+    const MgErr err = Conclude(AdoptCallingThread(*thread), thread);
     if (err == kNoErr) SetOwnRecord(*thread);
     return err;
 }

@@ -49,7 +49,7 @@ struct PriorityChange {
 PriorityChange ChangePriority(ThThread thread, int32 level) {
     LibraryMutexHolder holder(gCreateThread);
     if (!IsThread(thread)) return {};
-    bool set = platform::ThreadSetPriority(HandleOf(thread), priorities[level]);
+    const bool set = platform::ThreadSetPriority(HandleOf(thread), priorities[level]);
     const bool isForbidden = !set && platform::LastError() == platform::kErrorAccessDenied;
     return {true, set, isForbidden, thread->platformThread, thread->platformId};
 }

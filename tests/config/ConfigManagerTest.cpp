@@ -1,8 +1,10 @@
 // The manager: which file and section, reading, writing and removing, the shadow in memory, what is reported.
 #include "ConfigValue.h"
 #include "config/ConfigTestSupport.h"
+#include "support/FailingAllocator.h"
 
 #include <filesystem>
+#include <functional>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -24,9 +26,9 @@ std::string Section(ConfigManager& manager) {
     return StringUtils::ToNarrowString(text, StringUtils::kReleaseSource);
 }
 
-std::string PrefFile() {
+std::string PrefFile(ConfigManager& manager = *GetMainCfgAccess()) {
     Path path = nullptr;
-    EXPECT_EQ(kNoErr, CfgGetPrefFilePath(&path));
+    EXPECT_EQ(kNoErr, manager.GetPrefFilePath(&path));
     std::string text = path ? path->ToString(PathRef::StringDisplay()) : "none";
     FDestroyPath(&path);
     return text;
@@ -138,6 +140,7 @@ TEST(ConfigManager, StartsOnTheFileThatIsNamed) {
         ReportRecorder reports;
         InitTesselAppSupport();
         EXPECT_EQ(row.file, PrefFile());
+        EXPECT_EQ(byDefault, PrefFile(*OwnedManager(new ConfigManager(PathRef()))));
         EXPECT_EQ(row.set && row.set[0] == '\\', reports.CountAt(kDebugWarning) == 1);
         int32 value = static_cast<int32>(row.file.size());
         EXPECT_EQ(kNoErr, CfgWrite(kConfigI32, Key("n"), &value));
@@ -315,6 +318,42 @@ TEST(ConfigManager, ReportsKeysThatTheApplicationDoesNotKnow) {
     EXPECT_THAT(started.reports.Texts(kDebugWarning),
                 ElementsAre("If tokens is NULL, tokenCount must be zero", "Unknown INI token: m",
                             "Unknown INI token: m", "Unknown INI token: x"));
+}
+
+// Each operation with its n-th allocation failing, until it has all it wants.
+TEST(ConfigManager, AnAllocationThatFailsIsSaid) {
+    StartedConfig started("[App]\nPStr=\"x\"\n");
+    ConfigManager& main = *GetMainCfgAccess();
+    PathRef file("T:\\prefs.ini", PathRef::StringDisplay());
+    ConfigValue value(kConfigPStr), paths(kConfigPLst);
+    ConfigTypeFromString(kConfigPLst, "C:\\a;C:\\b", 9, paths.Pointer());
+    LStrArrayHandle keys = nullptr, texts = nullptr;
+    LStrHandle section = nullptr;
+    int32 count = 0;
+    const std::function<MgErr()> operations[] = {
+        [&] { return main.Write(kConfigPLst, "paths", paths.Pointer(), true); },
+        [&] { return main.GetDefault(kConfigPLst, "paths", paths.Pointer()); },
+        [&] { return main.GetInMemoryConfigList(&keys, &texts, &count); },
+        [&] { return CfgGetHostPrefsSection(&section); },
+        [&] { return CfgGetDefaultFrom(&file, kConfigPStr, Key("PStr"), value.Pointer()); },
+        [&] { return main.Write(kConfigPStr, "PStr", value.Pointer(), false); },
+    };
+    for (const auto& operation : operations) {
+        int failures = 0;
+        for (bool failed = true; failed;) {
+            const FailingAllocator failing(failures + 1);
+            const MgErr err = operation();
+            failed = failing.HasFailed();
+            EXPECT_TRUE(failed ? err == kMemFullErr || err == kConfigMemErr || !err : !err) << err;
+            failures += failed;
+        }
+        EXPECT_GT(failures, 0) << &operation - operations;
+    }
+    EXPECT_EQ(1, count);
+    EXPECT_EQ("[App]\r\nPStr=\"x\"\r\n", started.File());
+    ReallocLStrArrayHandle(&keys, 0);
+    ReallocLStrArrayHandle(&texts, 0);
+    DSDisposeHandle(reinterpret_cast<UHandle>(section));
 }
 
 // ---- names of files, enumerations -----------------------------------------------------------------------------------

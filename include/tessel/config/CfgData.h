@@ -48,9 +48,7 @@ public:
     bool IsDefaulted() const { return isDefaulted_; }
 
 private:
-    friend TESSEL_API MgErr CfgDataInit(CfgData* data, ConfigManager* manager, class CfgDataValidator* validator,
-                                        uint32 flags, void* context, CfgSettings* settings);
-    friend MgErr TakeDefault(CfgData& data, MgErr result);
+    friend struct CfgDataAccess;
 
     bool isDefaulted_ = false;
 };

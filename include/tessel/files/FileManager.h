@@ -185,6 +185,12 @@ TESSEL_API MgErr FCreate(File_t** file, Path path, int32 unused1, int32 openMode
 // Creates a file and opens it; an existing one is replaced by an empty one.
 TESSEL_API MgErr FCreateAlways(File_t** file, Path path, int32 unused1, int32 openMode, int32 denyMode, int32 unused2);
 
+// Writes a file with these bytes; one that is there is replaced, and keeps permissions, owner, attributes and time of
+// creation. `data` may be null when `size` is 0. kFileInUseErr while someone has it open. Atomic and durable: whenever
+// the process is killed or the power fails, the old file is there or the new one, whole. Neither where the file has
+// several names (hard links), or its folder cannot be written: then it is written in place.
+TESSEL_API MgErr FWriteWholeFile(Path path, const void* data, uint64 size);
+
 // Copies a file: its bytes, permissions and modification date; what takes no room takes none in the copy. kExistsErr
 // when `to` exists in any spelling, also when it comes meanwhile; kArgErr when `from` is a volume; kPermissionErr for
 // what is no file; kIOErr when it ends before its size. FCopy follows shortcuts in `from`, the other form only when
@@ -199,6 +205,7 @@ TESSEL_API MgErr FCopyResolve(Path from, Path to, int32 resolve);
 // To another file system a file is copied, with its owner, permissions, dates and attributes as far as they can be
 // kept, and is on the device there before it goes here: it is always whole in one of the two, for a moment in both.
 // kFileInUseErr, and nothing happens, while someone writes it. A link moves itself; a folder does not move (kIOErr).
+// When at last the old folder cannot be brought to the device, the file has moved all the same, with kIOErr.
 TESSEL_API MgErr FMove(Path from, Path to);
 // As FMove, which follows shortcuts in `from`; this one only when `resolve` is not 0.
 TESSEL_API MgErr FMoveResolve(Path from, Path to, int32 resolve);

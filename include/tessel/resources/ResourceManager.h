@@ -56,7 +56,8 @@ TESSEL_BEGIN_C
 // type and creator of the file. Results: kNotResFileErr not a resource file, kEOFErr too short for one, kVersionErr
 // newer than version 3, kIOErr damaged, kMemFullErr, or those of opening the file.
 
-// Creates an empty resource file on disk. kExistsErr when it exists and `replace` is 0.
+// Creates an empty resource file on disk. kExistsErr when it exists and `replace` is 0. Atomic and durable: at no
+// moment is there an unfinished file under the name, and a failed or interrupted replacement leaves the old one.
 TESSEL_API MgErr RCreateFile(Path path, int32 replace, _FMFileCreator creator, _FMFileType type, int32 unused);
 
 // Opens a file on disk. Read-only also finds a resource file behind a host file, by its trailer: the last 4 bytes,
@@ -81,15 +82,28 @@ TESSEL_API MgErr ROpenAppResFile(Path path, int32 mode, RsrcFile* refnum);
 // A new empty file in memory; RGetMemFileHandle gives its image.
 TESSEL_API MgErr RCreateMemFile(RsrcFile* refnum, _FMFileCreator creator, _FMFileType type);
 
-// Writes pending changes and closes. When that fails the file stays open. (A chain: RDestroyChain.)
+// Writes pending changes, as RUpdateFile does, and closes. When that fails the file stays open. (A chain:
+// RDestroyChain.)
 TESSEL_API MgErr RCloseFile(RsrcFile refnum);
 
-// The same, but when the changes cannot be written they are given up, and the file on disk stays as the try left it:
-// untouched when the disk is too full for the whole update, else in part rewritten. The result is that of the try.
+// The same, but when the changes cannot be written they are given up, and the file on disk stays as it was. The result
+// is that of the try.
 TESSEL_API MgErr RCloseFileForce(RsrcFile refnum);
 
-// (file) Writes pending changes and packs the file. On failure they stay pending, and the next update tries again.
-// kDiskFullErr before anything is overwritten when there is no room for the whole update.
+// (file) Writes pending changes and packs the file. On failure they stay pending, the file on disk is as it was, and
+// the next update tries again; kDiskFullErr when there is no room, kNotFoundErr when the file was moved away or removed
+// while it was open.
+//
+// Atomic and durable: whenever the process is killed or the power fails, the next open, a read-only one too, finds the
+// old file or the new one, whole; after kNoErr the new one. A new file takes the place of the old one. It keeps
+// permissions, owner, attributes, time of creation and what others are denied; a link goes on leading to it. A file
+// that has several names, whose folder cannot be written, whose owner cannot be kept, or that was opened by reference
+// is written in place, just as safely where the 32 bytes of its header are written whole or not at all, as devices do;
+// it needs room for what moves once more, for a while.
+//
+// On a full disk changes are written where there is room for them alone, and what is removed just goes; the file stays
+// longer than it has to be until an update has more room. When there is not even room for a new map, an update that
+// makes the file no longer overwrites it: only then a kill or a power loss in that moment may leave a damaged file.
 TESSEL_API MgErr RUpdateFile(RsrcFile refnum);
 
 // (file) Takes back the handle given to ROpenUHandle; it must outlive the file, which goes on using it. kGenericErr:
@@ -101,10 +115,12 @@ TESSEL_API MgErr RGetUHandleOwnership(RsrcFile refnum, UHandle* image);
 // they cannot be released or detached.
 TESSEL_API MgErr RGetMemFileHandle(RsrcFile refnum, UHandle* image);
 
-// (file) Grows the file by `size` bytes ahead of writing.
+// (file) Grows the file by `size` bytes ahead of writing. Neither atomic nor durable for the room; what the file holds
+// is not touched.
 TESSEL_API MgErr RPreAllocFile(RsrcFile refnum, uint32 size);
 
-// Type and creator of a file that is not open; RGetFileType takes null outputs.
+// Type and creator of a file that is not open; RGetFileType takes null outputs. RSetFileType is atomic and durable in
+// the same way as RUpdateFile.
 TESSEL_API MgErr RGetFileType(Path path, _FMFileType* type, _FMFileCreator* creator);
 // Sets type and creator of a file that is not open.
 TESSEL_API MgErr RSetFileType(Path path, _FMFileType type, _FMFileCreator creator);

@@ -58,13 +58,13 @@ namespace tessel {
 class ThMutexHolder {
 public:
     // Acquires the mutex; null holds nothing.
-    explicit ThMutexHolder(ThMutex mutex) : fMutex(mutex) { ThMutexAcquire(fMutex); }
-    ~ThMutexHolder() { ThMutexRelease(fMutex); }
+    explicit ThMutexHolder(ThMutex mutex) : mutex_(mutex) { ThMutexAcquire(mutex_); }
+    ~ThMutexHolder() { ThMutexRelease(mutex_); }
     ThMutexHolder(const ThMutexHolder&) = delete;
     ThMutexHolder& operator=(const ThMutexHolder&) = delete;
 
 private:
-    ThMutex fMutex;
+    ThMutex mutex_;
 };
 
 }  // namespace tessel

@@ -36,12 +36,12 @@ public:
     // The flags that are in both.
     OpSystemFeatureFlags operator&(const OpSystemFeatureFlags& other) const;
     // Whether there is any flag.
-    bool IsNonZero() const { return fFlags != 0; }
+    bool IsNonZero() const { return flags_ != 0; }
 
 private:
     friend class HostSystemInfo;
-    explicit OpSystemFeatureFlags(uint64 flags) : fFlags(flags) {}
-    uint64 fFlags;
+    explicit OpSystemFeatureFlags(uint64 flags) : flags_(flags) {}
+    uint64 flags_;
 };
 
 // What is known of the operating system.

@@ -103,7 +103,8 @@ TESSEL_API MgErr ThThreadSetPriority(ThThread thread, int32 level);
 // does not tell.
 TESSEL_API int32 ThThreadGetPriority(ThThread thread);
 
-// The host's priorities of the five levels. Each output may be null.
+// The host's priorities of the five levels: -15, 0, 1, 2 and 15, or what the settings "thpri_bgrnd", "thpri_normal",
+// "thpri_high", "thpri_vhigh" and "thpri_tcrit" (I32) say when the threads start. Each output may be null.
 TESSEL_API void ThThreadGetNativePriorityInfo(int32* background, int32* normal, int32* high, int32* veryHigh,
                                               int32* timeCritical);
 

@@ -29,7 +29,7 @@ public:
     HiResClock operator-(const HiResClock& other) const;
 
 private:
-    uint64 fCount = 0;
+    uint64 count_ = 0;
 };
 
 // Seconds since 1904-01-01 00:00:00 UTC as one signed number with 64 fraction bits: a time before the epoch has
@@ -38,7 +38,7 @@ class TESSEL_API ATime128 {
 public:
     ATime128() = default;
     // Whole seconds, and a fraction in units of 2^-64 s.
-    ATime128(int64 seconds, uint64 fraction) : fFraction(fraction), fSeconds(seconds) {}
+    ATime128(int64 seconds, uint64 fraction) : fraction_(fraction), seconds_(seconds) {}
     // Exact, truncating toward zero below 2^-64 s. Infinities, NaNs and what is too large give the largest or, with the
     // sign bit set, the smallest value.
     explicit ATime128(double seconds);
@@ -48,13 +48,13 @@ public:
     // Null outputs are skipped.
     void Get(uint32* secondsHigh, uint32* secondsLow, uint32* fractionHigh, uint32* fractionLow) const;
     // The whole seconds.
-    int64 GetInt64Seconds() const { return fSeconds; }
+    int64 GetInt64Seconds() const { return seconds_; }
     // The fraction in units of 2^-64 s.
-    uint64 GetUInt64Fraction() const { return fFraction; }
+    uint64 GetUInt64Fraction() const { return fraction_; }
     // Sets the whole seconds; the fraction stays.
-    void SetInt64Seconds(const int64& seconds) { fSeconds = seconds; }
+    void SetInt64Seconds(const int64& seconds) { seconds_ = seconds; }
     // Sets the fraction; the seconds stay.
-    void SetUInt64Fraction(const uint64& fraction) { fFraction = fraction; }
+    void SetUInt64Fraction(const uint64& fraction) { fraction_ = fraction; }
 
     // Adds 2^-64 s.
     void IncrementLSB();
@@ -73,13 +73,13 @@ public:
     // The product, modulo 2^128, rounded half away from zero.
     ATime128 operator*(const ATime128& other) const;
     // Whether the times are the same.
-    bool operator==(const ATime128& other) const { return fSeconds == other.fSeconds && fFraction == other.fFraction; }
+    bool operator==(const ATime128& other) const { return seconds_ == other.seconds_ && fraction_ == other.fraction_; }
     // Whether the times differ.
     bool operator!=(const ATime128& other) const { return !(*this == other); }
 
 private:
-    uint64 fFraction = 0;
-    int64 fSeconds = 0;
+    uint64 fraction_ = 0;
+    int64 seconds_ = 0;
 };
 
 // From a count of 100 ns since 1601; to double precision, about half a microsecond these days.

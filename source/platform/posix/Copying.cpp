@@ -23,10 +23,11 @@ namespace tessel::platform {
 
 namespace {
 
-bool VersionOfRegular(int file, FileVersion& version) {
+// False with errno; also for what is no regular file.
+bool VersionOf(int file, FileVersion& version) {
     struct statx status;
     if (systemCalls.statx(file, "", AT_EMPTY_PATH, kVersionMask | STATX_TYPE, &status) != 0) return false;
-    version = VersionOf(status);
+    version = VersionOfStatus(status);
     if (S_ISREG(status.stx_mode)) return true;
     errno = EACCES;
     return false;
@@ -122,7 +123,7 @@ CopyResult FileCopyBytes(FileHandle from, FileHandle to, bool keepsHoles, FileVe
     const int source = DescriptorOf(from), target = DescriptorOf(to);
     std::int64_t done = 0;
     for (int round = 0; round < kMostRounds; ++round) {
-        if (!VersionOfRegular(source, version)) {
+        if (!VersionOf(source, version)) {
             FailErrno();
             return CopyResult::kReadFailed;
         }
@@ -248,11 +249,11 @@ bool FileDeleteCopied(const char* name, FileHandle file, const FileVersion& copi
     if (systemCalls.statx(source, "", AT_EMPTY_PATH, STATX_INO, &opened) != 0) return FailErrno();
     if (!StatusOf(native, Links::kFollowed, STATX_INO, named)) return FailErrno();
     if (!SameFile(opened, named)) return FailWith(kErrorFileNotFound);
-    if (!VersionOfRegular(source, now)) return FailErrno();
+    if (!VersionOf(source, now)) return FailErrno();
     if (now != copied) return FailWith(kErrorSharingViolation);
     if (systemCalls.unlink(native.c_str()) != 0) return FailErrno();
     // Who had it open may have written a last time: nobody else finds it any more.
-    const bool grown = VersionOfRegular(source, now) && now.size > copied.size;
+    const bool grown = VersionOf(source, now) && now.size > copied.size;
     if (grown && CopyStretch(source, DescriptorOf(copy), copied.size, now.size, true) != CopyResult::kDone)
         return false;
     if (grown && !FileFlush(copy)) return false;
@@ -288,7 +289,11 @@ bool MoveFile(const char* from, const char* to) {
                         FinishNew(copy, to);
     if (!copied) return false;
     if (FileDeleteCopied(from, source.Get(), version, copy.File())) return true;
-    return ItemExists(from) == ItemKind::kNone ? false : Forsake(to);
+    const ErrorNumber reason = LastError();
+    const bool stays = systemCalls.statx(DescriptorOf(source.Get()), "", AT_EMPTY_PATH, STATX_NLINK, &status) != 0 ||
+                       status.stx_nlink != 0;
+    SetLastError(reason);
+    return stays ? Forsake(to) : false;
 }
 
 // A link itself, not what it leads to.

@@ -23,7 +23,7 @@ pid_t OwnProcess() {
     pid_t known = processId.load(std::memory_order_relaxed);
     if (known) return known;
     static const int registered = pthread_atfork(nullptr, nullptr, [] { processId = 0; });
-    pid_t own = ::getpid();
+    pid_t own = systemCalls.getpid();
     if (registered == 0) processId.store(own, std::memory_order_relaxed);
     return own;
 }

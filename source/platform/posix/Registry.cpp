@@ -284,7 +284,7 @@ bool TakePlace(Aside& aside, const std::string& name, const Folder& folder, cons
         flags = 0;
         placed = systemCalls.renameat2(from, name.c_str(), to, item.c_str(), flags) == 0;
     }
-    const bool flushed = placed && folder.Flush();
+    const bool flushed = placed && folder.Flush() && aside.Place().Flush();
     const int error = errno;
     const bool mayGoBack = !replaces || flags != 0;
     if (placed && !flushed && mayGoBack) systemCalls.renameat2(to, item.c_str(), from, name.c_str(), flags);

@@ -121,7 +121,7 @@ bool Aside::Delete(const Folder& folder, const std::string& item) {
     const std::string name = NewName();
     const int from = folder.Number(), to = place_.Number();
     if (systemCalls.renameat2(from, item.c_str(), to, name.c_str(), 0) != 0) return false;
-    if (!folder.Flush()) {
+    if (!folder.Flush() || !place_.Flush()) {
         const int error = errno;
         systemCalls.renameat2(to, name.c_str(), from, item.c_str(), 0);
         errno = error;

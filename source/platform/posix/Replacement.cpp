@@ -120,8 +120,9 @@ struct Replacement::Work {
     std::string last;         // the name, in the folder
     std::string privateName;  // in the same folder, while there is one
     int folder = -1;
-    int target = -1;  // the old file; -1 for none
-    int file = -1;    // the new one
+    bool unreadable = false;  // the folder may be written but not read, nor flushed
+    int target = -1;          // the old file; -1 for none
+    int file = -1;            // the new one
     bool hasName = false;
     bool exchanged = false;  // the old file has the private name
     struct statx targetStatus {};
@@ -151,6 +152,7 @@ struct Replacement::Work {
     bool LinkAs(const std::string& name) const;
     bool LinkPrivately();
     bool TakeName();
+    bool FlushFolder() const;
     bool TakeFreeName();
     bool TakeNameOver();
     void TakeBack();
@@ -189,6 +191,8 @@ bool Replacement::Work::FindFolder() {
     if (!FollowLinks(native)) return FailErrno();
     last = NativeLast(native);
     folder = OpenRetrying(NativeParent(native).c_str(), O_RDONLY | O_DIRECTORY);
+    unreadable = folder < 0 && errno == EACCES;
+    if (unreadable) folder = OpenRetrying(NativeParent(native).c_str(), O_PATH | O_DIRECTORY);
     if (folder < 0) return FailErrno();
     failure = ReplaceFailure::kNone;
     return true;
@@ -243,7 +247,7 @@ std::string Replacement::Work::NumberedName(int number) const {
 bool Replacement::Work::IsLeftover(int descriptor) const {
     struct statx status;
     if (!StatusOfOpen(descriptor, STATX_BASIC_STATS, status)) return false;
-    const bool own = status.stx_uid == ::geteuid() || (target >= 0 && status.stx_uid == targetStatus.stx_uid);
+    const bool own = status.stx_uid == systemCalls.geteuid() || (target >= 0 && status.stx_uid == targetStatus.stx_uid);
     if (!S_ISREG(status.stx_mode) || status.stx_nlink != 1 || !own) return false;
     if (request.pattern && systemCalls.fgetxattr(descriptor, kTemporaryAttribute, nullptr, 0) < 0) return false;
     return MarkBytes(descriptor, F_RDLCK, kWriterMark, 1) == Marking::kDone &&
@@ -348,7 +352,9 @@ bool Replacement::Work::Seal() {
 bool Replacement::Work::LinkAs(const std::string& name) const {
     char self[40];
     std::snprintf(self, sizeof self, "/proc/self/fd/%d", file);
-    return systemCalls.linkat(AT_FDCWD, self, folder, name.c_str(), AT_SYMLINK_FOLLOW) == 0;
+    if (systemCalls.linkat(AT_FDCWD, self, folder, name.c_str(), AT_SYMLINK_FOLLOW) == 0) return true;
+    // Without /proc newer kernels, and those who may search everything, link by the descriptor alone.
+    return errno == ENOENT && systemCalls.linkat(file, "", folder, name.c_str(), AT_EMPTY_PATH) == 0;
 }
 
 bool Replacement::Work::LinkPrivately() {
@@ -414,9 +420,15 @@ void Replacement::Work::TakeBack() {
     }
 }
 
+// What cannot be flushed by itself is flushed with all that its file system holds.
+bool Replacement::Work::FlushFolder() const {
+    if (unreadable) return Retry([&] { return systemCalls.syncfs(file); }) == 0;
+    return Flush(folder) || errno == EINVAL;  // a file system that does not flush folders
+}
+
 bool Replacement::Work::TakeName() {
     if (target < 0 ? !TakeFreeName() : !TakeNameOver()) return false;
-    if (!Flush(folder) && errno != EINVAL) {  // EINVAL: a file system that does not flush folders
+    if (!FlushFolder()) {
         const int error = errno;
         TakeBack();
         SetMark(hasName ? file : target, false);
