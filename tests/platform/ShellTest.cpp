@@ -111,33 +111,6 @@ TEST_F(Shell, TrashOfOthersAndWhatTheyLeftThere) {
     EXPECT_TRUE(ShellTrash(drive_.Name(std::string(250, 'n')).c_str()));
 }
 
-// After every failure the item is where it was and nothing is said of it, or both are in the trash.
-TEST_F(Shell, TrashingIsWholeOrNotAtAll) {
-    const std::string trash = "home/.local/share/Trash/";
-    drive_.Put("first", "");
-    ASSERT_TRUE(ShellTrash(drive_.Name("first").c_str()));
-    int failures = 0;
-    for (const char* call : {"open", "openat", "write", "fsync", "renameat2", "statx", "unlink", "flock", "opendir"}) {
-        for (int n = 1, calls = 1; n <= calls; ++n) {
-            SCOPED_TRACE(testing::Message() << call << ' ' << n);
-            drive_.Put("item", "x");
-            bool moved;
-            {
-                test::FailingPlatform failing(call, n, EIO);
-                moved = ShellTrash(drive_.Name("item").c_str());
-                calls = failing.Calls() < n ? 0 : n + 1;
-            }
-            failures += !moved;
-            EXPECT_EQ(moved, !fs::exists(drive_.Native("item")));
-            EXPECT_EQ(moved, fs::exists(drive_.Native(trash + "files/item")));
-            EXPECT_EQ(moved, fs::exists(drive_.Native(trash + "info/item.trashinfo")));
-            fs::remove(drive_.Native(trash + "files/item"));
-            fs::remove(drive_.Native(trash + "info/item.trashinfo"));
-        }
-    }
-    EXPECT_GT(failures, 15);
-}
-
 std::string Bytes(std::uint64_t value, int size) {
     std::string bytes;
     for (int i = 0; i < size; ++i) bytes += static_cast<char>(value >> (8 * i));
