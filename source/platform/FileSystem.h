@@ -27,6 +27,20 @@ struct ItemInfo {
 bool ItemGetInfo(const char* name, ItemInfo& info);
 bool FileGetInfo(FileHandle file, ItemInfo& info);
 
+// What shows whether a name still leads to the file and the text that it led to: another file, another size, or another
+// time of the last write, in whatever resolution the host keeps it.
+struct FileVersion {
+    std::uint64_t device, number;  // of the file
+    std::int64_t size;
+    std::int64_t seconds, nanoseconds;
+
+    bool operator==(const FileVersion&) const = default;
+};
+
+// As ItemGetInfo; but 2 for a link that leads nowhere.
+bool ItemGetVersion(const char* name, FileVersion& version);
+bool FileGetVersion(FileHandle file, FileVersion& version);
+
 enum class ItemKind { kNone, kFile, kFolder };
 ItemKind ItemExists(const char* name);
 
@@ -64,14 +78,6 @@ bool ItemRename(const char* from, const char* to);
 // (80). Atomic and durable: it appears whole, under its permissions. What is no regular file is refused (5), one that
 // ends before its size is not copied (38).
 bool FileCopy(const char* from, const char* to);
-
-// What an open file held at a time.
-struct FileVersion {
-    std::int64_t size = 0, modified = 0;
-    friend bool operator!=(const FileVersion& a, const FileVersion& b) {
-        return a.size != b.size || a.modified != b.modified;
-    }
-};
 
 // Copies all that a regular file holds over what another holds, with what is added meanwhile. `version`: which was
 // copied. `keepsHoles`: the other is new, and where it is not written it is to stay empty. Moves both positions. A

@@ -284,8 +284,9 @@ static_assert(static_cast<size_t>(platform::RegistryRoot::kUsers) == kRoots - 1)
 static_assert(kRegistryViewDefault == platform::kRegistryDefaultView);
 static_assert(kRegistryViewOf64Bit == platform::kRegistryView64);
 
-platform::Mutex rootsMutex;                 // guards the making of roots; nothing is taken inside
-IWinRegistryKey* rootKeys[kRoots][2] = {};  // by root and view, for the life of the process
+platform::Mutex rootsMutex;  // nothing is taken inside
+// By root and view, for the life of the process.
+IWinRegistryKey* rootKeys[kRoots][2] TESSEL_GUARDED_BY(rootsMutex) = {};
 
 // Null when there is no memory. Without a store it has no handle, so that every key of it is missing.
 IWinRegistryKey* MakeRoot(platform::RegistryRoot root, CStr name, uint32 view, ErrorNumber& error) try {

@@ -17,9 +17,9 @@ namespace tessel {
 namespace {
 
 // The "StringOutputWinConsole" lock. A plain mutex, since an output may be made before the library starts.
-platform::Mutex consoleLock;  // guards the two below
-int32 consoleCount = 0;
-bool consoleIsOurs = false;
+platform::Mutex consoleLock;
+int32 consoleCount TESSEL_GUARDED_BY(consoleLock) = 0;
+bool consoleIsOurs TESSEL_GUARDED_BY(consoleLock) = false;
 
 FILE* Stream(void* stream) {
     return static_cast<FILE*>(stream);

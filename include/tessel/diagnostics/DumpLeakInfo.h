@@ -23,6 +23,7 @@ namespace tessel {
 // Writes a leak report. The texts are kept by address.
 class TESSEL_API LeakDumper : public AllocDumper {
 public:
+    // For a report that expects so many records. The file is made by DumpLeaks.
     LeakDumper(int32 expected, const char* name, const char* fileName);
     ~LeakDumper() override;
     LeakDumper(const LeakDumper&) = delete;

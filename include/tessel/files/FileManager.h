@@ -180,7 +180,9 @@ TESSEL_API CStr FErrorText(MgErr err);
 // The unused arguments are ignored. *file is null on failure. Atomic, not durable: the file is there or not, empty.
 TESSEL_API MgErr FGenericCreate(File_t** file, Path path, int32 unused1, int32 openMode, int32 denyMode, int32 unused2,
                                 int32 always);
+// Creates a file and opens it. kExistsErr when it exists.
 TESSEL_API MgErr FCreate(File_t** file, Path path, int32 unused1, int32 openMode, int32 denyMode, int32 unused2);
+// Creates a file and opens it; an existing one is replaced by an empty one.
 TESSEL_API MgErr FCreateAlways(File_t** file, Path path, int32 unused1, int32 openMode, int32 denyMode, int32 unused2);
 
 // Writes a file with these bytes; one that is there is replaced, and keeps permissions, owner, attributes and time of
@@ -205,6 +207,7 @@ TESSEL_API MgErr FCopyResolve(Path from, Path to, int32 resolve);
 // kFileInUseErr, and nothing happens, while someone writes it. A link moves itself; a folder does not move (kIOErr).
 // When at last the old folder cannot be brought to the device, the file has moved all the same, with kIOErr.
 TESSEL_API MgErr FMove(Path from, Path to);
+// As FMove, which follows shortcuts in `from`; this one only when `resolve` is not 0.
 TESSEL_API MgErr FMoveResolve(Path from, Path to, int32 resolve);
 
 // Copies the bytes of `from` into the existing file `to`, which keeps its permissions, owner, attributes and time of
@@ -243,12 +246,14 @@ TESSEL_API MgErr FGetInfo(Path path, FInfoRec* info);
 
 // Applies the permissions and both dates of a file. A record of a folder changes nothing. Neither atomic nor durable.
 TESSEL_API MgErr FSetInfo64(Path path, FInfo64Rec* info);
+// As FSetInfo64, from the record with 32-bit sizes.
 TESSEL_API MgErr FSetInfo(Path path, FInfoRec* info);
 
 // Owner and group (always empty) and permissions: 0666, or 0444 read-only, for a file; 0777 or 0555 for a folder. Each
 // output may be null. Setting takes only permissions; with none given it checks that the item exists. Atomic, not
 // durable.
 TESSEL_API MgErr FGetAccessRights(Path path, PStr owner, PStr group, int32* permissions);
+// Sets the permissions; owner and group are not used.
 TESSEL_API MgErr FSetAccessRights(Path path, PStr owner, PStr group, int32* permissions);
 
 // `permissions` without those that the process removes by default. Takes the file manager's mutex.
@@ -284,7 +289,9 @@ TESSEL_API MgErr FListDesktop(CPStrHandle names, UHandle kinds);
 
 // Sizes of the volume of a path in bytes. FMGetVolInfo64: each output may be null, all are 0 on failure.
 TESSEL_API MgErr FGetVolInfo(Path path, VolInfoRec* info);
+// Bytes free and in all, and the bytes of a sector; each output may be null, all are 0 on failure.
 TESSEL_API MgErr FMGetVolInfo64(Path path, uint64* freeBytes, uint64* totalBytes, uint32* sectorSize);
+// Bytes in all and free.
 TESSEL_API MgErr FMGetVolInfo(Path path, double* totalBytes, double* freeBytes);
 
 // The path made of the volume alone. *volume is made when it is null.

@@ -122,6 +122,7 @@ TESSEL_API MgErr RPreAllocFile(RsrcFile refnum, uint32 size);
 // Type and creator of a file that is not open; RGetFileType takes null outputs. RSetFileType is atomic and durable in
 // the same way as RUpdateFile.
 TESSEL_API MgErr RGetFileType(Path path, _FMFileType* type, _FMFileCreator* creator);
+// Sets type and creator of a file that is not open.
 TESSEL_API MgErr RSetFileType(Path path, _FMFileType type, _FMFileCreator creator);
 
 // The header of a file that is not open for writing, as it stands in the file.
@@ -133,6 +134,7 @@ TESSEL_API MgErr RGetModDate(Path path, RsrcFile refnum, uint32* date, int32* re
 
 // (file) The file attributes word.
 TESSEL_API MgErr RGetFileAttrs(RsrcFile refnum, uint32* attrs);
+// (file) Sets the file attributes word.
 TESSEL_API MgErr RSetFileAttrs(RsrcFile refnum, uint32 attrs);
 
 // Installs the hook that offers files which are in memory already; null for none. Not while files are being opened.
@@ -153,10 +155,11 @@ TESSEL_API MgErr RGetNamed(RsrcFile refnum, ResType type, ConstPStr name, UHandl
 
 // *exists is 1 and the result kNoErr, or 0 and kResNotFoundErr.
 TESSEL_API MgErr RExists(RsrcFile refnum, ResType type, int32 id, int32* exists);
+// *loaded is whether the data of the resource are in memory.
 TESSEL_API MgErr RIsLoaded(RsrcFile refnum, ResType type, int32 id, bool* loaded);
 
-// (file) Adds a resource; on success the file owns the handle. kResIDExistsErr: the ID is taken, or `data`
-// is null. kArgErr: the handle is the data of a resource already, of this file or another.
+// (file) Adds a resource; on success the file owns the handle. kResIDExistsErr: the ID is taken, or `data` is null.
+// kArgErr: the handle is the data of a resource already, of this file or another.
 TESSEL_API MgErr RAdd(UHandle data, RsrcFile refnum, ResType type, int32 id, ConstPStr name);
 
 // (file) Removes the resource whose data this handle is. The caller owns the handle from then on.
@@ -164,7 +167,9 @@ TESSEL_API MgErr RRemove(UHandle data, RsrcFile refnum);
 
 // (file) How many resources of a type, how many types, and a type by index from 1 in the order they were added.
 TESSEL_API MgErr RCount(RsrcFile refnum, ResType type, int32* count);
+// (file) How many types there are.
 TESSEL_API MgErr RCountTypes(RsrcFile refnum, int32* count);
+// (file) A type by index from 1, in the order they were added.
 TESSEL_API MgErr RGetIndType(RsrcFile refnum, ResType* type, int32 index);
 
 // (file) An ID from 128 up that the type does not have, or 0. No ID either: 13, for an unknown refnum.
@@ -183,8 +188,11 @@ TESSEL_API MgErr RChanged(UHandle data);
 
 // Each output may be null; `name` takes up to 256 bytes.
 TESSEL_API MgErr RGetInfo(UHandle data, int32* id, ResType* type, PStr name);
+// The attributes word of the resource.
 TESSEL_API MgErr RGetAttrs(UHandle data, uint32* attrs);
+// Sets the attributes word of the resource.
 TESSEL_API MgErr RSetAttrs(UHandle data, uint32 attrs);
+// Bytes of the data.
 TESSEL_API MgErr RSize(UHandle data, uint32* size);
 
 // ---- strings and paths ----------------------------------------------------------------------------------------------
@@ -193,10 +201,12 @@ TESSEL_API MgErr RSize(UHandle data, uint32* size);
 
 // The "STR " resource: its data as a handle that stays the file's, or its text (256 bytes).
 TESSEL_API MgErr RGetString(RsrcFile refnum, int32 id, UHandle* data);
+// The text of a "STR " resource (256 bytes).
 TESSEL_API MgErr RGetPStr(RsrcFile refnum, int32 id, PStr string);
 
 // A string of a "STR#" resource (256 bytes), or of one of another type in place.
 TESSEL_API MgErr RGetIndString(RsrcFile refnum, PStr string, int32 id, int32 index);
+// A string of a list of another type, in place.
 TESSEL_API MgErr RGetIndStringPtr(RsrcFile refnum, ConstPStr* string, int32 id, int32 index, ResType type);
 
 // A string of a list of long strings, in a new handle that the caller owns.
@@ -204,6 +214,7 @@ TESSEL_API MgErr RGetIndLString(RsrcFile refnum, LStrHandle* string, int32 id, i
 
 // A path kept in a resource of any type, or in a "PTH#" list. *path is made when it is null.
 TESSEL_API MgErr RGetPath(RsrcFile refnum, ResType type, int32 id, Path* path);
+// A path of a "PTH#" list. *path is made when it is null.
 TESSEL_API MgErr RGetIndPath(RsrcFile refnum, Path* path, int32 id, int32 index);
 
 // ---- chains ---------------------------------------------------------------------------------------------------------
@@ -227,8 +238,11 @@ TESSEL_END_C
 
 namespace tessel {
 
+// The text of a "STR " resource.
 TESSEL_API MgErr RGetStringStd(RsrcFile refnum, std::string* text, int32 id);
+// A string of a "STR#" resource.
 TESSEL_API MgErr RGetIndexStringStd(RsrcFile refnum, std::string* text, int32 id, int32 index);
+// A string of a list of long strings.
 TESSEL_API MgErr RGetIndexLongStringStd(RsrcFile refnum, std::string* text, int32 id, int32 index, ResType type);
 
 // The "STR " resource taken as an LStr: a 32-bit count in host order, then the text.

@@ -23,11 +23,11 @@ namespace tessel::platform {
 
 namespace {
 
+// False with errno; also for what is no regular file.
 bool VersionOf(int file, FileVersion& version) {
     struct statx status;
-    if (systemCalls.statx(file, "", AT_EMPTY_PATH, STATX_SIZE | STATX_MTIME | STATX_TYPE, &status) != 0) return false;
-    version.size = static_cast<std::int64_t>(status.stx_size);
-    version.modified = FileTimeOf(status.stx_mtime.tv_sec, status.stx_mtime.tv_nsec);
+    if (systemCalls.statx(file, "", AT_EMPTY_PATH, kVersionMask | STATX_TYPE, &status) != 0) return false;
+    version = VersionOfStatus(status);
     if (S_ISREG(status.stx_mode)) return true;
     errno = EACCES;
     return false;

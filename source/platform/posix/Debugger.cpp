@@ -35,7 +35,7 @@ bool DebuggerAttached() noexcept {
 }
 
 void DebuggerBreak() noexcept {
-    ::raise(SIGTRAP);
+    systemCalls.raise(SIGTRAP);
 }
 
 void DebuggerOutput(const char* text) noexcept {

@@ -194,7 +194,7 @@ OwnFile ownFiles[kOwnFiles];
 unsigned ownFilesMade = 0;
 
 void RememberOwn(int descriptor) {
-    OwnFile made = {::getpid(), {}};
+    OwnFile made = {systemCalls.getpid(), {}};
     if (systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_INO, &made.file) != 0) return;
     MutexHolder holder(ownFilesMutex);
     ownFiles[ownFilesMade++ % kOwnFiles] = made;
@@ -203,7 +203,7 @@ void RememberOwn(int descriptor) {
 bool IsOwn(const struct statx& status) {
     MutexHolder holder(ownFilesMutex);
     for (const OwnFile& each : ownFiles) {
-        if (each.process == ::getpid() && SameFile(each.file, status)) return true;
+        if (each.process == systemCalls.getpid() && SameFile(each.file, status)) return true;
     }
     return false;
 }
@@ -231,7 +231,7 @@ public:
     bool Remove(const char* native) {
         struct statx status;
         if (!StatusOf(native, Links::kThemselves, STATX_BASIC_STATS, status)) return errno == ENOENT || FailErrno();
-        if (S_ISDIR(status.stx_mode) || status.stx_uid != ::geteuid()) return FailWith(kErrorAccessDenied);
+        if (S_ISDIR(status.stx_mode) || status.stx_uid != systemCalls.geteuid()) return FailWith(kErrorAccessDenied);
         if (S_ISREG(status.stx_mode) && !Hold(native)) return false;
         return systemCalls.unlink(native) == 0 || errno == ENOENT || FailErrno();
     }

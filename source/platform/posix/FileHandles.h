@@ -35,6 +35,10 @@ constexpr char kCreatedAttribute[] = "user.tessel.created";
 
 constexpr unsigned kInfoMask = STATX_BASIC_STATS | STATX_BTIME;
 
+// What a version is made of.
+constexpr unsigned kVersionMask = STATX_INO | STATX_SIZE | STATX_MTIME;
+FileVersion VersionOfStatus(const struct statx& status);
+
 // Every open file holds locks on some of four bytes, which lie far beyond any data and are never written. The locks
 // belong to the open file description: they are seen between processes and between two opens of one process, and go
 // when the file is closed. All holders lock for reading, so that any number of them can hold the same mark.

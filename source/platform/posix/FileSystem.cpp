@@ -5,7 +5,9 @@
 #include "platform/posix/Folders.h"
 #include "platform/posix/Interrupted.h"
 #include "platform/posix/NativeNames.h"
+#include "platform/posix/TextFile.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -68,6 +70,28 @@ bool FileGetInfo(FileHandle file, ItemInfo& info) {
     FillInfo(status, info);
     unsigned char bytes[8];
     TakeCreated(bytes, systemCalls.fgetxattr(descriptor, kCreatedAttribute, bytes, sizeof bytes), info);
+    return true;
+}
+
+FileVersion VersionOfStatus(const struct statx& status) {
+    const std::uint64_t device = std::uint64_t{status.stx_dev_major} << 32 | status.stx_dev_minor;
+    return {device, status.stx_ino, static_cast<std::int64_t>(status.stx_size), status.stx_mtime.tv_sec,
+            status.stx_mtime.tv_nsec};
+}
+
+bool ItemGetVersion(const char* name, FileVersion& version) {
+    return OnExistingItem(name, [&](const std::string& native) {
+        struct statx status;
+        if (!StatusOf(native, Links::kFollowed, kVersionMask, status)) return false;
+        version = VersionOfStatus(status);
+        return true;
+    });
+}
+
+bool FileGetVersion(FileHandle file, FileVersion& version) {
+    struct statx status;
+    if (systemCalls.statx(DescriptorOf(file), "", AT_EMPTY_PATH, kVersionMask, &status) != 0) return FailErrno();
+    version = VersionOfStatus(status);
     return true;
 }
 
@@ -243,15 +267,14 @@ bool ItemSetReadOnly(const char* name, bool readOnly) {
 }
 
 std::uint32_t PermissionMask() {
-    std::unique_ptr<FILE, int (*)(FILE*)> status(std::fopen("/proc/self/status", "re"), std::fclose);
-    char line[256];
+    std::string status;
+    ReadTextFile("/proc/self/status", status);
+    const std::size_t line = std::min(status.find("Umask:"), status.size());
     unsigned mask = 0;
-    while (status && std::fgets(line, sizeof line, status.get())) {
-        if (std::sscanf(line, "Umask: %o", &mask) == 1) return mask;
-    }
+    if (std::sscanf(status.c_str() + line, "Umask: %o", &mask) == 1) return mask;
     // Without /proc it can only be read by setting it.
-    mask = ::umask(0);
-    ::umask(static_cast<mode_t>(mask));
+    mask = systemCalls.umask(0);
+    systemCalls.umask(static_cast<mode_t>(mask));
     return mask;
 }
 

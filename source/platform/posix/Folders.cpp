@@ -21,7 +21,8 @@ std::string AccountHome() {
     passwd account{};
     passwd* found = nullptr;
     char buffer[2048];
-    bool known = getpwuid_r(::getuid(), &account, buffer, sizeof buffer, &found) == 0 && found && *found->pw_dir == '/';
+    bool known = getpwuid_r(systemCalls.getuid(), &account, buffer, sizeof buffer, &found) == 0 && found &&
+                 *found->pw_dir == '/';
     return known ? found->pw_dir : "/";
 }
 

@@ -92,15 +92,6 @@ bool ModuleFileName(ModuleHandle module, std::string& name) {
     return file.empty() ? FailWith(kErrorModuleNotFound) : NativeToName(file, name);
 }
 
-std::vector<ModuleEntry> ModuleList(std::size_t most) {
-    std::vector<ModuleEntry> modules;
-    ForEachModule([&](ModuleHandle base, const char* moduleName) {
-        if (modules.size() < most) modules.push_back({NameFromDisk(NativeLast(FileOf(moduleName))), base});
-        return modules.size() < most;
-    });
-    return modules;
-}
-
 bool DescribeAddress(const void* address, AddressEntry& entry) {
     Dl_info info{};
     entry = {};

@@ -70,7 +70,9 @@ bool EqualNames(std::string_view a, std::string_view b) noexcept {
 
 // ---- matching on the disk -------------------------------------------------------------------------------------------
 
-bool FindInFolder(const std::string& folder, std::string_view name, std::string& found) {
+// The entry of `folder` that is `name`, exactly or in another case. The first in byte order where several are, so that
+// the answer does not hang on the order of the listing.
+static bool FindInFolder(const std::string& folder, std::string_view name, std::string& found) {
     found.clear();
     return VisitFolder(folder, [&](DIR*, const dirent& entry) {
         const bool exact = name == entry.d_name;

@@ -27,11 +27,6 @@ bool NameToAbsoluteText(std::string_view name, std::string& native);
 // The item that `name` names, spelled as on the disk and absolute. False with LastError when it is missing.
 bool NameToAbsoluteNative(const char* name, std::string& native);
 
-// The entry of `folder` that is `name`, exactly or in another case; empty when there is none. The first in byte order
-// where several are, so that the answer does not hang on the order of the listing. False with errno when the folder
-// cannot be listed.
-bool FindInFolder(const std::string& folder, std::string_view name, std::string& found);
-
 // Equal but for case, of two names in UTF-8.
 bool EqualNames(std::string_view a, std::string_view b) noexcept;
 

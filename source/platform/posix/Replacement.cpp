@@ -54,13 +54,25 @@ bool IsTakenOver(const std::string& attribute) {
     return attribute.rfind("user.", 0) == 0 || attribute == kAccessList || attribute == "security.selinux";
 }
 
+// What `ask(buffer, size)` gives, of a size that others may change between two calls. False when it fails.
+template <typename Ask>
+bool AskWhole(Ask ask, std::vector<char>& answer) {
+    for (;;) {
+        const ssize_t size = ask(nullptr, 0);
+        if (size < 0) return false;
+        answer.resize(static_cast<std::size_t>(size) + 1);
+        const ssize_t got = ask(answer.data(), answer.size());
+        if (got < 0 && errno == ERANGE) continue;
+        if (got >= 0) answer.resize(static_cast<std::size_t>(got));
+        return got >= 0;
+    }
+}
+
 bool CopyAttribute(int from, int to, const char* name) {
-    const ssize_t size = systemCalls.fgetxattr(from, name, nullptr, 0);
-    if (size < 0) return errno == ENODATA;
-    std::vector<char> value(static_cast<std::size_t>(size) + 1);
-    const ssize_t got = systemCalls.fgetxattr(from, name, value.data(), value.size());
-    if (got < 0) return false;
-    return systemCalls.fsetxattr(to, name, value.data(), static_cast<std::size_t>(got), 0) == 0;
+    std::vector<char> value;
+    const auto ask = [&](char* bytes, std::size_t size) { return systemCalls.fgetxattr(from, name, bytes, size); };
+    if (!AskWhole(ask, value)) return errno == ENODATA;
+    return systemCalls.fsetxattr(to, name, value.data(), value.size(), 0) == 0;
 }
 
 bool HasNoAttributes(int error) {
@@ -70,12 +82,12 @@ bool HasNoAttributes(int error) {
 bool CopyAttributes(int from, int to) {
     // What a folder gives its new files is not the old file's.
     systemCalls.fremovexattr(to, kAccessList);
-    const ssize_t size = systemCalls.flistxattr(from, nullptr, 0);
-    if (size <= 0) return size == 0 || HasNoAttributes(errno);
-    std::vector<char> names(static_cast<std::size_t>(size) + 1);
-    const ssize_t got = systemCalls.flistxattr(from, names.data(), static_cast<std::size_t>(size));
-    if (got < 0) return false;
-    for (const char* name = names.data(); name < names.data() + got; name += std::strlen(name) + 1) {
+    std::vector<char> names;
+    const auto ask = [&](char* bytes, std::size_t size) { return systemCalls.flistxattr(from, bytes, size); };
+    if (!AskWhole(ask, names)) return HasNoAttributes(errno);
+    names.push_back(0);
+    const char* const end = &names.back();
+    for (const char* name = names.data(); name < end; name += std::strlen(name) + 1) {
         const bool user = std::strncmp(name, "security.", 9) != 0;
         if (IsTakenOver(name) && !CopyAttribute(from, to, name) && user) return false;
     }
@@ -235,7 +247,7 @@ std::string Replacement::Work::NumberedName(int number) const {
 bool Replacement::Work::IsLeftover(int descriptor) const {
     struct statx status;
     if (!StatusOfOpen(descriptor, STATX_BASIC_STATS, status)) return false;
-    const bool own = status.stx_uid == ::geteuid() || (target >= 0 && status.stx_uid == targetStatus.stx_uid);
+    const bool own = status.stx_uid == systemCalls.geteuid() || (target >= 0 && status.stx_uid == targetStatus.stx_uid);
     if (!S_ISREG(status.stx_mode) || status.stx_nlink != 1 || !own) return false;
     if (request.pattern && systemCalls.fgetxattr(descriptor, kTemporaryAttribute, nullptr, 0) < 0) return false;
     return MarkBytes(descriptor, F_RDLCK, kWriterMark, 1) == Marking::kDone &&

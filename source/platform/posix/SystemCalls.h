@@ -1,5 +1,7 @@
 // The calls that this backend makes of the kernel, by name, in one table that tests replace parts of: a short write, an
-// interruption, a full disk, a clock moved by hand.
+// interruption, a full disk, a clock moved by hand. No other file of the backend makes one, but for those that do not
+// come back. What the C library asks of the kernel for its own functions (threads, memory, locales, accounts, realpath,
+// loading) is its own affair.
 #ifndef TESSEL_PLATFORM_POSIX_SYSTEMCALLS_H
 #define TESSEL_PLATFORM_POSIX_SYSTEMCALLS_H
 
@@ -7,6 +9,9 @@
 #include <cstdint>
 #include <dirent.h>
 #include <fcntl.h>
+#include <sched.h>
+#include <signal.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/statfs.h>
 #include <sys/types.h>
@@ -16,8 +21,8 @@
 
 namespace tessel::platform {
 
-// X(result, name, parameters): all return -1 (opendir, fdopendir, readdir and getcwd: null) and set errno on
-// failure.
+// X(result, name, parameters): all return -1 (opendir, fdopendir, readdir and getcwd: null) and set errno on failure.
+// Asking who one is, and umask, cannot fail.
 #define TESSEL_SYSTEM_CALLS(X)                                                                                     \
     X(int, open, (const char* name, int flags, mode_t mode))                                                       \
     X(int, openat, (int folder, const char* name, int flags, mode_t mode))                                         \
@@ -58,6 +63,22 @@ namespace tessel::platform {
     X(int, closedir, (DIR * listing))                                                                              \
     X(char*, getcwd, (char* buffer, std::size_t size))                                                             \
     X(ssize_t, readlink, (const char* name, char* buffer, std::size_t size))                                       \
+    X(pid_t, getpid, ())                                                                                           \
+    X(pid_t, gettid, ())                                                                                           \
+    X(uid_t, getuid, ())                                                                                           \
+    X(uid_t, geteuid, ())                                                                                          \
+    X(mode_t, umask, (mode_t mask))                                                                                \
+    X(int, raise, (int signal))                                                                                    \
+    X(int, tgkill, (pid_t process, pid_t thread, int signal))                                                      \
+    X(int, sigaction, (int signal, const struct sigaction* action, struct sigaction* before))                      \
+    X(int, sigprocmask, (int how, const sigset_t* set, sigset_t* before))                                          \
+    X(int, getpriority, (int which, id_t who))                                                                     \
+    X(int, setpriority, (int which, id_t who, int priority))                                                       \
+    X(int, sched_yield, ())                                                                                        \
+    X(int, sched_getaffinity, (pid_t thread, std::size_t size, cpu_set_t * set))                                   \
+    X(int, prctl, (int option, unsigned long value))                                                               \
+    X(int, getrusage, (int who, struct rusage* usage))                                                             \
+    X(long, sysconf, (int name))                                                                                   \
     X(int, uname, (struct utsname * host))                                                                         \
     X(int, chdir, (const char* name))                                                                              \
     X(int, statfs, (const char* name, struct statfs* result))                                                      \

@@ -47,7 +47,7 @@ std::string TopFolder(const std::string& native, const struct statx& item) {
 bool MakeOwnFolder(const std::string& native) {
     struct statx status;
     if (!MakeFolders(native, 0700) || !GetStatus(native, status)) return false;
-    if (S_ISDIR(status.stx_mode) && status.stx_uid == ::geteuid()) return true;
+    if (S_ISDIR(status.stx_mode) && status.stx_uid == systemCalls.geteuid()) return true;
     errno = EACCES;
     return false;
 }
@@ -71,7 +71,7 @@ bool FindTrash(const std::string& native, const struct statx& item, Trash& trash
     if (!home && !MayBeElsewhere(errno)) return false;
     trash.top = TopFolder(native, item);
     const std::string prefix = trash.top == "/" ? "/" : trash.top + "/";
-    const std::string user = std::to_string(::getuid());
+    const std::string user = std::to_string(systemCalls.getuid());
     const bool shared = GetStatus(prefix + ".Trash", status) && S_ISDIR(status.stx_mode) && (status.stx_mode & S_ISVTX);
     trash.folder = prefix + ".Trash/" + user;
     if (shared && MakeTrash(trash.folder)) return true;
