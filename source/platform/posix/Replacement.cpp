@@ -141,6 +141,7 @@ struct Replacement::Work {
     std::string NumberedName(int number) const;
     bool IsLeftover(int descriptor) const;
     bool RemoveLeftover(const std::string& name) const;
+    void RemoveLeftovers() const;
     bool MakeFile();
     bool MakeNamed();
     bool HoldNamed(const std::string& name);
@@ -210,6 +211,7 @@ bool Replacement::Work::LeadsTo(const std::string& name, const struct statx& wan
 }
 
 bool Replacement::Work::FindTarget() {
+    RemoveLeftovers();
     if (request.mustNotExist) return true;
     if (request.opened != kNoFile) {
         target = DescriptorOf(request.opened);
@@ -242,13 +244,13 @@ std::string Replacement::Work::NumberedName(int number) const {
     return name;
 }
 
-// Of this user's (or the old file's owner's, for one who may write as he), with one name, ours by name or mark, and
-// nobody holds it. Without locks nobody's death is proven.
+// Of this user's, ours by name or mark, and nobody holds it. Without locks nobody's death is proven. It may have the
+// name already that it was made for.
 bool Replacement::Work::IsLeftover(int descriptor) const {
     struct statx status;
     if (!StatusOfOpen(descriptor, STATX_BASIC_STATS, status)) return false;
-    const bool own = status.stx_uid == systemCalls.geteuid() || (target >= 0 && status.stx_uid == targetStatus.stx_uid);
-    if (!S_ISREG(status.stx_mode) || status.stx_nlink != 1 || !own) return false;
+    const uid_t user = systemCalls.geteuid();
+    if (!S_ISREG(status.stx_mode) || (user != 0 && status.stx_uid != user)) return false;
     if (request.pattern && systemCalls.fgetxattr(descriptor, kTemporaryAttribute, nullptr, 0) < 0) return false;
     return MarkBytes(descriptor, F_RDLCK, kWriterMark, 1) == Marking::kDone &&
            TestBytes(descriptor, kWriterMark, 1) == Marking::kDone;
@@ -274,10 +276,13 @@ void Replacement::Work::SetMark(int descriptor, bool on) const {
         systemCalls.fremovexattr(descriptor, kTemporaryAttribute);
 }
 
+void Replacement::Work::RemoveLeftovers() const {
+    for (int number = 0; number < kSwept && number < request.limit; ++number) RemoveLeftover(NumberedName(number));
+}
+
 // ---- the new file ---------------------------------------------------------------------------------------------------
 
 bool Replacement::Work::MakeFile() {
-    for (int number = 0; number < kSwept && number < request.limit; ++number) RemoveLeftover(NumberedName(number));
     // Without a name nobody else reaches it, so that one like any new file may have their mode at once.
     const bool plain = target < 0 && request.like == kNoFile && request.mode < 0;
     mode = request.mode;
