@@ -1,6 +1,5 @@
+#include "support/Test.h"
 #include <tessel/base/MGAppInterface.h>
-
-#include <gtest/gtest.h>
 
 namespace {
 
@@ -20,17 +19,15 @@ private:
 };
 
 void ExpectAnswers(MGAppInterfacePtr app, uint32 base) {
-    EXPECT_EQ(base + 3, MGGetAppAPIVersion(app));
-    EXPECT_EQ(base + 4, MGGetAppEditorVersion(app));
-    EXPECT_EQ(static_cast<int32>(base) + 11, MGGetIsTopLevel(app));
-    EXPECT_EQ(static_cast<int32>(base) + 12, MGGetIsBoundApp(app));
-    EXPECT_EQ(static_cast<int32>(base) + 13, MGGetIsRunTime(app));
-    EXPECT_EQ(static_cast<int32>(base) + 14, MGGetIsFullFeatureRunTime(app));
+    EXPECT_EACH(base + 3 == MGGetAppAPIVersion(app), base + 4 == MGGetAppEditorVersion(app),
+                static_cast<int32>(base) + 11 == MGGetIsTopLevel(app),
+                static_cast<int32>(base) + 12 == MGGetIsBoundApp(app),
+                static_cast<int32>(base) + 13 == MGGetIsRunTime(app),
+                static_cast<int32>(base) + 14 == MGGetIsFullFeatureRunTime(app));
 }
 
 TEST(MGAppInterface, TheGivenObjectElseTheInstalledOneElseZero) {
-    EXPECT_EQ(nullptr, MGApp());
-    EXPECT_EQ(0, MGGetIsRunTime(nullptr));
+    EXPECT_EACH(MGApp() == nullptr, MGGetIsRunTime(nullptr) == 0);
     NumberedApp installed(100), given(200);
     ExpectAnswers(&given, 200);
     MGAppInterfaceSet(&installed);

@@ -1,8 +1,7 @@
+#include "support/Test.h"
 #include <tessel/base/MGPlacementNew.h>
 
-#include <gtest/gtest.h>
 #include <new>
-#include <string>
 
 namespace tessel {
 namespace {

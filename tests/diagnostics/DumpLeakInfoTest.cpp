@@ -1,13 +1,10 @@
-#include "support/ReportRecorder.h"
 #include "support/ScratchDrive.h"
+#include "support/Test.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/DumpLeakInfo.h>
 #include <tessel/diagnostics/FileLoc.h>
 
-#include <cstring>
 #include <filesystem>
-#include <gtest/gtest.h>
-#include <memory>
 #include <stdlib.h>
 #include <sys/mman.h>
 
@@ -15,7 +12,7 @@ namespace tessel {
 namespace {
 
 using test::ReportRecorder;
-using Texts = std::vector<std::string>;
+using test::Texts;
 
 // The temporary folder is on the scratch drive.
 class DumpLeakInfoTest : public testing::Test {
@@ -35,9 +32,7 @@ protected:
 TEST_F(DumpLeakInfoTest, AsManyAsExpectedIsOnlyATotal) {
     tracker->AddRecord(this, 1, "f.cpp", 1);
     DumpLeakInfo(tracker, 1, "Thing Leaks", "leaks.txt");
-    EXPECT_EQ(Texts{"Total Thing Leaks = 1.\n"}, recorder.Texts(kDebugInfo));
-    EXPECT_EQ(1u, recorder.Count());
-    EXPECT_FALSE(FileExists());
+    EXPECT_EACH(recorder.Texts(kDebugInfo) == Texts{"Total Thing Leaks = 1.\n"}, recorder.Count() == 1u, !FileExists());
     DumpLeakInfo(nullptr, 1, "Thing Leaks", "leaks.txt");
     EXPECT_EQ(1u, recorder.Count());
 }
@@ -57,14 +52,14 @@ TEST_F(DumpLeakInfoTest, MoreThanExpectedAreWrittenToTheFile) {
               recorder.Texts(kDebugError));
     const auto status = std::filesystem::symlink_status(drive.Native("leaks.txt"));
     EXPECT_EQ(std::filesystem::file_type::regular, status.type()) << "the link is gone, and not followed";
-    EXPECT_EQ(std::filesystem::perms(0600), status.permissions());
-    EXPECT_EQ("what was there before", drive.Get("target.txt"));
+    EXPECT_EACH(std::filesystem::perms(0600) == status.permissions(),
+                drive.Get("target.txt") == "what was there before");
     const std::string text = drive.Get("leaks.txt");
-    EXPECT_EQ(0u, text.find("****************************************\n** List of currently allocated Thing Leaks"));
-    EXPECT_NE(std::string::npos, text.find("File maker.cpp      ; Line 77    # "));
+    EXPECT_EACH(text.find("****************************************\n** List of currently allocated Thing Leaks") == 0u,
+                std::string::npos != text.find("File maker.cpp      ; Line 77    # "));
     EXPECT_NE(std::string::npos, text.find("\nMemory Contents: A.text...\n")) << text;
-    EXPECT_NE(std::string::npos, text.find("\nMemory Contents: " + std::string(254, 'b') + "\n"));
-    EXPECT_NE(std::string::npos, text.find("\nNumber of unfreed items: 2\n\n2 Thing Leaks\n"));
+    EXPECT_EACH(std::string::npos != text.find("\nMemory Contents: " + std::string(254, 'b') + "\n"),
+                std::string::npos != text.find("\nNumber of unfreed items: 2\n\n2 Thing Leaks\n"));
 }
 
 TEST_F(DumpLeakInfoTest, ManyRecordsAreWrittenWhole) {
@@ -76,8 +71,7 @@ TEST_F(DumpLeakInfoTest, ManyRecordsAreWrittenWhole) {
     for (size_t at = text.find("\nMemory Contents: .\n"); at != std::string::npos;
          at = text.find("\nMemory Contents: .\n", at + 1))
         ++count;
-    EXPECT_EQ(2000u, count);
-    EXPECT_TRUE(text.ends_with("\n2000 Thing Leaks\n"));
+    EXPECT_EACH(count == 2000u, text.ends_with("\n2000 Thing Leaks\n"));
 }
 
 TEST_F(DumpLeakInfoTest, AnObjectThatCannotBeReadIsEmpty) {
@@ -117,28 +111,23 @@ std::string PathText(int32 code, const std::string& name, bool addTxt) {
 }
 
 TEST(FileLoc, PlacesTheNameByItsCode) {
-    EXPECT_EQ("C:\\dir\\f", PathText(1, "C:\\dir\\f", false));
-    EXPECT_EQ("C:\\dir\\f.txt", PathText(-1, "C:\\dir\\f", true));
+    EXPECT_EACH(PathText(1, "C:\\dir\\f", false) == "C:\\dir\\f", PathText(-1, "C:\\dir\\f", true) == "C:\\dir\\f.txt");
     setenv("TMPDIR", "/some/where", 1);
     for (int32 code : {0, 2, 4}) EXPECT_EQ("C:\\some\\where\\f", PathText(code, "f", false));
     unsetenv("TMPDIR");
     const std::unique_ptr<FileLoc> location(CreateFileLoc(1, "name", false));
     const std::unique_ptr<FileLoc> clone(location->Clone());
-    EXPECT_NE(location->PathText(), clone->PathText());
-    EXPECT_STREQ("name", clone->PathText());
+    EXPECT_EACH(location->PathText() != clone->PathText(), clone->PathText() == "name");
 }
 
 TEST(FileLoc, RefusesWhatDoesNotFit) {
     const std::string n511(511, 'n'), n512(512, 'n'), n516(516, 'n'), n517(517, 'n');
-    EXPECT_EQ("1 inFilename is NULL", Failure(4, nullptr, false));
-    EXPECT_EQ(n516, PathText(1, n516, false));
-    EXPECT_EQ("7 Path too long", Failure(1, n517.c_str(), false));
-    EXPECT_EQ(n511 + ".txt", PathText(1, n511, true));
-    EXPECT_EQ("7 Path too long", Failure(1, n512.c_str(), true));
+    EXPECT_EACH(Failure(4, nullptr, false) == "1 inFilename is NULL", n516 == PathText(1, n516, false),
+                Failure(1, n517.c_str(), false) == "7 Path too long", n511 + ".txt" == PathText(1, n511, true),
+                Failure(1, n512.c_str(), true) == "7 Path too long");
     setenv("TMPDIR", "/t", 1);  // "C:\t\" is five bytes
-    EXPECT_EQ("C:\\t\\" + n511, PathText(4, n511, false));
-    EXPECT_EQ("7 Path too long", Failure(4, n512.c_str(), false));
-    EXPECT_EQ("7 Path too long", Failure(4, n511.c_str(), true));
+    EXPECT_EACH("C:\\t\\" + n511 == PathText(4, n511, false), Failure(4, n512.c_str(), false) == "7 Path too long",
+                Failure(4, n511.c_str(), true) == "7 Path too long");
     unsetenv("TMPDIR");
 }
 

@@ -6,21 +6,21 @@
 #include "platform/posix/SystemCalls.h"
 #include "support/FailingAllocator.h"
 #include "support/HandClock.h"
+#include "support/Test.h"
 
 #include <array>
 #include <chrono>
 #include <mutex>
 #include <optional>
-#include <random>
 #include <signal.h>
 #include <sys/time.h>
 
 namespace tessel::test {
 namespace {
 
+using tessel::test::Texts;
 using testing::ElementsAre;
 using testing::IsEmpty;
-using Texts = std::vector<std::string>;
 
 class OccurrenceTest : public EventsTest {
 protected:
@@ -40,9 +40,7 @@ protected:
 TEST_F(OccurrenceTest, RefusesWhatIsNoRefnum) {
     const Occurrence gone = AllocOccur();
     const OccurHdlr handler = AllocOccurHdlr(0, Log::Note, Name("h")), freed = AllocOccurHdlr(gone, Log::Note, nullptr);
-    EXPECT_TRUE(ValidOccurrence(gone));
-    EXPECT_EQ(kNoErr, DeallocOccur(gone));
-    EXPECT_EQ(kNoErr, DeallocOccurHdlr(freed));
+    EXPECT_EACH(ValidOccurrence(gone), DeallocOccur(gone) == kNoErr, DeallocOccurHdlr(freed) == kNoErr);
     for (uint32 bad : {Occurrence{0}, gone, handler ^ 0x00100000u}) {
         EXPECT_FALSE(ValidOccurrence(bad));
         for (auto* operation : {DeallocOccur, Occur, CancelOccurAtTime}) EXPECT_EQ(1, operation(bad));
@@ -51,15 +49,11 @@ TEST_F(OccurrenceTest, RefusesWhatIsNoRefnum) {
     }
     for (OccurHdlr bad : {OccurHdlr{0}, freed}) {
         for (auto* operation : {DeallocOccurHdlr, CancelOnOccur, FireOccurHdlr}) EXPECT_EQ(1, operation(bad));
-        EXPECT_EQ(1, OnOccurrence(bad, false));
-        EXPECT_EQ(1, OnOccurrenceWithTimeout(bad, false, 5));
-        EXPECT_EQ(1, BindOccurHdlr(bad, gone, Log::Note, nullptr));
-        EXPECT_FALSE(HandlerTimedOut(bad));
+        EXPECT_EACH(OnOccurrence(bad, false) == 1, OnOccurrenceWithTimeout(bad, false, 5) == 1,
+                    BindOccurHdlr(bad, gone, Log::Note, nullptr) == 1, !HandlerTimedOut(bad));
     }
-    EXPECT_EQ(69, OnOccurrence(handler, false));
-    EXPECT_TRUE(HandlerTimedOut(handler));
-    EXPECT_EQ(1, CancelOnOccur(handler));
-    EXPECT_EQ(kNoErr, DeallocOccurHdlr(handler));
+    EXPECT_EACH(OnOccurrence(handler, false) == 69, HandlerTimedOut(handler), CancelOnOccur(handler) == 1,
+                DeallocOccurHdlr(handler) == kNoErr);
     EXPECT_THAT(Log::Take(), ElementsAre("h"));
 }
 
@@ -95,8 +89,7 @@ TEST_F(OccurrenceTest, ReportsNullCallbacksAndDamagedLists) {
                             "bogus handler list in BindOccurHdlr()"));
     EXPECT_THAT(Log::Take(), ElementsAre("h"));  // each insertion went ahead
     record.fired = 1;
-    EXPECT_EQ(kNoErr, CancelOnOccur(h));
-    EXPECT_TRUE(reports.Has(kDebugInfo, "Handler marked as FIRED not on fired list!!"));
+    EXPECT_EACH(CancelOnOccur(h) == kNoErr, reports.Has(kDebugInfo, "Handler marked as FIRED not on fired list!!"));
 
     TimeList::Entry nobodys(12345);
     {
@@ -122,11 +115,9 @@ TEST_F(OccurrenceTest, ThreadsCheckTheirGroup) {
     const Occurrence o = AllocOccur();
     const OccurHdlr h = AllocOccurHdlr(o, Log::Note, Name("joined"));
     for (int32 bad : {-1, 2048}) {
-        EXPECT_EQ(1, SetOccThreadGroup(bad, 0));
-        EXPECT_EQ(1, SetOccThreadGroup(0, bad));
-        EXPECT_EQ(1, SetOccThreadGroupProc(bad, tell, &one));
-        EXPECT_EQ(kNoErr, ChkThGroupOccurrences(bad));
-        EXPECT_FALSE(QuickCheckGroupHandlersFired(bad));
+        EXPECT_EACH(SetOccThreadGroup(bad, 0) == 1, SetOccThreadGroup(0, bad) == 1,
+                    SetOccThreadGroupProc(bad, tell, &one) == 1, ChkThGroupOccurrences(bad) == kNoErr,
+                    !QuickCheckGroupHandlersFired(bad));
     }
     EXPECT_EQ(kNoErr, SetOccThreadGroupProc(0, tell, &one));
     int32 index = 0;
@@ -138,14 +129,12 @@ TEST_F(OccurrenceTest, ThreadsCheckTheirGroup) {
                 index = self->index;
                 EXPECT_EQ(kNoErr, SetOccThreadGroup(index, 0));
             }
-            EXPECT_EQ(index, self->index);
-            EXPECT_EQ(kNoErr, SetOccThreadGroupProc(index, tell, joins ? &one : &hundred));
+            EXPECT_EACH(index == self->index, SetOccThreadGroupProc(index, tell, joins ? &one : &hundred) == kNoErr);
             OnOccurrence(h, true);
             ThThreadDestroy(self);
         }).join();
         Occur(o);
-        EXPECT_EQ(joins, QuickCheckGroupHandlersFired(0));
-        EXPECT_EQ(!joins, QuickCheckGroupHandlersFired(index));
+        EXPECT_EACH(joins == QuickCheckGroupHandlersFired(0), !joins == QuickCheckGroupHandlersFired(index));
         ChkOccurrences();
         EXPECT_EQ(joins ? Texts{"joined"} : Texts{}, Log::Take());
     }
@@ -287,10 +276,8 @@ TEST_F(OccurrenceTest, StartsAsNewAfterEveryStop) {
     DeallocOccur(again);
 
     OccurrenceManagerService()->Uninit();
-    EXPECT_EQ(0u, AllocOccur() | AllocOccurHdlr(0, never, nullptr));
-    EXPECT_EQ(kNoErr, InterruptSafeOccur(again));
-    EXPECT_EQ(kNoErr, ChkOccurrences());
-    EXPECT_EQ(nullptr, GetOccurrenceManagerAsyncArea());
+    EXPECT_EACH((AllocOccur() | AllocOccurHdlr(0, never, nullptr)) == 0u, InterruptSafeOccur(again) == kNoErr,
+                ChkOccurrences() == kNoErr, GetOccurrenceManagerAsyncArea() == nullptr);
     OccurrenceManagerService()->Init();
 }
 
@@ -317,8 +304,7 @@ TEST_F(OccurrenceTest, SurvivesEveryAllocationThatFails) {
         failed = failing.HasFailed();
         EXPECT_EQ(before, heap::TotalAllocated()) << n;
     }
-    EXPECT_GT(refused, 8);
-    EXPECT_EQ(0u, reports.CountAt(kDebugWarning));
+    EXPECT_EACH(refused > 8, reports.CountAt(kDebugWarning) == 0u);
     OccurrenceManagerService()->Init();
 }
 
@@ -357,8 +343,7 @@ TEST_F(OccurrenceTest, TheAreaTakesAsManyAsItHasSlots) {
     for (Noted& each : noted) each.Alloc();
     SetResetCountDownRegCallbackProc([] { ++warnings; });
     for (int i = 0; i < 1023; ++i) EXPECT_EQ(kNoErr, (++noted[i].posted, InterruptSafeOccur(noted[i].occurrence)));
-    EXPECT_EQ(10, warnings);
-    EXPECT_EQ(70, InterruptSafeOccur(noted[1023].occurrence));
+    EXPECT_EACH(warnings == 10, InterruptSafeOccur(noted[1023].occurrence) == 70);
     for (int i : {0, 500, 1022}) EXPECT_EQ(kNoErr, InterruptSafeOccur(noted[i].occurrence));
     EXPECT_EQ(11, warnings);
     SetResetCountDownRegCallbackProc(nullptr);

@@ -2,13 +2,11 @@
 // allocations.
 #include "memory/Heap.h"
 #include "support/FailingAllocator.h"
+#include "support/Test.h"
 #include <tessel/diagnostics/DebugOutput.h>
 #include <tessel/frame/TesselInit.h>
 #include <tessel/memory/MemoryManager.h>
 
-#include <atomic>
-#include <cstdlib>
-#include <gtest/gtest.h>
 #include <new>
 
 namespace {

@@ -1,14 +1,12 @@
 #include "frame/CoreServices.h"
-#include "support/ReportRecorder.h"
 #include "support/StartedLibrary.h"
+#include "support/Test.h"
 #include <tessel/frame/TesselInit.h>
 #include <tessel/memory/MemoryManager.h>
 
-#include <algorithm>
 #include <array>
 #include <filesystem>
 #include <fstream>
-#include <gtest/gtest.h>
 #include <map>
 #include <sstream>
 #include <stdlib.h>
@@ -17,7 +15,7 @@ namespace tessel {
 namespace {
 
 using test::ReportRecorder;
-using Texts = std::vector<std::string>;
+using test::Texts;
 
 std::string ReadFile(const std::filesystem::path& path) {
     std::ostringstream text;
@@ -48,15 +46,13 @@ TEST_F(TesselInitTest, StartsAndStopsCleanlyAgainAndAgain) {
         recorder.Clear();
         {
             test::StartedLibrary library;
-            EXPECT_EQ(kGenericErr, InitTesselBase());
-            EXPECT_EQ(kNoErr, InitTesselAppSupport());
+            EXPECT_EACH(InitTesselBase() == kGenericErr, InitTesselAppSupport() == kNoErr);
             UHandle handle = DSNewHandle(64);
             ASSERT_NE(nullptr, handle);
             EXPECT_EQ(kNoErr, DSDisposeHandle(handle));
         }
-        EXPECT_EQ(Texts{}, recorder.Texts(kDebugWarning));
-        EXPECT_EQ(Texts{}, recorder.Texts(kDebugError));
-        EXPECT_EQ(Texts{}, recorder.Texts(kDebugFatal));
+        EXPECT_EACH(recorder.Texts(kDebugWarning) == Texts{}, recorder.Texts(kDebugError) == Texts{},
+                    recorder.Texts(kDebugFatal) == Texts{});
         // Each tracker is summed up when its service stops, in the reverse order of the start.
         Texts totals = recorder.Texts(kDebugInfo);
         std::erase_if(totals, [](const std::string& text) { return !text.starts_with("Total "); });
@@ -68,17 +64,13 @@ TEST_F(TesselInitTest, StartsAndStopsCleanlyAgainAndAgain) {
 }
 
 TEST_F(TesselInitTest, OutOfTurnNothingHappens) {
-    EXPECT_EQ(kNoErr, InitTesselAppSupport());
-    EXPECT_EQ(kNoErr, UninitTesselAppSupport());
-    EXPECT_EQ(kNoErr, UninitTesselBase());
-    EXPECT_EQ(0u, recorder.Count());
+    EXPECT_EACH(InitTesselAppSupport() == kNoErr, UninitTesselAppSupport() == kNoErr, UninitTesselBase() == kNoErr,
+                recorder.Count() == 0u);
 }
 
 TEST_F(TesselInitTest, TheBaseStopsWhatStandsOnIt) {
     for (int round = 0; round < 2; ++round) {
-        EXPECT_EQ(kNoErr, InitTesselBase());
-        EXPECT_EQ(kNoErr, InitTesselAppSupport());
-        EXPECT_EQ(kNoErr, UninitTesselBase());
+        EXPECT_EACH(InitTesselBase() == kNoErr, InitTesselAppSupport() == kNoErr, UninitTesselBase() == kNoErr);
         EXPECT_EQ(kNoErr, UninitTesselAppSupport()) << "nothing is left to stop";
     }
     EXPECT_EQ(0u, recorder.CountAt(kDebugError));
@@ -122,11 +114,11 @@ TEST_F(TesselInitTest, AHandleLeftBehindIsReported) {
     EXPECT_TRUE(pointed);
     const std::string report = ReadFile(folder / "ovHandleLeaks.txt");
     EXPECT_NE(std::string::npos, report.find("** List of currently allocated Handle Leaks          **\n")) << report;
-    EXPECT_NE(std::string::npos, report.find("Master Pointer: 0x"));
-    EXPECT_NE(std::string::npos, report.find("Memory Contents: xxx." + std::string(250, 'x') + '\n'));
-    EXPECT_NE(std::string::npos, report.find(" - frame_tests "));
-    EXPECT_NE(std::string::npos, report.find("\nNumber of unfreed items: 1\n\n1 Handle Leaks\n"));
-    EXPECT_FALSE(HasLeakFile("ovPointerLeaks.txt"));
+    EXPECT_EACH(std::string::npos != report.find("Master Pointer: 0x"),
+                std::string::npos != report.find("Memory Contents: xxx." + std::string(250, 'x') + '\n'),
+                std::string::npos != report.find(" - frame_tests "),
+                std::string::npos != report.find("\nNumber of unfreed items: 1\n\n1 Handle Leaks\n"),
+                !HasLeakFile("ovPointerLeaks.txt"));
 }
 
 // The names and what each names as its dependencies, in the order it adds them.
@@ -155,8 +147,7 @@ TEST(CoreServices, NamesAndDependencies) {
     for (const auto& [accessor, text] : expected) {
         Names names;
         accessor()->GetDependencies(names);
-        EXPECT_EQ(text, accessor()->GetName() + std::string(":") + names.text);
-        EXPECT_EQ(accessor(), accessor());
+        EXPECT_EACH(text == accessor()->GetName() + std::string(":") + names.text, accessor() == accessor());
     }
 }
 
@@ -177,8 +168,7 @@ TEST(CoreServices, AHostsRegistryMayDependOnThem) {
     IServiceRegistry* const registry = CreateServiceRegistry(services);
     {
         test::StartedLibrary library;
-        EXPECT_EQ(kNoErr, registry->InitServices());
-        EXPECT_EQ(kNoErr, registry->UninitServices());
+        EXPECT_EACH(registry->InitServices() == kNoErr, registry->UninitServices() == kNoErr);
     }
     registry->Release();
     EXPECT_EQ(0u, recorder.CountAt(kDebugError) + recorder.CountAt(kDebugFatal));

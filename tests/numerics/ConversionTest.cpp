@@ -1,6 +1,6 @@
 // The table of types, conversions, rounding and constants.
 #include "numerics/Extended.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include <tessel/numerics/FloatingPointConstants.h>
 #include <tessel/numerics/NumericSupport.h>
 #include <tessel/numerics/RealMath.h>
@@ -8,12 +8,8 @@
 
 #include <cfenv>
 #include <cmath>
-#include <cstring>
-#include <gtest/gtest.h>
 #include <limits>
-#include <random>
 #include <tuple>
-#include <vector>
 
 namespace {
 
@@ -28,40 +24,24 @@ TEST(NumericSupport, SizesAndClasses) {
     const int32 sizes[] = {0, 1, 2, 4, 8, 1, 2, 4, 8, 4, 8, 10, 8, 16, 20, 0};
     const int32 classes[] = {64, 0, 0, 0, 0, 1, 1, 1, 1, 2, 2, 2, 3, 3, 3, 64};
     for (int16 code = 0; code < 16; ++code) {
-        EXPECT_EQ(NumSize(code), sizes[code]);
-        EXPECT_EQ(NumClass(static_cast<int16>(code + 16)), classes[code]);
+        EXPECT_EACH(NumSize(code) == sizes[code], NumClass(static_cast<int16>(code + 16)) == classes[code]);
     }
 }
 
 TEST(NumericSupport, ExtendedSizeIsSettable) {
     const cmplxExt packed = {FromExtended(1.5L), FromExtended(-2.5L)};
-    EXPECT_EQ(SetFxSize(12), 10);
-    EXPECT_EQ(NumSize(11), 12);
-    EXPECT_EQ(NumSize(14), 24);
+    EXPECT_EACH(SetFxSize(12) == 10, NumSize(11) == 12, NumSize(14) == 24);
     uint8 padded[24] = {};
     const cmplx128 z = {1.5, -2.5};
     ConvertNum(kNumComplexDouble, &z, kNumComplexExtended, padded);
-    EXPECT_EQ(std::memcmp(padded, &packed.re, 10), 0);
-    EXPECT_EQ(std::memcmp(padded + 12, &packed.im, 10), 0);
-    EXPECT_EQ(SetFxSize(128), 12);
-    EXPECT_EQ(NumSize(14), 256);
-    EXPECT_EQ(SetFxSize(10), 128);
+    EXPECT_EACH(std::memcmp(padded, &packed.re, 10) == 0, std::memcmp(padded + 12, &packed.im, 10) == 0,
+                SetFxSize(128) == 12, NumSize(14) == 256, SetFxSize(10) == 128);
 }
 
 TEST(NumericSupport, SmallHelpers) {
-    EXPECT_EQ(Min(-3, 2), -3);
-    EXPECT_EQ(Max(-3, 2), 2);
-    EXPECT_EQ(Abs(-7), 7);
-    EXPECT_EQ(Abs(INT32_MIN), INT32_MIN);
-    EXPECT_EQ(Mod(-7, 3), 2);
-    EXPECT_EQ(Mod(7, -3), 1);
-    EXPECT_EQ(Mod(-6, 3), 0);
-    EXPECT_EQ(Mod(INT32_MIN, -1), 0);
-    EXPECT_EQ(Mod(-1, INT32_MIN), INT32_MAX);
-    EXPECT_EQ(Pin(5, 10, 0), 10);
-    EXPECT_EQ(Pin(15, 0, 10), 10);
-    EXPECT_EQ(Pin(-15, 0, 10), 0);
-    EXPECT_EQ(Pin(5, 0, 10), 5);
+    EXPECT_EACH(Min(-3, 2) == -3, Max(-3, 2) == 2, Abs(-7) == 7, Abs(INT32_MIN) == INT32_MIN, Mod(-7, 3) == 2,
+                Mod(7, -3) == 1, Mod(-6, 3) == 0, Mod(INT32_MIN, -1) == 0, Mod(-1, INT32_MIN) == INT32_MAX,
+                Pin(5, 10, 0) == 10, Pin(15, 0, 10) == 10, Pin(-15, 0, 10) == 0, Pin(5, 0, 10) == 5);
 }
 
 TEST(RoundingUtil, ToAnIncrementHalvesAwayFromZero) {
@@ -202,18 +182,16 @@ To Converted(int16 from, const From& value, int16 to) {
 }
 
 TEST(ConvertNum, RealsAndComplexValues) {
-    EXPECT_EQ((Converted<uint8, int32>(kNumInt32, 300, kNumUInt8)), 44);
-    EXPECT_EQ((Converted<uint8>(kNumDouble, 300.0, kNumUInt8)), 255);
-    EXPECT_EQ((Converted<float>(kNumDouble, 0.1, kNumSingle)), 0.1f);
-    EXPECT_EQ((Converted<float>(kNumDouble, 1e300, kNumSingle)), INFINITY);
-    EXPECT_EQ((Converted<double>(kNumUInt64, ~uint64{0}, kNumDouble)), 0x1p64);
-    EXPECT_EQ((Converted<double>(kNumInt64, int64{9007199254740993}, kNumDouble)), 9007199254740992.0);
-    EXPECT_EQ(ToExtended(Converted<floatExt>(kNumInt64, INT64_MIN, kNumExtended)), -0x1p63L);
+    EXPECT_EACH((Converted<uint8, int32>(kNumInt32, 300, kNumUInt8)) == 44,
+                (Converted<uint8>(kNumDouble, 300.0, kNumUInt8)) == 255,
+                (Converted<float>(kNumDouble, 0.1, kNumSingle)) == 0.1f,
+                (Converted<float>(kNumDouble, 1e300, kNumSingle)) == INFINITY,
+                (Converted<double>(kNumUInt64, ~uint64{0}, kNumDouble)) == 0x1p64,
+                (Converted<double>(kNumInt64, int64{9007199254740993}, kNumDouble)) == 9007199254740992.0,
+                ToExtended(Converted<floatExt>(kNumInt64, INT64_MIN, kNumExtended)) == -0x1p63L);
     const auto z = Converted<cmplx64>(kNumComplexDouble, cmplx128{0.1, -2}, kNumComplexSingle);
-    EXPECT_EQ(z.re, 0.1f);
-    EXPECT_EQ(z.im, -2.0f);
-    EXPECT_EQ((Converted<cmplx128>(kNumInt8, int8{-3}, kNumComplexDouble).im), 0);
-    EXPECT_EQ((Converted<int16>(kNumComplexSingle, cmplx64{-7.5f, 3}, kNumInt16)), -8);
+    EXPECT_EACH(z.re == 0.1f, z.im == -2.0f, (Converted<cmplx128>(kNumInt8, int8{-3}, kNumComplexDouble).im) == 0,
+                (Converted<int16>(kNumComplexSingle, cmplx64{-7.5f, 3}, kNumInt16)) == -8);
     EXPECT_EQ((Converted<int16>(static_cast<int16>(kNumInt32 + 16), int32{5}, kNumInt16)), 5) << "only four bits count";
 }
 
@@ -227,15 +205,15 @@ TEST(ConvertNum, BadArgumentsAreReportedAndStoreNothing) {
     ConvertNum(kNumInt32, &value, kNumInt32, nullptr);
     const std::string codes = "ConvertNum called with non-numeric";
     const std::string data = "ConvertNum called with Empty Data";
-    EXPECT_EQ(reports.Texts(4), (std::vector<std::string>{codes, codes, codes, codes, codes, data, data}));
-    EXPECT_EQ(value, 7);
+    EXPECT_EACH(reports.Texts(4) == (std::vector<std::string>{codes, codes, codes, codes, codes, data, data}),
+                value == 7);
 }
 
 TEST(RoundingUtil, UInt64ToFloat64RoundsToNearest) {
     EXPECT_EQ(UInt64ToFloat64(0), 0.0);
     EXPECT_EQ(UInt64ToFloat64(0x8000000000000400), 0x1p63) << "a tie goes to the even neighbour";
-    EXPECT_EQ(UInt64ToFloat64(0x8000000000000401), 0x1.0000000000001p63);
-    EXPECT_EQ(UInt64ToFloat64(0x8000000000000C00), 0x1.0000000000002p63);
+    EXPECT_EACH(UInt64ToFloat64(0x8000000000000401) == 0x1.0000000000001p63,
+                UInt64ToFloat64(0x8000000000000C00) == 0x1.0000000000002p63);
 }
 
 TEST(FloatingPointConstants, BytesOfSpecialAndWidenedValues) {
@@ -251,19 +229,16 @@ TEST(FloatingPointConstants, BytesOfSpecialAndWidenedValues) {
         {EEpsilonSgl(), 0x8000000000000000, 0x3FE8},
     };
     for (const auto& c : cases) {
-        EXPECT_EQ(c.value->mantissa, c.mantissa);
-        EXPECT_EQ(c.value->signExponent, c.signExponent);
+        EXPECT_EACH(c.value->mantissa == c.mantissa, c.value->signExponent == c.signExponent);
     }
     const auto bits = [](auto x) {
         uint64 result = 0;
         std::memcpy(&result, &x, sizeof x);
         return result;
     };
-    EXPECT_EQ(bits(SInfinity()), 0x7F800000u);
-    EXPECT_EQ(bits(SNegInfinity()), 0xFF800000u);
-    EXPECT_EQ(bits(DInfinity()), 0x7FF0000000000000u);
-    EXPECT_EQ(bits(DNegInfinity()), 0xFFF0000000000000u);
-    EXPECT_EQ(bits(DNaN()), ~uint64{0});
+    EXPECT_EACH(bits(SInfinity()) == 0x7F800000u, bits(SNegInfinity()) == 0xFF800000u,
+                bits(DInfinity()) == 0x7FF0000000000000u, bits(DNegInfinity()) == 0xFFF0000000000000u,
+                bits(DNaN()) == ~uint64{0});
 }
 
 TEST(FloatingPointConstants, Values) {

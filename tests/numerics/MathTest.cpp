@@ -1,19 +1,15 @@
 // The conventions of the math family: where values are special, halves, missing results. How near the results are to
 // the exact ones is measured in MathAccuracyTest.cpp.
 #include "numerics/Extended.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include <tessel/numerics/ComplexMath.h>
 #include <tessel/numerics/FloatingPointConstants.h>
 #include <tessel/numerics/IntegerMath.h>
 #include <tessel/numerics/RealMath.h>
 
 #include <cmath>
-#include <cstring>
-#include <gtest/gtest.h>
 #include <limits>
 #include <ostream>
-#include <utility>
-#include <vector>
 
 namespace {
 
@@ -164,8 +160,7 @@ TEST(RealMath, RemainderExistsInTwoPrecisions) {
     tessel::test::ReportRecorder reports;
     floatExt extended{};
     RTfRemX(EOne(), EOne(), &extended);
-    EXPECT_TRUE(reports.Has(4, "RTfRemX not implemented on this platform"));
-    EXPECT_TRUE(std::isnan(ToExtended(extended)));
+    EXPECT_EACH(reports.Has(4, "RTfRemX not implemented on this platform"), std::isnan(ToExtended(extended)));
 }
 
 TEST(RealMath, TwoResultsEitherOfWhichMayBeNull) {
@@ -207,15 +202,13 @@ TEST(RealMath, TwoResultsEitherOfWhichMayBeNull) {
     floatExt mantissa;
     floatExt exponent;
     RTfGetMantExpX(&x, &mantissa, &exponent);
-    EXPECT_EQ(ToExtended(mantissa), 1.5L);
-    EXPECT_EQ(ToExtended(exponent), -16400);
+    EXPECT_EACH(ToExtended(mantissa) == 1.5L, ToExtended(exponent) == -16400);
     const float zero = 0;
     float sine = 9;
     float cosine = 9;
     RTfSinCosS(&zero, &sine, nullptr);
     RTfSinCosS(&zero, nullptr, &cosine);
-    EXPECT_EQ(sine, 0);
-    EXPECT_EQ(cosine, 1);
+    EXPECT_EACH(sine == 0, cosine == 1);
 }
 
 TEST(RealMath, Predicates) {
@@ -240,12 +233,8 @@ TEST(RealMath, Predicates) {
     } pairs[] = {
         {1, 2, 0, 1, 0, 1, 0, 1}, {2, 1, 0, 1, 1, 0, 1, 0}, {2, 2, 1, 0, 1, 1, 0, 0}, {kNaN, kNaN, 0, 1, 0, 0, 0, 0}};
     for (const auto& c : pairs) {
-        EXPECT_EQ(RTfEQD(&c.x, &c.y), c.eq);
-        EXPECT_EQ(RTfNED(&c.x, &c.y), c.ne);
-        EXPECT_EQ(RTfGED(&c.x, &c.y), c.ge);
-        EXPECT_EQ(RTfLED(&c.x, &c.y), c.le);
-        EXPECT_EQ(RTfGTD(&c.x, &c.y), c.gt);
-        EXPECT_EQ(RTfLTD(&c.x, &c.y), c.lt);
+        EXPECT_EACH(RTfEQD(&c.x, &c.y) == c.eq, RTfNED(&c.x, &c.y) == c.ne, RTfGED(&c.x, &c.y) == c.ge,
+                    RTfLED(&c.x, &c.y) == c.le, RTfGTD(&c.x, &c.y) == c.gt, RTfLTD(&c.x, &c.y) == c.lt);
     }
 }
 
@@ -365,22 +354,15 @@ TEST(ComplexMath, FormsScalesAndPredicates) {
     float im = 0;
     RTcfCToReImS(&z, &re, &im);
     RTfcReImToCS(&im, &re, &back);
-    EXPECT_EQ(back.re, 4);
-    EXPECT_EQ(back.im, -3);
+    EXPECT_EACH(back.re == 4, back.im == -3);
     const float n = 2.5f;
     RTciScaleS(&z, &n, &back);
-    EXPECT_EQ(back.re, -12);
-    EXPECT_EQ(back.im, 16);
+    EXPECT_EACH(back.re == -12, back.im == 16);
 
     const cmplxExt x = {FromExtended(0), FromExtended(1)};
     const cmplxExt nan = {FromExtended(0), *ENaN()};
-    EXPECT_EQ(RTcEQ0X(&x), 0);
-    EXPECT_EQ(RTcNE0X(&x), 1);
-    EXPECT_EQ(RTcEQX(&x, &x), 1);
-    EXPECT_EQ(RTcEQX(&x, &nan), 0);
-    EXPECT_EQ(RTcNEX(&x, &nan), 1);
-    EXPECT_EQ(RTcIsNanX(&x), 0);
-    EXPECT_EQ(RTcIsNanX(&nan), 1);
+    EXPECT_EACH(RTcEQ0X(&x) == 0, RTcNE0X(&x) == 1, RTcEQX(&x, &x) == 1, RTcEQX(&x, &nan) == 0, RTcNEX(&x, &nan) == 1,
+                RTcIsNanX(&x) == 0, RTcIsNanX(&nan) == 1);
 }
 
 TEST(ComplexMath, ExtendedQuotientsStayInRange) {
@@ -414,25 +396,20 @@ TEST(ComplexMath, ExtendedQuotientsStayInRange) {
 // ---- integers -------------------------------------------------------------------------------------------------------
 
 TEST(IntegerMath, WrapAroundAndQuotients) {
-    EXPECT_EQ(RTiMul(0x10001, 0x10001), 0x20001);
-    EXPECT_EQ(RTuMul(0xFFFFFFFF, 2), 0xFFFFFFFE);
-    EXPECT_EQ(RTiDiv(-7, 2), -3);
-    EXPECT_EQ(RTiDiv(INT32_MIN, -1), INT32_MIN);
-    EXPECT_EQ(RTuDiv(0xFFFFFFFF, 2), 0x7FFFFFFFu);
+    EXPECT_EACH(RTiMul(0x10001, 0x10001) == 0x20001, RTuMul(0xFFFFFFFF, 2) == 0xFFFFFFFE, RTiDiv(-7, 2) == -3,
+                RTiDiv(INT32_MIN, -1) == INT32_MIN, RTuDiv(0xFFFFFFFF, 2) == 0x7FFFFFFFu);
     const int64 cases[][4] = {{-7, 2, -3, -1}, {7, -2, -3, 1}, {INT64_MIN, -1, INT64_MIN, 0}, {5, 0, 0, 5}};
     for (const auto& c : cases) {
         int64 quotient = 99;
         int64 remainder = 99;
         RTQRemiQ(c[0], c[1], &quotient, nullptr);
         RTQRemiQ(c[0], c[1], nullptr, &remainder);
-        EXPECT_EQ(quotient, c[2]);
-        EXPECT_EQ(remainder, c[3]);
+        EXPECT_EACH(quotient == c[2], remainder == c[3]);
     }
     uint64 quotient = 99;
     uint64 remainder = 99;
     RTQRemuQ(UINT64_MAX, 10, &quotient, &remainder);
-    EXPECT_EQ(quotient, 1844674407370955161u);
-    EXPECT_EQ(remainder, 5u);
+    EXPECT_EACH(quotient == 1844674407370955161u, remainder == 5u);
     RTQRemuQ(7, 0, nullptr, &remainder);
     EXPECT_EQ(remainder, 7u);
 }

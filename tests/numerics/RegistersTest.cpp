@@ -1,15 +1,11 @@
 // The register layer.
 #include "numerics/Extended.h"
+#include "support/Test.h"
 #include <tessel/numerics/FloatingPointConstants.h>
 #include <tessel/numerics/FloatingPointRegisters.h>
 
 #include <cfenv>
 #include <cmath>
-#include <cstring>
-#include <gtest/gtest.h>
-#include <random>
-#include <thread>
-#include <vector>
 
 namespace {
 
@@ -43,16 +39,12 @@ protected:
 TEST_F(Registers, StackOfEightAndItsFaults) {
     EXPECT_EQ(FPCheck(), 1);
     for (int i = 1; i <= 8; ++i) Push(i);
-    EXPECT_EQ(FPCheck(), 0);
-    EXPECT_EQ(CheckFPStat() & kFPStatStackFault, 0);
+    EXPECT_EACH(FPCheck() == 0, (CheckFPStat() & kFPStatStackFault) == 0);
     for (int i = 8; i >= 1; --i) EXPECT_EQ(Pop(), i);
-    EXPECT_EQ(FPCheck(), 1);
-    EXPECT_TRUE(std::isnan(Pop()));
-    EXPECT_EQ(CheckFPStat() & 0x3FF, kFPStatInvalid | kFPStatStackFault);
+    EXPECT_EACH(FPCheck() == 1, std::isnan(Pop()), (CheckFPStat() & 0x3FF) == (kFPStatInvalid | kFPStatStackFault));
     std::fesetround(FE_UPWARD);
     FPInit();
-    EXPECT_EQ(std::fegetround(), FE_TONEAREST);
-    EXPECT_EQ(CheckFPStat(), 0);
+    EXPECT_EACH(std::fegetround() == FE_TONEAREST, CheckFPStat() == 0);
     for (int i = 1; i <= 9; ++i) Push(i);
     EXPECT_EQ(CheckFPStat() & 0x3FF, kFPStatInvalid | kFPStatStackFault | kFPStatStackOverflow);
     EXPECT_TRUE(std::isnan(Pop())) << "the value pushed on a full stack is lost";
@@ -62,8 +54,7 @@ TEST_F(Registers, StackOfEightAndItsFaults) {
     EXPECT_EQ(CheckFPStat() >> 11 & 7, 7) << "the top";
     Push(0);
     RecipX();
-    EXPECT_EQ(CheckFPStat() & 0x7F, kFPStatZeroDivide);
-    EXPECT_EQ(Pop(), INFINITY);
+    EXPECT_EACH((CheckFPStat() & 0x7F) == kFPStatZeroDivide, Pop() == INFINITY);
 }
 
 TEST_F(Registers, EveryThreadHasItsOwnStack) {
@@ -82,8 +73,7 @@ TEST_F(Registers, PushDoublesAndPopDrops) {
     FPPush();
     FPPop();
     FPSave();
-    EXPECT_EQ(Pop(), 3);
-    EXPECT_EQ(FPCheck(), 1);
+    EXPECT_EACH(Pop() == 3, FPCheck() == 1);
 }
 
 TEST_F(Registers, TypedLoadsAndStores) {
@@ -116,13 +106,10 @@ TEST_F(Registers, TypedLoadsAndStores) {
 TEST_F(Registers, AnyTypeByItsCode) {
     const cmplx128 z = {1.25, -3.5};
     NumToFPR(kNumComplexDouble, &z);
-    EXPECT_EQ(Pop(), 1.25);
-    EXPECT_EQ(Pop(), -3.5);
+    EXPECT_EACH(Pop() == 1.25, Pop() == -3.5);
     NumToFPR(kNumComplexDouble, &z);
     cmplx64 narrow{};
-    EXPECT_EQ(FPRToNum(kNumComplexSingle, &narrow), 1);
-    EXPECT_EQ(narrow.re, 1.25f);
-    EXPECT_EQ(narrow.im, -3.5f);
+    EXPECT_EACH(FPRToNum(kNumComplexSingle, &narrow) == 1, narrow.re == 1.25f, narrow.im == -3.5f);
 
     Push(1e30L);
     int16 small = 0;
@@ -132,15 +119,13 @@ TEST_F(Registers, AnyTypeByItsCode) {
     const floatExt signaling = {0x8000000000000001, 0x7FFF};
     double d = 0;
     FPLoadExt(&signaling);
-    EXPECT_EQ(FPRToNum(kNumDouble, &d), 0);
-    EXPECT_TRUE(std::isnan(d));
+    EXPECT_EACH(FPRToNum(kNumDouble, &d) == 0, std::isnan(d));
 }
 
 TEST_F(Registers, ExtendedInMemoryToIntegers) {
     const floatExt x = FromExtended(18446744073709551613.0L);
-    EXPECT_EQ(FloatExtToUInt64(&x), 18446744073709551613u);
-    EXPECT_EQ(FloatExtToInt64(&x), INT64_MAX);
-    EXPECT_EQ(FloatExtToInt64(ENaN()), INT64_MAX);
+    EXPECT_EACH(FloatExtToUInt64(&x) == 18446744073709551613u, FloatExtToInt64(&x) == INT64_MAX,
+                FloatExtToInt64(ENaN()) == INT64_MAX);
 }
 
 // ---- decimal records ------------------------------------------------------------------------------------------------
@@ -185,8 +170,7 @@ TEST_F(Registers, SpecialDecimalRecords) {
     PackedDecimal record;
     Push(-INFINITY);
     FPStorePDR(5, &record);
-    EXPECT_EQ(record.exponent, 32767);
-    EXPECT_EQ(record.sign, 0x80);
+    EXPECT_EACH(record.exponent == 32767, record.sign == 0x80);
     FPLoadPDR(&record);
     EXPECT_EQ(Pop(), -INFINITY);
     FPLoadExt(ENaN());
@@ -342,8 +326,7 @@ TEST_F(Registers, RealOperations) {
     EXPECT_TRUE(std::isnan(Pop()));
     Push(-40);
     FMantExpX();
-    EXPECT_EQ(Pop(), -1.25L);
-    EXPECT_EQ(Pop(), 5);
+    EXPECT_EACH(Pop() == -1.25L, Pop() == 5);
 }
 
 TEST_F(Registers, ComplexOperations) {
@@ -372,13 +355,11 @@ TEST_F(Registers, ComplexOperations) {
     Push(-4);
     Push(3);
     ComplexDivide();
-    EXPECT_EQ(Pop(), -0.2L);
-    EXPECT_EQ(Pop(), 0.4L);
+    EXPECT_EACH(Pop() == -0.2L, Pop() == 0.4L);
     Push(1);  // the sine of i
     Push(0);
     ComplexSincos();
-    EXPECT_EQ(Pop(), 0);
-    EXPECT_EQ(Pop(), std::sinh(1.0L));
+    EXPECT_EACH(Pop() == 0, Pop() == std::sinh(1.0L));
     EXPECT_NEAR(static_cast<double>(Pop()), std::cosh(1.0), 1e-15);
     EXPECT_EQ(Pop(), 0);
     Push(0);
@@ -421,11 +402,9 @@ TEST_F(Registers, FromMemoryToMemory) {
     EXPECT_EQ(ToExtended(extended), 1);
     cmplx128 z = {-3, 0};
     FComplexRToP64(&z, &z);
-    EXPECT_EQ(z.re, 3);
-    EXPECT_EQ(z.im, std::acos(-1.0));
+    EXPECT_EACH(z.re == 3, z.im == std::acos(-1.0));
     FComplexPToR64(&z, &z);
-    EXPECT_EQ(z.re, -3);
-    EXPECT_EQ(FPCheck(), 1);
+    EXPECT_EACH(z.re == -3, FPCheck() == 1);
 }
 
 // ---- sums -----------------------------------------------------------------------------------------------------------

@@ -1,10 +1,6 @@
 #include "platform/CodePage.h"
 #include "platform/LastError.h"
-
-#include <cstring>
-#include <gtest/gtest.h>
-#include <string>
-#include <vector>
+#include "support/Test.h"
 
 namespace tessel::platform {
 namespace {
@@ -20,8 +16,7 @@ std::vector<std::size_t> Lengths(const std::string& text) {
     const char* end = text.data() + text.size();
     for (const char* at = text.c_str(); at < end; at += lengths.back()) {
         lengths.push_back(CharLength(at, end));
-        EXPECT_EQ(at + lengths.back(), NextChar(at));
-        EXPECT_EQ(at, PrevChar(text.data(), at + lengths.back()));
+        EXPECT_EACH(at + lengths.back() == NextChar(at), at == PrevChar(text.data(), at + lengths.back()));
     }
     return lengths;
 }
@@ -49,8 +44,7 @@ TEST_F(CodePage, CharactersAreWhole) {
         EXPECT_EQ(row.lengths, Lengths(row.text));
     }
     const char* empty = "";
-    EXPECT_EQ(empty, NextChar(empty));
-    EXPECT_EQ(empty, PrevChar(empty, empty));
+    EXPECT_EACH(empty == NextChar(empty), empty == PrevChar(empty, empty));
 }
 
 TEST_F(CodePage, LeadBytesAreTheDocumentedOnes) {
@@ -82,8 +76,7 @@ TEST_F(CodePage, CaseMapsLeaveTrailBytesAlone) {
         EXPECT_EQ(row.upper, text);
     }
     SetCodePage(1252);
-    EXPECT_EQ(0xE4, LowerByte(0xC4));
-    EXPECT_EQ(0xFF, LowerByte(0x9F));
+    EXPECT_EACH(LowerByte(0xC4) == 0xE4, LowerByte(0x9F) == 0xFF);
     std::string text = "\xC4Z";
     LowerText(text.data(), text.size());
     EXPECT_EQ("\xE4z", text);
@@ -110,31 +103,20 @@ TEST_F(CodePage, Conversions) {
         ASSERT_TRUE(SetCodePage(row.codePage));
         std::string utf8, text;
         std::u16string utf16;
-        EXPECT_TRUE(ToUtf8(row.text, utf8));
-        EXPECT_EQ(row.utf8, utf8);
-        EXPECT_TRUE(FromUtf8(row.utf8, text));
-        EXPECT_EQ(row.text, text);
-        EXPECT_TRUE(ToUtf16(row.text, utf16));
-        EXPECT_EQ(row.utf16, utf16);
-        EXPECT_TRUE(FromUtf16(row.utf16, text));
-        EXPECT_EQ(row.text, text);
+        EXPECT_EACH(ToUtf8(row.text, utf8), row.utf8 == utf8, FromUtf8(row.utf8, text), row.text == text,
+                    ToUtf16(row.text, utf16), row.utf16 == utf16, FromUtf16(row.utf16, text), row.text == text);
     }
 }
 
 TEST_F(CodePage, WhatCannotBeConvertedIsReplaced) {
     std::string result;
     SetCodePage(1252);
-    EXPECT_FALSE(FromUtf8("a\xE3\x82\xBDz\xFF", result));
-    EXPECT_EQ("a?z?", result);
-    EXPECT_EQ(kErrorNoUnicodeTranslation, LastError());
+    EXPECT_EACH(!FromUtf8("a\xE3\x82\xBDz\xFF", result), result == "a?z?", LastError() == kErrorNoUnicodeTranslation);
     SetCodePage(932);
-    EXPECT_FALSE(ToUtf8("a\x83", result));
-    EXPECT_EQ("a\xEF\xBF\xBD", result);
+    EXPECT_EACH(!ToUtf8("a\x83", result), result == "a\xEF\xBF\xBD");
     SetCodePage(kCodePageUtf8);
-    EXPECT_FALSE(ToUtf8("a\xC0z", result));
-    EXPECT_EQ("a\xEF\xBF\xBDz", result);
-    EXPECT_FALSE(FromUtf16(u"a\xD800z", result));
-    EXPECT_EQ("a\xEF\xBF\xBDz", result);
+    EXPECT_EACH(!ToUtf8("a\xC0z", result), result == "a\xEF\xBF\xBDz", !FromUtf16(u"a\xD800z", result),
+                result == "a\xEF\xBF\xBDz");
 }
 
 TEST_F(CodePage, UnknownPagesAreRefused) {

@@ -1,13 +1,8 @@
-#include "support/ReportRecorder.h"
 #include "support/StartedPaths.h"
+#include "support/Test.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/streams/BinDataReader.h>
 #include <tessel/streams/BinDataWriter.h>
-
-#include <cstring>
-#include <functional>
-#include <gtest/gtest.h>
-#include <string>
 
 namespace tessel {
 namespace {
@@ -28,8 +23,7 @@ protected:
         EXPECT_EQ(size, buffer.GetBytesWritten());
         PreflightOutputBuf counter;
         BinDataWriter counting(&counter, order);
-        EXPECT_EQ(size, write(counting));
-        EXPECT_EQ(size, counter.GetBytesWritten());
+        EXPECT_EACH(size == write(counting), size == counter.GetBytesWritten());
         return std::string(block, size);
     }
     // Whether all of the bytes, and no more, are read as what is expected.
@@ -94,8 +88,7 @@ TEST_F(BinData, ValuesInTheOrderOfTheStream) {
         }
     }
     const std::string native = Written(NativeEndianizer(), [&](W& w) { return w.WriteFX(pi); });
-    EXPECT_EQ(10u, native.size());
-    EXPECT_TRUE(Read(NativeEndianizer(), native, readsPi));
+    EXPECT_EACH(native.size() == 10u, Read(NativeEndianizer(), native, readsPi));
 }
 
 TEST_F(BinData, PStrsArePadded) {
@@ -116,9 +109,7 @@ TEST_F(BinData, PStrsArePadded) {
 TEST_F(BinData, TheFirstErrorStays) {
     MemInputBuf in("\x01\x02\x03", 3);
     BinDataReader reader(&in, BigEndianizer());
-    EXPECT_EQ(0, reader.ReadI32());
-    EXPECT_EQ(kCorruptErr, reader.GetError());
-    EXPECT_EQ(0, reader.ReadU8());
+    EXPECT_EACH(reader.ReadI32() == 0, reader.GetError() == kCorruptErr, reader.ReadU8() == 0);
     char bytes[3] = {9, 9, 9};
     reader.ReadBytes(bytes, 2);
     EXPECT_EQ("\0\0\x9"s, std::string(bytes, 3));
@@ -135,9 +126,7 @@ TEST_F(BinData, TheFirstErrorStays) {
         BinDataWriter writer(&out, BigEndianizer());
         EXPECT_EQ(0u, writer.WriteI16(1));
         PreflightOutputBuf other;
-        EXPECT_EQ(&out, writer.SetBuffer(&other));
-        EXPECT_EQ(0u, writer.WriteI8(1));
-        EXPECT_EQ(kCorruptErr, writer.GetError());
+        EXPECT_EACH(&out == writer.SetBuffer(&other), writer.WriteI8(1) == 0u, writer.GetError() == kCorruptErr);
     }
     EXPECT_TRUE(reports_.Has(0, "BinDataWriter finished with 74 error"));
 }

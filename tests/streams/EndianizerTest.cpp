@@ -1,8 +1,7 @@
+#include "support/Test.h"
 #include <tessel/streams/Endianizer.h>
 
 #include <array>
-#include <cstring>
-#include <gtest/gtest.h>
 
 namespace tessel {
 namespace {
@@ -25,10 +24,10 @@ TEST(ByteOrder, HelpersWorkInPlaceAtAnyAddress) {
 
 TEST(Endianizer, IntegersInBothOrders) {
     const uint8 stream[16] = {0x81, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16};
-    EXPECT_EQ(int16(0x8102), BigEndianizer()->ToNative16(stream));
-    EXPECT_EQ(int16(0x0281), LittleEndianizer()->ToNative16(stream));
-    EXPECT_EQ(int32(0x81020304), BigEndianizer()->ToNative32(stream));
-    EXPECT_EQ(int32(0x04030281), NativeEndianizer()->ToNative32(stream));
+    EXPECT_EACH(int16(0x8102) == BigEndianizer()->ToNative16(stream),
+                int16(0x0281) == LittleEndianizer()->ToNative16(stream),
+                int32(0x81020304) == BigEndianizer()->ToNative32(stream),
+                int32(0x04030281) == NativeEndianizer()->ToNative32(stream));
     uint64 value;
     BigEndianizer()->CopyToNative64(stream, &value);
     EXPECT_EQ(0x8102030405060708u, value);
@@ -37,10 +36,8 @@ TEST(Endianizer, IntegersInBothOrders) {
     for (int i = 0; i < 16; ++i) EXPECT_EQ(stream[15 - i], all[i]);
     uint8 back[16];
     BigEndianizer()->FromNative128(all, back);
-    EXPECT_EQ(0, std::memcmp(stream, back, 16));
-    EXPECT_EQ(1, BigEndianizer()->IsSwapping());
-    EXPECT_EQ(0, LittleEndianizer()->IsSwapping());
-    EXPECT_EQ(0, NativeEndianizer()->IsSwapping());
+    EXPECT_EACH(std::memcmp(stream, back, 16) == 0, BigEndianizer()->IsSwapping() == 1,
+                LittleEndianizer()->IsSwapping() == 0, NativeEndianizer()->IsSwapping() == 0);
 }
 
 floatExt Extended(uint16 signExponent, uint64 mantissa) {
@@ -62,16 +59,14 @@ TEST(Endianizer, ExtendedRealsInTheStandardForm) {
         little.fill(0xAA);
         BigEndianizer()->FromNativeFX(value, big.data());
         LittleEndianizer()->FromNativeFX(value, little.data());
-        EXPECT_EQ(bytes, big);
-        EXPECT_TRUE(std::equal(big.begin(), big.end(), little.rbegin()));
+        EXPECT_EACH(bytes == big, std::equal(big.begin(), big.end(), little.rbegin()));
         big[15] = 77;  // the last six bytes are not looked at
         const floatExt fromBig = BigEndianizer()->ToNativeFX(big.data());
         const floatExt fromLittle = LittleEndianizer()->ToNativeFX(little.data());
-        EXPECT_EQ(0, std::memcmp(&value, &fromBig, sizeof fromBig));
-        EXPECT_EQ(0, std::memcmp(&value, &fromLittle, sizeof fromLittle));
+        EXPECT_EACH(std::memcmp(&value, &fromBig, sizeof fromBig) == 0,
+                    std::memcmp(&value, &fromLittle, sizeof fromLittle) == 0);
     }
-    EXPECT_EQ(16u, BigEndianizer()->StreamFXSize());
-    EXPECT_EQ(10u, NativeEndianizer()->StreamFXSize());
+    EXPECT_EACH(BigEndianizer()->StreamFXSize() == 16u, NativeEndianizer()->StreamFXSize() == 10u);
 }
 
 }  // namespace

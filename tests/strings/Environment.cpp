@@ -1,8 +1,7 @@
 // The subsystems that the strings stand on run for all tests of this folder.
 #include "memory/Service.h"
+#include "support/Test.h"
 #include "sync/Service.h"
-
-#include <gtest/gtest.h>
 
 namespace {
 
@@ -15,11 +14,9 @@ class Foundations : public testing::Environment {
         ASSERT_EQ(kNoErr, tessel::TrackedMallocFreeStart());
     }
     void TearDown() override {
-        EXPECT_EQ(kNoErr, tessel::TrackedMallocFreeStop());
-        EXPECT_EQ(kNoErr, tessel::MemoryManagerStop());
-        EXPECT_EQ(kNoErr, tessel::ProtectedAtomicOperationsStop());
-        EXPECT_EQ(kNoErr, tessel::ThMutexStop());
-        EXPECT_EQ(kNoErr, tessel::ThEventStop());
+        EXPECT_EACH(tessel::TrackedMallocFreeStop() == kNoErr, tessel::MemoryManagerStop() == kNoErr,
+                    tessel::ProtectedAtomicOperationsStop() == kNoErr, tessel::ThMutexStop() == kNoErr,
+                    tessel::ThEventStop() == kNoErr);
     }
 };
 

@@ -1,4 +1,5 @@
 #include "strings/Support.h"
+#include "support/Test.h"
 #include <tessel/strings/StringCStr.h>
 #include <tessel/strings/StringFmtScan.h>
 
@@ -38,8 +39,7 @@ TEST(StringFmtScan, ReadsDecimalPointSpecifiers) {
     EXPECT_EQ(',', StrSetDecimalPoint(','));
     uint8 decimalPoint = 0;
     CStr cursor = ";";
-    EXPECT_TRUE(ScanForFormatDecPoint(&cursor, cursor + 1, &decimalPoint));
-    EXPECT_EQ(',', decimalPoint);
+    EXPECT_EACH(ScanForFormatDecPoint(&cursor, cursor + 1, &decimalPoint), decimalPoint == ',');
     StrSetDecimalPoint('.');
 }
 

@@ -1,24 +1,17 @@
 #include "platform/posix/SystemCalls.h"
-#include "support/ReportRecorder.h"
 #include "support/ScratchDrive.h"
 #include "support/StartedLibrary.h"
+#include "support/Test.h"
 #include "threads/Service.h"
 #include <tessel/sync/ThEvent.h>
 #include <tessel/threads/ThThread.h>
 
-#include <atomic>
-#include <cstdlib>
 #include <errno.h>
 #include <filesystem>
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
 #include <pthread.h>
-#include <string>
 #include <sys/resource.h>
 #include <sys/syscall.h>
-#include <thread>
 #include <unistd.h>
-#include <vector>
 
 namespace {
 
@@ -82,16 +75,12 @@ TEST_F(ThThreadTest, KnowsItsThreads) {
             return AwaitEvent(mine.go);
         },
         &seen);
-    EXPECT_EQ(ThThreadGetIndex(nullptr), 0);
-    EXPECT_TRUE(IsStartUpThread());
-    EXPECT_TRUE(ThThreadActive(thread));
+    EXPECT_EACH(ThThreadGetIndex(nullptr) == 0, IsStartUpThread(), ThThreadActive(thread));
     int a = 0, b = 0;
     void* valueA = nullptr;
     ThSetThInfo(thread, &a, &b);
-    EXPECT_EQ(ThGetThInfo(thread, &valueA), &b);
-    EXPECT_EQ(valueA, &a);
-    EXPECT_EQ(ThGetThInfo(nullptr, &valueA), nullptr);
-    EXPECT_EQ(valueA, nullptr);
+    EXPECT_EACH(ThGetThInfo(thread, &valueA) == &b, valueA == &a, ThGetThInfo(nullptr, &valueA) == nullptr,
+                valueA == nullptr);
     ThPlatformThread* handle = nullptr;
     uint32* id = nullptr;
     ThGetPlatformThread(thread, &handle, &id);
@@ -108,16 +97,13 @@ TEST_F(ThThreadTest, KnowsItsThreads) {
 
 TEST_F(ThThreadTest, HasNoIdentityBeforeTheStartUpThread) {
     Restart(nullptr);
-    EXPECT_EQ(ThThreadGetId(), nullptr);
-    EXPECT_EQ(ThThreadGetIndex(nullptr), 2048);
+    EXPECT_EACH(ThThreadGetId() == nullptr, ThThreadGetIndex(nullptr) == 2048);
     EXPECT_THAT(reports_.Texts(kDebugError), ElementsAre("bad ThThread in ThThreadGetIndex()"));
     EXPECT_EQ(AssimilateStartUpThread(), 1);
     std::thread([] {
         ThThread adopted = nullptr;
-        EXPECT_EQ(ThThreadGetId(), nullptr);
-        EXPECT_EQ(ThPseudoThreadCreate(&adopted), kNoErr);
-        EXPECT_EQ(ThThreadGetId(), adopted);
-        EXPECT_TRUE(adopted->adopted == 1 && ThThreadActive(adopted));
+        EXPECT_EACH(ThThreadGetId() == nullptr, ThPseudoThreadCreate(&adopted) == kNoErr, ThThreadGetId() == adopted,
+                    adopted->adopted == 1, ThThreadActive(adopted));
         ThThreadDestroy(adopted);
         EXPECT_EQ(ThThreadGetId(), nullptr);
     }).join();
@@ -136,8 +122,8 @@ TEST_F(ThThreadTest, RefusesOneMoreThanTheTableHolds) {
                       },
                       nullptr, nullptr),
                   kMemFullErr);
-        EXPECT_EQ(ThPseudoThreadCreate(&adopted), kMemFullErr);
-        EXPECT_TRUE(started == nullptr && adopted == nullptr && ThThreadGetId() == records.back());
+        EXPECT_EACH(ThPseudoThreadCreate(&adopted) == kMemFullErr, started == nullptr, adopted == nullptr,
+                    ThThreadGetId() == records.back());
         const int32 freed = ThThreadGetIndex(records[100]);
         ThThreadDestroy(records[100]);  // not the calling thread's current record
         EXPECT_THAT(reports_.Texts(), ElementsAre("Thread Array full!!", "Thread Array full!!",
@@ -173,8 +159,7 @@ TEST_F(ThThreadTest, GivesEachOfManyThreadsAPlaceOfItsOwn) {
         });
     }
     for (std::thread& creator : creators) creator.join();
-    EXPECT_EQ(ended, 4 * 100 * 2);
-    EXPECT_EQ(collisions, 0);
+    EXPECT_EACH(ended == 4 * 100 * 2, collisions == 0);
     EXPECT_THAT(reports_.Texts(), IsEmpty());
 }
 
@@ -184,10 +169,8 @@ TEST_F(ThThreadTest, ReportsBadRecordsAndThreadsThatAreLeft) {
     THTHREADREC bad{};
     ThThreadDestroy(nullptr);
     ThThreadDestroy(&bad);
-    EXPECT_EQ(ThThreadGetIndex(&bad), 2048);
-    EXPECT_EQ(ThThreadGetPriority(&bad), kThPriorityNormal);
-    EXPECT_EQ(ThThreadSetPriority(&bad, 1), kNoErr);
-    EXPECT_FALSE(ThThreadActive(&bad));
+    EXPECT_EACH(ThThreadGetIndex(&bad) == 2048, ThThreadGetPriority(&bad) == kThPriorityNormal,
+                ThThreadSetPriority(&bad, 1) == kNoErr, !ThThreadActive(&bad));
     EXPECT_THAT(
         reports_.Texts(kDebugError),
         ElementsAre("threadp does not have correct verifier in ThThreadDestroy", "bad ThThread in ThThreadGetIndex()",
@@ -348,9 +331,8 @@ TEST_F(ThThreadTest, SetsPrioritiesAndTellsTheHost) {
     };
     ThThreadPrioritySetProc other = [](ThThread, ThPlatformThread, uint32, int32) {};
     Restart(Lowered);  // everybody may lower a priority
-    EXPECT_EQ(ThSetThreadPrioritySetProc(nullptr), kArgErr);
-    EXPECT_EQ(ThSetThreadPrioritySetProc(note), kNoErr);
-    EXPECT_EQ(ThSetThreadPrioritySetProc(other), kArgErr);
+    EXPECT_EACH(ThSetThreadPrioritySetProc(nullptr) == kArgErr, ThSetThreadPrioritySetProc(note) == kNoErr,
+                ThSetThreadPrioritySetProc(other) == kArgErr);
     ThEvent go = nullptr;
     ThEventCreate(&go, 0, false);
     thread = StartThread(AwaitEvent, go);
@@ -358,11 +340,9 @@ TEST_F(ThThreadTest, SetsPrioritiesAndTellsTheHost) {
 
     EXPECT_EQ(ThThreadGetPriority(thread), kThPriorityVeryHigh);  // 0, as it was started
     for (int32 level : {3, 2, 5, -1, 0}) EXPECT_EQ(ThThreadSetPriority(thread, level), kNoErr);
-    EXPECT_EQ(ThThreadSetPriority(nullptr, 1), kNoErr);
-    EXPECT_EQ(ThThreadGetPriority(thread), kThPriorityBackground);
+    EXPECT_EACH(ThThreadSetPriority(nullptr, 1) == kNoErr, ThThreadGetPriority(thread) == kThPriorityBackground);
     EXPECT_THAT(levelsSet, ElementsAre(3, 2, 1, 0));
-    EXPECT_EQ(ThClearThreadPrioritySetProc(other), kArgErr);
-    EXPECT_EQ(ThClearThreadPrioritySetProc(note), kNoErr);
+    EXPECT_EACH(ThClearThreadPrioritySetProc(other) == kArgErr, ThClearThreadPrioritySetProc(note) == kNoErr);
     EXPECT_THAT(reports_.Texts(),
                 ElementsAre("bad argument to ThThreadSetPriority()", "", "bad argument to ThThreadSetPriority()",
                             "Someone is attempting to clear the ThreadPrioritySetProc but didn't set it!"));
@@ -425,11 +405,10 @@ TEST_F(ThThreadTest, TellsOfTheThreadAndTheMachine) {
     ThGetThreadTime(&before);
     do ThGetThreadTime(&after);
     while (HRTimeCompare(&after, &before) == 0);
-    EXPECT_EQ(HRTimeCompare(&after, &before), 1);
-    EXPECT_EQ(ThNumberOfProcessors(), static_cast<int32>(std::thread::hardware_concurrency()));
-    EXPECT_EQ(ThThreadStackLeft(), 2147483647);
-    EXPECT_EQ(stack_overflow_exception_filter(0xC00000FDu), 1);
-    EXPECT_EQ(stack_overflow_exception_filter(0xC0000005u), 0);
+    EXPECT_EACH(HRTimeCompare(&after, &before) == 1,
+                ThNumberOfProcessors() == static_cast<int32>(std::thread::hardware_concurrency()),
+                ThThreadStackLeft() == 2147483647, stack_overflow_exception_filter(0xC00000FDu) == 1,
+                stack_overflow_exception_filter(0xC0000005u) == 0);
 }
 
 }  // namespace

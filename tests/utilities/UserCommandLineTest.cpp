@@ -1,9 +1,6 @@
+#include "support/Test.h"
 #include "support/malloc/FailingMalloc.h"
 #include <tessel/utilities/UserCommandLine.h>
-
-#include <gtest/gtest.h>
-#include <string>
-#include <vector>
 
 namespace {
 
@@ -50,10 +47,8 @@ TEST(UserCommandLine, IsSplitAtTheFirstSeparator) {
     for (const auto& each : cases) {
         Host host(each.all);
         SetIgnoreCommandLine(each.ignore);
-        EXPECT_EQ(host.Init(), kNoErr);
-        EXPECT_EQ(Get(GetRawCommandLine), each.all);
-        EXPECT_EQ(Get(GetAppCommandLine), each.app);
-        EXPECT_EQ(Get(GetUserCommandLine), each.user);
+        EXPECT_EACH(host.Init() == kNoErr, Get(GetRawCommandLine) == each.all, Get(GetAppCommandLine) == each.app,
+                    Get(GetUserCommandLine) == each.user);
         EXPECT_STREQ(GetPrefsPath(), each.prefs);
     }
 }
@@ -61,20 +56,14 @@ TEST(UserCommandLine, IsSplitAtTheFirstSeparator) {
 TEST(UserCommandLine, RefusesNoneAndASecondOne) {
     EXPECT_EQ(InitUserCommandLine(0, nullptr), kArgErr);
     Host first({"one", "-pref", "a.ini", "--", "a"}), second({"two", "--", "b"});
-    EXPECT_EQ(first.Init(), kNoErr);
-    EXPECT_EQ(second.Init(), kArgErr);
-    EXPECT_EQ(Get(GetAppCommandLine), (Words{"two", "--", "b"}));
-    EXPECT_EQ(Get(GetUserCommandLine), (Words{"one", "a"}));
-    EXPECT_EQ(SetPrefsPath("own.ini"), kNoErr);
-    EXPECT_EQ(SetPrefsPath(GetPrefsPath()), kNoErr);
+    EXPECT_EACH(first.Init() == kNoErr, second.Init() == kArgErr, Get(GetAppCommandLine) == (Words{"two", "--", "b"}),
+                Get(GetUserCommandLine) == (Words{"one", "a"}), SetPrefsPath("own.ini") == kNoErr,
+                SetPrefsPath(GetPrefsPath()) == kNoErr);
     SetIgnoreCommandLine(1);
     UninitUserCommandLine();
-    EXPECT_TRUE(Get(GetRawCommandLine).empty() && Get(GetUserCommandLine).empty());
-    EXPECT_EQ(second.Init(), kNoErr);
-    EXPECT_EQ(Get(GetUserCommandLine), (Words{"two", "b"}));
-    EXPECT_STREQ(GetPrefsPath(), "own.ini");
-    EXPECT_EQ(SetPrefsPath(nullptr), kNoErr);
-    EXPECT_EQ(GetPrefsPath(), nullptr);
+    EXPECT_EACH(Get(GetRawCommandLine).empty(), Get(GetUserCommandLine).empty(), second.Init() == kNoErr,
+                Get(GetUserCommandLine) == (Words{"two", "b"}), GetPrefsPath() == "own.ini",
+                SetPrefsPath(nullptr) == kNoErr, GetPrefsPath() == nullptr);
 }
 
 TEST(UserCommandLine, WithoutMemoryNothingIsKept) {
@@ -131,8 +120,7 @@ TEST(UserCommandLine, IsMadeFromOneLine) {
         char** args = nullptr;
         NewCommandLineArgsFromSingleLine(each.line, first.data(), &count, &args);
         ASSERT_EQ(count, static_cast<int32>(each.words.size()) + 1) << (each.line ? each.line : "null");
-        EXPECT_EQ(args[0], first.data());
-        EXPECT_EQ(Words(args + 1, args + count), each.words);
+        EXPECT_EACH(args[0] == first.data(), Words(args + 1, args + count) == each.words);
         DeleteCommandLineArgsFromSingleLine(count, args);
     }
     DeleteCommandLineArgsFromSingleLine(0, nullptr);

@@ -1,11 +1,8 @@
 #include "support/StartedLibrary.h"
+#include "support/Test.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/utilities/VersionUtil.h>
 #include <tessel/utilities/pheventlog.h>
-
-#include <cstring>
-#include <gtest/gtest.h>
-#include <string>
 
 namespace {
 
@@ -38,12 +35,11 @@ TEST(VersionUtil, WritesEachLevel) {
 
 TEST(VersionUtil, FillsABufferWholeOrNotAtAll) {
     char buffer[6] = "12345";
-    EXPECT_EQ(BuildVersionString(0x13008000, kVersionStringShort, buffer, 4), 4u);
-    EXPECT_EQ(std::memcmp(buffer, "\0\0\0\0005", 6), 0);
-    EXPECT_EQ(BuildVersionString(0x13008000, kVersionStringShort, buffer, 5), 4u);
-    EXPECT_STREQ(buffer, "13.0");
-    EXPECT_EQ(BuildVersionString(0x13008000, kVersionStringShort, nullptr, 5), 4u);
-    EXPECT_EQ(BuildVersionString(0x13008000, kVersionStringShort, buffer, 0), 4u);
+    EXPECT_EACH(BuildVersionString(0x13008000, kVersionStringShort, buffer, 4) == 4u,
+                std::memcmp(buffer, "\0\0\0\0005", 6) == 0,
+                BuildVersionString(0x13008000, kVersionStringShort, buffer, 5) == 4u, buffer == "13.0",
+                BuildVersionString(0x13008000, kVersionStringShort, nullptr, 5) == 4u,
+                BuildVersionString(0x13008000, kVersionStringShort, buffer, 0) == 4u);
 }
 
 TEST(EventLog, ReadsAsEmpty) {
@@ -54,8 +50,8 @@ TEST(EventLog, ReadsAsEmpty) {
     UHandle text = DSNewHClr(5), tiny = DSNewHandle(0);
     LStrHandle string = reinterpret_cast<LStrHandle>(text);
     (*string)->count = 1;
-    EXPECT_EQ(EventLoggingEnumLogEntry(0, &words[0], &words[1], &words[2], &words[3], &words[4], string), 0);
-    EXPECT_EQ(EventLoggingEnumLogEntry(0, nullptr, nullptr, nullptr, nullptr, nullptr, (LStrHandle)tiny), 0);
+    EXPECT_EACH(EventLoggingEnumLogEntry(0, &words[0], &words[1], &words[2], &words[3], &words[4], string) == 0,
+                EventLoggingEnumLogEntry(0, nullptr, nullptr, nullptr, nullptr, nullptr, (LStrHandle)tiny) == 0);
     for (uint32 word : words) EXPECT_EQ(word, 0u);
     EXPECT_EQ((*string)->count, 0);
     DSDisposeHandle(text);
