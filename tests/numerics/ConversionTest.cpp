@@ -45,9 +45,11 @@ TEST(NumericSupport, SmallHelpers) {
 }
 
 TEST(RoundingUtil, ToAnIncrementHalvesAwayFromZero) {
-    const int32 cases[][3] = {
-        {7, 5, 5}, {8, 5, 10}, {-8, 5, -10}, {5, 10, 10}, {-5, 10, -10}, {4, 1, 4}, {INT32_MAX, 10, INT32_MIN + 2}};
-    for (const auto& c : cases) EXPECT_EQ(RndToInc(c[0], c[1]), c[2]) << c[0] << " to " << c[1];
+    EXPECT_EACH(RndToInc(7, 5) == 5, RndToInc(8, 5) == 10, RndToInc(-8, 5) == -10, RndToInc(5, 10) == 10,
+                RndToInc(-5, 10) == -10, RndToInc(4, 1) == 4, RndToInc(INT32_MAX, 10) == INT32_MIN + 2);
+    EXPECT_EACH(UInt64ToFloat64(0) == 0.0, UInt64ToFloat64(0x8000000000000400) == 0x1p63,  // a tie
+                UInt64ToFloat64(0x8000000000000401) == 0x1.0000000000001p63,
+                UInt64ToFloat64(0x8000000000000C00) == 0x1.0000000000002p63);
 }
 
 // ---- between integers -----------------------------------------------------------------------------------------------
@@ -127,49 +129,22 @@ TEST(ConvertNum, DoublesSaturateAndRoundHalvesToEven) {
     }
     for (const auto& [direction, x] : cases) {
         std::fesetround(direction);
-        ExpectNearest<int8>(x, Float64ToInt8, kNumInt8);
-        ExpectNearest<int16>(x, Float64ToInt16, kNumInt16);
-        ExpectNearest<int32>(x, Float64ToInt32, kNumInt32);
-        ExpectNearest<int64>(x, Float64ToInt64, kNumInt64);
-        ExpectNearest<uint8>(x, Float64ToUInt8, kNumUInt8);
-        ExpectNearest<uint16>(x, Float64ToUInt16, kNumUInt16);
-        ExpectNearest<uint32>(x, Float64ToUInt32, kNumUInt32);
-        ExpectNearest<uint64>(x, Float64ToUInt64, kNumUInt64);
-        EXPECT_EQ(RndToNearest(x), Nearest<int32>(x)) << x;
-        EXPECT_EQ(RndToNearestI64(x), Nearest<int64>(x)) << x;
-        EXPECT_EQ(RndToNearestU32(x), Nearest<uint32>(x)) << x;
-        EXPECT_EQ(RndToNearestU64(x), Nearest<uint64>(x)) << x;
+        ExpectNearest(x, Float64ToInt8, kNumInt8);
+        ExpectNearest(x, Float64ToInt16, kNumInt16);
+        ExpectNearest(x, Float64ToInt32, kNumInt32);
+        ExpectNearest(x, Float64ToInt64, kNumInt64);
+        ExpectNearest(x, Float64ToUInt8, kNumUInt8);
+        ExpectNearest(x, Float64ToUInt16, kNumUInt16);
+        ExpectNearest(x, Float64ToUInt32, kNumUInt32);
+        ExpectNearest(x, Float64ToUInt64, kNumUInt64);
+        EXPECT_EACH(RndToNearest(x) == Nearest<int32>(x), RndToNearestI64(x) == Nearest<int64>(x),
+                    RndToNearestU32(x) == Nearest<uint32>(x), RndToNearestU64(x) == Nearest<uint64>(x));
         double rounded = 0;
         RTfRoundD(&x, &rounded);
         const bool isSmall = std::fabs(x) < 0x1p62;
         EXPECT_EQ(isSmall ? rounded : 0, isSmall ? static_cast<double>(Nearest<int64>(x)) : 0) << x;
     }
     std::fesetround(FE_TONEAREST);
-}
-
-TEST(ConvertNum, ExtendedValuesNearTheLimits) {
-    const struct {
-        Extended value;
-        int64 asInt64;
-        uint64 asUInt64;
-    } cases[] = {
-        {9223372036854775807.0L, INT64_MAX, 9223372036854775807u},
-        {9223372036854775807.0L + 0.5L, INT64_MAX, 9223372036854775808u},
-        {18446744073709551615.0L, INT64_MAX, UINT64_MAX},
-        {18446744073709551616.0L, INT64_MAX, UINT64_MAX},
-        {4611686018427387904.5L, 4611686018427387904, 4611686018427387904u},
-        {-9223372036854775808.0L, INT64_MIN, 0},
-        {-0.75L, -1, 0},
-    };
-    for (const auto& c : cases) {
-        const floatExt x = FromExtended(c.value);
-        int64 asInt64 = 0;
-        uint64 asUInt64 = 0;
-        ConvertNum(kNumExtended, &x, kNumInt64, &asInt64);
-        ConvertNum(kNumExtended, &x, kNumUInt64, &asUInt64);
-        EXPECT_EQ(asInt64, c.asInt64) << c.value;
-        EXPECT_EQ(asUInt64, c.asUInt64) << c.value;
-    }
 }
 
 // ---- the rest -------------------------------------------------------------------------------------------------------
@@ -182,6 +157,22 @@ To Converted(int16 from, const From& value, int16 to) {
 }
 
 TEST(ConvertNum, RealsAndComplexValues) {
+    const struct {
+        Extended value;
+        int64 asInt64;
+        uint64 asUInt64;
+    } limits[] = {{9223372036854775807.0L, INT64_MAX, 9223372036854775807u},
+                  {9223372036854775807.0L + 0.5L, INT64_MAX, 9223372036854775808u},
+                  {18446744073709551615.0L, INT64_MAX, UINT64_MAX},
+                  {18446744073709551616.0L, INT64_MAX, UINT64_MAX},
+                  {4611686018427387904.5L, 4611686018427387904, 4611686018427387904u},
+                  {-9223372036854775808.0L, INT64_MIN, 0},
+                  {-0.75L, -1, 0}};
+    for (const auto& c : limits) {
+        const floatExt x = FromExtended(c.value);
+        EXPECT_EACH((Converted<int64>(kNumExtended, x, kNumInt64)) == c.asInt64,
+                    (Converted<uint64>(kNumExtended, x, kNumUInt64)) == c.asUInt64);
+    }
     EXPECT_EACH((Converted<uint8, int32>(kNumInt32, 300, kNumUInt8)) == 44,
                 (Converted<uint8>(kNumDouble, 300.0, kNumUInt8)) == 255,
                 (Converted<float>(kNumDouble, 0.1, kNumSingle)) == 0.1f,
@@ -209,28 +200,14 @@ TEST(ConvertNum, BadArgumentsAreReportedAndStoreNothing) {
                 value == 7);
 }
 
-TEST(RoundingUtil, UInt64ToFloat64RoundsToNearest) {
-    EXPECT_EQ(UInt64ToFloat64(0), 0.0);
-    EXPECT_EQ(UInt64ToFloat64(0x8000000000000400), 0x1p63) << "a tie goes to the even neighbour";
-    EXPECT_EACH(UInt64ToFloat64(0x8000000000000401) == 0x1.0000000000001p63,
-                UInt64ToFloat64(0x8000000000000C00) == 0x1.0000000000002p63);
-}
-
 TEST(FloatingPointConstants, BytesOfSpecialAndWidenedValues) {
-    const struct {
-        const floatExt* value;
-        uint64 mantissa;
-        uint16 signExponent;
-    } cases[] = {
-        {EOne(), 0x8000000000000000, 0x3FFF},        {EZero(), 0, 0},
-        {EInfinity(), 0x8000000000000000, 0x7FFF},   {ENegInfinity(), 0x8000000000000000, 0xFFFF},
-        {ENaN(), 0xFFFFFFFFFFFFFFFF, 0x7FFF},        {ETwoPi(), 0xC90FDAA22168C000, 0x4001},
-        {EEpsilon(), 0x8000000000000000, 0x3FCB},    {EEpsilonExt(), 0x8000000000000000, 0x3FC0},
-        {EEpsilonSgl(), 0x8000000000000000, 0x3FE8},
+    const auto is = [](const floatExt* value, uint16 signExponent, uint64 mantissa) {
+        return value->mantissa == mantissa && value->signExponent == signExponent;
     };
-    for (const auto& c : cases) {
-        EXPECT_EACH(c.value->mantissa == c.mantissa, c.value->signExponent == c.signExponent);
-    }
+    EXPECT_EACH(is(EOne(), 0x3FFF, 0x8000000000000000), is(EZero(), 0, 0), is(EInfinity(), 0x7FFF, 0x8000000000000000),
+                is(ENegInfinity(), 0xFFFF, 0x8000000000000000), is(ENaN(), 0x7FFF, 0xFFFFFFFFFFFFFFFF),
+                is(ETwoPi(), 0x4001, 0xC90FDAA22168C000), is(EEpsilon(), 0x3FCB, 0x8000000000000000),
+                is(EEpsilonExt(), 0x3FC0, 0x8000000000000000), is(EEpsilonSgl(), 0x3FE8, 0x8000000000000000));
     const auto bits = [](auto x) {
         uint64 result = 0;
         std::memcpy(&result, &x, sizeof x);
@@ -242,16 +219,12 @@ TEST(FloatingPointConstants, BytesOfSpecialAndWidenedValues) {
 }
 
 TEST(FloatingPointConstants, Values) {
-    const std::tuple<const floatExt*, double> cases[] = {
-        {ERecipPi(), 1 / M_PI},      {EE(), M_E},
-        {ERecipE(), std::exp(-1.0)}, {Eln10(), M_LN10},
-        {EPlanck(), 6.6260693e-34},  {EElemChg(), 1.60217653e-19},
-        {ESpeedLt(), 299792458.0},   {EGravity(), 6.6742e-11},
-        {EAvgdro(), 6.0221415e23},   {ERydbrg(), 10973731.568525},
-        {EMlrGas(), 8.314472},       {ELnOfTwo(), M_LN2},
-        {ELogOfE(), M_LOG10E},       {ELnOfPi(), std::log(M_PI)},
-    };
-    for (const auto& [value, expected] : cases) EXPECT_EQ(ToExtended(*value), expected);
+    const auto value = [](const floatExt* constant) { return static_cast<double>(ToExtended(*constant)); };
+    EXPECT_EACH(value(ERecipPi()) == 1 / M_PI, value(EE()) == M_E, value(ERecipE()) == std::exp(-1.0),
+                value(Eln10()) == M_LN10, value(EPlanck()) == 6.6260693e-34, value(EElemChg()) == 1.60217653e-19,
+                value(ESpeedLt()) == 299792458.0, value(EGravity()) == 6.6742e-11, value(EAvgdro()) == 6.0221415e23,
+                value(ERydbrg()) == 10973731.568525, value(EMlrGas()) == 8.314472, value(ELnOfTwo()) == M_LN2,
+                value(ELogOfE()) == M_LOG10E, value(ELnOfPi()) == std::log(M_PI));
 }
 
 }  // namespace
