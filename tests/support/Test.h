@@ -1,6 +1,5 @@
 // What most tests need: GoogleTest with its matchers, the reports' recorder, and checks of several things in a row.
-#ifndef TESSEL_TESTS_SUPPORT_TEST_H
-#define TESSEL_TESTS_SUPPORT_TEST_H
+#pragma once
 
 #include "support/ReportRecorder.h"
 
@@ -26,6 +25,8 @@
 
 namespace tessel::test {
 
+using testing::AllOf, testing::Contains, testing::ElementsAre, testing::ElementsAreArray, testing::EndsWith,
+    testing::HasSubstr, testing::IsEmpty, testing::StartsWith;
 using Texts = std::vector<std::string>;
 
 // Runs work(0) to work(count - 1), each in a thread of its own, and waits for all.
@@ -122,4 +123,3 @@ struct Start {
 }  // namespace each
 }  // namespace tessel::test
 
-#endif
