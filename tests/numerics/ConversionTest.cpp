@@ -13,19 +13,16 @@
 
 namespace {
 
-using tessel::Extended;
-using tessel::FromExtended;
-using tessel::ToExtended;
-using tessel::test::ReportRecorder;
+using namespace tessel;
+using namespace tessel::test;
 
 constexpr double kNaN = std::numeric_limits<double>::quiet_NaN();
 
 TEST(NumericSupport, SizesAndClasses) {
     const int32 sizes[] = {0, 1, 2, 4, 8, 1, 2, 4, 8, 4, 8, 10, 8, 16, 20, 0};
     const int32 classes[] = {64, 0, 0, 0, 0, 1, 1, 1, 1, 2, 2, 2, 3, 3, 3, 64};
-    for (int16 code = 0; code < 16; ++code) {
+    for (int16 code = 0; code < 16; ++code)
         EXPECT_EACH(NumSize(code) == sizes[code], NumClass(static_cast<int16>(code + 16)) == classes[code]);
-    }
 }
 
 TEST(NumericSupport, ExtendedSizeIsSettable) {
@@ -93,8 +90,7 @@ Int Nearest(Extended x) {
     const auto minimum = static_cast<Extended>(std::numeric_limits<Int>::min());
     if (std::isnan(x) || x > maximum) return std::numeric_limits<Int>::max();
     if (x < minimum) return std::numeric_limits<Int>::min();
-    const Extended below = std::floor(x);
-    const Extended distance = x - below;
+    const Extended below = std::floor(x), distance = x - below;
     const bool up = distance > 0.5L || (distance == 0.5L && std::fmod(below, 2.0L) != 0);
     return static_cast<Int>(up ? below + 1 : below);
 }
@@ -118,10 +114,9 @@ TEST(ConvertNum, DoublesSaturateAndRoundHalvesToEven) {
         values.push_back(std::nextafter(limit, 0));
     }
     std::mt19937_64 random(31);
-    for (int i = 0; i < 20000; ++i) {
+    for (int i = 0; i < 20000; ++i)
         values.push_back(
             std::ldexp(static_cast<double>(static_cast<int64>(random())), -static_cast<int>(random() % 70)));
-    }
     std::vector<std::pair<int, double>> cases;  // whatever direction the host rounds in
     for (const double x : values) {
         for (const int direction : {FE_TONEAREST, FE_UPWARD, FE_DOWNWARD, FE_TOWARDZERO})
@@ -194,8 +189,7 @@ TEST(ConvertNum, BadArgumentsAreReportedAndStoreNothing) {
     ConvertNum(15, &value, kNumInt32, &value);
     ConvertNum(kNumInt32, nullptr, kNumInt32, &value);
     ConvertNum(kNumInt32, &value, kNumInt32, nullptr);
-    const std::string codes = "ConvertNum called with non-numeric";
-    const std::string data = "ConvertNum called with Empty Data";
+    const std::string codes = "ConvertNum called with non-numeric", data = "ConvertNum called with Empty Data";
     EXPECT_EACH(reports.Texts(4) == (std::vector<std::string>{codes, codes, codes, codes, codes, data, data}),
                 value == 7);
 }

@@ -9,9 +9,7 @@
 
 namespace {
 
-using tessel::Extended;
-using tessel::FromExtended;
-using tessel::ToExtended;
+using namespace tessel;
 
 void Push(Extended x) {
     const floatExt value = FromExtended(x);
@@ -151,9 +149,8 @@ constexpr int kDirections[] = {FE_TONEAREST, FE_UPWARD, FE_DOWNWARD, FE_TOWARDZE
 void ExpectStoredAsText(const PackedDecimal& record) {
     char text[64] = {record.sign != 0 ? '-' : '+'};
     char* at = text + 1;
-    for (int digit = 17; digit >= 0; --digit) {
+    for (int digit = 17; digit >= 0; --digit)
         *at++ = static_cast<char>('0' + (record.mantissa[digit / 2] >> (digit % 2 * 4) & 15));
-    }
     std::snprintf(at, 16, "e%d", record.exponent);
     FPLoadPDR(&record);
     EXPECT_EQ(Pop(), std::strtold(text, nullptr)) << text;
@@ -220,12 +217,10 @@ TEST_F(Registers, NarrowStoresRoundAsTheHost) {
         const auto mantissa = static_cast<Extended>((random() | uint64{1} << 63) & mask);
         const Extended sign = random() % 2 != 0 ? 1 : -1;
         const int exponent = static_cast<int>(random() % 64);
-        for (const int end : {1024 - 32, -1022 - 62}) {
+        for (const int end : {1024 - 32, -1022 - 62})
             ExpectStoredAsTheHost<double>(sign * std::scalbn(mantissa, end + exponent - 63), FPStoreFlt64);
-        }
-        for (const int end : {128 - 32, -126 - 33}) {
+        for (const int end : {128 - 32, -126 - 33})
             ExpectStoredAsTheHost<float>(sign * std::scalbn(mantissa, end + exponent - 63), FPStoreFlt32);
-        }
     }
     std::fesetround(FE_TONEAREST);
 }
