@@ -3,11 +3,8 @@
 
 #include <new>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using test::ReportRecorder;
-using test::Texts;
 
 std::string theLog;  // "+A -A": A was started, then stopped
 
@@ -30,8 +27,7 @@ public:
     void Needs(IServiceObject* service) { needs_.push_back(service); }
 
     static constexpr MgErr kThrows = -99;
-    MgErr initResult = kNoErr;
-    MgErr uninitResult = kNoErr;
+    MgErr initResult = kNoErr, uninitResult = kNoErr;
 
 private:
     const char* name_;
@@ -76,9 +72,11 @@ TEST_F(ServiceRegistryTest, StartsDependenciesFirstAndStopsInReverse) {
     EXPECT_EQ(Texts{}, recorder.Texts());
 }
 
-TEST_F(ServiceRegistryTest, OfThoseReadyTheFirstRegisteredGoesFirst) {
+TEST_F(ServiceRegistryTest, OfThoseReadyTheFirstRegisteredGoesFirstAndOnce) {
     Service d("D"), e("E", {&d, &d});
-    const Registry registry = MakeRegistry({&e, &a, &d, &free, &b, &c});
+    const Registry registry = MakeRegistry({&e, &a, &d, &free, &b, &c, &c});
+    EXPECT_EQ(Texts{"ServiceRegistry: A service has already been registered that has the name \"C\"."},
+              recorder.Texts(kDebugFatal));
     EXPECT_EACH(registry->InitServices() == kNoErr, theLog == "+D +E +F +C +B +A ");
     registry->UninitServices();
 }
@@ -120,18 +118,8 @@ TEST_F(ServiceRegistryTest, AServiceCannotChangeARegistryThatIsStartingIt) {
                 meddler.calls == 3);
 }
 
-TEST_F(ServiceRegistryTest, AServiceThatStandsTwiceIsHeldOnce) {
-    const Registry registry = MakeRegistry({&c, &c});
-    EXPECT_EQ(Texts{"ServiceRegistry: A service has already been registered that has the name \"C\"."},
-              recorder.Texts(kDebugFatal));
-    registry->InitServices();
-    registry->UninitServices();
-    EXPECT_EQ("+C -C ", theLog);
-}
-
 TEST_F(ServiceRegistryTest, ADependencyMayRunInAnotherRegistry) {
-    const Registry lower = MakeRegistry({&c});
-    const Registry upper = MakeRegistry({&free, &b});
+    const Registry lower = MakeRegistry({&c}), upper = MakeRegistry({&free, &b});
     const Texts missing = {"ServiceRegistry: Service \"B\" has a dependency \"C\" that does not exist!"};
     EXPECT_EACH(upper->InitServices() == kNoErr, missing == recorder.Texts(kDebugFatal));
     EXPECT_EQ("", theLog) << "nothing is started";
@@ -166,25 +154,21 @@ TEST_F(ServiceRegistryTest, ACycleDropsTheRegistrationsButStartsTheOthers) {
     EXPECT_EACH(registry->UninitServices() == kNoErr, theLog == "+F -F ");
 }
 
-TEST_F(ServiceRegistryTest, AFailedStartStaysHalfWay) {
-    Service s1("1"), s2("2"), s3("3"), s4("4");
-    s3.initResult = 77;
-    const Registry registry = MakeRegistry({&s1, &s2, &s3, &s4});
-    EXPECT_EACH(registry->InitServices() == 77,
-                recorder.Texts(kDebugInfo) == Texts{"ServiceRegistry: Service 3 init failed with error 77"},
-                registry->AddService(&a) == kGenericErr, registry->UninitServices() == kNoErr,
-                theLog == "+1 +2 +3 -2 -1 ");
-}
-
-TEST_F(ServiceRegistryTest, AFailedStopCanBeTriedAgain) {
+TEST_F(ServiceRegistryTest, AFailedStartStaysHalfWayAndAFailedStopCanBeTriedAgain) {
+    b.initResult = 77;
+    const Registry registry = MakeRegistry({&a, &b, &c, &free});
+    EXPECT_EACH(registry->InitServices() == 77, registry->AddService(&free) == kGenericErr,
+                registry->UninitServices() == kNoErr, theLog == "+C +B -C ");
+    b.initResult = kNoErr;
     b.uninitResult = 9;
-    const Registry registry = MakeRegistry({&a, &b, &c});
-    registry->InitServices();
-    EXPECT_EACH(registry->UninitServices() == 9,
-                recorder.Texts(kDebugInfo) == Texts{"ServiceRegistry: Service B uninit failed with error 9"},
+    theLog.clear();
+    EXPECT_EACH(registry->InitServices() == kNoErr, registry->UninitServices() == 9,
                 registry->AddService(&free) == kGenericErr);
     b.uninitResult = kNoErr;
-    EXPECT_EACH(registry->UninitServices() == kNoErr, theLog == "+C +B +A -A -B -B -C ");
+    EXPECT_EACH(registry->UninitServices() == kNoErr, theLog == "+C +B +A +F -F -A -B -B -C ");
+    EXPECT_EQ((Texts{"ServiceRegistry: Service B init failed with error 77",
+                     "ServiceRegistry: Service B uninit failed with error 9"}),
+              recorder.Texts(kDebugInfo));
 }
 
 TEST_F(ServiceRegistryTest, DependencyListRefusesNullTooManyAndOutOfRange) {
@@ -241,4 +225,4 @@ TEST(RefcountedServiceObject, TheFirstUseStartsAndTheLastEnds) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test
