@@ -86,11 +86,11 @@ TEST(StringCPStr, EditsLikeAVector) {
 }
 
 TEST(StringCPStr, ComparesAndSearches) {
-    CPStrHandle a = NewCPStr({"one", "Two"});
-    CPStrHandle b = NewCPStr({"one", "two", "three"});
+    CPStrHandle a = NewCPStr({"one", "Two"}), b = NewCPStr({"one", "two", "three"});
     EXPECT_EACH('T' - 't' == CPStrCmp(*a, *b), !CPStrEqual(*a, *b), CPStrReplace(a, P("two"), 1) == kNoErr,
                 CPStrCmp(*a, *b) == -1, CPStrRemove(b, 2) == kNoErr, CPStrEqual(*a, *b),
-                CPStrSearch(a, P("TWO"), PStrCaseCmp) == 1, CPStrSearch(a, P("TWO"), PStrCmp) == -1);
+                CPStrSearch(a, P("TWO"), PStrCaseCmp) == 1, CPStrSearch(a, P("TWO"), PStrCmp) == -1,
+                CPStrSearch(nullptr, P("x"), PStrCmp) == -1, CPStrSearch(a, P("x"), nullptr) == -1);
     Dispose(a);
     Dispose(b);
 
@@ -131,10 +131,9 @@ TEST(StringCLStr, KeepsASortedList) {
     CLStrHandle list = NewCLStr();
     int32 index = -1;
     bool inserted = false;
-    for (CStr text : {"m", "c", "x", "d"}) {
+    for (CStr text : {"m", "c", "x", "d"})
         EXPECT_EACH(CLStrInsertSort(list, *L(text), false, &index, &inserted, false) == kNoErr, inserted,
                     text == TextOf(CLStrIndex(*list, index)));
-    }
     Texts texts;
     for (int32 i = 0; i < (*list)->count; ++i) texts.push_back(TextOf(CLStrIndex(*list, i)));
     EXPECT_EACH(texts == (Texts{"c", "d", "m", "x"}),

@@ -35,7 +35,7 @@ TEST(OVHandle, ResizesAFieldInPlace) {
     EXPECT_TRUE(reports.Has(kDebugFatal, "Can't attach to non null OVHandle."));
     DSDisposeHandle(held);
     OVHandle moved(std::move(handle));
-    EXPECT_EACH(moved.Size() == 1u, moved.Resize(0) == kNoErr, moved.Handle() == nullptr);
+    EXPECT_EACH(moved.Size() == 1u, moved.Resize(0) == kNoErr, moved.Handle() == nullptr, moved.Size() == 0u);
 }
 
 TEST(OVString, OwnsAText) {
@@ -50,7 +50,12 @@ TEST(OVString, OwnsAText) {
     EXPECT_EACH(p.Text() == "ab", text.Size() == 6u, text.Resize(0) == kNoErr, text.LHandle() == nullptr,
                 text.Resize(-1) == kArgErr);
     ReportRecorder reports;
-    text.CopyToCStr(buffer, 0);
+    char one[] = "x";
+    text.CopyToCStr(one, 0);
+    text.CopyToCStr(one + 1, 1);
+    EXPECT_EQ('x', one[0]);
+    text.CopyToCStr(one, 1);
+    EXPECT_EQ(0, one[0]);
     EXPECT_TRUE(reports.Has(kDebugError, "Bad Arg"));
     va_list none = {};
     EXPECT_EACH(OVSubStringPrintf(nullptr, false, "x", none) == kArgErr, reports.Has(kDebugError, "Bad string ptr"));
@@ -165,7 +170,9 @@ TEST(OVSubString, Compares) {
     EXPECT_EACH(OVSubString("").CompareCStr("abc") == -1, OVSubString("").CompareCStr("") == 0,
                 OVSubString("abc").CompareCStr("") == 1, OVSubString("abc").CompareCStr("abd") == -1,
                 OVSubString("abc").CompareCStr("ab") == 1, 'A' - 'a' == OVSubString("A").Compare("a", 1),
-                OVSubString("ABC").CompareNC(OVSubString("abc")) == 0, OVSubString("ABC").CompareNCCStr("abd") == -1);
+                OVSubString("ABC").CompareNC(OVSubString("abc")) == 0, OVSubString("ABC").CompareNCCStr("abd") == -1,
+                OVSubString("").CompareNCCStr("a") == -1, OVSubString("").CompareNCCStr("") == 0,
+                OVSubString("a").CompareNCCStr("") == 1, OVSubString("b").CompareNCCStr("A") == 1);
 }
 
 TEST(OVSubString, Searches) {
@@ -173,7 +180,8 @@ TEST(OVSubString, Searches) {
     EXPECT_EACH(text.FindFirstOfCStr(" t", 0) == 3, text.FindFirstOf(OVSubString(" t"), 4) == 4,
                 text.FindFirstOfCStr("xyz", 0) == -1, text.FindFirstOfCStr("", 0) == -1,
                 text.SearchCStr("one", -4) == 0, text.SearchCStr("one", 1) == -1, text.SearchNCCStr("one", 1) == 8,
-                text.SearchNCCStr("ones", 8) == -1, text.SearchCStr("", 0) == -1, text.SearchCStr("one", 100) == -1);
+                text.SearchNCCStr("ones", 8) == -1, OVSubString("abcd", 2).SearchNCCStr("cd", 0) == -1,
+                text.SearchCStr("", 0) == -1, text.SearchCStr("one", 100) == -1);
 }
 
 TEST(OVSubString, SearchReplaceMayUseItsOwnText) {

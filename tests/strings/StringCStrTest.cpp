@@ -10,10 +10,8 @@ namespace {
 
 TEST(StringCStr, ComparesByTheFirstDifference) {
     const struct {
-        CStr a;
-        CStr b;
-        int32 exact;
-        int32 noCase;
+        CStr a, b;
+        int32 exact, noCase;
     } kCases[] = {
         {"abc", "abc", 0, 0},
         {"abc", "abd", -1, -1},
@@ -49,10 +47,9 @@ TEST(StringCStr, OrdersWithoutCaseAsTheSystemDoes) {
 
 TEST(StringCStr, CopiesAndPads) {
     char text[8] = "1234567";
-    EXPECT_EACH(text == StrNCpy(text, "ab", 4), std::memcmp(text,
-                                                            "ab\0\0"
-                                                            "567",
-                                                            8) == 0);
+    EXPECT_EACH(text == StrNCpy(text, "ab", 4), std::string(text, 8) == std::string("ab\0\0"
+                                                                                    "567\0",
+                                                                                    8));
     StrNCpy(text, "xyz", 2);
     EXPECT_STREQ("xy", text);
     StrNCpy(text, "q", 0);

@@ -184,8 +184,7 @@ TEST(StringFmtPrint, AgreesWithTheCLibrary) {
         const long long value = pick(2) ? bits : -bits;
         const int last = static_cast<int>(value);
         const char* text = kTexts[pick(4)];
-        char expected[200];
-        char actual[200];
+        char expected[200], actual[200];
         const auto size = static_cast<int32>(1 + pick(120));
         const auto check = [&](auto argument) {
             const int full = std::snprintf(expected, static_cast<size_t>(size), theirs.c_str(), argument, last);

@@ -10,10 +10,8 @@ namespace {
 // PStrs compare by the same rules.
 TEST(StringLStr, ComparesWithNullAsEmpty) {
     const struct {
-        CStr a;  // null: a null pointer
-        CStr b;
-        int32 exact;
-        int32 noCase;
+        CStr a, b;  // null: a null pointer
+        int32 exact, noCase;
     } kCases[] = {{nullptr, "", 0, 0},
                   {"", nullptr, 0, 0},
                   {nullptr, nullptr, 0, 0},
@@ -27,10 +25,9 @@ TEST(StringLStr, ComparesWithNullAsEmpty) {
                   {"B", "a", 'B' - 'a', 1},
                   {"same", "same", 0, 0},
                   {"SAME", "same", 'S' - 's', 0},
-                  {"long enough for words A", "long enough for words a", 'A' - 'a', 0}};
+                  {"a text of words A", "a text of words a", 'A' - 'a', 0}};
     for (const auto& c : kCases) {
-        uint8 aRoom[64];
-        uint8 bRoom[64];
+        uint8 aRoom[64], bRoom[64];
         auto* a = reinterpret_cast<LStrPtr>(aRoom);
         auto* b = reinterpret_cast<LStrPtr>(bRoom);
         CToLStr(c.a, a);
@@ -43,10 +40,8 @@ TEST(StringLStr, ComparesWithNullAsEmpty) {
         EXPECT_EACH(c.exact == PtrLenStrCmp(aBytes, a->count, bBytes, b->count),
                     c.noCase == PtrLenStrCaseCmp(aBytes, a->count, bBytes, b->count));
         if (!c.a || !c.b) continue;
-        P pa(c.a);
-        P pb(c.b);
-        ConstPStr aText = pa;
-        ConstPStr bText = pb;
+        P pa(c.a), pb(c.b);
+        ConstPStr aText = pa, bText = pb;
         EXPECT_EACH(c.exact == PLStrCmp(pa, b), c.noCase == PLStrCaseCmp(pa, b), c.exact == PPStrCmp(&aText, &bText),
                     c.noCase == PPStrCaseCmp(&aText, &bText), (c.exact == 0) == PPStrEqual(&aText, &bText),
                     (c.noCase == 0) == PPStrCaseEqual(&aText, &bText));

@@ -3,7 +3,7 @@
 #include <tessel/diagnostics/FileLoc.h>
 #include <tessel/strings/StringOutput.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 // Gathers what is printed; a print may print again, as a report raised meanwhile would.
@@ -90,4 +90,4 @@ TEST(StringOutput, FileThatCannotBeOpenedPrintsNothing) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -30,7 +30,10 @@ TEST(StringPStr, Terminates) {
     uint8 text[257];
     std::fill(std::begin(text), std::end(text), 'x');
     text[0] = 2;
-    EXPECT_EACH(PStrNullTerminate(text) == 2, text[3] == 0);
+    EXPECT_EACH(PStrNullTerminate(text) == 2, text[3] == 0, PStrNullTerminate(nullptr) == 0,
+                PStrTerminateIfPossible(nullptr) == 0, PStrCmp(P("a"), nullptr) == 1, PStrCmp(nullptr, P("a")) == -1,
+                PStrCaseCmp(P("a"), nullptr) == 1, PStrCaseCmp(nullptr, nullptr) == 0, PStrEndsWith(nullptr, ""),
+                !PStrEndsWith(nullptr, "a"));
     text[0] = 255;
     EXPECT_EACH(PStrTerminateIfPossible(text) == 255, text[255] == 'x', PStrNullTerminate(text) == 255, text[255] == 0,
                 text[0] == 255, text[256] == 'x');
@@ -49,24 +52,15 @@ TEST(StringPStr, Searches) {
 }
 
 TEST(StringPStr, SplitsAtTheFirstUnescapedCharacter) {
-    const struct {
-        CStr text;
-        bool split;
-        CStr left;
-        CStr right;
-    } kCases[] = {{"a\\,b,c", true, "a,b", "c"}, {"a,b,c", true, "a", "b,c"}, {",b", true, "", "b"},
-                  {"a,", true, "a", ""},         {"abc", false, "abc", ""},   {"a\\,b", false, "a,b", ""},
-                  {"", false, "", ""},           {"a\\b,", true, "a\\b", ""}};
-    for (const auto& c : kCases) {
-        P left("junk");
-        P right("junk");
-        EXPECT_EQ(c.split, PStrSplitAtChar(P(c.text), ',', left, right)) << c.text;
-        EXPECT_EACH(c.left == left.Text(), c.right == right.Text());
-    }
-    P left;
-    P text("one,and more");
-    EXPECT_TRUE(PStrSplitAtChar(text, ',', left, text));  // over its own rest
-    EXPECT_EQ("and more", text.Text());
+    const auto split = [](CStr text) {
+        P first("junk"), second("junk");
+        const bool found = PStrSplitAtChar(P(text), ',', first, second);
+        return first.Text() + (found ? "|" : "!") + second.Text();
+    };
+    EXPECT_EACH(split("a\\,b,c") == "a,b|c", split("a,b,c") == "a|b,c", split(",b") == "|b", split("a,") == "a|",
+                split("abc") == "abc!", split("a\\,b") == "a,b!", split("") == "!", split("a\\b,") == "a\\b|");
+    P left, text("one,and more");
+    EXPECT_EACH(PStrSplitAtChar(text, ',', left, text), text.Text() == "and more");  // over its own rest
 }
 
 TEST(StringPStr, Replaces) {
