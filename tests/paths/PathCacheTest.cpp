@@ -5,10 +5,9 @@
 #include "support/Test.h"
 #include <tessel/paths/PathCachedItem.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
-using namespace test;
 using Item = PathRef::CachedItem;
 
 // Counts those that live.
@@ -198,4 +197,4 @@ TEST_F(PathCache, DebugModeShowsTheText) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

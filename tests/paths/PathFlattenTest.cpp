@@ -5,10 +5,9 @@
 #include <tessel/streams/BinDataReader.h>
 #include <tessel/streams/BinDataWriter.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
-using namespace test;
 using std::string_literals::operator""s;
 
 class PathFlatten : public PathTest {
@@ -35,19 +34,16 @@ protected:
 };
 
 TEST_F(PathFlatten, BytesOfBothFormats) {
-    const std::pair<PathRef, std::string> rows[] = {
-        {Abs({"C", "dir"}), "PTH0\0\0\0\12\0\0\0\2\1C\3dir"s},
-        {Rel({"..", "a"}), "PTH0\0\0\0\7\0\1\0\2\0\1a"s},
-        {Unc({"s"}), "PTH0\0\0\0\6\0\3\0\1\1s"s},
-        {PathRef(), "PTH0\0\0\0\4\0\2\0\0"s},
-        {Abs({}), "PTH0\0\0\0\4\0\0\0\0"s},
-        {Abs({"C", "\xC3\xA9"}), "PTH1\0\0\0\13abs \0\1C\0\2\xC3\xA9"s},
-        {Rel({"..", "\xC3\xA9"}), "PTH1\0\0\0\12rel \0\0\0\2\xC3\xA9"s},
-    };
-    for (const auto& [path, bytes] : rows) {
+    const std::pair<PathRef, std::string> rows[] = {{Abs({"C", "dir"}), "PTH0\0\0\0\12\0\0\0\2\1C\3dir"s},
+                                                    {Rel({"..", "a"}), "PTH0\0\0\0\7\0\1\0\2\0\1a"s},
+                                                    {Unc({"s"}), "PTH0\0\0\0\6\0\3\0\1\1s"s},
+                                                    {PathRef(), "PTH0\0\0\0\4\0\2\0\0"s},
+                                                    {Abs({}), "PTH0\0\0\0\4\0\0\0\0"s},
+                                                    {Abs({"C", "\xC3\xA9"}), "PTH1\0\0\0\13abs \0\1C\0\2\xC3\xA9"s},
+                                                    {Rel({"..", "\xC3\xA9"}), "PTH1\0\0\0\12rel \0\0\0\2\xC3\xA9"s}};
+    for (const auto& [path, bytes] : rows)
         EXPECT_EACH(bytes == Flattened(path), Show(path) == Unflattened(bytes),
                     bytes.size() == path.FlattenedSize(bytes[3] == '0' ? PathRef::kPTH0 : PathRef::kPTH1));
-    }
     char block[64];
     StaticOutputBuf buffer(block, sizeof block);
     uint32 size;
@@ -145,4 +141,4 @@ TEST_F(PathFlatten, PathsInStreams) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

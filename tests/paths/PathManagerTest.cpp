@@ -3,18 +3,13 @@
 #include "support/Test.h"
 #include <tessel/memory/MemoryManager.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using namespace test;
 
 class PathManagerFlat : public PathTest {
 protected:
     static constexpr ConstPStr kEnd = nullptr;
-    PathRef abs_ = Abs({"C", "dir"});
-    PathRef rel_ = Rel({"..", "x"});
-    PathRef none_;
-    PathRef null_{PathRef::kNullPath};
+    PathRef abs_ = Abs({"C", "dir"}), rel_ = Rel({"..", "x"}), none_, null_{PathRef::kNullPath};
     PathRef bareUnc_{PathRef::kUNC};
 };
 
@@ -91,8 +86,7 @@ TEST_F(PathManagerFlat, Types) {
 }
 
 TEST_F(PathManagerFlat, Comparing) {
-    PathRef ab = Abs({"a", "b"}), AB = Abs({"A", "B"}), ac = Abs({"a", "c"}), xb = Abs({"x", "q", "b"});
-    PathRef bare = Abs({});
+    PathRef ab = Abs({"a", "b"}), AB = Abs({"A", "B"}), ac = Abs({"a", "c"}), xb = Abs({"x", "q", "b"}), bare = Abs({});
     const struct {
         Path a, b;
         std::vector<int32> equalExactLexicalCmpTail;
@@ -145,4 +139,4 @@ TEST_F(PathManagerFlat, TheTextsOfTheHostAreTwoPairs) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -6,26 +6,18 @@
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathCachedItem.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
-using namespace test;
 using PathModel = PathTest;
 using Item = PathRef::CachedItem;
 
 TEST_F(PathModel, AppendingStepsUpWhereItCan) {
-    const struct {
-        PathRef path;
-        const char* shown;
-    } rows[] = {{Rel({"a", "..", "b"}), "rel:b"},
-                {Rel({".."}), "rel:^"},
-                {Rel({"..", "..", "a"}), "rel:^/^/a"},
-                {Rel({"..", "..", "a", ""}), "rel:^/^"},
-                {Rel({"a", ".", "b", ""}), "rel:a"},
-                {Abs({"C", ".."}), "abs:"},
-                {Abs({"C", "x"}).Append(Rel({"..", "..", "D"})), "abs:D"},
-                {Rel({"a"}).Append(Rel({"..", "..", "b"})), "rel:^/b"}};
-    for (const auto& row : rows) EXPECT_EQ(row.shown, Show(row.path));
+    EXPECT_EACH(Show(Rel({"a", "..", "b"})) == "rel:b", Show(Rel({".."})) == "rel:^",
+                Show(Rel({"..", "..", "a"})) == "rel:^/^/a", Show(Rel({"..", "..", "a", ""})) == "rel:^/^",
+                Show(Rel({"a", ".", "b", ""})) == "rel:a",
+                Show(Abs({"C", ".."})) == "abs:", Show(Abs({"C", "x"}).Append(Rel({"..", "..", "D"}))) == "abs:D",
+                Show(Rel({"a"}).Append(Rel({"..", "..", "b"}))) == "rel:^/b");
     EXPECT_EACH(
         Rel({"..", "..", "a"}).CountUpDir() == 2, CodeOf([] { PathRef(PathRef::kNullPath).Append("a"); }) == kArgErr,
         CodeOf([] { PathRef().Append(".."); }) == kArgErr, CodeOf([] { Abs({"C"}).Append(Abs({"C"})); }) == kArgErr,
@@ -33,9 +25,7 @@ TEST_F(PathModel, AppendingStepsUpWhereItCan) {
 }
 
 TEST_F(PathModel, TheSameNamesAreTheSameElement) {
-    const PathRef a = Abs({"C", "dir", "file"});
-    const PathRef b = Abs({"C", "dir", "file"});
-    const PathRef otherCase = Abs({"C", "Dir", "file"});
+    const PathRef a = Abs({"C", "dir", "file"}), b = Abs({"C", "dir", "file"}), otherCase = Abs({"C", "Dir", "file"});
     EXPECT_EACH(PathRefAccess::Element(a) == PathRefAccess::Element(b),
                 PathRefAccess::Element(a) != PathRefAccess::Element(otherCase),
                 a.Equals(otherCase, PathRef::kIgnoreCase), !a.Equals(otherCase, PathRef::kExact),
@@ -51,9 +41,8 @@ TEST_F(PathModel, NamesByIndex) {
     PathRef path = Abs({"C", "dir", "file"});
     EXPECT_EQ((std::vector<std::string>{"C", "file", "C", "file"}),
               (std::vector<std::string>{path.ItemAt(0), path.ItemAt(-1), path.ItemAt(-3), path.Name()}));
-    for (int32 bad : {3, -4, INT32_MAX, INT32_MIN}) {
+    for (int32 bad : {3, -4, INT32_MAX, INT32_MIN})
         EXPECT_EACH(CodeOf([&] { path.ItemAt(bad); }) == kArgErr, CodeOf([&] { path.Replace(bad, "x"); }) == kArgErr);
-    }
     path.Replace(-2, "other");
     EXPECT_EQ("abs:C/other/file", Show(path));
     path.Replace(0, "D");
@@ -66,25 +55,16 @@ TEST_F(PathModel, NamesByIndex) {
 
 TEST_F(PathModel, Comparison) {
     const PathRef notAPath;
-    const struct {
-        PathRef a, b;
-        int32 exact, ignoringCase;
-    } rows[] = {
-        {Abs({"a"}), Abs({"a"}), 0, 0},
-        {Abs({"a", "c", "x"}), Abs({"a", "b"}), 2, 2},
-        {Abs({"a"}), Abs({"a", "b"}), -2, -2},
-        {Abs({"a", "b"}), Abs({"a"}), 2, 2},
-        {Unc({"s"}), Abs({"s"}), -1, -1},
-        {Rel({"s"}), Abs({"s"}), 1, -1},
-        {PathRef(PathRef::kNullPath), Rel({}), 1, -1},
-        {notAPath, Abs({}), 1, 1},
-        {Abs({}), notAPath, -1, -1},
-        {notAPath, notAPath, 0, 0},
+    const auto compared = [](const PathRef& a, const PathRef& b) {
+        return std::pair(a.Compare(b, PathRef::kExact), a.Compare(b, PathRef::kIgnoreCase));
     };
-    for (const auto& row : rows) {
-        EXPECT_EQ(row.exact, row.a.Compare(row.b, PathRef::kExact)) << Show(row.a) << " " << Show(row.b);
-        EXPECT_EQ(row.ignoringCase, row.a.Compare(row.b, PathRef::kIgnoreCase)) << Show(row.a) << " " << Show(row.b);
-    }
+    const auto both = [](int32 exact, int32 ignoringCase) { return std::pair(exact, ignoringCase); };
+    EXPECT_EACH(
+        compared(Abs({"a"}), Abs({"a"})) == both(0, 0), compared(Abs({"a", "c", "x"}), Abs({"a", "b"})) == both(2, 2),
+        compared(Abs({"a"}), Abs({"a", "b"})) == both(-2, -2), compared(Abs({"a", "b"}), Abs({"a"})) == both(2, 2),
+        compared(Unc({"s"}), Abs({"s"})) == both(-1, -1), compared(Rel({"s"}), Abs({"s"})) == both(1, -1),
+        compared(PathRef(PathRef::kNullPath), Rel({})) == both(1, -1), compared(notAPath, Abs({})) == both(1, 1),
+        compared(Abs({}), notAPath) == both(-1, -1), compared(notAPath, notAPath) == both(0, 0));
     EXPECT_EACH(Rel({}).Compare(Unc({"s"}), PathRef::kIgnoreCase3) == 1,
                 PathRef::NameEquals("a", "A", static_cast<PathRef::ComparePolicy>(9)),
                 reports_.Has(2, "Unexpected PathRef::ComparePolicy"),
@@ -247,4 +227,4 @@ TEST_F(PathModel, ThreadsShareElements) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

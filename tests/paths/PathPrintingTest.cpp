@@ -4,10 +4,8 @@
 #include <tessel/strings/CPStrList.h>
 #include <tessel/strings/StringFmtPrint.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using namespace test;
 
 class PathPrinting : public PathTest {
 protected:
@@ -33,8 +31,7 @@ TEST_F(PathPrinting, PrintsDisplayText) {
 }
 
 TEST_F(PathPrinting, ListsCompareAsFileNames) {
-    CPStrList a;
-    CPStrList b;
+    CPStrList a, b;
     for (const char* name : {"Dir", "FILE"}) EXPECT_EQ(kNoErr, a.Insert(PStrOf(name), -1));
     for (const char* name : {"dir", "file"}) EXPECT_EQ(kNoErr, b.Insert(PStrOf(name), -1));
     EXPECT_EACH(a.EqualFS(b), !a.Equal(b), b.Insert(PStrOf("more"), -1) == kNoErr, !a.EqualFS(b), a.EqualNEltsFS(b, 2),
@@ -42,4 +39,4 @@ TEST_F(PathPrinting, ListsCompareAsFileNames) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test
