@@ -3,12 +3,8 @@
 #include <tessel/memory/CookieManager.h>
 #include <tessel/memory/MemoryManager.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::ElementsAreArray;
-using ::testing::EndsWith;
 
 struct Cookies : ::testing::Test {
     test::StartedMemory memory;
@@ -47,11 +43,10 @@ TEST_F(Cookies, AreRefusedOnceTheyAreStale) {
 
     void* untouched = Info(1);
     void** place = &untouched;
-    for (MagicCookie stale : {first, 0u, IndexOf(second), third + 100, third ^ 0x00100000}) {
+    for (MagicCookie stale : {first, 0u, IndexOf(second), third + 100, third ^ 0x00100000})
         EXPECT_EACH(!MCIsACookie(jar, stale), MCGetCookieInfo(jar, stale, &untouched) == kArgErr,
                     MCSetCookieInfo(jar, stale, &info) == kArgErr, MCDisposeCookie(jar, stale, &untouched) == kArgErr,
                     MCGetCookieInfoPtr(jar, stale, reinterpret_cast<void**>(&place)) == kArgErr, place == nullptr);
-    }
     EXPECT_EACH(Info(1) == untouched, MCGetCookieInfoPtr(jar, third, reinterpret_cast<void**>(&place)) == kNoErr,
                 other == *place, third == MCGetCookieForInfo(jar, &other),
                 MCSetCookieInfo(jar, third, &info) == kNoErr);
@@ -96,8 +91,7 @@ TEST_F(Cookies, AreListedByIndex) {
 }
 
 TEST_F(Cookies, JarsReportTheirSize) {
-    constexpr uint32 kPointer = sizeof(void*);
-    constexpr uint32 kRecord = kPointer == 4 ? 36 : 48, kEntry = kPointer == 4 ? 16 : 24;
+    constexpr uint32 kPointer = sizeof(void*), kRecord = kPointer == 4 ? 36 : 48, kEntry = kPointer == 4 ? 16 : 24;
     uint32 size = kRecord + (16 + 32 + 32) * kPointer + 64 * kEntry;
     EXPECT_EQ(kPointer == 4 ? 1380u : 2224u, size);
     for (uint32 n : {1u, 2u}) {
@@ -146,7 +140,8 @@ TEST_F(Cookies, CarryRights) {
 TEST_F(Cookies, FillLists) {
     CookieList list;
     EXPECT_EACH(list.SetCount(-1) == kArgErr, list.SetCookie(0, 5) == kArgErr, list.SetCount(2) == kNoErr,
-                list.SetCookie(1, 7) == kNoErr, list.SetCount(3) == kNoErr);
+                list.SetCookie(1, 7) == kNoErr, list.SetCount(3) == kNoErr, list.SetCookie(2, 9) == kNoErr,
+                list.SetCount(2) == kNoErr, list.SetCount(3) == kNoErr);
     EXPECT_THAT(
         (std::vector{list.GetCookie(0), list.GetCookie(1), list.GetCookie(2), list.GetCookie(3), list.GetCookie(-1)}),
         ElementsAre(0, 7, 0, 0, 0));
@@ -173,15 +168,15 @@ TEST_F(Cookies, AreNotEndedByThoseWhoComeTooLate) {
         while (!done)
             if (MagicCookie cookie = offered; jar.AcquireCookieRights(cookie, nullptr)) jar.ReleaseCookieRights(cookie);
     };
-    std::vector<std::thread> threads;
-    for (int i = 0; i < kLate; ++i) threads.emplace_back(comeLate);
     int lost = 0;
-    for (int i = 0; i < kRounds; ++i) {
-        offered = jar.NewCookie(nullptr);
-        lost += jar.DisposeCookie(offered) != kNoErr;
-    }
-    done = true;
-    for (std::thread& thread : threads) thread.join();
+    InThreads(kLate + 1, [&](int thread) {
+        if (thread > 0) return comeLate();
+        for (int i = 0; i < kRounds; ++i) {
+            offered = jar.NewCookie(nullptr);
+            lost += jar.DisposeCookie(offered) != kNoErr;
+        }
+        done = true;
+    });
     EXPECT_EQ(0, lost);
     jar.Uninit();
 }
@@ -215,9 +210,7 @@ TEST_F(Cookies, AreSafeBetweenThreads) {
             release(cookie);
         }
     };
-    std::vector<std::thread> threads;
-    for (int i = 0; i < kThreads; ++i) threads.emplace_back(work, i);
-    for (std::thread& thread : threads) thread.join();
+    InThreads(kThreads, work);
     EXPECT_EACH(wrong == 0, kThreads * kRounds == ended);
     int32 left = -1;
     jar.GetNumCookies(&left);
@@ -226,4 +219,4 @@ TEST_F(Cookies, AreSafeBetweenThreads) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

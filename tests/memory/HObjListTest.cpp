@@ -3,11 +3,8 @@
 #include <tessel/memory/HObjList.h>
 #include <tessel/memory/MemoryManager.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::ElementsAreArray;
 
 struct ObjList : ::testing::Test {
     test::StartedMemory memory;
@@ -101,4 +98,4 @@ TEST_F(ObjList, ReportsWhatIsWrong) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

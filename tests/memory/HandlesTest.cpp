@@ -2,13 +2,11 @@
 #include "memory/Heap.h"
 #include "support/StartedMemory.h"
 #include "support/Test.h"
+#include <tessel/base/MGPlacementNew.h>
 #include <tessel/memory/MemoryManager.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 
 struct Tracking {
     explicit Tracking(bool on) { SetAllocTracking(on); }
@@ -88,9 +86,7 @@ TEST_P(Handles, KeepTheirBytesAndAlignmentThroughResizes) {
             size_t kept = std::min<size_t>(model.size(), size);
             std::string now = Content(h);
             ASSERT_EQ(model.substr(0, kept), now.substr(0, kept));
-            if (clear) {
-                ASSERT_EQ(std::string(size - kept, '\0'), now.substr(kept));
-            }
+            ASSERT_TRUE(!clear || now.substr(kept) == std::string(size - kept, '\0'));
             for (size_t at = kept; at < size; ++at) (*h)[at] = static_cast<uint8>(random());
             model = Content(h);
         }
@@ -239,9 +235,16 @@ TEST_P(Handles, AreRecoveredAtTheStop) {
     Make("twelve bytes");
     DSDisposeHandle(Make("gone"));
     Make("abc");
+    int ended = 0;
+    struct Singleton {
+        int& count;
+        ~Singleton() { ++count; }
+    };
+    alignas(Singleton) char place[sizeof(Singleton)];
+    MGPlacementNewRegisterDeletor(new MGPlacementDelete<Singleton>(new (place) Singleton{ended}));
     EXPECT_TRUE(GetMemoryManagerInitialized());
     memory.Stop();
-    EXPECT_FALSE(GetMemoryManagerInitialized());
+    EXPECT_EACH(!GetMemoryManagerInitialized(), ended == 1);
     EXPECT_THAT(memory.reports.Texts(),
                 ::testing::Contains(::testing::EndsWith("2 Handle Leaks (0 expected)")).Times(GetParam()));
     EXPECT_TRUE(memory.reports.Has(kDebugInfo, "Recovered 2 Handles for 15 bytes."));
@@ -249,4 +252,4 @@ TEST_P(Handles, AreRecoveredAtTheStop) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -125,22 +125,6 @@ TEST(MemoryFull, IsToldByTrackedAllocation) {
     EXPECT_GT(runs, 3);
 }
 
-uint32 wantedAtStart;
-
-TEST(MemoryFull, PreventsTheStart) {
-    uint64 before = heap::TotalAllocated();
-    SetMemFullProc([](uint32 size) { wantedAtStart = size; });
-    for (int n = 1; n <= 5; ++n) {
-        wantedAtStart = 0;
-        test::FailingAllocator failing(n);
-        EXPECT_EQ(kMemFullErr, MemoryManagerStart());
-        EXPECT_EQ(10001 * sizeof(void*), wantedAtStart);  // a block of master pointers
-        EXPECT_FALSE(GetMemoryManagerInitialized());
-        EXPECT_EQ(before, heap::TotalAllocated());
-    }
-    SetMemFullProc(nullptr);
-}
-
 TEST(TrackedAllocation, IsReportedWhenItLeaks) {
     test::StartedMemory memory;
     EXPECT_THROW(TrackedNew(SIZE_MAX - 100), std::bad_alloc);
@@ -376,9 +360,7 @@ TEST(MemoryThreads, DoNotDisturbEachOther) {
     const uint32 zeros[4] = {};
     DSSetCounters(zeros);
     std::atomic<int> wrong{0};
-    std::vector<std::thread> threads;
-    for (uint32 i = 0; i < kThreads; ++i) threads.emplace_back([&, i] { wrong += Worker(i, jar).Run(rounds); });
-    for (std::thread& thread : threads) thread.join();
+    test::InThreads(kThreads, [&](int thread) { wrong += Worker(static_cast<uint32>(thread), jar).Run(rounds); });
     EXPECT_EQ(0, wrong);
     int32 cookies = -1;
     EXPECT_EACH(MCJarSize(jar, &cookies) == kNoErr, cookies == 0);
