@@ -9,6 +9,8 @@
 #include <errno.h>
 #include <set>
 
+using namespace tessel::test;
+
 namespace {
 
 // The process-wide generator, seeded by a clock whose low 14 bits are 0: 1234, x 8191 & 0x3FFF, and that again.
@@ -49,13 +51,9 @@ TEST(RandomGen, ThreadsShareOneSeededStream) {
     RandomGen(&drawn[0]);
     EXPECT_EQ(drawn[0], 0);  // not seeded
     SeededGenerator generator;
-    std::vector<std::thread> threads;
-    for (size_t t = 0; t < kThreads; ++t) {
-        threads.emplace_back([&drawn, t] {
-            for (size_t i = 0; i < kEach; ++i) RandomGen(&drawn[t * kEach + i]);
-        });
-    }
-    for (std::thread& thread : threads) thread.join();
+    InThreads(kThreads, [&](int thread) {
+        for (size_t i = 0; i < kEach; ++i) RandomGen(&drawn[static_cast<size_t>(thread) * kEach + i]);
+    });
     std::vector<double> expected = Stream(generator.seeds, drawn.size() + 1);
     int32 state[3];
     RandomGenInitState(state);
@@ -101,7 +99,8 @@ TEST(OVGuid, TurnsIntoTextAndBack) {
         EXPECT_EQ(OVGuidFromCStr(each, &guid), kGuidErr) << each;
         EXPECT_TRUE(OVGuidsEqual(&guid, &kSample)) << each;
     }
-    EXPECT_EACH(OVGuidFromCStr(nullptr, nullptr) == kArgErr, OVGuidFromCStr("nothing is done", nullptr) == kNoErr,
+    EXPECT_EACH(OVGuidsEqual(nullptr, nullptr), !OVGuidsEqual(&guid, nullptr), !OVGuidsEqual(nullptr, &guid),
+                OVGuidFromCStr(nullptr, nullptr) == kArgErr, OVGuidFromCStr("nothing is done", nullptr) == kNoErr,
                 OVGuidToCStr(&kSample, nullptr) == kNoErr, OVGuidToCStr(nullptr, text) == kGuidErr, text == "");
     tessel::test::ReportRecorder reports;
     TESSEL_REPORT(kDebugInfo, 0x11223344u) << kSample;

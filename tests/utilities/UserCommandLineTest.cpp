@@ -27,30 +27,30 @@ private:
     std::vector<char*> args_;
 };
 
+std::string Joined(const Words& words) {
+    std::string text;
+    for (const std::string& word : words) text += word + '|';
+    return text;
+}
+
+// The application's words of a command line, the user's, and the preferences.
+std::string Split(Words words, bool ignore = false) {
+    Host host(words);
+    SetIgnoreCommandLine(ignore);
+    EXPECT_EACH(host.Init() == kNoErr, Get(GetRawCommandLine) == words);
+    return Joined(Get(GetAppCommandLine)) + "; " + Joined(Get(GetUserCommandLine)) + "; " +
+           (GetPrefsPath() ? GetPrefsPath() : "null");
+}
+
 TEST(UserCommandLine, IsSplitAtTheFirstSeparator) {
-    const struct {
-        Words all;
-        bool ignore;
-        Words app, user;
-        const char* prefs;
-    } cases[] = {
-        {{"prog", "-x", "--", "-y", "z"}, false, {"prog", "-x"}, {"prog", "-y", "z"}, nullptr},
-        {{"prog", "-pref"}, false, {"prog", "-pref"}, {"prog"}, nullptr},
-        {{"prog", "--", "a", "--", "b"}, false, {"prog"}, {"prog", "a", "--", "b"}, nullptr},
-        {{"--", "a"}, false, {}, {"--", "a"}, nullptr},
-        {{"prog", "---", "-- "}, false, {"prog", "---", "-- "}, {"prog"}, nullptr},
-        {{"prog", "-x", "--", "z"}, true, {}, {"prog", "-x", "--", "z"}, nullptr},
-        {{"prog", "-pref", "a", "-pref", "b"}, false, {"prog", "-pref", "a", "-pref", "b"}, {"prog"}, "b"},
-        {{"prog", "-pref", "a", "-pref"}, false, {"prog", "-pref", "a", "-pref"}, {"prog"}, "a"},
-        {{"prog", "--", "-pref", "a"}, false, {"prog"}, {"prog", "-pref", "a"}, nullptr},
-    };
-    for (const auto& each : cases) {
-        Host host(each.all);
-        SetIgnoreCommandLine(each.ignore);
-        EXPECT_EACH(host.Init() == kNoErr, Get(GetRawCommandLine) == each.all, Get(GetAppCommandLine) == each.app,
-                    Get(GetUserCommandLine) == each.user);
-        EXPECT_STREQ(GetPrefsPath(), each.prefs);
-    }
+    EXPECT_EACH(Split({"prog", "-x", "--", "-y", "z"}) == "prog|-x|; prog|-y|z|; null",
+                Split({"prog", "-pref"}) == "prog|-pref|; prog|; null",
+                Split({"prog", "--", "a", "--", "b"}) == "prog|; prog|a|--|b|; null",
+                Split({"--", "a"}) == "; --|a|; null", Split({"prog", "---", "-- "}) == "prog|---|-- |; prog|; null",
+                Split({"prog", "-x", "--", "z"}, true) == "; prog|-x|--|z|; null",
+                Split({"prog", "-pref", "a", "-pref", "b"}) == "prog|-pref|a|-pref|b|; prog|; b",
+                Split({"prog", "-pref", "a", "-pref"}) == "prog|-pref|a|-pref|; prog|; a",
+                Split({"prog", "--", "-pref", "a"}) == "prog|; prog|-pref|a|; null");
 }
 
 TEST(UserCommandLine, RefusesNoneAndASecondOne) {
@@ -99,30 +99,20 @@ TEST(UserCommandLine, KnowsTheLibrarysOwnArguments) {
 }
 
 TEST(UserCommandLine, IsMadeFromOneLine) {
-    const struct {
-        const char* line;
-        Words words;
-    } cases[] = {
-        {" a \"b c\" d", {"a", "b c", "d"}},
-        {nullptr, {}},
-        {"", {}},
-        {" \t \t", {}},
-        {"\ta\t\tb ", {"a", "b"}},
-        {"\"", {""}},
-        {"\"\"\"\"", {"", ""}},
-        {"x \"y z", {"x", "y z"}},
-        {"\"a\"b\"c d\"", {"a", "b\"c", "d\""}},
-        {"-n=\"a b\"", {"-n=\"a", "b\""}},
-    };
-    for (const auto& each : cases) {
+    const auto words = [](const char* line) {
         std::string first = "prog";
         int32 count = 0;
         char** args = nullptr;
-        NewCommandLineArgsFromSingleLine(each.line, first.data(), &count, &args);
-        ASSERT_EQ(count, static_cast<int32>(each.words.size()) + 1) << (each.line ? each.line : "null");
-        EXPECT_EACH(args[0] == first.data(), Words(args + 1, args + count) == each.words);
+        NewCommandLineArgsFromSingleLine(line, first.data(), &count, &args);
+        EXPECT_EQ(args[0], first.data());
+        const std::string text = Joined(Words(args + 1, args + count));
         DeleteCommandLineArgsFromSingleLine(count, args);
-    }
+        return text;
+    };
+    EXPECT_EACH(words(" a \"b c\" d") == "a|b c|d|", words(nullptr) == "", words("") == "", words(" \t \t") == "",
+                words("\ta\t\tb ") == "a|b|", words("\"") == "|", words("\"\"\"\"") == "||",
+                words("x \"y z") == "x|y z|", words("\"a\"b\"c d\"") == "a|b\"c|d\"|",
+                words("-n=\"a b\"") == "-n=\"a|b\"|");
     DeleteCommandLineArgsFromSingleLine(0, nullptr);
 }
 
