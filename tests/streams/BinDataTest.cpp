@@ -4,7 +4,7 @@
 #include <tessel/streams/BinDataReader.h>
 #include <tessel/streams/BinDataWriter.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 using std::string_literals::operator""s;
@@ -79,8 +79,7 @@ TEST_F(BinData, ValuesInTheOrderOfTheStream) {
          [&](R& r) { return r.ReadBytes(nullptr, 2), r.Skip(1), r.ReadBytes(two, 2), std::string(two, 2) == "45"; },
          "12345", "12345"},
         {[](W& w) { return w.WriteU8(7) + w.Align(4) + w.Align(4); },
-         [](R& r) { return r.ReadU8() == 7 && (r.Align(4), true); }, "\7\0\0\0"s, "\7\0\0\0"s},
-    };
+         [](R& r) { return r.ReadU8() == 7 && (r.Align(4), true); }, "\7\0\0\0"s, "\7\0\0\0"s}};
     for (const auto& row : rows) {
         for (const auto& [order, bytes] : {std::pair{BigEndianizer(), row.big}, {LittleEndianizer(), row.little}}) {
             EXPECT_EQ(bytes, Written(order, row.write));
@@ -124,7 +123,8 @@ TEST_F(BinData, TheFirstErrorStays) {
     {
         StaticOutputBuf out(bytes, 1);
         BinDataWriter writer(&out, BigEndianizer());
-        EXPECT_EQ(0u, writer.WriteI16(1));
+        EXPECT_EACH(writer.WriteI8(1) == 1u, writer.Align(4) == 0u, writer.GetError() == kCorruptErr,
+                    writer.WriteI16(1) == 0u, writer.Align(4) == 0u);
         PreflightOutputBuf other;
         EXPECT_EACH(&out == writer.SetBuffer(&other), writer.WriteI8(1) == 0u, writer.GetError() == kCorruptErr);
     }
@@ -157,4 +157,4 @@ TEST_F(BinData, CountsOfStringsAreChecked) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,10 +1,11 @@
+#include "memory/Heap.h"
 #include "support/StartedPaths.h"
 #include "support/Test.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/streams/InputBuf.h>
 #include <tessel/streams/OutputBuf.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 class Buffers : public ::testing::Test {
@@ -47,9 +48,15 @@ TEST_F(Buffers, AStringHandleIsTakenOver) {
     EXPECT_EACH(text == nullptr, buffer.GetSize() == 5u, std::memcmp(buffer.GetDataPointer(5, err_), "hello", 5) == 0);
     LStrHandle back = buffer.ReleaseOwnership();
     EXPECT_EACH(buffer.GetDataPointer(1, err_) == nullptr, err_ == kArgErr);
-    (*back)->count = 1000;  // more than the handle holds
-    LStrInputBuf damaged(back);
-    EXPECT_EQ(5u, damaged.GetSize());
+    for (const auto& [count, size] : {std::pair{1000, 5u}, {-1, 0u}, {0, 0u}, {1, 1u}}) {  // 1000: more than it holds
+        (*back)->count = count;
+        LStrInputBuf damaged(back);
+        EXPECT_EQ(size, damaged.GetSize());
+        back = damaged.ReleaseOwnership();
+    }
+    DSDisposeHandle(reinterpret_cast<UHandle>(back));
+    LStrHandle bare = reinterpret_cast<LStrHandle>(DSNewHClr(LStrSize(0)));
+    EXPECT_EACH(std::unique_ptr<InputBuf>(CreateLStrInputBuf(bare))->GetSize() == 0u);
     LStrInputBuf empty(text);
     empty.GetDataPointer(0, err_);
     EXPECT_EQ(kArgErr, err_);
@@ -69,9 +76,8 @@ TEST_F(Buffers, AFixedBlockIsNotWrittenBeyond) {
 TEST_F(Buffers, AHandleGrowsByAQuarterWithinBounds) {
     HandleOutputBuf buffer(16);
     std::memset(buffer.GetDataPointer(100, err_), 'x', 100);
-    EXPECT_EQ(100u, buffer.GetBytesWritten());
     UHandle handle = buffer.GetHandle(0);
-    EXPECT_EQ(100u, DSGetHandleSize(handle));
+    EXPECT_EACH(buffer.GetBytesWritten() == 100u, DSGetHandleSize(handle) == 100u);
     buffer.GetDataPointer(30000, err_);  // grows: 4096 more at most
     EXPECT_EQ(30100u + 4096u, DSGetHandleSize(handle));
     handle = buffer.GetHandle(1);
@@ -86,8 +92,12 @@ TEST_F(Buffers, AStringHandleGrowsBehindItsCount) {
     std::memcpy(buffer.GetDataPointer(3, err_), "abc", 3);
     std::memset(buffer.GetDataPointer(2, err_), '!', 2);
     EXPECT_LE(9u, DSGetHandleSize(reinterpret_cast<UHandle>(room)));
+    EXPECT_EQ(room, buffer.GetHandle(0));
+    buffer.GetDataPointer(0, err_);
+    std::memset(buffer.GetDataPointer(100, err_), '?', 100);  // grows anew
+    EXPECT_LE(109u, DSGetHandleSize(reinterpret_cast<UHandle>(room)));
     LStrHandle text = buffer.GetHandle(1);
-    EXPECT_EACH((*text)->count == 5, DSGetHandleSize(reinterpret_cast<UHandle>(text)) == 9u,
+    EXPECT_EACH((*text)->count == 105, DSGetHandleSize(reinterpret_cast<UHandle>(text)) == 109u,
                 std::memcmp((*text)->bytes, "abc!!", 5) == 0);
     LStrOutputBuf resized(text, 1000);
     EXPECT_EQ(1004u, DSGetHandleSize(reinterpret_cast<UHandle>(text)));
@@ -98,6 +108,15 @@ TEST_F(Buffers, FactoriesMakeObjectsThatTheLibraryFrees) {
     EXPECT_EACH(std::unique_ptr<InputBuf>(CreateMemInputBuf("ab", 2))->GetSize() == 2u,
                 std::unique_ptr<InputBuf>(CreateLStrInputBuf(text))->GetSize() == 1u);
     char block[4];
+    const auto taken = [](auto make) {
+        const uint64 before = heap::TotalAllocated();
+        auto* made = make();
+        const uint64 bytes = heap::TotalAllocated() - before;
+        delete made;
+        return bytes;
+    };
+    const uint64 plain = taken([] { return new HandleOutputBuf(4000); });
+    EXPECT_EACH(plain >= 4000u, plain == taken([] { return new LStrOutputBuf(3996); }));
     for (OutputBuf* made : std::initializer_list<OutputBuf*>{CreatePreflightOutputBuf(),
                                                              CreateStaticOutputBuf(block, 4), CreateLStrOutputBuf(4)}) {
         const std::unique_ptr<OutputBuf> output(made);
@@ -107,4 +126,4 @@ TEST_F(Buffers, FactoriesMakeObjectsThatTheLibraryFrees) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -5,7 +5,7 @@
 #include <tessel/strings/CPStrList.h>
 #include <tessel/strings/StringPStr.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 class CPStrListFlatten : public testing::Test {
@@ -52,4 +52,4 @@ TEST_F(CPStrListFlatten, StopsAtTheFirstError) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

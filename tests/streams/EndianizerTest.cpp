@@ -3,23 +3,21 @@
 
 #include <array>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 using Bytes16 = std::array<uint8, 16>;
 
 TEST(ByteOrder, HelpersWorkInPlaceAtAnyAddress) {
     uint8 bytes[9] = {0xEE, 1, 2, 3, 4, 5, 6, 7, 8};
-    RevBQ(bytes + 1);
-    EXPECT_EQ(0, std::memcmp(bytes, "\xEE\x08\x07\x06\x05\x04\x03\x02\x01", 9));
-    uint32 halves = 0x11223344;
-    SwapWL(&halves);
-    EXPECT_EQ(0x33441122u, halves);
-    RevBL(&halves);
-    EXPECT_EQ(0x22114433u, halves);
+    uint32 halves = 0x11223344, reversed = 0x33441122;
     uint16 word = 0x1122;
+    RevBQ(bytes + 1);
+    SwapWL(&halves);
+    RevBL(&reversed);
     SwapBW(&word);
-    EXPECT_EQ(0x2211u, word);
+    EXPECT_EACH(std::memcmp(bytes, "\xEE\x08\x07\x06\x05\x04\x03\x02\x01", 9) == 0, halves == 0x33441122u,
+                reversed == 0x22114433u, word == 0x2211u);
 }
 
 TEST(Endianizer, IntegersInBothOrders) {
@@ -29,13 +27,11 @@ TEST(Endianizer, IntegersInBothOrders) {
                 int32(0x81020304) == BigEndianizer()->ToNative32(stream),
                 int32(0x04030281) == NativeEndianizer()->ToNative32(stream));
     uint64 value;
+    uint8 all[16], back[16];
     BigEndianizer()->CopyToNative64(stream, &value);
-    EXPECT_EQ(0x8102030405060708u, value);
-    uint8 all[16];
     BigEndianizer()->CopyToNative128(stream, all);
-    for (int i = 0; i < 16; ++i) EXPECT_EQ(stream[15 - i], all[i]);
-    uint8 back[16];
     BigEndianizer()->FromNative128(all, back);
+    EXPECT_EACH(value == 0x8102030405060708u, std::equal(all, all + 16, std::rbegin(stream)));
     EXPECT_EACH(std::memcmp(stream, back, 16) == 0, BigEndianizer()->IsSwapping() == 1,
                 LittleEndianizer()->IsSwapping() == 0, NativeEndianizer()->IsSwapping() == 0);
 }
@@ -70,4 +66,4 @@ TEST(Endianizer, ExtendedRealsInTheStandardForm) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test
