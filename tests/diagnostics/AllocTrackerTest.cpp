@@ -7,11 +7,8 @@
 
 #include <map>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using test::ReportRecorder;
-using test::TextDumper;
 
 const void* At(uintptr_t address) {
     return reinterpret_cast<const void*>(address);
@@ -367,4 +364,4 @@ TEST_F(AllocTrackerFailures, AnAllocatorThatGivesOrTakesWronglyTurnsItOff) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -6,10 +6,9 @@
 #include <sys/resource.h>
 #include <unistd.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
-using test::ReportRecorder;
 using testing::ExitedWithCode;
 
 TEST(DebugOutput, DefaultBehaviourCountsAndShowsSeriousReports) {
@@ -136,4 +135,4 @@ TEST(DumpSomeMemory, BytesThatCannotBeReadAreMarked) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -4,10 +4,8 @@
 
 #include <limits>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using test::ReportRecorder;
 
 template <class... Values>
 std::string Reported(const Values&... values) {
@@ -114,4 +112,4 @@ TEST_F(DebugStreamPool, TheSeventeenthStreamAtOnceHasABufferOfItsOwn) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

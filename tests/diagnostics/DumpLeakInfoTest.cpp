@@ -8,11 +8,8 @@
 #include <stdlib.h>
 #include <sys/mman.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using test::ReportRecorder;
-using test::Texts;
 
 // The temporary folder is on the scratch drive.
 class DumpLeakInfoTest : public testing::Test {
@@ -74,12 +71,17 @@ TEST_F(DumpLeakInfoTest, ManyRecordsAreWrittenWhole) {
     EXPECT_EACH(count == 2000u, text.ends_with("\n2000 Thing Leaks\n"));
 }
 
-TEST_F(DumpLeakInfoTest, AnObjectThatCannotBeReadIsEmpty) {
-    void* const page = mmap(nullptr, 4096, PROT_NONE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
-    tracker->AddRecord(page, 100, "maker.cpp", 1);
+TEST_F(DumpLeakInfoTest, WhatCannotBeReadOfAnObjectIsLeftOut) {
+    char* const pages =
+        static_cast<char*>(mmap(nullptr, 8192, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0));
+    std::memset(pages, 'x', 8192);
+    mprotect(pages + 4096, 4096, PROT_NONE);
+    tracker->AddRecord(pages + 4096, 100, "maker.cpp", 1);
+    tracker->AddRecord(pages + 4091, 100, "maker.cpp", 1);
     DumpLeakInfo(tracker, 0, "Thing Leaks", "leaks.txt");
-    munmap(page, 4096);
-    EXPECT_NE(std::string::npos, drive.Get("leaks.txt").find("\nMemory Contents: \n"));
+    munmap(pages, 8192);
+    EXPECT_THAT(drive.Get("leaks.txt"),
+                AllOf(HasSubstr("\nMemory Contents: \n"), HasSubstr("\nMemory Contents: xxxxx\n")));
 }
 
 TEST_F(DumpLeakInfoTest, WithoutAFileTheSummaryStays) {
@@ -115,8 +117,7 @@ TEST(FileLoc, PlacesTheNameByItsCode) {
     setenv("TMPDIR", "/some/where", 1);
     for (int32 code : {0, 2, 4}) EXPECT_EQ("C:\\some\\where\\f", PathText(code, "f", false));
     unsetenv("TMPDIR");
-    const std::unique_ptr<FileLoc> location(CreateFileLoc(1, "name", false));
-    const std::unique_ptr<FileLoc> clone(location->Clone());
+    const std::unique_ptr<FileLoc> location(CreateFileLoc(1, "name", false)), clone(location->Clone());
     EXPECT_EACH(location->PathText() != clone->PathText(), clone->PathText() == "name");
 }
 
@@ -132,4 +133,4 @@ TEST(FileLoc, RefusesWhatDoesNotFit) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

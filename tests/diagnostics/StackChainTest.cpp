@@ -3,7 +3,7 @@
 
 #include <exception>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 struct Frame {
@@ -90,4 +90,4 @@ TEST(FrameDecoder, NamesAFunctionOfAModule) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test
