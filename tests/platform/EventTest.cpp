@@ -5,6 +5,7 @@
 #include "support/HandClock.h"
 #include "support/Test.h"
 
+#include <bit>
 #include <cerrno>
 #include <chrono>
 #include <signal.h>
@@ -79,6 +80,37 @@ TEST(Event, WaitAnyTakesTheFirstSignaled) {
         EXPECT_EQ(expected, index);
     }
     EXPECT_EQ(EventWait::kTimedOut, first.Wait(0));
+}
+
+// Each waits for an event that all share and for its own; whoever leaves must take nobody else off the list.
+TEST(Event, AnyOfTheWaitersMayLeave) {
+    constexpr int kWaiters = 6;
+    std::mt19937 random(1);
+    for (int round = 0; round < 50; ++round) {
+        Event shared, own[kWaiters];
+        std::atomic<int> waiting{0}, left{0}, wrong{0}, byShared{0};
+        const unsigned leaving = random() % (1u << kWaiters);
+        test::InThreads(kWaiters + 1, [&](int thread) {
+            if (thread < kWaiters) {
+                Event* both[] = {&shared, &own[thread]};
+                int index = -1;
+                ++waiting;
+                wrong += Event::WaitAny(both, 2, 60000, index) != EventWait::kTaken;
+                byShared += index == 0;
+                ++left;
+                return;
+            }
+            while (waiting < kWaiters) std::this_thread::yield();
+            for (int i = 0; i < kWaiters; ++i)
+                if (leaving >> i & 1) own[i].Set();
+            while (left < std::popcount(leaving)) std::this_thread::yield();
+            for (int gone = left; gone < kWaiters; ++gone) {
+                shared.Set();
+                while (left == gone) std::this_thread::yield();
+            }
+        });
+        EXPECT_EACH(wrong == 0, byShared == kWaiters - std::popcount(leaving));
+    }
 }
 
 TEST(Clock, IsReadFromTheHost) {

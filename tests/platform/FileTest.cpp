@@ -53,9 +53,8 @@ TEST(File, DispositionsDecideWhatIsMade) {
     }
     EXPECT_EACH(Open(name, kRead, 0, Disposition::kTruncateExisting) == kNoFile, LastError() == kErrorInvalidParameter);
     ASSERT_TRUE(FolderCreate(drive.Name("folder").c_str()));
-    for (std::uint32_t access : {kRead, kWrite, kRead | kWrite}) {
+    for (std::uint32_t access : {kRead, kWrite, kRead | kWrite})
         EXPECT_EACH(Open(drive.Name("folder"), access) == kNoFile, LastError() == kErrorAccessDenied);
-    }
 }
 
 TEST(File, AccessIsThatOfTheHandle) {

@@ -14,7 +14,6 @@
 #include <iterator>
 #include <sys/mman.h>
 #include <sys/ptrace.h>
-#include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -208,49 +207,6 @@ TEST(Thread, HandlesMayGoBeforeTheThread) {
     EXPECT_FALSE(ThreadEnd(self, 0));  // not started here
     EXPECT_EQ(kErrorAccessDenied, LastError());
     EXPECT_TRUE(ThreadClose(self));
-}
-
-TEST(Thread, EndsByForceWhereverItIs) {
-#if defined(__SANITIZE_THREAD__)
-    GTEST_SKIP() << "the thread sanitizer waits for the bookkeeping of a thread that ends without any";
-#endif
-    Worker worker;  // never told to stop: without force this thread would run for ever
-    ThreadId id = 0;
-    ThreadHandle thread = ThreadStart(
-        [](void* argument) -> std::int32_t {
-            Worker& state = *static_cast<Worker*>(argument);
-            state.started = true;
-            for (unsigned spins = 0; !state.stop.load(std::memory_order_relaxed);) spins = spins + 1;
-            return 1;
-        },
-        &worker, id);
-    while (!worker.started) YieldThread();
-    EXPECT_TRUE(ThreadEnd(thread, 77));
-    std::int32_t code = 0;
-    EXPECT_EACH(ThreadExitCode(thread, code), code == 77);
-    EXPECT_TRUE(ThreadEnd(thread, 78));  // already over: nothing happens
-    EXPECT_TRUE(ThreadExitCode(thread, code));
-    EXPECT_EACH(code == 77, ThreadClose(thread));
-}
-
-TEST(Thread, PrioritiesAreTheHosts) {
-    if (::getpriority(PRIO_PROCESS, 0) != 0) GTEST_SKIP() << "the process itself does not have the priority 0";
-    std::thread([] {  // a lowered priority cannot always be raised again
-        ThreadHandle self = ThreadOpenCurrent();
-        std::int32_t priority = 99;
-        EXPECT_EACH(ThreadGetPriority(self, priority), priority == 0);
-        for (std::int32_t lower : {-1, -2, -15}) {
-            EXPECT_EACH(ThreadSetPriority(self, lower), ThreadGetPriority(self, priority), lower == priority);
-        }
-        EXPECT_EACH(!ThreadSetPriority(self, 7), LastError() == kErrorInvalidParameter);
-        if (ThreadSetPriority(self, 15)) {
-            EXPECT_EACH(ThreadGetPriority(self, priority), priority == 15);
-        } else {
-            EXPECT_EQ(kErrorAccessDenied, LastError());
-        }
-        ThreadClose(self);
-    })
-        .join();
 }
 
 TEST(Thread, StackAndSlotsAreItsOwn) {

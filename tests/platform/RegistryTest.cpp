@@ -92,14 +92,12 @@ TEST_F(Registry, ValuesKeepTypeAndBytes) {
     const std::pair<const char*, std::string> rows[] = {{"", "unnamed"}, {"Path", bytes}, {"=.%2F/\\", ""}};
     std::uint32_t type = 0;
     std::string data;
-    for (const auto& [name, value] : rows) {
+    for (const auto& [name, value] : rows)
         EXPECT_EACH(RegistryQueryValue(key, name, type, data) == kErrorFileNotFound,
                     RegistrySetValue(key, name, 4000000000u, "longer before", 13) == kErrorSuccess,
                     RegistrySetValue(key, name, 3, value.data(), value.size()) == kErrorSuccess);
-    }
-    for (const auto& [name, value] : rows) {
+    for (const auto& [name, value] : rows)
         EXPECT_EACH(RegistryQueryValue(key, name, type, data) == kErrorSuccess, type == 3u, value == data);
-    }
     EXPECT_EACH(RegistryQueryValue(key, "PATH", type, data) == kErrorSuccess, bytes == data);
     std::uint32_t keys = 0, values = 0;
     EXPECT_EACH(RegistryCounts(key, keys, values) == kErrorSuccess, values == 3u);

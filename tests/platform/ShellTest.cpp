@@ -104,11 +104,11 @@ TEST_F(Shell, ShortcutsTellTheirTarget) {
     std::string environment =
         Bytes(788, 4) + Bytes(0xA0000001, 4) + std::string("%TESSEL_LNK%\\x") + std::string(766, '\0') + Bytes(0, 4);
     setenv("TESSEL_LNK", "C:\\env", 1);
-    const std::pair<std::string, std::string> rows[] = {
-        {Header(3) + idList + local, "C:\\folder\\a.txt"}, {Header(2) + wide, "C:\\\xC3\xA9"},
-        {Header(2) + network, "\\\\server\\share\\b\\c"},  {Header(4 | 8 | 0x80) + relative, "T:\\..\\b.txt"},
-        {Header(0x200) + environment, "C:\\env\\x"},
-    };
+    const std::pair<std::string, std::string> rows[] = {{Header(3) + idList + local, "C:\\folder\\a.txt"},
+                                                        {Header(2) + wide, "C:\\\xC3\xA9"},
+                                                        {Header(2) + network, "\\\\server\\share\\b\\c"},
+                                                        {Header(4 | 8 | 0x80) + relative, "T:\\..\\b.txt"},
+                                                        {Header(0x200) + environment, "C:\\env\\x"}};
     std::string target;
     for (const auto& [bytes, expected] : rows) {
         drive_.Put("a.lnk", bytes);
