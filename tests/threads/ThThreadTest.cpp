@@ -56,6 +56,15 @@ void AwaitThreads(size_t most) {
     while (ThreadsOfProcess() > most) std::this_thread::yield();
 }
 
+TEST(ThThreadPriorities, AreTheUsualOnesUntilTheStart) {
+    int32 p[5];
+    uint8 distinct[5];
+    ThThreadGetNativePriorityInfo(&p[0], &p[1], &p[2], &p[3], &p[4]);
+    ThThreadGetPrioInfo(distinct);
+    EXPECT_THAT(p, ElementsAre(-15, 0, 1, 2, 15));
+    EXPECT_THAT(distinct, ElementsAre(1, 1, 1, 1, 1));
+}
+
 // ---- identity and the table -----------------------------------------------------------------------------------------
 
 TEST_F(ThThreadTest, KnowsItsThreads) {
@@ -139,26 +148,21 @@ TEST_F(ThThreadTest, RefusesOneMoreThanTheTableHolds) {
 TEST_F(ThThreadTest, GivesEachOfManyThreadsAPlaceOfItsOwn) {
     static std::atomic<int> users[kMaxThThreads], collisions, ended;
     collisions = ended = 0;
-    std::vector<std::thread> creators;
-    for (int i = 0; i < 4; ++i) {
-        creators.emplace_back([this] {
-            for (int round = 0; round < 100; ++round) {
-                ThThread thread = StartThread([](void*) -> int32 {
-                    std::atomic<int>& mine = users[ThThreadGetIndex(nullptr)];
-                    if (mine++ != 0) ++collisions;
-                    --mine;
-                    return ++ended;
-                });
-                ThThread hasty =
-                    StartThread([](void*) -> int32 { return ThThreadGetIndex(nullptr) != 0 ? ++ended : 0; });
-                for (int spin = 0; spin < round % 5 * 100; ++spin) ThThreadActive(hasty);
-                ThThreadDestroy(hasty);                                    // while it begins, runs or ends
-                while (ThThreadActive(thread)) std::this_thread::yield();  // its place is taken as long as it uses it
-                ThThreadDestroy(thread);
-            }
-        });
-    }
-    for (std::thread& creator : creators) creator.join();
+    tessel::test::InThreads(4, [this](int) {
+        for (int round = 0; round < 100; ++round) {
+            ThThread thread = StartThread([](void*) -> int32 {
+                std::atomic<int>& mine = users[ThThreadGetIndex(nullptr)];
+                if (mine++ != 0) ++collisions;
+                --mine;
+                return ++ended;
+            });
+            ThThread hasty = StartThread([](void*) -> int32 { return ThThreadGetIndex(nullptr) != 0 ? ++ended : 0; });
+            for (int spin = 0; spin < round % 5 * 100; ++spin) ThThreadActive(hasty);
+            ThThreadDestroy(hasty);                                    // while it begins, runs or ends
+            while (ThThreadActive(thread)) std::this_thread::yield();  // its place is taken as long as it uses it
+            ThThreadDestroy(thread);
+        }
+    });
     EXPECT_EACH(ended == 4 * 100 * 2, collisions == 0);
     EXPECT_THAT(reports_.Texts(), IsEmpty());
 }
