@@ -10,7 +10,6 @@
 namespace tessel::test {
 namespace {
 
-using testing::ElementsAre;
 using Policy = MGEventQueue::DuplicatePostedEventPolicy;
 
 std::atomic<int> live{0};

@@ -18,8 +18,7 @@ struct ModelOccurrence {
 
 struct ModelHandler {
     OccurHdlr refnum = 0;  // 0: freed
-    bool strict = false, threadSafe = false, armsAgain = false;
-    bool armed = false, fired = false, timedOut = false;
+    bool strict = false, threadSafe = false, armsAgain = false, armed = false, fired = false, timedOut = false;
     int occurrence = kNone;
     uint32 seen = 2;
 };

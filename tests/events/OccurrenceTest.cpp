@@ -18,10 +18,6 @@
 namespace tessel::test {
 namespace {
 
-using tessel::test::Texts;
-using testing::ElementsAre;
-using testing::IsEmpty;
-
 class OccurrenceTest : public EventsTest {
 protected:
     // Until another thread has noted so much. What never comes makes the test run out of time.
@@ -114,11 +110,10 @@ TEST_F(OccurrenceTest, ThreadsCheckTheirGroup) {
     int one = 1, hundred = 100;
     const Occurrence o = AllocOccur();
     const OccurHdlr h = AllocOccurHdlr(o, Log::Note, Name("joined"));
-    for (int32 bad : {-1, 2048}) {
+    for (int32 bad : {-1, 2048})
         EXPECT_EACH(SetOccThreadGroup(bad, 0) == 1, SetOccThreadGroup(0, bad) == 1,
                     SetOccThreadGroupProc(bad, tell, &one) == 1, ChkThGroupOccurrences(bad) == kNoErr,
                     !QuickCheckGroupHandlersFired(bad));
-    }
     EXPECT_EQ(kNoErr, SetOccThreadGroupProc(0, tell, &one));
     int32 index = 0;
     for (bool joins : {true, false}) {  // the second thread has the place of the first, and a group of its own
@@ -386,14 +381,11 @@ TEST_F(OccurrenceTest, NothingIsLostThatManyThreadsPost) {
     std::vector<Noted> noted(64);
     for (Noted& each : noted) each.Alloc();
     std::atomic<int> posting{8};
-    std::vector<std::thread> posters;
-    for (size_t i = 0; i < 8; ++i)
-        posters.emplace_back([&, i] {
-            for (size_t n = 0; n < 5000; ++n) noted[n % 8 * 8 + i].Post();
-            --posting;
-        });
-    while (posting > 0) ChkOccurrences();
-    for (std::thread& poster : posters) poster.join();
+    InThreads(9, [&](int thread) {
+        while (thread == 8 && posting > 0) ChkOccurrences();
+        for (size_t n = 0; thread < 8 && n < 5000; ++n) noted[n % 8 * 8 + static_cast<size_t>(thread)].Post();
+        if (thread < 8) --posting;
+    });
     ChkOccurrences();
     for (Noted& each : noted) each.ExpectNothingLost();
 }
@@ -422,45 +414,20 @@ void DoAnything(std::mt19937& random) {
         ++slot.arms;
         how(slot.handler, random() % 4 == 0);
     };
-    switch (random() % 16) {
-        case 0:
-            DeallocOccur(occurrence.exchange(AllocOccur()));
-            break;
-        case 1:
-            DeallocOccurHdlr(slot.handler.exchange(alloc(occurrence, CountCall, &slot)));
-            break;
-        case 2:
-            BindOccurHdlr(slot.handler, occurrence, CountCall, &slot);
-            break;
-        case 3:
-            CancelOnOccur(slot.handler);
-            break;
-        case 4:
-            FireOccurHdlr(slot.handler);
-            break;
-        case 5:
-            OccurAtTime(occurrence, MilliSecs() + random() % 3);
-            break;
-        case 6:
-            CancelOccurAtTime(occurrence);
-            break;
-        case 7:
-            InterruptSafeOccur(occurrence);
-            break;
-        case 8:
-            arm([](OccurHdlr h, bool reset) { return OnOccurrenceWithTimeout(h, reset, reset ? 1 : 5); });
-            break;
-        case 9:
-        case 10:
-            arm(OnOccurrence);
-            break;
-        case 11:
-        case 12:
-            ChkThGroupOccurrences(static_cast<int32>(random() % 10));
-            break;
-        default:
-            Occur(occurrence);
-    }
+    const std::function<void()> operations[] = {
+        [&] { DeallocOccur(occurrence.exchange(AllocOccur())); },
+        [&] { DeallocOccurHdlr(slot.handler.exchange(alloc(occurrence, CountCall, &slot))); },
+        [&] { BindOccurHdlr(slot.handler, occurrence, CountCall, &slot); },
+        [&] { CancelOnOccur(slot.handler); },
+        [&] { FireOccurHdlr(slot.handler); },
+        [&] { OccurAtTime(occurrence, MilliSecs() + random() % 3); },
+        [&] { CancelOccurAtTime(occurrence); },
+        [&] { InterruptSafeOccur(occurrence); },
+        [&] { arm([](OccurHdlr h, bool reset) { return OnOccurrenceWithTimeout(h, reset, reset ? 1 : 5); }); },
+        [&] { arm(OnOccurrence); },
+        [&] { ChkThGroupOccurrences(static_cast<int32>(random() % 10)); },
+        [&] { Occur(occurrence); }};
+    operations[std::array{0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 9, 10, 10, 11, 11, 11}[random() % 16]]();
 }
 
 TEST_F(OccurrenceTest, ManyThreadsDoAnythingAtOnce) {
@@ -469,19 +436,16 @@ TEST_F(OccurrenceTest, ManyThreadsDoAnythingAtOnce) {
     for (auto& occurrence : occurrences) occurrence = AllocOccur();
     for (Slot& slot : slots) slot.handler = AllocOccurHdlr(0, CountCall, &slot);
     std::atomic<uint64> operations{0};
-    std::vector<std::thread> threads;
-    for (unsigned seed = 0; seed < 8; ++seed)
-        threads.emplace_back([&, seed] {
-            std::mt19937 random(seed);
-            ThThread self = nullptr;
-            ThPseudoThreadCreate(&self);
-            do {
-                for (int i = 0; i < 1000; ++i) DoAnything(random);
-                operations += 1000;
-            } while (std::chrono::steady_clock::now() < end);
-            ThThreadDestroy(self);
-        });
-    for (std::thread& thread : threads) thread.join();
+    InThreads(8, [&](int seed) {
+        std::mt19937 random(static_cast<unsigned>(seed));
+        ThThread self = nullptr;
+        ThPseudoThreadCreate(&self);
+        do {
+            for (int i = 0; i < 1000; ++i) DoAnything(random);
+            operations += 1000;
+        } while (std::chrono::steady_clock::now() < end);
+        ThThreadDestroy(self);
+    });
     for (int32 group = 0; group < 16; ++group) ChkThGroupOccurrences(group);
     RecordProperty("operations", std::to_string(operations));
     for (Slot& slot : slots) {
