@@ -14,12 +14,8 @@
 #include <tessel/sync/ThSleep.h>
 #include <tessel/time/Millisecs.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using ::testing::Contains;
-using ::testing::ElementsAre;
-using ::testing::EndsWith;
 
 struct Sync : ::testing::Test {
     test::ReportRecorder reports;
@@ -35,13 +31,6 @@ struct Sync : ::testing::Test {
         return mutex;
     }
 };
-
-template <class Work>
-void InThreads(int count, Work work) {
-    std::vector<std::thread> threads;
-    for (int i = 0; i < count; ++i) threads.emplace_back(work, i);
-    for (std::thread& thread : threads) thread.join();
-}
 
 TEST_F(Sync, SignalsCountAsOneUntilTheyAreTaken) {
     ThEvent event = NewEvent(true);
@@ -352,8 +341,8 @@ TEST(PlatformObjects, WorkByThemselves) {
             mutex->Unlock();
         }
     });
-    EXPECT_EACH(sum == 20000, DestroyPlatformMutex(mutex) == kNoErr);
+    EXPECT_EACH(sum == 20000, DestroyPlatformMutex(mutex) == kNoErr, DestroyPlatformMutex(nullptr) == kNoErr);
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test
