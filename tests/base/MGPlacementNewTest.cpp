@@ -3,7 +3,7 @@
 
 #include <new>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 std::string theEnds;
@@ -29,4 +29,4 @@ TEST(MGPlacementNew, ObjectsEndNewestFirstAndOnce) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test
