@@ -8,7 +8,7 @@
 
 #include <errno.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 constexpr bool k64Bit = sizeof(void*) == 8;
@@ -74,4 +74,4 @@ TEST(CPUInformation, TellsOfThisHost) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test
