@@ -251,11 +251,7 @@ int Remove(const Words& words) {
 // Writes a new file; one that is there already is replaced.
 void WriteWholeFile(const std::string& name, const std::string& bytes) {
     const OwnedPath path(name);
-    File_t* file = nullptr;
-    Check(FCreateAlways(&file, path.get(), 0, kFOpenWrite, kFDenyReadWrite, 0), name);
-    const MgErr err = FMWrite(file, static_cast<uint32>(bytes.size()), nullptr, bytes.data());
-    const MgErr closeErr = FMClose(file);
-    Check(err ? err : closeErr, name);
+    Check(FWriteWholeFile(path.get(), bytes.data(), bytes.size()), name);
 }
 
 int Append(const Words& words) {

@@ -123,7 +123,12 @@ OpenRsrc::OpenRsrc(const std::string& file, int32 mode) : file_(file) {
 }
 
 OpenRsrc::~OpenRsrc() {
-    if (refnum_) RCloseFileForce(refnum_);
+    if (!refnum_) return;
+    // What was refused is not done behind the user's back.
+    uint32 attrs = 0;
+    RGetFileAttrs(refnum_, &attrs);
+    if (attrs & kRFileChanged) RSetFileAttrs(refnum_, attrs & ~static_cast<uint32>(kRFileChanged));
+    RCloseFile(refnum_);
 }
 
 void OpenRsrc::Close() {

@@ -1,4 +1,5 @@
 // The command `tessel`: what the library does with files, from the command line.
+#include "Prefs.h"
 #include "Rsrc.h"
 #include "Support.h"
 
@@ -16,6 +17,7 @@ void PrintHelp() {
     std::printf(
         "usage: tessel COMMAND ARGUMENTS\n"
         "\n"
+        "  prefs    lists, reads, changes and checks preference files\n"
         "  rsrc     lists, reads, creates, changes and checks resource files\n"
         "\n"
         "`tessel COMMAND --help` says more. FILE names are those of this system.\n"
@@ -28,7 +30,9 @@ int Run(const std::vector<std::string>& words) {
         PrintHelp();
         return 0;
     }
-    if (words[0] == "rsrc") return tool::RunRsrc(std::vector<std::string>(words.begin() + 1, words.end()));
+    const std::vector<std::string> rest(words.begin() + 1, words.end());
+    if (words[0] == "prefs") return tool::RunPrefs(rest);
+    if (words[0] == "rsrc") return tool::RunRsrc(rest);
     throw tool::UsageError{"there is no command " + words[0]};
 }
 

@@ -11,6 +11,14 @@
 #include <tessel/base/OVExcept.h>
 #include <tessel/base/StringTypes.h>
 #include <tessel/base/Types.h>
+#include <tessel/config/CfgData.h>
+#include <tessel/config/CfgSettings.h>
+#include <tessel/config/ConfigCoreTypes.h>
+#include <tessel/config/ConfigEnum.h>
+#include <tessel/config/ConfigManager.h>
+#include <tessel/config/ConfigOperations.h>
+#include <tessel/config/ConfigTypeRegistry.h>
+#include <tessel/config/HardWaitBehavior.h>
 #include <tessel/diagnostics/AllocTracker.h>
 #include <tessel/diagnostics/DebugOutput.h>
 #include <tessel/diagnostics/DebugStream.h>

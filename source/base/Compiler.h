@@ -13,6 +13,6 @@
 #define TESSEL_FAST_THREAD_LOCAL [[gnu::tls_model("initial-exec")]] thread_local
 
 // For code that reads memory which others may own or write, as walks over stacks do.
-#define TESSEL_NOT_SANITIZED [[gnu::no_sanitize("address"), gnu::no_sanitize("thread")]]
+#define TESSEL_NOT_SANITIZED __attribute__((no_sanitize("address", "thread")))
 
 #endif

@@ -6,22 +6,22 @@ using tessel::MGAppInterface;
 
 namespace {
 
-std::atomic<MGAppInterface*> theApp{nullptr};
+std::atomic<MGAppInterface*> installedApp{nullptr};
 
 // Asks the object, or for null the installed one.
 template <class Result>
 Result Ask(MGAppInterface* app, Result (MGAppInterface::*query)()) {
-    if (!app) app = theApp;
+    if (!app) app = installedApp;
     return app ? (app->*query)() : Result{0};
 }
 
 }  // namespace
 
 void MGAppInterfaceSet(MGAppInterfacePtr app) {
-    theApp = app;
+    installedApp = app;
 }
 MGAppInterfacePtr MGApp(void) {
-    return theApp;
+    return installedApp;
 }
 
 uint32 MGGetAppAPIVersion(MGAppInterfacePtr app) {

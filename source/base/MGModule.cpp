@@ -19,8 +19,8 @@ namespace {
 constexpr size_t kExtensionLength = 4;  // with its dot
 constexpr size_t kShortestWithLocation = 7;
 
-std::atomic<MGModuleHandle> theInstance{0};
-std::atomic<MGModuleHandle> theModule{0};
+std::atomic<MGModuleHandle> executableModule{0};
+std::atomic<MGModuleHandle> ownModule{0};
 
 int32 CopyText(const std::string& text, char* buffer, size_t size) {
     const size_t length = std::min(text.size(), size - 1);
@@ -98,16 +98,16 @@ void WriteDate(int64 time, char* out) {
 using namespace tessel;
 
 void MGModuleSetInstance(MGModuleHandle module) {
-    theInstance = module;
+    executableModule = module;
 }
 MGModuleHandle MGModuleGetInstance(void) {
-    return theInstance;
+    return executableModule;
 }
 void MGModuleSetModule(MGModuleHandle module) {
-    theModule = module;
+    ownModule = module;
 }
 MGModuleHandle MGModuleGetModule(void) {
-    return theModule;
+    return ownModule;
 }
 
 int32 MSWinGetModulePath(MGModuleHandle module, char* buffer, int32 size) try {

@@ -5,7 +5,7 @@
 namespace tessel {
 namespace {
 
-std::atomic<MGPlacementDeletor*> theNewest{nullptr};
+std::atomic<MGPlacementDeletor*> newestDeletor{nullptr};
 
 }  // namespace
 
@@ -13,13 +13,13 @@ MGPlacementDeletor::~MGPlacementDeletor() = default;
 
 void MGPlacementNewRegisterDeletor(MGPlacementDeletor* deletor) {
     if (!deletor) return;
-    deletor->next_ = theNewest.load();
-    while (!theNewest.compare_exchange_weak(deletor->next_, deletor)) {
+    deletor->next_ = newestDeletor.load();
+    while (!newestDeletor.compare_exchange_weak(deletor->next_, deletor)) {
     }
 }
 
 void MGPlacementNewRunCleanup() {
-    for (MGPlacementDeletor* deletor = theNewest.exchange(nullptr); deletor;) {
+    for (MGPlacementDeletor* deletor = newestDeletor.exchange(nullptr); deletor;) {
         MGPlacementDeletor* const next = deletor->next_;
         delete deletor;
         deletor = next;

@@ -11,9 +11,10 @@ namespace {
 constexpr uint32 kFirstSlots = 16;
 constexpr int kSpinsBeforeYield = 64;
 
-struct SpinLockHolder {
-    explicit SpinLockHolder(SpinLock& lock) : lock_(lock) { lock_.Lock(); }
-    ~SpinLockHolder() { lock_.Unlock(); }
+class TESSEL_LOCKS(scoped_lockable) SpinLockHolder {
+public:
+    explicit SpinLockHolder(SpinLock& lock) TESSEL_LOCKS(acquire_capability(lock)) : lock_(lock) { lock_.Lock(); }
+    ~SpinLockHolder() TESSEL_LOCKS(release_capability()) { lock_.Unlock(); }
     SpinLockHolder(const SpinLockHolder&) = delete;
     SpinLockHolder& operator=(const SpinLockHolder&) = delete;
 

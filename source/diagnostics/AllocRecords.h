@@ -20,12 +20,12 @@ struct AllocRecord {
 };
 
 // Held for a few instructions; a shard that grows is the exception.
-class SpinLock {
+class TESSEL_LOCKS(capability("mutex")) SpinLock {
 public:
-    void Lock() {
+    void Lock() TESSEL_LOCKS(acquire_capability()) {
         if (held_.exchange(true, std::memory_order_acquire)) LockSlowly();
     }
-    void Unlock() { held_.store(false, std::memory_order_release); }
+    void Unlock() TESSEL_LOCKS(release_capability()) { held_.store(false, std::memory_order_release); }
 
 private:
     void LockSlowly();
@@ -70,22 +70,22 @@ private:
     static constexpr int kShardBits = 6;  // a bit for each shard fits into a word
 
     struct alignas(64) Shard {
-        SpinLock lock;    // guards the rest
-        uint32 mask = 0;  // slots - 1
-        AllocRecord* slots = nullptr;
-        Counts counts{};
+        SpinLock lock;
+        uint32 mask TESSEL_GUARDED_BY(lock) = 0;  // slots - 1
+        AllocRecord* slots TESSEL_GUARDED_BY(lock) = nullptr;
+        Counts counts TESSEL_GUARDED_BY(lock){};
         // What can be added before there is more than ever: what was removed from it. So a thread that makes and
         // releases in turn raises no total that others share, and still no peak is missed.
-        Amount room;
+        Amount room TESSEL_GUARDED_BY(lock);
     };
     struct Place;
 
-    static AllocRecord* Look(const Shard& shard, Place place);
-    bool Grow(Shard& shard, TrackerFailure& failure);
+    static AllocRecord* Look(const Shard& shard, Place place) TESSEL_REQUIRES(shard.lock);
+    bool Grow(Shard& shard, TrackerFailure& failure) TESSEL_REQUIRES(shard.lock);
     Shard& ShardOf(Place place);
     Insertion InsertInto(Shard& shard, Place place, AllocRecord record, AllocRecord& earlier, bool& isMore,
                          TrackerFailure& failure);
-    void GiveRoom(Shard& shard, uint32 size);
+    void GiveRoom(Shard& shard, uint32 size) TESSEL_REQUIRES(shard.lock);
     void TakeRoom(uint32 size);
 
     TrackerHeap& heap_;
@@ -93,9 +93,9 @@ private:
     std::atomic<uint64> withRoom_{0};  // a bit for each shard that has room
 
     alignas(64) std::atomic<uint64> made_{0};
-    alignas(64) SpinLock mostLock_;  // guards the rest; locks of shards are taken inside
-    Amount most_;
-    Amount room_;  // that of no shard
+    alignas(64) SpinLock mostLock_;  // locks of shards are taken inside
+    Amount most_ TESSEL_GUARDED_BY(mostLock_);
+    Amount room_ TESSEL_GUARDED_BY(mostLock_);  // that of no shard
 };
 
 }  // namespace tessel

@@ -118,8 +118,7 @@ void AllocTracker::Implementation::Deactivate(TrackerFailure failure) {
     records_.Clear();
 }
 
-// Writes from a copy, so that no lock is held while the dumper works.
-// work(records, count) on a copy of the records.
+// Calls work(records, count) on a copy of the records, so that no lock is held while a dumper works.
 template <class Work>
 void AllocTracker::Implementation::WithRecords(AllocRecords::Which which, Work work) {
     if (IsIdle()) return;

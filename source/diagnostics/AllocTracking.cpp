@@ -12,7 +12,7 @@ namespace tessel {
 namespace {
 
 enum class Tracking { kNotAsked, kOff, kOn };
-std::atomic<Tracking> theTracking{Tracking::kNotAsked};
+std::atomic<Tracking> tracking{Tracking::kNotAsked};
 
 constexpr char kVariable[] = "OV_ALLOC_TRACKER";
 constexpr char kOff[] = "off";
@@ -33,12 +33,12 @@ bool IsOffInArguments() {
 }  // namespace
 
 bool IsAllocTrackingOn() {
-    if (theTracking == Tracking::kNotAsked) SetAllocTracking(!IsOffInEnvironment() && !IsOffInArguments());
-    return theTracking == Tracking::kOn;
+    if (tracking == Tracking::kNotAsked) SetAllocTracking(!IsOffInEnvironment() && !IsOffInArguments());
+    return tracking == Tracking::kOn;
 }
 
 void SetAllocTracking(bool on) {
-    theTracking = on ? Tracking::kOn : Tracking::kOff;
+    tracking = on ? Tracking::kOn : Tracking::kOff;
 }
 
 }  // namespace tessel

@@ -13,13 +13,12 @@
 namespace tessel {
 namespace {
 
-constexpr uint32 kFirstSlots = 64;
 constexpr size_t kChunkSize = 16 * 1024;
 constexpr int32 kMostSkipRemembered = 8;
 constexpr int32 kMostFrames = CallStack::kCapacity + kMostSkipRemembered;
 constexpr int kWalksRemembered = 16;
 
-std::atomic<uint64> theNextSerial{1};
+std::atomic<uint64> nextSerial{1};
 
 // One odd factor for each word of a key, so that the products do not wait for each other.
 constexpr auto kFactors = [] {
@@ -48,37 +47,37 @@ struct RememberedWalk {
 
 namespace {
 
-// What a thread remembers. All its own, so that no lock is needed.
-struct ThreadMemory {
+// What a thread remembers: the walks it did last, and for whom it is reporting. All its own, so that no lock is needed.
+struct RememberedWalks {
     const CallSites* reporting;
     RememberedWalk walks[kWalksRemembered];
 };
 
-TESSEL_FAST_THREAD_LOCAL ThreadMemory* theMemory = nullptr;
-TESSEL_FAST_THREAD_LOCAL bool theThreadEnds = false;
+TESSEL_FAST_THREAD_LOCAL RememberedWalks* ownWalks = nullptr;
+TESSEL_FAST_THREAD_LOCAL bool threadEnds = false;
 
-struct ThreadMemoryOwner {
-    ~ThreadMemoryOwner() {
-        theThreadEnds = true;
-        std::free(std::exchange(theMemory, nullptr));
+struct RememberedWalksOwner {
+    ~RememberedWalksOwner() {
+        threadEnds = true;
+        std::free(std::exchange(ownWalks, nullptr));
     }
     bool alive = true;
 };
-thread_local ThreadMemoryOwner theOwner;
+thread_local RememberedWalksOwner walksOwner;
 
-TESSEL_NOT_INLINE ThreadMemory* MakeThreadMemory() {
-    if (theThreadEnds || !theOwner.alive) return nullptr;
-    return theMemory = static_cast<ThreadMemory*>(std::calloc(1, sizeof(ThreadMemory)));
+TESSEL_NOT_INLINE RememberedWalks* MakeWalks() {
+    if (threadEnds || !walksOwner.alive) return nullptr;
+    return ownWalks = static_cast<RememberedWalks*>(std::calloc(1, sizeof(RememberedWalks)));
 }
 
 // Null while the thread ends, and when there is no memory.
-ThreadMemory* MemoryOfThread() {
-    return theMemory ? theMemory : MakeThreadMemory();
+RememberedWalks* WalksOfThread() {
+    return ownWalks ? ownWalks : MakeWalks();
 }
 
-RememberedWalk& WalkFrom(ThreadMemory& memory, const StackFrame* frame, uint64 serial) {
+RememberedWalk& WalkFrom(RememberedWalks& mine, const StackFrame* frame, uint64 serial) {
     const auto hash = (reinterpret_cast<uintptr_t>(frame) >> 4) + serial * 5;
-    return memory.walks[(hash ^ (hash >> 4)) % kWalksRemembered];
+    return mine.walks[(hash ^ (hash >> 4)) % kWalksRemembered];
 }
 
 // The frames lie in the stack of this thread above the innermost one, so that they can be read whatever became of them.
@@ -144,7 +143,7 @@ struct CallSites::Key {
     const void* addresses[CallStack::kCapacity];
 };
 
-CallSites::CallSites(TrackerHeap& heap, int32 skip) : heap_(heap), serial_(theNextSerial.fetch_add(1)), skip_(skip) {
+CallSites::CallSites(TrackerHeap& heap, int32 skip) : heap_(heap), serial_(nextSerial.fetch_add(1)), skip_(skip) {
 }
 
 void CallSites::SetSkip(int32 skip) {
@@ -152,10 +151,10 @@ void CallSites::SetSkip(int32 skip) {
 }
 
 const CallSite* CallSites::Enter(const char* file, int32 line, const StackFrame* frame, TrackerFailure& failure) {
-    ThreadMemory* const memory = MemoryOfThread();
-    if (!memory) return Walk(file, line, frame, nullptr, failure);
-    if (memory->reporting == this) return nullptr;
-    RememberedWalk& walk = WalkFrom(*memory, frame, serial_);
+    RememberedWalks* const mine = WalksOfThread();
+    if (!mine) return Walk(file, line, frame, nullptr, failure);
+    if (mine->reporting == this) return nullptr;
+    RememberedWalk& walk = WalkFrom(*mine, frame, serial_);
     if (walk.first == frame && walk.serial == serial_ && walk.file == file && walk.line == line &&
         walk.skip == skip_.load(std::memory_order_relaxed) && IsSameWalk(walk))
         return walk.site;
@@ -190,19 +189,13 @@ const CallSite* CallSites::Walk(const char* file, int32 line, const StackFrame* 
 }
 
 const CallSite* CallSites::Find(const Key& key) const {
-    const Table* const table = table_.load(std::memory_order_acquire);
-    if (!table) return nullptr;
-    for (auto slot = static_cast<uint32>(key.hash >> 32);; ++slot) {
-        const CallSite* const site = table->slots[slot & table->mask].load(std::memory_order_acquire);
-        if (!site || key.Is(*site)) return site;
-    }
+    return sites_.Find(SiteKeys::HashOf(key.hash), [&key](const CallSite* site) { return key.Is(*site); });
 }
 
 const CallSite* CallSites::Add(const Key& key, TrackerFailure& failure) {
     platform::MutexHolder hold(mutex_);
     if (const CallSite* site = Find(key)) return site;
     if (count_ >= kMostStacks && key.count > 1) return nullptr;
-    if (!MakeRoom(failure)) return nullptr;
     const size_t stackSize = static_cast<size_t>(key.count) * sizeof key.addresses[0];
     auto* const site = static_cast<CallSite*>(AllocateSmall(offsetof(CallSite, addresses) + stackSize, failure));
     const char* const file = CopyText(key.file, failure);
@@ -214,10 +207,7 @@ const CallSite* CallSites::Add(const Key& key, TrackerFailure& failure) {
     site->count = key.count;
     std::memcpy(site->addresses, key.addresses, stackSize);
 
-    Table& table = *table_.load(std::memory_order_relaxed);
-    auto slot = static_cast<uint32>(key.hash >> 32);
-    while (table.slots[slot & table.mask].load(std::memory_order_relaxed)) ++slot;
-    table.slots[slot & table.mask].store(site, std::memory_order_release);
+    if (!sites_.Add(site, [&](size_t size) { return heap_.Allocate(size, failure); })) return nullptr;
     ++count_;
     return site;
 }
@@ -225,27 +215,6 @@ const CallSite* CallSites::Add(const Key& key, TrackerFailure& failure) {
 uint32 CallSites::Count() const {
     platform::MutexHolder hold(mutex_);
     return count_;
-}
-
-// Keeps half of the slots free. Readers may still be in the table that is replaced, so it stays until the end; together
-// those before are no larger than the current one.
-bool CallSites::MakeRoom(TrackerFailure& failure) {
-    const Table* const old = table_.load(std::memory_order_relaxed);
-    const uint32 oldSlots = old ? old->mask + 1 : 0;
-    if (old && 2 * (count_ + 1) <= oldSlots) return true;
-    const uint32 slots = old ? 2 * oldSlots : kFirstSlots;
-    auto* const table = static_cast<Table*>(heap_.Allocate(sizeof(Table) + slots * sizeof old->slots[0], failure));
-    if (!table) return false;
-    table->mask = slots - 1;
-    for (uint32 i = 0; i < oldSlots; ++i) {
-        const CallSite* const site = old->slots[i].load(std::memory_order_relaxed);
-        if (!site) continue;
-        auto slot = static_cast<uint32>(site->hash >> 32);
-        while (table->slots[slot & table->mask].load(std::memory_order_relaxed)) ++slot;
-        table->slots[slot & table->mask].store(site, std::memory_order_relaxed);
-    }
-    table_.store(table, std::memory_order_release);
-    return true;
 }
 
 void* CallSites::AllocateSmall(size_t size, TrackerFailure& failure) {
@@ -271,16 +240,16 @@ const char* CallSites::CopyText(const char* text, TrackerFailure& failure) {
     return copy ? static_cast<const char*>(std::memcpy(copy, text, size)) : nullptr;
 }
 
-CallSites::Reporting::Reporting(const CallSites& sites) : outer_(theMemory ? theMemory->reporting : nullptr) {
-    if (ThreadMemory* memory = MemoryOfThread()) memory->reporting = &sites;
+CallSites::Reporting::Reporting(const CallSites& sites) : outer_(ownWalks ? ownWalks->reporting : nullptr) {
+    if (RememberedWalks* mine = WalksOfThread()) mine->reporting = &sites;
 }
 
 CallSites::Reporting::~Reporting() {
-    if (theMemory) theMemory->reporting = outer_;
+    if (ownWalks) ownWalks->reporting = outer_;
 }
 
 bool CallSites::IsReporting() const {
-    return theMemory && theMemory->reporting == this;
+    return ownWalks && ownWalks->reporting == this;
 }
 
 }  // namespace tessel

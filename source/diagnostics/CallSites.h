@@ -6,6 +6,7 @@
 #ifndef TESSEL_SOURCE_DIAGNOSTICS_CALLSITES_H
 #define TESSEL_SOURCE_DIAGNOSTICS_CALLSITES_H
 
+#include "base/ReadMostlyTable.h"
 #include "diagnostics/CallStackWalk.h"
 #include "diagnostics/TrackerHeap.h"
 #include <tessel/base/OVExcept.h>
@@ -59,29 +60,34 @@ public:
     bool IsReporting() const;
 
 private:
-    struct Table {
-        uint32 mask;  // slots - 1
-        std::atomic<const CallSite*> slots[1];
-    };
     struct Key;
+    struct SiteKeys {
+        static constexpr uint32 kFirstSlots = 64;
+        static constexpr uint32 kSlotsPerUsed = 2;
+        static constexpr uint32 kMostHashes = 1;
+        static constexpr bool kRemoves = false;
+
+        static uint32 Hashes(const CallSite*) { return 1; }
+        static uint32 Hash(const CallSite* site, uint32) { return HashOf(site->hash); }
+        static uint32 HashOf(uint64 hash) { return static_cast<uint32>(hash >> 32); }
+    };
 
     const CallSite* Walk(const char* file, int32 line, const StackFrame* frame, RememberedWalk* remembered,
                          TrackerFailure& failure);
     const CallSite* Find(const Key& key) const;
     const CallSite* Add(const Key& key, TrackerFailure& failure);
-    bool MakeRoom(TrackerFailure& failure);
-    void* AllocateSmall(size_t size, TrackerFailure& failure);
-    const char* CopyText(const char* text, TrackerFailure& failure);
+    void* AllocateSmall(size_t size, TrackerFailure& failure) TESSEL_REQUIRES(mutex_);
+    const char* CopyText(const char* text, TrackerFailure& failure) TESSEL_REQUIRES(mutex_);
 
     TrackerHeap& heap_;
     const uint64 serial_;  // unlike that of any other table there ever was, for what threads remember
     std::atomic<int32> skip_;
-    std::atomic<Table*> table_{nullptr};
+    ReadMostlyTable<const CallSite, SiteKeys> sites_;
 
-    mutable platform::Mutex mutex_;  // guards what follows, and changes of the table
-    uint32 count_ = 0;
-    char* small_ = nullptr;  // the unused rest of the newest chunk
-    size_t smallLeft_ = 0;
+    mutable platform::Mutex mutex_;  // guards changes of the sites too
+    uint32 count_ TESSEL_GUARDED_BY(mutex_) = 0;
+    char* small_ TESSEL_GUARDED_BY(mutex_) = nullptr;  // the unused rest of the newest chunk
+    size_t smallLeft_ TESSEL_GUARDED_BY(mutex_) = 0;
 };
 
 }  // namespace tessel

@@ -17,14 +17,14 @@ constexpr int kMostNestedReports = 8;  // a handler whose own work is reported, 
 constexpr int kBytesPerLine = 16;
 constexpr size_t kMessageSize = 1024;
 
-std::atomic<DebugOutputHandler> theHandler{nullptr};
-std::atomic<int32> theEventCounts[kNumDebugLevels];
-volatile int32 theStopHereResult = 0;
-TESSEL_FAST_THREAD_LOCAL int theNestedReports = 0;
+std::atomic<DebugOutputHandler> installedHandler{nullptr};
+std::atomic<int32> eventCounts[kNumDebugLevels];
+volatile int32 stopHereResult = 0;
+TESSEL_FAST_THREAD_LOCAL int nestedReports = 0;
 
 struct NestedReport {
-    NestedReport() { ++theNestedReports; }
-    ~NestedReport() { --theNestedReports; }
+    NestedReport() { ++nestedReports; }
+    ~NestedReport() { --nestedReports; }
 };
 
 bool IsLevel(int32 level) {
@@ -85,35 +85,35 @@ void DumpLine(const uint8* from) {
 using namespace tessel;
 
 DebugOutputHandler DebugOutputSetHandler(DebugOutputHandler handler) {
-    theHandler.store(handler);
+    installedHandler.store(handler);
     return handler;
 }
 
 DebugOutputHandler DebugOutputGetHandler(void) {
-    return theHandler.load();
+    return installedHandler.load();
 }
 
 // A handler that reports, which calls the handler again, would never end: what is nested too deep takes the default
 // behaviour, which reports nothing.
 void DebugOutputCallHandler(CStr file, int32 line, CStr identifier, int32 level, uint32 siteCode, CStr text) {
     NestedReport nested;
-    DebugOutputHandler handler = theHandler.load(std::memory_order_acquire);
-    if (handler && theNestedReports <= kMostNestedReports)
+    DebugOutputHandler handler = installedHandler.load(std::memory_order_acquire);
+    if (handler && nestedReports <= kMostNestedReports)
         handler(OrEmpty(file), line, OrEmpty(identifier), level, siteCode, OrEmpty(text));
     else
         DefaultHandler(OrEmpty(file), line, level, siteCode, OrEmpty(text));
 }
 
 int32 DebugOutputGetNumEvents(int32 level) {
-    return IsLevel(level) ? theEventCounts[level].load() : 0;
+    return IsLevel(level) ? eventCounts[level].load() : 0;
 }
 
 void DebugOutputResetNumEvents(void) {
-    for (auto& count : theEventCounts) count.store(0);
+    for (auto& count : eventCounts) count.store(0);
 }
 
 void DebugOutputIncrementEventCount(int32 level) {
-    if (IsLevel(level)) theEventCounts[level].fetch_add(1, std::memory_order_relaxed);
+    if (IsLevel(level)) eventCounts[level].fetch_add(1, std::memory_order_relaxed);
 }
 
 void DebugOutputCoreBreak(CStr text) {
@@ -128,7 +128,7 @@ void DebugOutputCoreDie(void) {
 int32 StopHere(CStr text) {
     DebugOutputCoreBreak(text);
     TESSEL_REPORT(kDebugInfo, 0x2C77A9D4u) << "StopHere: " << text;
-    return theStopHereResult;
+    return stopHereResult;
 }
 
 void DumpSomeMemory(const void* memory, int32 length) {

@@ -21,14 +21,14 @@ struct Slot {
 };
 static_assert(sizeof(Slot) == 260);
 
-Slot thePool[kPoolSlots];
-std::atomic<bool> thePoolReady{false};
-std::atomic<int32> theFailedCheckouts{0};
+Slot pool[kPoolSlots];
+std::atomic<bool> poolIsReady{false};
+std::atomic<int32> failedCheckouts{0};
 
 // For a thread that can get no memory, so it is there from the start. One stream of the thread has it, the others go
 // without text.
-TESSEL_FAST_THREAD_LOCAL Slot theLastResort;
-char theNoText[1];
+TESSEL_FAST_THREAD_LOCAL Slot lastResort;
+char noText[1];
 
 bool Claim(Slot& slot) {
     std::atomic_ref<uint32> inUse(slot.inUse);
@@ -38,10 +38,10 @@ bool Claim(Slot& slot) {
 }
 
 Slot* ClaimFromPool() {
-    if (!thePoolReady.load(std::memory_order_acquire)) return nullptr;
-    for (Slot& slot : thePool)
+    if (!poolIsReady.load(std::memory_order_acquire)) return nullptr;
+    for (Slot& slot : pool)
         if (Claim(slot)) return &slot;
-    theFailedCheckouts.fetch_add(1, std::memory_order_relaxed);
+    failedCheckouts.fetch_add(1, std::memory_order_relaxed);
     return nullptr;
 }
 
@@ -79,23 +79,19 @@ void AppendComplex(DebugStream& stream, const Complex& value) {
 }  // namespace
 
 MgErr DebugStreamStart() {
-    for (Slot& slot : thePool) std::atomic_ref<uint32>(slot.inUse).store(0);
-    theFailedCheckouts = 0;
-    thePoolReady = true;
+    for (Slot& slot : pool) std::atomic_ref<uint32>(slot.inUse).store(0);
+    failedCheckouts = 0;
+    poolIsReady = true;
     return kNoErr;
 }
 
 MgErr DebugStreamStop() {
-    thePoolReady = false;
-    const int32 failed = theFailedCheckouts;
+    poolIsReady = false;
+    const int32 failed = failedCheckouts;
     if (failed != 0)
         TESSEL_REPORT(kDebugWarning, 0x51D2E80Fu)
             << "DebugStream_Service: " << failed << " failed checkouts forced a private buffer.";
     return kNoErr;
-}
-
-int32 DebugStreamFailedCheckouts() {
-    return theFailedCheckouts;
 }
 
 DebugStream::DebugStream(CStr file, int32 line, CStr identifier, _DebugOutputLevel level) noexcept
@@ -105,11 +101,11 @@ DebugStream::DebugStream(CStr file, int32 line, CStr identifier, _DebugOutputLev
         inUse_ = &slot->inUse;
     } else if (void* buffer = std::malloc(kTextSize)) {
         text_ = static_cast<char*>(buffer);
-    } else if (Claim(theLastResort)) {
-        text_ = theLastResort.text;
-        inUse_ = &theLastResort.inUse;
+    } else if (Claim(lastResort)) {
+        text_ = lastResort.text;
+        inUse_ = &lastResort.inUse;
     } else {
-        text_ = write_ = last_ = theNoText;
+        text_ = write_ = last_ = noText;
         return;
     }
     write_ = text_;
@@ -137,10 +133,10 @@ void DebugStream::Process() {
 void DebugStream::GiveBack() noexcept {
     if (inUse_)
         std::atomic_ref<uint32>(*inUse_).store(0, std::memory_order_release);
-    else if (text_ != theNoText)
+    else if (text_ != noText)
         std::free(text_);
     inUse_ = nullptr;
-    text_ = write_ = last_ = theNoText;
+    text_ = write_ = last_ = noText;
 }
 
 DebugReport::DebugReport(CStr file, int32 line, CStr identifier, _DebugOutputLevel level, uint32 siteCode)

@@ -10,9 +10,6 @@ namespace tessel {
 MgErr DebugStreamStart();
 MgErr DebugStreamStop();
 
-// How many reports found no free buffer in the pool since the start.
-int32 DebugStreamFailedCheckouts();
-
 }  // namespace tessel
 
 #endif

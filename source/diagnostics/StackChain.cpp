@@ -20,7 +20,7 @@ const char* OrUnknown(const std::string& name) {
 }  // namespace
 
 // Reads frames that belong to other functions, which a sanitizer would take for an error.
-TESSEL_NOT_SANITIZED TESSEL_NOT_INLINE int32 WalkCallStack(const void** addresses, int32 capacity,
+TESSEL_NOT_INLINE TESSEL_NOT_SANITIZED int32 WalkCallStack(const void** addresses, int32 capacity,
                                                            const void* framePointer, const void* returnAddress,
                                                            int32 skip) noexcept {
     const auto [low, high] = platform::CurrentStackBounds();

@@ -13,21 +13,21 @@ constexpr TrackerHeapSource kCAllocator = {
     },
 };
 
-TrackerHeapSource theSource = kCAllocator;
+TrackerHeapSource heapSource = kCAllocator;
 
 }  // namespace
 
 void SetTrackerHeapSource(const TrackerHeapSource& source) {
-    theSource = source;
+    heapSource = source;
 }
 void ResetTrackerHeapSource() {
-    theSource = kCAllocator;
+    heapSource = kCAllocator;
 }
 
 TrackerHeap::~TrackerHeap() {
     for (Block* block = list_.next; block != &list_;) {
         Block* const next = block->next;
-        theSource.release(block);
+        heapSource.release(block);
         block = next;
     }
 }
@@ -39,7 +39,7 @@ bool TrackerHeap::Holds(const Block* block) const {
 }
 
 void* TrackerHeap::Allocate(size_t size, TrackerFailure& failure) {
-    auto* block = static_cast<Block*>(theSource.allocate(sizeof(Block) + size));
+    auto* block = static_cast<Block*>(heapSource.allocate(sizeof(Block) + size));
     if (!block) {
         failure = TrackerFailure::kOutOfMemory;
         return nullptr;
@@ -62,7 +62,7 @@ void TrackerHeap::Release(void* memory, TrackerFailure& failure) {
         block->previous->next = block->next;
         block->next->previous = block->previous;
     }
-    if (!theSource.release(block)) failure = TrackerFailure::kFreeError;
+    if (!heapSource.release(block)) failure = TrackerFailure::kFreeError;
 }
 
 }  // namespace tessel

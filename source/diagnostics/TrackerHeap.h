@@ -37,10 +37,10 @@ private:
         Block* next;
         Block* previous;
     };
-    bool Holds(const Block* block) const;
+    bool Holds(const Block* block) const TESSEL_REQUIRES(mutex_);
 
-    platform::Mutex mutex_;  // guards the list
-    Block list_{&list_, &list_};
+    platform::Mutex mutex_;
+    Block list_ TESSEL_GUARDED_BY(mutex_){&list_, &list_};
 };
 
 }  // namespace tessel

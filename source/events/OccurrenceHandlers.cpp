@@ -1,3 +1,4 @@
+// What becomes of a handler: the lists it is on, bound, armed, fired and run.
 #include "events/OccurrenceThread.h"
 #include "events/Occurrences.h"
 #include "events/ThreadGroups.h"
@@ -12,7 +13,7 @@ void LeaveTimedList(occh& handler) {
     if (!(handler.flags & kOnTimedList)) return;
     handler.flags &= ~kOnTimedList;
     OccurrenceLockHolder timed(gTimedHdlrMutex);
-    gTimedHandlers.Remove(handler.timeout);
+    timedHandlers.Remove(handler.timeout);
 }
 
 void Unbind(occh& handler) {
@@ -25,9 +26,9 @@ void Fire(occh& handler, bool timedOut, OccurrenceReports& reports) {
     handler.armed = 0;
     handler.fired = 1;
     LeaveTimedList(handler);
-    handler.flags = timedOut ? handler.flags | kTimedOut : handler.flags & ~kTimedOut;
+    handler.flags = timedOut ? handler.flags | kHasTimedOut : handler.flags & ~kHasTimedOut;
     if (IsDamaged(handler.firedNode, handler)) reports.Add(OccurrenceReports::kBogusFired);
-    ThreadGroup& group = gThreadGroups[handler.group];
+    ThreadGroup& group = threadGroups[handler.group];
     group.fired.PushFront(handler.firedNode);
     if (group.notify) group.notify(group.argument);
 }
@@ -114,12 +115,12 @@ bool JoinTimedList(occh& handler, int32 milliseconds, OccurrenceReports& reports
     OccurrenceLockHolder timed(gTimedHdlrMutex);
     if (handler.timeout.IsListed() || handler.timeout.GetRefnum() != handler.refnum) {
         reports.Add(OccurrenceReports::kBogusTimed);
-        gTimedHandlers.Remove(handler.timeout);
+        timedHandlers.Remove(handler.timeout);
         handler.timeout.SetRefnum(handler.refnum);
     }
-    gTimedHandlers.Insert(handler.timeout, deadline ? deadline : 1, now, TimeList::Among::kAfterEquals);
+    timedHandlers.Insert(handler.timeout, deadline ? deadline : 1, now, TimeList::Among::kAfterEquals);
     handler.flags |= kOnTimedList;
-    return gTimedHandlers.IsFirst(handler.timeout);
+    return timedHandlers.IsFirst(handler.timeout);
 }
 
 Outcome RunNow(occh& handler, MgErr err) {
@@ -132,14 +133,14 @@ Outcome ArmRecord(occh& handler, const Arming& arming, OccurrenceReports& report
     LeaveTimedList(handler);
     const Occ* occurrence = FindOccurrence(handler.occurrence);
     if (!occurrence) {
-        handler.flags |= kTimedOut;
+        handler.flags |= kHasTimedOut;
         return RunNow(handler, kOccurrenceGoneErr);
     }
-    if (arming.withTimeout) handler.flags &= ~kTimedOut;
+    if (arming.withTimeout) handler.flags &= ~kHasTimedOut;
     if (handler.group != kThreadSafeGroup) handler.group = OwnThreadGroup();
     if (arming.reset) handler.seen = occurrence->count;
     if (handler.seen != occurrence->count) {
-        handler.flags &= ~kTimedOut;
+        handler.flags &= ~kHasTimedOut;
         handler.seen = handler.flags & kStrict ? NextCount(handler.seen) : occurrence->count;
         return RunNow(handler, kNoErr);
     }
@@ -246,5 +247,5 @@ MgErr FireOccurHdlr(OccurHdlr handler) {
 bool HandlerTimedOut(OccurHdlr handler) {
     OccurrenceLockHolder holder(gOccMutex);
     const occh* record = FindHandler(handler);
-    return record && (record->flags & kTimedOut);
+    return record && (record->flags & kHasTimedOut);
 }

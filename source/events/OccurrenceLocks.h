@@ -5,16 +5,8 @@
 #ifndef TESSEL_SOURCE_EVENTS_OCCURRENCELOCKS_H
 #define TESSEL_SOURCE_EVENTS_OCCURRENCELOCKS_H
 
+#include "platform/LockMarks.h"
 #include <tessel/sync/ThMutex.h>
-
-#if defined(__clang__)
-#    define TESSEL_LOCKS(...) __attribute__((__VA_ARGS__))
-#else
-#    define TESSEL_LOCKS(...)
-#endif
-#define TESSEL_GUARDED_BY(lock) TESSEL_LOCKS(guarded_by(lock))
-#define TESSEL_REQUIRES(...) TESSEL_LOCKS(requires_capability(__VA_ARGS__))
-#define TESSEL_ACQUIRED_AFTER(lock) TESSEL_LOCKS(acquired_after(lock))
 
 #if defined(__SANITIZE_THREAD__) || defined(__SANITIZE_ADDRESS__)
 #    define TESSEL_CHECK_LOCK_ORDER 1

@@ -59,7 +59,7 @@ struct Occ {
 };
 
 // The bits of a handler's flags.
-enum : uint32 { kOnTimedList = 1, kTimedOut = 2, kStrict = 4 };
+enum : uint32 { kOnTimedList = 1, kHasTimedOut = 2, kStrict = 4 };
 
 // A handler.
 struct occh {

@@ -14,8 +14,8 @@
 
 namespace tessel {
 
-TimeList gSchedule;
-TimeList gTimedHandlers;
+TimeList schedule;
+TimeList timedHandlers;
 
 namespace {
 
@@ -40,14 +40,14 @@ uint32 NeverZero(uint32 time) {
 bool SetNextDue(uint32 now) {
     OccurrenceReports reports;
     OccurrenceLockHolder timer(gTimerOccMutex);
-    const Occurrence due = gSchedule.FirstDue(now);
+    const Occurrence due = schedule.FirstDue(now);
     if (!due) return false;
     OccurrenceLockHolder holder(gOccMutex);
     if (Occ* occurrence = FindOccurrence(due)) {
-        gSchedule.Remove(occurrence->schedule);
+        schedule.Remove(occurrence->schedule);
         SetOccurrence(*occurrence, reports);
     } else {
-        gSchedule.DropFirst();
+        schedule.DropFirst();
     }
     return true;
 }
@@ -55,13 +55,13 @@ bool SetNextDue(uint32 now) {
 // Takes the first handler whose deadline has come off the list; null when it is none. False when none is due.
 bool TakeTimedOut(uint32 now, occh*& handler) TESSEL_REQUIRES(gOccMutex) {
     OccurrenceLockHolder timed(gTimedHdlrMutex);
-    const OccurHdlr due = gTimedHandlers.FirstDue(now);
+    const OccurHdlr due = timedHandlers.FirstDue(now);
     handler = FindHandler(due);
     if (handler) {
-        gTimedHandlers.Remove(handler->timeout);
+        timedHandlers.Remove(handler->timeout);
         handler->flags &= ~kOnTimedList;
     } else if (due) {
-        gTimedHandlers.DropFirst();
+        timedHandlers.DropFirst();
     }
     return due != 0;
 }
@@ -82,12 +82,12 @@ bool FireNextTimedOut(uint32 now) {
 
 size_t CountScheduledDue(uint32 now) {
     OccurrenceLockHolder timer(gTimerOccMutex);
-    return gSchedule.CountDue(now);
+    return schedule.CountDue(now);
 }
 
 size_t CountTimeOutsDue(uint32 now) {
     OccurrenceLockHolder timed(gTimedHdlrMutex);
-    return gTimedHandlers.CountDue(now);
+    return timedHandlers.CountDue(now);
 }
 
 // As much as is due now: what callbacks schedule for now has its turn in the next round.
@@ -117,20 +117,20 @@ int32 RunOccurrenceThread(void*) {
 void UpdateWakeUp() {
     if (!timedEvent) return;
     OccurrenceLockHolder timed(gTimedHdlrMutex);
-    ThTmoEventSetDeadline(*timedEvent, Earlier(gSchedule.FirstTime(), gTimedHandlers.FirstTime()));
+    ThTmoEventSetDeadline(*timedEvent, Earlier(schedule.FirstTime(), timedHandlers.FirstTime()));
 }
 
 void Unschedule(Occ& occurrence) {
-    const bool wasFirst = gSchedule.IsFirst(occurrence.schedule);
-    gSchedule.Remove(occurrence.schedule);
+    const bool wasFirst = schedule.IsFirst(occurrence.schedule);
+    schedule.Remove(occurrence.schedule);
     if (wasFirst) UpdateWakeUp();
 }
 
 void ForgetTimes() {
     OccurrenceLockHolder timer(gTimerOccMutex);
     OccurrenceLockHolder timed(gTimedHdlrMutex);
-    gSchedule.Forget();
-    gTimedHandlers.Forget();
+    schedule.Forget();
+    timedHandlers.Forget();
 }
 
 MgErr OccurrenceThreadStart(bool hardWaitTimeCritical) {
@@ -163,12 +163,12 @@ MgErr OccurAtTime(Occurrence occurrence, uint32 milliseconds) {
     OccurrenceLockHolder timer(gTimerOccMutex);
     Occ* record = nullptr;  // freed under the timer mutex only
     if (!occurrence || gOccurrences.GetCookieInfo(occurrence, &record) != kNoErr) return kArgErr;
-    const uint32 before = gSchedule.FirstTime(), time = NeverZero(milliseconds), now = MilliSecs();
+    const uint32 before = schedule.FirstTime(), time = NeverZero(milliseconds), now = MilliSecs();
     if (record->schedule.IsListed())
-        gSchedule.Move(record->schedule, time, now);
+        schedule.Move(record->schedule, time, now);
     else
-        gSchedule.Insert(record->schedule, time, now, TimeList::Among::kBeforeEquals);
-    if (gSchedule.FirstTime() != before) UpdateWakeUp();
+        schedule.Insert(record->schedule, time, now, TimeList::Among::kBeforeEquals);
+    if (schedule.FirstTime() != before) UpdateWakeUp();
     return kNoErr;
 }
 

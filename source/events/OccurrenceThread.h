@@ -9,7 +9,7 @@
 namespace tessel {
 
 // The occurrences with a schedule.
-extern TimeList gSchedule TESSEL_GUARDED_BY(gTimerOccMutex);
+extern TimeList schedule TESSEL_GUARDED_BY(gTimerOccMutex);
 
 // Lets the thread wake for what is due next. After a time was added in front; one that went away costs it a look.
 void UpdateWakeUp() TESSEL_REQUIRES(gTimerOccMutex);

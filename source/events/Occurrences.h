@@ -18,7 +18,7 @@ extern CookieJar<Occ*> gOccurrences;
 extern CookieJar<occh*> gHandlers;
 
 // The armed handlers with a deadline.
-extern TimeList gTimedHandlers TESSEL_GUARDED_BY(gTimedHdlrMutex);
+extern TimeList timedHandlers TESSEL_GUARDED_BY(gTimedHdlrMutex);
 
 // ---- reports and callbacks, once the locks are given back -----------------------------------------------------------
 

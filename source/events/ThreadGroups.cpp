@@ -9,7 +9,7 @@
 namespace tessel {
 
 // The lists and procedures are guarded by gOccMutex.
-ThreadGroup gThreadGroups[kNumOccThreadGroups + 1];
+ThreadGroup threadGroups[kNumOccThreadGroups + 1];
 
 namespace {
 
@@ -33,7 +33,7 @@ int32 RootOf(int32 index) {
 
 // Accounts for what a handler that runs has seen. One that timed out has seen nothing.
 void AccountForOccurrence(occh& handler) TESSEL_REQUIRES(gOccMutex) {
-    if (handler.flags & kTimedOut) return;
+    if (handler.flags & kHasTimedOut) return;
     const Occ* occurrence = FindOccurrence(handler.occurrence);
     if (!occurrence) return;
     handler.seen = handler.flags & kStrict ? NextCount(handler.seen) : occurrence->count;
@@ -65,7 +65,7 @@ void RunFired(ThreadGroup& group) {
 void ResetThreadGroups() {
     for (int32 i = 0; i < kNumOccThreadGroups; ++i)
         memberships[i].store({static_cast<uint32>(i), ThreadEndings(i)}, std::memory_order_relaxed);
-    for (ThreadGroup& group : gThreadGroups) {
+    for (ThreadGroup& group : threadGroups) {
         group.fired.Forget();
         group.notify = nullptr;
         group.argument = nullptr;
@@ -82,9 +82,9 @@ void RunThreadGroup(int32 group) {
     AsyncAreaWalk area;
     while (const Occurrence noted = area.Next()) {
         SetOccurrence(noted);
-        RunFired(gThreadGroups[kThreadSafeGroup]);
+        RunFired(threadGroups[kThreadSafeGroup]);
     }
-    RunFired(gThreadGroups[group]);
+    RunFired(threadGroups[group]);
 }
 
 }  // namespace tessel
@@ -102,7 +102,7 @@ MgErr SetOccThreadGroup(int32 threadIndex, int32 groupThreadIndex) {
 MgErr SetOccThreadGroupProc(int32 groupIndex, OccThreadGroupProc procedure, void* argument) {
     if (!IsGroup(groupIndex)) return kArgErr;
     OccurrenceLockHolder holder(gOccMutex);
-    ThreadGroup& group = gThreadGroups[RootOf(groupIndex)];
+    ThreadGroup& group = threadGroups[RootOf(groupIndex)];
     group.notify = procedure;
     group.argument = argument;
     return kNoErr;
@@ -119,7 +119,7 @@ MgErr ChkThGroupOccurrences(int32 group) {
 }
 
 bool QuickCheckGroupHandlersFired(int32 group) {
-    return IsGroup(group) && (!gThreadGroups[group].fired.IsEmpty() || AsyncAreaHasOccurrence());
+    return IsGroup(group) && (!threadGroups[group].fired.IsEmpty() || AsyncAreaHasOccurrence());
 }
 
 void SetOccurrenceManagerMainThreadGroupIndex(int32 group) {

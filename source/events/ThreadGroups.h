@@ -19,7 +19,7 @@ struct ThreadGroup {
 };
 
 // The last is kThreadSafeGroup.
-extern ThreadGroup gThreadGroups[kNumOccThreadGroups + 1];
+extern ThreadGroup threadGroups[kNumOccThreadGroups + 1];
 
 // Every thread is in a group of its own, and nobody is told.
 void ResetThreadGroups();

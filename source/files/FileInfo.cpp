@@ -83,36 +83,6 @@ MgErr DescribeItem(Path path, const char* name, uint8 mask, FInfo64Rec* info) {
     return kNoErr;
 }
 
-// The result for a failure while permissions were set.
-MgErr AccessRightsErr() {
-    switch (platform::LastError()) {
-        case platform::kErrorSuccess:
-            return kNoErr;
-        case platform::kErrorFileNotFound:
-        case platform::kErrorPathNotFound:
-            return kNotFoundErr;
-        case platform::kErrorInvalidHandle:
-        case platform::kErrorInvalidParameter:
-            return kArgErr;
-        case platform::kErrorNotEnoughMemory:
-            return kMemFullErr;
-        case platform::kErrorAccessDenied:
-            return kPermissionErr;
-        case platform::kErrorFileExists:
-        case platform::kErrorAlreadyExists:
-            return kExistsErr;
-        case platform::kErrorTooManyOpenFiles:
-            return kTooManyOpenErr;
-        case platform::kErrorDiskFull:
-            return kDiskFullErr;
-        case platform::kErrorSeek:
-        case platform::kErrorNegativeSeek:
-            return kEOFErr;
-        default:
-            return kIOErr;
-    }
-}
-
 MgErr SetDates(Path path, const FInfo64Rec& info) {
     File_t* file = nullptr;
     if (const MgErr err = FMOpen(&file, path, kFOpenWrite, kFDenyReadWrite)) return err;
@@ -366,7 +336,8 @@ MgErr FSetAccessRights(Path path, PStr owner, PStr group, int32* permissions) {
         if (FDepth(path) == 0) return kIOErr;
         PlatformName name;
         if (const MgErr err = name.Make(path, true)) return err;
-        if (!permissions) return FExists(path) ? kNoErr : kNotFoundErr;
+        platform::ItemInfo item;
+        if (!permissions) return platform::ItemGetInfo(name.Text(), item) ? kNoErr : AccessRightsErr();
         const auto mode = static_cast<uint32>(*permissions) & 0777;
         return platform::ItemSetMode(name.Text(), mode) ? kNoErr : AccessRightsErr();
     });

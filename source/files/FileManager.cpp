@@ -211,35 +211,3 @@ MgErr FPrintfWErrv(File_t* file, CStr format, va_list args) {
     uint32 written = 0;
     return PrintToFile(file, format, args, BadFormat::kWriteNothing, &written);
 }
-
-// ---- errors ---------------------------------------------------------------------------------------------------------
-
-MgErr Win32ToOVFileErr() {
-    switch (platform::LastError()) {
-        case platform::kErrorFileNotFound:
-        case platform::kErrorPathNotFound:
-        case platform::kErrorNotReady:
-        case platform::kErrorNetworkPathNotFound:
-        case platform::kErrorNotAFolder:
-            return kNotFoundErr;
-        case platform::kErrorAccessDenied:
-        case platform::kErrorLockViolation:
-            return kPermissionErr;
-        case platform::kErrorNotEnoughMemory:
-            return kMemFullErr;
-        case platform::kErrorSharingViolation:
-            return kFileInUseErr;
-        case platform::kErrorHandleDiskFull:
-        case platform::kErrorDiskFull:
-            return kDiskFullErr;
-        case platform::kErrorFileExists:
-        case platform::kErrorAlreadyExists:
-            return kExistsErr;
-        case platform::kErrorInvalidParameter:
-        case platform::kErrorInvalidName:
-        case platform::kErrorNotLocked:
-            return kArgErr;
-        default:
-            return kIOErr;
-    }
-}

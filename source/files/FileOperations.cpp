@@ -3,6 +3,7 @@
 #include "files/FileSupport.h"
 #include "platform/FileSystem.h"
 #include "platform/LastError.h"
+#include "platform/Replacement.h"
 #include "platform/Shell.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/FileManager.h>
@@ -10,11 +11,12 @@
 #include <tessel/paths/PathRef.h>
 #include <tessel/paths/PathTextFormat.h>
 
+#include <cstring>
+
 namespace tessel {
 
 namespace {
 
-constexpr uint32 kCopyBlock = 8192;
 constexpr int32 kNewFolderPermissions = 0777;
 
 // An open file that closes itself.
@@ -28,44 +30,63 @@ public:
     OpenFile& operator=(const OpenFile&) = delete;
 
     MgErr Open(Path path, int32 openMode, int32 denyMode) { return FMOpen(&file_, path, openMode, denyMode); }
-    MgErr Close() {
-        File_t* file = file_;
-        file_ = nullptr;
-        return FMClose(file);
-    }
-    File_t* get() const { return file_; }
+    platform::FileHandle get() const { return HandleOf(file_); }
 
 private:
     File_t* file_ = nullptr;
 };
 
-// Copies until a read returns nothing, and cuts the destination there.
-MgErr CopyBytes(File_t* from, File_t* to) {
-    uint8 block[kCopyBlock];
-    int64 copied = 0;
-    for (;;) {
-        uint32 got = 0;
-        const MgErr err = FMRead(from, kCopyBlock, &got, block);
-        if (err && err != kEOFErr) return kIOErr;
-        if (!got) break;
-        if (const MgErr writeErr = FMWrite(to, got, nullptr, block)) return writeErr;
-        copied += got;
-    }
-    return FSetEOF64(to, copied);
+MgErr ErrOfCopy(platform::CopyResult result) {
+    if (result == platform::CopyResult::kDone) return kNoErr;
+    return result == platform::CopyResult::kReadFailed ? kIOErr : Win32ToOVFileErr();
 }
 
-MgErr CopyInto(Path from, Path to) {
-    OpenFile source;
+// Deletes the copied source. That it stays is not told, unless it is because it has been written meanwhile.
+MgErr DeleteSource(Path from, const OpenFile& source, const platform::FileVersion& version, platform::FileHandle copy) {
+    PlatformName name, resolved;
+    if (name.Make(from, false) || resolved.Make(from, true)) return kNoErr;
+    if (std::strcmp(name.Text(), resolved.Text()) != 0) {
+        FRemove(from);  // a shortcut: it goes itself
+        return kNoErr;
+    }
+    if (platform::FileDeleteCopied(name.Text(), source.get(), version, copy)) return kNoErr;
+    return platform::LastError() == platform::kErrorSharingViolation ? kFileInUseErr : kNoErr;
+}
+
+// For a file that cannot be replaced: its own bytes change. The room is had first, so that a full disk changes none.
+MgErr OverwriteWith(Path from, const OpenFile& source, const OpenFile& destination) {
+    int64 size = 0;
+    if (!platform::FileSize(source.get(), size)) return kIOErr;
+    if (!platform::FileReserve(destination.get(), size)) return Win32ToOVFileErr();
+    platform::FileVersion version;
+    if (const MgErr err = ErrOfCopy(platform::FileCopyBytes(source.get(), destination.get(), false, version)))
+        return err;
+    if (!platform::FileFlush(destination.get())) return Win32ToOVFileErr();
+    return DeleteSource(from, source, version, destination.get());
+}
+
+MgErr MoveInto(Path from, Path to) {
+    OpenFile source, destination;
     if (const MgErr err = source.Open(from, kFOpenRead, kFDenyWrite)) return err;
-    OpenFile destination;
     if (const MgErr err = destination.Open(to, kFOpenWrite, kFDenyReadWrite)) {
         TESSEL_REPORT(kDebugWarning, 0x71B0E3A4u) << "FCopyIntoWin32 got error " << err;
         return err;
     }
-    if (const MgErr err = CopyBytes(source.get(), destination.get())) return err;
-    const MgErr sourceErr = source.Close();
-    const MgErr destinationErr = destination.Close();
-    return sourceErr || destinationErr ? kIOErr : kNoErr;
+    PlatformName name;
+    if (const MgErr err = name.Make(to, true)) return err;
+    platform::ReplaceRequest request;
+    request.name = name.Text();
+    request.opened = destination.get();
+    request.deny = platform::kRead | platform::kWrite;
+    platform::Replacement copy;
+    if (!copy.Begin(request)) {
+        const bool inPlace = copy.Failure() == platform::ReplaceFailure::kCannotMake;
+        return inPlace ? OverwriteWith(from, source, destination) : Win32ToOVFileErr();
+    }
+    platform::FileVersion version;
+    if (const MgErr err = ErrOfCopy(platform::FileCopyBytes(source.get(), copy.File(), true, version))) return err;
+    if (!copy.Finish()) return Win32ToOVFileErr();
+    return DeleteSource(from, source, version, copy.File());
 }
 
 // When the current directory lies inside `path`, goes to the parent of `path`. A failure is only reported.
@@ -191,9 +212,9 @@ MgErr FMove(Path from, Path to) {
 MgErr FMoveInto(Path from, Path to) {
     return Guarded([&] {
         if (!FIsAbsPath(from) || !FIsAbsPath(to)) return kArgErr;
-        if (const MgErr err = CopyInto(from, to)) return err;
-        FRemove(from);
-        return kNoErr;
+        FlushPathCache(from);
+        FlushPathCache(to);
+        return MoveInto(from, to);
     });
 }
 

@@ -40,12 +40,19 @@ public:
     platform::FileHandle Open(platform::Disposition disposition) const {
         return platform::FileOpen(name_.Text(), access_, denied_, disposition);
     }
+    const char* Name() const { return name_.Text(); }
+    uint32 Access() const { return access_; }
+    uint32 Denied() const { return denied_; }
 
 private:
     PlatformName name_;
     uint32 access_ = 0;
     uint32 denied_ = 0;
 };
+
+// Makes a file with these bytes, or with `replace` puts it in the place of the one that is there, which must admit what
+// is requested. What FWriteWholeFile promises.
+MgErr WriteWholeFile(const OpenRequest& request, bool replace, const void* data, uint64 size);
 
 // Hands out what was opened, or says why it was not.
 MgErr OpenedFile(platform::FileHandle handle, File_t** file);
@@ -54,6 +61,9 @@ MgErr OpenedFile(platform::FileHandle handle, File_t** file);
 inline MgErr ErrUnless(bool ok) {
     return ok ? kNoErr : Win32ToOVFileErr();
 }
+
+// The same while permissions are set, which has codes of its own.
+MgErr AccessRightsErr();
 
 // Drops what a path has cached about its item. Nothing for null.
 void FlushPathCache(Path path);

@@ -1,6 +1,7 @@
 // The start-up map: every service of the library, what it depends on, and what starts and stops it.
 #include "frame/CoreServices.h"
 
+#include "config/Service.h"
 #include "diagnostics/Guarded.h"
 #include "diagnostics/Service.h"
 #include "events/Service.h"
@@ -11,6 +12,10 @@
 #include "resources/Service.h"
 #include "sync/Service.h"
 #include "threads/Service.h"
+#include <tessel/config/ConfigCoreTypes.h>
+#include <tessel/config/ConfigManager.h>
+#include <tessel/config/HardWaitBehavior.h>
+#include <tessel/strings/StringPStr.h>
 
 namespace tessel {
 namespace {
@@ -105,37 +110,43 @@ struct ResourceManager_Service final : CoreService<ResourceManager_Service> {
 struct ConfigCoreTypes_Service final : CoreService<ConfigCoreTypes_Service> {
     static constexpr char kName[] = "ConfigCoreTypes";
     static constexpr Accessor kDependencies[] = {PathManagerService, ConfigManagerService};
-    static MgErr Start() { return kNoErr; }
-    static MgErr Stop() { return kNoErr; }
+    static MgErr Start() { return ConfigCoreTypesStart(); }
+    static MgErr Stop() { return ConfigCoreTypesStop(); }
 };
 
 struct ConfigManager_Service final : CoreService<ConfigManager_Service> {
     static constexpr char kName[] = "ConfigManager";
     static constexpr Accessor kDependencies[] = {ThMutexService, PathManagerService, FileManagerService,
                                                  MemoryManagerService};
-    static MgErr Start() { return kNoErr; }
-    static MgErr Stop() { return kNoErr; }
+    static MgErr Start() { return ConfigManagerStart(); }
+    static MgErr Stop() { return ConfigManagerStop(); }
 };
+
+bool ReadThreadPriority(CStr key, int32& value) {
+    Str255 token;
+    CToPStr(key, token);
+    return CfgGetDefault(kConfigI32, token, &value) == kNoErr;
+}
 
 struct ThThread_Service final : CoreService<ThThread_Service> {
     static constexpr char kName[] = "ThThread";
     static constexpr Accessor kDependencies[] = {ThMutexService, ThEventService, ConfigManagerService,
                                                  ConfigCoreTypesService};
-    static MgErr Start() { return ThThreadStart(); }
+    static MgErr Start() { return ThThreadStart(ReadThreadPriority); }
     static MgErr Stop() { return ThThreadStop(); }
 };
 
 struct HardWaitBehavior_Service final : CoreService<HardWaitBehavior_Service> {
     static constexpr char kName[] = "HardWaitBehavior";
     static constexpr Accessor kDependencies[] = {ConfigManagerService, ConfigCoreTypesService};
-    static MgErr Start() { return kNoErr; }
-    static MgErr Stop() { return kNoErr; }
+    static MgErr Start() { return HardWaitBehaviorStart(); }
+    static MgErr Stop() { return HardWaitBehaviorStop(); }
 };
 
 struct OccurrenceManager_Service final : CoreService<OccurrenceManager_Service> {
     static constexpr char kName[] = "OccurrenceManager";
     static constexpr Accessor kDependencies[] = {HardWaitBehaviorService, ThMutexService, ThThreadService};
-    static MgErr Start() { return OccurrenceManagerStart(); }
+    static MgErr Start() { return OccurrenceManagerStart(GetHardWaitTimeCritical() != 0); }
     static MgErr Stop() { return OccurrenceManagerStop(); }
 };
 

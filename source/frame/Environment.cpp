@@ -66,7 +66,6 @@ void ReportUnknownSettings() {
             {"TESSEL_DRIVES", {}, AreDrives},
             {"TESSEL_UNC", {}, IsFolder},
             {"TESSEL_CODEPAGE", {}, IsCodePage},
-            {"TESSEL_REGISTRY", {}, IsFolder},
         };
         for (const Setting& setting : settings) Check(setting);
         return true;

@@ -1,6 +1,10 @@
+#include "diagnostics/Guarded.h"
 #include "frame/CoreServices.h"
 #include "frame/Environment.h"
 #include "frame/ServiceRegistry.h"
+#include "platform/Module.h"
+#include <tessel/config/ConfigCoreTypes.h>
+#include <tessel/config/ConfigManager.h>
 #include <tessel/frame/TesselInit.h>
 
 #include <algorithm>
@@ -10,14 +14,23 @@
 namespace tessel {
 namespace {
 
-IServiceRegistry* theBaseRegistry = nullptr;
-bool theAppSupportIsOn = false;
+IServiceRegistry* baseRegistry = nullptr;
+bool appSupportIsOn = false;
 
 // In the order they are started.
 constexpr IServiceObject* (*kAppSupport[])() = {ConfigManagerService, ConfigCoreTypesService, ThThreadService,
                                                 ResourceManagerService};
+constexpr size_t kConfigIsReady = 2;  // when so many are started
 // Those of them that were taken hold of.
-IServiceObject* theAppServices[std::size(kAppSupport)];
+IServiceObject* appServices[std::size(kAppSupport)];
+
+// A library that watches the heap, when the settings ask for it. The library goes on without it.
+void LoadHeapDebugger() {
+    static constexpr uint8 kKey[] = "\20LoadHeapDebugger";
+    int32 isWanted = 0;
+    if (CfgGetDefault(kConfigBool, kKey, &isWanted) == kNoErr && isWanted)
+        GuardedOr<platform::LibraryHandle>(nullptr, [] { return platform::LibraryLoad("HeapDebugger.dll"); });
+}
 
 }  // namespace
 }  // namespace tessel
@@ -25,7 +38,7 @@ IServiceObject* theAppServices[std::size(kAppSupport)];
 using namespace tessel;
 
 MgErr InitTesselBase(void) {
-    if (theBaseRegistry) return kGenericErr;
+    if (baseRegistry) return kGenericErr;
     static IServiceObject* services[10];
     IServiceObject* const core[] = {
         DebugStreamService(),
@@ -40,39 +53,40 @@ MgErr InitTesselBase(void) {
     };
     std::copy(std::begin(core), std::end(core), services);
     if (std::find(std::begin(core), std::end(core), nullptr) != std::end(core)) return kMemFullErr;
-    theBaseRegistry = CreateServiceRegistry(services);
-    if (!theBaseRegistry) return kMemFullErr;
-    const MgErr err = theBaseRegistry->InitServices();
+    baseRegistry = CreateServiceRegistry(services);
+    if (!baseRegistry) return kMemFullErr;
+    const MgErr err = baseRegistry->InitServices();
     ReportUnknownSettings();
     return err;
 }
 
 // A service that failed to start keeps its error until it is let go: then the next start finds a new one.
 MgErr UninitTesselBase(void) {
-    if (!theBaseRegistry) return kNoErr;
+    if (!baseRegistry) return kNoErr;
     UninitTesselAppSupport();  // which stands on the base
-    if (IServiceObject* failed = static_cast<ServiceRegistry*>(theBaseRegistry)->Failed()) failed->Uninit();
-    theBaseRegistry->UninitServices();
-    theBaseRegistry->Release();
-    theBaseRegistry = nullptr;
+    if (IServiceObject* failed = static_cast<ServiceRegistry*>(baseRegistry)->Failed()) failed->Uninit();
+    baseRegistry->UninitServices();
+    baseRegistry->Release();
+    baseRegistry = nullptr;
     return kNoErr;
 }
 
 // Their results are not looked at: the library goes on without what did not start.
 MgErr InitTesselAppSupport(void) {
-    if (theAppSupportIsOn || !theBaseRegistry) return kNoErr;
+    if (appSupportIsOn || !baseRegistry) return kNoErr;
     for (size_t i = 0; i < std::size(kAppSupport); ++i) {
-        theAppServices[i] = kAppSupport[i]();
-        if (theAppServices[i]) theAppServices[i]->Init();
+        if (i == kConfigIsReady) LoadHeapDebugger();
+        appServices[i] = kAppSupport[i]();
+        if (appServices[i]) appServices[i]->Init();
     }
-    theAppSupportIsOn = true;
+    appSupportIsOn = true;
     return kNoErr;
 }
 
 MgErr UninitTesselAppSupport(void) {
-    if (!theAppSupportIsOn) return kNoErr;
+    if (!appSupportIsOn) return kNoErr;
     for (size_t i = std::size(kAppSupport); i-- > 0;)
-        if (IServiceObject* service = std::exchange(theAppServices[i], nullptr)) service->Uninit();
-    theAppSupportIsOn = false;
+        if (IServiceObject* service = std::exchange(appServices[i], nullptr)) service->Uninit();
+    appSupportIsOn = false;
     return kNoErr;
 }

@@ -14,8 +14,8 @@ namespace {
 // there is no such cookie any more, its count is not positive or it can take no more.
 uint32 ChangeRights(CookieEntry* entry, uint32 generation, int32 change) {
     for (;;) {
-        uint32 rights = entry->Rights();
-        uint32 count = rights & CookieEntry::kMostRights;
+        const uint32 rights = entry->Rights();
+        const uint32 count = rights & CookieEntry::kMostRights;
         if (rights >> CookieEntry::kRightsBits != generation || count == 0) return 0;
         if (change > 0 && count == CookieEntry::kMostRights) return 0;
         if (entry->SwapRights(rights, rights + static_cast<uint32>(change))) return count;
@@ -25,7 +25,7 @@ uint32 ChangeRights(CookieEntry* entry, uint32 generation, int32 change) {
 // Lowers the count, and ends the cookie with it, unless somebody else has ended it meanwhile.
 uint32 ReleaseEntry(JarRecord& record, CookieEntry* entry, MagicCookie cookie) {
     const uint32 generation = GenerationOf(cookie);
-    uint32 before = ChangeRights(entry, generation, -1);
+    const uint32 before = ChangeRights(entry, generation, -1);
     if (before == 1) {
         ThMutexHolder hold(record.mutex);
         if (IsValid(entry, cookie) && entry->Rights() == CookieEntry::RightsOf(generation, 0))
@@ -65,11 +65,11 @@ MgErr CookieList::SetCookie(int32 i, MagicCookie cookie) {
 
 MgErr CookieList::SetCount(int32 count) {
     if (count < 0) return kArgErr;
-    int32 known = count_;
+    const int32 known = count_;
     count_ = 0;
     if (count == 0) return DSDisposeHandleAndNull(&cookies_);
     if (count > INT32_MAX / static_cast<int32>(sizeof(MagicCookie))) return kMemFullErr;
-    MgErr err = DSSetHandleSizeOrNewHandle(&cookies_, static_cast<uint32>(count) * sizeof(MagicCookie));
+    const MgErr err = DSSetHandleSizeOrNewHandle(&cookies_, static_cast<uint32>(count) * sizeof(MagicCookie));
     if (err != kNoErr) return err;
     if (count > known)
         ClearMem(reinterpret_cast<MagicCookie*>(*cookies_) + known,
@@ -84,7 +84,7 @@ MgErr BaseCookieJar::Init(uint32 infoSize, int32 rightsMode) {
 }
 
 MgErr BaseCookieJar::Uninit() {
-    MgErr err = MCDisposeJar(jar_);
+    const MgErr err = MCDisposeJar(jar_);
     jar_ = nullptr;
     return err;
 }
@@ -112,9 +112,9 @@ bool BaseCookieJar::IsACookie(const MagicCookie& cookie) {
 MgErr BaseCookieJar::GetCookieList(CookieList* list) {
     if (!list) return kArgErr;
     UHandle cookies = nullptr;
-    MgErr err = jar_ ? MCGetCookieList(jar_, &cookies) : kNoErr;
-    int32 count = cookies && err == kNoErr ? *reinterpret_cast<const int32*>(*cookies) : 0;
-    MgErr listErr = list->SetCount(count);
+    const MgErr err = jar_ ? MCGetCookieList(jar_, &cookies) : kNoErr;
+    const int32 count = cookies && err == kNoErr ? *reinterpret_cast<const int32*>(*cookies) : 0;
+    const MgErr listErr = list->SetCount(count);
     for (int32 i = 0; listErr == kNoErr && i < count; ++i)
         list->SetCookie(i, reinterpret_cast<const MagicCookie*>(*cookies)[i + 1]);
     DSDisposeHandle(cookies);

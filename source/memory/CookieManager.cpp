@@ -18,7 +18,7 @@ std::atomic<uint32> disposedTotal{0};  // bytes of all jars disposed of
 // ---- making and ending cookies, under the mutex ---------------------------------------------------------------------
 
 uint32 NextGeneration(JarRecord& record) {
-    uint32 generation = record.serial++;
+    const uint32 generation = record.serial++;
     if ((record.serial & kGenerations) == 0) record.serial = 1;
     return generation;
 }
@@ -28,11 +28,11 @@ MagicCookie MakeCookie(JarRecord& record, const void* info) {
     CookieEntry* entry = index < PouchTree::kIndices ? record.tree->Find(index) : nullptr;
     if (!entry) return 0;
     record.freeHead = static_cast<uint32>(entry->Link());
-    int32 live = record.liveCount + 1;
+    const int32 live = record.liveCount + 1;
     __atomic_store_n(&record.liveCount, live, __ATOMIC_RELAXED);
     record.highWater = std::max(record.highWater, live);
     // The generation last: from then on the cookie is valid to those who look without the mutex.
-    uint32 generation = NextGeneration(record);
+    const uint32 generation = NextGeneration(record);
     StoreInfo(record, entry, info);
     entry->SetRights(CookieEntry::RightsOf(generation, record.rightsMode ? 1 : 0));
     entry->SetLink(CookieEntry::kInUse);
@@ -82,8 +82,8 @@ void ReportDisposal(MagicCookieJar jar) {
     if (record.liveCount != 0)
         TESSEL_REPORT(kDebugInfo, 0x22C7F5A9u) << "Disposing jar with " << record.liveCount << " cookies remaining";
     PouchTree::Size tree = record.tree ? record.tree->Measure() : PouchTree::Size{0, 0, 0};
-    uint32 size = static_cast<uint32>(sizeof(JarRecord)) + tree.bytes;
-    uint32 total = disposedTotal.fetch_add(size, std::memory_order_relaxed) + size;
+    const uint32 size = static_cast<uint32>(sizeof(JarRecord)) + tree.bytes;
+    const uint32 total = disposedTotal.fetch_add(size, std::memory_order_relaxed) + size;
     TESSEL_REPORT(kDebugInfo, 0x6D04B1E8u)
         << "MCDisposeJar(" << DbgFmtPtr(jar) << "): highWater=" << static_cast<uint32>(record.highWater)
         << "; nTreeNodes=" << tree.arrays << "; nPouches=" << tree.pouches << "; size=" << size << "; total=" << total;
@@ -166,7 +166,7 @@ MgErr MCGetCookieInfo(MagicCookieJar jar, MagicCookie cookie, void* infoOut) {
     if (!entry) return kArgErr;
     if (record.infoSize != kWord) return CopyInfoUnderMutex(record, entry, cookie, infoOut);
     void* word = LoadWord(entry);
-    bool valid = IsValid(entry, cookie);  // still, so the word was the cookie's
+    const bool valid = IsValid(entry, cookie);  // still, so the word was the cookie's
     if (!valid) word = nullptr;
     std::memcpy(infoOut, &word, kWord);
     return valid ? kNoErr : kArgErr;
@@ -191,7 +191,7 @@ uint32 LiveCount(const JarRecord& record) {
 
 // Under the mutex, into a list that has room for all that live.
 void CollectCookies(const JarRecord& record, uint32* list) {
-    uint32 live = LiveCount(record);
+    const uint32 live = LiveCount(record);
     uint32 count = 0;
     if (live != 0)
         record.tree->ForEachInUse([&](CookieEntry* entry, uint32 index) {
@@ -209,7 +209,7 @@ MgErr MCGetCookieList(MagicCookieJar jar, UHandle* list) {
     JarRecord& record = Record(jar);
     uint32 room = LiveCount(record), live;
     for (;; room = live) {
-        MgErr err = DSSetHandleSizeOrNewHandle(list, ListSize(room));
+        const MgErr err = DSSetHandleSizeOrNewHandle(list, ListSize(room));
         if (err != kNoErr) return err;
         ThMutexHolder hold(record.mutex);
         live = LiveCount(record);

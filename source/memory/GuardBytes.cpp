@@ -44,21 +44,16 @@ bool Fail(const void* data, Failure failure, const char* version) {
     return false;
 }
 
-// A guard of any version.
+}  // namespace
+
 bool IsGuard(const char* guard) {
     return std::memcmp(guard, kGuardPattern, kDigits) == 0 &&
            std::memcmp(guard + kTail, kGuardPattern + kTail, kGuardSize - kTail) == 0;
 }
 
-}  // namespace
-
 void WriteGuards(void* data, size_t size) {
     std::memcpy(static_cast<char*>(data) - kGuardSize, kGuardPattern, kGuardSize);
     std::memcpy(static_cast<char*>(data) + size, kGuardPattern, kGuardSize);
-}
-
-bool LeadingGuardIsIntact(const void* data) {
-    return IsGuard(static_cast<const char*>(data) - kGuardSize);
 }
 
 bool CheckGuards(const void* data, GuardKind kind) {
@@ -68,7 +63,7 @@ bool CheckGuards(const void* data, GuardKind kind) {
     }
     const char* leading = static_cast<const char*>(data) - kGuardSize;
     if (!IsGuard(leading)) return Fail(data, kUnderrun, nullptr);
-    uint32 size = kind == GuardKind::kHandle ? HandleLayout().SizeOf(data) : *GuardedPtrSize(data);
+    const uint32 size = kind == GuardKind::kHandle ? HandleLayout().SizeOf(data) : *GuardedPtrSize(data);
     const char* trailing = static_cast<const char*>(data) + size;
     if (!IsGuard(trailing)) return Fail(data, kOverrun, nullptr);
     char version[kTail - kDigits + 1] = {leading[kDigits], leading[kDigits + 1], 0};

@@ -41,8 +41,8 @@ inline uint32* GuardedPtrSize(const void* data) {
 
 void WriteGuards(void* data, size_t size);
 
-// Whether the guard in front of the data is intact; nobody is told.
-bool LeadingGuardIsIntact(const void* data);
+// Whether the eight bytes are a guard, of whatever version.
+bool IsGuard(const char* guard);
 
 // True when both guards of a block are intact; else the guard-failure procedure has been called.
 bool CheckGuards(const void* data, GuardKind kind);

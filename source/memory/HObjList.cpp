@@ -37,7 +37,7 @@ int32 Pin(int32 pos, int32 last) {
 
 // Makes room for one more value.
 MgErr Grow(UHandle list, int32 count) {
-    uint32 size = DSGetHandleSize(list);
+    const uint32 size = DSGetHandleSize(list);
     if (size >= static_cast<uint32>(count) * kValue + 2 * kValue) return kNoErr;
     return DSSetHSzClr(list, size > UINT32_MAX - kGranule ? UINT32_MAX : RoundDown(size + kGranule));
 }
@@ -46,8 +46,8 @@ MgErr Grow(UHandle list, int32 count) {
 
 MgErr HObjListInsert(UHandle list, uint32 value, int32 pos) {
     if (!IsList(list)) return kArgErr;
-    int32 count = ListOf(list).count;
-    MgErr err = Grow(list, count);
+    const int32 count = ListOf(list).count;
+    const MgErr err = Grow(list, count);
     if (err != kNoErr) return err;
     ObjList& data = ListOf(list);
     uint32* at = data.values + Pin(pos, count);
@@ -60,14 +60,14 @@ MgErr HObjListInsert(UHandle list, uint32 value, int32 pos) {
 uint32 HObjListDelete(UHandle list, int32 pos) {
     if (!IsList(list)) return 0;
     ObjList& data = ListOf(list);
-    int32 count = data.count;
+    const int32 count = data.count;
     if (count <= 0) return 0;
     uint32* at = data.values + Pin(pos, count - 1);
-    uint32 value = *at;
+    const uint32 value = *at;
     std::memmove(at, at + 1, static_cast<size_t>(data.values + count - 1 - at) * kValue);
     data.values[count - 1] = 0;
     data.count = count - 1;
-    uint32 size = DSGetHandleSize(list);
+    const uint32 size = DSGetHandleSize(list);
     if (size > static_cast<uint32>(count) * kValue + kGranule)
         DSSetHandleSize(list, size % kGranule == 0 ? size - kGranule : RoundDown(size));
     return value;
@@ -82,7 +82,7 @@ int32 HObjListSearch(UHandle list, uint32 value) {
 }
 
 int32 HObjListSearchDelete(UHandle list, uint32 value) {
-    int32 pos = HObjListSearch(list, value);
+    const int32 pos = HObjListSearch(list, value);
     if (pos == kAbsent) return 0;
     HObjListDelete(list, pos);
     return 1;
@@ -90,7 +90,7 @@ int32 HObjListSearchDelete(UHandle list, uint32 value) {
 
 int32 HObjListBringToFront(UHandle list, uint32 value) {
     if (!IsList(list)) return 0;
-    int32 pos = HObjListSearch(list, value);
+    const int32 pos = HObjListSearch(list, value);
     if (pos == kAbsent) TESSEL_REPORT(kDebugInfo, 0x1EA4C8B0u) << "HObjListBringToFront: object not found!!!";
     if (pos <= 0) return 0;
     uint32* values = ListOf(list).values;
@@ -115,6 +115,6 @@ void HCompactObjList(UHandle list) {
     uint32* kept = std::remove(data.values, end, 0u);
     std::fill(kept, end, 0u);
     data.count = static_cast<int32>(kept - data.values);
-    uint32 wanted = RoundDown(static_cast<uint32>(data.count) * kValue + kValue + kGranule - 1);
+    const uint32 wanted = RoundDown(static_cast<uint32>(data.count) * kValue + kValue + kGranule - 1);
     if (DSGetHandleSize(list) > wanted) DSSetHandleSize(list, wanted);
 }

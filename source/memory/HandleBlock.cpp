@@ -1,6 +1,7 @@
 #include "memory/HandleBlock.h"
 
 #include "memory/Heap.h"
+#include "platform/Allocator.h"
 
 #include <algorithm>
 #include <bit>
@@ -22,29 +23,37 @@ Alignment AlignmentFor(uint32 alignment, uint32 offset) {
     return {static_cast<uint16>(power), static_cast<uint16>(rounded)};
 }
 
-// A distance that no block can have is told without following it.
-bool HandleLayout::IsPlaced(UPtr data) const {
+// Where the header says that the block starts, if the data would be placed there, and how it is aligned. A distance
+// that no block can have is told without following it.
+bool HandleLayout::FindBlock(UPtr data, uint32 distance, FoundBlock& found, platform::ReadablePages& pages) const {
     constexpr uint32 kMostDistance = sizeof(Alignment) + UINT16_MAX + kMostAlignment;
-    const uint32 distance = HeaderOf(data)->distance;
+    found = {reinterpret_cast<char*>(HeaderOf(data)) - distance, Alignment()};
     if (distance == 0) return true;
     if (distance > kMostDistance || distance % sizeof(Alignment) != 0) return false;
-    const Alignment alignment = AlignmentOf(data);
-    return std::has_single_bit(alignment.alignment) && PlaceData(BlockOf(data), alignment) == data;
+    return pages.Read(found.block, found.alignment) && std::has_single_bit(found.alignment.alignment) &&
+           PlaceData(found.block, found.alignment) == data;
 }
 
-bool HandleLayout::IsSound(UPtr data) const {
-    if (room_ != 0 && WritesGuards(GuardKind::kHandle) && !LeadingGuardIsIntact(data)) return false;
-    if (!IsPlaced(data)) return false;
-    const uint32 bytes = BlockSize(SizeOf(data), AlignmentOf(data));
-    return bytes != 0 && bytes <= platform::AllocatedSize(BlockOf(data));
+bool HandleLayout::IsSound(UPtr data, platform::ReadablePages& pages) const {
+    constexpr size_t kMostUnused = 4 << 20;  // a mapped block ends with its last page, which may be a large one
+    HandleHeader header;
+    FoundBlock found;
+    char guard[kGuardSize];
+    if (!pages.Read(HeaderOf(data), header)) return false;
+    if (room_ != 0 && WritesGuards(GuardKind::kHandle) && !(pages.Read(data - kGuardSize, guard) && IsGuard(guard)))
+        return false;
+    if (!FindBlock(data, header.distance, found, pages)) return false;
+    const uint32 bytes = BlockSize(header.size, found.alignment);
+    const size_t room = platform::AllocatedSizeIfAny(found.block, pages);
+    return bytes != 0 && bytes <= room && room - bytes <= bytes / 7 + kMostUnused;
 }
 
 UPtr NewGuardedBlock(size_t size, GuardKind kind) {
-    bool guarded = GuardRoom(kind) != 0;
-    size_t room = guarded ? kPtrHeader + kGuardSize : 0;
-    size_t bytes = (std::max<size_t>(size + room, 1) + 7) & ~size_t{7};
+    const bool guarded = GuardRoom(kind) != 0;
+    const size_t room = guarded ? kPtrHeader + kGuardSize : 0;
+    const size_t bytes = (std::max<size_t>(size + room, 1) + 7) & ~size_t{7};
     if (bytes < size || (guarded && size > UINT32_MAX)) return static_cast<UPtr>(heap::OutOfMemory());
-    auto block = static_cast<UPtr>(heap::Allocate(bytes));
+    const auto block = static_cast<UPtr>(heap::Allocate(bytes));
     if (!block || !guarded) return block;
     UPtr data = block + kPtrHeader;
     *GuardedPtrSize(data) = static_cast<uint32>(size);

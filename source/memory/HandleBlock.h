@@ -10,6 +10,7 @@
 
 #include "base/Compiler.h"
 #include "memory/GuardBytes.h"
+#include "platform/MemoryRead.h"
 #include <tessel/base/Types.h>
 
 namespace tessel {
@@ -81,12 +82,9 @@ public:
         return header->distance == 0 ? Alignment() : *static_cast<Alignment*>(BlockOf(data));
     }
 
-    // Whether the header leads back to a block in which the data would be placed there.
-    bool IsPlaced(UPtr data) const;
-
-    // Whether the header may be trusted: no guard in front of the data is damaged, it leads to the block, and what it
-    // says fits in there.
-    bool IsSound(UPtr data) const;
+    // Whether the header may be trusted: no guard in front of the data is damaged, it leads to a block of the heap in
+    // which the data would be placed there, and what it says fits in there. The data may be any address.
+    bool IsSound(UPtr data, platform::ReadablePages& pages) const;
 
     // Where the data goes in a heap block.
     UPtr PlaceData(void* block, Alignment alignment) const {
@@ -108,6 +106,12 @@ public:
     }
 
 private:
+    struct FoundBlock {
+        void* block;
+        Alignment alignment;
+    };
+    bool FindBlock(UPtr data, uint32 distance, FoundBlock& found, platform::ReadablePages& pages) const;
+
     uint32 room_;
 };
 

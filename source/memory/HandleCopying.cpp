@@ -36,8 +36,8 @@ MgErr CopyHandle(UHandle* destination, UHandle source, const void* frame) {
         return kNoErr;
     }
     if (!IsGoodHandle(source, kChangeProves)) return kHandleErr;
-    uint32 size = DSGetHandleSize(source);
-    MgErr err = ResizeOrCreate(destination, size, false, kResizeOrNew, frame);
+    const uint32 size = DSGetHandleSize(source);
+    const MgErr err = ResizeOrCreate(destination, size, false, kResizeOrNew, frame);
     if (err == kNoErr) Copy(*source, *destination, 0, size);
     return err;
 }
@@ -45,7 +45,7 @@ MgErr CopyHandle(UHandle* destination, UHandle source, const void* frame) {
 MgErr HandToHand(UHandle* h, const void* frame) {
     if (!h) return kArgErr;
     if (!IsGoodHandle(*h, kChangeProves)) return kHandleErr;
-    uint32 size = DSGetHandleSize(*h);
+    const uint32 size = DSGetHandleSize(*h);
     UHandle copy = CreateHandle(size, false, frame);
     if (!copy) return kMemFullErr;
     Copy(**h, copy, 0, size);
@@ -65,7 +65,7 @@ MgErr PtrToHand(const void* p, UHandle* h, uint32 size, const void* frame) {
 
 MgErr SetHandleFromPtr(UHandle* h, const void* p, uint32 size, const void* frame) {
     if (IsNoData(p, size)) return kArgErr;
-    MgErr err = ResizeOrCreate(h, size, false, kResizeOrNew, frame);
+    const MgErr err = ResizeOrCreate(h, size, false, kResizeOrNew, frame);
     if (err == kNoErr) Copy(p, *h, 0, size);
     return err;
 }
@@ -86,7 +86,7 @@ MgErr DSPtrToHand(const void* p, UHandle* h, uint32 size) {
 
 MgErr DSPtrToXHand(const void* p, UHandle h, uint32 size) {
     if (IsNoData(p, size)) return kArgErr;
-    MgErr err = DSSetHandleSize(h, size);
+    const MgErr err = DSSetHandleSize(h, size);
     if (err == kNoErr) Copy(p, h, 0, size);
     return err;
 }
@@ -102,7 +102,7 @@ MgErr DSSetHandleFromPtrNULLMeansEmpty(UHandle* h, const void* p, uint32 size) {
 MgErr DSPtrAndHand(const void* p, UHandle h, uint32 size) {
     if (IsNoData(p, size)) return kArgErr;
     uint32 end;
-    MgErr err = Append(h, size, &end);
+    const MgErr err = Append(h, size, &end);
     if (err == kNoErr) Copy(p, h, end, size);
     return err;
 }
@@ -110,7 +110,7 @@ MgErr DSPtrAndHand(const void* p, UHandle h, uint32 size) {
 MgErr DSHandAndHand(UHandle source, UHandle destination) {
     if (!IsGoodHandle(source, kChangeProves)) return kHandleErr;
     uint32 end, size = DSGetHandleSize(source);
-    MgErr err = Append(destination, size, &end);
+    const MgErr err = Append(destination, size, &end);
     if (err == kNoErr) Copy(*source, destination, end, size);
     return err;
 }

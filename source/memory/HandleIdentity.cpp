@@ -11,7 +11,7 @@ MgErr DSSwapHandles(UHandle a, UHandle b) {
     }
     if (a == b) TESSEL_REPORT(kDebugFatal, 0x0E8C53B6u);
     HandleGate gate(ThreadMemory::Mine());  // a walk meets each block once
-    uintptr_t first = SlotContent(a), second = SlotContent(b);
+    const uintptr_t first = SlotContent(a), second = SlotContent(b);
     SetSlotContent(a, second);
     SetSlotContent(b, first);
     return kNoErr;

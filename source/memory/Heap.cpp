@@ -20,9 +20,9 @@ struct alignas(kAlignment) Link {
 };
 
 struct alignas(64) Shard {
-    platform::Mutex mutex;  // guards the rest, and the links of the blocks in it
-    Link* first = nullptr;
-    uint64 bytes = 0;
+    platform::Mutex mutex;  // guards the links of the blocks in it too
+    Link* first TESSEL_GUARDED_BY(mutex) = nullptr;
+    uint64 bytes TESSEL_GUARDED_BY(mutex) = 0;
 };
 
 constexpr size_t kShards = 64;
@@ -31,7 +31,7 @@ constinit Shard shards[kShards];
 std::atomic<HandleBlocks> handleBlocks{nullptr};
 
 Shard& ShardOf(const Link* link) {
-    uint32 hash = static_cast<uint32>(reinterpret_cast<uintptr_t>(link) >> 4) * 0x9E3779B1u;
+    const uint32 hash = static_cast<uint32>(reinterpret_cast<uintptr_t>(link) >> 4) * 0x9E3779B1u;
     return shards[hash / (UINT32_MAX / kShards + 1)];
 }
 
@@ -62,11 +62,11 @@ bool IsPlausible(const Shard& shard, const Link* link) {
     return reinterpret_cast<uintptr_t>(link) % kAlignment == 0 && &ShardOf(link) == &shard;
 }
 
-bool IsSound(const Shard& shard, const Link* link) {
+bool IsSound(const Shard& shard, const Link* link) TESSEL_REQUIRES(shard.mutex) {
     const Link* next = link->next;
     const Link* previous = link->previous;
-    bool nextIs = !next || (IsPlausible(shard, next) && next->previous == link);
-    bool previousIs = previous ? IsPlausible(shard, previous) && previous->next == link : shard.first == link;
+    const bool nextIs = !next || (IsPlausible(shard, next) && next->previous == link);
+    const bool previousIs = previous ? IsPlausible(shard, previous) && previous->next == link : shard.first == link;
     return nextIs && previousIs;
 }
 
@@ -145,8 +145,8 @@ bool Free(void* block) {
 
 void* Reallocate(void* block, size_t oldSize, size_t newSize) {
     if (!MayAllocate(newSize)) return nullptr;
-    size_t more = newSize / 8;
-    bool growsByLittle = newSize > oldSize && newSize - oldSize < more && newSize <= kMostBytes - more;
+    const size_t more = newSize / 8;
+    const bool growsByLittle = newSize > oldSize && newSize - oldSize < more && newSize <= kMostBytes - more;
     void* resized = growsByLittle ? std::realloc(block, newSize + more) : nullptr;
     return resized ? resized : std::realloc(block, newSize);
 }

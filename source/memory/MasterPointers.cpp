@@ -14,64 +14,17 @@ MasterPointers masterPointers;
 
 // ---- the set --------------------------------------------------------------------------------------------------------
 
-MasterPointerSet::Table* MasterPointerSet::NewTable(uint32 bits, Table* older) {
-    constexpr uint32 kHashBits = 32;
-    size_t entries = size_t{1} << bits;
-    auto* table = static_cast<Table*>(std::calloc(1, offsetof(Table, entries) + entries * sizeof(Table::entries[0])));
-    if (!table) return nullptr;
-    table->older = older;
-    table->mask = static_cast<uint32>(entries - 1);
-    table->shift = kHashBits - bits;
-    return table;
-}
-
-void MasterPointerSet::Insert(Table& table, uintptr_t block) {
-    uintptr_t last = block + sizeof(MasterPointerBlock) - 1;
-    for (uintptr_t stretch = block >> kStretchBits; stretch <= last >> kStretchBits; ++stretch) {
-        uint32 i = table.Start(stretch << kStretchBits);
-        while (table.entries[i & table.mask].load(std::memory_order_relaxed) != 0) ++i;
-        table.entries[i & table.mask].store(block, std::memory_order_release);
-    }
-}
-
-bool MasterPointerSet::Grow() {
-    constexpr uint32 kFirstBits = 8;
-    Table* old = table_.load(std::memory_order_relaxed);
-    Table* table = NewTable(old ? 32 - old->shift + 1 : kFirstBits, old);
-    if (!table) return false;
-    for (uint32 i = 0; old && i <= old->mask; ++i) {
-        uintptr_t block = old->entries[i].load(std::memory_order_relaxed);
-        // Once for each block: at the first of its stretches.
-        if (block != 0 && !IsIn(*table, block)) Insert(*table, block);
-    }
-    table_.store(table, std::memory_order_release);
-    return true;
-}
-
-bool MasterPointerSet::IsIn(const Table& table, uintptr_t block) {
-    for (uint32 i = table.Start(block);; ++i) {
-        uintptr_t entry = table.entries[i & table.mask].load(std::memory_order_relaxed);
-        if (entry == 0 || entry == block) return entry == block;
-    }
-}
-
 bool MasterPointerSet::Add(const MasterPointerBlock* block) {
-    const Table* table = table_.load(std::memory_order_relaxed);
-    if ((!table || (used_ + kMostStretches) * 4 > table->mask) && !Grow()) return false;
-    Insert(*table_.load(std::memory_order_relaxed), reinterpret_cast<uintptr_t>(block));
-    used_ += kMostStretches;
-    return true;
+    return blocks_.Add(block, [](size_t size) { return std::calloc(1, size); });
 }
 
 void MasterPointerSet::Clear() {
-    Table* table = table_.exchange(nullptr, std::memory_order_acq_rel);
-    while (table) std::free(std::exchange(table, table->older));
-    used_ = 0;
+    blocks_.Clear(std::free);
 }
 
 // ---- blocks ---------------------------------------------------------------------------------------------------------
 
-MgErr MasterPointers::Start() {
+MgErr MasterPointers::Start() TESSEL_LOCKS_UNPROVEN {
     for (int i = 0; i < kFirstBlocks; ++i)
         if (!AddBlock()) {
             Stop();
@@ -81,7 +34,7 @@ MgErr MasterPointers::Start() {
     return kNoErr;
 }
 
-void MasterPointers::Stop() {
+void MasterPointers::Stop() TESSEL_LOCKS_UNPROVEN {
     ThreadMemory::ForgetHandles();
     set_.Clear();
     while (blocks_) DisposePtrBlock(std::exchange(blocks_, blocks_->next));
@@ -113,7 +66,7 @@ bool MasterPointers::AddBlock() {
 
 // Cuts a chain for a thread off the shared one.
 bool MasterPointers::Refill(SlotChain& chain) {
-    ThMutexHolder hold(mutex);
+    LibraryMutexHolder hold(mutex);
     if (!freeHead_ && !AddBlock()) return false;
     chain.head = chain.tail = freeHead_;
     for (chain.count = 1; chain.count < kChainSlots; ++chain.count) {
@@ -153,7 +106,7 @@ void MasterPointers::PutShared(ThreadMemory* mine, UHandle slot) {
 
 void MasterPointers::Return(SlotChain& chain) {
     if (!chain.head) return;
-    ThMutexHolder hold(mutex);
+    LibraryMutexHolder hold(mutex);
     SetSlotContent(chain.tail, reinterpret_cast<uintptr_t>(freeHead_) | 1);
     freeHead_ = chain.head;
     freeCount_ += static_cast<int32>(chain.count);
@@ -184,7 +137,7 @@ bool MasterPointers::IsChain(UHandle head, uint32 count) const {
 bool MasterPointers::CheckChains(ThreadMemory* mine) const {
     bool countIsBad, chainIsBad;
     {
-        ThMutexHolder hold(mutex);
+        LibraryMutexHolder hold(mutex);
         countIsBad = freeCount_ < 0;
         chainIsBad = !countIsBad && !IsChain(freeHead_, static_cast<uint32>(freeCount_));
     }
@@ -199,7 +152,7 @@ bool MasterPointers::CheckChains(ThreadMemory* mine) const {
 MgErr MasterPointers::CheckBlocks() const {
     int32 difference;
     {
-        ThMutexHolder hold(mutex);
+        LibraryMutexHolder hold(mutex);
         int32 count = 0;
         for (MasterPointerBlock* block = blocks_; block && count <= blockCount_; block = block->next) ++count;
         difference = count - blockCount_;

@@ -5,13 +5,11 @@
 #ifndef TESSEL_SOURCE_MEMORY_MASTERPOINTERS_H
 #define TESSEL_SOURCE_MEMORY_MASTERPOINTERS_H
 
-#include "base/Compiler.h"
+#include "base/ReadMostlyTable.h"
 #include "memory/ThreadMemory.h"
+#include "sync/LibraryMutex.h"
 #include <tessel/base/MgErr.h>
 #include <tessel/base/Types.h>
-#include <tessel/sync/ThMutex.h>
-
-#include <atomic>
 
 namespace tessel {
 
@@ -32,59 +30,60 @@ inline bool IsLiveContent(uintptr_t content) {
     return content != 0 && (content & 1) == 0;
 }
 
-// The addresses of all blocks, to tell a handle from any other address. A hash table of the stretches of memory that
-// the blocks cover. Lookups take no lock and write nothing: entries are only added, a table that is full is replaced by
-// a larger one, and the old one stays until Clear.
+// All blocks, to tell a handle from any other address. A block stands under each of the stretches of memory that it
+// covers.
 class MasterPointerSet {
 public:
     bool Contains(const void* address) const {
-        const Table* table = table_.load(std::memory_order_acquire);
-        if (TESSEL_UNLIKELY(table == nullptr)) return false;
-        uintptr_t at = reinterpret_cast<uintptr_t>(address);
-        for (uint32 i = table->Start(at);; ++i) {
-            uintptr_t block = table->entries[i & table->mask].load(std::memory_order_acquire);
-            if (block == 0) return false;
-            uintptr_t offset = at - block - offsetof(MasterPointerBlock, slots);
-            if (offset < sizeof(MasterPointerBlock::slots)) return offset % sizeof(UPtr) == 0;
-        }
+        const uintptr_t at = reinterpret_cast<uintptr_t>(address);
+        bool isSlot = false;
+        blocks_.Find(Stretches::HashOf(at >> kStretchBits), [&](const MasterPointerBlock* block) {
+            uintptr_t offset = at - reinterpret_cast<uintptr_t>(block) - offsetof(MasterPointerBlock, slots);
+            if (offset >= sizeof(MasterPointerBlock::slots)) return false;
+            isSlot = offset % sizeof(UPtr) == 0;
+            return true;
+        });
+        return isSlot;
     }
     // Callers serialise. False when there is no memory.
     bool Add(const MasterPointerBlock* block);
+    // When no other thread uses handles.
     void Clear();
 
 private:
     // Short enough that few handles lie in a stretch that belongs to two blocks, where a lookup takes two steps.
     static constexpr uint32 kStretchBits = sizeof(void*) == 8 ? 14 : 13;
-    static constexpr uint32 kMostStretches = 6;  // that a block covers
-    static_assert(sizeof(MasterPointerBlock) <= (kMostStretches - 1) << kStretchBits);
 
-    struct Table {
-        Table* older;
-        uint32 mask;
-        uint32 shift;
-        std::atomic<uintptr_t> entries[1];  // mask + 1 of them, at most a quarter in use
+    struct Stretches {
+        static constexpr uint32 kFirstSlots = 256;
+        static constexpr uint32 kSlotsPerUsed = 4;
+        static constexpr uint32 kMostHashes = 6;
+        static constexpr bool kRemoves = false;
 
-        uint32 Start(uintptr_t address) const {
-            return (static_cast<uint32>(address >> kStretchBits) * 0x9E3779B1u) >> shift;
+        static uintptr_t First(const MasterPointerBlock* block) {
+            return reinterpret_cast<uintptr_t>(block) >> kStretchBits;
         }
+        static uint32 Hashes(const MasterPointerBlock* block) {
+            const uintptr_t last = (reinterpret_cast<uintptr_t>(block + 1) - 1) >> kStretchBits;
+            return static_cast<uint32>(last - First(block)) + 1;
+        }
+        static uint32 Hash(const MasterPointerBlock* block, uint32 n) { return HashOf(First(block) + n); }
+        static uint32 HashOf(uintptr_t stretch) { return static_cast<uint32>(stretch) * 0x9E3779B1u; }
     };
-    static Table* NewTable(uint32 bits, Table* older);
-    static void Insert(Table& table, uintptr_t block);
-    static bool IsIn(const Table& table, uintptr_t block);
-    bool Grow();
+    static_assert(sizeof(MasterPointerBlock) <= (Stretches::kMostHashes - 1) << kStretchBits);
 
-    std::atomic<Table*> table_{nullptr};
-    uint32 used_ = 0;
+    ReadMostlyTable<const MasterPointerBlock, Stretches> blocks_;
 };
 
 class MasterPointers {
 public:
-    MgErr Start();  // adds the first five blocks
-    void Stop();    // frees all blocks; no handle may be live
+    // Adds the first five blocks. While nobody else uses handles, as Stop.
+    MgErr Start();
+    // Frees all blocks; no handle may be live.
+    void Stop();
 
-    // The mutex guards the shared chain, its count, the list of blocks and their count. Nothing is called inside it
-    // that takes another lock of the memory manager, but for the heap's.
-    ThMutex mutex = nullptr;
+    // Nothing is called inside it that takes another lock of the memory manager, but for the heap's.
+    mutable LibraryMutex mutex;
 
     // A slot for a new handle, or null. It is not live before it is given data.
     UHandle Take(ThreadMemory* mine) { return mine && mine->slots.head ? Pop(mine->slots) : TakeShared(mine); }
@@ -111,7 +110,7 @@ public:
     // Visits every live slot until the visitor returns false, which it then returns.
     template <class Visitor>
     bool ForEachLive(Visitor&& visitor) const {
-        ThMutexHolder hold(mutex);
+        LibraryMutexHolder hold(mutex);
         for (MasterPointerBlock* block = blocks_; block; block = block->next)
             for (UPtr& slot : block->slots)
                 if (IsLiveContent(SlotContent(&slot)) && !visitor(&slot)) return false;
@@ -120,7 +119,7 @@ public:
 
     // The same without the mutex, for a visitor that frees what it sees. No other thread may be using handles.
     template <class Visitor>
-    void ForEachLeft(Visitor&& visitor) const {
+    void ForEachLeft(Visitor&& visitor) const TESSEL_LOCKS_UNPROVEN {
         for (MasterPointerBlock* block = blocks_; block; block = block->next)
             for (UPtr& slot : block->slots)
                 if (IsLiveContent(SlotContent(&slot))) visitor(&slot);
@@ -152,13 +151,13 @@ private:
     UHandle TakeShared(ThreadMemory* mine);
     void PutShared(ThreadMemory* mine, UHandle slot);
     bool Refill(SlotChain& chain);
-    bool AddBlock();
+    bool AddBlock() TESSEL_REQUIRES(mutex);
     bool IsChain(UHandle head, uint32 count) const;
 
-    UHandle freeHead_ = nullptr;
-    int32 freeCount_ = 0;
-    MasterPointerBlock* blocks_ = nullptr;
-    int32 blockCount_ = 0;
+    UHandle freeHead_ TESSEL_GUARDED_BY(mutex) = nullptr;
+    int32 freeCount_ TESSEL_GUARDED_BY(mutex) = 0;
+    MasterPointerBlock* blocks_ TESSEL_GUARDED_BY(mutex) = nullptr;
+    int32 blockCount_ TESSEL_GUARDED_BY(mutex) = 0;
     MasterPointerSet set_;
 };
 

@@ -1,11 +1,11 @@
 // Checks and statistics.
 #include "memory/Handles.h"
 #include "memory/Heap.h"
+#include "platform/Mutex.h"
 #include <tessel/diagnostics/DebugStream.h>
 
 #include <algorithm>
 #include <atomic>
-#include <mutex>
 
 namespace tessel {
 namespace {
@@ -15,7 +15,7 @@ uint32 Saturated(uint64 value) {
 }
 
 MgErr CheckConsistency(bool report) {
-    bool chainsAreSound = !MemoryDebugging() || masterPointers.CheckChains(ThreadMemory::Mine());
+    const bool chainsAreSound = !MemoryDebugging() || masterPointers.CheckChains(ThreadMemory::Mine());
     heap::Check();
     MgErr err = masterPointers.CheckBlocks();
     if (!chainsAreSound) err = kCorruptErr;
@@ -31,8 +31,8 @@ std::atomic<bool> isChecking{false};
 
 // The counters as DSSetCounters set them lie this far from what the threads have counted.
 struct CounterOffsets {
-    std::mutex mutex;  // guards the rest
-    uint32 offsets[4] = {};
+    platform::Mutex mutex;
+    uint32 offsets[4] TESSEL_GUARDED_BY(mutex) = {};
 };
 CounterOffsets counterOffsets;
 
@@ -59,7 +59,7 @@ MgErr DSCheckHandle(UHandle h) {
 
 MgErr DSCheckPtr(const void* p) {
     if (!p) return kHandleErr;
-    bool checked = ChecksGuards(GuardKind::kPointer) && WritesGuards(GuardKind::kPointer);
+    const bool checked = ChecksGuards(GuardKind::kPointer) && WritesGuards(GuardKind::kPointer);
     return !checked || CheckGuards(p, GuardKind::kPointer) ? kNoErr : kHandleErr;
 }
 
@@ -80,14 +80,14 @@ int32 DSCheckPtrGuardBytes(const void* p) {
 MgErr DSHeapCheck(int32 report) {
     constexpr uint32 kProbe = 2;
     if (isChecking.exchange(true)) return kNoErr;
-    MgErr err = CheckConsistency(report != 0);
+    const MgErr err = CheckConsistency(report != 0);
     DSDisposePtr(DSNewPtr(kProbe));
     isChecking.store(false);
     return err;
 }
 
 MgErr DSMemStats(MemStatRec* stats) {
-    MgErr err = CheckConsistency(false);
+    const MgErr err = CheckConsistency(false);
     if (stats) {
         *stats = MemStatRec();
         stats->totalAllocated = Saturated(heap::TotalAllocated());
@@ -98,7 +98,7 @@ MgErr DSMemStats(MemStatRec* stats) {
 MgErr DSMemStats2(uint32* out0, uint32* out1, uint32* out2, uint32* out3, uint32* out4, uint32* out5, uint32* out6,
                   uint32* out7, uint32* out8, uint32* out9, uint32* out10, uint32* out11) {
     MemStatRec stats;
-    MgErr err = DSMemStats(&stats);
+    const MgErr err = DSMemStats(&stats);
     uint32* zeros[] = {out0, out1, out2, out4, out5, out6, out7, out8, out9, out10, out11};
     for (uint32* out : zeros)
         if (out) *out = 0;
@@ -130,7 +130,7 @@ MgErr DSCompact(void) {
 }
 
 bool MemCheckHeaps(void) {
-    bool was = MemoryDebugging();
+    const bool was = MemoryDebugging();
     SetMemoryDebugger(true);
     DSHeapCheck(1);
     heap::Check();
@@ -142,7 +142,7 @@ void DSSetCounters(const uint32 counters[4]) {
     if (!counters) return;
     uint32 raw[4];
     ReadRawCounters(raw);
-    std::lock_guard<std::mutex> hold(counterOffsets.mutex);
+    platform::MutexHolder hold(counterOffsets.mutex);
     for (int i = 0; i < 4; ++i) counterOffsets.offsets[i] = counters[i] - raw[i];
 }
 
@@ -150,6 +150,6 @@ void DSReadCounters(uint32 counters[4]) {
     if (!counters) return;
     uint32 raw[4];
     ReadRawCounters(raw);
-    std::lock_guard<std::mutex> hold(counterOffsets.mutex);
+    platform::MutexHolder hold(counterOffsets.mutex);
     for (int i = 0; i < 4; ++i) counters[i] = raw[i] + counterOffsets.offsets[i];
 }

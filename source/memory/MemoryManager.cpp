@@ -41,7 +41,7 @@ UHandle CreationFailed(uint32 size) {
 // A heap block with the data of a handle in it; null when there is no memory.
 UPtr NewData(ThreadMemory* mine, uint32 size, Alignment alignment) {
     HandleLayout layout;
-    uint32 bytes = layout.BlockSize(size, alignment);
+    const uint32 bytes = layout.BlockSize(size, alignment);
     if (TESSEL_UNLIKELY(bytes == 0)) return nullptr;
     void* block = heap::AllocateHandleBlock(mine, bytes);
     if (TESSEL_UNLIKELY(!block)) return nullptr;
@@ -52,7 +52,7 @@ UPtr NewData(ThreadMemory* mine, uint32 size, Alignment alignment) {
 
 TESSEL_NOT_INLINE UHandle NewHandle(uint32 size, Alignment alignment, bool clear, const void* frame) {
     ThreadMemory* mine = ThreadMemory::Mine();
-    uint32 detours = Detours();
+    const uint32 detours = Detours();
     if (detours) BeforeCreation(mine);
     UHandle h = masterPointers.Take(mine);
     if (TESSEL_UNLIKELY(!h)) return CreationFailed(size);
@@ -73,8 +73,8 @@ TESSEL_NOT_INLINE UHandle NewHandle(uint32 size, Alignment alignment, bool clear
 TESSEL_ALWAYS_INLINE UHandle NewPlainHandle(uint32 size) {
     ThreadMemory* mine = ThreadMemory::MineIfAny();
     if (TESSEL_UNLIKELY(Detours() != 0 || !mine || !mine->slots.head)) return nullptr;
-    uint32 bytes = HandleLayout::PlainBlockSize(size);
-    auto header = static_cast<HandleHeader*>(std::malloc(bytes));
+    const uint32 bytes = HandleLayout::PlainBlockSize(size);
+    const auto header = static_cast<HandleHeader*>(std::malloc(bytes));
     if (TESSEL_UNLIKELY(!header)) return nullptr;
     *header = {size, 0};
     UHandle h = masterPointers.TakePlain(mine);
@@ -105,18 +105,18 @@ void AfterPtrCreation(UPtr p, uint32 size, const void* frame) {
 void Free(ThreadMemory* mine, UHandle h, UPtr data) {
     HandleLayout layout;
     HandleGate gate(mine);
-    uint32 bytes = layout.BlockSize(layout.SizeOf(data), layout.AlignmentOf(data));
+    const uint32 bytes = layout.BlockSize(layout.SizeOf(data), layout.AlignmentOf(data));
     void* block = layout.BlockOf(data);
     masterPointers.Put(mine, h);
     heap::FreeHandleBlock(mine, block, bytes);
 }
 
 TESSEL_NOT_INLINE MgErr DisposeHandle(UHandle h) {
-    uint32 detours = Detours();
+    const uint32 detours = Detours();
     if (detours) UntrackHandle(h);
     if (!IsGoodHandle(h, kQueryProves)) return ReportMemoryError(kHandleErr, "DSDisposeHandle");
     UPtr data = *h;
-    uint32 size = HandleLayout().SizeOf(data);
+    const uint32 size = HandleLayout().SizeOf(data);
     if (detours & kScopeTracked) ScopeRemove(h);
     Free(ThreadMemory::Mine(), h, data);
     if (detours & kHandlesTraced) Trace(kDisposed, kNoErr, h, size, 0);
@@ -154,7 +154,7 @@ TESSEL_ALWAYS_INLINE UPtr ResizeInPlace(const Resizing& r) {
     UPtr data = *r.h;
     void* block = r.layout.BlockOf(data);
     if (r.newBytes != r.oldBytes) {
-        uint32 distance = r.layout.HeaderOf(data)->distance + r.layout.HeaderRoom();
+        const uint32 distance = r.layout.HeaderOf(data)->distance + r.layout.HeaderRoom();
         block = heap::ResizeHandleBlock(r.mine, block, r.oldBytes, r.newBytes);
         if (TESSEL_UNLIKELY(!block)) return nullptr;
         data = static_cast<UPtr>(block) + distance;
@@ -178,7 +178,7 @@ TESSEL_NOT_INLINE UPtr ResizeByCopy(const Resizing& r) {
 
 // The data's place afterwards, or null when there is no memory.
 TESSEL_ALWAYS_INLINE UPtr ResizeData(const Resizing& r) {
-    bool stress = memorySettings.stress.load(std::memory_order_relaxed);
+    const bool stress = memorySettings.stress.load(std::memory_order_relaxed);
     HandleGate gate(r.mine);
     UPtr data = nullptr;
     if (!stress && r.newAlignment == r.oldAlignment) data = ResizeInPlace(r);
@@ -237,8 +237,8 @@ MgErr Resize(UHandle h, uint32 size, Alignment alignment, AlignedBy by, bool cle
     ThreadMemory::Count(mine, &MemoryCounters::resizes, 1u);
     if (TESSEL_UNLIKELY(!IsGoodHandle(h, kChangeProves))) return ReportBadHandle(operation);
     HandleLayout layout;
-    uint32 oldSize = layout.SizeOf(*h);
-    MgErr err = ResizeChecked(mine, h, size, alignment, by, clear, layout, oldSize);
+    const uint32 oldSize = layout.SizeOf(*h);
+    const MgErr err = ResizeChecked(mine, h, size, alignment, by, clear, layout, oldSize);
     if (TESSEL_UNLIKELY(err != kNoErr || (Detours() & kHandlesTraced)))
         return AfterResize(err, h, size, oldSize, operation);
     return kNoErr;
@@ -320,7 +320,7 @@ MgErr DSDisposeHandle(UHandle h) {
 
 MgErr DSDisposeHandleAndNull(UHandle* h) {
     if (!h || !*h) return kNoErr;
-    MgErr err = DSDisposeHandle(*h);
+    const MgErr err = DSDisposeHandle(*h);
     *h = nullptr;
     return err;
 }
@@ -328,7 +328,7 @@ MgErr DSDisposeHandleAndNull(UHandle* h) {
 MgErr DSDisposePtr(void* p) {
     NeedMemorySettings();
     if (!p) return ReportMemoryError(kArgErr, "DSDisposePtr");
-    uint32 detours = Detours();
+    const uint32 detours = Detours();
     if (detours) UntrackPointer(p);
     if (ChecksGuards(GuardKind::kPointer) && !CheckGuards(p, GuardKind::kPointer))
         return ReportMemoryError(kHandleErr, "DSDisposePtr");

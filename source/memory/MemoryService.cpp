@@ -23,21 +23,25 @@ void PassOnHeapError(heap::Error error, const void* block) {
 // Names the blocks of all handles to a walk over the heap.
 bool NameHandleBlocks(void* context, heap::Visitor visitor) {
     HandleLayout layout;
+    platform::ReadablePages pages;
     return masterPointers.ForEachLive([&](UHandle h) {
-        if (!layout.IsSound(*h)) return false;
-        uint32 bytes = layout.BlockSize(layout.SizeOf(*h), layout.AlignmentOf(*h));
-        return visitor(context, layout.BlockOf(*h), bytes);
+        const UPtr data = *h;
+        if (!layout.IsSound(data, pages)) return false;
+        const uint32 bytes = layout.BlockSize(layout.SizeOf(data), layout.AlignmentOf(data));
+        return visitor(context, layout.BlockOf(data), bytes);
     });
 }
 
-// Reports and frees every handle that is left. One whose header is destroyed has a size that nobody knows, and keeps
-// its block: to free it would be to follow the header.
+// Reports and frees every handle that is left. One that was overwritten, or whose header was, has a size that nobody
+// knows, and keeps its block: to free it would be to follow the header. Blocks that were freed may be given back to the
+// system, so what can be read is asked anew for each.
 void RecoverHandles() {
     uint32 count = 0;
     uint64 bytes = 0;
     masterPointers.ForEachLeft([&](UHandle h) {
-        const bool sound = HandleLayout().IsSound(*h);
-        uint32 size = sound ? HandleLayout().SizeOf(*h) : 0;
+        platform::ReadablePages pages;
+        const bool sound = HandleLayout().IsSound(*h, pages);
+        const uint32 size = sound ? HandleLayout().SizeOf(*h) : 0;
         TESSEL_REPORT(kDebugInfo, 0x66B5D82Cu) << "handle " << DbgFmtPtr(h) << ", size " << size << " still allocated.";
         UntrackHandle(h);
         if (!sound) return heap::CallErrorCallback(heap::Error::kDamagedBlock, *h);
@@ -58,7 +62,7 @@ MgErr MemoryManagerStart() {
     previousCallback = heap::SetErrorCallback(PassOnHeapError);
     SetMemoryDebugger(false);
     MgErr err = masterPointers.Start();
-    if (err == kNoErr) err = ThMutexCreate(&masterPointers.mutex, "MemoryManager");
+    if (err == kNoErr) err = masterPointers.mutex.Create("MemoryManager");
     if (err != kNoErr) {
         masterPointers.Stop();
         heap::SetErrorCallback(previousCallback);
@@ -78,8 +82,7 @@ MgErr MemoryManagerStop() {
     WriteLeakReports();
     heap::SetHandleBlocks(nullptr);
     RecoverHandles();
-    ThMutexDestroy(masterPointers.mutex);
-    masterPointers.mutex = nullptr;
+    masterPointers.mutex.Destroy();
     StopTrackers();
     SetMemFullProc(nullptr);
     heap::SetErrorCallback(previousCallback);

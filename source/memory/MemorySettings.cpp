@@ -106,7 +106,7 @@ void SetMemoryDebugger(bool on) {
 }
 
 bool ToggleMemoryDebugging(void) {
-    bool on = !MemoryDebugging();
+    const bool on = !MemoryDebugging();
     TESSEL_REPORT(kDebugInfo, 0x5D3A0B96u) << "turning memory checking " << (on ? "on" : "off");
     SetMemoryDebugger(on);
     return on;

@@ -32,14 +32,14 @@ void ClearMem(void* address, size_t count) {
 }
 
 int32 BlockCmp(const void* a, const void* b, size_t count) {
-    auto first = static_cast<const uint8*>(a), second = static_cast<const uint8*>(b);
+    const auto first = static_cast<const uint8*>(a), second = static_cast<const uint8*>(b);
     // memcmp is fast but does not tell the difference.
     if (count == 0 || std::memcmp(first, second, count) == 0) return 0;
-    auto unequal = std::mismatch(first, first + count, second);
+    const auto unequal = std::mismatch(first, first + count, second);
     return *unequal.first - *unequal.second;
 }
 
 void SwapBlock(void* a, void* b, size_t count) {
-    auto first = static_cast<uint8*>(a);
+    const auto first = static_cast<uint8*>(a);
     std::swap_ranges(first, first + count, static_cast<uint8*>(b));
 }

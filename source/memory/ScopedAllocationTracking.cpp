@@ -3,10 +3,10 @@
 #include "diagnostics/Guarded.h"
 #include "memory/MemorySettings.h"
 #include "memory/Trackers.h"
+#include "sync/LibraryMutex.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/diagnostics/StackChain.h>
 #include <tessel/memory/ScopedAllocationTracking.h>
-#include <tessel/sync/ThMutex.h>
 
 #include <map>
 #include <new>
@@ -24,9 +24,9 @@ struct ScopedAllocation {
 using ScopedMap = std::map<uintptr_t, ScopedAllocation>;
 
 struct ScopedRecord {
-    ThMutex mutex = nullptr;  // guards the rest
-    bool active = false;
-    ScopedMap map;
+    LibraryMutex mutex;
+    bool active TESSEL_GUARDED_BY(mutex) = false;
+    ScopedMap map TESSEL_GUARDED_BY(mutex);
 };
 ScopedRecord* record = nullptr;  // from start to stop of the memory manager
 
@@ -50,8 +50,8 @@ void ReportAllocation(const ScopedAllocation& allocation) {
 
 // Takes what is left out of the record and ends tracking. False when it was not on.
 bool EndTracking(ScopedMap& left) {
-    ThMutexHolder hold(record->mutex);
-    bool was = record->active;
+    LibraryMutexHolder hold(record->mutex);
+    const bool was = record->active;
     record->active = false;
     SetDetour(kScopeTracked, false);
     left.swap(record->map);
@@ -62,14 +62,13 @@ bool EndTracking(ScopedMap& left) {
 
 void StartScopedTracker() {
     record = new (std::nothrow) ScopedRecord;
-    if (record && ThMutexCreate(&record->mutex, "ScopedAllocationTracking") != kNoErr)
-        delete std::exchange(record, nullptr);
+    if (record && record->mutex.Create("ScopedAllocationTracking") != kNoErr) delete std::exchange(record, nullptr);
 }
 
 void StopScopedTracker() {
     if (!record) return;
     SetDetour(kScopeTracked, false);
-    ThMutexDestroy(record->mutex);
+    record->mutex.Destroy();
     delete record;
     record = nullptr;
 }
@@ -77,16 +76,16 @@ void StopScopedTracker() {
 void ScopeAdd(const void* address, uint32 size, const void* frame) {
     ScopedAllocation allocation{size, {}};
     allocation.stack.RecordFrom(frame, static_cast<const StackFrame*>(frame)->returnAddress, 0);
-    ThMutexHolder hold(record->mutex);
+    LibraryMutexHolder hold(record->mutex);
     if (!record->active) return;
-    Guarded([&] {
+    Guarded([&]() TESSEL_LOCKS_UNPROVEN {  // called at once
         record->map.insert_or_assign(reinterpret_cast<uintptr_t>(address), allocation);
         return kNoErr;
     });
 }
 
 void ScopeRemove(const void* address) {
-    ThMutexHolder hold(record->mutex);
+    LibraryMutexHolder hold(record->mutex);
     record->map.erase(reinterpret_cast<uintptr_t>(address));
 }
 
@@ -98,7 +97,7 @@ void StartScopedAllocationTracking(void) {
     if (!record) return;
     bool wasActive;
     {
-        ThMutexHolder hold(record->mutex);
+        LibraryMutexHolder hold(record->mutex);
         wasActive = record->active;
         record->active = true;
         SetDetour(kScopeTracked, true);

@@ -14,7 +14,7 @@ namespace {
 
 // Guards the list of threads, and is held while the gate is closed. The heap's locks may be taken inside.
 platform::Mutex threadsMutex;
-ThreadMemory* threads = nullptr;
+ThreadMemory* threads TESSEL_GUARDED_BY(threadsMutex) = nullptr;
 
 thread_local bool isEnding = false;
 
@@ -106,23 +106,25 @@ void HandleGate::EnterSlowly() {
     }
 }
 
-void HandleGate::LockShared() {
+// Given back by UnlockShared.
+void HandleGate::LockShared() TESSEL_LOCKS_UNPROVEN {
     threadsMutex.Lock();
 }
 
-void HandleGate::UnlockShared() {
+void HandleGate::UnlockShared() TESSEL_LOCKS_UNPROVEN {
     threadsMutex.Unlock();
 }
 
-GateClosed::GateClosed() {
+// Holds the mutex until its end.
+GateClosed::GateClosed() TESSEL_LOCKS_UNPROVEN {
     threadsMutex.Lock();
-    uint32 before = HandleGate::state.fetch_or(HandleGate::kClosed, std::memory_order_seq_cst);
+    const uint32 before = HandleGate::state.fetch_or(HandleGate::kClosed, std::memory_order_seq_cst);
     if (!(before & HandleGate::kOwnFences)) platform::FenceEveryThread();
     for (ThreadMemory* thread = threads; thread; thread = thread->next_)
         while (thread->inside_.load(std::memory_order_seq_cst) != 0) platform::YieldThread();
 }
 
-GateClosed::~GateClosed() {
+GateClosed::~GateClosed() TESSEL_LOCKS_UNPROVEN {
     HandleGate::state.fetch_and(~HandleGate::kClosed, std::memory_order_seq_cst);
     threadsMutex.Unlock();
 }

@@ -30,7 +30,7 @@ complex<Extended> Native(const cmplxExt& z) {
 // An operand in the precision to compute in.
 template <class Real>
 auto Wide(const Real& x) {
-    return real::Widen(Native(x));
+    return real::InWider(Native(x));
 }
 complex<double> Wide(const cmplx64& z) {
     return {z.re, z.im};

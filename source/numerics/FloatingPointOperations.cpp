@@ -65,54 +65,54 @@ using namespace tessel;
 
 // ---- on the stack ---------------------------------------------------------------------------------------------------
 
-#define REAL_UNARY(NAME, FUNCTION)             \
+#define EXTENDED_UNARY(NAME, FUNCTION)         \
     void NAME(void) {                          \
         PushRegister(FUNCTION(PopRegister())); \
     }
 
 // The second operand lies on top of the first.
-#define REAL_BINARY(NAME, FUNCTION)            \
+#define EXTENDED_BINARY(NAME, FUNCTION)        \
     void NAME(void) {                          \
         const Extended second = PopRegister(); \
         const Extended first = PopRegister();  \
         PushRegister(FUNCTION(first, second)); \
     }
 
-#define COMPLEX_UNARY(NAME, FUNCTION)    \
-    void NAME(void) {                    \
-        PushValue(FUNCTION(PopValue())); \
+#define EXTENDED_COMPLEX_UNARY(NAME, FUNCTION) \
+    void NAME(void) {                          \
+        PushValue(FUNCTION(PopValue()));       \
     }
 
-REAL_BINARY(LogX, real::Logx)
-REAL_UNARY(Log2, real::Log2)
-REAL_UNARY(Log10, real::Log10)
-REAL_UNARY(LogN, real::Logn)
-REAL_UNARY(Lognp1, real::Lognp1)
-REAL_UNARY(ExpX, std::exp)
-REAL_UNARY(_F2X, std::exp2)
-REAL_UNARY(Pow10X, real::Pow10)
-REAL_UNARY(Pow2X, std::exp2)
-REAL_BINARY(PowerX, std::pow)
-REAL_BINARY(ScaleX, real::Scale)
-REAL_UNARY(FloorX, std::floor)
-REAL_UNARY(CeilX, std::ceil)
-REAL_UNARY(SignX, real::Sign)
-REAL_UNARY(SinX, std::sin)
-REAL_UNARY(CosX, std::cos)
-REAL_UNARY(TanX, std::tan)
-REAL_BINARY(ATanX, real::Atan2)
-REAL_UNARY(SincX, real::Sinc)
-REAL_UNARY(RecipX, real::Recip)
-REAL_UNARY(Sinh, std::sinh)
-REAL_UNARY(Cosh, std::cosh)
-REAL_UNARY(Tanh, std::tanh)
-REAL_UNARY(Asinh, std::asinh)
-REAL_UNARY(Acosh, std::acosh)
-REAL_UNARY(Atanh, std::atanh)
-REAL_UNARY(ASinX, std::asin)
-REAL_UNARY(ACosX, std::acos)
-REAL_UNARY(FPIsInt, IsInteger)
-REAL_BINARY(FPCompareExt, Compare)
+EXTENDED_BINARY(LogX, real::Logx)
+EXTENDED_UNARY(Log2, real::Log2)
+EXTENDED_UNARY(Log10, real::Log10)
+EXTENDED_UNARY(LogN, real::Logn)
+EXTENDED_UNARY(Lognp1, real::Lognp1)
+EXTENDED_UNARY(ExpX, std::exp)
+EXTENDED_UNARY(_F2X, std::exp2)
+EXTENDED_UNARY(Pow10X, real::Pow10)
+EXTENDED_UNARY(Pow2X, std::exp2)
+EXTENDED_BINARY(PowerX, std::pow)
+EXTENDED_BINARY(ScaleX, real::Scale)
+EXTENDED_UNARY(FloorX, std::floor)
+EXTENDED_UNARY(CeilX, std::ceil)
+EXTENDED_UNARY(SignX, real::Sign)
+EXTENDED_UNARY(SinX, std::sin)
+EXTENDED_UNARY(CosX, std::cos)
+EXTENDED_UNARY(TanX, std::tan)
+EXTENDED_BINARY(ATanX, real::Atan2)
+EXTENDED_UNARY(SincX, real::Sinc)
+EXTENDED_UNARY(RecipX, real::Recip)
+EXTENDED_UNARY(Sinh, std::sinh)
+EXTENDED_UNARY(Cosh, std::cosh)
+EXTENDED_UNARY(Tanh, std::tanh)
+EXTENDED_UNARY(Asinh, std::asinh)
+EXTENDED_UNARY(Acosh, std::acosh)
+EXTENDED_UNARY(Atanh, std::atanh)
+EXTENDED_UNARY(ASinX, std::asin)
+EXTENDED_UNARY(ACosX, std::acos)
+EXTENDED_UNARY(FPIsInt, IsInteger)
+EXTENDED_BINARY(FPCompareExt, Compare)
 
 // 2^x - 1, which is e^(x ln 2) - 1 where that is small.
 void _F2XM1(void) {
@@ -126,23 +126,23 @@ void FMantExpX(void) {
     PushRegister(parts.mantissa);
 }
 
-COMPLEX_UNARY(ComplexRToP, cmplx::ToPolar)
-COMPLEX_UNARY(ComplexPToR, cmplx::ToRectangular)
-COMPLEX_UNARY(ComplexRecip, cmplx::Recip)
-COMPLEX_UNARY(ComplexSin, std::sin)
-COMPLEX_UNARY(ComplexCos, std::cos)
-COMPLEX_UNARY(ComplexTan, std::tan)
-COMPLEX_UNARY(ComplexCot, cmplx::Cot)
-COMPLEX_UNARY(ComplexSinh, std::sinh)
-COMPLEX_UNARY(ComplexCosh, std::cosh)
-COMPLEX_UNARY(ComplexTanh, std::tanh)
-COMPLEX_UNARY(ComplexSinc, cmplx::Sinc)
-COMPLEX_UNARY(ComplexAsin, std::asin)
-COMPLEX_UNARY(ComplexAcos, std::acos)
-COMPLEX_UNARY(ComplexAsinh, std::asinh)
-COMPLEX_UNARY(ComplexAcosh, std::acosh)
-COMPLEX_UNARY(ComplexAtan, std::atan)
-COMPLEX_UNARY(ComplexAtanh, std::atanh)
+EXTENDED_COMPLEX_UNARY(ComplexRToP, cmplx::ToPolar)
+EXTENDED_COMPLEX_UNARY(ComplexPToR, cmplx::ToRectangular)
+EXTENDED_COMPLEX_UNARY(ComplexRecip, cmplx::Recip)
+EXTENDED_COMPLEX_UNARY(ComplexSin, std::sin)
+EXTENDED_COMPLEX_UNARY(ComplexCos, std::cos)
+EXTENDED_COMPLEX_UNARY(ComplexTan, std::tan)
+EXTENDED_COMPLEX_UNARY(ComplexCot, cmplx::Cot)
+EXTENDED_COMPLEX_UNARY(ComplexSinh, std::sinh)
+EXTENDED_COMPLEX_UNARY(ComplexCosh, std::cosh)
+EXTENDED_COMPLEX_UNARY(ComplexTanh, std::tanh)
+EXTENDED_COMPLEX_UNARY(ComplexSinc, cmplx::Sinc)
+EXTENDED_COMPLEX_UNARY(ComplexAsin, std::asin)
+EXTENDED_COMPLEX_UNARY(ComplexAcos, std::acos)
+EXTENDED_COMPLEX_UNARY(ComplexAsinh, std::asinh)
+EXTENDED_COMPLEX_UNARY(ComplexAcosh, std::acosh)
+EXTENDED_COMPLEX_UNARY(ComplexAtan, std::atan)
+EXTENDED_COMPLEX_UNARY(ComplexAtanh, std::atanh)
 
 void ComplexDivide(void) {
     const Complex divisor = PopValue();

@@ -33,15 +33,16 @@ T NaN() {
 template <class T>
 using Wider = std::conditional_t<std::is_same_v<T, float>, double, Extended>;
 
+// An operand in that precision. No other type is turned into one of these silently.
 template <class T>
-T Widen(T x) = delete;
-inline double Widen(float x) {
+T InWider(T x) = delete;
+inline double InWider(float x) {
     return x;
 }
-inline Extended Widen(double x) {
+inline Extended InWider(double x) {
     return x;
 }
-inline Extended Widen(Extended x) {
+inline Extended InWider(Extended x) {
     return x;
 }
 
@@ -107,7 +108,7 @@ T Lognp1(T x) {
 
 template <class T>
 T Logx(T base, T x) {
-    const auto quotient = Logn(Widen(x)) / Logn(Widen(base));
+    const auto quotient = Logn(InWider(x)) / Logn(InWider(base));
     return std::isnan(quotient) ? NaN<T>() : static_cast<T>(quotient);
 }
 

@@ -66,9 +66,6 @@ PathRef::CachedValue<Item, Value>::CachedValue(uint32 lifetime, RelationToMetaDa
 }
 
 template <class Item, class Value>
-PathRef::CachedValue<Item, Value>::~CachedValue() = default;
-
-template <class Item, class Value>
 bool PathRef::CachedValue<Item, Value>::IsA(const char* className) const {
     return std::strcmp(className, Item::ClassName()) == 0 || CachedItem::IsA(className);
 }

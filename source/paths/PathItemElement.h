@@ -3,6 +3,7 @@
 #define TESSEL_SOURCE_PATHS_PATHITEMELEMENT_H
 
 #include "paths/PathItemCache.h"
+#include "paths/PathLock.h"
 #include <tessel/memory/TrackedMallocFree.h>
 
 #include <atomic>
@@ -35,23 +36,27 @@ public:
 
     // ---- with the path mutex held -----------------------------------------------------------------------------------
 
-    int32 ChildCount() const { return static_cast<int32>(children_.size()); }
-    PathItemElement* ChildAt(int32 index) const { return children_[static_cast<size_t>(index)].element; }
-    int32 OutsideRetains() const { return retains_.load(std::memory_order_relaxed) - ChildCount(); }
-    std::unique_ptr<PathItemCache>& Cache() { return cache_; }
-    void GiveBackUnusedRoom();
+    int32 ChildCount() const TESSEL_REQUIRES(pathMutex) { return static_cast<int32>(children_.size()); }
+    PathItemElement* ChildAt(int32 index) const TESSEL_REQUIRES(pathMutex) {
+        return children_[static_cast<size_t>(index)].element;
+    }
+    int32 OutsideRetains() const TESSEL_REQUIRES(pathMutex) {
+        return retains_.load(std::memory_order_relaxed) - ChildCount();
+    }
+    std::unique_ptr<PathItemCache>& Cache() TESSEL_REQUIRES(pathMutex) { return cache_; }
+    void GiveBackUnusedRoom() TESSEL_REQUIRES(pathMutex);
 
     // Moves the caches of this element and all below it to the list.
-    void TakeCaches(PathItemCacheList& list);
+    void TakeCaches(PathItemCacheList& list) TESSEL_REQUIRES(pathMutex);
 
     enum class Fault { kNone, kOwnParent, kBaseDepth, kDepth, kChildren };
-    Fault Check();
+    Fault Check() TESSEL_REQUIRES(pathMutex);
 
     // ---- for the storage --------------------------------------------------------------------------------------------
 
     bool Claim();
     void BecomeBase(const char* name);
-    void Vacate();
+    void Vacate() TESSEL_REQUIRES(pathMutex);
 
 private:
     struct ChildEntry {
@@ -60,13 +65,14 @@ private:
     };
     using Children = std::vector<ChildEntry, TrackedAllocator<ChildEntry>>;
 
-    Children::iterator FindChild(const std::string& name, int32 hash, bool& found);
+    Children::iterator FindChild(const std::string& name, int32 hash, bool& found) TESSEL_REQUIRES(pathMutex);
     PathItemElement* FindOrMakeChild(const std::string& name);
-    PathItemElement* MakeChild(const std::string& name, int32 hash, Children::iterator position);
+    PathItemElement* MakeChild(const std::string& name, int32 hash, Children::iterator position)
+        TESSEL_REQUIRES(pathMutex);
     struct Remains;
-    void End(Remains& remains);
+    void End(Remains& remains) TESSEL_REQUIRES(pathMutex);
     // The element that follows this one and those below it in the tree of `top`; null at its end.
-    PathItemElement* NextBelow(const PathItemElement* top);
+    PathItemElement* NextBelow(const PathItemElement* top) TESSEL_REQUIRES(pathMutex);
     // Gives up one retain. The parent loses one too, the caller's to give up, when that ended the element.
     PathItemElement* ReleaseOnce();
 
@@ -74,11 +80,12 @@ private:
     PathItemElement* parent_ = nullptr;
     std::atomic<int32> retains_{0};
     std::atomic<uint32> inUse_{0};
-    Children children_;  // in the order of their hashes
-    std::unique_ptr<PathItemCache> cache_;
+    Children children_ TESSEL_GUARDED_BY(pathMutex);  // in the order of their hashes
+    std::unique_ptr<PathItemCache> cache_ TESSEL_GUARDED_BY(pathMutex);
     int32 depth_ = 0;
     int32 hash_ = 0;
-    bool checked_ = false;  // whether the order of the children has been verified since one was added
+    // Whether the order of the children has been verified since one was added.
+    bool checked_ TESSEL_GUARDED_BY(pathMutex) = false;
 };
 
 }  // namespace tessel

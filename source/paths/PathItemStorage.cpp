@@ -1,12 +1,14 @@
 #include "paths/PathItemStorage.h"
 
+#include "base/ReadMostlyTable.h"
 #include "paths/PathItemElement.h"
 #include "paths/PathLock.h"
+#include "sync/LibraryMutex.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/TrackedMallocFree.h>
-#include <tessel/sync/ThMutex.h>
 
 #include <bit>
+#include <cstdlib>
 #include <map>
 #include <new>
 #include <utility>
@@ -31,106 +33,36 @@ Block* BlockOf(const PathItemElement* element) {
     return reinterpret_cast<Block*>(reinterpret_cast<uintptr_t>(element) & ~uintptr_t{kBlockAlignment - 1});
 }
 
-// The addresses of all blocks: a hash table that is read without a lock, by any number of threads, while one who holds
-// the storage mutex changes it. It grows by being replaced; tables that were replaced stay until the end.
-class BlockSet {
-public:
-    bool Contains(const Block* block) const {
-        const Table* table = table_.load(std::memory_order_acquire);
-        if (!table) return false;
-        for (size_t i = Hash(block);; ++i) {
-            const Block* entry = table->entries[i & table->mask].load(std::memory_order_relaxed);
-            if (entry == block) return true;
-            if (!entry) return false;
-        }
+// All blocks. Read by any thread, changed by one that holds the storage mutex.
+struct BlockKeys {
+    static constexpr uint32 kFirstSlots = 16;
+    static constexpr uint32 kSlotsPerUsed = 2;
+    static constexpr uint32 kMostHashes = 1;
+    static constexpr bool kRemoves = true;
+
+    static uint32 Hashes(const Block*) { return 1; }
+    static uint32 Hash(const Block* block, uint32 = 0) {
+        return static_cast<uint32>(reinterpret_cast<uintptr_t>(block) / kBlockAlignment) * 0x9E3779B1u;
     }
-
-    bool Add(Block* block) {
-        Table* table = table_.load(std::memory_order_relaxed);
-        if (!table || (table->used + 1) * 2 > table->mask + 1) table = Grow(table);
-        if (!table) return false;
-        Put(*table, block);
-        return true;
-    }
-
-    // A removed entry that no other stands behind is empty again, and so are those before it: who looks for a block
-    // ends there either way.
-    void Remove(const Block* block) {
-        Table* table = table_.load(std::memory_order_relaxed);
-        const auto entry = [&](size_t at) -> std::atomic<const Block*>& { return table->entries[at & table->mask]; };
-        size_t i = Hash(block);
-        while (entry(i).load(std::memory_order_relaxed) != block) ++i;
-        entry(i).store(Removed(), std::memory_order_relaxed);
-        if (entry(i + 1).load(std::memory_order_relaxed)) return;
-        for (; entry(i).load(std::memory_order_relaxed) == Removed(); --i, --table->used)
-            entry(i).store(nullptr, std::memory_order_relaxed);
-    }
-
-    // No other thread may be reading.
-    void Clear() {
-        Table* table = table_.exchange(nullptr, std::memory_order_relaxed);
-        while (table) {
-            Table* previous = table->previous;
-            delete[] table->entries;
-            delete table;
-            table = previous;
-        }
-    }
-
-private:
-    struct Table {
-        size_t mask;
-        size_t used;  // entries that are not empty
-        std::atomic<const Block*>* entries;
-        Table* previous;
-    };
-
-    static size_t Hash(const Block* block) { return reinterpret_cast<uintptr_t>(block) / kBlockAlignment; }
-    static const Block* Removed() { return reinterpret_cast<const Block*>(uintptr_t{1}); }
-
-    static void Put(Table& table, const Block* block) {
-        size_t i = Hash(block);
-        while (table.entries[i & table.mask].load(std::memory_order_relaxed)) ++i;
-        table.entries[i & table.mask].store(block, std::memory_order_release);
-        ++table.used;
-    }
-
-    Table* Grow(Table* old) {
-        const size_t size = old ? (old->mask + 1) * 2 : 16;
-        auto* entries = new (std::nothrow) std::atomic<const Block*>[size]();
-        Table* table = new (std::nothrow) Table{size - 1, 0, entries, old};
-        if (!entries || !table) {
-            delete[] entries;
-            delete table;
-            return nullptr;
-        }
-        for (size_t i = 0; old && i <= old->mask; ++i) {
-            const Block* block = old->entries[i].load(std::memory_order_relaxed);
-            if (block && block != Removed()) Put(*table, block);
-        }
-        table_.store(table, std::memory_order_release);
-        return table;
-    }
-
-    std::atomic<Table*> table_{nullptr};
 };
+using BlockSet = ReadMostlyTable<const Block, BlockKeys>;
 
 using Locations = std::map<std::string, PathItemElement*, std::less<>,
                            TrackedAllocator<std::pair<const std::string, PathItemElement*>>>;
 
-ThMutex storageMutex = nullptr;
-Block* currentBlock = nullptr;
+LibraryMutex storageMutex;
+Block* currentBlock TESSEL_GUARDED_BY(storageMutex) = nullptr;
 BlockSet blocks;
-Locations* locations = nullptr;
+Locations* locations TESSEL_GUARDED_BY(storageMutex) = nullptr;
 
 std::atomic<PathItemElement*> standards[kBaseCount];
 std::atomic<bool> standardsRead{false};
 
-Block* NewBlock() {
+Block* NewBlock() TESSEL_REQUIRES(storageMutex) {
     void* room = ::operator new (sizeof(Block), std::align_val_t{kBlockAlignment}, std::nothrow);
     if (!room) return nullptr;
     Block* block = new (room) Block;
-    if (!blocks.Add(block)) {
+    if (!blocks.Add(block, [](size_t size) { return std::calloc(1, size); })) {
         block->~Block();
         ::operator delete (room, std::align_val_t{kBlockAlignment});
         return nullptr;
@@ -144,7 +76,7 @@ Block* NewBlock() {
 }
 
 // Frees the block after `before`, which may be `before` itself.
-void FreeBlockAfter(Block* before) {
+void FreeBlockAfter(Block* before) TESSEL_REQUIRES(storageMutex) {
     Block* block = before->next;
     before->next = block->next;
     if (currentBlock == block) currentBlock = before == block ? nullptr : before;
@@ -154,7 +86,7 @@ void FreeBlockAfter(Block* before) {
 }
 
 template <class Visitor>
-void ForEachBlock(Visitor visit) {
+void ForEachBlock(Visitor visit) TESSEL_REQUIRES(storageMutex) {
     Block* block = currentBlock;
     if (!block) return;
     do {
@@ -167,7 +99,7 @@ bool IsUnused(const Block& block) {
     return block.freeSlots.load(std::memory_order_acquire) == kElementsPerBlock;
 }
 
-PathItemElement* ClaimSlot(Block& block) {
+PathItemElement* ClaimSlot(Block& block) TESSEL_REQUIRES(storageMutex) {
     if (block.freeSlots.load(std::memory_order_acquire) == 0) return nullptr;
     for (uint32 i = 0; i < kElementsPerBlock; ++i) {
         PathItemElement& slot = block.slots[block.cursor];
@@ -181,7 +113,7 @@ PathItemElement* ClaimSlot(Block& block) {
 }
 
 // The first free slot from the current block on. That block becomes the current one.
-PathItemElement* ClaimAnySlot() {
+PathItemElement* ClaimAnySlot() TESSEL_REQUIRES(storageMutex) {
     Block* block = currentBlock;
     if (!block) return nullptr;
     do {
@@ -194,7 +126,7 @@ PathItemElement* ClaimAnySlot() {
     return nullptr;
 }
 
-uint32 FreeUnusedBlocks() {
+uint32 FreeUnusedBlocks() TESSEL_REQUIRES(storageMutex) {
     uint32 unvisited = 0;
     ForEachBlock([&](Block&) { ++unvisited; });
     uint32 bytes = 0;
@@ -232,10 +164,10 @@ struct LeakedElement {
 using LeakedElements = std::vector<LeakedElement, TrackedAllocator<LeakedElement>>;
 
 // Elements that paths still refer to. The holds of children are no leaks, nor are the bases.
-LeakedElements FindLeakedElements() {
+LeakedElements FindLeakedElements() TESSEL_REQUIRES(pathMutex, storageMutex) {
     LeakedElements leaked;
     ForEachBlock([&](Block& block) {
-        ForEachLiveElement(block, [&](const PathItemElement& element) {
+        ForEachLiveElement(block, [&](const PathItemElement& element) TESSEL_LOCKS_UNPROVEN {  // called at once
             const int32 retains = element.OutsideRetains();
             if (retains > 0 && element.Parent()) leaked.push_back({retains, element.Name()});
         });
@@ -248,22 +180,22 @@ LeakedElements FindLeakedElements() {
 // ---- start and stop -------------------------------------------------------------------------------------------------
 
 MgErr PathItemStorage::Start() {
-    return ThMutexCreate(&storageMutex, "PathStorageMutex");
+    return storageMutex.Create("PathStorageMutex");
 }
 
-void PathItemStorage::Stop() {
+// Alone: nobody uses paths any more.
+void PathItemStorage::Stop() TESSEL_LOCKS_UNPROVEN {
     FreeUnusedBlocks();
     ForEachBlock(ReportLiveElements);
-    if (!currentBlock) blocks.Clear();
+    if (!currentBlock) blocks.Clear(std::free);
     standardsRead.store(false, std::memory_order_relaxed);
-    ThMutexDestroy(storageMutex);
-    storageMutex = nullptr;
+    storageMutex.Destroy();
 }
 
 // ---- slots ----------------------------------------------------------------------------------------------------------
 
 PathItemElement* PathItemStorage::Allocate() {
-    ThMutexHolder lock(storageMutex);
+    LibraryMutexHolder lock(storageMutex);
     PathItemElement* element = ClaimAnySlot();
     if (!element && NewBlock()) element = ClaimSlot(*currentBlock);
     return element;
@@ -275,7 +207,7 @@ void PathItemStorage::SlotVacated(const PathItemElement* element) {
 
 bool PathItemStorage::Owns(const PathItemElement* element) {
     const Block* block = BlockOf(element);
-    if (!block || !blocks.Contains(block)) return false;
+    if (!blocks.Find(BlockKeys::Hash(block), [block](const Block* there) { return there == block; })) return false;
     const uintptr_t offset = reinterpret_cast<uintptr_t>(element) - reinterpret_cast<uintptr_t>(block->slots);
     return offset < sizeof block->slots && offset % sizeof(PathItemElement) == 0;
 }
@@ -298,7 +230,7 @@ PathItemElement* PathItemStorage::Standard(PathRef::PathBase base) {
 // ---- standard locations ---------------------------------------------------------------------------------------------
 
 MgErr PathItemStorage::AddLocation(const char* name, PathItemElement* element) {
-    ThMutexHolder lock(storageMutex);
+    LibraryMutexHolder lock(storageMutex);
     if (!locations) locations = new (TrackedNew(sizeof(Locations))) Locations;
     if (!locations->emplace(name, element).second) return kArgErr;
     element->Retain();
@@ -306,7 +238,7 @@ MgErr PathItemStorage::AddLocation(const char* name, PathItemElement* element) {
 }
 
 PathItemElement* PathItemStorage::FindLocation(const char* name) {
-    ThMutexHolder lock(storageMutex);
+    LibraryMutexHolder lock(storageMutex);
     if (!locations) return nullptr;
     const auto found = locations->find(std::string_view(name));
     if (found == locations->end()) return nullptr;
@@ -317,7 +249,7 @@ PathItemElement* PathItemStorage::FindLocation(const char* name) {
 void PathItemStorage::ForgetLocations() {
     Locations* forgotten;
     {
-        ThMutexHolder lock(storageMutex);
+        LibraryMutexHolder lock(storageMutex);
         forgotten = std::exchange(locations, nullptr);
     }
     if (!forgotten) return;
@@ -333,7 +265,7 @@ uint32 PathItemStorage::GarbageCollect(PathRef::OptimizationMethod method) {
     LeakedElements leaked;
     {
         PathLock pathLock;
-        ThMutexHolder lock(storageMutex);
+        LibraryMutexHolder lock(storageMutex);
         if (method == PathRef::kFreeUnusedAndReport) leaked = FindLeakedElements();
         if (method != PathRef::kCountOnly) bytes = FreeUnusedBlocks();
     }

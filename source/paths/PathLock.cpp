@@ -1,11 +1,11 @@
 #include "paths/PathLock.h"
 
-#include "sync/RecursiveMutex.h"
-
 namespace tessel {
-namespace {
 
 RecursiveMutex pathMutex;
+
+namespace {
+
 thread_local uint32 pathMutexHeld = 0;
 
 }  // namespace

@@ -56,12 +56,17 @@ void FlushEverything() {
         if (PathItemElement* base = PathItemStorage::Standard(entry.base)) base->TakeCaches(caches);
 }
 
+bool HasChildren(const PathItemElement& element) {
+    PathLock lock;
+    return element.ChildCount() > 0;
+}
+
 // An element that is still there after that is somebody's.
 void PurgeBases() {
     FlushEverything();
     for (const BaseName& entry : kBaseNames) {
         const PathItemElement* base = PathItemStorage::Standard(entry.base);
-        if (base && base->ChildCount() > 0)
+        if (base && HasChildren(*base))
             TESSEL_REPORT(kDebugWarning, 0xC04E91B7u)
                 << "Possible path leak, unable to purge elements of base #" << static_cast<int32>(entry.base);
         PathItemStorage::SetStandard(entry.base, nullptr);

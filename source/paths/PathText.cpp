@@ -1,6 +1,7 @@
 // Paths as text through the flat interface.
 #include "diagnostics/Guarded.h"
 #include "paths/PathSteps.h"
+#include "strings/HandleOps.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/memory/MemoryManager.h>
@@ -36,12 +37,9 @@ MgErr TextOf(Path path, const char* format, std::string& text) {
 
 // Stores text in a string handle, which is made when it is null. A zero byte follows when asked for.
 MgErr StoreText(const std::string& text, bool terminated, LStrHandle* handle) {
-    if (text.size() >= INT32_MAX - LStrSize(1)) return kMemFullErr;
-    const uint32 size = LStrSize(text.size()) + (terminated ? 1 : 0);
-    const MgErr err = DSSetHandleSizeOrNewHandle(reinterpret_cast<UHandle*>(handle), size);
-    if (err) return err;
-    (**handle)->count = static_cast<int32>(text.size());
-    std::memcpy((**handle)->bytes, text.c_str(), text.size() + (terminated ? 1 : 0));
+    const size_t end = terminated ? 1 : 0;
+    if (const MgErr err = MakeLStr(handle, text.size(), end)) return err;
+    std::memcpy((**handle)->bytes, text.c_str(), text.size() + end);
     return kNoErr;
 }
 

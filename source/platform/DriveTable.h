@@ -22,7 +22,8 @@
 namespace tessel::platform {
 
 // The host's name for `name`, with each part that exists spelled as on the disk; parts that do not exist stay as given.
-// False with 53 (no such server), 3 (no such drive), 123 (an empty name, or bytes that the code page does not have).
+// False with 53 (no such server), 3 (no such drive), 123 (an empty name, or bytes that the code page does not have),
+// and when the disk cannot be asked.
 bool NameToNative(std::string_view name, std::string& native);
 
 // The same without looking at the disk: what the text says.

@@ -13,6 +13,8 @@
 #ifndef TESSEL_PLATFORM_EVENT_H
 #define TESSEL_PLATFORM_EVENT_H
 
+#include "platform/Mutex.h"
+
 #include <atomic>
 #include <cstddef>
 #include <cstdint>
@@ -59,6 +61,7 @@ public:
 
 private:
     struct Watch;
+    static constinit Mutex watchMutex;            // one for the watches of all events; nothing is taken inside
     static constexpr std::uint32_t kWatched = 1;  // bit 0 of sleepers_: a WaitAny watches this event among others
     static constexpr std::uint32_t kSleeper = 2;  // the rest counts the threads asleep in Wait
 
@@ -69,8 +72,8 @@ private:
     bool LookAgain() noexcept;
     EventWait SleepFor(std::int32_t milliseconds) noexcept;
     void Wake(std::uint32_t sleepers) noexcept;
-    void AddWatch(Watch& watch) noexcept;
-    void RemoveWatch(Watch& watch) noexcept;
+    void AddWatch(Watch& watch) noexcept TESSEL_REQUIRES(watchMutex);
+    void RemoveWatch(Watch& watch) noexcept TESSEL_REQUIRES(watchMutex);
     void WakeWatches() noexcept;
     static int TakeFirst(Event* const* events, std::size_t count) noexcept;
 
@@ -81,7 +84,7 @@ private:
     std::atomic<std::uint32_t> awake_{0};  // threads in Wait that do not sleep
     std::atomic<std::uint8_t> habit_{0};   // how soon signals came lately
     std::atomic<std::uint8_t> shortSleeps_{0};
-    Watch* watches_ = nullptr;  // guarded by the one lock of all watches
+    Watch* watches_ TESSEL_GUARDED_BY(watchMutex) = nullptr;
 };
 
 }  // namespace tessel::platform

@@ -11,6 +11,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <cstdio>
 
 namespace tessel::platform {
 
@@ -37,10 +38,15 @@ enum class Disposition {
 FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, Disposition disposition);
 
 // Creates a file afresh that only this user may read or write. What of this user's has the name goes first: a link
-// itself, never what it leads to. 5, and nothing is touched, when it is another user's, or a folder.
+// itself, never what it leads to. 5, and nothing is touched, when it is another user's, or a folder; 32 when another
+// process is writing it so, or has done since this one began.
 FileHandle FileCreatePrivate(const char* name, std::uint32_t access);
 
 bool FileClose(FileHandle file);
+
+// A stream of the C library for writing: at the end of the file with `append`, else after emptying it. It is made where
+// there is none. A folder or a pipe is refused (5). Null on failure.
+std::FILE* FileOpenStream(const char* name, bool append);
 
 // Move up to `count` bytes at the position, and the position with them. `actual` is set in every case. Reading ends
 // early only at the end of the file, which is no failure. Interrupted and short transfers go on by themselves. 5
@@ -63,12 +69,9 @@ bool FileSetSize(FileHandle file, std::int64_t size);
 // failure, and where the file system cannot promise room.
 bool FileReserve(FileHandle file, std::int64_t size);
 
-// Puts what was written onto the device.
+// Puts what was written, and the file's size and permissions, onto the device. After a failure nobody knows what is
+// there: flushing again proves nothing, what was written has to be written anew.
 bool FileFlush(FileHandle file);
-
-// The whole file as read-only memory. 1006 for an empty file. The view outlives the handle.
-bool FileMap(FileHandle file, const void*& data, std::size_t& size);
-bool FileUnmap(const void* data, std::size_t size);
 
 // Exclusive locks of byte ranges, between handles, in this process or another. They bind those who lock, not those who
 // only read and write. FileLock does not wait: 33 when another handle holds a part. FileUnlock gives 158 when nobody

@@ -27,6 +27,20 @@ struct ItemInfo {
 bool ItemGetInfo(const char* name, ItemInfo& info);
 bool FileGetInfo(FileHandle file, ItemInfo& info);
 
+// What shows whether a name still leads to the file and the text that it led to: another file, another size, or another
+// time of the last write, in whatever resolution the host keeps it.
+struct FileVersion {
+    std::uint64_t device, number;  // of the file
+    std::int64_t size;
+    std::int64_t seconds, nanoseconds;
+
+    bool operator==(const FileVersion&) const = default;
+};
+
+// As ItemGetInfo; but 2 for a link that leads nowhere.
+bool ItemGetVersion(const char* name, FileVersion& version);
+bool FileGetVersion(FileHandle file, FileVersion& version);
+
 enum class ItemKind { kNone, kFile, kFolder };
 ItemKind ItemExists(const char* name);
 
@@ -53,12 +67,27 @@ bool FolderRemove(const char* name);  // 145 when it is not empty, 267 when it i
 bool FileDelete(const char* name);    // 5 for a folder
 
 // Renames or moves a file or a folder. The destination must not exist (183), unless it is the same item in another
-// spelling. A file moves between file systems by copying; a folder does not (17).
+// spelling. Atomic and durable. Between file systems a file moves by copying, and keeps what it has: permissions,
+// attributes, times, and the owner where this user may give files away (else the rights to run as that owner go); a
+// link moves itself. It is whole in one place or the other, for a moment in both; a file that is being written is not
+// moved (32), and what is still added to it then is added to the copy. A folder does not move between file systems
+// (17), nor what is no file (5).
 bool ItemRename(const char* from, const char* to);
 
-// Copies bytes, permissions and modification time. The destination must not exist (80). Nothing is left behind after a
-// failure.
+// Copies bytes, permissions and modification time; holes stay holes. The destination must not exist in any spelling
+// (80). Atomic and durable: it appears whole, under its permissions. What is no regular file is refused (5), one that
+// ends before its size is not copied (38).
 bool FileCopy(const char* from, const char* to);
+
+// Copies all that a regular file holds over what another holds, with what is added meanwhile. `version`: which was
+// copied. `keepsHoles`: the other is new, and where it is not written it is to stay empty. Moves both positions. A
+// failure says which side failed; then the other holds a part. Neither atomic nor durable.
+enum class CopyResult { kDone, kReadFailed, kWriteFailed };
+CopyResult FileCopyBytes(FileHandle from, FileHandle to, bool keepsHoles, FileVersion& version);
+
+// Deletes the file that was copied, for good. 2 when `name` leads to another file than `file`, 32 when it has been
+// written since: nothing is deleted then. What is added to it in the last moment is added to the copy.
+bool FileDeleteCopied(const char* name, FileHandle file, const FileVersion& copied, FileHandle copy);
 
 bool ItemSetReadOnly(const char* name, bool readOnly);
 bool ItemSetMode(const char* name, std::uint32_t mode);  // 0777 at most

@@ -7,7 +7,6 @@
 #include <cstddef>
 #include <cstdint>
 #include <string>
-#include <vector>
 
 namespace tessel::platform {
 
@@ -19,14 +18,6 @@ ModuleHandle OwnModule() noexcept;
 
 // The full name of the module's file (as in DriveTable.h). 126 when no module is loaded at the handle.
 bool ModuleFileName(ModuleHandle module, std::string& name);
-
-struct ModuleEntry {
-    std::string name;  // of its file, without folders
-    ModuleHandle base;
-};
-
-// Every module, the executable first, at most `most`.
-std::vector<ModuleEntry> ModuleList(std::size_t most);
 
 struct AddressEntry {
     std::string module;  // name of its file, without folders; empty when unknown

@@ -1,11 +1,16 @@
 // The registry: keys that hold keys and typed values.
 //
 // A folder a key, a file a value, under TESSEL_REGISTRY (not set: $XDG_CONFIG_HOME/tessel/registry). Names ignore case.
-// A value is written whole: a reader, in whatever process, sees the old or the new one.
 //
-// Functions return an error number, 0 for success, and do not touch LastError. What changes a key, lists it or makes
-// one in it returns 1018 once somebody has deleted it. They may throw std::bad_alloc. A key is for one thread at a
-// time; different keys for any.
+// Every change is atomic and durable: a reader, in whatever process, sees what was there before or what is there now,
+// whole, also after the process was killed or the power failed, and once a change has returned 0 it stays. One that
+// fails leaves what was there before. Changes wait for each other; 1460 when another program does not come to its end
+// in 10 seconds (it was stopped), 5 and others when the store's lock cannot be opened. Where the file system has no
+// locks, nobody waits.
+//
+// Functions return an error number, 0 for success, and do not touch LastError. What is done to a key returns 1018 once
+// somebody has deleted it, or the store has vanished. They may throw std::bad_alloc. A key is for one thread at a time;
+// different keys for any.
 #ifndef TESSEL_PLATFORM_REGISTRY_H
 #define TESSEL_PLATFORM_REGISTRY_H
 
@@ -40,12 +45,13 @@ ErrorNumber RegistryOpenRoot(RegistryRoot root, std::uint32_t view, RegistryKey*
 // when it may not be written and `write` asks for it.
 ErrorNumber RegistryOpen(const RegistryKey* parent, const char* path, bool write, RegistryKey*& key);
 
-// Opens with write access, and makes what is missing.
+// Opens with write access, and makes what is missing, one key after the other. After a failure a key that was made may
+// be there.
 ErrorNumber RegistryCreate(const RegistryKey* parent, const char* path, RegistryKey*& key);
 
 ErrorNumber RegistryClose(RegistryKey* key);
 
-// Deletes the key at `path` and its values. 5 while it has subkeys.
+// Deletes the key at `path`, with its values and all below, at once.
 ErrorNumber RegistryDelete(const RegistryKey* parent, const char* path);
 
 ErrorNumber RegistryCounts(const RegistryKey* key, std::uint32_t& subKeys, std::uint32_t& values);
@@ -62,7 +68,7 @@ ErrorNumber RegistrySetValue(const RegistryKey* key, const char* name, std::uint
                              std::size_t size);  // 5 without write access
 ErrorNumber RegistryDeleteValue(const RegistryKey* key, const char* name);
 
-// Puts the key onto the device.
+// Puts the key onto the device, with what others have put into it.
 ErrorNumber RegistryFlush(const RegistryKey* key);
 
 }  // namespace tessel::platform

@@ -26,7 +26,9 @@ enum class ShellFolder {
 // there is none of that kind, or it is missing.
 bool ShellFolderName(ShellFolder kind, bool create, std::string& name);
 
-// Moves a file or folder to the user's trash. 2 when it is missing.
+// Moves a file or folder to the user's trash. 2 when it is missing, 5 when there is no trash of this user's own on its
+// file system. Atomic and durable: it is where it was or whole in the trash, and what is said of it there is never
+// without it for longer than until the next is moved there.
 bool ShellTrash(const char* name);
 
 // The target that the shortcut file `name` points to. 2 when it is missing, 1006 when it is no shortcut or has no

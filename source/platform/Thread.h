@@ -40,9 +40,8 @@ bool ThreadJoin(ThreadHandle thread, std::int32_t milliseconds) noexcept;
 bool ThreadExitCode(ThreadHandle thread, std::int32_t& code) noexcept;
 
 // Ends a thread by force, wherever it is: nothing of it is cleaned up, locks it holds stay held, its stack and its
-// thread-local values stay in memory. Only for a thread that
-// this seam started, and not the calling one (5 otherwise; 50 where the host cannot). Returns when it has ended; 1460
-// when it did not within a second, because it refuses.
+// thread-local values stay in memory. Only for a thread that this seam started, and not the calling one (5 otherwise;
+// 50 where the host cannot). Returns when it has ended; 1460 when it did not within a second, because it refuses.
 bool ThreadEnd(ThreadHandle thread, std::int32_t code) noexcept;
 
 // Priorities on the scale of the host that the library was designed for: -15 idle, -2 to 2, 15 time critical. Where the

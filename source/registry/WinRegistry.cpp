@@ -6,6 +6,7 @@
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/registry/WinRegistry.h>
 
+#include <atomic>
 #include <cstring>
 #include <new>
 #include <string_view>
@@ -132,22 +133,21 @@ ErrorNumber WinRegistryKey::CollectSubKeys(std::vector<std::string>& names) cons
     }
 }
 
-MgErr WinRegistryKey::DeleteAllSubKeys() {
+// Opens what would be deleted with a subkey, to see that it may be.
+MgErr WinRegistryKey::CheckDeletable(CStr name) {
+    AutoRelease<IWinRegistryKey> key;
+    if (const MgErr err = OpenSubKey(name, 1, key.Out())) return err;
+    auto& subKey = static_cast<WinRegistryKey&>(*key);
     std::vector<std::string> names;
-    MgErr err = Call([&] { return CollectSubKeys(names); });
-    for (size_t i = 0; i < names.size() && err == kNoErr; ++i) err = DeleteSubKey(names[i].c_str());
+    MgErr err = subKey.Call([&] { return subKey.CollectSubKeys(names); });
+    for (size_t i = 0; i < names.size() && err == kNoErr; ++i) err = subKey.CheckDeletable(names[i].c_str());
+    lastError_ = subKey.lastError_.load();
     return err;
 }
 
 MgErr WinRegistryKey::DeleteSubKey(CStr name) {
     if (!name || !*name) return Missing();
-    AutoRelease<IWinRegistryKey> key;
-    MgErr err = OpenSubKey(name, 1, key.Out());
-    if (err != kNoErr) return err;
-    err = static_cast<WinRegistryKey&>(*key).DeleteAllSubKeys();
-    lastError_ = key->GetLastError();
-    if (err != kNoErr) return err;
-    key.Reset(nullptr);
+    if (const MgErr err = CheckDeletable(name)) return err;
     return Call([&] { return platform::RegistryDelete(Handle(), name); });
 }
 
@@ -284,8 +284,9 @@ static_assert(static_cast<size_t>(platform::RegistryRoot::kUsers) == kRoots - 1)
 static_assert(kRegistryViewDefault == platform::kRegistryDefaultView);
 static_assert(kRegistryViewOf64Bit == platform::kRegistryView64);
 
-platform::Mutex rootsMutex;                 // guards the making of roots; nothing is taken inside
-IWinRegistryKey* rootKeys[kRoots][2] = {};  // by root and view, for the life of the process
+platform::Mutex rootsMutex;  // nothing is taken inside
+// By root and view, for the life of the process.
+IWinRegistryKey* rootKeys[kRoots][2] TESSEL_GUARDED_BY(rootsMutex) = {};
 
 // Null when there is no memory. Without a store it has no handle, so that every key of it is missing.
 IWinRegistryKey* MakeRoot(platform::RegistryRoot root, CStr name, uint32 view, ErrorNumber& error) try {
@@ -312,9 +313,10 @@ IWinRegistryKey* RootKey(platform::RegistryRoot root, uint32 view) {
         if (!known) known = MakeRoot(root, kRootNames[index], view, error);
         key = known;
     }
-    if (error != platform::kErrorSuccess)
+    static std::atomic<bool> isReported{false};
+    if (error != platform::kErrorSuccess && !isReported.exchange(true))
         TESSEL_REPORT(kDebugError, 0x6C41F7A3u)
-            << "TESSEL_REGISTRY is not the absolute name of a folder: " << kRootNames[index] << " has no keys";
+            << "TESSEL_REGISTRY is not the absolute name of a folder: there is no registry";
     return key;
 }
 

@@ -1,3 +1,4 @@
+// Walks over subkeys and values, and the values they give.
 #include "platform/CodePage.h"
 #include "registry/WinRegistryObjects.h"
 #include <tessel/base/OVExcept.h>

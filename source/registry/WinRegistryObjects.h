@@ -88,7 +88,7 @@ private:
     MgErr Missing();
 
     bool ReadValue(CStr name, uint32& type);
-    MgErr DeleteAllSubKeys();
+    MgErr CheckDeletable(CStr name);
     platform::ErrorNumber CollectSubKeys(std::vector<std::string>& names) const;
 
     RegistryKeyHandle handle_;

@@ -110,9 +110,9 @@ private:
     MgErr GetAttrs(const OVResource* resource, uint32* attrs);
 
     // writing (OVResFileUpdate.cpp)
-    MgErr WriteEmpty();
     MgErr RebaseData();
-    MgErr UpdateMap(uint64 dataLength);
+
+    // the whole file in memory (OVResFileImage.cpp)
     MgErr BuildImage(UHandle* image);
     MgErr MeasureLoaded(const Positions& positions, uint64* dataLength) const;
     void LayOut(ResourceMap* map, const Positions& positions, uint32 dataLength, uint8* image) const;

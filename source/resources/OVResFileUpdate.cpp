@@ -1,5 +1,25 @@
-// Writing resource files back: the update, which also packs them, and the image of a whole file.
+// Writing resource files back: the update, which also packs them.
+//
+// After a kill or a power loss at any moment, and after any failure, the next open finds the file as it was or as it
+// was to be, whole. There are three ways to that, tried in this order:
+//
+// A new file: the image is written beside the old one, flushed, and takes its name (platform/Replacement.h). It needs
+// room for the whole image.
+//
+// In place, where no new file can stand in for the old one: it has several names, was opened by reference, its folder
+// cannot be written or its owner not be kept; or the device has no room for an image. What has to move is written
+// behind the end of the file with a map that names it there, and flushed; then the header, 32 bytes in the first
+// sector, is turned over to that map. From then on the file is the new one, if not yet packed: where the old one's data
+// were is room now, and everything is written to its place there and turned over once more. Whenever that ends, a
+// reader finds a whole file at the places that the header gives. With less room only what changed is written behind the
+// end, and the file stays unpacked until its next update.
+//
+// On the spot, when there is not even room for that, and the update needs no more than the file has: everything is read
+// first, and put back if a write fails. A kill in this moment is the one that may leave neither file.
 #include "diagnostics/Guarded.h"
+#include "files/FileSupport.h"
+#include "platform/Replacement.h"
+#include "resources/ImageOutput.h"
 #include "resources/OVResFile.h"
 #include "resources/ResFileLock.h"
 #include <tessel/diagnostics/DebugStream.h>
@@ -13,86 +33,55 @@ namespace tessel {
 
 namespace {
 
-// Up to this size an entry is put together and written at once.
-constexpr uint32 kOneWriteLimit = 4096;
-
 constexpr uint64 kLongestFile = std::numeric_limits<uint32>::max();
 
-uint32 Padding(uint32 size) {
-    return static_cast<uint32>(DiskSize(size) - 4 - size);
+using Bytes = std::vector<uint8, TrackedAllocator<uint8>>;
+
+uint64 AlignedUp(uint64 offset) {
+    return (offset + 3) & ~uint64{3};
 }
-
-// The parts of a data entry, end to end. Returns what follows it.
-uint8* PutEntry(uint8* to, const uint8* data, uint32 size) {
-    const uint32 length = ToBig32(size);
-    std::memcpy(to, &length, 4);
-    if (size) std::memcpy(to + 4, data, size);
-    std::memset(to + 4 + size, 0, Padding(size));
-    return to + DiskSize(size);
-}
-
-MgErr WriteEntry(OVResfileIO& io, uint64 position, const uint8* data, uint32 size) {
-    if (DiskSize(size) <= kOneWriteLimit) {
-        uint8 entry[kOneWriteLimit];
-        PutEntry(entry, data, size);
-        return io.Write(position, entry, static_cast<uint32>(DiskSize(size)));
-    }
-    static const uint8 kZeros[4] = {};
-    const uint32 length = ToBig32(size);
-    if (const MgErr err = io.Write(position, &length, 4)) return err;
-    if (const MgErr err = io.Write(position + 4, data, size)) return err;
-    return Padding(size) ? io.Write(position + 4 + size, kZeros, Padding(size)) : kNoErr;
-}
-
-// A pointer block that frees itself.
-class Block {
-public:
-    explicit Block(uint32 size) : data_(DSNewPtr(size)) {}
-    ~Block() {
-        if (data_) DSDisposePtr(data_);
-    }
-    Block(const Block&) = delete;
-    Block& operator=(const Block&) = delete;
-    uint8* get() const { return data_; }
-
-private:
-    UPtr data_;
-};
 
 }  // namespace
 
 // A reference entry on its way through an update.
 struct OVResFile::Entry {
-    uint32 position;  // in the map
-    uint32 data;      // where its data are, from the data section start
-    uint64 diskSize;  // what its data take up on disk now
-    bool changed;
+    uint32 position;           // in the map
+    bool changed;              // has to be written
+    uint64 data;               // where its bytes are, from the data section start
+    uint64 place;              // where they go
+    uint32 diskLength;         // of its data, where they are
+    uint32 length;             // of what is written
+    const ResourceData* held;  // what is written, or null: the bytes on disk
 };
 
-// One update. Everything that can fail without a write is done before the first write, so that a damaged entry or a
-// full memory leaves the file as it was. After each entry that is written the map says where it is; what a failed write
-// may have spoilt on disk is marked changed, and is written again from memory by the next update.
 class OVResFile::Updating {
 public:
     explicit Updating(OVResFile* file) : file_(*file), map_(file->map_), io_(*file->io_) {}
-    ~Updating() { DropLoaded(); }
 
     MgErr Run() {
         if (const MgErr err = Collect()) return err;
-        if (const MgErr err = LoadChanged()) return err;
-        SkipPacked();
-        if (const MgErr err = LoadEndangered()) return err;
-        if (const MgErr err = ReserveLength()) return err;
-        for (; next_ < entries_.size(); ++next_) {
-            if (const MgErr err = Move(&entries_[next_])) return err;
+        PassPacked();
+        Lay(packed_, packedEnd_);
+        if (End() > kLongestFile) return kDiskFullErr;
+        if (io_.Handle()) return InMemory();
+        bool inPlace = !io_.CanBeReplaced();
+        if (!inPlace) {
+            const MgErr err = ReplaceFile(&inPlace);
+            if (!inPlace) return err;
         }
-        return file_.UpdateMap(end_);
+        return map_.IsEmpty() ? EmptyInPlace() : InPlace();
     }
 
 private:
     using Entries = std::vector<Entry, TrackedAllocator<Entry>>;
 
-    ResourceEntry* At(const Entry& entry) const { return map_.EntryAt(entry.position); }
+    // What stands around the data: the header, and the map without slots of loaded resources.
+    struct Frame {
+        RsrcHeader header;
+        Bytes map;
+    };
+
+    // ---- what there is ----
 
     // Lists every entry, unchanged ones first, those by where their data are.
     MgErr Collect() {
@@ -106,118 +95,261 @@ private:
             return kArgErr;
         }
         entries_.reserve(positions.size());
-        loadedHere_.reserve(positions.size());
         for (const uint32 position : positions) {
             const ResourceEntry* entry = map_.EntryAt(position);
-            entries_.push_back({position, entry->data, 0, file_.IsChanged(*entry)});
+            entries_.push_back({position, file_.IsChanged(*entry), entry->data, 0, 0, 0, nullptr});
         }
         const auto firstChanged =
             std::stable_partition(entries_.begin(), entries_.end(), [](const Entry& entry) { return !entry.changed; });
         unchanged_ = static_cast<size_t>(firstChanged - entries_.begin());
         std::sort(entries_.begin(), firstChanged, [](const Entry& a, const Entry& b) { return a.data < b.data; });
-        return MeasureUnchanged();
-    }
-
-    MgErr MeasureUnchanged() {
-        for (size_t i = 0; i < unchanged_; ++i) {
-            uint32 length = 0;
-            if (const MgErr err = file_.DataLengthAt(*At(entries_[i]), &length)) return err;
-            entries_[i].diskSize = DiskSize(length);
+        for (Entry& entry : entries_) {
+            if (const MgErr err = Measure(&entry)) return err;
         }
         return kNoErr;
     }
 
-    // Marked changed but not in memory: what is on disk counts.
-    MgErr LoadChanged() {
-        for (size_t i = unchanged_; i < entries_.size(); ++i) {
-            if (const MgErr err = EnsureLoaded(entries_[i])) return err;
+    // Of what is marked changed but is not in memory, what is on disk counts.
+    MgErr Measure(Entry* entry) const {
+        const ResourceEntry& reference = *map_.EntryAt(entry->position);
+        const OVResource* loaded = file_.LoadedAt(reference);
+        entry->held = loaded ? loaded->data_.get() : nullptr;
+        if (entry->changed && loaded && !entry->held) return kResNotFoundErr;  // its data were taken away
+        if (!entry->changed || !entry->held) {
+            if (const MgErr err = file_.DataLengthAt(reference, &entry->diskLength)) return err;
         }
+        entry->length = entry->held ? entry->held->GetSize() : entry->diskLength;
         return kNoErr;
     }
 
-    // Passes over what is packed at the front already.
-    void SkipPacked() {
-        while (next_ < unchanged_ && entries_[next_].data == end_) end_ += entries_[next_++].diskSize;
+    // Passes over what is packed at the front already, which stays as it is.
+    void PassPacked() {
+        for (; packed_ < unchanged_ && entries_[packed_].data == packedEnd_; ++packed_) {
+            packedEnd_ += DiskSize(entries_[packed_].diskLength);
+        }
     }
 
-    uint64 SizeToWrite(const Entry& entry) const {
-        const OVResource* loaded = file_.LoadedAt(*At(entry));
-        return loaded && loaded->data_ ? DiskSize(loaded->data_->GetSize()) : entry.diskSize;
+    // Gives all entries from one on their places, end to end.
+    void Lay(size_t from, uint64 start) {
+        first_ = from;
+        start_ = end_ = start;
+        for (size_t i = 0; i < entries_.size(); ++i) {
+            Entry& entry = entries_[i];
+            entry.place = i < from ? entry.data : end_;
+            if (i >= from) end_ += DiskSize(entry.length);
+        }
     }
 
-    // Entries move down, so that each is read before anything is written over it. Where they overlap, or one grew in
-    // memory, that does not hold, and all are loaded first.
-    MgErr LoadEndangered() {
-        uint64 end = end_;
-        bool endangered = false;
-        for (size_t i = next_; i < unchanged_; ++i) {
-            endangered = endangered || end > entries_[i].data;
-            end += SizeToWrite(entries_[i]);
+    // The file's length as laid.
+    uint64 End() const { return kHeaderSize + end_ + (map_.IsEmpty() ? 0 : map_.Size()); }
+
+    // ---- writing ----
+
+    MgErr MakeFrame(Frame* frame) const {
+        const RsrcHeader& header = map_.Head()->header;
+        frame->header = EmptyHeader(header.type, header.creator);
+        frame->map.clear();
+        if (!map_.IsEmpty()) {
+            ResourceMap copy;
+            MgErr err = copy.CopyOf(map_);
+            if (!err)
+                err = Guarded([&] {
+                    frame->map.resize(map_.Size());
+                    return kNoErr;
+                });
+            if (err) {
+                ReportUnlocked(
+                    [] { TESSEL_REPORT(kDebugError, 0x174DB8E3u) << "Could not allocate temp handle storage."; });
+                return err;
+            }
+            SetPlaces(copy);
+            copy.ToDisk(frame->map.data());
+            frame->header = copy.Head()->header;
         }
-        for (size_t i = next_; endangered && i < unchanged_; ++i) {
-            if (const MgErr err = EnsureLoaded(entries_[i])) return err;
-        }
+        SwapHeader(&frame->header);
         return kNoErr;
     }
 
-    MgErr ReserveLength() {
-        uint64 end = kHeaderSize + end_ + map_.Size();
-        for (size_t i = next_; i < entries_.size(); ++i) end += SizeToWrite(entries_[i]);
-        if (end > kLongestFile) return kDiskFullErr;
-        return io_.Reserve(static_cast<uint32>(end));
+    void SetPlaces(ResourceMap& map) const {
+        for (const Entry& entry : entries_) {
+            ResourceEntry* reference = map.EntryAt(entry.position);
+            reference->data = static_cast<uint32>(entry.place);
+            if (entry.changed) reference->attrs &= ~uint32{kRChangedAttr};
+        }
+        map.SetLayout(static_cast<uint32>(end_));
     }
 
-    MgErr EnsureLoaded(const Entry& entry) {
-        ResourceEntry* reference = At(entry);
-        const OVResource* loaded = file_.LoadedAt(*reference);
-        if (loaded && loaded->data_) return kNoErr;
-        if (loaded && entry.changed) return kResNotFoundErr;  // its data were taken away
-        OVResource* made = nullptr;
-        if (const MgErr err = file_.Load(0, reference, &made)) return err;
-        file_.cache_.Empty();
-        if (!loaded) loadedHere_.push_back(entry.position);
+    MgErr PutEntry(const Entry& entry) {
+        const uint32 length = ToBig32(entry.length);
+        MgErr err = output_.Put(&length, 4);
+        if (!err && entry.held)
+            err = output_.Put(entry.held->GetData(), entry.length);
+        else if (!err)
+            err = output_.Copy(io_, file_.DataStart() + entry.data + 4, entry.length);
+        return err ? err : output_.PutZeros(static_cast<uint32>(DiskSize(entry.length) - 4 - entry.length));
+    }
+
+    // The entries as laid, and the map behind them, to where `to` stands.
+    MgErr PutRest(const Frame& frame) {
+        for (size_t i = first_; i < entries_.size(); ++i) {
+            if (const MgErr err = PutEntry(entries_[i])) return err;
+        }
+        if (const MgErr err = output_.Put(frame.map.data(), static_cast<uint32>(frame.map.size()))) return err;
+        return output_.Drain();
+    }
+
+    MgErr WriteImage(OVResfileIO* to) {
+        Frame frame;
+        MgErr err = MakeFrame(&frame);
+        if (!err) err = to->Reserve(static_cast<uint32>(End()));
+        output_.Start(to, 0);
+        if (!err) err = output_.Put(&frame.header, kHeaderSize);
+        if (!err) err = output_.Copy(io_, file_.DataStart(), packedEnd_);
+        return err ? err : PutRest(frame);
+    }
+
+    // What is laid is what the file holds.
+    void Accept() {
+        SetPlaces(map_);
+        for (Entry& entry : entries_) {
+            entry.data = entry.place;
+            OVResource* loaded = file_.LoadedAt(*map_.EntryAt(entry.position));
+            if (loaded && entry.changed) loaded->unwritten_ = false;
+        }
+    }
+
+    // ---- a new image ----
+
+    MgErr InMemory() {
+        UHandle image = DSNewHandle(0);
+        if (!image) return kMemFullErr;
+        OVResfileIO to;
+        to.UseHandle(image, false);
+        MgErr err = Guarded([&] { return WriteImage(&to); });
+        if (!err) err = io_.Assign(*image, static_cast<uint32>(End()));
+        DSDisposeHandle(image);
+        if (!err) Accept();
+        return err;
+    }
+
+    // *inPlace: a new file cannot stand in for this one, or there is no room for it; nothing of it is left.
+    MgErr ReplaceFile(bool* inPlace) {
+        platform::Replacement replacement;
+        if (const MgErr err = io_.BeginReplacement(&replacement, inPlace)) return err;
+        OVResfileIO to;
+        to.UseFile(FileOf(replacement.File()), false);
+        MgErr err = WriteImage(&to);
+        if (!err) err = io_.FinishReplacement(&replacement, inPlace);
+        if (!err || replacement.HasName()) Accept();
+        *inPlace = *inPlace || err == kDiskFullErr;
+        return err;
+    }
+
+    // ---- in place ----
+
+    // The header alone says that there is nothing.
+    MgErr EmptyInPlace() {
+        Frame frame;
+        if (const MgErr err = MakeFrame(&frame)) return err;
+        bool undone = true;
+        if (const MgErr err = io_.SwitchHeader(frame.header, &undone)) return err;
+        Accept();
+        if (!io_.SetSize(kHeaderSize)) io_.Flush();
         return kNoErr;
     }
 
-    MgErr Move(Entry* entry) {
-        if (const MgErr err = EnsureLoaded(*entry)) return err;
-        ResourceEntry* reference = At(*entry);
-        OVResource* resource = file_.LoadedAt(*reference);
-        const ResourceData* data = resource->data_.get();
-        const MgErr err = WriteEntry(io_, file_.DataStart() + end_, data->GetData(), data->GetSize());
-        resource->unwritten_ = err != kNoErr;
-        if (err) {
-            reference->attrs |= kRChangedAttr;
-            return err;
+    MgErr InPlace() {
+        uint64 size = 0;
+        if (const MgErr err = io_.Size(&size)) return err;
+        const uint64 end = End();
+        const uint64 behind = AlignedUp(std::max<uint64>(size, kHeaderSize)) - kHeaderSize;
+        MgErr err = WriteBehind(packed_, std::max(behind, AlignedUp(end) - kHeaderSize), size);
+        if (!err) {
+            Pack();
+            return kNoErr;
         }
-        reference->data = static_cast<uint32>(end_);
-        reference->attrs &= ~uint32{kRChangedAttr};
-        end_ += DiskSize(data->GetSize());
-        RsrcHeader& header = map_.Head()->header;
-        header.dataLength = std::max(header.dataLength, static_cast<uint32>(end_));
+        if (err == kDiskFullErr) err = WriteBehind(unchanged_, behind, size);
+        if (err != kDiskFullErr || end > size) return err;
+        Lay(packed_, packedEnd_);
+        return OnTheSpot(size);
+    }
+
+    // Everything from an entry on, and the map, behind the end, and the header turned over to it.
+    MgErr WriteBehind(size_t from, uint64 start, uint64 oldSize) {
+        Lay(from, start);
+        if (End() > kLongestFile) return kDiskFullErr;
+        Frame frame;
+        if (const MgErr err = MakeFrame(&frame)) return err;
+        MgErr err = io_.Reserve(static_cast<uint32>(End()));
+        if (err) return err;
+        bool undone = true;
+        err = WriteAndSwitch(frame, &undone);
+        if (!err) Accept();
+        if (err && undone) io_.SetSize(static_cast<uint32>(oldSize));
+        return err;
+    }
+
+    MgErr WriteAndSwitch(const Frame& frame, bool* undone) {
+        output_.Start(&io_, kHeaderSize + start_);
+        MgErr err = PutRest(frame);
+        if (!err) err = io_.Flush();
+        return err ? err : io_.SwitchHeader(frame.header, undone);
+    }
+
+    // The update is done; a failure here leaves the file whole and unpacked.
+    void Pack() {
+        Lay(packed_, packedEnd_);
+        Frame frame;
+        bool undone = true;
+        if (MakeFrame(&frame) || WriteAndSwitch(frame, &undone)) return;
+        Accept();
+        if (!io_.SetSize(static_cast<uint32>(End()))) io_.Flush();
+    }
+
+    // ---- on the spot ----
+
+    MgErr OnTheSpot(uint64 size) {
+        Frame frame;
+        if (const MgErr err = MakeFrame(&frame)) return err;
+        const uint64 from = kHeaderSize + packedEnd_;
+        const auto count = static_cast<uint32>(End() - from);
+        Bytes old(count);
+        if (const MgErr err = io_.Read(from, old.data(), count)) return err;
+        UHandle fresh = DSNewHandle(count);
+        if (!fresh) return kMemFullErr;
+        OVResfileIO to;
+        to.UseHandle(fresh, false);
+        output_.Start(&to, 0);
+        MgErr err = PutRest(frame);
+        if (!err) err = OverwriteWith(*fresh, old, from, frame.header);
+        DSDisposeHandle(fresh);
+        if (err) return err;
+        Accept();
+        if (End() < size && !io_.SetSize(static_cast<uint32>(End()))) io_.Flush();
         return kNoErr;
     }
 
-    // What was loaded only to be moved goes again, except what a failed write left in memory alone.
-    void DropLoaded() {
-        for (const uint32 position : loadedHere_) {
-            ResourceEntry* reference = map_.EntryAt(position);
-            if (file_.IsChanged(*reference)) continue;
-            OVResource* resource = file_.LoadedAt(*reference);
-            reference->loaded = 0;
-            file_.Forget(resource);
-            delete resource;
-        }
+    MgErr OverwriteWith(const uint8* fresh, const Bytes& old, uint64 from, const RsrcHeader& header) {
+        const auto count = static_cast<uint32>(old.size());
+        bool undone = true;
+        MgErr err = io_.Write(from, fresh, count);
+        if (!err) err = io_.Flush();
+        if (!err) err = io_.SwitchHeader(header, &undone);
+        if (err && !io_.Write(from, old.data(), count)) io_.Flush();
+        return err;
     }
 
     OVResFile& file_;
     ResourceMap& map_;
     OVResfileIO& io_;
+    ImageOutput output_;
     Entries entries_;
     size_t unchanged_ = 0;  // how many entries come before the changed ones
-    size_t next_ = 0;       // the first entry that is not at its place
-    uint64 end_ = 0;        // where the next entry goes, from the data section start
-    Positions loadedHere_;
+    size_t packed_ = 0;     // how many of those are at their places
+    uint64 packedEnd_ = 0;  // and where they end, from the data section start
+    size_t first_ = 0;      // the first entry that is laid anew,
+    uint64 start_ = 0;      // from here on
+    uint64 end_ = 0;        // and where the last one ends
 };
 
 MgErr OVResFile::RUpdateFile() {
@@ -226,20 +358,11 @@ MgErr OVResFile::RUpdateFile() {
     if (!(map_.Head()->fileAttrs & kRFileChanged)) return kNoErr;
     if (!io_ || !io_->CanWrite()) return kNoErr;
     const MgErr err = Guarded([&] {
-        if (map_.IsEmpty()) return WriteEmpty();
         if (const MgErr rebaseErr = RebaseData()) return rebaseErr;
         return Updating(this).Run();
     });
     if (!err) map_.Head()->fileAttrs &= ~uint32{kRFileChanged};
     return err;
-}
-
-MgErr OVResFile::WriteEmpty() {
-    RsrcHeader header = map_.Head()->header;
-    SwapHeader(&header);
-    if (const MgErr err = io_->Write(0, &header, kHeaderSize)) return err;
-    if (const MgErr err = io_->SetSize(kHeaderSize)) return err;
-    return io_->Flush();
 }
 
 // Counts data offsets from where an update puts the data section. The data stay where they are.
@@ -259,85 +382,6 @@ MgErr OVResFile::RebaseData() {
     header.dataOffset = kHeaderSize;
     header.dataLength += static_cast<uint32>(by);
     return kNoErr;
-}
-
-MgErr OVResFile::UpdateMap(uint64 dataLength) {
-    // The map is converted in a copy: the one in memory keeps its numbers and its loaded resources.
-    Block bytes(map_.Size());
-    if (!bytes.get()) {
-        ReportUnlocked([] { TESSEL_REPORT(kDebugError, 0x174DB8E3u) << "Could not allocate temp handle storage."; });
-        return kMemFullErr;
-    }
-    map_.SetLayout(static_cast<uint32>(dataLength));
-    map_.ToDisk(bytes.get());
-    const RsrcHeader& header = map_.Head()->header;
-    if (const MgErr err = io_->Write(header.mapOffset, bytes.get(), header.mapLength)) return err;
-    if (const MgErr err = io_->SetSize(header.mapOffset + header.mapLength)) return err;
-    if (const MgErr err = io_->Write(0, bytes.get(), kHeaderSize)) return err;
-    return io_->Flush();
-}
-
-// ---- the image of a whole file --------------------------------------------------------------------------------------
-
-MgErr OVResFile::RGetMemFileHandle(UHandle* image) {
-    ResFileLock lock;
-    if (!image) return kArgErr;
-    *image = nullptr;
-    if (!open_) return kNotResFileErr;
-    if (io_ && io_->Handle()) {
-        if (const MgErr err = RUpdateFile()) return err;
-        return RGetUHandleOwnership(image);
-    }
-    return Guarded([&] { return BuildImage(image); });
-}
-
-// What all data take up, which must be loaded.
-MgErr OVResFile::MeasureLoaded(const Positions& positions, uint64* dataLength) const {
-    *dataLength = 0;
-    for (const uint32 position : positions) {
-        const OVResource* loaded = LoadedAt(*map_.EntryAt(position));
-        if (!loaded || !loaded->data_) return kArgErr;
-        *dataLength += DiskSize(loaded->data_->GetSize());
-    }
-    return kNoErr;
-}
-
-// A file made in memory takes on the places that its data have in the image, but its resources stay unwritten: there is
-// nothing to load them from. A file that has a source keeps its own map.
-MgErr OVResFile::BuildImage(UHandle* image) {
-    Positions positions;
-    map_.CollectEntries(&positions);
-    uint64 dataLength = 0;
-    if (const MgErr err = MeasureLoaded(positions, &dataLength)) return err;
-    const uint64 size = kHeaderSize + dataLength + (map_.IsEmpty() ? 0 : map_.Size());
-    if (size > kLongestFile) return kMemFullErr;
-
-    ResourceMap copy;
-    if (io_) {
-        if (const MgErr err = copy.CopyOf(map_)) return err;
-    }
-    *image = DSNewHandle(static_cast<uint32>(size));
-    if (!*image) return kMemFullErr;
-    LayOut(io_ ? &copy : &map_, positions, static_cast<uint32>(dataLength), **image);
-    return kNoErr;
-}
-
-// Writes header, data in the order of the map, and map.
-void OVResFile::LayOut(ResourceMap* map, const Positions& positions, uint32 dataLength, uint8* image) const {
-    uint8* const start = image + kHeaderSize;
-    uint8* to = start;
-    for (const uint32 position : positions) {
-        ResourceEntry* entry = map->EntryAt(position);
-        const ResourceData* data = LoadedAt(*entry)->data_.get();
-        entry->data = static_cast<uint32>(to - start);
-        entry->attrs &= ~uint32{kRChangedAttr};
-        to = PutEntry(to, data->GetData(), data->GetSize());
-    }
-    map->SetLayout(dataLength);
-    if (!map->IsEmpty()) map->ToDisk(to);
-    RsrcHeader header = map->Head()->header;
-    SwapHeader(&header);
-    std::memcpy(image, &header, kHeaderSize);
 }
 
 }  // namespace tessel

@@ -1,7 +1,9 @@
 #include "resources/OVResfileIO.h"
 
-#include "files/FileSupport.h"
+#include "platform/LastError.h"
+#include "platform/Replacement.h"
 #include "resources/ResFileLock.h"
+#include "resources/RsrcFormat.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/files/FileManager.h>
 #include <tessel/memory/MemoryManager.h>
@@ -45,7 +47,9 @@ MgErr OVResfileIO::OpenPath(Path path, bool readOnly, int32 denyMode) {
         view_ = nullptr;
         data_ = nullptr;
     }
-    const MgErr err = FMOpen(&file_, path, readOnly ? kFOpenRead : kFOpenReadWrite, denyMode);
+    const int32 openMode = readOnly ? kFOpenRead : kFOpenReadWrite;
+    MgErr err = readOnly ? kNoErr : request_.Check(path, openMode, denyMode);
+    if (!err) err = FMOpen(&file_, path, openMode, denyMode);
     openedByPath_ = !err;
     return err;
 }
@@ -210,6 +214,58 @@ MgErr OVResfileIO::Extend(uint32 count) {
 
 MgErr OVResfileIO::Flush() {
     return file_ ? FFlush(file_) : kNoErr;
+}
+
+MgErr OVResfileIO::Assign(const void* data, uint32 size) {
+    if (size > length_) {
+        if (const MgErr err = SetSize(size)) return err;
+    }
+    if (size) std::memcpy(*handle_, data, size);
+    return size < length_ ? SetSize(size) : kNoErr;
+}
+
+// ---- replacing ------------------------------------------------------------------------------------------------------
+
+namespace {
+
+// Nothing speaks against writing in place but that the name leads elsewhere, or that what is to be written cannot be.
+MgErr ReplacementErr(const platform::Replacement& replacement, bool* inPlace) {
+    const platform::ReplaceFailure failure = replacement.Failure();
+    const bool moved =
+        failure == platform::ReplaceFailure::kCannotRename && platform::LastError() == platform::kErrorFileNotFound;
+    *inPlace = failure != platform::ReplaceFailure::kCannotFlush && !moved;
+    return Win32ToOVFileErr();
+}
+
+}  // namespace
+
+MgErr OVResfileIO::BeginReplacement(platform::Replacement* replacement, bool* inPlace) {
+    platform::ReplaceRequest request;
+    request.name = request_.Name();
+    request.opened = HandleOf(file_);
+    request.access = request_.Access();
+    request.deny = request_.Denied();
+    return replacement->Begin(request) ? kNoErr : ReplacementErr(*replacement, inPlace);
+}
+
+MgErr OVResfileIO::FinishReplacement(platform::Replacement* replacement, bool* inPlace) {
+    const MgErr err = replacement->Finish() ? kNoErr : ReplacementErr(*replacement, inPlace);
+    if (err && !replacement->HasName()) return err;
+    FMClose(file_);
+    file_ = FileOf(replacement->Release());
+    position_ = kUnknownPosition;
+    aheadLength_ = 0;
+    return err;
+}
+
+MgErr OVResfileIO::SwitchHeader(const RsrcHeader& header, bool* undone) {
+    RsrcHeader old;
+    *undone = true;
+    if (const MgErr err = Read(0, &old, kHeaderSize)) return err;
+    MgErr err = Write(0, &header, kHeaderSize);
+    if (!err) err = Flush();
+    if (err) *undone = !Write(0, &old, kHeaderSize) && !Flush();
+    return err;
 }
 
 MgErr OVResfileIO::Close() {

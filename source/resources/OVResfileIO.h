@@ -2,10 +2,16 @@
 #ifndef TESSEL_SOURCE_RESOURCES_OVRESFILEIO_H
 #define TESSEL_SOURCE_RESOURCES_OVRESFILEIO_H
 
+#include "files/FileSupport.h"
 #include <tessel/base/MgErr.h>
 #include <tessel/memory/TrackedMallocFree.h>
 
 namespace tessel {
+
+namespace platform {
+class Replacement;
+}
+struct RsrcHeader;
 
 // The source of one open file: a file on disk, a handle with a whole file in it, or memory of the caller's. A small
 // read-only file on disk is read as a whole when it is opened, so that resources are used in place; a large one is read
@@ -38,6 +44,21 @@ public:
     // Appends `count` zero bytes. Nothing stays of them on failure.
     MgErr Extend(uint32 count);
     MgErr Flush();
+    // A memory handle gets these bytes. Nothing changes on failure.
+    MgErr Assign(const void* data, uint32 size);
+
+    // Whether a new file may take this one's place, which needs its name.
+    bool CanBeReplaced() const { return openedByPath_ && !readOnly_ && file_; }
+    // Begins a new file for that, with the same access. *inPlace: there cannot be one, but the file may still be
+    // written.
+    MgErr BeginReplacement(platform::Replacement* replacement, bool* inPlace);
+    // Lets it take the name, and goes on with it; the old file is closed.
+    MgErr FinishReplacement(platform::Replacement* replacement, bool* inPlace);
+
+    // Writes and flushes the header at the start, in file order, which lies in one sector. After a failure the old one
+    // is put back and flushed, and *undone says whether that went well; if not, either may be on the device.
+    MgErr SwitchHeader(const RsrcHeader& header, bool* undone);
+
     // Closes what was opened here; disposes of the handle if it is still owned.
     MgErr Close();
 
@@ -64,6 +85,7 @@ private:
     bool readOnly_ = false;
     bool ownsHandle_ = false;
     bool ownsData_ = false;
+    OpenRequest request_;  // of a file opened for writing by path
     File_t* file_ = nullptr;
     void* view_ = nullptr;  // the hook's
     UHandle handle_ = nullptr;

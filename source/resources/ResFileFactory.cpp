@@ -1,5 +1,7 @@
 // Making resource files and chains of them.
 #include "diagnostics/Guarded.h"
+#include "platform/Replacement.h"
+#include "resources/ImageOutput.h"
 #include "resources/OVResChain.h"
 #include "resources/OVResFile.h"
 #include "resources/ResFileLock.h"
@@ -13,6 +15,7 @@
 #include <tessel/resources/ovresfile.h>
 
 #include <cstring>
+#include <limits>
 #include <memory>
 #include <vector>
 
@@ -47,25 +50,81 @@ MgErr ReadMapHead(OVResfileIO& io, const RsrcHeader& header, uint64 base, RsrcMa
     return kNoErr;
 }
 
-MgErr WriteHeader(OVResfileIO& io, uint64 position, RsrcHeader header) {
+// Both headers of a file that is not open, in host order, for another type. Without a map the second says nothing.
+struct Headers {
+    RsrcHeader file, map;
+    bool hasMap() const { return file.mapLength > kHeaderSize; }
+};
+
+RsrcHeader InFileOrder(RsrcHeader header) {
     SwapHeader(&header);
-    return io.Write(position, &header, kHeaderSize);
+    return header;
+}
+
+MgErr ReadHeaders(OVResfileIO& io, Headers* headers) {
+    RsrcMap head;
+    uint64 base = 0;
+    if (const MgErr err = ReadRsrcHeader(io, &headers->file, &base)) return err;
+    if (const MgErr err = ReadMapHead(io, headers->file, base, &head)) return err;
+    headers->map = head.header;
+    return headers->hasMap() && !SanityCheckRsrcMap(headers->map, headers->file) ? kIOErr : kNoErr;
+}
+
+// The map with its new header goes behind the end, with the file's header turned over to it; then to its own place.
+MgErr SetTypeInPlace(OVResfileIO& io, const Headers& headers) {
+    bool undone = true;
+    if (!headers.hasMap()) return io.SwitchHeader(InFileOrder(headers.file), &undone);
+    uint64 size = 0;
+    if (const MgErr err = io.Size(&size)) return err;
+    const uint64 behind = (size + 3) & ~uint64{3};
+    const uint32 mapLength = headers.file.mapLength;
+    if (behind + mapLength > std::numeric_limits<uint32>::max()) return kDiskFullErr;
+    std::vector<uint8, TrackedAllocator<uint8>> map(mapLength);
+    if (const MgErr err = io.Read(headers.file.mapOffset, map.data(), mapLength)) return err;
+    Headers moved = headers;
+    moved.file.mapOffset = moved.map.mapOffset = static_cast<uint32>(behind);
+
+    const auto turnTo = [&](const Headers& to) {
+        const RsrcHeader head = InFileOrder(to.map);
+        std::memcpy(map.data(), &head, kHeaderSize);
+        MgErr err = io.Write(to.file.mapOffset, map.data(), mapLength);
+        if (!err) err = io.Flush();
+        return err ? err : io.SwitchHeader(InFileOrder(to.file), &undone);
+    };
+    const MgErr err = turnTo(moved);
+    // The type is set; if it stays at that, a longer file is left.
+    const bool goesBack = err ? undone : turnTo(headers) == kNoErr;
+    if (goesBack && !io.SetSize(static_cast<uint32>(size))) io.Flush();
+    return err;
+}
+
+MgErr SetTypeInCopy(OVResfileIO& io, const Headers& headers, bool* inPlace) {
+    platform::Replacement replacement;
+    if (const MgErr err = io.BeginReplacement(&replacement, inPlace)) return err;
+    OVResfileIO to;
+    to.UseFile(FileOf(replacement.File()), false);
+    uint64 size = 0;
+    ImageOutput output;
+    output.Start(&to, 0);
+    MgErr err = io.Size(&size);
+    if (!err) err = output.Copy(io, 0, size);
+    if (!err) err = output.Drain();
+    const RsrcHeader file = InFileOrder(headers.file), map = InFileOrder(headers.map);
+    if (!err && headers.hasMap()) err = to.Write(headers.file.mapOffset, &map, kHeaderSize);
+    if (!err) err = to.Write(0, &file, kHeaderSize);
+    if (!err) err = io.FinishReplacement(&replacement, inPlace);
+    *inPlace = *inPlace || err == kDiskFullErr;
+    return err;
 }
 
 MgErr SetTypeIn(OVResfileIO& io, _FMFileType type, _FMFileCreator creator) {
-    RsrcHeader header;
-    RsrcMap head;
-    uint64 base = 0;
-    if (const MgErr err = ReadRsrcHeader(io, &header, &base)) return err;
-    if (const MgErr err = ReadMapHead(io, header, base, &head)) return err;
-    const bool hasMap = header.mapLength > kHeaderSize;
-    if (hasMap && !SanityCheckRsrcMap(head.header, header)) return kIOErr;
-    head.header.type = header.type = type;
-    head.header.creator = header.creator = creator;
-    if (hasMap) {
-        if (const MgErr err = WriteHeader(io, header.mapOffset, head.header)) return err;
-    }
-    return WriteHeader(io, 0, header);
+    Headers headers;
+    if (const MgErr err = ReadHeaders(io, &headers)) return err;
+    headers.map.type = headers.file.type = type;
+    headers.map.creator = headers.file.creator = creator;
+    bool inPlace = false;
+    const MgErr err = SetTypeInCopy(io, headers, &inPlace);
+    return inPlace ? SetTypeInPlace(io, headers) : err;
 }
 
 // The file of the application's own module.
@@ -92,13 +151,12 @@ MgErr ResFileFactory::UninitResourceMgr() {
 }
 
 MgErr ResFileFactory::RCreateFile(Path path, int32 replace, _FMFileCreator creator, _FMFileType type, int32) {
-    File_t* file = nullptr;
-    if (const MgErr err = FGenericCreate(&file, path, 0, kFOpenReadWrite, kFDenyNone, 0, replace ? 1 : 0)) return err;
-    RsrcHeader header = EmptyHeader(type, creator);
-    SwapHeader(&header);
-    const MgErr err = FMWrite(file, kHeaderSize, nullptr, &header);
-    const MgErr closeErr = FMClose(file);
-    return err ? err : closeErr;
+    return Guarded([&] {
+        OpenRequest request;
+        if (const MgErr err = request.Check(path, kFOpenReadWrite, kFDenyNone)) return err;
+        const RsrcHeader header = InFileOrder(EmptyHeader(type, creator));
+        return WriteWholeFile(request, replace != 0, &header, kHeaderSize);
+    });
 }
 
 MgErr ResFileFactory::RGetFileType(Path path, _FMFileType* type, _FMFileCreator* creator) {
@@ -112,9 +170,9 @@ MgErr ResFileFactory::RGetFileType(Path path, _FMFileType* type, _FMFileCreator*
 MgErr ResFileFactory::RSetFileType(Path path, _FMFileType type, _FMFileCreator creator) {
     OVResfileIO io;
     if (const MgErr err = io.OpenPath(path, false, kFDenyWrite)) return err;
-    const MgErr err = SetTypeIn(io, type, creator);
-    const MgErr closeErr = io.Close();
-    return err ? err : closeErr;
+    const MgErr err = Guarded([&] { return SetTypeIn(io, type, creator); });
+    io.Close();  // what was written is flushed
+    return err;
 }
 
 MgErr ResFileFactory::RGetModDate(Path path, uint32* date, int32* readOnly) {

@@ -29,10 +29,11 @@ MgErr SizeHandle(T** handle, uint32 needed, bool exact) {
 
 constexpr size_t kMaxLStr = INT32_MAX - LStrSize(0);  // bytes of the longest text that a handle can hold
 
-// Makes a handle, null or not, an LStr with a text of `count` bytes. New bytes are not set.
-inline MgErr MakeLStr(LStrHandle* handle, size_t count) {
-    if (count > kMaxLStr) return kMemFullErr;
-    if (MgErr err = DSSetHandleSizeOrNewHandle(AsHandlePtr(handle), LStrSize(count))) return err;
+// Makes a handle, null or not, an LStr with a text of `count` bytes, and room for some that do not count behind it. New
+// bytes are not set.
+inline MgErr MakeLStr(LStrHandle* handle, size_t count, size_t behind = 0) {
+    if (count + behind > kMaxLStr) return kMemFullErr;
+    if (MgErr err = DSSetHandleSizeOrNewHandle(AsHandlePtr(handle), LStrSize(count + behind))) return err;
     (**handle)->count = static_cast<int32>(count);
     return kNoErr;
 }

@@ -1,7 +1,7 @@
 // The destinations of printed text: console, debugger, file, and two at once.
 #include "diagnostics/Guarded.h"
 #include "platform/Debugger.h"
-#include "platform/DriveTable.h"
+#include "platform/File.h"
 #include "platform/Mutex.h"
 #include <tessel/diagnostics/FileLoc.h>
 #include <tessel/strings/StringFmtPrint.h>
@@ -17,20 +17,17 @@ namespace tessel {
 namespace {
 
 // The "StringOutputWinConsole" lock. A plain mutex, since an output may be made before the library starts.
-platform::Mutex consoleLock;  // guards the two below
-int32 consoleCount = 0;
-bool consoleIsOurs = false;
+platform::Mutex consoleLock;
+int32 consoleCount TESSEL_GUARDED_BY(consoleLock) = 0;
+bool consoleIsOurs TESSEL_GUARDED_BY(consoleLock) = false;
 
 FILE* Stream(void* stream) {
     return static_cast<FILE*>(stream);
 }
 
-// The file at a location in the host's terms; null when it cannot be opened.
-FILE* OpenStream(CStr name, CStr mode) {
-    return GuardedOr(static_cast<FILE*>(nullptr), [&]() -> FILE* {
-        std::string native;
-        return platform::NameToNative(name, native) ? std::fopen(native.c_str(), mode) : nullptr;
-    });
+// Null when it cannot be opened.
+FILE* OpenStream(CStr name, bool append) {
+    return GuardedOr(static_cast<FILE*>(nullptr), [&] { return platform::FileOpenStream(name, append); });
 }
 
 }  // namespace
@@ -102,7 +99,7 @@ StringOutputFile::~StringOutputFile() {
 void StringOutputFile::Open(OpenMode mode) {
     Close();
     if (!location_) return;
-    FILE* const stream = OpenStream(location_->PathText(), mode == kTruncate ? "w" : "a");
+    FILE* const stream = OpenStream(location_->PathText(), mode != kTruncate);
     if (stream && mode == kAppendAtEnd) std::fseek(stream, 0, SEEK_END);
     stream_ = stream;
 }

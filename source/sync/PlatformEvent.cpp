@@ -26,8 +26,8 @@ public:
     }
 
 private:
-    platform::Mutex mutex_;  // guards the list; nothing is taken inside
-    HostEvent* first_ = nullptr;
+    platform::Mutex mutex_;  // nothing is taken inside
+    HostEvent* first_ TESSEL_GUARDED_BY(mutex_) = nullptr;
 };
 
 namespace {
@@ -76,7 +76,7 @@ PlatformEvent* CreatePlatformEvent(bool signaled) {
 
 MgErr DestroyPlatformEvent(PlatformEvent* event) {
     if (!event) return kNoErr;
-    MgErr err = event->Uninit();
+    const MgErr err = event->Uninit();
     if (auto* own = dynamic_cast<HostEvent*>(event))
         spareEvents.Keep(own);
     else

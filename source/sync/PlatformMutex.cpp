@@ -5,13 +5,14 @@
 namespace tessel {
 namespace {
 
+// Taken and given back by calls of the host's.
 class HostMutex final : public PlatformMutex, public PlainAllocation {
 public:
-    int32 Lock() override {
+    int32 Lock() override TESSEL_LOCKS_UNPROVEN {
         mutex_.Lock();
         return 0;
     }
-    int32 Unlock() override {
+    int32 Unlock() override TESSEL_LOCKS_UNPROVEN {
         mutex_.Unlock();
         return 0;
     }
@@ -34,7 +35,7 @@ PlatformMutex* CreatePlatformMutex() {
 
 MgErr DestroyPlatformMutex(PlatformMutex* mutex) {
     if (!mutex) return kNoErr;
-    MgErr err = mutex->Uninit();
+    const MgErr err = mutex->Uninit();
     delete mutex;
     return err;
 }

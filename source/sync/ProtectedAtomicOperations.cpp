@@ -22,7 +22,7 @@ uint64 CompareExchange(void* address, uint64 expected, uint64 value) {
 
 void CopyInHardware(void* own, void* shared, bool write) {
     if (!write) {
-        uint64 value = CompareExchange(shared, 0, 0);
+        const uint64 value = CompareExchange(shared, 0, 0);
         std::memcpy(own, &value, sizeof value);
         return;
     }
@@ -63,7 +63,7 @@ MgErr ProtectedAtomicOperationsStop() {
 }  // namespace tessel
 
 void Th8ByteAtomicWrtRd(void* own, void* shared, int32 direction, ThMutex mutex) {
-    bool write = direction != 0;
+    const bool write = direction != 0;
     if (tessel::AtomicsInHardware())
         tessel::CopyInHardware(own, shared, write);
     else

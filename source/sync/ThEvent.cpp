@@ -98,7 +98,7 @@ void ThEventDestroy(ThEvent event) {
     if (!IsEvent(event)) return;
     ReportLatency(*event->platformEvent);
     eventTracker.Remove(event);
-    if (MgErr err = DestroyPlatformEvent(event->platformEvent))
+    if (const MgErr err = DestroyPlatformEvent(event->platformEvent))
         TESSEL_REPORT(kDebugError, 0x1F98B35Au) << "DestroyPlatformEvent failed with MgErr " << err << ".";
     event->verifier = 0;
     delete static_cast<EventRecord*>(event);
@@ -153,6 +153,6 @@ MgErr ThEventMessageArrived(uint32 threadId) {
 
 MgErr ThEventWaitAndPump(ThEvent event, ThEventPumpProc pump, int32 milliseconds, void* argument) {
     const bool isEvent = IsEvent(event);
-    MgErr pumped = pump ? pump(argument) : kNoErr;
+    const MgErr pumped = pump ? pump(argument) : kNoErr;
     return isEvent ? event->platformEvent->WaitAndPump(pump, argument, milliseconds) : pumped;
 }

@@ -13,7 +13,7 @@ void ThPause(uint32 count) {
 }
 
 uint32 ThWaitTill(uint32 deadline, uint32 now) {
-    int32 left = MillisecCmp(deadline, now);
+    const int32 left = MillisecCmp(deadline, now);
     if (left < 1) return now;
     ThSleep(static_cast<uint32>(left >= 2 ? left - 1 : left));
     return MilliSecs();

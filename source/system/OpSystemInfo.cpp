@@ -24,17 +24,17 @@ const OpSystemFeatureFlags& OpSystemFeatureFlags::kFirstBit() {
 }
 
 const OpSystemFeatureFlags& OpSystemFeatureFlags::k64Bit() {
-    static const OpSystemFeatureFlags flags(kFirstBit().fFlags << 0);
+    static const OpSystemFeatureFlags flags(kFirstBit().flags_ << 0);
     return flags;
 }
 
 const OpSystemFeatureFlags& OpSystemFeatureFlags::kIsNTOS() {
-    static const OpSystemFeatureFlags flags(kFirstBit().fFlags << 16);
+    static const OpSystemFeatureFlags flags(kFirstBit().flags_ << 16);
     return flags;
 }
 
 OpSystemFeatureFlags OpSystemFeatureFlags::operator&(const OpSystemFeatureFlags& other) const {
-    return OpSystemFeatureFlags(fFlags & other.fFlags);
+    return OpSystemFeatureFlags(flags_ & other.flags_);
 }
 
 OpSystemInfo::~OpSystemInfo() = default;

@@ -13,7 +13,7 @@
 
 namespace tessel {
 
-ThMutex gCreateThread = nullptr;
+LibraryMutex gCreateThread;
 
 namespace {
 
@@ -36,8 +36,8 @@ void SetOwnRecord(ThThread thread) {
 
 // ---- the table ------------------------------------------------------------------------------------------------------
 
-// Puts a record into the first empty entry; under gCreateThread. False when there is none.
-bool EnterIntoTable(ThThread thread) {
+// Puts a record into the first empty entry. False when there is none.
+bool EnterIntoTable(ThThread thread) TESSEL_REQUIRES(gCreateThread) {
     for (int32 i = 0; i < kMaxThThreads; ++i) {
         if (table[i].load(std::memory_order_relaxed)) continue;
         thread->index = i;
@@ -49,7 +49,7 @@ bool EnterIntoTable(ThThread thread) {
 
 // False when it does not stand where it says.
 bool RemoveFromTable(ThThread thread) {
-    ThMutexHolder holder(gCreateThread);
+    LibraryMutexHolder holder(gCreateThread);
     if (thread->index < 0 || thread->index >= kMaxThThreads || table[thread->index] != thread) return false;
     endings[thread->index].fetch_add(1, std::memory_order_relaxed);
     table[thread->index] = nullptr;
@@ -92,7 +92,7 @@ enum class Outcome { kMade, kTableFull, kRefused };
 
 // The place in the table is taken first, so that no thread starts that has none.
 Outcome StartThread(ThThread thread) {
-    ThMutexHolder holder(gCreateThread);
+    LibraryMutexHolder holder(gCreateThread);
     if (!EnterIntoTable(thread)) return Outcome::kTableFull;
     thread->verifier = kThThreadVerifier;
     ThPlatformThread handle = platform::ThreadStart(RunThread, thread, thread->platformId);
@@ -108,7 +108,7 @@ Outcome AdoptCallingThread(ThThread thread) {
     thread->adopted = 1;
     thread->platformId = platform::CurrentThreadId();
     thread->verifier = kThThreadVerifier;
-    ThMutexHolder holder(gCreateThread);
+    LibraryMutexHolder holder(gCreateThread);
     return EnterIntoTable(thread) ? Outcome::kMade : Outcome::kTableFull;
 }
 
@@ -175,15 +175,14 @@ MgErr ThThreadStart(ThreadPriorityReader configured) {
     ClearTable();
     ownRecordKey = ThLocalStorageAllocateKey();
     BuildPriorityTable(configured);
-    MgErr err = ThMutexCreate(&gCreateThread, "gCreateThread");
+    MgErr err = gCreateThread.Create("gCreateThread");
     if (err == kNoErr && ownRecordKey == kThNoLocalStorageKey) err = kMemFullErr;
     if (err != kNoErr) ThThreadStop();
     return err;
 }
 
 MgErr ThThreadStop() {
-    ThMutexDestroy(gCreateThread);
-    gCreateThread = nullptr;
+    gCreateThread.Destroy();
     if (ownRecordKey != kThNoLocalStorageKey) ThLocalStorageFreeKey(ownRecordKey);
     ownRecordKey = kThNoLocalStorageKey;
     ClearTable();
@@ -216,7 +215,7 @@ MgErr ThPseudoThreadCreate(ThThread* thread) {
     if (!thread) return kArgErr;
     *thread = NewRecord();
     if (!*thread) return kMemFullErr;
-    MgErr err = Conclude(AdoptCallingThread(*thread), thread);
+    const MgErr err = Conclude(AdoptCallingThread(*thread), thread);
     if (err == kNoErr) SetOwnRecord(*thread);
     return err;
 }

@@ -1,3 +1,4 @@
+// The levels of priority, what they are on the host, and the procedure that is told of a change.
 #include "platform/LastError.h"
 #include "threads/ThreadTable.h"
 #include <tessel/diagnostics/DebugStream.h>
@@ -46,9 +47,9 @@ struct PriorityChange {
 };
 
 PriorityChange ChangePriority(ThThread thread, int32 level) {
-    ThMutexHolder holder(gCreateThread);
+    LibraryMutexHolder holder(gCreateThread);
     if (!IsThread(thread)) return {};
-    bool set = platform::ThreadSetPriority(HandleOf(thread), priorities[level]);
+    const bool set = platform::ThreadSetPriority(HandleOf(thread), priorities[level]);
     const bool isForbidden = !set && platform::LastError() == platform::kErrorAccessDenied;
     return {true, set, isForbidden, thread->platformThread, thread->platformId};
 }

@@ -3,15 +3,15 @@
 #define TESSEL_SOURCE_THREADS_THREADTABLE_H
 
 #include "platform/Thread.h"
+#include "sync/LibraryMutex.h"
 #include "threads/Service.h"
-#include <tessel/sync/ThMutex.h>
 #include <tessel/threads/ThThread.h>
 
 namespace tessel {
 
 // Guards the thread table, and the change of a thread's priority. Memory may be taken and threads started inside;
-// nothing of the host's runs inside. Null while the service is stopped.
-extern ThMutex gCreateThread;
+// nothing of the host's runs inside. There is none while the service is stopped.
+extern LibraryMutex gCreateThread;
 
 inline bool IsThread(ThThread thread) {
     return thread && thread->verifier == kThThreadVerifier;

@@ -31,7 +31,7 @@ ATime128 Place(uint64 significand, int shift) {
     if (shift < 0) return ATime128(0, significand >> -shift);
     if (shift + kSignificandBits > 127) return Extreme(false);
     if (shift >= 64) return ATime128(static_cast<int64>(significand << (shift - 64)), 0);
-    uint64 seconds = shift == 0 ? 0 : significand >> (64 - shift);
+    const uint64 seconds = shift == 0 ? 0 : significand >> (64 - shift);
     return ATime128(static_cast<int64>(seconds), significand << shift);
 }
 
@@ -39,7 +39,7 @@ ATime128 Place(uint64 significand, int shift) {
 void AddProduct(uint32 (&number)[8], int word, uint32 a, uint32 b) {
     uint64 carry = static_cast<uint64>(a) * b;
     for (; carry != 0 && word < 8; ++word) {
-        uint64 sum = static_cast<uint64>(number[word]) + Low(carry);
+        const uint64 sum = static_cast<uint64>(number[word]) + Low(carry);
         number[word] = Low(sum);
         carry = (carry >> 32) + (sum >> 32);
     }
@@ -48,23 +48,23 @@ void AddProduct(uint32 (&number)[8], int word, uint32 a, uint32 b) {
 }  // namespace
 
 void HiResClock::SetToNow() {
-    fCount = platform::HighResolutionCount();
+    count_ = platform::HighResolutionCount();
 }
 
 double HiResClock::ToSeconds() const {
     static const double kSecondsPerCount = 1.0 / static_cast<double>(platform::HighResolutionFrequency());
-    return static_cast<double>(fCount) * kSecondsPerCount;
+    return static_cast<double>(count_) * kSecondsPerCount;
 }
 
 HiResClock HiResClock::operator+(const HiResClock& other) const {
     HiResClock sum;
-    sum.fCount = fCount + other.fCount;
+    sum.count_ = count_ + other.count_;
     return sum;
 }
 
 HiResClock HiResClock::operator-(const HiResClock& other) const {
     HiResClock difference;
-    difference.fCount = fCount - other.fCount;
+    difference.count_ = count_ - other.count_;
     return difference;
 }
 
@@ -74,8 +74,8 @@ ATime128::ATime128(double seconds) {
     constexpr int kInfinityOrNaN = 2047;
     uint64 bits;
     std::memcpy(&bits, &seconds, sizeof bits);
-    bool negative = (bits >> 63) != 0;
-    int exponent = static_cast<int>((bits >> 52) & kInfinityOrNaN);
+    const bool negative = (bits >> 63) != 0;
+    const int exponent = static_cast<int>((bits >> 52) & kInfinityOrNaN);
     if (exponent == kInfinityOrNaN) {
         *this = Extreme(negative);
         return;
@@ -85,19 +85,19 @@ ATime128::ATime128(double seconds) {
 }
 
 double ATime128::ToDouble() const {
-    if (fSeconds < 0 && *this != Extreme(true)) return -(-*this).ToDouble();
-    uint64 seconds = static_cast<uint64>(fSeconds);  // the smallest value is its own negative: 2^63
+    if (seconds_ < 0 && *this != Extreme(true)) return -(-*this).ToDouble();
+    const uint64 seconds = static_cast<uint64>(seconds_);  // the smallest value is its own negative: 2^63
     double value =
-        Low(fFraction) * kTwoToMinus64 + High(fFraction) / kTwoTo32 + Low(seconds) + High(seconds) * kTwoTo32;
-    return fSeconds < 0 ? -value : value;
+        Low(fraction_) * kTwoToMinus64 + High(fraction_) / kTwoTo32 + Low(seconds) + High(seconds) * kTwoTo32;
+    return seconds_ < 0 ? -value : value;
 }
 
 void ATime128::Get(uint32* secondsHigh, uint32* secondsLow, uint32* fractionHigh, uint32* fractionLow) const {
-    uint64 seconds = static_cast<uint64>(fSeconds);
+    const uint64 seconds = static_cast<uint64>(seconds_);
     if (secondsHigh) *secondsHigh = High(seconds);
     if (secondsLow) *secondsLow = Low(seconds);
-    if (fractionHigh) *fractionHigh = High(fFraction);
-    if (fractionLow) *fractionLow = Low(fFraction);
+    if (fractionHigh) *fractionHigh = High(fraction_);
+    if (fractionLow) *fractionLow = Low(fraction_);
 }
 
 void ATime128::IncrementLSB() {
@@ -105,25 +105,25 @@ void ATime128::IncrementLSB() {
 }
 
 double ATime128::getSeconds() const {
-    return static_cast<double>(fSeconds);
+    return static_cast<double>(seconds_);
 }
 
 double ATime128::getFraction() const {
     // A double holds 53 bits: what would round up to 1 stays below it.
     constexpr double kBelowOne = 1.0 - 0x1p-53;
-    return std::min(static_cast<double>(fFraction) * kTwoToMinus64, kBelowOne);
+    return std::min(static_cast<double>(fraction_) * kTwoToMinus64, kBelowOne);
 }
 
 ATime128 ATime128::operator+(const ATime128& other) const {
-    uint64 fraction = fFraction + other.fFraction;
-    uint64 carry = fraction < fFraction ? 1 : 0;
-    uint64 seconds = static_cast<uint64>(fSeconds) + static_cast<uint64>(other.fSeconds) + carry;
+    const uint64 fraction = fraction_ + other.fraction_;
+    const uint64 carry = fraction < fraction_ ? 1 : 0;
+    const uint64 seconds = static_cast<uint64>(seconds_) + static_cast<uint64>(other.seconds_) + carry;
     return ATime128(static_cast<int64>(seconds), fraction);
 }
 
 ATime128 ATime128::operator-() const {
-    uint64 seconds = ~static_cast<uint64>(fSeconds) + (fFraction == 0 ? 1 : 0);
-    return ATime128(static_cast<int64>(seconds), ~fFraction + 1);
+    const uint64 seconds = ~static_cast<uint64>(seconds_) + (fraction_ == 0 ? 1 : 0);
+    return ATime128(static_cast<int64>(seconds), ~fraction_ + 1);
 }
 
 ATime128 ATime128::operator-(const ATime128& other) const {
@@ -132,19 +132,19 @@ ATime128 ATime128::operator-(const ATime128& other) const {
 
 ATime128 ATime128::operator*(const ATime128& other) const {
     uint32 a[4], b[4], product[8] = {};
-    (fSeconds < 0 ? -*this : *this).Get(&a[3], &a[2], &a[1], &a[0]);
-    (other.fSeconds < 0 ? -other : other).Get(&b[3], &b[2], &b[1], &b[0]);
+    (seconds_ < 0 ? -*this : *this).Get(&a[3], &a[2], &a[1], &a[0]);
+    (other.seconds_ < 0 ? -other : other).Get(&b[3], &b[2], &b[1], &b[0]);
     for (int i = 0; i < 4; ++i)
         for (int j = 0; j < 4; ++j) AddProduct(product, i + j, a[i], b[j]);
     // The middle 128 of the 256 bits, rounded by the bit below.
     ATime128 result(static_cast<int64>((static_cast<uint64>(product[5]) << 32) | product[4]),
                     (static_cast<uint64>(product[3]) << 32) | product[2]);
     if (product[1] & 0x80000000u) result.IncrementLSB();
-    return (fSeconds < 0) != (other.fSeconds < 0) ? -result : result;
+    return (seconds_ < 0) != (other.seconds_ < 0) ? -result : result;
 }
 
 ATime128 ATime128FromHILOTime(const uint32& high, const uint32& low) {
-    uint64 fileTime = (static_cast<uint64>(high) << 32) | low;
+    const uint64 fileTime = (static_cast<uint64>(high) << 32) | low;
     ATime128 sinceEpoch(static_cast<int64>(fileTime - static_cast<uint64>(kEpochOffset)), 0);
     return ATime128(sinceEpoch.ToDouble() / static_cast<double>(kFileTimesPerSecond));
 }
@@ -155,12 +155,12 @@ ATime128 ATime128FromFILETIME(const FILETIME& fileTime) {
 
 FILETIME FILETIMEFromATime128(const ATime128& time) {
     ATime128 fileTime = time * ATime128(kFileTimesPerSecond, 0) + ATime128(kEpochOffset, 0);
-    uint64 count = static_cast<uint64>(fileTime.GetInt64Seconds());
+    const uint64 count = static_cast<uint64>(fileTime.GetInt64Seconds());
     return FILETIME{Low(count), High(count)};
 }
 
 ATime128 GetCurrentATime128() {
-    uint64 now = static_cast<uint64>(platform::SystemFileTime());
+    const uint64 now = static_cast<uint64>(platform::SystemFileTime());
     return ATime128FromHILOTime(High(now), Low(now));
 }
 

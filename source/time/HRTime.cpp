@@ -31,7 +31,7 @@ ClockMode CurrentClockMode() {
     static std::atomic<ClockMode> decided{ClockMode::kUndecided};
     ClockMode mode = decided.load(std::memory_order_relaxed);
     if (mode == ClockMode::kUndecided) {
-        bool processTime = (OSInfo()->GetFeatureFlags() & OpSystemFeatureFlags::kIsNTOS()).IsNonZero();
+        const bool processTime = (OSInfo()->GetFeatureFlags() & OpSystemFeatureFlags::kIsNTOS()).IsNonZero();
         mode = processTime ? ClockMode::kProcessTime : ClockMode::kTick;
         decided.store(mode, std::memory_order_relaxed);
     }
@@ -40,8 +40,8 @@ ClockMode CurrentClockMode() {
 
 _HRTime ExtendTick(std::atomic<uint32>& state, uint32 tick) {
     constexpr uint32 kWraps = 0xFF;
-    uint32 last = state.load(std::memory_order_relaxed);
-    uint32 wraps = (last + (tick < (last & ~kWraps) ? 1 : 0)) & kWraps;
+    const uint32 last = state.load(std::memory_order_relaxed);
+    const uint32 wraps = (last + (tick < (last & ~kWraps) ? 1 : 0)) & kWraps;
     state.store((tick & ~kWraps) | wraps, std::memory_order_relaxed);
     return {wraps, tick};
 }
@@ -57,7 +57,7 @@ double SecondsOf(const _HRTime& t, ClockMode mode) {
 }
 
 _HRTime TimeOf(double seconds, ClockMode mode) {
-    double count = seconds * CountsPerSecond(mode);
+    const double count = seconds * CountsPerSecond(mode);
     // Through 64 bits, so that a negative count wraps as the words of _HRTime do.
     auto word = [](double value) {
         constexpr double kBeyondInt64 = 9223372036854775808.0;
@@ -83,7 +83,7 @@ void HRTimeSubtract(const _HRTime* a, const _HRTime* b, _HRTime* out) {
 }
 
 int32 HRTimeCompare(const _HRTime* a, const _HRTime* b) {
-    uint64 left = Count(*a), right = Count(*b);
+    const uint64 left = Count(*a), right = Count(*b);
     return (left > right) - (left < right);
 }
 

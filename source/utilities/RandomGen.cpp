@@ -1,5 +1,5 @@
 // The random generator of the process, and those with a state of the caller's.
-#include <tessel/sync/ThMutex.h>
+#include "sync/LibraryMutex.h"
 #include <tessel/time/Millisecs.h>
 #include <tessel/utilities/RandomGen.h>
 
@@ -9,8 +9,8 @@ struct Seeds {
     int32 s[3];
 };
 
-ThMutex randomMutex = nullptr;  // guards currentSeeds; nothing is taken inside
-Seeds currentSeeds = {};
+tessel::LibraryMutex randomMutex;  // nothing is taken inside
+Seeds currentSeeds TESSEL_GUARDED_BY(randomMutex) = {};
 
 // 15 bits a step, from a first seed that is not 0.
 Seeds SeedsFrom(int32 first) {
@@ -43,16 +43,15 @@ double Number(const Seeds& seeds) {
 
 }  // namespace
 
-MgErr InitRandomGen() {
+// Alone, as its counterpart: the library starts or stops.
+MgErr InitRandomGen() TESSEL_LOCKS_UNPROVEN {
     constexpr uint32 kMask = 0x3FFF;
     currentSeeds = SeedsFrom(static_cast<int32>(MilliSecs() & kMask));
-    if (randomMutex) return kNoErr;
-    return ThMutexCreate(&randomMutex, "RandomGen");
+    return randomMutex.Create("RandomGen");
 }
 
-MgErr UninitRandomGen() {
-    ThMutexDestroy(randomMutex);
-    randomMutex = nullptr;
+MgErr UninitRandomGen() TESSEL_LOCKS_UNPROVEN {
+    randomMutex.Destroy();
     currentSeeds = {};
     return kNoErr;
 }
@@ -61,7 +60,7 @@ void RandomGen(double* out) {
     if (!out) return;
     Seeds seeds;
     {
-        tessel::ThMutexHolder holder(randomMutex);
+        tessel::LibraryMutexHolder holder(randomMutex);
         seeds = currentSeeds = Next(currentSeeds);
     }
     *out = Number(seeds);

@@ -1,12 +1,29 @@
+<<<<<<< HEAD
+=======
+#include "support/FailingPlatform.h"
+#include "support/ReportRecorder.h"
+>>>>>>> main
 #include "support/ScratchDrive.h"
 #include "support/Test.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/DumpLeakInfo.h>
 #include <tessel/diagnostics/FileLoc.h>
 
+<<<<<<< HEAD
 #include <filesystem>
+=======
+#include <cerrno>
+#include <chrono>
+#include <cstring>
+#include <filesystem>
+#include <gtest/gtest.h>
+#include <memory>
+#include <set>
+>>>>>>> main
 #include <stdlib.h>
 #include <sys/mman.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 namespace tessel::test {
 namespace {
@@ -89,13 +106,61 @@ TEST_F(DumpLeakInfoTest, WithoutAFileTheSummaryStays) {
     DumpLeakInfo(tracker, 0, "Thing Leaks", "no\\such\\folder.txt");
     DumpLeakInfo(tracker, 0, "Thing Leaks", std::string(600, 'n').c_str());
     DumpLeakInfo(tracker, 0, "Thing Leaks", nullptr);
-    EXPECT_EQ(Texts(3, "We got 1 more Thing Leaks than we see from a basic launch and quit.\n"),
-              recorder.Texts(kDebugError));
+    const std::string summary = "We got 1 more Thing Leaks than we see from a basic launch and quit.\n";
+    const std::string nowhere = "There is no place for the report of the Thing Leaks",
+                      folder = "\\no\\such\\folder.txt";
+    const Texts errors = recorder.Texts(kDebugError);
+    ASSERT_EQ(6u, errors.size());
+    EXPECT_TRUE(errors[0].ends_with(folder + ": there is no such folder on the way")) << errors[0];
+    EXPECT_EQ((Texts{summary, nowhere, summary, nowhere, summary}), Texts(errors.begin() + 1, errors.end()));
     EXPECT_EQ(1u, recorder.CountAt(kDebugInfo)) << "the one whose location is good";
-    EXPECT_EQ(1u, recorder.CountAt(kDebugWarning)) << "and which could not be created";
     DumpLeakInfo(tracker, INT32_MIN, "Thing Leaks", nullptr);
     EXPECT_TRUE(
         recorder.Has(kDebugError, "We got 2147483649 more Thing Leaks than we see from a basic launch and quit.\n"));
+}
+
+TEST_F(DumpLeakInfoTest, WhatIsCutShortSaysSo) {
+    tracker->AddRecord(this, 1, std::string(3000, 'f').c_str(), 1);
+    DumpLeakInfo(tracker, 0, "Thing Leaks", "leaks.txt");
+    DumpLeakInfo(tracker, 0, std::string(20000, 'n').c_str(), "leaks.txt");
+    for (const char* call : {"write", "close"}) {
+        test::FailingPlatform failing(call, call[0] == 'w' ? 1 : 2, ENOSPC);  // the old file is closed first
+        DumpLeakInfo(tracker, 0, "Thing Leaks", "leaks.txt");
+    }
+    int cut = 0;
+    for (const std::string& text : recorder.Texts(kDebugError))
+        cut += text.ends_with("\\leaks.txt could not be written whole");
+    EXPECT_EQ(4, cut);
+}
+
+TEST_F(DumpLeakInfoTest, ProgramsAtTheSameTimeKeepTheirReports) {
+    tracker->AddRecord(this, 1, "f.cpp", 1);
+    drive.Put("leaks.txt", "of an earlier program");
+    std::filesystem::last_write_time(drive.Native("leaks.txt"),
+                                     std::filesystem::file_time_type::clock::now() - std::chrono::hours(1));
+    std::set<pid_t> others;
+    for (int i = 0; i < 4; ++i) {
+        const pid_t other = fork();
+        if (other == 0) {
+            DumpLeakInfo(tracker, 0, ("Leaks of " + std::to_string(getpid())).c_str(), "leaks.txt");
+            _exit(0);
+        }
+        others.insert(other);
+    }
+    for (const pid_t other : others) waitpid(other, nullptr, 0);
+    DumpLeakInfo(tracker, 0, ("Leaks of " + std::to_string(getpid())).c_str(), "leaks.txt");
+    DumpLeakInfo(tracker, 0, ("Leaks of " + std::to_string(getpid())).c_str(), "leaks.txt");  // its own, again
+    others.insert(getpid());
+    int usual = 0;
+    for (const auto& entry : std::filesystem::directory_iterator(drive.Native())) {
+        const std::string name = entry.path().filename(), text = drive.Get(name);
+        const pid_t writer = std::stoi(text.substr(text.find("Leaks of ") + 9));
+        EXPECT_TRUE(name == "leaks.txt" || name == "leaks." + std::to_string(writer) + ".txt") << name;
+        usual += name == "leaks.txt";
+        EXPECT_EQ(1u, others.erase(writer)) << name;
+    }
+    EXPECT_EQ(1, usual);
+    EXPECT_TRUE(others.empty());
 }
 
 std::string Failure(int32 code, const char* name, bool addTxt) {

@@ -73,7 +73,7 @@ TEST_F(OccurrenceTest, ReportsNullCallbacksAndDamagedLists) {
     BindOccurHdlr(h, o, Log::Note, Name("h"));
     occh& record = RecordOf(h);
     record.firedNode.refnum = record.occurrenceNode.refnum = 1;
-    gTimedHandlers.Remove(record.timeout);
+    timedHandlers.Remove(record.timeout);
     record.timeout.SetRefnum(1);
     OnOccurrenceWithTimeout(h, false, 1000000);
     Occur(o);
@@ -90,7 +90,7 @@ TEST_F(OccurrenceTest, ReportsNullCallbacksAndDamagedLists) {
     TimeList::Entry nobodys(12345);
     {
         OccurrenceLockHolder timed(gTimedHdlrMutex);
-        gTimedHandlers.Insert(nobodys, MilliSecs(), MilliSecs(), TimeList::Among::kBeforeEquals);
+        timedHandlers.Insert(nobodys, MilliSecs(), MilliSecs(), TimeList::Among::kBeforeEquals);
     }
     OccurAtTime(o, MilliSecs() + 1000000);  // wakes the thread
     Await([&] { return reports.Has(kDebugInfo, "Bad occhandler in timeout list"); });

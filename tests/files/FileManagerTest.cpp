@@ -209,6 +209,8 @@ TEST(Win32ToOVFileErr, MapsTheSystemsErrors) {
         platform::SetLastError(row.number);
         EXPECT_EQ(row.err, Win32ToOVFileErr()) << row.number;
     }
+    EXPECT_STREQ("the device failed", FErrorText(kIOErr));  // the last of them
+    EXPECT_STREQ(MgErrMeaning(kNotFoundErr), FErrorText(kNotFoundErr));
 }
 
 }  // namespace

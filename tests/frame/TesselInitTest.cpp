@@ -70,11 +70,10 @@ TEST_F(TesselInitTest, OutOfTurnNothingHappensAndTheBaseStopsWhatStandsOnIt) {
 
 TEST_F(TesselInitTest, SettingsThatAreNotUnderstoodAreReported) {
     const std::array<const char*, 3> settings[] = {
-        {"OVGuardBytes", "off", "on"},          {"OVGuardBytes_Ptr", "alloc", "Check"},
-        {"OVHandleCheck", "resize", "3"},       {"OV_ALLOC_TRACKER", "", "OFF"},
-        {"OV_USE_MALLOC", "0", "yes"},          {"TESSEL_DRIVES", "C=/;;t=/tmp", "C=/;TT=/tmp"},
-        {"TESSEL_UNC", "/srv", "srv"},          {"TESSEL_CODEPAGE", "cp932", "klingon"},
-        {"TESSEL_REGISTRY", "/tmp", "registry"}};
+        {"OVGuardBytes", "off", "on"},    {"OVGuardBytes_Ptr", "alloc", "Check"},
+        {"OVHandleCheck", "resize", "3"}, {"OV_ALLOC_TRACKER", "", "OFF"},
+        {"OV_USE_MALLOC", "0", "yes"},    {"TESSEL_DRIVES", "C=/;;t=/tmp", "C=/;TT=/tmp"},
+        {"TESSEL_UNC", "/srv", "srv"},    {"TESSEL_CODEPAGE", "cp932", "klingon"}};
     for (const auto& [variable, good, bad] : settings) {
         for (const char* value : {good, bad}) {
             recorder.Clear();

@@ -1,4 +1,5 @@
 #include "memory/GuardBytes.h"
+#include "memory/HandleBlock.h"
 #include "memory/Heap.h"
 #include "memory/MasterPointers.h"
 #include "memory/MemorySettings.h"
@@ -74,6 +75,47 @@ TEST(MemorySettings, ComeFromTheEnvironment) {
 std::vector<std::string> failures;
 void RecordFailure(const void*, int32 kind, const char* version) {
     failures.push_back(std::to_string(kind) + (version ? std::string(" ") + version : ""));
+}
+
+TEST(MemoryStop, EndsWellWhateverAHandleWasOverwrittenWith) {
+    alignas(16) static char writable[64] = {};
+    alignas(16) static const char text[65] = "0123456789abcdef0123456789abcdef0123456789abcdef0123456789abcde";
+    void* const mine = std::malloc(40);
+    for (const char* guards : {"", "check"}) {
+        Environment environment(Variables{{"OVGuardBytes", guards}});
+        test::StartedMemory memory;
+        UHandle const other = DSNewHandle(5000);
+        const uintptr_t contents[] = {0x10,
+                                      8,
+                                      0x7ffff008,
+                                      ~uintptr_t{7},
+                                      ~uintptr_t{1},
+                                      uintptr_t(mine),
+                                      uintptr_t(writable + 24),
+                                      uintptr_t(text + 16),
+                                      uintptr_t(&mine),
+                                      uintptr_t(*other) - 8,
+                                      uintptr_t(*other) + 8};
+        std::vector<void*> lost;
+        for (uintptr_t content : contents) {
+            UHandle const h = DSNewHandle(24);
+            const UPtr data = *h;
+            EXPECT_TRUE(heap::Check()) << content;
+            *h = reinterpret_cast<UPtr>(content);
+            EXPECT_FALSE(heap::Check()) << content;
+            *h = data;
+            lost.push_back(HandleLayout().BlockOf(data));
+        }
+        size_t next = 0;
+        masterPointers.ForEachLeft([&](UHandle h) {
+            if (h != other) *h = reinterpret_cast<UPtr>(contents[next++]);
+        });
+        ASSERT_EQ(std::size(contents), next);
+        memory.Stop();
+        for (void* block : lost) std::free(block);
+        EXPECT_TRUE(memory.reports.Has(kDebugInfo, "Recovered 1 Handles for 5000 bytes.")) << guards;
+    }
+    std::free(mine);
 }
 
 TEST(GuardBytes, ShowWhatWasOverwritten) {

@@ -187,7 +187,7 @@ TEST(FileSystem, CopiesAreWholeOrNotThere) {
                     !FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()), LastError() == kErrorFileExists);
         fs::remove(drive.Native("b"));
     }
-    for (const char* call : {"copy_file_range", "fchmod", "close"}) {
+    for (const char* call : {"copy_file_range", "fchmod", "fsync", "linkat"}) {
         FailingPlatform failing(call, 1, ENOSPC);
         EXPECT_EACH(!FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()), LastError() == kErrorDiskFull);
         EXPECT_FALSE(fs::exists(drive.Native("b"))) << call;

@@ -83,15 +83,6 @@ TEST(File, PositionAndSize) {
                 value == 7, FileSeek(file, std::int64_t{5} << 32, SeekFrom::kStart), FileTell(file, value),
                 (std::int64_t{5} << 32) == value, FileSetSize(file, 4), FileSize(file, value), value == 4,
                 FileFlush(file));
-
-    const void* data = nullptr;
-    std::size_t size = 0;
-    ASSERT_TRUE(FileMap(file, data, size));
-    FileClose(file);
-    EXPECT_EACH(std::string(static_cast<const char*>(data), size) == "0123", FileUnmap(data, size));
-    drive.Put("empty", "");
-    file = Open(drive.Name("empty"), kRead);
-    EXPECT_EACH(!FileMap(file, data, size), LastError() == kErrorFileInvalid);
     FileClose(file);
 }
 

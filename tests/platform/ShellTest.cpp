@@ -1,10 +1,13 @@
 #include "platform/LastError.h"
 #include "platform/Shell.h"
+#include "support/FailingPlatform.h"
 #include "support/ScratchDrive.h"
 #include "support/Test.h"
 
+#include <cerrno>
 #include <filesystem>
 #include <map>
+#include <set>
 #include <sys/stat.h>
 
 namespace tessel::platform {
@@ -65,11 +68,65 @@ TEST_F(Shell, TrashKeepsItemsAndWhereTheyCameFrom) {
     EXPECT_EACH(drive_.Get(trash + "files/A file.txt") == "first",
                 drive_.Get(trash + "files/A file.txt.2") == "second");
     std::string path = drive_.Native() + "/A%20file.txt";
-    EXPECT_THAT(drive_.Get(trash + "info/A file.txt.2.trashinfo"),
-                ::testing::MatchesRegex("\\[Trash Info\\]\nPath=" + path + "\nDeletionDate=....-..-..T..:..:..\n"));
+    EXPECT_THAT(
+        drive_.Get(trash + "info/A file.txt.2.trashinfo"),
+        ::testing::MatchesRegex("\\[Trash Info\\]\nPath=" + path + "\nDeletionDate=....-..-..T..:..:..\nX-Tessel=1\n"));
     fs::create_directories(drive_.Native("folder/sub"));
     EXPECT_EACH(ShellTrash(drive_.Name("folder").c_str()), fs::exists(drive_.Native(trash + "files/folder/sub")),
                 !ShellTrash(drive_.Name("none").c_str()), LastError() == kErrorFileNotFound);
+}
+
+TEST_F(Shell, TrashOfOthersAndWhatTheyLeftThere) {
+    const std::string trash = "home/.local/share/Trash/";
+    fs::create_directories(drive_.Native("elsewhere"));
+    fs::create_directories(drive_.Native("home/.local/share"));
+    fs::create_directory_symlink(drive_.Native("elsewhere"), drive_.Native("home/.local/share/Trash"));
+    drive_.Put("item", "kept");
+    {
+        test::FailingPlatform failing("mkdir", 2, EROFS, 100);  // none elsewhere either
+        EXPECT_EACH(!ShellTrash(drive_.Name("item").c_str()), LastError() == kErrorAccessDenied);
+    }
+    EXPECT_EACH(drive_.Get("item") == "kept", fs::is_empty(drive_.Native("elsewhere")));
+
+    fs::remove(drive_.Native("home/.local/share/Trash"));
+    for (const char* folder : {"files", "info"}) fs::create_directories(drive_.Native(trash + folder));
+    drive_.Put(trash + "info/stray.trashinfo", "[Trash Info]\nPath=/x\nX-Tessel=1\n");
+    drive_.Put(trash + "info/.tessel.trashinfo.new", "half");
+    drive_.Put(trash + "info/theirs.trashinfo", "[Trash Info]\nPath=/x\n");  // another program may be on its way
+    EXPECT_TRUE(ShellTrash(drive_.Name("item").c_str()));
+    std::set<std::string> infos;
+    for (const auto& entry : fs::directory_iterator(drive_.Native(trash + "info")))
+        infos.insert(entry.path().filename());
+    EXPECT_EQ((std::set<std::string>{"item.trashinfo", "theirs.trashinfo"}), infos);
+    drive_.Put(std::string(250, 'n'), "long");
+    EXPECT_TRUE(ShellTrash(drive_.Name(std::string(250, 'n')).c_str()));
+}
+
+// After every failure the item is where it was and nothing is said of it, or both are in the trash.
+TEST_F(Shell, TrashingIsWholeOrNotAtAll) {
+    const std::string trash = "home/.local/share/Trash/";
+    drive_.Put("first", "");
+    ASSERT_TRUE(ShellTrash(drive_.Name("first").c_str()));
+    int failures = 0;
+    for (const char* call : {"open", "openat", "write", "fsync", "renameat2", "statx", "unlink", "flock", "opendir"}) {
+        for (int n = 1, calls = 1; n <= calls; ++n) {
+            SCOPED_TRACE(testing::Message() << call << ' ' << n);
+            drive_.Put("item", "x");
+            bool moved;
+            {
+                test::FailingPlatform failing(call, n, EIO);
+                moved = ShellTrash(drive_.Name("item").c_str());
+                calls = failing.Calls() < n ? 0 : n + 1;
+            }
+            failures += !moved;
+            EXPECT_EACH(moved == !fs::exists(drive_.Native("item")),
+                        moved == fs::exists(drive_.Native(trash + "files/item")),
+                        moved == fs::exists(drive_.Native(trash + "info/item.trashinfo")));
+            fs::remove(drive_.Native(trash + "files/item"));
+            fs::remove(drive_.Native(trash + "info/item.trashinfo"));
+        }
+    }
+    EXPECT_GT(failures, 15);
 }
 
 std::string Bytes(std::uint64_t value, int size) {

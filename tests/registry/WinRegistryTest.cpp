@@ -187,12 +187,11 @@ TEST_F(Registry, DeletingTakesAllThatIsBelow) {
     below.Reset(nullptr);
     ASSERT_EQ(key_->SetSubKeyDefaultValue("A\\1\\x", "value"), kNoErr);
     {
-        test::FailingPlatform failing("unlinkat", 3, EACCES);  // of y, behind a value and x
+        test::FailingPlatform failing("renameat2", 1, EACCES);
         EXPECT_EQ(key_->DeleteSubKey("A"), kRegistryErr);
         EXPECT_EQ(key_->GetLastError(), 5u);
     }
-    EXPECT_FALSE(key_->SubKeyExists("A\\1\\x"));
-    EXPECT_TRUE(key_->SubKeyExists("A\\2"));
+    for (CStr name : {"A\\1\\x", "A\\1\\y", "A\\2"}) EXPECT_TRUE(key_->SubKeyExists(name));
     EXPECT_EQ(key_->DeleteSubKey(Bytes("a")), kNoErr);
     EXPECT_FALSE(key_->SubKeyExists("A"));
     EXPECT_EQ(key_->GetSubKeyCount(), 1);

@@ -1,13 +1,12 @@
 // Updates: what they write, and what is left when they fail or are killed.
-#include "platform/posix/SystemCalls.h"
 #include "resources/ResourceTestSupport.h"
 #include "support/FailingPlatform.h"
 #include <tessel/resources/RFReadWrite.h>
 
 #include <cerrno>
-#include <gmock/gmock.h>
+#include <filesystem>
 #include <map>
-#include <sys/wait.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 namespace tessel::test {
@@ -41,46 +40,50 @@ protected:
         {1, std::string(3000, 'a')}, {2, std::string(700, 'b')}, {3, ""}, {4, std::string(5000, 'd')}, {5, "e"}};
 };
 
-TEST_F(UpdateTest, WritesEntriesUpTo4096BytesAtOnceAndMovesOnlyWhatMustMove) {
-    const RsrcFile file = CreateDisk("f");
-    const struct {
-        uint32 size;
-        int writes;
-    } kTable[] = {{0, 1}, {4088, 1}, {4092, 1}, {4093, 3}, {4096, 2}};
-    for (const auto& row : kTable) {
-        SCOPED_TRACE(row.size);
-        ASSERT_EQ(kNoErr, Add(file, kData, static_cast<int32>(row.size), std::string(row.size, 'x')));
-        const FailingPlatform counting("write", 1000000, EIO);
+// Each way of updating leaves the same bytes: a new file, in place because of a second name, and in memory.
+TEST_F(UpdateTest, TheLayoutIsTheSameWhicheverWayItIsWritten) {
+    std::string images[3];
+    for (int way = 0; way < 3; ++way) {
+        RsrcFile file = FileWithHole(model_);
+        if (way == 1) std::filesystem::create_hard_link(started.drive.Native("f"), started.drive.Native("g"));
+        if (way == 2) {
+            EXPECT_EQ(kNoErr, RSetFileAttrs(file, 0));
+            EXPECT_EQ(kNoErr, RCloseFile(file));
+            file = Open(started.drive.Get("f"));
+            Remove(file, kData, 0);
+        }
+        ASSERT_EQ(kNoErr, Add(file, kData, 9, std::string(70000, 'n'), "name"));
         ASSERT_EQ(kNoErr, RUpdateFile(file));
-        // The entry, the map and the header: what was packed before stays where it is.
-        EXPECT_EQ(row.writes + 2, counting.Calls());
+        UHandle image = nullptr;
+        EXPECT_EQ(kNoErr, way == 2 ? RGetMemFileHandle(file, &image) : kNoErr);
+        images[way] = way == 2 ? BytesOf(image) : started.drive.Get("f");
+        EXPECT_EQ(kNoErr, RCloseFile(file));
+        EXPECT_EQ(kNoErr, image ? DSDisposeHandle(image) : kNoErr);
+        std::filesystem::remove(started.drive.Native("g"));
     }
+    EXPECT_EQ(images[0], images[1]);
+    EXPECT_EQ(images[0], images[2]);
+    // Header, five entries and the new one as long as they are, and the map of six references and one name.
+    EXPECT_EQ(32u + 3004 + 704 + 4 + 5004 + 8 + 70004 + (52 + 4 + 12 + 6 * 20 + 5), images[0].size());
 }
 
-TEST_F(UpdateTest, AFullDiskLosesNothingThatCanBeWrittenLater) {
-    for (int n = 1; n <= 12; ++n) {
-        SCOPED_TRACE(n);
+// With less and less room a removal still works: in place, without moving anything, and on the spot.
+TEST_F(UpdateTest, AFullDiskDoesNotKeepResourcesFromBeingRemoved) {
+    for (const int failures : {1, 2, 3, 1000}) {
+        SCOPED_TRACE(failures);
         const RsrcFile file = FileWithHole(model_);
-        ASSERT_EQ(kNoErr, Add(file, kData, 9, "new"));
-        bool failed = false;
         {
-            const FailingPlatform full("write", n, ENOSPC);
-            const MgErr err = RUpdateFile(file);
-            failed = full.Calls() >= n;
-            EXPECT_EQ(failed ? kDiskFullErr : kNoErr, err);
+            const FailingPlatform full("fallocate", 1, ENOSPC, failures);
+            EXPECT_EQ(kNoErr, RUpdateFile(file));
         }
-        uint32 attrs = 0;
-        EXPECT_EQ(kNoErr, RGetFileAttrs(file, &attrs));
-        EXPECT_EQ(failed ? uint32{kRFileChanged} : 0, attrs);
-        Model expected = model_;
-        expected[9] = "new";
-        EXPECT_EQ(expected, ContentsOf(file));
-        EXPECT_EQ(kNoErr, RUpdateFile(file));
-        EXPECT_EQ(expected, ContentsOf(file));
+        EXPECT_EQ(model_, ContentsOf(file));
         EXPECT_EQ(kNoErr, RCloseFile(file));
-        const RsrcFile again = OpenDisk("f", kROpenReadOnly);
-        EXPECT_EQ(expected, ContentsOf(again));
+        const RsrcFile again = OpenDisk("f");
+        EXPECT_EQ(model_, ContentsOf(again));
+        // What was left unpacked the next update packs.
+        Remove(again, kData, 5);
         EXPECT_EQ(kNoErr, RCloseFile(again));
+        EXPECT_EQ(32u + 3004 + 704 + 4 + 5004 + (52 + 4 + 12 + 4 * 20), started.drive.Get("f").size());
     }
 }
 
@@ -118,40 +121,34 @@ TEST_F(UpdateTest, AnUpdateThatFailsKeepsTheFileOpenUnlessForced) {
     EXPECT_EQ(size + 30000, started.drive.Get("f").size());
 }
 
-// In a child: its n-th write goes half through, and then it is gone.
-int gWritesLeft;
-ssize_t WriteHalfAndDie(int file, const void* data, size_t count) {
-    if (--gWritesLeft > 0) return write(file, data, count);
-    static_cast<void>(!write(file, data, count / 2));
-    _exit(0);
-}
-
-TEST_F(UpdateTest, KilledInMidWriteTheFileOpensOrIsRefused) {
-    for (int n = 1; n <= 9; ++n) {
-        SCOPED_TRACE(n);
-        const pid_t child = fork();
-        if (child == 0) {
-            const RsrcFile file = FileWithHole(model_);
-            gWritesLeft = n;
-            platform::systemCalls.write = WriteHalfAndDie;
-            RUpdateFile(file);
-            _exit(1);
-        }
-        int status = 0;
-        ASSERT_EQ(child, waitpid(child, &status, 0));
-        ASSERT_TRUE(WIFEXITED(status));
-        const bool killed = WEXITSTATUS(status) == 0;
-
-        RsrcFile file = 0;
-        const MgErr err = ROpenFile(started.At("f"), kROpenReadOnly, &file, nullptr, nullptr);
-        if (!killed) {
-            EXPECT_EQ(model_, ContentsOf(file));
-        }
-        EXPECT_THAT(err, testing::AnyOf(kNoErr, kEOFErr, kIOErr, kNotResFileErr));
-        for (int32 id = 0; id <= 5 && !err; ++id) Get(file, kData, id);
-        if (!err) RCloseFile(file);
-        EXPECT_EQ(n > 8, !killed);
+// The file stays what it is to others: mode, the link that leads to it, whom it is denied to. One whose name leads
+// elsewhere is not written behind everybody's back.
+TEST_F(UpdateTest, TheNewFileStandsInForTheOldOne) {
+    ASSERT_EQ(kNoErr, RCloseFile(FileWithHole(model_)));
+    const std::string native = started.drive.Native("f");
+    ASSERT_EQ(0, chmod(native.c_str(), 0604));
+    std::filesystem::create_symlink("f", started.drive.Native("link"));
+    const RsrcFile file = OpenDisk("link");
+    RsrcFile second = 0;
+    for (int32 id = 10; id < 12; ++id) {
+        ASSERT_EQ(kNoErr, Add(file, kData, id, "more"));
+        ASSERT_EQ(kNoErr, RUpdateFile(file));
+        EXPECT_EQ(kFileInUseErr, ROpenFile(started.At("f"), kROpenReadWrite, &second, nullptr, nullptr));
     }
+    struct stat status {};
+    EXPECT_EQ(0, stat(native.c_str(), &status));
+    EXPECT_EQ(0604u, status.st_mode & 07777u);
+    EXPECT_TRUE(std::filesystem::is_symlink(started.drive.Native("link")));
+    std::filesystem::rename(native, started.drive.Native("away"));
+    started.drive.Put("f", "another's");
+    ASSERT_EQ(kNoErr, Add(file, kData, 12, "lost?"));
+    EXPECT_EQ(kNotFoundErr, RUpdateFile(file));
+    EXPECT_EQ("another's", started.drive.Get("f"));
+    std::filesystem::rename(started.drive.Native("away"), native);
+    EXPECT_EQ(kNoErr, RCloseFile(file));
+    const RsrcFile again = OpenDisk("f", kROpenReadOnly);
+    EXPECT_EQ("lost?", Get(again, kData, 12));
+    EXPECT_EQ(kNoErr, RCloseFile(again));
 }
 
 }  // namespace

@@ -2,12 +2,16 @@
 
 #include "platform/posix/SystemCalls.h"
 
+#include <algorithm>
 #include <atomic>
 #include <cerrno>
+#include <climits>
 #include <cstring>
+#include <iterator>
 #include <stdexcept>
 #include <tuple>
 #include <type_traits>
+#include <unistd.h>
 
 namespace tessel::test {
 
@@ -25,6 +29,21 @@ bool IsDue() {
     return number >= first && number <= last;
 }
 
+// Not of files, or without a way to fail.
+bool IsOfFiles(const char* call) {
+    static constexpr const char* kOthers[] = {
+        "clock_gettime", "clock_nanosleep", "futex", "membarrier", "getrandom", "process_vm_readv",
+        "uname",         "getcwd",          "chdir", "pipe2",      "statfs"};
+    return std::none_of(std::begin(kOthers), std::end(kOthers),
+                        [&](const char* other) { return std::strcmp(call, other) == 0; });
+}
+
+template <auto kCall, auto kOther>
+constexpr bool Is() {
+    if constexpr (std::is_same_v<decltype(kCall), decltype(kOther)>) return kCall == kOther;
+    return false;
+}
+
 // Stands in for the member `kCall` of the table.
 template <auto kCall>
 struct Stand;
@@ -33,14 +52,16 @@ template <typename Result, typename... Arguments, Result (*SystemCalls::*kCall)(
 struct Stand<kCall> {
     static Result Call(Arguments... arguments) {
         if (!IsDue()) return (original.*kCall)(arguments...);
+        if (failure == FailingPlatform::kKill) _exit(99);
         if (failure != 0) {
+            // A file is closed whatever the host says.
+            if constexpr (Is<kCall, &SystemCalls::close>() || Is<kCall, &SystemCalls::closedir>())
+                (original.*kCall)(arguments...);
             errno = failure;
             if constexpr (std::is_pointer_v<Result> && !std::is_void_v<std::remove_pointer_t<Result>>) return nullptr;
             return (Result)-1;  // also of mmap: MAP_FAILED
         }
-        if constexpr (std::is_same_v<std::tuple_element_t<sizeof...(Arguments) - 1, std::tuple<Arguments...>>,
-                                     std::size_t> &&
-                      std::is_same_v<Result, ssize_t> && sizeof...(Arguments) == 3) {
+        if constexpr (Is<kCall, &SystemCalls::read>() || Is<kCall, &SystemCalls::write>()) {
             std::tuple<Arguments...> shortened(arguments...);
             std::get<2>(shortened) = 1;
             return std::apply(original.*kCall, shortened);
@@ -55,13 +76,13 @@ FailingPlatform::FailingPlatform(const char* call, int n, int error, int times) 
     original = systemCalls;
     calls = 0;
     first = n;
-    last = n + times - 1;
+    last = times >= kForever ? INT_MAX : n + times - 1;
     failure = error;
     bool known = false;
-#define TESSEL_STAND_IN(result, name, parameters)           \
-    if (std::strcmp(call, #name) == 0) {                    \
-        systemCalls.name = Stand<&SystemCalls::name>::Call; \
-        known = true;                                       \
+#define TESSEL_STAND_IN(result, name, parameters)                                             \
+    if (std::strcmp(call, #name) == 0 || (std::strcmp(call, "*") == 0 && IsOfFiles(#name))) { \
+        systemCalls.name = Stand<&SystemCalls::name>::Call;                                   \
+        known = true;                                                                         \
     }
     TESSEL_SYSTEM_CALLS(TESSEL_STAND_IN)
 #undef TESSEL_STAND_IN

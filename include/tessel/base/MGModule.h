@@ -14,8 +14,11 @@ TESSEL_BEGIN_C
 
 // The application's executable, and this library's own module. 0 until the host sets them. Any thread.
 TESSEL_API void MGModuleSetInstance(MGModuleHandle module);
+// The application's executable; 0 until the host sets it. Any thread.
 TESSEL_API MGModuleHandle MGModuleGetInstance(void);
+// Says which module this library is. Any thread.
 TESSEL_API void MGModuleSetModule(MGModuleHandle module);
+// This library's own module; 0 until the host sets it. Any thread.
 TESSEL_API MGModuleHandle MGModuleGetModule(void);
 
 // The full name of a module's file as the disk spells it, when that fits, else as the system gave it, cut to fit.

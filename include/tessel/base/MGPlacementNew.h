@@ -23,6 +23,7 @@ private:
 template <class T>
 class MGPlacementDelete final : public MGPlacementDeletor {
 public:
+    // Will destroy the object, which must live until then.
     explicit MGPlacementDelete(T* object) : object_(object) {}
     ~MGPlacementDelete() override { object_->~T(); }
 

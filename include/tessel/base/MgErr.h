@@ -6,6 +6,7 @@
 
 #include <tessel/base/Types.h>
 
+// A result code: one of the constants below.
 typedef int32 MgErr;
 
 // X(constant, code, meaning)

@@ -19,11 +19,13 @@ typedef struct cmplx64 {
     float im;
 } cmplx64;
 
+// A complex value of two doubles.
 typedef struct cmplx128 {
     double re;
     double im;
 } cmplx128;
 
+// A complex value of two extended reals.
 typedef struct cmplxExt {
     floatExt re;
     floatExt im;

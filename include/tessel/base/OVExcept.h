@@ -16,16 +16,22 @@ struct CallStack {
     const void* addresses[kCapacity] = {};
 };
 
+// A result code and where it was raised.
 class TESSEL_API OVExcept : public std::exception {
 public:
     // The detail is cut at 127 bytes, of the file name the last 31 are kept; null leaves them empty. Records the call
     // stack. Allocates nothing.
     OVExcept(MgErr code, const char* detail, const char* file, int32 line) noexcept;
 
+    // The result code.
     MgErr Code() const noexcept { return code_; }
+    // The detail, terminated; empty for none.
     const char* Detail() const noexcept { return detail_; }
+    // The source file, terminated; empty for none.
     const char* File() const noexcept { return file_; }
+    // The line in the source file.
     int32 Line() const noexcept { return line_; }
+    // The calls that led to where it was made.
     const CallStack& Stack() const noexcept { return stack_; }
 
     // "OVExcept. Err=<code>, File=<file>, Line=<line>, Detail='<detail>'", cut at 255 bytes. Of a file name of more

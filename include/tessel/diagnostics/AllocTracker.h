@@ -22,6 +22,7 @@ TESSEL_BEGIN_C
 // A new tracker that leaves the 3, or the given number of, innermost calls out of every call stack (the tracker's own
 // are three). The caller owns it. Null when memory runs out. When tracking is off the tracker does nothing.
 TESSEL_API AllocTrackerPtr CreateAllocTracker(void);
+// A new tracker that leaves so many innermost calls out of every call stack; else as CreateAllocTracker.
 TESSEL_API AllocTrackerPtr CreateAllocTrackerSpecifySkip(int32 skip);
 
 // Ends a tracker; its records are gone without a report. Null is ignored.
@@ -61,9 +62,13 @@ public:
 class TESSEL_API MGGenericRegistry {
 public:
     virtual ~MGGenericRegistry() = default;
+    // Leaves what is registered now out of later reports.
     virtual void Mark() = 0;
+    // Takes note of an object.
     virtual void Register(const void* object) = 0;
+    // Forgets an object.
     virtual void Unregister(const void* object) = 0;
+    // How many objects are registered.
     virtual int32 Count() = 0;
 };
 
@@ -75,8 +80,11 @@ public:
     ~AllocTracker() override;
     AllocTracker(const AllocTracker&) = delete;
     AllocTracker& operator=(const AllocTracker&) = delete;
+    // Untracked memory, so that a tracker never tracks itself; null when there is none.
     static void* operator new(size_t size, const std::nothrow_t&) noexcept;
+    // Frees what operator new gave. Null is fine.
     static void operator delete(void* memory) noexcept;
+    // Frees what operator new gave. Null is fine.
     static void operator delete(void* memory, const std::nothrow_t&) noexcept;
 
     // The same as MarkAllReported.
@@ -104,6 +112,7 @@ public:
     // Forgets an object. Nothing happens when it is not recorded.
     virtual void RemoveRecord(const void* address);
 
+    // How many recorded objects live.
     virtual int32 CountLive();
     // Of those living, the ones that MarkAllReported has not seen.
     virtual int32 CountUnreported();
@@ -112,6 +121,7 @@ public:
     virtual void DumpAll(AllocDumper* dumper);
     // Writes one record if it exists and is unreported. Null: a DefaultDumper.
     virtual void DumpOne(const void* address, AllocDumper* dumper);
+    // Whether the object is recorded.
     virtual bool IsTracked(const void* address);
     // Leaves every record made until now out of later counts of unreported records, and out of dumps.
     virtual void MarkAllReported();
@@ -125,6 +135,7 @@ public:
         uint64 mostLive;
         uint64 mostBytesLive;
     };
+    // The figures so far; all 0 for a tracker that was not started.
     Totals GetTotals();
 
     // What lives of the objects made at one line. The file name is the tracker's.

@@ -15,6 +15,7 @@ enum {
     kDebugFatal = 4,    // the default behaviour ends the process with exit status 1
     kNumDebugLevels = 5
 };
+// One of those levels.
 typedef int32 _DebugOutputLevel;
 
 // Takes a report: source file and line of the reporting site, its identifier (the function's name), the level, the
@@ -39,7 +40,9 @@ TESSEL_API void DebugOutputCallHandler(CStr file, int32 line, CStr identifier, i
 // How many reports of a level the default behaviour has taken; 0 for an unknown level. The counters are not exact when
 // several threads report at once.
 TESSEL_API int32 DebugOutputGetNumEvents(int32 level);
+// Sets the counters of all levels to 0.
 TESSEL_API void DebugOutputResetNumEvents(void);
+// Counts one report of a level; nothing for an unknown level.
 TESSEL_API void DebugOutputIncrementEventCount(int32 level);
 
 // Sends a text (null: none) to the debugger channel, and breaks into the debugger when one is attached.

@@ -27,18 +27,25 @@ namespace tessel {
 // library is started and after it is stopped too.
 class TESSEL_API DebugStream {
 public:
+    // An empty text. File and identifier are those of the reporting site, kept by address.
     DebugStream(CStr file, int32 line, CStr identifier, _DebugOutputLevel level) noexcept;
     ~DebugStream() { GiveBack(); }
     DebugStream(const DebugStream&) = delete;
     DebugStream& operator=(const DebugStream&) = delete;
 
+    // The constant of the reporting site; 0 until set.
     void SetSiteCode(uint32 siteCode) noexcept { siteCode_ = siteCode; }
 
+    // Appends one byte.
     void Append(char byte) noexcept { Append(&byte, &byte + 1); }
-    void Append(CStr text) noexcept;                           // null appends nothing
-    void Append(const char* begin, const char* end) noexcept;  // an empty range appends nothing
+    // Appends terminated text; nothing for null.
+    void Append(CStr text) noexcept;
+    // Appends a range of bytes; nothing for an empty one.
+    void Append(const char* begin, const char* end) noexcept;
 
+    // The text so far, terminated; empty after Process.
     CStr Text() const noexcept { return text_ ? text_ : ""; }
+    // Bytes of the text so far.
     size_t Length() const noexcept { return static_cast<size_t>(write_ - text_); }
 
     // Hands the report to DebugOutputCallHandler, then gives the buffer back. Nothing can be appended after it.
@@ -58,8 +65,11 @@ private:
     uint32* inUse_;  // the in-use word of the pool's slot; null for a private buffer
 };
 
+// The byte as it is.
 TESSEL_API void ToDebugStream(DebugStream& stream, char byte);
+// The text; null appends nothing.
 TESSEL_API void ToDebugStream(DebugStream& stream, CStr text);
+// The bytes of the text.
 TESSEL_API void ToDebugStream(DebugStream& stream, std::string_view text);
 // The bytes; null appends nothing.
 TESSEL_API void ToDebugStream(DebugStream& stream, const LStr* text);
@@ -69,23 +79,34 @@ TESSEL_API void ToDebugStream(DebugStream& stream, LStrHandle text);
 TESSEL_API void ToDebugStream(DebugStream& stream, const LStrHandle* text);
 // Decimal, as all integers.
 TESSEL_API void ToDebugStream(DebugStream& stream, short value);
+// Decimal.
 TESSEL_API void ToDebugStream(DebugStream& stream, int value);
+// Decimal.
 TESSEL_API void ToDebugStream(DebugStream& stream, long value);
+// Decimal.
 TESSEL_API void ToDebugStream(DebugStream& stream, long long value);
+// Decimal.
 TESSEL_API void ToDebugStream(DebugStream& stream, unsigned char value);
+// Decimal.
 TESSEL_API void ToDebugStream(DebugStream& stream, unsigned short value);
+// Decimal.
 TESSEL_API void ToDebugStream(DebugStream& stream, unsigned int value);
+// Decimal.
 TESSEL_API void ToDebugStream(DebugStream& stream, unsigned long value);
+// Decimal.
 TESSEL_API void ToDebugStream(DebugStream& stream, unsigned long long value);
 // Six digits after the point.
 TESSEL_API void ToDebugStream(DebugStream& stream, float value);
 // Six digits after the point.
 TESSEL_API void ToDebugStream(DebugStream& stream, double value);
-TESSEL_API void ToDebugStream(DebugStream& stream, const cmplx64& value);   ///< "(re, im)"
-TESSEL_API void ToDebugStream(DebugStream& stream, const cmplx128& value);  ///< "(re, im)"
+// The two parts, "(re, im)".
+TESSEL_API void ToDebugStream(DebugStream& stream, const cmplx64& value);
+// The two parts, "(re, im)".
+TESSEL_API void ToDebugStream(DebugStream& stream, const cmplx128& value);
 // The address, upper-case hexadecimal.
 TESSEL_API void ToDebugStream(DebugStream& stream, void (*function)());
 
+// The address of a function of any type.
 template <class R, class... A>
 void ToDebugStream(DebugStream& stream, R (*function)(A...)) {
     ToDebugStream(stream, reinterpret_cast<void (*)()>(function));
@@ -94,12 +115,14 @@ void ToDebugStream(DebugStream& stream, R (*function)(A...)) {
 // A value with a written form of its own. The helpers below hold their value; texts are kept by address.
 class TESSEL_API DbgFmtToDebugStream {
 public:
+    // Appends the written form of the value.
     virtual void ToDebugStream(DebugStream& stream) const = 0;
 
 protected:
     ~DbgFmtToDebugStream() = default;
 };
 
+// The value in its own written form.
 inline void ToDebugStream(DebugStream& stream, const DbgFmtToDebugStream& value) {
     value.ToDebugStream(stream);
 }
@@ -107,6 +130,7 @@ inline void ToDebugStream(DebugStream& stream, const DbgFmtToDebugStream& value)
 // A CStr as it is. Null writes nothing.
 class TESSEL_API DbgFmtCStr final : public DbgFmtToDebugStream {
 public:
+    // Keeps the address of the text.
     explicit DbgFmtCStr(CStr text) : text_(text) {}
     void ToDebugStream(DebugStream& stream) const override;
 
@@ -117,6 +141,7 @@ private:
 // The bytes of a PStr. Null writes nothing.
 class TESSEL_API DbgFmtPStr final : public DbgFmtToDebugStream {
 public:
+    // Keeps the address of the text.
     explicit DbgFmtPStr(ConstPStr text) : text_(text) {}
     void ToDebugStream(DebugStream& stream) const override;
 
@@ -127,9 +152,13 @@ private:
 // "0x" and at least eight lower-case hexadecimal digits.
 class TESSEL_API DbgFmtPtr final : public DbgFmtToDebugStream {
 public:
+    // The value as an unsigned number of 32 bits.
     explicit DbgFmtPtr(int value) : value_(static_cast<unsigned int>(value)) {}
+    // The value as it is.
     explicit DbgFmtPtr(unsigned int value) : value_(value) {}
+    // The address.
     explicit DbgFmtPtr(const void* value) : value_(reinterpret_cast<uintptr_t>(value)) {}
+    // The address.
     explicit DbgFmtPtr(const volatile void* value) : value_(reinterpret_cast<uintptr_t>(value)) {}
     void ToDebugStream(DebugStream& stream) const override;
 
@@ -140,6 +169,7 @@ private:
 // "0x" and at least eight lower-case hexadecimal digits.
 class TESSEL_API DbgFmtHex final : public DbgFmtToDebugStream {
 public:
+    // The value as it is.
     explicit DbgFmtHex(uint32 value) : value_(value) {}
     void ToDebugStream(DebugStream& stream) const override;
 
@@ -150,9 +180,13 @@ private:
 // The four bytes of a code in memory order, a control character as a space.
 class TESSEL_API DbgFmtQuadChar final : public DbgFmtToDebugStream {
 public:
+    // The code, whatever integer type it comes in.
     explicit DbgFmtQuadChar(int value) : value_(static_cast<uint32>(value)) {}
+    // The code, whatever integer type it comes in.
     explicit DbgFmtQuadChar(unsigned int value) : value_(value) {}
+    // The low 32 bits.
     explicit DbgFmtQuadChar(long value) : value_(static_cast<uint32>(value)) {}
+    // The low 32 bits.
     explicit DbgFmtQuadChar(unsigned long value) : value_(static_cast<uint32>(value)) {}
     void ToDebugStream(DebugStream& stream) const override;
 
@@ -163,7 +197,9 @@ private:
 // "0x" and the identifier of a thread in lower-case hexadecimal digits; the calling thread's by default.
 class TESSEL_API DbgFmtSysThreadID final : public DbgFmtToDebugStream {
 public:
+    // The calling thread.
     DbgFmtSysThreadID();
+    // A thread by the host's identifier.
     explicit DbgFmtSysThreadID(uintptr_t threadID) : threadID_(threadID) {}
     void ToDebugStream(DebugStream& stream) const override;
 
@@ -174,6 +210,7 @@ private:
 // A number already formatted: at most 31 bytes of text, held here.
 class TESSEL_API DbgFmtNum final : public DbgFmtToDebugStream {
 public:
+    // Copies the text; null is empty.
     explicit DbgFmtNum(CStr text) noexcept;
     void ToDebugStream(DebugStream& stream) const override;
 
@@ -188,6 +225,7 @@ class DbgFmtType final : public DbgFmtToDebugStream {
     static_assert(std::is_scalar_v<T>, "a printf conversion takes a number or a pointer");
 
 public:
+    // Formats the value now; keeps neither the value nor the format.
     DbgFmtType(T value, CStr format) {
         if (VerifySingleFormatSpecifier(format))
             std::snprintf(text_, sizeof text_, format, value);
@@ -203,6 +241,7 @@ private:
 // A report that is processed at the end of the statement that makes it.
 class TESSEL_API DebugReport {
 public:
+    // Begins a report of the site.
     DebugReport(CStr file, int32 line, CStr identifier, _DebugOutputLevel level, uint32 siteCode);
     ~DebugReport();
     DebugReport(const DebugReport&) = delete;
@@ -214,6 +253,7 @@ public:
         ToDebugStream(stream_, value);
         return *this;
     }
+    // The text so far, to append to by other means.
     DebugStream& Stream() { return stream_; }
 
 private:

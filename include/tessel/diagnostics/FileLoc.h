@@ -21,6 +21,7 @@ public:
     virtual const char* PathText() const = 0;
 };
 
+// A location in the form of the host's names.
 class TESSEL_API Win32FileLoc final : public FileLoc {
 public:
     // Puts the name into the system's temporary folder for the codes 0, 2 and 4. Raises OVExcept 7 when it does not

@@ -39,7 +39,9 @@ public:
     void RecordFrom(const void* framePointer, const void* returnAddress, int32 skip) override {
         count_ = RecordToBuf(addresses_, N, framePointer, returnAddress, skip);
     }
+    // How many addresses were recorded.
     int32 Count() const { return count_; }
+    // An address by its index from 0, innermost first; not checked.
     const void* At(int32 index) const { return addresses_[index]; }
 
 private:
@@ -50,12 +52,17 @@ private:
 // The name of a code address. "<unknown>" stands for what is not known.
 class TESSEL_API FrameDecoder {
 public:
+    // Looks the address up now; the texts are the object's own.
     explicit FrameDecoder(const void* address);
 
+    // The address as it was given.
     const void* Address() const { return address_; }
+    // The file name of the module that the address lies in.
     const char* Module() const { return module_; }
+    // The function that the address lies in.
     const char* Symbol() const { return symbol_; }
-    uintptr_t Offset() const { return offset_; }  // of the address from the start of the symbol
+    // Bytes from the start of the symbol to the address.
+    uintptr_t Offset() const { return offset_; }
 
     // Module and symbol, "%s %s".
     const char* Name() const { return name_; }

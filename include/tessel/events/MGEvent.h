@@ -11,10 +11,12 @@ namespace tessel {
 // The host implements it. Both run with the lock of the queue held: they must not call the queue.
 class TESSEL_API MGEvent : public MGUnknown {
 public:
+    // What the event is about, in the host's numbering.
     virtual int32 GetKind() = 0;
     // Whether one of the two is enough.
     virtual bool IsEquivalent(MGEvent* other) = 0;
 
+    // The identifier that QueryClass knows this interface by.
     static const OVGuidType& ClassID();
 
 protected:

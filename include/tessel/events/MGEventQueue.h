@@ -37,16 +37,19 @@ public:
     class TESSEL_API KeepExistingEventPolicy final : public DuplicatePostedEventPolicy {
     public:
         int32 Decide(MGEventTarget*, MGEvent*) override { return kKeepQueued; }
+        // The one object of this policy; the library's.
         static KeepExistingEventPolicy& Instance();
     };
 
     // Has a word on the events that their target would have delivered: any MGEventTarget::Decision.
     class TESSEL_API EventFilter {
     public:
+        // What to do with the event now.
         virtual int32 Check(MGEventTarget* target, MGEvent* event) = 0;
         virtual ~EventFilter() = default;
     };
 
+    // Picks events to be dropped; `argument` is the caller's.
     using PurgePredicate = bool (*)(MGEventTarget* target, MGEvent* event, void* argument);
 
     // Starts the queue, its counters at 0. The error of its creation, if there was one.
@@ -58,6 +61,7 @@ public:
 
     // A queue that does not accept events delivers none either. Changes only while it runs; the value as it was.
     virtual bool IsAcceptingEvents() = 0;
+    // Opens or closes the queue to events; nothing while it does not run. The value as it was.
     virtual bool SetAcceptingEvents(bool accepting) = 0;
 
     // Posts an event, whose reference the queue takes over, unless the result says otherwise.
@@ -73,8 +77,10 @@ public:
     // Drops the events that the predicate is true for; how many. 0 while the queue does not run.
     virtual uint32 PurgeEvents(PurgePredicate predicate, void* argument) = 0;
 
+    // How many events wait; 0 while the queue does not run.
     virtual uint32 GetNumEvents() = 0;
-    virtual uint32 GetMaxSize() = 0;  // 0: unbounded
+    // How many events may wait; 0: any number.
+    virtual uint32 GetMaxSize() = 0;
     // Whether some target would have its event delivered.
     virtual bool HasDispatchableEvent() = 0;
 

@@ -14,6 +14,7 @@ public:
     virtual uintptr_t Slot4() { return 0; }
     virtual uintptr_t Slot5() { return 0; }
 
+    // The identifier that QueryClass knows this interface by.
     static const OVGuidType& ClassID();
 
 protected:
@@ -34,6 +35,7 @@ public:
     // afterwards.
     virtual void HandleEvent(MGEvent* event) = 0;
 
+    // The identifier that QueryClass knows this interface by.
     static const OVGuidType& ClassID();
 
 protected:

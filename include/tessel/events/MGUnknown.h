@@ -18,10 +18,12 @@ public:
     virtual void* QueryClass(const OVGuidType& classID) = 0;
     // One reference more, or less: the last one ends the object. What is left, roughly. Any thread.
     virtual uint32 AddRef() = 0;
+    // One reference less; the last one ends the object. What is left, roughly. Any thread.
     virtual uint32 Release() = 0;
     // Appends what tells the object from others.
     virtual void WriteToDebugStream(DebugStream& stream) = 0;
 
+    // The identifier that QueryClass knows this interface by.
     static const OVGuidType& ClassID();
 
 protected:

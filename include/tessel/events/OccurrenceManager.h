@@ -43,11 +43,13 @@ typedef void (*OccThreadGroupProc)(void* argument);
 // on: one exchange of 8 bytes turns a slot that is not claimed into {1, 0, occurrence}. The 16 bytes at the start are
 // not used.
 #define kNumOccurAsyncSlots 1023
+// One slot, 8 bytes, which are exchanged as one.
 typedef struct OccurAsyncSlot {
     uint16 claimed;  // bit 0
     uint16 counted;  // the library's own mark
     Occurrence occurrence;
 } OccurAsyncSlot;
+// The whole area.
 typedef struct OccurAsyncArea {
     uint8 header[16];
     OccurAsyncSlot slots[kNumOccurAsyncSlots];
@@ -85,6 +87,7 @@ TESSEL_API OccurAsyncArea* GetOccurrenceManagerAsyncArea(void);
 // Called, without arguments, by an InterruptSafeOccur that has claimed one of the last ten slots: it is time to check.
 // It must do no more than a signal handler may. Null: none, as it starts.
 typedef void (*ResetCountDownRegCallbackProc)(void);
+// Installs that procedure, for the whole process.
 TESSEL_API void SetResetCountDownRegCallbackProc(ResetCountDownRegCallbackProc procedure);
 
 // Sets the occurrence when MilliSecs() reaches `milliseconds` (0 counts as 1), from a thread of the library's own; a
@@ -100,7 +103,9 @@ TESSEL_API MgErr CancelOccurAtTime(Occurrence occurrence);
 // refnums run out. A plain handler runs once for all that happened since it last ran; a strict one once for each. A
 // thread-safe one belongs to no group: it runs on the thread that sets the occurrence, or on the library's own.
 TESSEL_API OccurHdlr AllocOccurHdlr(Occurrence occurrence, OccurHdlrProc callback, void* argument);
+// The same for a strict handler.
 TESSEL_API OccurHdlr AllocOccurHdlrStrict(Occurrence occurrence, OccurHdlrProc callback, void* argument);
+// The same for a thread-safe handler.
 TESSEL_API OccurHdlr AllocThreadSafeOccurHdlr(Occurrence occurrence, OccurHdlrProc callback, void* argument);
 
 // Binds the handler to another occurrence, of which it has then seen nothing (0, or one that is gone: to none), or
@@ -141,6 +146,7 @@ TESSEL_API MgErr SetOccThreadGroupProc(int32 groupIndex, OccThreadGroupProc proc
 // Runs the fired handlers of the calling thread's group, or of a given one (nothing when it is out of range), those too
 // that are fired meanwhile; sets what InterruptSafeOccur has noted first. Always kNoErr.
 TESSEL_API MgErr ChkOccurrences(void);
+// Runs the fired handlers of a given group, nothing when it is out of range; else as ChkOccurrences.
 TESSEL_API MgErr ChkThGroupOccurrences(int32 group);
 
 // Whether there is anything to run or to set for the group; takes no lock. False when it is out of range.
@@ -148,6 +154,7 @@ TESSEL_API bool QuickCheckGroupHandlersFired(int32 group);
 
 // The group of the main thread: kept for the host, 0 as it starts.
 TESSEL_API void SetOccurrenceManagerMainThreadGroupIndex(int32 group);
+// The group of the main thread, as it was set; 0 at first.
 TESSEL_API int32 GetOccurrenceManagerMainThreadGroupIndex(void);
 
 TESSEL_END_C

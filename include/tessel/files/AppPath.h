@@ -14,6 +14,7 @@ TESSEL_API MgErr FAppCStr(char* buffer, int32 size);
 
 // The application file, and the folder that holds it.
 TESSEL_API MgErr FAppName(Path* path);
+// The folder that holds the application file.
 TESSEL_API MgErr FAppPath(Path* path);
 
 // The folder of the application or, in a run-time engine, of this library.

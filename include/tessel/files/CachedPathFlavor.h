@@ -10,8 +10,10 @@
 
 namespace tessel {
 
+// The key that the item is cached under.
 inline constexpr char kPathFlavorKey[] = "FExists";
 
+// Says whether the item at a path is a file, a folder, or not there.
 class CachedPathFlavor : public PathRef::CachedItem {
 public:
     // Neither a file nor a folder: there is no such item, nor anything below it.
@@ -22,8 +24,11 @@ public:
         return std::strcmp(className, ClassName()) == 0 || CachedItem::IsA(className);
     }
     uint32 Size() const override { return sizeof *this; }
+    // Whether it is a file.
     bool IsFile() const { return isFile_ != 0; }
+    // Whether it is a folder.
     bool IsFolder() const { return isFolder_ != 0; }
+    // The name that IsA and PathRef::GetCachedProxy know the class by.
     static const char* ClassName() { return "CachedPathFlavor"; }
 
 private:

@@ -6,8 +6,12 @@
 // Every path must be absolute; a relative or null one gives kArgErr unless a function says otherwise. The name of an
 // item, drive and folders included, has at most 259 bytes; a longer one gives kArgErr. Shortcuts (.lnk) along a path
 // are followed where they are named with their extension. Failures of the system come back as Win32ToOVFileErr maps
-// them. Functions that change a file drop what the path has cached about it. Any thread; no lock is held except where
-// noted.
+// them: a look at the disk that failed is never "not found", and nothing waits for what is no file (a pipe). Functions
+// that change a file drop what the path has cached about it. Any thread; no lock is held except where noted.
+//
+// Each function that changes the disk says what it promises when the process is killed or the power fails. Atomic: the
+// change is there whole or not at all. Durable: what it reported done is on the device. Neither: what was under way may
+// be there in part, and what was done may be lost, until FFlush.
 #ifndef TESSEL_FILES_FILEMANAGER_H
 #define TESSEL_FILES_FILEMANAGER_H
 
@@ -113,12 +117,14 @@ TESSEL_API MgErr FMClose(File_t* file);
 TESSEL_API MgErr FMRead(File_t* file, uint32 count, uint32* actual, void* buffer);
 
 // Writes `count` bytes. *actual (may be null) receives what was written, also on failure. 0 bytes always succeed.
+// Neither atomic nor durable.
 TESSEL_API MgErr FMWrite(File_t* file, uint32 count, uint32* actual, const void* data);
 
-// Writes a carriage return and a line feed.
+// Writes a carriage return and a line feed. Neither atomic nor durable.
 TESSEL_API MgErr FMWriteEOL(File_t* file);
 
-// Has the system bring what was written to the device.
+// Has the system bring what was written to the device: durable after kNoErr. After a failure what was not there is lost
+// for this file; write it again to another.
 TESSEL_API MgErr FFlush(File_t* file);
 
 // ---- position and size ----------------------------------------------------------------------------------------------
@@ -138,7 +144,8 @@ TESSEL_API MgErr FGetEOF64(File_t* file, uint64* size);
 // The low 32 bits of the size in bytes.
 TESSEL_API MgErr FGetEOF(File_t* file, uint32* size);
 
-// Cuts or extends (with zero bytes) the file. The position stays, unless it would lie beyond the new end.
+// Cuts or extends (with zero bytes) the file. The position stays, unless it would lie beyond the new end. Atomic, not
+// durable.
 TESSEL_API MgErr FSetEOF64(File_t* file, int64 size);
 // Cuts or extends (with zero bytes) the file, as FSetEOF64.
 TESSEL_API MgErr FSetEOF(File_t* file, int32 size);
@@ -149,6 +156,7 @@ TESSEL_API MgErr FLockOrUnlockRange(File_t* file, int32 mode, int32 offset, int3
 // ---- formatted writing ----------------------------------------------------------------------------------------------
 
 // Writes text in the library's own format language (strings/StringFmtPrint.h), and returns the bytes written or -1.
+// Neither atomic nor durable.
 TESSEL_API int32 FPrintf(File_t* file, CStr format, ...);
 
 // The same with a result: kFormatErr for a bad format, kMemFullErr, kGenericErr when the arguments' texts changed
@@ -162,40 +170,65 @@ TESSEL_API MgErr FPrintfWErrv(File_t* file, CStr format, va_list args);
 // The calling thread's last error of the system as a result code. kIOErr for one without a closer code.
 TESSEL_API MgErr Win32ToOVFileErr(void);
 
+// Why the calling thread's last call failed, for people: what the system said, where `err` comes from it, else what the
+// code means (MgErrMeaning). The text is constant.
+TESSEL_API CStr FErrorText(MgErr err);
+
 // ---- creating, copying, moving, removing ----------------------------------------------------------------------------
 
 // Creates a file and opens it. `always` 0: kExistsErr when it exists; else an existing one is replaced by an empty one.
-// The unused arguments are ignored. *file is null on failure.
+// The unused arguments are ignored. *file is null on failure. Atomic, not durable: the file is there or not, empty.
 TESSEL_API MgErr FGenericCreate(File_t** file, Path path, int32 unused1, int32 openMode, int32 denyMode, int32 unused2,
                                 int32 always);
+// Creates a file and opens it. kExistsErr when it exists.
 TESSEL_API MgErr FCreate(File_t** file, Path path, int32 unused1, int32 openMode, int32 denyMode, int32 unused2);
+// Creates a file and opens it; an existing one is replaced by an empty one.
 TESSEL_API MgErr FCreateAlways(File_t** file, Path path, int32 unused1, int32 openMode, int32 denyMode, int32 unused2);
 
-// Copies a file; kExistsErr when `to` exists, kArgErr when `from` is a volume. FCopy follows shortcuts in `from`, the
-// other form only when `resolve` is not 0.
+// Writes a file with these bytes; one that is there is replaced, and keeps permissions, owner, attributes and time of
+// creation. `data` may be null when `size` is 0. kFileInUseErr while someone has it open. Atomic and durable: whenever
+// the process is killed or the power fails, the old file is there or the new one, whole. Neither where the file has
+// several names (hard links), or its folder cannot be written: then it is written in place.
+TESSEL_API MgErr FWriteWholeFile(Path path, const void* data, uint64 size);
+
+// Copies a file: its bytes, permissions and modification date; what takes no room takes none in the copy. kExistsErr
+// when `to` exists in any spelling, also when it comes meanwhile; kArgErr when `from` is a volume; kPermissionErr for
+// what is no file; kIOErr when it ends before its size. FCopy follows shortcuts in `from`, the other form only when
+// `resolve` is not 0. Atomic and durable: the copy appears whole and under its permissions.
 TESSEL_API MgErr FCopy(Path from, Path to);
-// Copies a file; shortcuts in `from` are followed when `resolve` is not 0.
+// Copies a file as FCopy does; shortcuts in `from` are followed when `resolve` is not 0. Atomic and durable.
 TESSEL_API MgErr FCopyResolve(Path from, Path to, int32 resolve);
 
 // Renames or moves a file or folder; `to` must not exist. When the current directory lies inside `from`, the parent of
-// `from` becomes the current directory first. kArgErr for a volume.
+// `from` becomes the current directory first. kArgErr for a volume. Atomic and durable; on a file system that cannot
+// rename without replacing, a file has both names for a moment.
+// To another file system a file is copied, with its owner, permissions, dates and attributes as far as they can be
+// kept, and is on the device there before it goes here: it is always whole in one of the two, for a moment in both.
+// kFileInUseErr, and nothing happens, while someone writes it. A link moves itself; a folder does not move (kIOErr).
+// When at last the old folder cannot be brought to the device, the file has moved all the same, with kIOErr.
 TESSEL_API MgErr FMove(Path from, Path to);
+// As FMove, which follows shortcuts in `from`; this one only when `resolve` is not 0.
 TESSEL_API MgErr FMoveResolve(Path from, Path to, int32 resolve);
 
-// Copies the bytes of `from` into the existing file `to`, which keeps its identity, then removes `from`. The result is
-// that of the copy.
+// Copies the bytes of `from` into the existing file `to`, which keeps its permissions, owner, attributes and time of
+// creation, then removes `from`. The result is that of the copy; a `from` that has been written meanwhile stays, with
+// kFileInUseErr. Atomic and durable: `to` holds the old bytes or the new, and they are on the device before `from`
+// goes. Neither where `to` has several names (hard links), its owner cannot be kept or its folder cannot be written:
+// then its bytes are overwritten, when there is room for all, and a failure leaves a part of them.
 TESSEL_API MgErr FMoveInto(Path from, Path to);
 
-// Deletes a file or an empty folder. Shortcuts are not followed: one is deleted itself.
+// Deletes a file or an empty folder. Shortcuts are not followed: one is deleted itself. Atomic, not durable.
 TESSEL_API MgErr FRemove(Path path);
 
-// Moves a file or folder to the recycle bin; the system may ask the user when `ask` is not 0.
+// Moves a file or folder to the recycle bin; the system may ask the user when `ask` is not 0. kPermissionErr when there
+// is none of this user's own: a bin that is another's, or a link, is not used. Atomic and durable.
 TESSEL_API MgErr FRemoveToRecycle(Path path, int32 ask);
 
-// Creates one folder. kArgErr for an empty or bad name.
+// Creates one folder. kArgErr for an empty or bad name. Atomic, not durable.
 TESSEL_API MgErr FNewDir(Path path, int32 permissions);
 
 // Creates a folder and the parents that are missing. A folder that exists is no error; kGenericErr: it is a file.
+// Neither atomic (a parent may be there without the folder) nor durable.
 TESSEL_API MgErr FNewDirHier(Path path);
 
 // ---- queries and changes --------------------------------------------------------------------------------------------
@@ -211,13 +244,16 @@ TESSEL_API MgErr FGetInfo64(Path path, FInfo64Rec* info, int32 mask);
 // All that is known about an item, shortcuts followed; sizes that do not fit are reported.
 TESSEL_API MgErr FGetInfo(Path path, FInfoRec* info);
 
-// Applies the permissions and both dates of a file. A record of a folder changes nothing.
+// Applies the permissions and both dates of a file. A record of a folder changes nothing. Neither atomic nor durable.
 TESSEL_API MgErr FSetInfo64(Path path, FInfo64Rec* info);
+// As FSetInfo64, from the record with 32-bit sizes.
 TESSEL_API MgErr FSetInfo(Path path, FInfoRec* info);
 
 // Owner and group (always empty) and permissions: 0666, or 0444 read-only, for a file; 0777 or 0555 for a folder. Each
-// output may be null. Setting takes only permissions; with none given it checks that the item exists.
+// output may be null. Setting takes only permissions; with none given it checks that the item exists. Atomic, not
+// durable.
 TESSEL_API MgErr FGetAccessRights(Path path, PStr owner, PStr group, int32* permissions);
+// Sets the permissions; owner and group are not used.
 TESSEL_API MgErr FSetAccessRights(Path path, PStr owner, PStr group, int32* permissions);
 
 // `permissions` without those that the process removes by default. Takes the file manager's mutex.
@@ -226,7 +262,7 @@ TESSEL_API int32 FGetDefPerm(int32 permissions);
 // The default group: an empty string in `group`, or in a new handle that the caller owns when it is null.
 TESSEL_API LStrHandle FGetDefGroup(LStrHandle group);
 
-// Deprecated: clears the read-only attribute of a file.
+// Deprecated: clears the read-only attribute of a file. Atomic, not durable.
 TESSEL_API MgErr FMakeFileNotReadOnly(Path path);
 
 // *isHidden or *isShortcut become 1 or 0. A shortcut is a file whose name ends in ".lnk".
@@ -253,7 +289,9 @@ TESSEL_API MgErr FListDesktop(CPStrHandle names, UHandle kinds);
 
 // Sizes of the volume of a path in bytes. FMGetVolInfo64: each output may be null, all are 0 on failure.
 TESSEL_API MgErr FGetVolInfo(Path path, VolInfoRec* info);
+// Bytes free and in all, and the bytes of a sector; each output may be null, all are 0 on failure.
 TESSEL_API MgErr FMGetVolInfo64(Path path, uint64* freeBytes, uint64* totalBytes, uint32* sectorSize);
+// Bytes in all and free.
 TESSEL_API MgErr FMGetVolInfo(Path path, double* totalBytes, double* freeBytes);
 
 // The path made of the volume alone. *volume is made when it is null.

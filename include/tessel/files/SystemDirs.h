@@ -45,10 +45,15 @@ class TESSEL_API SystemDirs {
 public:
     SystemDirs() = delete;
 
+    // The folder of a kind.
     static PathRef Get(SystemDirType kind, bool create);
+    // The user's home folder.
     static PathRef GetUserHomeDir(bool create);
+    // The user's desktop.
     static PathRef GetUserDesktopDir(bool create);
+    // The user's documents.
     static PathRef GetUserDocumentsDir(bool create);
+    // The folder of the user's application data.
     static PathRef GetUserApplicationDataDir(bool create);
 };
 

@@ -22,10 +22,12 @@ class IServiceObject;
 // Collects the services that one depends on.
 class TESSEL_API IServiceDependencyList {
 public:
+    // Adds a service that must run first. It stays its owner's.
     virtual void AddDependency(IServiceObject* service) = 0;
     virtual ~IServiceDependencyList();
 };
 
+// A part of a program that is started and stopped, and counts who uses it.
 class TESSEL_API IServiceObject {
 public:
     // Takes hold of the service; the first to do so starts it.
@@ -63,7 +65,9 @@ public:
         return err;
     }
 
+    // How many hold the service.
     int32 UseCount() const { return useCount_; }
+    // What the start returned; kGenericErr before.
     MgErr Status() const { return status_; }
 
 protected:
@@ -80,10 +84,12 @@ private:
 // A list of at most 1024 services.
 class TESSEL_API ServiceDependencyList final : public IServiceDependencyList {
 public:
+    // An empty list. Raises std::bad_alloc when memory runs out.
     ServiceDependencyList();
 
     // Refuses null (level-2 report) and a 1025th service (level 4). Throws std::bad_alloc when memory runs out.
     void AddDependency(IServiceObject* service) override;
+    // How many services it holds.
     int32 GetCount() const { return static_cast<int32>(services_.size()); }
     // Null, with a level-4 report, beyond the count.
     IServiceObject* GetAt(int32 index) const;
@@ -110,6 +116,7 @@ public:
     virtual MgErr AddService(IServiceObject* service) = 0;
     // 1 for null and for a service that is not registered; 42 while services are started.
     virtual MgErr RemoveService(IServiceObject* service) = 0;
+    // Whether the service is registered here.
     virtual bool HasService(IServiceObject* service) = 0;
     virtual ~IServiceRegistry();
 };

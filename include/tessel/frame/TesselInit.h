@@ -16,6 +16,8 @@ TESSEL_API MgErr InitTesselBase(void);
 TESSEL_API MgErr UninitTesselBase(void);
 
 // Starts configuration, threads and resources. Does nothing before InitTesselBase, and when they are started. Always 0.
+// When the setting "LoadHeapDebugger" (Bool) is true, the library "HeapDebugger.dll" is loaded before the threads
+// start, searched for as the host system does; nothing is said when it is not found.
 TESSEL_API MgErr InitTesselAppSupport(void);
 
 // Stops them. Does nothing when they are not started. Always 0.

@@ -12,7 +12,9 @@
 #include <tessel/base/MgErr.h>
 #include <tessel/base/Types.h>
 
+// A refnum of a record; 0 is never one.
 typedef uint32 MagicCookie;
+// A jar for the flat functions.
 typedef UHandle MagicCookieJar;
 
 TESSEL_BEGIN_C
@@ -52,8 +54,8 @@ TESSEL_API MgErr MCGetCookieList(MagicCookieJar jar, UHandle* list);
 // False for a null jar.
 TESSEL_API bool MCIsACookie(MagicCookieJar jar, MagicCookie cookie);
 
-// The first live cookie, by slot index, whose record has the bytes of `info`; 0 when there is none, and for
-// a null argument.
+// The first live cookie, by slot index, whose record has the bytes of `info`; 0 when there is none, and for a null
+// argument.
 TESSEL_API MagicCookie MCGetCookieForInfo(MagicCookieJar jar, const void* info);
 
 TESSEL_END_C
@@ -71,6 +73,7 @@ public:
     CookieList(const CookieList&) = delete;
     CookieList& operator=(const CookieList&) = delete;
 
+    // How many cookies the list holds.
     int32 GetCount() const { return count_; }
     // 0 when i is out of range.
     MagicCookie GetCookie(int32 i) const;
@@ -96,14 +99,22 @@ public:
 
     // kMemFullErr when the jar cannot be made.
     MgErr Init(uint32 infoSize, int32 rightsMode);
+    // Disposes of the jar, if there is one.
     MgErr Uninit();
 
+    // A new cookie for a copy of the record at `info`; as MCNewCookie.
     MagicCookie NewCookie(const void* info);
+    // Ends a cookie, its record to infoOut unless that is null; as MCDisposeCookie.
     MgErr DisposeCookie(const MagicCookie& cookie, void* infoOut);
+    // Replaces the record of a cookie; as MCSetCookieInfo.
     MgErr SetCookieInfo(const MagicCookie& cookie, const void* info);
+    // Copies the record of a cookie out; as MCGetCookieInfo.
     MgErr GetCookieInfo(const MagicCookie& cookie, void* infoOut);
+    // Whether it is a live cookie of the jar.
     bool IsACookie(const MagicCookie& cookie);
+    // Fills the list with the live cookies, by slot index. kArgErr for a null list.
     MgErr GetCookieList(CookieList* list);
+    // The first live cookie with these bytes as its record; 0: none.
     MagicCookie GetCookieForInfo(const void* info);
 
     // Raises the count, to 1,048,575 at most, and copies the record out: 1. A cookie that has ended, a count that can
@@ -113,7 +124,9 @@ public:
     // Lowers the count and returns what it was: 1 when the cookie has ended now. 0: nothing to release.
     int32 ReleaseCookieRights(const MagicCookie& cookie);
 
+    // Whether there is a jar: between Init and Uninit.
     bool IsAValidJar() const { return jar_ != nullptr; }
+    // *count = cookies alive; as MCJarSize.
     MgErr GetNumCookies(int32* count);
 
 private:
@@ -126,14 +139,21 @@ class CookieJar : public BaseCookieJar {
     static_assert(sizeof(T) == sizeof(void*), "a CookieJar keeps pointers; use BaseCookieJar for other records");
 
 public:
+    // Makes the jar. kMemFullErr when it cannot be made.
     MgErr Init(int32 rightsMode = 0) { return BaseCookieJar::Init(sizeof(T), rightsMode); }
+    // A new cookie for the pointer; 0 on failure.
     MagicCookie NewCookie(T info) { return BaseCookieJar::NewCookie(&info); }
+    // Ends a cookie; its pointer goes to *infoOut unless that is null.
     MgErr DisposeCookie(const MagicCookie& cookie, T* infoOut = nullptr) {
         return BaseCookieJar::DisposeCookie(cookie, infoOut);
     }
+    // Replaces the pointer of a cookie.
     MgErr SetCookieInfo(const MagicCookie& cookie, T info) { return BaseCookieJar::SetCookieInfo(cookie, &info); }
+    // *infoOut = the pointer of a cookie.
     MgErr GetCookieInfo(const MagicCookie& cookie, T* infoOut) { return BaseCookieJar::GetCookieInfo(cookie, infoOut); }
+    // The first live cookie of the pointer; 0: none.
     MagicCookie GetCookieForInfo(T info) { return BaseCookieJar::GetCookieForInfo(&info); }
+    // Raises the count of a cookie, its pointer to *infoOut, which is null when that fails.
     int32 AcquireCookieRights(const MagicCookie& cookie, T* infoOut) {
         if (infoOut) *infoOut = nullptr;
         return BaseCookieJar::AcquireCookieRights(cookie, infoOut);

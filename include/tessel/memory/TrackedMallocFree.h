@@ -39,15 +39,25 @@ TESSEL_API void* TrackedNewNoThrow(size_t size) noexcept;
 // Base of classes whose objects are tracked when made with new.
 class TrackedObject {
 public:
+    // Tracked; raises std::bad_alloc when there is no memory.
     static void* operator new(size_t size) { return TrackedNew(size); }
+    // Tracked; null when there is no memory.
     static void* operator new(size_t size, const std::nothrow_t&) noexcept { return TrackedNewNoThrow(size); }
+    // In memory of the caller's: not tracked.
     static void* operator new(size_t, void* place) noexcept { return place; }
+    // Tracked; raises std::bad_alloc when there is no memory.
     static void* operator new[](size_t size) { return TrackedNew(size); }
+    // Tracked; null when there is no memory.
     static void* operator new[](size_t size, const std::nothrow_t&) noexcept { return TrackedNewNoThrow(size); }
+    // Frees an object. Null is fine.
     static void operator delete(void* address) noexcept { TrackedFree(address); }
+    // What a constructor that raises leaves behind.
     static void operator delete(void* address, const std::nothrow_t&) noexcept { TrackedFree(address); }
+    // Nothing: the memory is the caller's.
     static void operator delete(void*, void*) noexcept {}
+    // Frees an array. Null is fine.
     static void operator delete[](void* address) noexcept { TrackedFree(address); }
+    // What a constructor that raises leaves behind.
     static void operator delete[](void* address, const std::nothrow_t&) noexcept { TrackedFree(address); }
 };
 
@@ -58,18 +68,23 @@ struct TrackedAllocator {
     using value_type = T;
 
     TrackedAllocator() noexcept = default;
+    // All are alike: what one gives, any other takes back.
     template <class U>
     TrackedAllocator(const TrackedAllocator<U>&) noexcept {}
 
+    // Room for so many objects; raises std::bad_alloc when there is no memory.
     T* allocate(size_t count) {
         if (count > size_t(-1) / sizeof(T)) return static_cast<T*>(TrackedNew(size_t(-1)));
         return static_cast<T*>(TrackedNew(count * sizeof(T)));
     }
+    // Gives the room back.
     void deallocate(T* address, size_t) noexcept { TrackedFree(address); }
+    // True: all are alike.
     template <class U>
     bool operator==(const TrackedAllocator<U>&) const noexcept {
         return true;
     }
+    // False: all are alike.
     template <class U>
     bool operator!=(const TrackedAllocator<U>&) const noexcept {
         return false;

@@ -4,9 +4,9 @@
 // The rule for rounding, which all numeric functions follow:
 //
 // 1. A real that becomes an integer - by Float64To..., RndToNearest..., FPStoreInt... and FPStoreUInt...,
-// FloatExtTo..., FPRToNum, ConvertNum, RTfRound and RTcRound - goes to the nearest one, halves to the even neighbour,
-// whatever direction the host rounds in. Only ceiling, floor and RndToInc (halves away from zero) are named after
-// another.
+//    FloatExtTo..., FPRToNum, ConvertNum, RTfRound and RTcRound - goes to the nearest one, halves to the even
+//    neighbour, whatever direction the host rounds in. Only ceiling, floor and RndToInc (halves away from zero) are
+//    named after another.
 // 2. A real result is rounded once, in the direction in force in the calling thread (fesetround; FPInit sets the
 //    nearest, halves to even): sums, products, quotients, square roots, UInt64ToFloat64, and a value stored into a
 //    narrower real by FPStoreFlt32, FPStoreFlt64, FPRToNum or ConvertNum. The other mathematical functions are made

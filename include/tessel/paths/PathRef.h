@@ -36,6 +36,7 @@ class InputBuf;
 class OutputBuf;
 class PathItemElement;
 
+// A location in the file system.
 class TESSEL_API PathRef {
 public:
     typedef std::string StringType;
@@ -78,18 +79,27 @@ public:
 
     // ---- construction and assignment --------------------------------------------------------------------------------
 
-    PathRef() noexcept = default;  // not a path
+    // Not a path.
+    PathRef() noexcept = default;
+    // The path without names on a base.
     explicit PathRef(PathBase base);
-    explicit PathRef(const PathRef* other);  // null gives not-a-path
+    // A copy; null gives not-a-path.
+    explicit PathRef(const PathRef* other);
+    // A copy: the same names, which are shared.
     PathRef(const PathRef& other) noexcept;
+    // Takes the path over; the other becomes not-a-path.
     PathRef(PathRef&& other) noexcept;
+    // Becomes a copy.
     PathRef& operator=(const PathRef& other);
+    // Becomes a copy; null gives not-a-path.
     PathRef& operator=(const PathRef* other);
+    // Takes the path over; the other becomes not-a-path.
     PathRef& operator=(PathRef&& other) noexcept;
     ~PathRef();
 
     // The location registered under the name, and registering this path under one (kArgErr when the name is taken).
     explicit PathRef(const char* standardLocationName);
+    // Registers this path under a name. kArgErr when the name is taken.
     MgErr AssignToName(const char* name) const;
 
     // Reads text in a format (the String... names below). Raises 53 for an unknown format, which it names, 1 for text
@@ -102,31 +112,48 @@ public:
 
     // Copies into *path, which is made when it is null. DisposePath destroys and sets to null.
     MgErr ConvertToPath(Path* path) const;
+    // Destroys the path, if there is one, and sets it to null.
     static void DisposePath(Path& path);
 
+    // The one that is not a path; the library's.
     static const PathRef& NotAPath();
 
     // A PathRef on the heap is registered as a path object until it is deleted; see UnInit.
     static void* operator new(size_t size);
+    // The same; null when there is no memory.
     static void* operator new(size_t size, const std::nothrow_t&) noexcept;
+    // In memory of the caller's: not registered.
     static void* operator new(size_t, void* place) noexcept { return place; }
+    // Deletes a path object. Null is fine.
     static void operator delete(void* address) noexcept;
+    // What a constructor that raises leaves behind.
     static void operator delete(void* address, const std::nothrow_t&) noexcept;
+    // Nothing: the memory is the caller's.
     static void operator delete(void*, void*) noexcept {}
 
     // ---- names ------------------------------------------------------------------------------------------------------
     // Index 0 is the first name; a negative index counts from the end, -1 being the last name.
 
+    // Number of names.
     int32 ItemCount() const;
-    const StringType& ItemAt(int32 index) const;  // good as long as this path
+    // A name; good as long as this path.
+    const StringType& ItemAt(int32 index) const;
+    // Copies a name. kArgErr for an index out of range or no output.
     MgErr CopyItemAt(int32 index, StringType* name) const;
-    const StringType& Name();  // the last name, in the text cache; empty when there is none
+    // The last name, in the text cache; empty when there is none.
+    const StringType& Name();
 
+    // Appends a name.
     PathRef& Append(const StringType& name);
+    // Appends a name.
     PathRef& Append(const char* name);
-    PathRef& Append(const PathRef& relativePath);  // each of its up-directory elements removes a name
+    // Appends the names of a relative path; each of its up-directory elements removes a name.
+    PathRef& Append(const PathRef& relativePath);
+    // Removes the last name, or adds an up-directory element.
     PathRef& AppendUpDir();
+    // Puts another name in the place of one.
     void Replace(int32 index, const StringType& name);
+    // Puts another name in the place of one.
     void Replace(int32 index, const char* name);
 
     // Appends prefix, a random number, suffix and (unless empty) "." and the extension, such that no such item exists.
@@ -134,21 +161,35 @@ public:
 
     // ---- extensions: what follows the last "." of the last name -----------------------------------------------------
 
+    // The extension of the last name, without the dot; empty for none.
     StringType GetExtension() const;
-    const StringType& Extension();  // in the text cache
+    // The same, in the text cache.
+    const StringType& Extension();
+    // The same into *extension. kArgErr without an output.
     MgErr CopyExtension(StringType* extension) const;
-    void AppendExtension(const StringType& extension);  // the dot is added
+    // Appends an extension; the dot is added.
+    void AppendExtension(const StringType& extension);
+    // Appends the extension that is listed for a file type.
     void AppendExtension(_FMFileType type);
+    // Takes the extension and its dot off.
     void RemoveExtension();
 
+    // The extension of a name, without the dot; empty for none.
     static StringType NameGetExtension(const StringType& name);
+    // Takes the extension and its dot off.
     static void NameRemoveExtension(StringType* name);
+    // Appends a dot and the extension. kArgErr for null.
     static MgErr NameAppendExtension(StringType* name, const StringType& extension);
-    static MgErr NameAppendExtension(StringType* name, _FMFileType type);  // kArgErr: no extension is listed
-    static _FMFileType NameGetExtensionType(const StringType& name);       // 0: none is listed
+    // Appends the extension of a file type. kArgErr: none is listed.
+    static MgErr NameAppendExtension(StringType* name, _FMFileType type);
+    // The file type of the extension; 0: none is listed.
+    static _FMFileType NameGetExtensionType(const StringType& name);
+    // Whether the name has the extension of the file type.
     static bool NameHasExtension(const StringType& name, _FMFileType type);
+    // Whether the names are equal under the policy.
     static bool NameEquals(const StringType& a, const StringType& b, ComparePolicy policy);
-    static int32 NameCompare(const StringType& a, const StringType& b, ComparePolicy policy);  // -1, 0 or 1
+    // The order of the names under the policy: -1, 0 or 1.
+    static int32 NameCompare(const StringType& a, const StringType& b, ComparePolicy policy);
 
     // "?" one character, "*" and "**" any run without and with "\", "." a dot or the end. Ignores case.
     static bool NameWildCardMatch(const StringType& name, const StringType& pattern);
@@ -158,13 +199,21 @@ public:
 
     // ---- relations --------------------------------------------------------------------------------------------------
 
-    PathRef GetParentDirectory() const;  // not-a-path when there are no names
-    PathRef Volume() const;              // the base and the first name
+    // The path without its last name; not-a-path when there are no names.
+    PathRef GetParentDirectory() const;
+    // The base and the first name.
+    PathRef Volume() const;
+    // Whether the path is on that base.
     bool StartsWith(PathBase base) const;
+    // Whether the other path is a leading part of this one.
     bool StartsWith(const PathRef& start, ComparePolicy policy) const;
+    // Whether the other path lies somewhere below this one.
     bool IsParentDirectoryOf(const PathRef& other, ComparePolicy policy) const;
+    // Number of up-directory elements.
     int32 CountUpDir() const;
-    PathRef GetInCommonWith(const PathRef& other, ComparePolicy policy) const;  // the longest common leading part
+    // The longest common leading part.
+    PathRef GetInCommonWith(const PathRef& other, ComparePolicy policy) const;
+    // The relative path that leads from here to there.
     PathRef GetRelativePathFromThisToThat(const PathRef& that, ComparePolicy policy) const;
 
     // When this path starts with `from`, puts `to` in the place of that part. Up-directory elements that follow it
@@ -176,27 +225,39 @@ public:
 
     // ---- comparison and checks --------------------------------------------------------------------------------------
 
+    // Whether the two lead the same way under the policy.
     bool Equals(const PathRef& other, ComparePolicy policy) const;
 
     // 0 when equal. On one base with names on both sides, the magnitude is one more than the number of leading names in
     // common, negative when this path sorts first.
     int32 Compare(const PathRef& other, ComparePolicy policy) const;
 
-    bool IsValid() const;           // on a known base; a UNC path has a server
-    bool IsSane(bool quick) const;  // not quick: every element is checked, and what is wrong reported
+    // On a known base; a UNC path has a server.
+    bool IsValid() const;
+    // Whether it holds together. Not quick: every element is checked, and what is wrong reported.
+    bool IsSane(bool quick) const;
 
     // ---- text: the formats are the names returned here --------------------------------------------------------------
 
-    static const char* StringDisplay();              // C:\dir\file, for people
-    static const char* StringCommandLine();          // the same; not for a path without names
-    static const char* StringDOS();                  // C:\dir\file
-    static const char* StringUnix();                 // /C/dir/file
-    static const char* StringPlatformIndependent();  // /C/dir/file, reads and writes UNC paths
-    static const char* StringPlatformAgnostic();     // written as before; read by guessing the kind of text
+    // C:\dir\file, for people.
+    static const char* StringDisplay();
+    // The same; not for a path without names.
+    static const char* StringCommandLine();
+    // C:\dir\file.
+    static const char* StringDOS();
+    // /C/dir/file.
+    static const char* StringUnix();
+    // /C/dir/file, reads and writes UNC paths.
+    static const char* StringPlatformIndependent();
+    // Written as before; read by guessing the kind of text.
+    static const char* StringPlatformAgnostic();
 
-    MgErr ConvertToString(StringType* out, const char* format) const;  // 53: unknown format
-    const StringType& ToString(const char* format);                    // in the text cache
+    // The text in a format, into *out. 53: unknown format.
+    MgErr ConvertToString(StringType* out, const char* format) const;
+    // The text in a format, in the text cache.
+    const StringType& ToString(const char* format);
 
+    // A short text for each path, by a style and a measure (paths/PathAbbreviation.h).
     static MgErr ToAbbreviatedDisplayStrings(const std::list<PathRef>& paths, std::vector<StringType>* out,
                                              const AbbreviationStyle& style, const MeasurementStyle& measure);
 
@@ -204,29 +265,47 @@ public:
 
     // Writes "PTH0" or "PTH1". *size (may be null) receives the bytes. A null buffer only measures.
     MgErr Flatten(OutputBuf* buffer, FlattenFormat format, uint32* size, const Endianizer* endianizer) const;
+    // Bytes of the flattened form.
     uint32 FlattenedSize(FlattenFormat format) const;
 
     // ---- file system ------------------------------------------------------------------------------------------------
 
+    // Whether there is such an item.
     bool Exists() const;
+    // Whether it is a folder.
     bool IsADirectory() const;
+    // Whether it is a file.
     bool IsAFile() const;
-    uint64 Size(SizeType type) const;   // bytes of a file
-    uint64 DirectoryItemCount() const;  // entries of a folder
-    double VolumeSize() const;          // bytes
+    // Bytes of a file.
+    uint64 Size(SizeType type) const;
+    // Entries of a folder.
+    uint64 DirectoryItemCount() const;
+    // Bytes of the volume in all.
+    double VolumeSize() const;
+    // Bytes of the volume that are free.
     double VolumeFree() const;
-    int32 DisconnectVolume() const;   // 0: there is nothing to do
-    uint32 ModificationDate() const;  // seconds since 1904-01-01 UTC
+    // 0: there is nothing to do.
+    int32 DisconnectVolume() const;
+    // Seconds since 1904-01-01 UTC.
+    uint32 ModificationDate() const;
+    // Whether it is a shortcut: a file named *.lnk.
     bool IsAShortcut() const;
-    bool IsSpecial() const;  // false
+    // False.
+    bool IsSpecial() const;
+    // Follows the shortcuts on the way, that of the last name only when asked for all.
     void ResolveShortcuts(ResolveMethod method);
+    // The path with the names under which the system lists them.
     PathRef GetLongNames() const;
     // Each name as the disk has it; remembered for so long. Raises 1 for a path of more than 259 bytes, or with a name
     // that no file can have.
     PathRef GetCorrectedCase(double seconds) const;
+    // Clears the read-only attribute. kUnsupportedErr for kItemAndContents.
     MgErr MakeWriteable(WriteableDepth depth) const;
+    // Deletes the file or empty folder; with kResolveShortcuts what a shortcut stands for, and the shortcut.
     MgErr RemoveFile(ResolveAction action);
+    // Copies the file, or what it is a shortcut to.
     MgErr CopyFileTo(const PathRef& to, ResolveAction action) const;
+    // Moves the file, or what it is a shortcut to.
     MgErr MoveFileTo(const PathRef& to, ResolveAction action) const;
 
     // ---- cached attributes ------------------------------------------------------------------------------------------
@@ -241,7 +320,8 @@ public:
     CachedItem* GetCachedProxy(const char* key, const char* className, SearchDirection direction,
                                PathItemElement** foundAt = nullptr) const;
 
-    uint32 FlushCache() const;  // drops what depends on the file, and what has expired; bytes released
+    // Drops what depends on the file, and what has expired; returns the bytes released.
+    uint32 FlushCache() const;
 
     // Guards the cached items and the tree of names. A thread that takes this mutex itself must not use paths until it
     // has released it; the lock below lets it.
@@ -249,6 +329,7 @@ public:
 
     class TESSEL_API CacheLock {
     public:
+        // Takes the lock; a thread may hold several.
         CacheLock();
         ~CacheLock();
         CacheLock(const CacheLock&) = delete;
@@ -257,6 +338,7 @@ public:
 
     // ---- process-wide -----------------------------------------------------------------------------------------------
 
+    // Makes paths usable; the start of the library calls it. Raises OVExcept when memory runs out.
     static void Init();
     // Reports the path objects that are left ("ovpathleaks.txt" in the temporary folder).
     static void UnInit();
@@ -264,16 +346,21 @@ public:
     // "debug", "nodebug": whether assignments keep the display text for a debugger to show. "utf8", "sysenc": whether
     // every path is flattened as "PTH1", or only one that needs it. Others do nothing.
     static void Setting(const char* setting);
+    // Whether assignments keep the display text ("debug").
     static bool& DebugModeEnabled();
 
     // Gives unused storage of names back. Returns the bytes.
     static uint32 GarbageCollect(OptimizationMethod method);
-    static uint32 MemorySize();  // bytes of a path object; the shared names are not counted
+    // Bytes of a path object; the shared names are not counted.
+    static uint32 MemorySize();
 
     // What stands for a not-a-path in text, and for a path whose text is too long. Empty until set. For start-up.
     static const StringType& GetNotAPathString();
+    // Sets the text for a not-a-path. For start-up.
     static void SetNotAPathString(const StringType& text);
+    // What stands for a path whose text is too long.
     static const StringType& GetPathTooLongString();
+    // Sets the text for a path whose own is too long. For start-up.
     static void SetPathTooLongString(const StringType& text);
 
 private:
@@ -305,6 +392,7 @@ public:
 
 // Display text; "NULL" for a null pointer, "<path too long>" when the text cannot be made.
 TESSEL_API void ToDebugStream(DebugStream& stream, const PathRef& path);
+// The same for a pointer, which may be null.
 TESSEL_API void ToDebugStream(DebugStream& stream, PathRef* path);
 
 }  // namespace tessel

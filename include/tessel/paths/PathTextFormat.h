@@ -30,8 +30,11 @@ TESSEL_BEGIN_C
 // as a relative path of that one name, which no file can have. Names of this host go through NativeToPath, text of
 // unknown kind through PathRef with StringPlatformAgnostic.
 TESSEL_API MgErr FTextToPath(const char* text, int32 length, Path* path);
+// Reads the display text in a string handle; else as FTextToPath.
 TESSEL_API MgErr FStringToPath(LStrHandle text, Path* path);
+// Reads the display text in a string handle; else as FTextToPath.
 TESSEL_API MgErr FFileSystemStringToPath(LStrHandle text, Path* path);
+// Reads terminated display text; else as FTextToPath. Null is reported: kArgErr.
 TESSEL_API MgErr FFileSystemCStrToPath(CStr text, Path* path);
 
 // ---- writing --------------------------------------------------------------------------------------------------------
@@ -42,7 +45,9 @@ TESSEL_API MgErr FPathToText(Path path, LStrPtr text);
 // Text into *text, a string handle that is made when it is null and belongs to the caller. A zero byte follows the text
 // in the first three. A null path gives the not-a-path text in the first two, and kArgErr in the third.
 TESSEL_API MgErr FPathToDSString(Path path, LStrHandle* text);
+// Display text and a zero byte into *text. A null path gives the not-a-path text.
 TESSEL_API MgErr FPathToAZString(Path path, LStrHandle* text);
+// Display text and a zero byte into *text. kArgErr for a null path.
 TESSEL_API MgErr FPathToFileSystemDSString(Path path, LStrHandle* text);
 // /C/dir/file; a zero byte follows.
 TESSEL_API MgErr FPathToUnixString(Path path, LStrHandle* text);
@@ -52,7 +57,9 @@ TESSEL_API MgErr FPathToStringRTF(Path path, LStrHandle* text);
 // Display text as a terminated string: in a new handle (null on failure), or in a new pointer block of 264 bytes
 // (kMemFullErr when it is longer than 260). The caller disposes of it.
 TESSEL_API UHandle PathToCString(Path path);
+// The same; the second argument is not used.
 TESSEL_API UHandle PathToCStringEx(Path path, int32 unused);
+// Display text in a new pointer block of 264 bytes. kMemFullErr when it is longer than 260.
 TESSEL_API MgErr FPathToMaxCString(Path path, UPtr* text);
 
 // kNotFoundErr, always.
@@ -60,6 +67,7 @@ TESSEL_API MgErr FPathToURL(Path path, LStrHandle* text);
 
 // The form that is the same on every host: /C/dir/file. Null text reads as the empty path.
 TESSEL_API MgErr ConvertPathToPlatformIndependentText(Path path, LStrHandle* text);
+// Reads the form that is the same on every host; null reads as the empty path.
 TESSEL_API MgErr ConvertPlatformIndependentTextToPath(Path* path, CStr text);
 
 // ---- names for the system -------------------------------------------------------------------------------------------
@@ -81,6 +89,7 @@ TESSEL_API bool FStrFitsPat(const char* pattern, const char* name, int32 pattern
 
 // Moves *position on to the next "*", "?" or extra character ("`" in the second form) before `end`. False: none.
 TESSEL_API bool FMFindWildCardMatchCh(const char* text, int32* position, int32 end, char extra);
+// Moves *position on to the next "*", "?" or "`" before `end`. False: none.
 TESSEL_API bool FFindMatchCh(const char* text, int32* position, int32 end);
 
 TESSEL_END_C

@@ -56,7 +56,8 @@ TESSEL_BEGIN_C
 // type and creator of the file. Results: kNotResFileErr not a resource file, kEOFErr too short for one, kVersionErr
 // newer than version 3, kIOErr damaged, kMemFullErr, or those of opening the file.
 
-// Creates an empty resource file on disk. kExistsErr when it exists and `replace` is 0.
+// Creates an empty resource file on disk. kExistsErr when it exists and `replace` is 0. Atomic and durable: at no
+// moment is there an unfinished file under the name, and a failed or interrupted replacement leaves the old one.
 TESSEL_API MgErr RCreateFile(Path path, int32 replace, _FMFileCreator creator, _FMFileType type, int32 unused);
 
 // Opens a file on disk. Read-only also finds a resource file behind a host file, by its trailer: the last 4 bytes,
@@ -81,15 +82,28 @@ TESSEL_API MgErr ROpenAppResFile(Path path, int32 mode, RsrcFile* refnum);
 // A new empty file in memory; RGetMemFileHandle gives its image.
 TESSEL_API MgErr RCreateMemFile(RsrcFile* refnum, _FMFileCreator creator, _FMFileType type);
 
-// Writes pending changes and closes. When that fails the file stays open. (A chain: RDestroyChain.)
+// Writes pending changes, as RUpdateFile does, and closes. When that fails the file stays open. (A chain:
+// RDestroyChain.)
 TESSEL_API MgErr RCloseFile(RsrcFile refnum);
 
-// The same, but when the changes cannot be written they are given up, and the file on disk stays as the try left it:
-// untouched when the disk is too full for the whole update, else in part rewritten. The result is that of the try.
+// The same, but when the changes cannot be written they are given up, and the file on disk stays as it was. The result
+// is that of the try.
 TESSEL_API MgErr RCloseFileForce(RsrcFile refnum);
 
-// (file) Writes pending changes and packs the file. On failure they stay pending, and the next update tries again.
-// kDiskFullErr before anything is overwritten when there is no room for the whole update.
+// (file) Writes pending changes and packs the file. On failure they stay pending, the file on disk is as it was, and
+// the next update tries again; kDiskFullErr when there is no room, kNotFoundErr when the file was moved away or removed
+// while it was open.
+//
+// Atomic and durable: whenever the process is killed or the power fails, the next open, a read-only one too, finds the
+// old file or the new one, whole; after kNoErr the new one. A new file takes the place of the old one. It keeps
+// permissions, owner, attributes, time of creation and what others are denied; a link goes on leading to it. A file
+// that has several names, whose folder cannot be written, whose owner cannot be kept, or that was opened by reference
+// is written in place, just as safely where the 32 bytes of its header are written whole or not at all, as devices do;
+// it needs room for what moves once more, for a while.
+//
+// On a full disk changes are written where there is room for them alone, and what is removed just goes; the file stays
+// longer than it has to be until an update has more room. When there is not even room for a new map, an update that
+// makes the file no longer overwrites it: only then a kill or a power loss in that moment may leave a damaged file.
 TESSEL_API MgErr RUpdateFile(RsrcFile refnum);
 
 // (file) Takes back the handle given to ROpenUHandle; it must outlive the file, which goes on using it. kGenericErr:
@@ -101,11 +115,14 @@ TESSEL_API MgErr RGetUHandleOwnership(RsrcFile refnum, UHandle* image);
 // they cannot be released or detached.
 TESSEL_API MgErr RGetMemFileHandle(RsrcFile refnum, UHandle* image);
 
-// (file) Grows the file by `size` bytes ahead of writing.
+// (file) Grows the file by `size` bytes ahead of writing. Neither atomic nor durable for the room; what the file holds
+// is not touched.
 TESSEL_API MgErr RPreAllocFile(RsrcFile refnum, uint32 size);
 
-// Type and creator of a file that is not open; RGetFileType takes null outputs.
+// Type and creator of a file that is not open; RGetFileType takes null outputs. RSetFileType is atomic and durable in
+// the same way as RUpdateFile.
 TESSEL_API MgErr RGetFileType(Path path, _FMFileType* type, _FMFileCreator* creator);
+// Sets type and creator of a file that is not open.
 TESSEL_API MgErr RSetFileType(Path path, _FMFileType type, _FMFileCreator creator);
 
 // The header of a file that is not open for writing, as it stands in the file.
@@ -117,6 +134,7 @@ TESSEL_API MgErr RGetModDate(Path path, RsrcFile refnum, uint32* date, int32* re
 
 // (file) The file attributes word.
 TESSEL_API MgErr RGetFileAttrs(RsrcFile refnum, uint32* attrs);
+// (file) Sets the file attributes word.
 TESSEL_API MgErr RSetFileAttrs(RsrcFile refnum, uint32 attrs);
 
 // Installs the hook that offers files which are in memory already; null for none. Not while files are being opened.
@@ -137,10 +155,11 @@ TESSEL_API MgErr RGetNamed(RsrcFile refnum, ResType type, ConstPStr name, UHandl
 
 // *exists is 1 and the result kNoErr, or 0 and kResNotFoundErr.
 TESSEL_API MgErr RExists(RsrcFile refnum, ResType type, int32 id, int32* exists);
+// *loaded is whether the data of the resource are in memory.
 TESSEL_API MgErr RIsLoaded(RsrcFile refnum, ResType type, int32 id, bool* loaded);
 
-// (file) Adds a resource; on success the file owns the handle. kResIDExistsErr: the ID is taken, or `data`
-// is null. kArgErr: the handle is the data of a resource already, of this file or another.
+// (file) Adds a resource; on success the file owns the handle. kResIDExistsErr: the ID is taken, or `data` is null.
+// kArgErr: the handle is the data of a resource already, of this file or another.
 TESSEL_API MgErr RAdd(UHandle data, RsrcFile refnum, ResType type, int32 id, ConstPStr name);
 
 // (file) Removes the resource whose data this handle is. The caller owns the handle from then on.
@@ -148,7 +167,9 @@ TESSEL_API MgErr RRemove(UHandle data, RsrcFile refnum);
 
 // (file) How many resources of a type, how many types, and a type by index from 1 in the order they were added.
 TESSEL_API MgErr RCount(RsrcFile refnum, ResType type, int32* count);
+// (file) How many types there are.
 TESSEL_API MgErr RCountTypes(RsrcFile refnum, int32* count);
+// (file) A type by index from 1, in the order they were added.
 TESSEL_API MgErr RGetIndType(RsrcFile refnum, ResType* type, int32 index);
 
 // (file) An ID from 128 up that the type does not have, or 0. No ID either: 13, for an unknown refnum.
@@ -167,8 +188,11 @@ TESSEL_API MgErr RChanged(UHandle data);
 
 // Each output may be null; `name` takes up to 256 bytes.
 TESSEL_API MgErr RGetInfo(UHandle data, int32* id, ResType* type, PStr name);
+// The attributes word of the resource.
 TESSEL_API MgErr RGetAttrs(UHandle data, uint32* attrs);
+// Sets the attributes word of the resource.
 TESSEL_API MgErr RSetAttrs(UHandle data, uint32 attrs);
+// Bytes of the data.
 TESSEL_API MgErr RSize(UHandle data, uint32* size);
 
 // ---- strings and paths ----------------------------------------------------------------------------------------------
@@ -177,10 +201,12 @@ TESSEL_API MgErr RSize(UHandle data, uint32* size);
 
 // The "STR " resource: its data as a handle that stays the file's, or its text (256 bytes).
 TESSEL_API MgErr RGetString(RsrcFile refnum, int32 id, UHandle* data);
+// The text of a "STR " resource (256 bytes).
 TESSEL_API MgErr RGetPStr(RsrcFile refnum, int32 id, PStr string);
 
 // A string of a "STR#" resource (256 bytes), or of one of another type in place.
 TESSEL_API MgErr RGetIndString(RsrcFile refnum, PStr string, int32 id, int32 index);
+// A string of a list of another type, in place.
 TESSEL_API MgErr RGetIndStringPtr(RsrcFile refnum, ConstPStr* string, int32 id, int32 index, ResType type);
 
 // A string of a list of long strings, in a new handle that the caller owns.
@@ -188,6 +214,7 @@ TESSEL_API MgErr RGetIndLString(RsrcFile refnum, LStrHandle* string, int32 id, i
 
 // A path kept in a resource of any type, or in a "PTH#" list. *path is made when it is null.
 TESSEL_API MgErr RGetPath(RsrcFile refnum, ResType type, int32 id, Path* path);
+// A path of a "PTH#" list. *path is made when it is null.
 TESSEL_API MgErr RGetIndPath(RsrcFile refnum, Path* path, int32 id, int32 index);
 
 // ---- chains ---------------------------------------------------------------------------------------------------------
@@ -211,8 +238,11 @@ TESSEL_END_C
 
 namespace tessel {
 
+// The text of a "STR " resource.
 TESSEL_API MgErr RGetStringStd(RsrcFile refnum, std::string* text, int32 id);
+// A string of a "STR#" resource.
 TESSEL_API MgErr RGetIndexStringStd(RsrcFile refnum, std::string* text, int32 id, int32 index);
+// A string of a list of long strings.
 TESSEL_API MgErr RGetIndexLongStringStd(RsrcFile refnum, std::string* text, int32 id, int32 index, ResType type);
 
 // The "STR " resource taken as an LStr: a 32-bit count in host order, then the text.

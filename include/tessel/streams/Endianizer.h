@@ -32,22 +32,36 @@ class TESSEL_API Endianizer {
 public:
     virtual ~Endianizer();
 
+    // The value of two stream bytes.
     virtual int16 ToNative16(const void* stream) const = 0;
+    // The value of four stream bytes.
     virtual int32 ToNative32(const void* stream) const = 0;
+    // Converts two stream bytes into a host value.
     virtual void CopyToNative16(const void* stream, void* host) const = 0;
+    // Converts four stream bytes into a host value.
     virtual void CopyToNative32(const void* stream, void* host) const = 0;
+    // Converts eight stream bytes into a host value.
     virtual void CopyToNative64(const void* stream, void* host) const = 0;
+    // The extended real at `stream`, StreamFXSize bytes of it.
     virtual floatExt ToNativeFX(const void* stream) const = 0;
+    // Converts StreamFXSize stream bytes into an extended real.
     virtual void CopyToNative128(const void* stream, void* host) const = 0;
 
+    // Stores a value as two stream bytes.
     virtual void FromNative16(int16 value, void* stream) const = 0;
+    // Stores a value as four stream bytes.
     virtual void FromNative32(int32 value, void* stream) const = 0;
+    // Stores a value as eight stream bytes.
     virtual void FromNative64(int64 value, void* stream) const = 0;
+    // Stores an extended real as StreamFXSize bytes.
     virtual void FromNativeFX(const floatExt& value, void* stream) const = 0;
+    // Stores the extended real at `value` as StreamFXSize bytes.
     virtual void FromNative128(const void* value, void* stream) const = 0;
 
-    virtual uint32 StreamFXSize() const = 0;  // bytes of an extended real in the stream: 16 or 10
-    virtual int32 IsSwapping() const = 0;     // 1 when the stream's order is not the host's, else 0
+    // Bytes of an extended real in the stream: 16 or 10.
+    virtual uint32 StreamFXSize() const = 0;
+    // 1 when the stream's order is not the host's, else 0.
+    virtual int32 IsSwapping() const = 0;
 
 protected:
     Endianizer() = default;
@@ -56,8 +70,11 @@ protected:
 };
 
 // The three Endianizers. They belong to the library and live as long as it is loaded. Any thread.
+// The bytes as they lie in memory.
 TESSEL_API const Endianizer* NativeEndianizer();
+// Most significant byte first.
 TESSEL_API const Endianizer* BigEndianizer();
+// Least significant byte first.
 TESSEL_API const Endianizer* LittleEndianizer();
 
 }  // namespace tessel

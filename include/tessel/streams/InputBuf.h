@@ -13,6 +13,7 @@
 
 namespace tessel {
 
+// Where bytes are read from, in order.
 class TESSEL_API InputBuf : public TrackedObject {
 public:
     // A pointer to the next n bytes, which stays good as long as the buffer; the read position moves past them unless
@@ -22,8 +23,10 @@ public:
     // (null at the end), its length in `available` and no error. When n bytes remain, `available` is n.
     virtual const void* GetDataPointer(uint32 n, MgErr& err, uint32* available = nullptr, int32 peek = 0) = 0;
 
-    virtual uint32 GetBytesRead() const = 0;  // the read position
-    virtual uint32 GetSize() const = 0;       // bytes in all; 0 after an error
+    // The read position.
+    virtual uint32 GetBytesRead() const = 0;
+    // Bytes in all; 0 after an error.
+    virtual uint32 GetSize() const = 0;
 
     virtual ~InputBuf();
 
@@ -37,6 +40,7 @@ protected:
 // Reads a block of the caller's, which must stay where it is. A null pointer is an empty block.
 class TESSEL_API MemInputBuf final : public InputBuf {
 public:
+    // Over the caller's block.
     MemInputBuf(const void* data, uint32 size);
     const void* GetDataPointer(uint32 n, MgErr& err, uint32* available = nullptr, int32 peek = 0) override;
     uint32 GetBytesRead() const override;
@@ -54,6 +58,7 @@ private:
 // A null handle puts the buffer in error 1.
 class TESSEL_API LStrInputBuf final : public InputBuf {
 public:
+    // Takes the handle over; `text` becomes null.
     explicit LStrInputBuf(LStrHandle& text);
     const void* GetDataPointer(uint32 n, MgErr& err, uint32* available = nullptr, int32 peek = 0) override;
     uint32 GetBytesRead() const override;
@@ -72,6 +77,7 @@ private:
 
 // A new buffer, or null when memory is short (the string handle then stays with the caller). The caller deletes it.
 TESSEL_API MemInputBuf* CreateMemInputBuf(const void* data, uint32 size);
+// The same over a string handle, which it takes over: `text` becomes null.
 TESSEL_API LStrInputBuf* CreateLStrInputBuf(LStrHandle& text);
 
 }  // namespace tessel

@@ -13,6 +13,7 @@
 
 namespace tessel {
 
+// Where bytes are written to, in order.
 class TESSEL_API OutputBuf : public TrackedObject {
 public:
     virtual ~OutputBuf();
@@ -21,6 +22,7 @@ public:
     // Null for n = 0, after an error, and always from a PreflightOutputBuf (which only counts).
     virtual void* GetDataPointer(uint32 n, MgErr& err) = 0;
 
+    // Bytes that were given room so far.
     virtual uint32 GetBytesWritten() const = 0;
 
     OutputBuf(const OutputBuf&) = delete;
@@ -45,6 +47,7 @@ private:
 // Writes into a block of the caller's. Error 74 when it is full.
 class TESSEL_API StaticOutputBuf final : public OutputBuf {
 public:
+    // Over the caller's block.
     StaticOutputBuf(void* data, uint32 capacity);
     ~StaticOutputBuf() override;
     void* GetDataPointer(uint32 n, MgErr& err) override;
@@ -61,7 +64,9 @@ private:
 // of the handle gives.
 class TESSEL_API HandleOutputBuf final : public OutputBuf {
 public:
+    // With room for 4096 bytes at first.
     HandleOutputBuf();
+    // With room for so many bytes at first.
     explicit HandleOutputBuf(uint32 initialSize);
     ~HandleOutputBuf() override;
     void* GetDataPointer(uint32 n, MgErr& err) override;
@@ -81,7 +86,9 @@ private:
 // The same with a string handle. Capacities leave out the four bytes of the count.
 class TESSEL_API LStrOutputBuf final : public OutputBuf {
 public:
+    // With room for 4096 bytes at first.
     LStrOutputBuf();
+    // With room for so many bytes at first.
     explicit LStrOutputBuf(uint32 initialCapacity);
 
     // Takes over the given handle, of `capacity` bytes or, when 0, of the size it has. Null: a new handle of `capacity`
@@ -103,7 +110,9 @@ private:
 
 // A new buffer, or null when memory is short. The caller deletes it.
 TESSEL_API PreflightOutputBuf* CreatePreflightOutputBuf();
+// The same over a block of the caller's.
 TESSEL_API StaticOutputBuf* CreateStaticOutputBuf(void* data, uint32 capacity);
+// The same with a string handle of its own.
 TESSEL_API LStrOutputBuf* CreateLStrOutputBuf(uint32 initialCapacity);
 
 }  // namespace tessel

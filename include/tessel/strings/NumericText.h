@@ -69,6 +69,7 @@ TESSEL_API bool StringToPacked(const char* text, int32 length, PackedDecimal* re
 // does not fit saturates. In a radix other than 10 a signed type takes the bit pattern of its unsigned twin. The cursor
 // is left after the last digit, or untouched when there is no digit (the result is then 0).
 TESSEL_API int32 StringToNum32(const char** cursor, int32 length, int16 typeCode, int32 radix, bool noSign);
+// The same for types of 64 bits.
 TESSEL_API int64 StringToNum64(const char** cursor, int32 length, int16 typeCode, int32 radix, bool noSign);
 
 // Which kind of value a single, double or extended real is (kFloat...). Other types are finite.
@@ -77,6 +78,7 @@ TESSEL_API int32 ClassifyFloatNumber(const void* value, int16 typeCode);
 // Replace the texts of a NaN ("NaN") and of an infinity ("Inf") for the whole process and return the previous ones;
 // null restores those. The text is not copied. To be called while no other thread renders.
 TESSEL_API CStr NumSetNaNText(CStr text);
+// Replaces the text of an infinity; else as NumSetNaNText.
 TESSEL_API CStr NumSetInfText(CStr text);
 
 TESSEL_END_C
@@ -88,13 +90,17 @@ namespace tessel {
 class TESSEL_API CharacterSource {
 public:
     virtual ~CharacterSource();
-    virtual uint8 Current() const = 0;       // the character at the cursor
-    virtual void Advance() = 0;              // one character on
-    virtual void StepBack(int32 count) = 0;  // so many characters back
+    // The character at the cursor.
+    virtual uint8 Current() const = 0;
+    // One character on.
+    virtual void Advance() = 0;
+    // So many characters back.
+    virtual void StepBack(int32 count) = 0;
 };
 
 // As StringToNum32 and StringToNum64. At most `length` characters are read.
 TESSEL_API int32 StringToNumL(CharacterSource& source, int32 length, int16 typeCode, int32 radix, bool noSign);
+// As StringToNum64.
 TESSEL_API int64 StringToNumQ(CharacterSource& source, int32 length, int16 typeCode, int32 radix, bool noSign);
 
 }  // namespace tessel

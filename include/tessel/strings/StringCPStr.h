@@ -35,7 +35,7 @@ TESSEL_API MgErr CPStrInsert(CPStrHandle list, ConstPStr element, int32 index);
 // The same; `exact` says whether the handle is left exactly as large as the list.
 TESSEL_API MgErr CPStrInsertEfficient(CPStrHandle list, ConstPStr element, int32 index, bool exact);
 
-// Removes or replaces element `index`, brought into 0 ... count - 1. kArgErr for null inputs and for an empty list.
+// Removes element `index`, brought into 0 ... count - 1. kArgErr for null inputs and for an empty list.
 TESSEL_API MgErr CPStrRemove(CPStrHandle list, int32 index);
 // Replaces element `index`, brought into 0 ... count - 1. kArgErr for null inputs and for an empty list.
 TESSEL_API MgErr CPStrReplace(CPStrHandle list, ConstPStr element, int32 index);

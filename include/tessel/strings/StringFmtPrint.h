@@ -51,6 +51,7 @@ TESSEL_API int32 SPrintfv(char* dst, int32 size, const char* format, int32 forma
 
 // Without a limit; dst is terminated. Return the length, which is all that they do with a null dst.
 TESSEL_API int32 SPrintf(char* dst, CStr format, ...);
+// As SPrintf, with the format in a PStr.
 TESSEL_API int32 SPrintfp(char* dst, ConstPStr format, ...);
 
 // Writes at most size - 1 bytes and a terminator, nothing when size is 0. Returns the length the engine reached, at
@@ -59,6 +60,7 @@ TESSEL_API int32 SNPrintf(char* dst, int32 size, CStr format, ...);
 
 // Into a PStr of at most 255 bytes; dst must take 256. Return the length; 0 with a null dst.
 TESSEL_API int32 PPrintf(PStr dst, CStr format, ...);
+// As PPrintf, with the format in a PStr.
 TESSEL_API int32 PPrintfp(PStr dst, ConstPStr format, ...);
 
 // Into a handle, which is sized to the text; the arguments may lie in it. kArgErr for a null handle or format, the

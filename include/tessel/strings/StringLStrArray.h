@@ -36,6 +36,7 @@ using ::LStrArrayToCPStrHandle;
 
 // The same over all elements; null is a list of none.
 TESSEL_API MgErr CPStrPtrToLStrArray(const CPStr* list, LStrArrayHandle* array);
+// The same over all elements; a null array is one of none.
 TESSEL_API MgErr LStrArrayToCPStrHandle(LStrArrayHandle array, CPStrHandle* list);
 
 }  // namespace tessel

@@ -21,10 +21,13 @@ public:
     enum OpenMode : int32 { kTruncate = 0, kAppendAtEnd = 1 };
 
     virtual ~StringOutput() = default;
+    // Opens what is to be opened; nothing for outputs that need no opening.
     virtual void Open(OpenMode mode);
     // Print one piece of text of at most 2047 bytes; return how many prints there were so far.
     virtual int32 PrintData(CStr format, ...) = 0;
+    // The same from an argument list.
     virtual int32 PrintDataV(CStr format, va_list arguments) = 0;
+    // Sends on what is held back.
     virtual void Flush();
 };
 
@@ -51,6 +54,7 @@ private:
 // Writes to the console, which it makes when there is none; the last such output takes it away again.
 class TESSEL_API StringOutputWinConsole final : public StringOutputBase {
 public:
+    // Makes the console when there is none.
     StringOutputWinConsole();
     ~StringOutputWinConsole() override;
 
@@ -96,10 +100,12 @@ public:
     StringOutputFork(const StringOutputFork&) = delete;
     StringOutputFork& operator=(const StringOutputFork&) = delete;
 
+    // Opens both.
     void Open(OpenMode mode) override;
     // The result is the second output's, without one the first's.
     int32 PrintData(CStr format, ...) override;
     int32 PrintDataV(CStr format, va_list arguments) override;
+    // Flushes both.
     void Flush() override;
 
 private:
@@ -111,7 +117,9 @@ private:
 // Makes outputs, owned by the caller. Null when memory runs out.
 class TESSEL_API StringOutputFactory {
 public:
+    // An output to the debugger channel.
     static StringOutput* CreateDebugPrintOutput();
+    // An output to the console.
     static StringOutput* CreateConsoleOutput();
     // Takes the location over, unless it returns null.
     static StringOutput* CreateFileOutput(FileLoc* location);

@@ -12,11 +12,15 @@ namespace tessel {
 class TESSEL_API OVHandle {
 public:
     OVHandle() = default;
+    // Takes the handle over; the other is empty then.
     OVHandle(OVHandle&& other) noexcept : handle_(other.DetachHandle()) {}
+    // Disposes of the handle held, and takes the other's over.
     OVHandle& operator=(OVHandle&& other) noexcept;
     ~OVHandle();
 
+    // The handle, which stays the holder's; null when empty.
     UHandle Handle() const { return handle_; }
+    // Bytes of the handle; 0 when empty.
     uint32 Size() const;
 
     // Resizes the handle, creating it when there is none; n of 0 disposes of it. kMemFullErr when it cannot be created,

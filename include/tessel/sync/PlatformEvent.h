@@ -22,6 +22,7 @@ public:
     virtual int32 Signal() = 0;
     // 1 when the event was signaled, else 0.
     virtual int32 Reset() = 0;
+    // Waits until signaled, for so long at most; a WaitResult.
     virtual int32 Wait(int32 milliseconds) = 0;
     // Not available here: kMemFullErr.
     virtual MgErr WaitAndPump(ThEventPumpProc pump, void* argument, int32 milliseconds) = 0;
@@ -32,11 +33,13 @@ public:
     virtual void GetLatencyStats(uint32* count, _HRTime* total, _HRTime* third, _HRTime* minimum, _HRTime* maximum) = 0;
     // Before first use, and after the last.
     virtual MgErr Init(bool signaled) = 0;
+    // After the last use.
     virtual MgErr Uninit() = 0;
 };
 
 // A new event of this host, or null. Destroy: kNoErr for null, else what Uninit returns.
 TESSEL_API PlatformEvent* CreatePlatformEvent(bool signaled);
+// Ends an event. kNoErr for null, else what Uninit returns.
 TESSEL_API MgErr DestroyPlatformEvent(PlatformEvent* event);
 
 }  // namespace tessel

@@ -9,6 +9,7 @@
 
 namespace tessel {
 
+// Collects how long it took from Start to RecordLatency: how often, and the sum, the least and the most of it.
 class TESSEL_API PlatformEventTimer {
 public:
     PlatformEventTimer() = default;
@@ -21,12 +22,12 @@ public:
     void GetLatencyStats(uint32* count, _HRTime* total, _HRTime* third, _HRTime* minimum, _HRTime* maximum) const;
 
 private:
-    _HRTime fStart = {0, 0};
-    _HRTime fTotal = {0, 0};
-    _HRTime fThird = {0, 0};
-    _HRTime fMaximum = {0, 0};
-    _HRTime fMinimum = {0, 0};
-    uint32 fCount = 0;
+    _HRTime start_ = {0, 0};
+    _HRTime total_ = {0, 0};
+    _HRTime third_ = {0, 0};
+    _HRTime maximum_ = {0, 0};
+    _HRTime minimum_ = {0, 0};
+    uint32 count_ = 0;
 };
 
 }  // namespace tessel

@@ -22,8 +22,10 @@ typedef tessel::PlatformEvent* PlatformEventPtr;
 typedef struct tessel_PlatformEvent* PlatformEventPtr;
 #endif
 
+// Called at the start of a signal, on the signaling thread.
 typedef void (*ThEventSignalProc)(void);
 
+// An event. Its fields are the library's to change.
 typedef struct THEVENTREC {
     uint32 verifier;  // kThEventVerifier
     PlatformEventPtr platformEvent;
@@ -38,6 +40,7 @@ TESSEL_BEGIN_C
 // A new event in *event, owned by the caller; null there and kMemFullErr when it cannot be made. `ignored` is not used.
 // WithCustomSignal: `customSignal` (or null) is called at the start of every signal, on the signaling thread.
 TESSEL_API MgErr ThEventCreate(ThEvent* event, uint32 ignored, bool signaled);
+// A new event whose every signal begins with a call of `customSignal` (null: none); else as ThEventCreate.
 TESSEL_API MgErr ThEventCreateWithCustomSignal(ThEvent* event, uint32 ignored, bool signaled,
                                                ThEventSignalProc customSignal);
 
@@ -53,6 +56,7 @@ TESSEL_API int32 ThEventReset(ThEvent event);
 
 // Waits until signaled: kNoErr, or kTimeOutErr after so many milliseconds; negative waits for ever. Null: kArgErr.
 TESSEL_API MgErr ThEventWaitWithTimeout(ThEvent event, int32 milliseconds);
+// Waits until signaled, for ever. Null: kArgErr.
 TESSEL_API MgErr ThEventWait(ThEvent event);
 
 // Waits for one of two events (the second may be null, or the first again) or, with pumpMessages, for a message to the
@@ -67,6 +71,7 @@ TESSEL_API MgErr ThEventMessageArrived(uint32 threadId);
 
 // Calls pump(argument) once. For a null event its result; else kMemFullErr: waiting while pumping is not available.
 typedef MgErr (*ThEventPumpProc)(void* argument);
+// Calls pump(argument) once, as above; does not wait.
 TESSEL_API MgErr ThEventWaitAndPump(ThEvent event, ThEventPumpProc pump, int32 milliseconds, void* argument);
 
 TESSEL_END_C

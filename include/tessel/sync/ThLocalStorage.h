@@ -9,8 +9,11 @@
 
 TESSEL_BEGIN_C
 
+// A new key, null in every thread; kThNoLocalStorageKey when there is none left.
 TESSEL_API uint32 ThLocalStorageAllocateKey(void);
+// Stores the calling thread's value. Nothing for what is no key.
 TESSEL_API void ThLocalStorageSetValue(uint32 key, void* value);
+// The calling thread's value; null when it set none, and for what is no key.
 TESSEL_API void* ThLocalStorageGetValue(uint32 key);
 
 // The values are the callers'.

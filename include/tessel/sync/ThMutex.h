@@ -10,6 +10,7 @@
 #include <tessel/base/Types.h>
 #include <tessel/sync/ThEvent.h>
 
+// A mutex. Its fields are the library's to change.
 typedef struct THMUTEXREC {
     int32 count;      // -1 when free; else the number of threads that hold it or sleep for it, minus one
     ThEvent event;    // wakes one that sleeps
@@ -30,6 +31,7 @@ TESSEL_API void ThMutexDestroy(ThMutex mutex);
 
 // What the inline operations do when another thread holds the mutex, or sleeps for it. Not for null.
 TESSEL_API void ThMutexAcquireHeld(ThMutex mutex);
+// Hands the mutex to one that sleeps for it. Not for null.
 TESSEL_API void ThMutexWakeNext(ThMutex mutex);
 
 // Both do nothing for null.
@@ -40,6 +42,7 @@ static inline void ThMutexAcquire(ThMutex mutex) {
         ThMutexAcquireHeld(mutex);
 }
 
+// Lets a mutex go that the calling thread holds. Nothing for null.
 static inline void ThMutexRelease(ThMutex mutex) {
     if (!mutex) return;
     if (__atomic_sub_fetch(&mutex->count, 1, __ATOMIC_RELEASE) != -1) ThMutexWakeNext(mutex);
@@ -54,13 +57,14 @@ namespace tessel {
 // Holds a mutex for a scope.
 class ThMutexHolder {
 public:
-    explicit ThMutexHolder(ThMutex mutex) : fMutex(mutex) { ThMutexAcquire(fMutex); }
-    ~ThMutexHolder() { ThMutexRelease(fMutex); }
+    // Acquires the mutex; null holds nothing.
+    explicit ThMutexHolder(ThMutex mutex) : mutex_(mutex) { ThMutexAcquire(mutex_); }
+    ~ThMutexHolder() { ThMutexRelease(mutex_); }
     ThMutexHolder(const ThMutexHolder&) = delete;
     ThMutexHolder& operator=(const ThMutexHolder&) = delete;
 
 private:
-    ThMutex fMutex;
+    ThMutex mutex_;
 };
 
 }  // namespace tessel

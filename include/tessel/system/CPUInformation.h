@@ -33,7 +33,9 @@ namespace tessel {
 class TESSEL_API CPUFeatures {
 public:
     virtual ~CPUFeatures();
+    // What it can do, a bit each (kCompareExchange8).
     virtual uint64 GetFlags() const = 0;
+    // Hardware threads of a core.
     virtual uint8 GetThreadsPerCore() const = 0;
 
     static constexpr uint64 kCompareExchange8 = 512;  // 8 bytes at once
@@ -43,23 +45,34 @@ public:
 class TESSEL_API MachineDescription {
 public:
     virtual ~MachineDescription();
+    // Processors as the system counts them.
     virtual uint32 GetNumLogicalProcessors() const = 0;
+    // Cores of all packages.
     virtual uint32 GetNumCores() const = 0;
+    // Packages.
     virtual uint32 GetNumPackages() const = 0;
     // Null for a selector that is not known.
     virtual const CPUFeatures* GetFeatures(uint32 selector) const = 0;
 };
 
+// What is known of the processors of this machine.
 class TESSEL_API CPUInformation {
 public:
+    // The architecture (kCPUArch...).
     virtual int32 GetArch() const = 0;
+    // Its name.
     virtual const std::string& GetArchName() const = 0;
+    // Processors as the system counts them.
     virtual uint32 GetNumLogicalCPUs() const = 0;
-    virtual uint32 GetNumHardwareThreads() const = 0;  // threads of a core x cores
+    // Threads of a core x cores.
+    virtual uint32 GetNumHardwareThreads() const = 0;
+    // Cores of all packages.
     virtual uint32 GetNumCores() const = 0;
+    // Packages.
     virtual uint32 GetNumPackages() const = 0;
     // Null when the selector or the machine is not known.
     virtual const CPUFeatures* GetFeatures(uint32 selector) const = 0;
+    // The machine; null when it is not known. It stays this object's.
     virtual const MachineDescription* GetMachineDescription() const = 0;
     // Appends "CPUArch: x64, NumLogicalCPUs: 8".
     virtual void WriteToDebugStream(DebugStream& stream) const = 0;

@@ -9,9 +9,12 @@
 
 namespace tessel {
 
+// The operating system and the processors.
 class TESSEL_API PlatformInformation {
 public:
+    // The operating system, as OSInfo().
     virtual OpSystemInfo* GetOSInfo() const = 0;
+    // The processors, as CPUInfo().
     virtual CPUInformation* GetCPUInfo() const = 0;
 
 protected:

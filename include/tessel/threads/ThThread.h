@@ -30,6 +30,7 @@ typedef int32 (*ThThreadProc)(void* argument);
 // The host's own handle of a thread.
 typedef void* ThPlatformThread;
 
+// The record of a thread. Its fields are the library's to change.
 typedef struct THTHREADREC {
     uint32 verifier;  // kThThreadVerifier
     ThPlatformThread platformThread;
@@ -60,6 +61,7 @@ TESSEL_API MgErr ThPseudoThreadCreate(ThThread* thread);
 // or 0 when the host gives no handle. Once, on the main thread, after the start of the library and before other
 // threads.
 TESSEL_API int32 AssimilateStartUpThread(void);
+// Whether the calling thread is the start-up thread.
 TESSEL_API bool IsStartUpThread(void);
 
 // Ends a record. A thread started here that still runs is waited for, 10 seconds at most, and then ended by force:
@@ -82,6 +84,7 @@ TESSEL_API bool ThThreadActive(ThThread thread);
 
 // Two values of the caller's in the record. Get returns B and stores A; null and null for a null thread.
 TESSEL_API void ThSetThInfo(ThThread thread, void* valueA, void* valueB);
+// Stores value A in *valueA and returns value B; null and null for a null thread.
 TESSEL_API void* ThGetThInfo(ThThread thread, void** valueA);
 
 // Where the host's handle and number of the thread stand; null and null for a null thread or one without a handle.
@@ -100,7 +103,8 @@ TESSEL_API MgErr ThThreadSetPriority(ThThread thread, int32 level);
 // does not tell.
 TESSEL_API int32 ThThreadGetPriority(ThThread thread);
 
-// The host's priorities of the five levels. Each output may be null.
+// The host's priorities of the five levels: -15, 0, 1, 2 and 15, or what the settings "thpri_bgrnd", "thpri_normal",
+// "thpri_high", "thpri_vhigh" and "thpri_tcrit" (I32) say when the threads start. Each output may be null.
 TESSEL_API void ThThreadGetNativePriorityInfo(int32* background, int32* normal, int32* high, int32* veryHigh,
                                               int32* timeCritical);
 

@@ -6,6 +6,7 @@
 
 TESSEL_BEGIN_C
 
+// The clock now.
 TESSEL_API uint32 MilliSecs(void);
 
 // a - b, positive when a is later; right across the wrap while they are less than 2^31 ms apart.

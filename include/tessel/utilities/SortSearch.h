@@ -2,15 +2,16 @@
 //
 // A comparison returns a negative number, 0 or a positive one as its first argument stands before, with or behind its
 // second. `context` is handed through to it. Whatever a comparison answers, sorting ends and stays within the array.
-// Sizes are bytes. A null array or comparison counts as no records; a null key goes to
-// the comparison as it is. Nothing allocates; an exception
-// of the comparison's passes through. Any thread on its own array.
+// Sizes are bytes. A null array or comparison counts as no records; a null key goes to the comparison as it is. Nothing
+// allocates; an exception of the comparison's passes through. Any thread on its own array.
 #ifndef TESSEL_UTILITIES_SORTSEARCH_H
 #define TESSEL_UTILITIES_SORTSEARCH_H
 
 #include <tessel/base/Types.h>
 
+// Compares two records, or a key with a record.
 typedef int32 (*CompareProc)(const void* a, const void* b);
+// The same with the caller's context.
 typedef int32 (*CompareProcEx)(const void* a, const void* b, void* context);
 
 TESSEL_BEGIN_C

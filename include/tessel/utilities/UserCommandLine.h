@@ -25,7 +25,9 @@ TESSEL_API void SetIgnoreCommandLine(int32 ignore);
 
 // The whole line, the user's and the host's. The arrays are the library's. Each output may be null.
 TESSEL_API void GetRawCommandLine(int32* count, char*** args);
+// The user's part of the line; else as GetRawCommandLine.
 TESSEL_API void GetUserCommandLine(int32* count, char*** args);
+// The host's part of the line; else as GetRawCommandLine.
 TESSEL_API void GetAppCommandLine(int32* count, char*** args);
 
 // Keeps a copy of the path of the preference file; null forgets it. kMemFullErr: none is kept.
@@ -35,9 +37,9 @@ TESSEL_API MgErr SetPrefsPath(CStr path);
 TESSEL_API CStr GetPrefsPath(void);
 
 // Arguments from one line of text: `first`, then the words of the line. Blanks and tabs separate words; a word that
-//    begins with a double quote goes on, without it, to the next double quote or the end of the line. The caller owns
-// args (not `first`) and frees it with the other function; null and a count of 0 when there is no memory, and
-//    nothing is made where one of the outputs is null. A null line is empty.
+// begins with a double quote goes on, without it, to the next double quote or the end of the line. The caller owns args
+// (not `first`) and frees it with the other function; null and a count of 0 when there is no memory, and nothing is
+// made where one of the outputs is null. A null line is empty.
 TESSEL_API void NewCommandLineArgsFromSingleLine(CStr line, char* first, int32* count, char*** args);
 // Null is fine.
 TESSEL_API void DeleteCommandLineArgsFromSingleLine(int32 count, char** args);

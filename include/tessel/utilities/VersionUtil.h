@@ -35,6 +35,7 @@ TESSEL_END_C
 
 namespace tessel {
 
+// The text at a level, as a std::string.
 TESSEL_API std::string BuildVersStdStr(int32 version, VersionStringDetailLevel level);
 
 }  // namespace tessel

@@ -9,13 +9,21 @@ TESSEL_BEGIN_C
 
 // These do nothing.
 TESSEL_API void InitEventLoggingMgr(void);
+// Does nothing.
 TESSEL_API void UnInitEventLoggingMgr(void);
+// Does nothing.
 TESSEL_API void EventLoggingEnable(int32 enable);
+// Does nothing.
 TESSEL_API void EventLoggingConfigure(uint32 entriesPerThread, uint32 flags);
+// Does nothing.
 TESSEL_API void EventLoggingSetFlags(uint32 flags, uint32 mask);
+// Does nothing.
 TESSEL_API void EventLoggingClearLog(void);
+// Does nothing.
 TESSEL_API void EventLoggingLogUserEvent(uint32 event, uint32 value);
+// Does nothing.
 TESSEL_API void EventLoggingLogUserBuffer(uint32 event, const void* data, uint32 size);
+// Does nothing.
 TESSEL_API void EventLoggingEnumerateThreads(void (*visit)(uint32 threadID, void* context), void* context);
 
 // Sets each output to 0. Null outputs are skipped.

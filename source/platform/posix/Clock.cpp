@@ -4,8 +4,6 @@
 #include "platform/posix/SystemCalls.h"
 
 #include <errno.h>
-#include <sched.h>
-#include <sys/resource.h>
 
 namespace tessel::platform {
 
@@ -25,7 +23,7 @@ std::uint64_t In100Nanoseconds(const timeval& time) {
 
 ProcessorTime UsageOf(int who) {
     rusage usage{};
-    getrusage(who, &usage);
+    systemCalls.getrusage(who, &usage);
     return {In100Nanoseconds(usage.ru_stime), In100Nanoseconds(usage.ru_utime)};
 }
 
@@ -60,7 +58,7 @@ ProcessorTime ThreadTimes() noexcept {
 
 void SleepMilliseconds(std::uint32_t milliseconds) noexcept {
     if (milliseconds == 0) {
-        sched_yield();
+        systemCalls.sched_yield();
         return;
     }
     timespec until = Read(CLOCK_MONOTONIC);

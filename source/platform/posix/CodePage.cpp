@@ -48,8 +48,8 @@ struct OtherPage : CodePageTables {
     OtherPage* next;
 };
 
-constinit OtherPage* otherPages = nullptr;  // guarded by pagesMutex
 Mutex pagesMutex;
+constinit OtherPage* otherPages TESSEL_GUARDED_BY(pagesMutex) = nullptr;
 
 struct NamedPage {
     const char* name;
@@ -246,8 +246,8 @@ std::unique_ptr<OtherPage> MakePage(std::uint32_t codePage) {
     return page;
 }
 
-// Null when the host does not know it. The caller holds pagesMutex.
-const CodePageTables* FindPage(std::uint32_t codePage) {
+// Null when the host does not know it.
+const CodePageTables* FindPage(std::uint32_t codePage) TESSEL_REQUIRES(pagesMutex) {
     if (codePage == kCodePageUtf8) return &utf8Tables;
     for (OtherPage* page = otherPages; page; page = page->next) {
         if (page->codePage == codePage) return page;
@@ -267,7 +267,7 @@ std::uint32_t LocaleCodePage() {
     return number;
 }
 
-const CodePageTables* ConfiguredPage() {
+const CodePageTables* ConfiguredPage() TESSEL_REQUIRES(pagesMutex) {
     const char* setting = std::getenv("TESSEL_CODEPAGE");
     std::uint32_t number = setting && *setting ? CodePageNumber(setting) : LocaleCodePage();
     const CodePageTables* tables = number ? FindPage(number) : nullptr;

@@ -29,13 +29,13 @@ bool DebuggerAttached() noexcept {
     systemCalls.close(file);
     if (count <= 0) return false;
     status[count] = 0;
-    constexpr char kLabel[] = "TracerPid:";
+    constexpr char kLabel[] = "\nTracerPid:";  // not within another line: a program may be named so
     const char* line = std::strstr(status, kLabel);
     return line && std::strtol(line + sizeof kLabel - 1, nullptr, 10) != 0;
 }
 
 void DebuggerBreak() noexcept {
-    ::raise(SIGTRAP);
+    systemCalls.raise(SIGTRAP);
 }
 
 void DebuggerOutput(const char* text) noexcept {

@@ -28,7 +28,7 @@ std::atomic<Table*> activeTable{nullptr};
 Mutex tableMutex;  // guards the making of a table
 
 // Owns the newest table, and through it the older ones.
-std::unique_ptr<Table>& OwnedTable() {
+std::unique_ptr<Table>& OwnedTable() TESSEL_REQUIRES(tableMutex) {
     static std::unique_ptr<Table>* const owned = new std::unique_ptr<Table>;  // outlives every thread
     return *owned;
 }
@@ -66,7 +66,7 @@ std::unique_ptr<Table> MakeTable() {
     return table;
 }
 
-void PublishTable() {
+void PublishTable() TESSEL_REQUIRES(tableMutex) {
     std::unique_ptr<Table>& owned = OwnedTable();
     std::unique_ptr<Table> table = MakeTable();
     table->older = std::move(owned);
@@ -188,8 +188,7 @@ bool NameToNativeText(std::string_view name, std::string& native) {
 
 bool NameToNative(std::string_view name, std::string& native) {
     if (!NameToNativeText(name, native)) return false;
-    MatchOnDisk(native);
-    return true;
+    return MatchOnDisk(native) != Match::kFailed || FailErrno();
 }
 
 // ---- names from the host's ------------------------------------------------------------------------------------------

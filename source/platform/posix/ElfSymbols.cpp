@@ -34,7 +34,7 @@ struct Names {
 // A file read in pieces: of one with debugging information only a small part is wanted.
 class ElfFile {
 public:
-    explicit ElfFile(const char* native) : file_(OpenRetrying(native, O_RDONLY)) {}
+    explicit ElfFile(const char* native) : file_(OpenRetrying(native, O_RDONLY | O_NONBLOCK)) {}
     ~ElfFile() {
         if (file_ >= 0) systemCalls.close(file_);
     }

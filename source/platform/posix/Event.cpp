@@ -125,12 +125,7 @@ struct Event::Watch {
     Watch* next;
 };
 
-namespace {
-
-// Guards the lists of watches of all events. Nothing is taken inside it.
-constinit Mutex watchMutex;
-
-}  // namespace
+constinit Mutex Event::watchMutex;
 
 void Event::Renew(bool signaled) noexcept {
     MutexHolder holder(watchMutex);

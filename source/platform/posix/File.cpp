@@ -1,5 +1,6 @@
 #include "platform/File.h"
 
+#include "platform/Mutex.h"
 #include "platform/posix/Errors.h"
 #include "platform/posix/FileHandles.h"
 #include "platform/posix/Interrupted.h"
@@ -8,9 +9,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <errno.h>
-#include <limits>
 #include <string>
-#include <sys/mman.h>
 #include <unistd.h>
 
 namespace tessel::platform {
@@ -19,11 +18,7 @@ namespace tessel::platform {
 
 namespace {
 
-// Every open file holds locks on some of four bytes, which lie far beyond any data and are never written. The locks
-// belong to the open file description: they are seen between processes and between two opens of one process, and go
-// when the file is closed. All holders lock for reading, so that any number of them can hold the same mark. The order
-// of the marks makes the usual sets contiguous.
-constexpr std::int64_t kMarksAt = std::int64_t{1} << 62;
+// The order of the marks makes the usual sets contiguous.
 constexpr unsigned kHasWrite = 1, kHasRead = 2, kDenyWrite = 4, kDenyRead = 8;
 constexpr int kMarkCount = 4;
 
@@ -50,8 +45,6 @@ int LockBytes(int descriptor, int command, short type, std::int64_t start, std::
     return Retry([&] { return systemCalls.lock(descriptor, command, &range); });
 }
 
-enum class Marking { kDone, kRefused, kNoLocks };
-
 // Calls act(first mark, count) for each run of contiguous marks, until one of them is not kDone.
 template <typename Action>
 Marking ForEachRun(unsigned marks, Action act) {
@@ -70,19 +63,12 @@ Marking ForEachRun(unsigned marks, Action act) {
 // than it must: never too little.
 Marking SetMarks(int descriptor, unsigned marks, bool readable) {
     return ForEachRun(marks, [&](int first, int count) {
-        struct flock range;
-        short type = readable ? F_RDLCK : F_WRLCK;
-        if (LockBytes(descriptor, F_OFD_SETLK, type, kMarksAt + first, count, range) == 0) return Marking::kDone;
-        return errno == EAGAIN || errno == EACCES ? Marking::kRefused : Marking::kNoLocks;
+        return MarkBytes(descriptor, readable ? F_RDLCK : F_WRLCK, kMarksAt + first, count);
     });
 }
 
 Marking TestMarks(int descriptor, unsigned marks) {
-    return ForEachRun(marks, [&](int first, int count) {
-        struct flock range;
-        if (LockBytes(descriptor, F_OFD_GETLK, F_WRLCK, kMarksAt + first, count, range) != 0) return Marking::kNoLocks;
-        return range.l_type == F_UNLCK ? Marking::kDone : Marking::kRefused;
-    });
+    return ForEachRun(marks, [&](int first, int count) { return TestBytes(descriptor, kMarksAt + first, count); });
 }
 
 // Marks first and tests then: of two openers at the same moment at least one sees the other's marks. A file system that
@@ -95,6 +81,26 @@ bool ShareAllows(int descriptor, std::uint32_t access, std::uint32_t deny, bool 
     if (result == Marking::kRefused) result = TestMarks(descriptor, AdverseMarks(marks));
     return result != Marking::kRefused;
 }
+
+}  // namespace
+
+Marking MarkBytes(int descriptor, short type, std::int64_t start, std::int64_t count) {
+    struct flock range;
+    if (LockBytes(descriptor, F_OFD_SETLK, type, start, count, range) == 0) return Marking::kDone;
+    return errno == EAGAIN || errno == EACCES ? Marking::kRefused : Marking::kNoLocks;
+}
+
+Marking TestBytes(int descriptor, std::int64_t start, std::int64_t count) {
+    struct flock range;
+    if (LockBytes(descriptor, F_OFD_GETLK, F_WRLCK, start, count, range) != 0) return Marking::kNoLocks;
+    return range.l_type == F_UNLCK ? Marking::kDone : Marking::kRefused;
+}
+
+Marking MarkShare(int descriptor, std::uint32_t access, std::uint32_t deny) {
+    return SetMarks(descriptor, MarksOf(access, deny), true);
+}
+
+namespace {
 
 // ---- opening --------------------------------------------------------------------------------------------------------
 
@@ -120,11 +126,9 @@ bool MakeWaiting(int descriptor) {
 }
 
 // Folders, pipes and sockets have no bytes at positions. A device may be opened.
-bool CheckKind(int descriptor) {
-    struct statx status;
-    if (systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_TYPE, &status) != 0) return FailErrno();
-    if (S_ISREG(status.stx_mode)) return true;
-    if (S_ISDIR(status.stx_mode) || S_ISFIFO(status.stx_mode)) return FailWith(kErrorAccessDenied);
+bool CheckKind(int descriptor, unsigned mode) {
+    if (S_ISREG(mode)) return true;
+    if (S_ISDIR(mode) || S_ISFIFO(mode)) return FailWith(kErrorAccessDenied);
     return MakeWaiting(descriptor) || FailErrno();
 }
 
@@ -132,21 +136,120 @@ bool Truncate(int descriptor, std::int64_t size) {
     return Retry([&] { return systemCalls.ftruncate(descriptor, static_cast<off_t>(size)); }) == 0;
 }
 
-// What has to hold of a descriptor before it is handed out.
-bool Admit(int descriptor, std::uint32_t access, std::uint32_t deny, bool readable, bool empty) {
-    if (!CheckKind(descriptor)) return false;
-    if (!ShareAllows(descriptor, access, deny, readable)) return FailWith(kErrorSharingViolation);
-    if (empty && !Truncate(descriptor, 0) && errno != EINVAL) return FailErrno();  // EINVAL: a device
-    return true;
+enum class Admission { kGranted, kRefused, kReplaced };
+
+// Who replaces a file lets go of the old one's marks: they are on the new one. A file without a name that was opened by
+// one is such an old file, unless the name still leads to it (as those of open files under /proc do).
+bool WasReplaced(const char* native, const struct statx& status) {
+    if (status.stx_nlink != 0) return false;
+    struct statx named;
+    return !StatusOf(native, Links::kFollowed, STATX_INO, named) || !SameFile(status, named);
 }
 
-// Removes what has the name, when it is this user's and no folder. True also when there is nothing.
-bool RemoveOwn(const char* native) {
+// What has to hold of a descriptor before it is handed out. LastError says why it is refused.
+Admission Admit(int descriptor, const char* native, std::uint32_t access, std::uint32_t deny, bool readable) {
+    const bool allowed = ShareAllows(descriptor, access, deny, readable);
     struct statx status;
-    if (!StatusOf(native, Links::kThemselves, STATX_TYPE | STATX_UID, status)) return errno == ENOENT || FailErrno();
-    if (S_ISDIR(status.stx_mode) || status.stx_uid != ::geteuid()) return FailWith(kErrorAccessDenied);
-    return systemCalls.unlink(native) == 0 || errno == ENOENT || FailErrno();
+    if (systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_TYPE | STATX_NLINK | STATX_INO, &status) != 0)
+        return FailErrno(), Admission::kRefused;
+    if (!CheckKind(descriptor, status.stx_mode)) return Admission::kRefused;
+    if (WasReplaced(native, status)) return Admission::kReplaced;
+    if (!allowed) FailWith(kErrorSharingViolation);
+    return allowed ? Admission::kGranted : Admission::kRefused;
 }
+
+// A descriptor that may be handed out, or kNotOpened with errno, or kNotAdmitted with LastError.
+constexpr int kNotOpened = -1, kNotAdmitted = -2;
+
+int OpenAdmitted(const std::string& native, std::uint32_t access, std::uint32_t deny, int flags) {
+    for (;;) {
+        bool readable = true;
+        const int descriptor = OpenDescriptor(native.c_str(), access, flags, readable);
+        if (descriptor < 0) return kNotOpened;
+        const Admission admission = Admit(descriptor, native.c_str(), access, deny, readable);
+        if (admission == Admission::kGranted) return descriptor;
+        systemCalls.close(descriptor);
+        if (admission == Admission::kRefused) return kNotAdmitted;
+    }
+}
+
+// ---- private files --------------------------------------------------------------------------------------------------
+
+// When this process began to use the library, by the clock of the files' times.
+timespec BeginOfProcess() {
+    timespec now{};
+    systemCalls.clock_gettime(CLOCK_REALTIME_COARSE, &now);
+    return now;
+}
+const timespec beginOfProcess = BeginOfProcess();
+
+// The private files that this process made last: its own it may make again.
+struct OwnFile {
+    pid_t process;
+    struct statx file;
+};
+constexpr int kOwnFiles = 16;
+constinit Mutex ownFilesMutex;  // guards both; nothing is taken inside
+OwnFile ownFiles[kOwnFiles];
+unsigned ownFilesMade = 0;
+
+void RememberOwn(int descriptor) {
+    OwnFile made = {systemCalls.getpid(), {}};
+    if (systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_INO, &made.file) != 0) return;
+    MutexHolder holder(ownFilesMutex);
+    ownFiles[ownFilesMade++ % kOwnFiles] = made;
+}
+
+bool IsOwn(const struct statx& status) {
+    MutexHolder holder(ownFilesMutex);
+    for (const OwnFile& each : ownFiles) {
+        if (each.process == systemCalls.getpid() && SameFile(each.file, status)) return true;
+    }
+    return false;
+}
+
+bool IsOfThisTime(const struct statx& status) {
+    const statx_timestamp& time = status.stx_mtime;
+    if (time.tv_sec != beginOfProcess.tv_sec) return time.tv_sec > beginOfProcess.tv_sec;
+    return time.tv_nsec > beginOfProcess.tv_nsec;
+}
+
+// Holds what has a name while it makes way for a new file, so that of two only one removes it, and the other does not
+// take the new one for it.
+class OldFile {
+public:
+    OldFile() = default;
+    ~OldFile() {
+        const int error = errno;
+        if (descriptor_ >= 0) systemCalls.close(descriptor_);
+        errno = error;
+    }
+    OldFile(const OldFile&) = delete;
+    OldFile& operator=(const OldFile&) = delete;
+
+    // Removes what has the name, when it is this user's, no folder, and not in use. True also when there is nothing.
+    bool Remove(const char* native) {
+        struct statx status;
+        if (!StatusOf(native, Links::kThemselves, STATX_BASIC_STATS, status)) return errno == ENOENT || FailErrno();
+        if (S_ISDIR(status.stx_mode) || status.stx_uid != systemCalls.geteuid()) return FailWith(kErrorAccessDenied);
+        if (S_ISREG(status.stx_mode) && !Hold(native)) return false;
+        return systemCalls.unlink(native) == 0 || errno == ENOENT || FailErrno();
+    }
+
+private:
+    bool Hold(const char* native) {
+        struct statx held, named;
+        descriptor_ = OpenAtOnce(native, O_RDWR | O_NOFOLLOW);
+        if (descriptor_ < 0) return FailErrno();
+        const bool taken = MarkBytes(descriptor_, F_WRLCK, kWriterMark, 1) == Marking::kRefused;
+        if (systemCalls.statx(descriptor_, "", AT_EMPTY_PATH, STATX_BASIC_STATS, &held) != 0) return FailErrno();
+        if (taken || (IsOfThisTime(held) && !IsOwn(held))) return FailWith(kErrorSharingViolation);
+        const bool same = StatusOf(native, Links::kThemselves, STATX_INO, named) && SameFile(held, named);
+        return same || FailWith(kErrorSharingViolation);
+    }
+
+    int descriptor_ = -1;
+};
 
 }  // namespace
 
@@ -161,24 +264,27 @@ FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, 
     int flags = creates ? O_CREAT : 0;
     if (disposition == Disposition::kCreateNew) flags |= O_EXCL;
 
-    int descriptor = -1;
-    bool readable = true;
+    int descriptor = kNotAdmitted;
     auto open = [&](const std::string& native) {
-        descriptor = OpenDescriptor(native.c_str(), access, flags, readable);
-        return descriptor >= 0;
+        descriptor = OpenAdmitted(native, access, deny, flags);
+        return descriptor != kNotOpened;
     };
     if (creates) {
         std::string native;
         if (!NameToNativeText(name, native)) return kNoFile;
         Match match = MatchOnDisk(native);
-        if (match == Match::kParentMissing) FailWith(kErrorPathNotFound);
-        if (match == Match::kParentMissing) return kNoFile;
+        if (match != Match::kAll && match != Match::kLastMissing) {
+            FailMatch(match);
+            return kNoFile;
+        }
         if (!open(native)) FailWith(errno == EEXIST ? kErrorFileExists : ErrorOfErrno(errno));
     } else if (!OnExistingItem(name, open)) {
         return kNoFile;
     }
     if (descriptor < 0) return kNoFile;
-    if (Admit(descriptor, access, deny, readable, empties)) return HandleOf(descriptor, access);
+    if (!empties || Truncate(descriptor, 0) || errno == EINVAL)
+        return HandleOf(descriptor, access);  // EINVAL: a device
+    FailErrno();
     systemCalls.close(descriptor);
     return kNoFile;
 }
@@ -186,13 +292,45 @@ FileHandle FileOpen(const char* name, std::uint32_t access, std::uint32_t deny, 
 FileHandle FileCreatePrivate(const char* name, std::uint32_t access) {
     std::string native;
     if (!NameToNativeText(name, native)) return kNoFile;
-    MatchOnDisk(native);
-    if (!RemoveOwn(native.c_str())) return kNoFile;
+    Match match = MatchOnDisk(native);
+    if (match != Match::kAll && match != Match::kLastMissing) {
+        FailMatch(match);
+        return kNoFile;
+    }
+    OldFile old;
+    if (!old.Remove(native.c_str())) return kNoFile;
     // Whoever puts something there in between is refused, a link too.
     const int descriptor = OpenAtOnce(native.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
-    if (descriptor >= 0) return HandleOf(descriptor, access);
-    FailWith(errno == EEXIST ? kErrorAccessDenied : ErrorOfErrno(errno));
-    return kNoFile;
+    if (descriptor < 0) {
+        FailWith(errno == EEXIST ? kErrorSharingViolation : ErrorOfErrno(errno));
+        return kNoFile;
+    }
+    MarkBytes(descriptor, F_WRLCK, kWriterMark, 1);
+    RememberOwn(descriptor);
+    return HandleOf(descriptor, access);
+}
+
+std::FILE* FileOpenStream(const char* name, bool append) {
+    std::string native;
+    if (!NameToNativeText(name, native)) return nullptr;
+    const Match match = MatchOnDisk(native);
+    if (match != Match::kAll && match != Match::kLastMissing) {
+        FailMatch(match);
+        return nullptr;
+    }
+    const int descriptor = OpenAtOnce(native.c_str(), O_WRONLY | O_CREAT | (append ? O_APPEND : 0));
+    if (descriptor < 0) {
+        FailWith(errno == ENXIO ? kErrorAccessDenied : ErrorOfErrno(errno));  // a pipe that nobody reads
+        return nullptr;
+    }
+    struct statx status;
+    const bool known = systemCalls.statx(descriptor, "", AT_EMPTY_PATH, STATX_TYPE, &status) == 0 || FailErrno();
+    const bool usable = known && CheckKind(descriptor, status.stx_mode) &&
+                        (append || Truncate(descriptor, 0) || errno == EINVAL || FailErrno());
+    std::FILE* stream = usable ? ::fdopen(descriptor, append ? "a" : "w") : nullptr;
+    if (usable && !stream) FailErrno();
+    if (!stream) systemCalls.close(descriptor);
+    return stream;
 }
 
 bool FileClose(FileHandle file) {
@@ -252,31 +390,7 @@ bool FileReserve(FileHandle file, std::int64_t size) {
 
 bool FileFlush(FileHandle file) {
     const int result = Retry([&] { return systemCalls.fsync(DescriptorOf(file)); });
-    return result == 0 || errno == EINVAL || errno == EROFS || FailErrno();  // both: there is no device to wait for
-}
-
-// ---- mapping --------------------------------------------------------------------------------------------------------
-
-bool FileMap(FileHandle file, const void*& data, std::size_t& size) {
-    data = nullptr;
-    size = 0;
-    if (!HasAccess(file, kRead)) return FailWith(file ? kErrorAccessDenied : kErrorInvalidHandle);
-    std::int64_t bytes = 0;
-    if (!FileSize(file, bytes)) return false;
-    if (bytes == 0) return FailWith(kErrorFileInvalid);
-    if (static_cast<std::uint64_t>(bytes) > std::numeric_limits<std::size_t>::max()) {
-        return FailWith(kErrorNotEnoughMemory);
-    }
-    std::size_t count = static_cast<std::size_t>(bytes);
-    void* view = systemCalls.mmap(nullptr, count, PROT_READ, MAP_SHARED, DescriptorOf(file), 0);
-    if (view == MAP_FAILED) return FailErrno();
-    data = view;
-    size = count;
-    return true;
-}
-
-bool FileUnmap(const void* data, std::size_t size) {
-    return systemCalls.munmap(const_cast<void*>(data), size) == 0 || FailErrno();
+    return result == 0 || errno == EINVAL || FailErrno();  // EINVAL: there is no device to wait for
 }
 
 // ---- range locks ----------------------------------------------------------------------------------------------------

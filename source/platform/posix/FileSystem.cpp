@@ -1,16 +1,19 @@
 #include "platform/FileSystem.h"
 
+#include "platform/posix/Copying.h"
 #include "platform/posix/FileHandles.h"
+#include "platform/posix/Folders.h"
 #include "platform/posix/Interrupted.h"
 #include "platform/posix/NativeNames.h"
+#include "platform/posix/TextFile.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <errno.h>
 #include <linux/fs.h>
 #include <memory>
-#include <new>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -67,6 +70,28 @@ bool FileGetInfo(FileHandle file, ItemInfo& info) {
     FillInfo(status, info);
     unsigned char bytes[8];
     TakeCreated(bytes, systemCalls.fgetxattr(descriptor, kCreatedAttribute, bytes, sizeof bytes), info);
+    return true;
+}
+
+FileVersion VersionOfStatus(const struct statx& status) {
+    const std::uint64_t device = std::uint64_t{status.stx_dev_major} << 32 | status.stx_dev_minor;
+    return {device, status.stx_ino, static_cast<std::int64_t>(status.stx_size), status.stx_mtime.tv_sec,
+            status.stx_mtime.tv_nsec};
+}
+
+bool ItemGetVersion(const char* name, FileVersion& version) {
+    return OnExistingItem(name, [&](const std::string& native) {
+        struct statx status;
+        if (!StatusOf(native, Links::kFollowed, kVersionMask, status)) return false;
+        version = VersionOfStatus(status);
+        return true;
+    });
+}
+
+bool FileGetVersion(FileHandle file, FileVersion& version) {
+    struct statx status;
+    if (systemCalls.statx(DescriptorOf(file), "", AT_EMPTY_PATH, kVersionMask, &status) != 0) return FailErrno();
+    version = VersionOfStatus(status);
     return true;
 }
 
@@ -135,7 +160,7 @@ bool FolderCreate(const char* name) {
     if (!NameToNativeText(name, native)) return false;
     Match match = MatchOnDisk(native);
     if (match == Match::kAll) return FailWith(kErrorAlreadyExists);
-    if (match == Match::kParentMissing) return FailWith(kErrorPathNotFound);
+    if (match != Match::kLastMissing) return FailMatch(match);
     return systemCalls.mkdir(native.c_str(), 0777) == 0 || FailErrno();
 }
 
@@ -165,126 +190,63 @@ bool FileDelete(const char* name) {
 
 // ---- moving and copying ---------------------------------------------------------------------------------------------
 
-namespace {
-
-// For file systems that cannot rename without replacing. A file is linked under its new name first, which fails when
-// that is taken; for a folder, which cannot be linked, there is a moment between the look and the renaming.
+// A file is linked under its new name, which fails when that is taken; a folder cannot be linked.
 bool RenameWithoutReplacing(const std::string& from, const std::string& to) {
     if (systemCalls.renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), RENAME_NOREPLACE) == 0) return true;
     if (errno != EINVAL && errno != ENOSYS) return false;
     if (systemCalls.link(from.c_str(), to.c_str()) == 0) return systemCalls.unlink(from.c_str()) == 0;
     if (errno == EEXIST || errno == EXDEV) return false;
-    if (Exists(to)) {
-        errno = EEXIST;
-        return false;
-    }
+    if (Exists(to)) errno = EEXIST;
+    if (errno != ENOENT) return false;
     return systemCalls.renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), 0) == 0;
 }
 
+namespace {
+
 bool SameItem(const std::string& a, const std::string& b) {
     struct statx first, second;
-    constexpr unsigned mask = STATX_INO;
-    if (!StatusOf(a, Links::kThemselves, mask, first) || !StatusOf(b, Links::kThemselves, mask, second)) return false;
-    return first.stx_ino == second.stx_ino && first.stx_dev_major == second.stx_dev_major &&
-           first.stx_dev_minor == second.stx_dev_minor;
+    return StatusOf(a, Links::kThemselves, STATX_INO, first) && StatusOf(b, Links::kThemselves, STATX_INO, second) &&
+           SameFile(first, second);
 }
 
-bool MoveAcross(const std::string& native, const char* from, const char* to) {
-    if (IsFolder(native, Links::kThemselves)) return FailWith(kErrorNotSameDevice);
-    return FileCopy(from, to) && FileDelete(from);
+// Puts a rename onto the device, or takes it back. False with errno.
+bool FlushRename(const std::string& from, const std::string& to) {
+    const std::string source = NativeParent(from), target = NativeParent(to);
+    if (FlushFolder(target) && (source == target || FlushFolder(source))) return true;
+    const int error = errno;
+    RenameWithoutReplacing(to, from);
+    errno = error;
+    return false;
+}
+
+bool Rename(const std::string& source, const std::string& wanted, bool otherSpelling) {
+    if (RenameWithoutReplacing(source, wanted)) return FlushRename(source, wanted);
+    // A file system that ignores case itself takes the new spelling for a name that is taken.
+    const bool itself = errno == EEXIST && otherSpelling && SameItem(source, wanted);
+    if (!itself || systemCalls.renameat2(AT_FDCWD, source.c_str(), AT_FDCWD, wanted.c_str(), 0) != 0) return false;
+    return FlushRename(source, wanted);
 }
 
 }  // namespace
 
 bool ItemRename(const char* from, const char* to) {
-    std::string source, target, respelled;
+    std::string source, target;
     if (!NameToAbsoluteNative(from, source) || !NameToAbsoluteText(to, target)) return false;
-    respelled = target;
+    std::string respelled = target;
     Match match = MatchOnDisk(respelled);
-    if (match == Match::kParentMissing) return FailWith(kErrorPathNotFound);
-    bool otherSpelling = match == Match::kAll && respelled == source;
-    if (match == Match::kAll && !otherSpelling) return FailWith(kErrorAlreadyExists);
     // The parent as on the disk, the last part as the caller wants it.
     std::string wanted = NativeParent(respelled);
-    if (wanted != "/") wanted += '/';
-    wanted += NativeLast(target);
-    if (wanted == source || RenameWithoutReplacing(source, wanted)) return true;
-    if (errno == EXDEV) return MoveAcross(source, from, to);
-    // A file system that ignores case itself takes the new spelling for a name that is taken.
-    bool itself = errno == EEXIST && otherSpelling && SameItem(source, wanted);
-    if (itself && systemCalls.renameat2(AT_FDCWD, source.c_str(), AT_FDCWD, wanted.c_str(), 0) == 0) return true;
-    return FailErrno();
-}
-
-namespace {
-
-// One file handle for a scope.
-class OpenedFile {
-public:
-    OpenedFile(const char* name, std::uint32_t access, std::uint32_t deny, Disposition disposition)
-        : handle_(FileOpen(name, access, deny, disposition)) {}
-    ~OpenedFile() { Close(); }
-    OpenedFile(const OpenedFile&) = delete;
-    OpenedFile& operator=(const OpenedFile&) = delete;
-
-    FileHandle Get() const { return handle_; }
-    bool Close() {
-        FileHandle closing = handle_;
-        handle_ = kNoFile;
-        return closing == kNoFile || FileClose(closing);
+    {
+        const FolderTurn turn(wanted);
+        if (match == Match::kLastMissing) match = MatchOnDisk(respelled);
+        if (match == Match::kParentMissing || match == Match::kFailed) return FailMatch(match);
+        const bool otherSpelling = match == Match::kAll && respelled == source;
+        if (match == Match::kAll && !otherSpelling) return FailWith(kErrorAlreadyExists);
+        if (wanted != "/") wanted += '/';
+        wanted += NativeLast(target);
+        if (wanted == source || Rename(source, wanted, otherSpelling)) return true;
     }
-
-private:
-    FileHandle handle_;
-};
-
-bool CopyThroughBuffer(FileHandle from, FileHandle to) {
-    constexpr std::size_t kBufferSize = 128 * 1024;
-    std::unique_ptr<char[]> buffer(new (std::nothrow) char[kBufferSize]);
-    if (!buffer) return FailWith(kErrorNotEnoughMemory);
-    std::size_t count = 0, written = 0;
-    do {
-        if (!FileRead(from, buffer.get(), kBufferSize, count) || !FileWrite(to, buffer.get(), count, written))
-            return false;
-    } while (count == kBufferSize);
-    return true;
-}
-
-// Lets the kernel copy as long as it gets on; the rest, or what it cannot copy at all, goes through a buffer.
-bool CopyBytes(FileHandle from, FileHandle to) {
-    constexpr std::size_t kAtOnce = std::size_t{1} << 30;
-    ssize_t moved;
-    do {
-        moved = systemCalls.copy_file_range(DescriptorOf(from), nullptr, DescriptorOf(to), nullptr, kAtOnce, 0);
-    } while (moved > 0 || (moved < 0 && errno == EINTR));
-    if (moved < 0 && (errno == ENOSPC || errno == EDQUOT || errno == EIO)) return FailErrno();
-    return CopyThroughBuffer(from, to);
-}
-
-bool CopyInto(FileHandle source, FileHandle target) {
-    if (!CopyBytes(source, target)) return false;
-    struct statx status;
-    if (systemCalls.statx(DescriptorOf(source), "", AT_EMPTY_PATH, kInfoMask, &status) != 0) return FailErrno();
-    timespec times[2]{};
-    times[0].tv_nsec = UTIME_OMIT;
-    times[1].tv_sec = static_cast<time_t>(status.stx_mtime.tv_sec);
-    times[1].tv_nsec = static_cast<long>(status.stx_mtime.tv_nsec);
-    if (systemCalls.futimens(DescriptorOf(target), times) != 0) return FailErrno();
-    return systemCalls.fchmod(DescriptorOf(target), status.stx_mode & 0777u) == 0 || FailErrno();
-}
-
-}  // namespace
-
-bool FileCopy(const char* from, const char* to) {
-    OpenedFile source(from, kRead, 0, Disposition::kOpenExisting);
-    if (source.Get() == kNoFile) return false;
-    OpenedFile target(to, kWrite, kRead | kWrite, Disposition::kCreateNew);
-    if (target.Get() == kNoFile) return false;
-    bool copied = CopyInto(source.Get(), target.Get());
-    if (target.Close() && copied) return true;
-    ErrorNumber reason = LastError();
-    FileDelete(to);
-    return FailWith(reason);
+    return errno == EXDEV ? MoveAcross(source, from, to) : FailErrno();
 }
 
 // ---- permissions ----------------------------------------------------------------------------------------------------
@@ -305,15 +267,14 @@ bool ItemSetReadOnly(const char* name, bool readOnly) {
 }
 
 std::uint32_t PermissionMask() {
-    std::unique_ptr<FILE, int (*)(FILE*)> status(std::fopen("/proc/self/status", "re"), std::fclose);
-    char line[256];
+    std::string status;
+    ReadTextFile("/proc/self/status", status);
+    const std::size_t line = std::min(status.find("Umask:"), status.size());
     unsigned mask = 0;
-    while (status && std::fgets(line, sizeof line, status.get())) {
-        if (std::sscanf(line, "Umask: %o", &mask) == 1) return mask;
-    }
+    if (std::sscanf(status.c_str() + line, "Umask: %o", &mask) == 1) return mask;
     // Without /proc it can only be read by setting it.
-    mask = ::umask(0);
-    ::umask(static_cast<mode_t>(mask));
+    mask = systemCalls.umask(0);
+    systemCalls.umask(static_cast<mode_t>(mask));
     return mask;
 }
 

@@ -21,7 +21,8 @@ std::string AccountHome() {
     passwd account{};
     passwd* found = nullptr;
     char buffer[2048];
-    bool known = getpwuid_r(::getuid(), &account, buffer, sizeof buffer, &found) == 0 && found && *found->pw_dir == '/';
+    bool known = getpwuid_r(systemCalls.getuid(), &account, buffer, sizeof buffer, &found) == 0 && found &&
+                 *found->pw_dir == '/';
     return known ? found->pw_dir : "/";
 }
 
@@ -39,16 +40,45 @@ std::string XdgFolder(const char* variable, const char* underHome) {
     return (home == "/" ? home : home + "/") + underHome;
 }
 
+bool FlushFolder(int folder) {
+    // Some file systems cannot flush a folder, and then need not.
+    return Retry([&] { return systemCalls.fsync(folder); }) == 0 || errno == EINVAL;
+}
+
+bool FlushFolder(const std::string& native) {
+    const int folder = OpenRetrying(native.c_str(), O_RDONLY | O_DIRECTORY);
+    if (folder < 0) return false;
+    const bool flushed = FlushFolder(folder);
+    const int error = errno;
+    systemCalls.close(folder);
+    errno = error;
+    return flushed;
+}
+
+namespace {
+
+bool MakeFolder(const std::string& native, unsigned mode) {
+    if (systemCalls.mkdir(native.c_str(), static_cast<mode_t>(mode)) != 0) return false;
+    if (FlushFolder(NativeParent(native))) return true;
+    const int error = errno;
+    systemCalls.rmdir(native.c_str());
+    errno = error;
+    return false;
+}
+
+}  // namespace
+
 bool MakeFolders(const std::string& native, unsigned mode) {
-    if (systemCalls.mkdir(native.c_str(), static_cast<mode_t>(mode)) == 0) return true;
+    if (MakeFolder(native, mode)) return true;
     if (errno == EEXIST) {
-        if (IsFolder(native, Links::kFollowed)) return true;
+        struct statx status;
+        if (!StatusOf(native, Links::kFollowed, STATX_TYPE, status)) return false;
         errno = ENOTDIR;
-        return false;
+        return S_ISDIR(status.stx_mode);
     }
     std::string parent = NativeParent(native);
     if (errno != ENOENT || parent == native || !MakeFolders(parent, mode)) return false;
-    return systemCalls.mkdir(native.c_str(), static_cast<mode_t>(mode)) == 0 || errno == EEXIST;
+    return MakeFolder(native, mode) || errno == EEXIST;
 }
 
 }  // namespace tessel::platform

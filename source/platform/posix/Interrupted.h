@@ -57,6 +57,11 @@ inline bool ReadAll(int file, void* to, std::size_t count, std::size_t& done) {
     return true;
 }
 
+// Whether a failure says that there is no such item, rather than that the host could not look.
+inline bool IsAbsence(int error) {
+    return error == ENOENT || error == ENOTDIR;
+}
+
 // Of a name that is a link: what it leads to, or the link itself.
 enum class Links { kFollowed, kThemselves };
 
@@ -66,6 +71,7 @@ inline bool StatusOf(const std::string& native, Links links, unsigned mask, stru
 }
 
 // Of a link: the link itself.
+// False with errno: only IsAbsence says that it is not there.
 inline bool Exists(const std::string& native) {
     struct statx status;
     return StatusOf(native, Links::kThemselves, STATX_TYPE, status);
@@ -76,16 +82,28 @@ inline bool IsFolder(const std::string& native, Links links) {
     return StatusOf(native, links, STATX_TYPE, status) && S_ISDIR(status.stx_mode);
 }
 
+// Calls visit(listing, entry) for each entry, `.` and `..` too, until it returns false. False with errno when not all
+// could be had.
+template <typename Visitor>
+bool VisitListing(DIR* listing, Visitor visit) {
+    for (;;) {
+        errno = 0;
+        const dirent* entry = systemCalls.readdir(listing);
+        if (!entry && errno == EINTR) continue;
+        if (!entry) return errno == 0;
+        if (!visit(listing, *entry)) return true;
+    }
+}
+
 // Calls visit(listing, entry) for each entry of a folder, `.` and `..` too, until it returns false. False with errno
 // when the folder cannot be listed, or not to its end.
 template <typename Visitor>
 bool VisitFolder(const std::string& native, Visitor visit) {
-    const std::unique_ptr<DIR, int (*)(DIR*)> listing(systemCalls.opendir(native.c_str()), systemCalls.closedir);
-    if (!listing) return false;
-    for (errno = 0; const dirent* entry = systemCalls.readdir(listing.get()); errno = 0) {
-        if (!visit(listing.get(), *entry)) return true;
-    }
-    return errno == 0;
+    DIR* opened = nullptr;
+    do opened = systemCalls.opendir(native.c_str());
+    while (!opened && errno == EINTR);
+    const std::unique_ptr<DIR, int (*)(DIR*)> listing(opened, systemCalls.closedir);
+    return listing && VisitListing(listing.get(), visit);
 }
 
 }  // namespace tessel::platform

@@ -37,7 +37,7 @@ constexpr ErrnoRow kErrnoRows[] = {
     {EBADF, kErrorInvalidHandle},
     {EINVAL, kErrorInvalidParameter},
     {ESRCH, kErrorInvalidParameter},
-    {ENAMETOOLONG, kErrorNameTooLong},
+    {ENAMETOOLONG, kErrorInvalidName},
     {EXDEV, kErrorNotSameDevice},
     {ESPIPE, kErrorSeek},
     {EFBIG, kErrorFileTooLarge},
@@ -65,6 +65,18 @@ constexpr ErrnoRow kErrnoRows[] = {
 };
 
 }  // namespace
+
+const char* ErrorText(ErrorNumber number) noexcept {
+    switch (number) {
+#define TESSEL_ERROR_TEXT(name, value, text) \
+    case value:                              \
+        return text;
+        TESSEL_ERROR_NUMBERS(TESSEL_ERROR_TEXT)
+#undef TESSEL_ERROR_TEXT
+        default:
+            return "unknown error";
+    }
+}
 
 ErrorNumber LastError() noexcept {
     return lastError;

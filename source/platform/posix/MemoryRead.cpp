@@ -23,7 +23,7 @@ pid_t OwnProcess() {
     pid_t known = processId.load(std::memory_order_relaxed);
     if (known) return known;
     static const int registered = pthread_atfork(nullptr, nullptr, [] { processId = 0; });
-    pid_t own = ::getpid();
+    pid_t own = systemCalls.getpid();
     if (registered == 0) processId.store(own, std::memory_order_relaxed);
     return own;
 }
@@ -90,6 +90,34 @@ std::size_t ReadMemory(const void* from, void* to, std::size_t count) noexcept {
     if (outcome == Outcome::kRefused) total += ReadThroughPipe(source + total, target + total, count - total);
     errno = savedError;
     return total;
+}
+
+bool ReadablePages::CoverPage(std::uintptr_t page) noexcept {
+    std::uintptr_t& known = known_[page % known_.size()];
+    char byte;
+    if (page == 0 || (known != page && ReadMemory(reinterpret_cast<const void*>(page * kPage), &byte, 1) != 1))
+        return false;
+    known = page;
+    return true;
+}
+
+bool ReadablePages::Cover(const void* from, std::size_t count) noexcept {
+    const auto first = reinterpret_cast<std::uintptr_t>(from);
+    if (count == 0) return true;
+    if (first + (count - 1) < first) return false;
+    for (std::uintptr_t page = first / kPage; page <= (first + (count - 1)) / kPage; ++page)
+        if (!CoverPage(page)) return false;
+    return true;
+}
+
+// What is read may lie between the objects that a sanitizer knows.
+__attribute__((no_sanitize("address", "thread", "undefined"))) bool ReadablePages::Read(const void* from, void* to,
+                                                                                        std::size_t count) noexcept {
+    if (!Cover(from, count)) return false;
+    const auto source = static_cast<const volatile unsigned char*>(from);
+    const auto target = static_cast<unsigned char*>(to);
+    for (std::size_t i = 0; i < count; ++i) target[i] = source[i];
+    return true;
 }
 
 }  // namespace tessel::platform

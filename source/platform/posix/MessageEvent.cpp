@@ -38,18 +38,18 @@ std::uint64_t StartOf(ThreadId thread) {
     return at ? std::strtoull(at, nullptr, 10) : 0;
 }
 
-constinit Mutex sourcesMutex;  // guards the list; nothing is taken inside but what an event takes
-constinit Source* sources = nullptr;
+constinit Mutex sourcesMutex;  // nothing is taken inside but what an event takes
+constinit Source* sources TESSEL_GUARDED_BY(sourcesMutex) = nullptr;
 
-// The link that holds the thread's source, or the one at the end; under the mutex.
-Source** Find(ThreadId thread) {
+// The link that holds the thread's source, or the one at the end.
+Source** Find(ThreadId thread) TESSEL_REQUIRES(sourcesMutex) {
     Source** link = &sources;
     while (*link && (*link)->thread != thread) link = &(*link)->next;
     return link;
 }
 
 // An earlier thread of that number may have left one that was signaled and never asked for.
-Source* FindOrMake(ThreadId thread) {
+Source* FindOrMake(ThreadId thread) TESSEL_REQUIRES(sourcesMutex) {
     Source** link = Find(thread);
     std::uint64_t start = StartOf(thread);
     if (!*link) *link = new (std::nothrow) Source{thread, start, nullptr, Event()};

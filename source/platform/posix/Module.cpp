@@ -1,8 +1,8 @@
 #include "platform/Module.h"
 
 #include "platform/posix/ElfSymbols.h"
+#include "platform/posix/Interrupted.h"
 #include "platform/posix/NativeNames.h"
-#include "platform/posix/SystemCalls.h"
 
 #include <cstdlib>
 #include <cxxabi.h>
@@ -92,15 +92,6 @@ bool ModuleFileName(ModuleHandle module, std::string& name) {
     return file.empty() ? FailWith(kErrorModuleNotFound) : NativeToName(file, name);
 }
 
-std::vector<ModuleEntry> ModuleList(std::size_t most) {
-    std::vector<ModuleEntry> modules;
-    ForEachModule([&](ModuleHandle base, const char* moduleName) {
-        if (modules.size() < most) modules.push_back({NameFromDisk(NativeLast(FileOf(moduleName))), base});
-        return modules.size() < most;
-    });
-    return modules;
-}
-
 bool DescribeAddress(const void* address, AddressEntry& entry) {
     Dl_info info{};
     entry = {};
@@ -131,6 +122,13 @@ LibraryHandle LibraryLoad(const char* name) {
     std::string file = name;
     bool plain = file.find_first_of("\\/:") == std::string::npos;
     if (!plain && !NameToNative(name, file)) return nullptr;
+    // The loader would wait for a pipe.
+    struct statx status;
+    const bool isThere = !plain && StatusOf(file, Links::kFollowed, STATX_TYPE, status);
+    if (isThere && !S_ISREG(status.stx_mode)) {
+        FailWith(kErrorModuleNotFound);
+        return nullptr;
+    }
     void* library = dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL);
     if (!library) FailWith(kErrorModuleNotFound);
     return library;

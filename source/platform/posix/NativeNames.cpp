@@ -70,29 +70,40 @@ bool EqualNames(std::string_view a, std::string_view b) noexcept {
 
 // ---- matching on the disk -------------------------------------------------------------------------------------------
 
-bool FindInFolder(const std::string& folder, std::string_view name, std::string& found) {
+// The entry of `folder` that is `name`, exactly or in another case. The first in byte order where several are, so that
+// the answer does not hang on the order of the listing.
+static bool FindInFolder(const std::string& folder, std::string_view name, std::string& found) {
     found.clear();
-    VisitFolder(folder, [&](DIR*, const dirent& entry) {
+    return VisitFolder(folder, [&](DIR*, const dirent& entry) {
         const bool exact = name == entry.d_name;
         if (exact || (EqualNames(name, entry.d_name) && (found.empty() || found > entry.d_name))) found = entry.d_name;
         return !exact;
     });
-    return !found.empty();
 }
 
 Match MatchOnDisk(std::string& native) {
     if (Exists(native)) return Match::kAll;
+    if (!IsAbsence(errno)) return Match::kFailed;
     std::string parent = NativeParent(native);
     std::string last(NativeLast(native));
     if (last.empty() || parent == native) return Match::kParentMissing;
-    bool parentThere = MatchOnDisk(parent) == Match::kAll;
+    Match above = MatchOnDisk(parent);
+    if (above == Match::kFailed) return above;
     std::string found;
-    bool there = parentThere && FindInFolder(parent, last, found);
+    if (above == Match::kAll && !FindInFolder(parent, last, found)) {
+        if (!IsAbsence(errno)) return Match::kFailed;
+        above = Match::kParentMissing;  // a file, or gone meanwhile
+    }
     bool hasFolder = native.find('/') != std::string::npos;
     native = !hasFolder ? "" : parent == "/" ? parent : parent + "/";
-    native += there ? found : last;
-    if (there) return Match::kAll;
-    return parentThere && IsFolder(parent, Links::kFollowed) ? Match::kLastMissing : Match::kParentMissing;
+    native += found.empty() ? last : found;
+    if (!found.empty()) return Match::kAll;
+    return above == Match::kAll ? Match::kLastMissing : Match::kParentMissing;
+}
+
+bool FailMatch(Match match) noexcept {
+    if (match == Match::kFailed) return FailErrno();
+    return FailWith(match == Match::kLastMissing ? kErrorFileNotFound : kErrorPathNotFound);
 }
 
 bool NameToAbsoluteText(std::string_view name, std::string& native) {
@@ -106,8 +117,7 @@ bool NameToAbsoluteText(std::string_view name, std::string& native) {
 bool NameToAbsoluteNative(const char* name, std::string& native) {
     if (!NameToAbsoluteText(name, native)) return false;
     Match match = MatchOnDisk(native);
-    if (match == Match::kAll) return true;
-    return FailWith(match == Match::kLastMissing ? kErrorFileNotFound : kErrorPathNotFound);
+    return match == Match::kAll || FailMatch(match);
 }
 
 }  // namespace tessel::platform

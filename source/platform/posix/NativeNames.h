@@ -4,6 +4,7 @@
 
 #include "platform/DriveTable.h"
 #include "platform/posix/Errors.h"
+#include "platform/posix/Interrupted.h"
 
 #include <errno.h>
 #include <string>
@@ -11,20 +12,20 @@
 
 namespace tessel::platform {
 
-enum class Match { kAll, kLastMissing, kParentMissing };
+// kFailed: the disk does not tell, errno says why. A look that failed is not one that found nothing.
+enum class Match { kAll, kLastMissing, kParentMissing, kFailed };
 
 // Respells the parts of `native` that exist on the disk in another case only.
 Match MatchOnDisk(std::string& native);
+
+// Sets LastError to what stands against an item that must exist, and returns false. Not for kAll.
+bool FailMatch(Match match) noexcept;
 
 // What NameToNativeText says, from the current folder on where it is relative.
 bool NameToAbsoluteText(std::string_view name, std::string& native);
 
 // The item that `name` names, spelled as on the disk and absolute. False with LastError when it is missing.
 bool NameToAbsoluteNative(const char* name, std::string& native);
-
-// The entry of `folder` that is `name`, exactly or in another case. The first in byte order where several are, so that
-// the answer does not hang on the order of the listing.
-bool FindInFolder(const std::string& folder, std::string_view name, std::string& found);
 
 // Equal but for case, of two names in UTF-8.
 bool EqualNames(std::string_view a, std::string_view b) noexcept;
@@ -49,12 +50,11 @@ bool OnExistingItem(std::string_view name, Operation operation) {
     std::string native;
     if (!NameToNativeText(name, native)) return false;
     if (operation(native)) return true;
-    if (errno != ENOENT && errno != ENOTDIR) return FailErrno();
+    if (!IsAbsence(errno)) return FailErrno();
     int error = errno;
     std::string asGiven = native;
     Match match = MatchOnDisk(native);
-    if (match == Match::kParentMissing) return FailWith(kErrorPathNotFound);
-    if (match == Match::kLastMissing) return FailWith(kErrorFileNotFound);
+    if (match != Match::kAll) return FailMatch(match);
     if (native == asGiven) return FailWith(ErrorOfErrno(error));
     return operation(native) || FailErrno();
 }

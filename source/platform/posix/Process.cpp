@@ -1,5 +1,6 @@
 #include "platform/Process.h"
 
+#include "platform/posix/SystemCalls.h"
 #include "platform/posix/TextFile.h"
 
 #include <cstdlib>
@@ -13,7 +14,7 @@ void ProcessExit(int status) noexcept {
 }
 
 std::uint32_t ProcessId() noexcept {
-    return static_cast<std::uint32_t>(::getpid());
+    return static_cast<std::uint32_t>(systemCalls.getpid());
 }
 
 std::vector<std::string> ProcessArguments() {

@@ -3,20 +3,19 @@
 #include "platform/CodePage.h"
 #include "platform/posix/Folders.h"
 #include "platform/posix/NativeNames.h"
-#include "platform/posix/SystemCalls.h"
+#include "platform/posix/RegistryStore.h"
 #include "platform/posix/TextFile.h"
 
 #include <algorithm>
+#include <atomic>
 #include <charconv>
 #include <climits>
 #include <cstdio>
 #include <cstdlib>
-#include <dirent.h>
 #include <errno.h>
-#include <memory>
+#include <linux/fs.h>
 #include <string_view>
 #include <unistd.h>
-#include <utility>
 #include <vector>
 
 // On the disk:
@@ -25,8 +24,8 @@
 //
 // A key is a folder of its name; a value is a file of its name behind `=`, so that the two never meet. `%` and two
 // hexadecimal digits stand for a byte that a file's name cannot have, or that would read as something else. Names that
-// begin with a dot belong to the store: its lock, and values being written. The 64-bit view is a store of its own in
-// the folder `.view64`.
+// begin with a dot belong to the store: its lock, and beside the keys of a root the folder `.aside`, in which values
+// and keys are on their way in or out. The 64-bit view is a store of its own in the folder `.view64`.
 //
 // A name too long for the host is `%~` and a hash of the name without regard to case; the name itself is in the file
 // `.name` of the key's folder, or in the value's file before the data. Keys may lie deeper than the host's longest path
@@ -39,9 +38,11 @@
 namespace tessel::platform {
 
 struct RegistryKey {
-    std::string store;   // the host's name of the folder that holds all
-    std::string folder;  // the host's name; that of a root need not exist
+    std::string store;       // the host's name of the folder that holds all
+    std::string rootFolder;  // of its root
+    std::string folder;      // the host's name; that of a root need not exist
     bool root, write;
+    mutable std::atomic<bool> wasThere;        // of a root's folder: when it is missing now, it has vanished
     mutable std::vector<std::string> listing;  // of the enumeration under way
 };
 
@@ -163,57 +164,7 @@ std::string StoreFolder() {
     return XdgFolder("XDG_CONFIG_HOME", ".config") + "/tessel/registry";
 }
 
-// Held by whoever changes the store, in whatever process: so no two make one name in two spellings, and no key goes
-// while a value is put into it. Where it cannot be had (a file system without locks) things go on without.
-class StoreLock {
-public:
-    explicit StoreLock(const std::string& store) {
-        if (!MakeFolders(store)) return;
-        file_ = systemCalls.open((store + "/.lock").c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0666);
-        struct flock range {};
-        range.l_type = F_WRLCK;
-        while (file_ >= 0 && systemCalls.lock(file_, F_OFD_SETLKW, &range) != 0 && errno == EINTR) {
-        }
-    }
-    ~StoreLock() {
-        if (file_ >= 0) systemCalls.close(file_);
-    }
-    StoreLock(const StoreLock&) = delete;
-    StoreLock& operator=(const StoreLock&) = delete;
-
-private:
-    int file_ = -1;
-};
-
 // ---- folders --------------------------------------------------------------------------------------------------------
-
-// A folder that is held open, to name what is in it from there. Without one, `Number` is -1 and errno said why.
-class Folder {
-public:
-    Folder() = default;
-    Folder(int from, const char* name, int flags)
-        : number_(systemCalls.openat(from, name, flags | O_DIRECTORY | O_CLOEXEC, 0)) {}
-    Folder(Folder&& other) noexcept : number_(std::exchange(other.number_, -1)) {}
-    Folder& operator=(Folder&& other) noexcept {
-        std::swap(number_, other.number_);
-        return *this;
-    }
-    ~Folder() {
-        const int error = errno;
-        if (number_ >= 0) systemCalls.close(number_);
-        errno = error;
-    }
-
-    explicit operator bool() const { return number_ >= 0; }
-    int Number() const { return number_; }
-
-    // A key's folder in this one. It is a folder itself: a link might lead out of the store, and what is deleted must
-    // lie within.
-    Folder Key(const std::string& name) const { return Folder(number_, name.c_str(), O_PATH | O_NOFOLLOW); }
-
-private:
-    int number_ = -1;
-};
 
 // Of a key, in steps of what the host takes at once. The user may have put a root elsewhere by a link.
 Folder FolderOf(const RegistryKey* key) {
@@ -227,110 +178,154 @@ Folder FolderOf(const RegistryKey* key) {
         from = folder.Number();
         path.remove_prefix(length + 1);
     }
-    return Folder(from, std::string(path).c_str(), key->root ? O_PATH : O_PATH | O_NOFOLLOW);
+    Folder last(from, std::string(path).c_str(), key->root ? O_PATH : O_PATH | O_NOFOLLOW);
+    if (last && key->root) key->wasThere = true;
+    return last;
 }
 
 bool IsMissing(int error) {
     return error == ENOENT || error == ENOTDIR || error == ELOOP;
 }
 
-// Of a key whose folder could not be opened: 1018 when somebody has deleted it meanwhile.
+// Of a key whose folder could not be opened: 1018 when it has been there, and is gone.
 ErrorNumber LostNumber() {
     return IsMissing(errno) ? kErrorKeyDeleted : ErrnoNumber();
 }
 
-bool Exists(const Folder& folder, const std::string& name) {
-    struct statx status;
-    return systemCalls.statx(folder.Number(), name.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0;
+// A root is always there, if only by name, as long as nothing has been put into it.
+bool IsUnmadeRoot(const RegistryKey* key) {
+    return key->root && !key->wasThere && IsMissing(errno);
 }
 
 enum class Kind { kKey, kValue, kOther };
 
-Kind KindOf(const Folder& folder, const dirent& entry) {
-    if (entry.d_name[0] == kValueMark) return Kind::kValue;
-    if (entry.d_name[0] == '.') return Kind::kOther;
-    const bool isFolder = entry.d_type == DT_DIR || (entry.d_type == DT_UNKNOWN && folder.Key(entry.d_name));
-    return isFolder ? Kind::kKey : Kind::kOther;
+// False with errno.
+bool KindOf(const Folder& folder, const dirent& entry, Kind& kind) {
+    kind = entry.d_name[0] == kValueMark ? Kind::kValue : Kind::kOther;
+    if (entry.d_name[0] == kValueMark || entry.d_name[0] == '.') return true;
+    bool isFolder = entry.d_type == DT_DIR;
+    if (entry.d_type == DT_UNKNOWN) {
+        isFolder = static_cast<bool>(folder.Key(entry.d_name));
+        if (!isFolder && !IsMissing(errno)) return false;
+    }
+    if (isFolder) kind = Kind::kKey;
+    return true;
 }
 
-// Calls visit(name on the disk, kind) for all that a key's folder holds.
+// Calls visit(name on the disk, kind) for all that a key's folder holds; visit returns an error number.
 template <typename Visitor>
-ErrorNumber VisitFolder(const Folder& folder, Visitor visit) {
-    const int number = systemCalls.openat(folder.Number(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC, 0);
-    if (number < 0) return ErrnoNumber();
-    std::unique_ptr<DIR, int (*)(DIR*)> listing(fdopendir(number), closedir);
-    if (!listing) {
-        const ErrorNumber error = ErrnoNumber();
-        systemCalls.close(number);
-        return error;
-    }
-    for (errno = 0; const dirent* entry = readdir(listing.get()); errno = 0) {
-        const std::string_view name = entry->d_name;
-        if (name != "." && name != "..") visit(name, KindOf(folder, *entry));
-    }
-    return errno == 0 ? kErrorSuccess : ErrnoNumber();
+ErrorNumber VisitItems(const Folder& folder, Visitor visit) {
+    ErrorNumber number = kErrorSuccess;
+    const bool all = folder.Visit([&](const dirent& entry) {
+        Kind kind;
+        if (number != kErrorSuccess) return;
+        number = KindOf(folder, entry, kind) ? visit(std::string_view(entry.d_name), kind) : ErrnoNumber();
+    });
+    return all || number != kErrorSuccess ? number : ErrnoNumber();
 }
 
-// Calls visit(folder, name on the disk, kind) for all that a key holds. A root is always there, if only by name.
+// Calls visit(folder, name on the disk, kind) for all that a key holds.
 template <typename Visitor>
 ErrorNumber VisitKey(const RegistryKey* key, Visitor visit) {
     const Folder folder = FolderOf(key);
-    if (!folder) return key->root && IsMissing(errno) ? kErrorSuccess : LostNumber();
-    return VisitFolder(folder, [&](std::string_view name, Kind kind) { visit(folder, name, kind); });
+    if (!folder) return IsUnmadeRoot(key) ? kErrorSuccess : LostNumber();
+    return VisitItems(folder, [&](std::string_view name, Kind kind) { return visit(folder, name, kind); });
 }
 
 // The item of `folder` with that name, in whatever case; the name as given where there is none. The first in byte order
-// where several are, so that the answer does not hang on the order of the listing.
-std::string ItemIn(const Folder& folder, const std::string& diskName) {
-    if (Exists(folder, diskName)) return diskName;
+// where several are, so that the answer does not hang on the order of the listing. False with errno when the folder
+// does not tell.
+bool ItemIn(const Folder& folder, const std::string& diskName, std::string& item) {
+    struct statx status;
+    item = diskName;
+    if (systemCalls.statx(folder.Number(), item.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0) return true;
+    if (!IsAbsence(errno)) return false;
     std::string found;
-    VisitFolder(folder, [&](std::string_view name, Kind) {
-        if (EqualNames(name, diskName) && (found.empty() || found > name)) found = name;
+    const bool listed = folder.Visit([&](const dirent& entry) {
+        if (EqualNames(entry.d_name, diskName) && (found.empty() || found > entry.d_name)) found = entry.d_name;
     });
-    return found.empty() ? diskName : found;
+    if (!found.empty()) item = found;
+    return listed;
 }
 
-// Deletes a folder with all that is in it. False with errno.
-bool DeleteFolder(const Folder& parent, const std::string& name) {
-    const Folder folder = parent.Key(name);
-    if (!folder) return false;
-    std::vector<std::string> items;
-    VisitFolder(folder, [&](std::string_view item, Kind) { items.emplace_back(item); });
-    for (const std::string& item : items) {
-        const bool deleted = systemCalls.unlinkat(folder.Number(), item.c_str(), 0) == 0 || errno == ENOENT ||
-                             (errno == EISDIR && DeleteFolder(folder, item));
-        if (!deleted) return false;
+// ---- on the way in --------------------------------------------------------------------------------------------------
+
+// Writes a new file in `folder` and puts it onto the device, with the permissions and the owner of `like` where it is
+// given. False with errno; then there is none.
+bool WriteFile(const Folder& folder, const std::string& name, const std::string& text, const struct statx* like) {
+    const int flags = O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW;
+    const int file = OpenAtRetrying(folder.Number(), name.c_str(), flags, like ? 0600 : 0666);
+    if (file < 0) return false;
+    std::size_t done = 0;
+    bool written = WriteAll(file, text.data(), text.size(), done);
+    if (written && like) {
+        // Not everybody may give a file away: then it is the writer's, as the old one would be for one who may.
+        written = systemCalls.fchown(file, like->stx_uid, like->stx_gid) == 0 || errno == EPERM;
+        written = written && systemCalls.fchmod(file, like->stx_mode & 07777u) == 0;
     }
-    return systemCalls.unlinkat(parent.Number(), name.c_str(), AT_REMOVEDIR) == 0;
+    written = written && Retry([&] { return systemCalls.fsync(file); }) == 0;
+    int error = errno;
+    if (systemCalls.close(file) != 0 && written && errno != EINTR) {
+        written = false;
+        error = errno;
+    }
+    if (!written) systemCalls.unlinkat(folder.Number(), name.c_str(), 0);
+    errno = error;
+    return written;
 }
 
-// Makes a key's folder. One with a long name is made under another, and takes its own when that stands in it: nobody
-// ever sees a key without its name.
-bool MakeKeyFolder(const Folder& parent, const KeyName& part) {
-    if (!IsHashed(part.disk)) return systemCalls.mkdirat(parent.Number(), part.disk.c_str(), 0777) == 0;
-    const std::string unfinished = ".making" + part.disk;
-    DeleteFolder(parent, unfinished);  // of a process that ended on the way
-    if (systemCalls.mkdirat(parent.Number(), unfinished.c_str(), 0777) != 0) return false;
-    const Folder folder = parent.Key(unfinished);
-    if (folder && ReplaceFile(kNameFile, part.name, folder.Number()) &&
-        systemCalls.renameat2(parent.Number(), unfinished.c_str(), parent.Number(), part.disk.c_str(), 0) == 0)
-        return true;
+// Gives what lies aside under `name` its place, for good. What had the place lies aside then. It stays where it was,
+// and what is aside is deleted, when that cannot be put onto the device. False with errno.
+bool TakePlace(Aside& aside, const std::string& name, const Folder& folder, const std::string& item, bool replaces) {
+    const int from = aside.Place().Number(), to = folder.Number();
+    unsigned flags = replaces ? RENAME_EXCHANGE : 0;
+    bool placed = systemCalls.renameat2(from, name.c_str(), to, item.c_str(), flags) == 0;
+    if (!placed && replaces && (errno == EINVAL || errno == ENOSYS)) {  // a file system that cannot exchange names
+        flags = 0;
+        placed = systemCalls.renameat2(from, name.c_str(), to, item.c_str(), flags) == 0;
+    }
+    const bool flushed = placed && folder.Flush() && aside.Place().Flush();
     const int error = errno;
-    DeleteFolder(parent, unfinished);
+    const bool mayGoBack = !replaces || flags != 0;
+    if (placed && !flushed && mayGoBack) systemCalls.renameat2(to, item.c_str(), from, name.c_str(), flags);
+    aside.Empty();
+    errno = error;
+    return flushed;
+}
+
+// Makes a key's folder. One with a long name is made aside, and takes its place when that stands in it: nobody ever
+// sees a key without its name.
+bool MakeKeyFolder(Aside& aside, const Folder& parent, const KeyName& part) {
+    if (!IsHashed(part.disk)) {
+        if (systemCalls.mkdirat(parent.Number(), part.disk.c_str(), 0777) != 0) return false;
+        if (parent.Flush()) return true;
+        const int error = errno;
+        systemCalls.unlinkat(parent.Number(), part.disk.c_str(), AT_REMOVEDIR);
+        errno = error;
+        return false;
+    }
+    if (!aside) return false;
+    const std::string unfinished = aside.NewName();
+    if (systemCalls.mkdirat(aside.Place().Number(), unfinished.c_str(), 0777) != 0) return false;
+    const Folder folder = aside.Place().Key(unfinished);
+    if (folder && WriteFile(folder, kNameFile, part.name, nullptr) && folder.Flush())
+        return TakePlace(aside, unfinished, parent, part.disk, false);
+    const int error = errno;
+    aside.Empty();
     errno = error;
     return false;
 }
 
-// Goes from a key down, and makes what is missing where `make` asks for it. `path` becomes that of what was found, in
+// Goes from a key down, and makes what is missing where there is an `aside`. `path` becomes that of what was found, in
 // the spelling of the disk.
-Folder Descend(const RegistryKey* key, const std::vector<KeyName>& parts, bool make, std::string& path) {
+Folder Descend(const RegistryKey* key, const std::vector<KeyName>& parts, Aside* aside, std::string& path) {
     Folder folder = FolderOf(key);
     path = key->folder;
     for (const KeyName& part : parts) {
-        if (!folder) break;
-        const std::string item = ItemIn(folder, part.disk);
+        std::string item;
+        if (!folder || !ItemIn(folder, part.disk, item)) return Folder();
         Folder next = folder.Key(item);
-        if (!next && errno == ENOENT && make && (MakeKeyFolder(folder, part) || errno == EEXIST || errno == ENOTEMPTY))
+        if (!next && errno == ENOENT && aside && (MakeKeyFolder(*aside, folder, part) || errno == EEXIST))
             next = folder.Key(item);
         (path += '/') += item;
         folder = std::move(next);
@@ -351,9 +346,19 @@ ErrorNumber RegistryOpenRoot(RegistryRoot root, std::uint32_t view, RegistryKey*
     std::string store = StoreFolder();
     if (store.empty()) return kErrorInvalidName;
     std::string folder = store + (view == kRegistryView64 ? "/.view64/" : "/") + kNames[static_cast<int>(root)];
-    key = new RegistryKey{std::move(store), std::move(folder), true, true, {}};
+    const bool isThere = IsFolder(folder, Links::kFollowed);
+    key = new RegistryKey{std::move(store), folder, folder, true, true, isThere, {}};
     return kErrorSuccess;
 }
+
+namespace {
+
+RegistryKey* NewKey(const RegistryKey* parent, std::string&& folder, bool root, bool write) {
+    return new RegistryKey{
+        parent->store, parent->rootFolder, std::move(folder), root, write, parent->wasThere.load(), {}};
+}
+
+}  // namespace
 
 ErrorNumber RegistryOpen(const RegistryKey* parent, const char* path, bool write, RegistryKey*& key) {
     key = nullptr;
@@ -362,24 +367,27 @@ ErrorNumber RegistryOpen(const RegistryKey* parent, const char* path, bool write
     std::string name = parent->folder;
     const bool root = parent->root && parts.empty();
     if (!root) {
-        const Folder folder = Descend(parent, parts, false, name);
+        if (!FolderOf(parent)) return IsUnmadeRoot(parent) ? kErrorFileNotFound : LostNumber();
+        const Folder folder = Descend(parent, parts, nullptr, name);
         if (!folder) return IsMissing(errno) ? kErrorFileNotFound : ErrnoNumber();
         if (write && ::faccessat(folder.Number(), ".", W_OK, 0) != 0) return ErrnoNumber();
     }
-    key = new RegistryKey{parent->store, std::move(name), root, write, {}};
+    key = NewKey(parent, std::move(name), root, write);
     return kErrorSuccess;
 }
 
 ErrorNumber RegistryCreate(const RegistryKey* parent, const char* path, RegistryKey*& key) {
     key = nullptr;
     if (!parent) return kErrorInvalidHandle;
-    StoreLock lock(parent->store);
+    StoreLock lock(parent->store, parent->rootFolder);
+    if (lock.Error() != kErrorSuccess) return lock.Error();
     if (parent->root && !MakeFolders(parent->folder)) return ErrnoNumber();
     if (!FolderOf(parent)) return LostNumber();
     const std::vector<KeyName> parts = PathParts(path);
+    Aside aside(parent->rootFolder);
     std::string name;
-    if (!Descend(parent, parts, true, name)) return IsMissing(errno) ? kErrorAccessDenied : ErrnoNumber();
-    key = new RegistryKey{parent->store, std::move(name), parent->root && parts.empty(), true, {}};
+    if (!Descend(parent, parts, &aside, name)) return IsMissing(errno) ? kErrorAccessDenied : ErrnoNumber();
+    key = NewKey(parent, std::move(name), parent->root && parts.empty(), true);
     return kErrorSuccess;
 }
 
@@ -393,19 +401,16 @@ ErrorNumber RegistryDelete(const RegistryKey* parent, const char* path) {
     if (!parent) return kErrorInvalidHandle;
     std::vector<KeyName> parts = PathParts(path);
     if (parts.empty()) return kErrorInvalidParameter;
-    StoreLock lock(parent->store);
+    StoreLock lock(parent->store, parent->rootFolder);
+    if (lock.Error() != kErrorSuccess) return lock.Error();
     const std::string last = parts.back().disk;
     parts.pop_back();
-    std::string above;
-    const Folder folder = Descend(parent, parts, false, above);
-    const std::string item = folder ? ItemIn(folder, last) : last;
-    const Folder key = folder ? folder.Key(item) : Folder();
-    if (!key) return IsMissing(errno) ? kErrorFileNotFound : ErrnoNumber();
-    bool hasSubKeys = false;
-    const ErrorNumber number = VisitFolder(key, [&](std::string_view, Kind kind) { hasSubKeys |= kind == Kind::kKey; });
-    if (number != kErrorSuccess) return number;
-    if (hasSubKeys) return kErrorAccessDenied;
-    return DeleteFolder(folder, item) ? kErrorSuccess : ErrnoNumber();
+    std::string above, item;
+    const Folder folder = Descend(parent, parts, nullptr, above);
+    const bool found = folder && ItemIn(folder, last, item) && folder.Key(item);
+    if (!found) return IsMissing(errno) ? kErrorFileNotFound : ErrnoNumber();
+    Aside aside(parent->rootFolder);
+    return aside && aside.Delete(folder, item) ? kErrorSuccess : ErrnoNumber();
 }
 
 ErrorNumber RegistryCounts(const RegistryKey* key, std::uint32_t& subKeys, std::uint32_t& values) {
@@ -414,6 +419,7 @@ ErrorNumber RegistryCounts(const RegistryKey* key, std::uint32_t& subKeys, std::
     return VisitKey(key, [&](const Folder&, std::string_view, Kind kind) {
         if (kind == Kind::kKey) ++subKeys;
         if (kind == Kind::kValue) ++values;
+        return kErrorSuccess;
     });
 }
 
@@ -439,18 +445,21 @@ bool ParseHeader(const std::string& text, bool hashed, ValueHeader& header) {
     return header.length <= text.size() - header.size;
 }
 
-// The name of what stands in a key's folder, in UTF-8. False when it cannot be read: then it is none of ours.
-bool NameOfItem(const Folder& folder, std::string_view item, Kind kind, std::string& name) {
+// The name of what stands in a key's folder, in UTF-8. 2 when it is none of ours.
+ErrorNumber NameOfItem(const Folder& folder, std::string_view item, Kind kind, std::string& name) {
     constexpr std::size_t kMost = 1024 * 1024;
     const std::string_view disk = item.substr(kind == Kind::kValue ? 1 : 0);
     name = Unescaped(disk);
-    if (!IsHashed(disk)) return true;
+    if (!IsHashed(disk)) return kErrorSuccess;
     std::string file(item);
-    if (kind == Kind::kKey) return ReadTextFile(((file += '/') += kNameFile).c_str(), name, kMost, folder.Number());
+    if (kind == Kind::kKey) (file += '/') += kNameFile;
+    if (!ReadTextFile(file.c_str(), name, kMost, folder.Number()))
+        return IsMissing(errno) || errno == EISDIR ? kErrorFileNotFound : ErrnoNumber();
+    if (kind == Kind::kKey) return kErrorSuccess;
     ValueHeader header;
-    if (!ReadTextFile(file.c_str(), name, kMost, folder.Number()) || !ParseHeader(name, true, header)) return false;
+    if (!ParseHeader(name, true, header)) return kErrorFileNotFound;
     name = name.substr(header.size, header.length);
-    return true;
+    return kErrorSuccess;
 }
 
 // The first index lists the folder, the others read on in that listing.
@@ -460,7 +469,10 @@ ErrorNumber Enumerate(const RegistryKey* key, Kind kind, std::uint32_t index, st
         key->listing.clear();
         ErrorNumber number = VisitKey(key, [&](const Folder& folder, std::string_view item, Kind itemKind) {
             std::string found;
-            if (itemKind == kind && NameOfItem(folder, item, kind, found)) key->listing.push_back(FromDisk(found));
+            if (itemKind != kind) return kErrorSuccess;
+            const ErrorNumber named = NameOfItem(folder, item, kind, found);
+            if (named == kErrorSuccess) key->listing.push_back(FromDisk(found));
+            return named == kErrorFileNotFound ? kErrorSuccess : named;
         });
         if (number != kErrorSuccess) return number;
         std::sort(key->listing.begin(), key->listing.end());
@@ -486,14 +498,17 @@ namespace {
 
 constexpr std::size_t kLongestName = 1024 * 1024;  // bytes of a value's name before its data
 
-// As the name is spelled first: a name that fits costs no look at the folder. False with errno. No more is read than
-// a value may have, and a byte: a damaged store must not take all memory.
-bool ReadValueFile(const RegistryKey* key, const std::string& diskName, std::string& text) {
+// As the name is spelled first: a name that fits costs no look at the folder. No more is read than a value may have,
+// and a byte: a damaged store must not take all memory.
+ErrorNumber ReadValueFile(const RegistryKey* key, const std::string& diskName, std::string& text) {
     constexpr std::size_t kMost = kLongestHeader + kLongestName + kLargestRegistryValue + 1;
-    if (ReadTextFile((key->folder + "/" + diskName).c_str(), text, kMost)) return true;
-    if (errno != ENOENT && errno != ENAMETOOLONG) return false;
+    if (ReadTextFile((key->folder + "/" + diskName).c_str(), text, kMost)) return kErrorSuccess;
+    if (!IsAbsence(errno) && errno != ENAMETOOLONG) return ErrnoNumber();
     const Folder folder = FolderOf(key);
-    return folder && ReadTextFile(ItemIn(folder, diskName).c_str(), text, kMost, folder.Number());
+    if (!folder) return IsUnmadeRoot(key) ? kErrorFileNotFound : LostNumber();
+    std::string item;
+    const bool read = ItemIn(folder, diskName, item) && ReadTextFile(item.c_str(), text, kMost, folder.Number());
+    return read ? kErrorSuccess : ErrnoNumber();
 }
 
 bool ParseValue(std::string& text, bool hashed, std::uint32_t& type) {
@@ -504,12 +519,28 @@ bool ParseValue(std::string& text, bool hashed, std::uint32_t& type) {
     return text.size() <= kLargestRegistryValue;
 }
 
+// Under the lock. False with errno; then the old value is there.
+bool WriteValue(const RegistryKey* key, const Folder& folder, const std::string& file, const std::string& text) {
+    std::string item;
+    if (!ItemIn(folder, file, item)) return false;
+    constexpr unsigned kMask = STATX_TYPE | STATX_MODE | STATX_UID | STATX_GID;
+    struct statx old;
+    const bool isThere = systemCalls.statx(folder.Number(), item.c_str(), AT_SYMLINK_NOFOLLOW, kMask, &old) == 0;
+    if (!isThere && !IsAbsence(errno)) return false;
+    Aside aside(key->rootFolder);
+    if (!aside) return false;
+    const std::string name = aside.NewName();
+    const struct statx* const like = isThere && S_ISREG(old.stx_mode) ? &old : nullptr;
+    return WriteFile(aside.Place(), name, text, like) && TakePlace(aside, name, folder, item, isThere);
+}
+
 }  // namespace
 
 ErrorNumber RegistryQueryValue(const RegistryKey* key, const char* name, std::uint32_t& type, std::string& data) {
     if (!key) return kErrorInvalidHandle;
     const std::string file = ValueFileName(name);
-    if (!ReadValueFile(key, file, data)) return ErrnoNumber();
+    const ErrorNumber number = ReadValueFile(key, file, data);
+    if (number != kErrorSuccess) return number;
     return ParseValue(data, IsHashed(std::string_view(file).substr(1)), type) ? kErrorSuccess : kErrorRegistryCorrupt;
 }
 
@@ -524,30 +555,37 @@ ErrorNumber RegistrySetValue(const RegistryKey* key, const char* name, std::uint
     std::string text(kValueHeader);
     text += std::to_string(type) + (hashed ? " " + std::to_string(utf8.size()) + "\n" + utf8 : "\n");
     if (size != 0) text.append(static_cast<const char*>(data), size);
-    StoreLock lock(key->store);
+    StoreLock lock(key->store, key->rootFolder);
+    if (lock.Error() != kErrorSuccess) return lock.Error();
     if (key->root && !MakeFolders(key->folder)) return ErrnoNumber();
     const Folder folder = FolderOf(key);
     if (!folder) return LostNumber();
-    return ReplaceFile(ItemIn(folder, file), text, folder.Number()) ? kErrorSuccess : ErrnoNumber();
+    return WriteValue(key, folder, file, text) ? kErrorSuccess : ErrnoNumber();
 }
 
 ErrorNumber RegistryDeleteValue(const RegistryKey* key, const char* name) {
     if (!key) return kErrorInvalidHandle;
     if (!key->write) return kErrorAccessDenied;
-    StoreLock lock(key->store);
+    StoreLock lock(key->store, key->rootFolder);
+    if (lock.Error() != kErrorSuccess) return lock.Error();
     const Folder folder = FolderOf(key);
-    if (!folder) return ErrnoNumber();
-    const std::string file = ItemIn(folder, ValueFileName(name));
-    return systemCalls.unlinkat(folder.Number(), file.c_str(), 0) == 0 ? kErrorSuccess : ErrnoNumber();
+    if (!folder) return IsUnmadeRoot(key) ? kErrorFileNotFound : LostNumber();
+    std::string item;
+    struct statx status;
+    const bool found = ItemIn(folder, ValueFileName(name), item) &&
+                       systemCalls.statx(folder.Number(), item.c_str(), AT_SYMLINK_NOFOLLOW, STATX_TYPE, &status) == 0;
+    if (!found) return ErrnoNumber();
+    Aside aside(key->rootFolder);
+    return aside && aside.Delete(folder, item) ? kErrorSuccess : ErrnoNumber();
 }
 
 namespace {
 
 ErrorNumber Synchronize(const Folder& folder, const std::string& name) {
-    int file = systemCalls.openat(folder.Number(), name.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK, 0);
+    int file = OpenAtRetrying(folder.Number(), name.c_str(), O_RDONLY | O_NONBLOCK);
     if (file < 0) return errno == ENOENT ? kErrorSuccess : ErrnoNumber();
     ErrorNumber number = kErrorSuccess;
-    if (systemCalls.fsync(file) != 0 && errno != EINVAL) number = ErrnoNumber();
+    if (Retry([&] { return systemCalls.fsync(file); }) != 0 && errno != EINVAL) number = ErrnoNumber();
     systemCalls.close(file);
     return number;
 }
@@ -561,11 +599,12 @@ ErrorNumber RegistryFlush(const RegistryKey* key) {
         if (first == kErrorSuccess) first = number;
     };
     const Folder folder = FolderOf(key);
-    if (!folder) return key->root && IsMissing(errno) ? kErrorSuccess : LostNumber();
-    keep(VisitFolder(folder, [&](std::string_view name, Kind kind) {
+    if (!folder) return IsUnmadeRoot(key) ? kErrorSuccess : LostNumber();
+    keep(VisitItems(folder, [&](std::string_view name, Kind kind) {
         if (kind == Kind::kValue) keep(Synchronize(folder, std::string(name)));
+        return kErrorSuccess;
     }));
-    keep(Synchronize(folder, "."));
+    keep(folder.Flush() ? kErrorSuccess : ErrnoNumber());
     return first;
 }
 

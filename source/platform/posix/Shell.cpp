@@ -11,11 +11,8 @@
 #include <cstdint>
 #include <cstdlib>
 #include <errno.h>
-#include <linux/fs.h>
 #include <stdio.h>
 #include <string_view>
-#include <time.h>
-#include <unistd.h>
 
 namespace tessel::platform {
 
@@ -92,106 +89,6 @@ bool ShellFolderName(ShellFolder kind, bool create, std::string& name) {
     if (!there && !create) return FailWith(kErrorFileNotFound);
     if (!there && !MakeFolders(native, 0700)) return FailErrno();  // new folders of the user's are private
     return NativeToName(native, name);
-}
-
-// ---- the trash ------------------------------------------------------------------------------------------------------
-
-namespace {
-
-// A trash folder, and the folder that the paths in it are relative to (empty: they are absolute).
-struct Trash {
-    std::string folder, top;
-};
-
-bool GetStatus(const std::string& native, struct statx& status) {
-    return StatusOf(native, Links::kThemselves, STATX_BASIC_STATS, status);
-}
-
-bool SameDevice(const struct statx& a, const struct statx& b) {
-    return a.stx_dev_major == b.stx_dev_major && a.stx_dev_minor == b.stx_dev_minor;
-}
-
-// The top folder of the file system that holds the item.
-std::string TopFolder(const std::string& native, const struct statx& item) {
-    std::string top = NativeParent(native);
-    struct statx status;
-    while (top != "/" && GetStatus(NativeParent(top), status) && SameDevice(status, item)) top = NativeParent(top);
-    return top;
-}
-
-bool MakeTrash(const std::string& folder) {
-    return MakeFolders(folder + "/files", 0700) && MakeFolders(folder + "/info", 0700);
-}
-
-// The home trash for what lies on its file system; else that at the top of the item's own: the shared one if it is set
-// up as it must be (a real folder with the sticky bit), else one of the user's.
-bool FindTrash(const std::string& native, const struct statx& item, Trash& trash) {
-    struct statx status;
-    trash = {XdgFolder("XDG_DATA_HOME", ".local/share") + "/Trash", ""};
-    if (MakeTrash(trash.folder) && GetStatus(trash.folder, status) && SameDevice(status, item)) return true;
-    trash.top = TopFolder(native, item);
-    std::string prefix = trash.top == "/" ? "/" : trash.top + "/";
-    std::string user = std::to_string(::getuid());
-    bool shared = GetStatus(prefix + ".Trash", status) && S_ISDIR(status.stx_mode) && (status.stx_mode & S_ISVTX);
-    trash.folder = prefix + ".Trash/" + user;
-    if (shared && MakeTrash(trash.folder)) return true;
-    trash.folder = prefix + ".Trash-" + user;
-    return MakeTrash(trash.folder);
-}
-
-std::string PercentEncoded(std::string_view path) {
-    constexpr std::string_view kPlain = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789/-_.~";
-    std::string encoded;
-    for (char c : path) {
-        char text[4] = {c};
-        if (kPlain.find(c) == std::string_view::npos) {
-            std::snprintf(text, sizeof text, "%%%02X", static_cast<unsigned char>(c));
-        }
-        encoded += text;
-    }
-    return encoded;
-}
-
-std::string TrashInfo(const std::string& native, const Trash& trash) {
-    timespec now{};
-    systemCalls.clock_gettime(CLOCK_REALTIME, &now);
-    tm local{};
-    localtime_r(&now.tv_sec, &local);
-    char date[32];
-    ::strftime(date, sizeof date, "%Y-%m-%dT%H:%M:%S", &local);
-    std::string_view path = native;
-    if (!trash.top.empty()) path.remove_prefix(trash.top == "/" ? 1 : trash.top.size() + 1);
-    return "[Trash Info]\nPath=" + PercentEncoded(path) + "\nDeletionDate=" + date + "\n";
-}
-
-// The information first, which takes the name; then the item itself. False with errno; EEXIST when the name is taken.
-bool PutIntoTrash(const std::string& native, const Trash& trash, const std::string& name) {
-    std::string info = trash.folder + "/info/" + name + ".trashinfo";
-    if (!CreateTextFile(info, TrashInfo(native, trash))) return false;
-    std::string target = trash.folder + "/files/" + name;
-    if (systemCalls.renameat2(AT_FDCWD, native.c_str(), AT_FDCWD, target.c_str(), RENAME_NOREPLACE) == 0) return true;
-    int error = errno;
-    systemCalls.unlink(info.c_str());
-    errno = error;
-    return false;
-}
-
-}  // namespace
-
-bool ShellTrash(const char* name) {
-    std::string native;
-    struct statx status;
-    if (!NameToAbsoluteNative(name, native)) return false;
-    if (!GetStatus(native, status)) return FailErrno();
-    Trash trash;
-    if (native == "/" || !FindTrash(native, status, trash)) return FailErrno();
-    std::string last(NativeLast(native));
-    constexpr int kMostNames = 10'000;
-    for (int number = 1; number <= kMostNames; ++number) {
-        if (PutIntoTrash(native, trash, number == 1 ? last : last + "." + std::to_string(number))) return true;
-        if (errno != EEXIST) return FailErrno();
-    }
-    return FailWith(kErrorAlreadyExists);
 }
 
 // ---- shortcuts ------------------------------------------------------------------------------------------------------

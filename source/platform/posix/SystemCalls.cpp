@@ -2,7 +2,8 @@
 
 #include <errno.h>
 #include <stdio.h>
-#include <sys/mman.h>
+#include <sys/file.h>
+#include <sys/prctl.h>
 #include <sys/random.h>
 #include <sys/syscall.h>
 #include <sys/xattr.h>
@@ -39,12 +40,30 @@ int Membarrier(int command, unsigned flags) {
     return static_cast<int>(::syscall(SYS_membarrier, command, flags, 0));
 }
 
-// Reports through its result, unlike all others.
-int ClockNanosleep(clockid_t clock, int flags, const struct timespec* time, struct timespec* remaining) {
-    int error = ::clock_nanosleep(clock, flags, time, remaining);
+int TgKill(pid_t process, pid_t thread, int signal) {
+    return static_cast<int>(::syscall(SYS_tgkill, process, thread, signal));
+}
+int Prctl(int option, unsigned long value) {
+    return ::prctl(option, value);
+}
+int GetPriority(int which, id_t who) {
+    return ::getpriority(static_cast<__priority_which_t>(which), who);
+}
+int SetPriority(int which, id_t who, int priority) {
+    return ::setpriority(static_cast<__priority_which_t>(which), who, priority);
+}
+
+// These two report through their results, unlike all others.
+int Result(int error) {
     if (error == 0) return 0;
     errno = error;
     return -1;
+}
+int SigProcMask(int how, const sigset_t* set, sigset_t* before) {
+    return Result(::pthread_sigmask(how, set, before));
+}
+int ClockNanosleep(clockid_t clock, int flags, const struct timespec* time, struct timespec* remaining) {
+    return Result(::clock_nanosleep(clock, flags, time, remaining));
 }
 
 }  // namespace
@@ -59,17 +78,23 @@ constinit SystemCalls systemCalls = {
     .ftruncate = ::ftruncate,
     .fallocate = ::fallocate,
     .fsync = ::fsync,
+    .syncfs = ::syncfs,
     .lock = Lock,
     .fcntl = Fcntl,
-    .mmap = ::mmap,
-    .munmap = ::munmap,
     .statx = ::statx,
     .futimens = ::futimens,
     .fsetxattr = ::fsetxattr,
+    .fchown = ::fchown,
+    .flistxattr = ::flistxattr,
+    .fremovexattr = ::fremovexattr,
     .getxattr = ::getxattr,
     .fgetxattr = ::fgetxattr,
     .renameat2 = ::renameat2,
     .link = ::link,
+    .linkat = ::linkat,
+    .symlink = ::symlink,
+    .lchown = ::lchown,
+    .flock = ::flock,
     .unlink = ::unlink,
     .unlinkat = ::unlinkat,
     .rmdir = ::rmdir,
@@ -78,10 +103,27 @@ constinit SystemCalls systemCalls = {
     .chmod = ::chmod,
     .fchmod = ::fchmod,
     .opendir = ::opendir,
+    .fdopendir = ::fdopendir,
     .readdir = ::readdir,
     .closedir = ::closedir,
     .getcwd = ::getcwd,
     .readlink = ::readlink,
+    .getpid = ::getpid,
+    .gettid = ::gettid,
+    .getuid = ::getuid,
+    .geteuid = ::geteuid,
+    .umask = ::umask,
+    .raise = ::raise,
+    .tgkill = TgKill,
+    .sigaction = ::sigaction,
+    .sigprocmask = SigProcMask,
+    .getpriority = GetPriority,
+    .setpriority = SetPriority,
+    .sched_yield = ::sched_yield,
+    .sched_getaffinity = ::sched_getaffinity,
+    .prctl = Prctl,
+    .getrusage = ::getrusage,
+    .sysconf = ::sysconf,
     .uname = ::uname,
     .chdir = ::chdir,
     .statfs = ::statfs,

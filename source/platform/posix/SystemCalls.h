@@ -1,5 +1,7 @@
 // The calls that this backend makes of the kernel, by name, in one table that tests replace parts of: a short write, an
-// interruption, a full disk, a clock moved by hand.
+// interruption, a full disk, a clock moved by hand. No other file of the backend makes one, but for those that do not
+// come back. What the C library asks of the kernel for its own functions (threads, memory, locales, accounts, realpath,
+// loading) is its own affair.
 #ifndef TESSEL_PLATFORM_POSIX_SYSTEMCALLS_H
 #define TESSEL_PLATFORM_POSIX_SYSTEMCALLS_H
 
@@ -7,6 +9,9 @@
 #include <cstdint>
 #include <dirent.h>
 #include <fcntl.h>
+#include <sched.h>
+#include <signal.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/statfs.h>
 #include <sys/types.h>
@@ -16,8 +21,8 @@
 
 namespace tessel::platform {
 
-// X(result, name, parameters): all return -1 (mmap: MAP_FAILED; opendir, readdir and getcwd: null) and set errno on
-// failure.
+// X(result, name, parameters): all return -1 (opendir, fdopendir, readdir and getcwd: null) and set errno on failure.
+// Asking who one is, and umask, cannot fail.
 #define TESSEL_SYSTEM_CALLS(X)                                                                                     \
     X(int, open, (const char* name, int flags, mode_t mode))                                                       \
     X(int, openat, (int folder, const char* name, int flags, mode_t mode))                                         \
@@ -28,17 +33,23 @@ namespace tessel::platform {
     X(int, ftruncate, (int file, off_t size))                                                                      \
     X(int, fallocate, (int file, int mode, off_t offset, off_t size))                                              \
     X(int, fsync, (int file))                                                                                      \
+    X(int, syncfs, (int file))                                                                                     \
     X(int, lock, (int file, int command, struct flock* range))                                                     \
     X(int, fcntl, (int file, int command, int value))                                                              \
-    X(void*, mmap, (void* address, std::size_t size, int protection, int flags, int file, off_t offset))           \
-    X(int, munmap, (void* address, std::size_t size))                                                              \
     X(int, statx, (int folder, const char* name, int flags, unsigned mask, struct statx* result))                  \
     X(int, futimens, (int file, const struct timespec* times))                                                     \
     X(int, fsetxattr, (int file, const char* name, const void* value, std::size_t size, int flags))                \
+    X(int, fchown, (int file, uid_t owner, gid_t group))                                                           \
+    X(ssize_t, flistxattr, (int file, char* names, std::size_t size))                                              \
+    X(int, fremovexattr, (int file, const char* name))                                                             \
     X(ssize_t, getxattr, (const char* path, const char* name, void* value, std::size_t size))                      \
     X(ssize_t, fgetxattr, (int file, const char* name, void* value, std::size_t size))                             \
     X(int, renameat2, (int fromFolder, const char* from, int toFolder, const char* to, unsigned flags))            \
     X(int, link, (const char* from, const char* to))                                                               \
+    X(int, linkat, (int fromFolder, const char* from, int toFolder, const char* to, int flags))                    \
+    X(int, symlink, (const char* text, const char* name))                                                          \
+    X(int, lchown, (const char* name, uid_t owner, gid_t group))                                                   \
+    X(int, flock, (int file, int operation))                                                                       \
     X(int, unlink, (const char* name))                                                                             \
     X(int, unlinkat, (int folder, const char* name, int flags))                                                    \
     X(int, rmdir, (const char* name))                                                                              \
@@ -47,10 +58,27 @@ namespace tessel::platform {
     X(int, chmod, (const char* name, mode_t mode))                                                                 \
     X(int, fchmod, (int file, mode_t mode))                                                                        \
     X(DIR*, opendir, (const char* name))                                                                           \
+    X(DIR*, fdopendir, (int folder))                                                                               \
     X(dirent*, readdir, (DIR * listing))                                                                           \
     X(int, closedir, (DIR * listing))                                                                              \
     X(char*, getcwd, (char* buffer, std::size_t size))                                                             \
     X(ssize_t, readlink, (const char* name, char* buffer, std::size_t size))                                       \
+    X(pid_t, getpid, ())                                                                                           \
+    X(pid_t, gettid, ())                                                                                           \
+    X(uid_t, getuid, ())                                                                                           \
+    X(uid_t, geteuid, ())                                                                                          \
+    X(mode_t, umask, (mode_t mask))                                                                                \
+    X(int, raise, (int signal))                                                                                    \
+    X(int, tgkill, (pid_t process, pid_t thread, int signal))                                                      \
+    X(int, sigaction, (int signal, const struct sigaction* action, struct sigaction* before))                      \
+    X(int, sigprocmask, (int how, const sigset_t* set, sigset_t* before))                                          \
+    X(int, getpriority, (int which, id_t who))                                                                     \
+    X(int, setpriority, (int which, id_t who, int priority))                                                       \
+    X(int, sched_yield, ())                                                                                        \
+    X(int, sched_getaffinity, (pid_t thread, std::size_t size, cpu_set_t * set))                                   \
+    X(int, prctl, (int option, unsigned long value))                                                               \
+    X(int, getrusage, (int who, struct rusage* usage))                                                             \
+    X(long, sysconf, (int name))                                                                                   \
     X(int, uname, (struct utsname * host))                                                                         \
     X(int, chdir, (const char* name))                                                                              \
     X(int, statfs, (const char* name, struct statfs* result))                                                      \

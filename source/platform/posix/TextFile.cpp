@@ -3,26 +3,9 @@
 #include "platform/posix/Interrupted.h"
 
 #include <algorithm>
-#include <atomic>
-#include <cstdio>
 #include <errno.h>
-#include <unistd.h>
 
 namespace tessel::platform {
-
-namespace {
-
-// Unlike any other's, in this process or another: who made it, and which it is. Hidden, beside the file it will be.
-// Short, as that file's name may be as long as a name can be.
-std::string TemporaryName(const std::string& native) {
-    static std::atomic<unsigned> number{0};
-    char name[48];
-    std::snprintf(name, sizeof name, ".%d.%u.tmp", ::getpid(), number.fetch_add(1));
-    std::size_t last = native.rfind('/') + 1;  // 0 when there is no folder
-    return native.substr(0, last) + name;
-}
-
-}  // namespace
 
 bool ReadTextFile(const char* native, std::string& text, std::size_t most, int folder) {
     text.clear();
@@ -41,36 +24,20 @@ bool ReadTextFile(const char* native, std::string& text, std::size_t most, int f
     return moved >= 0;
 }
 
-bool CreateTextFile(const std::string& native, const std::string& data, int folder) {
-    int file = OpenAtRetrying(folder, native.c_str(), O_WRONLY | O_CREAT | O_EXCL);
+bool CreateTextFile(const std::string& native, const std::string& data) {
+    int file = OpenRetrying(native.c_str(), O_WRONLY | O_CREAT | O_EXCL, 0600);
     if (file < 0) return false;
     std::size_t done = 0;
     bool written = WriteAll(file, data.data(), data.size(), done);
+    written = written && Retry([&] { return systemCalls.fsync(file); }) == 0;
     int error = errno;
-    if (systemCalls.close(file) != 0 && written) {
+    if (systemCalls.close(file) != 0 && written && errno != EINTR) {
         written = false;
         error = errno;
     }
-    if (!written) systemCalls.unlinkat(folder, native.c_str(), 0);
+    if (!written) systemCalls.unlink(native.c_str());
     errno = error;
     return written;
-}
-
-bool ReplaceFile(const std::string& native, const std::string& data, int folder) {
-    constexpr int kTries = 100;  // a process of our number may have ended and left its files behind
-    std::string temporary;
-    bool made = false;
-    for (int i = 0; i < kTries && !made; ++i) {
-        temporary = TemporaryName(native);
-        made = CreateTextFile(temporary, data, folder);
-        if (!made && errno != EEXIST) return false;
-    }
-    if (!made) return false;
-    if (systemCalls.renameat2(folder, temporary.c_str(), folder, native.c_str(), 0) == 0) return true;
-    int error = errno;
-    systemCalls.unlinkat(folder, temporary.c_str(), 0);
-    errno = error;
-    return false;
 }
 
 }  // namespace tessel::platform

@@ -1,4 +1,5 @@
-// Small files of the host, read and written whole. `native`: the host's own name, seen from `folder`.
+// Small files of the host, read and written whole. `native`: the host's own name, seen from `folder` where there is
+// one.
 #ifndef TESSEL_PLATFORM_POSIX_TEXTFILE_H
 #define TESSEL_PLATFORM_POSIX_TEXTFILE_H
 
@@ -12,11 +13,9 @@ namespace tessel::platform {
 bool ReadTextFile(const char* native, std::string& text, std::size_t most = static_cast<std::size_t>(-1),
                   int folder = AT_FDCWD);
 
-// Writes a new file; EEXIST when there is one. Nothing is left behind after a failure. False with errno.
-bool CreateTextFile(const std::string& native, const std::string& data, int folder = AT_FDCWD);
-
-// Writes all, through a new file that takes the name when it is complete. False with errno.
-bool ReplaceFile(const std::string& native, const std::string& data, int folder = AT_FDCWD);
+// Writes a new file for this user alone, and puts it onto the device; EEXIST when there is one. Nothing is left behind
+// after a failure. False with errno.
+bool CreateTextFile(const std::string& native, const std::string& data);
 
 }  // namespace tessel::platform
 

@@ -4,6 +4,7 @@
 #include "platform/Event.h"
 #include "platform/Mutex.h"
 #include "platform/posix/Errors.h"
+#include "platform/posix/SystemCalls.h"
 #include "platform/posix/Threads.h"
 
 #include <algorithm>
@@ -11,10 +12,7 @@
 #include <errno.h>
 #include <new>
 #include <pthread.h>
-#include <sched.h>
-#include <signal.h>
 #include <sys/prctl.h>
-#include <sys/resource.h>
 #include <sys/syscall.h>
 #include <unistd.h>
 
@@ -29,13 +27,13 @@ struct ThreadRecord {
     std::atomic<bool> abandoned{false};  // forced, and its own reference given back
     std::atomic<std::int32_t> exitCode{0};
     bool started = false;  // by this seam
-    bool joined = false;   // nothing of it runs any more; guarded by joinMutex
     pthread_t thread{};
     ThreadProcedure procedure = nullptr;
     void* argument = nullptr;
     Event idKnown;
     Event over;  // signaled for good once the thread has ended: who takes the signal gives it back
     Mutex joinMutex;
+    bool joined TESSEL_GUARDED_BY(joinMutex) = false;  // nothing of it runs any more
 };
 
 // ---- who is who -----------------------------------------------------------------------------------------------------
@@ -48,7 +46,8 @@ constexpr std::int32_t kStillActive = 259;
 constinit thread_local ThreadRecord* currentRecord = nullptr;
 constinit thread_local ThreadId currentId = 0;
 
-void Release(ThreadRecord* record) {
+// Who gives up the last reference is alone with the record.
+void Release(ThreadRecord* record) TESSEL_LOCKS_UNPROVEN {
     if (record->references.fetch_sub(1, std::memory_order_acq_rel) != 1) return;
     if (record->started && !record->joined && !record->forced) pthread_detach(record->thread);
     delete record;
@@ -57,13 +56,13 @@ void Release(ThreadRecord* record) {
 }  // namespace
 
 bool IsThreadOfProcess(ThreadId thread) noexcept {
-    return ::syscall(SYS_tgkill, ::getpid(), static_cast<pid_t>(thread), 0) == 0;
+    return systemCalls.tgkill(systemCalls.getpid(), static_cast<pid_t>(thread), 0) == 0;
 }
 
 // The host lets wake-ups slip by 50 us else, to gather them.
 void WakeOnTime() noexcept {
     constexpr unsigned long kLeastSlack = 1;  // nanosecond
-    ::prctl(PR_SET_TIMERSLACK, kLeastSlack);
+    systemCalls.prctl(PR_SET_TIMERSLACK, kLeastSlack);
 }
 
 ThreadId CurrentThreadId() noexcept {
@@ -71,7 +70,7 @@ ThreadId CurrentThreadId() noexcept {
         // A forked child's one thread has another id than the thread it was.
         static const int registered = pthread_atfork(nullptr, nullptr, [] { currentId = 0; });
         (void)registered;
-        currentId = static_cast<ThreadId>(::syscall(SYS_gettid));
+        currentId = static_cast<ThreadId>(systemCalls.gettid());
     }
     return currentId;
 }
@@ -98,7 +97,7 @@ void MarkEnded(ThreadRecord& record, std::int32_t code) {
 
 void OnEndSignal(int, siginfo_t* info, void*) {
     ThreadRecord* record = static_cast<ThreadRecord*>(info->si_value.sival_ptr);
-    if (info->si_code != SI_QUEUE || info->si_pid != ::getpid() || !record || record != currentRecord) return;
+    if (info->si_code != SI_QUEUE || info->si_pid != systemCalls.getpid() || !record || record != currentRecord) return;
     record->forced.store(true, std::memory_order_relaxed);
     MarkEnded(*record, record->exitCode.load(std::memory_order_relaxed));
     ::syscall(SYS_exit, 0);  // of this thread alone
@@ -108,13 +107,13 @@ void OnEndSignal(int, siginfo_t* info, void*) {
 bool InstallEndSignal() {
     static const bool installed = [] {
         struct sigaction before {};
-        if (sigaction(EndSignal(), nullptr, &before) != 0) return false;
+        if (systemCalls.sigaction(EndSignal(), nullptr, &before) != 0) return false;
         if ((before.sa_flags & SA_SIGINFO) != 0 || before.sa_handler != SIG_DFL) return false;
         struct sigaction action {};
         action.sa_sigaction = OnEndSignal;
         action.sa_flags = SA_SIGINFO | SA_ONSTACK;
         sigfillset(&action.sa_mask);
-        return sigaction(EndSignal(), &action, nullptr) == 0;
+        return systemCalls.sigaction(EndSignal(), &action, nullptr) == 0;
     }();
     return installed;
 }
@@ -123,7 +122,7 @@ void AdmitEndSignal() {
     sigset_t set;
     sigemptyset(&set);
     sigaddset(&set, EndSignal());
-    pthread_sigmask(SIG_UNBLOCK, &set, nullptr);
+    systemCalls.sigprocmask(SIG_UNBLOCK, &set, nullptr);
 }
 
 }  // namespace
@@ -156,11 +155,11 @@ bool ThreadEnd(ThreadHandle thread, std::int32_t code) noexcept {
 namespace {
 
 // As the process was started with it.
-const int processNice = ::getpriority(PRIO_PROCESS, 0);
+const int processNice = systemCalls.getpriority(PRIO_PROCESS, 0);
 
 // The host hands a maker's priority on to the threads it makes. Where it may not be raised again it stays.
 void TakeProcessPriority() {
-    if (::getpriority(PRIO_PROCESS, 0) != processNice) ::setpriority(PRIO_PROCESS, 0, processNice);
+    if (systemCalls.getpriority(PRIO_PROCESS, 0) != processNice) systemCalls.setpriority(PRIO_PROCESS, 0, processNice);
 }
 
 void* RunThread(void* context) {
@@ -297,7 +296,8 @@ bool IsThere(ThreadHandle thread) {
 bool ThreadSetPriority(ThreadHandle thread, std::int32_t priority) noexcept {
     if (!IsThere(thread)) return FailWith(kErrorInvalidHandle);
     for (const PriorityRow& row : kPriorities) {
-        if (row.priority == priority) return setpriority(PRIO_PROCESS, thread->id, row.nice) == 0 || FailErrno();
+        if (row.priority == priority)
+            return systemCalls.setpriority(PRIO_PROCESS, thread->id, row.nice) == 0 || FailErrno();
     }
     return FailWith(kErrorInvalidParameter);
 }
@@ -305,7 +305,7 @@ bool ThreadSetPriority(ThreadHandle thread, std::int32_t priority) noexcept {
 bool ThreadGetPriority(ThreadHandle thread, std::int32_t& priority) noexcept {
     if (!IsThere(thread)) return FailWith(kErrorInvalidHandle);
     errno = 0;
-    int nice = getpriority(PRIO_PROCESS, thread->id);
+    int nice = systemCalls.getpriority(PRIO_PROCESS, thread->id);
     if (errno != 0) return FailErrno();
     // The most urgent row that the thread's number reaches.
     for (const PriorityRow& row : kPriorities) {
@@ -338,13 +338,14 @@ StackBounds CurrentStackBounds() noexcept {
 
 std::uint32_t NumberOfProcessors() noexcept {
     cpu_set_t set;
-    if (sched_getaffinity(0, sizeof set, &set) == 0) return static_cast<std::uint32_t>(std::max(1, CPU_COUNT(&set)));
-    long online = ::sysconf(_SC_NPROCESSORS_ONLN);
+    if (systemCalls.sched_getaffinity(0, sizeof set, &set) == 0)
+        return static_cast<std::uint32_t>(std::max(1, CPU_COUNT(&set)));
+    long online = systemCalls.sysconf(_SC_NPROCESSORS_ONLN);
     return online > 0 ? static_cast<std::uint32_t>(online) : 1;
 }
 
 void YieldThread() noexcept {
-    sched_yield();
+    systemCalls.sched_yield();
 }
 
 // ---- thread-local slots ---------------------------------------------------------------------------------------------
