@@ -1,25 +1,14 @@
-<<<<<<< HEAD
-=======
 #include "support/FailingPlatform.h"
-#include "support/ReportRecorder.h"
->>>>>>> main
 #include "support/ScratchDrive.h"
 #include "support/Test.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/diagnostics/DumpLeakInfo.h>
 #include <tessel/diagnostics/FileLoc.h>
 
-<<<<<<< HEAD
-#include <filesystem>
-=======
 #include <cerrno>
 #include <chrono>
-#include <cstring>
 #include <filesystem>
-#include <gtest/gtest.h>
-#include <memory>
 #include <set>
->>>>>>> main
 #include <stdlib.h>
 #include <sys/mman.h>
 #include <sys/wait.h>
@@ -159,8 +148,7 @@ TEST_F(DumpLeakInfoTest, ProgramsAtTheSameTimeKeepTheirReports) {
         usual += name == "leaks.txt";
         EXPECT_EQ(1u, others.erase(writer)) << name;
     }
-    EXPECT_EQ(1, usual);
-    EXPECT_TRUE(others.empty());
+    EXPECT_EACH(usual == 1, others.empty());
 }
 
 std::string Failure(int32 code, const char* name, bool addTxt) {
