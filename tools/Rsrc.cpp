@@ -43,12 +43,12 @@ std::string TextOf(ConstPStr string) {
 template <class Visit>
 void ForEachResource(const OpenRsrc& file, const std::string& name, Visit visit) {
     int32 types = 0;
-    Check(RCountTypes(file.get(), &types), name);
+    Check(RCountTypes(file.get(), &types), name, "list");
     for (int32 t = 1; t <= types; ++t) {
         ResType type = 0;
         int32 count = 0;
-        Check(RGetIndType(file.get(), &type, t), name);
-        Check(RCount(file.get(), type, &count), name);
+        Check(RGetIndType(file.get(), &type, t), name, "list");
+        Check(RCount(file.get(), type, &count), name, "list");
         for (int32 i = 1; i <= count; ++i) {
             UHandle data = nullptr;
             const MgErr err = RGetInd(file.get(), type, i, &data);
@@ -61,8 +61,8 @@ void ForEachResource(const OpenRsrc& file, const std::string& name, Visit visit)
 Entry Describe(UHandle data, const std::string& file) {
     Entry entry = {};
     Str255 name;
-    Check(RGetInfo(data, &entry.id, &entry.type, name), file);
-    Check(RGetAttrs(data, &entry.attrs), file);
+    Check(RGetInfo(data, &entry.id, &entry.type, name), file, "list");
+    Check(RGetAttrs(data, &entry.attrs), file, "list");
     entry.name = TextOf(name);
     entry.bytes = BytesOf(data);
     return entry;
@@ -113,7 +113,7 @@ void EntryJson(Json* json, const Entry& entry) {
 RFileHeader HeaderOf(const std::string& file) {
     const OwnedPath path(file);
     RFileHeader header;
-    Check(RGetFileHeader(path.get(), &header), file);
+    Check(RGetFileHeader(path.get(), &header), file, "read the header");
     return header;
 }
 
@@ -125,7 +125,7 @@ void ListJson(const std::string& name, const OpenRsrc& file) {
     ListHeaderJson(&json, HeaderOf(name));
     json.Key("resources").Begin('[');
     ForEachResource(file, name, [&](ResType, int32, UHandle data, MgErr err) {
-        Check(err, name);
+        Check(err, name, "get");
         EntryJson(&json, Describe(data, name));
     });
     json.End(']');
@@ -169,7 +169,7 @@ int Get(const Words& words) {
     const int32 id = ParseID(names[2]);
     const OpenRsrc file(names[0], kROpenReadOnly);
     UHandle data = nullptr;
-    Check(RGet(file.get(), type, id, &data), names[0]);
+    Check(RGet(file.get(), type, id, &data), names[0], "get");
     WriteStandardOutput(BytesOf(data));
     return 0;
 }
@@ -179,13 +179,13 @@ int Strings(const Words& words) {
     const int32 id = ParseID(names[1]);
     const OpenRsrc file(names[0], kROpenReadOnly);
     int32 exists = 0;
-    Check(RExists(file.get(), kStringListType, id, &exists), names[0]);
+    Check(RExists(file.get(), kStringListType, id, &exists), names[0], "get");
     std::string text;
     for (int32 index = 1;; ++index) {
         Str255 string;
         const MgErr err = RGetIndString(file.get(), string, id, index);
         if (err == kResNotFoundErr) break;
-        Check(err, names[0]);
+        Check(err, names[0], "get");
         text += TextOf(string) + "\n";
     }
     WriteStandardOutput(text);
@@ -198,7 +198,7 @@ int Create(const Words& words) {
     const FourCC type = ParseFourCC(arguments.Option("--type", kDefaultType), "--type");
     const FourCC creator = ParseFourCC(arguments.Option("--creator", kDefaultCreator), "--creator");
     const OwnedPath path(name);
-    Check(RCreateFile(path.get(), arguments.Has("--replace") ? 1 : 0, creator, type, 0), name);
+    Check(RCreateFile(path.get(), arguments.Has("--replace") ? 1 : 0, creator, type, 0), name, "create");
     return 0;
 }
 
@@ -212,11 +212,11 @@ int Add(const Words& words) {
     const std::string bytes = ReadStandardInput();
     OpenRsrc file(names[0], kROpenReadWrite);
     UHandle data = nullptr;
-    Check(DSPtrToHand(bytes.data(), &data, static_cast<uint32>(bytes.size())), names[0]);
+    Check(DSPtrToHand(bytes.data(), &data, static_cast<uint32>(bytes.size())), names[0], "add");
     const MgErr err = RAdd(data, file.get(), type, id, name.bytes);
     if (err) DSDisposeHandle(data);
-    Check(err, names[0]);
-    Check(RSetAttrs(data, attrs), names[0]);
+    Check(err, names[0], "add");
+    Check(RSetAttrs(data, attrs), names[0], "add");
     file.Close();
     return 0;
 }
@@ -228,9 +228,9 @@ int Replace(const Words& words) {
     const std::string bytes = ReadStandardInput();
     OpenRsrc file(names[0], kROpenReadWrite);
     int32 exists = 0;
-    Check(RExists(file.get(), type, id, &exists), names[0]);
+    Check(RExists(file.get(), type, id, &exists), names[0], "replace");
     tessel::ResFile* object = tessel::RsrcFileToRMapResFile(file.get());
-    Check(object->RReplacePtr(bytes.data(), static_cast<uint32>(bytes.size()), type, id), names[0]);
+    Check(object->RReplacePtr(bytes.data(), static_cast<uint32>(bytes.size()), type, id), names[0], "replace");
     file.Close();
     return 0;
 }
@@ -241,8 +241,8 @@ int Remove(const Words& words) {
     const int32 id = ParseID(names[2]);
     OpenRsrc file(names[0], kROpenReadWrite);
     UHandle data = nullptr;
-    Check(RGet(file.get(), type, id, &data), names[0]);
-    Check(RRemove(data, file.get()), names[0]);
+    Check(RGet(file.get(), type, id, &data), names[0], "get");
+    Check(RRemove(data, file.get()), names[0], "remove");
     DSDisposeHandle(data);
     file.Close();
     return 0;
@@ -251,7 +251,7 @@ int Remove(const Words& words) {
 // Writes a new file; one that is there already is replaced.
 void WriteWholeFile(const std::string& name, const std::string& bytes) {
     const OwnedPath path(name);
-    Check(FWriteWholeFile(path.get(), bytes.data(), bytes.size()), name);
+    Check(FWriteWholeFile(path.get(), bytes.data(), bytes.size()), name, "write");
 }
 
 int Append(const Words& words) {
@@ -260,12 +260,12 @@ int Append(const Words& words) {
     const std::string out = arguments.Option("-o", "");
     if (out.empty()) throw UsageError{"-o OUT is missing"};
     const RFileHeader header = HeaderOf(names[1]);
-    if (header.base != 0) throw Refusal{names[1], kNotResFileErr};
+    if (header.base != 0) throw Refusal(names[1], "append", kNotResFileErr);
     std::string bytes = ReadWholeFile(names[0]);
     const auto start = static_cast<uint32>(bytes.size());
     bytes += ReadWholeFile(names[1]);
     for (int32 shift = 24; shift >= 0; shift -= 8) bytes += static_cast<char>(start >> shift);
-    if (bytes.size() > UINT32_MAX) throw Refusal{out, kDiskFullErr};
+    if (bytes.size() > UINT32_MAX) throw Refusal(out, "write", kDiskFullErr);
     WriteWholeFile(out, bytes);
     return 0;
 }

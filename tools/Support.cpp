@@ -100,8 +100,8 @@ std::string FourCCText(FourCC code) {
 
 Session::Session() {
     DebugOutputSetHandler(TakeReport);
-    Check(InitTesselBase(), "start of the library");
-    Check(InitTesselAppSupport(), "start of the library");
+    Check(InitTesselBase(), "the library", "start");
+    Check(InitTesselAppSupport(), "the library", "start");
 }
 
 Session::~Session() {
@@ -110,7 +110,7 @@ Session::~Session() {
 }
 
 OwnedPath::OwnedPath(const std::string& native) {
-    Check(NativeToPath(native.c_str(), &path_), native);
+    Check(NativeToPath(native.c_str(), &path_), native, "look up");
 }
 
 OwnedPath::~OwnedPath() {
@@ -119,7 +119,7 @@ OwnedPath::~OwnedPath() {
 
 OpenRsrc::OpenRsrc(const std::string& file, int32 mode) : file_(file) {
     const OwnedPath path(file);
-    Check(ROpenFile(path.get(), mode, &refnum_, nullptr, nullptr), file);
+    Check(ROpenFile(path.get(), mode, &refnum_, nullptr, nullptr), file, "open");
 }
 
 OpenRsrc::~OpenRsrc() {
@@ -132,7 +132,7 @@ OpenRsrc::~OpenRsrc() {
 }
 
 void OpenRsrc::Close() {
-    Check(RCloseFile(refnum_), file_);
+    Check(RCloseFile(refnum_), file_, "write");
     refnum_ = 0;
 }
 
@@ -144,19 +144,19 @@ std::string ReadStandardInput() {
     std::string bytes;
     char block[65536];
     while (const size_t got = std::fread(block, 1, sizeof block, stdin)) bytes.append(block, got);
-    if (std::ferror(stdin)) throw Refusal{"standard input", kIOErr};
+    if (std::ferror(stdin)) throw Refusal("standard input", "read", kIOErr);
     return bytes;
 }
 
 void WriteStandardOutput(const std::string& bytes) {
     const bool written = std::fwrite(bytes.data(), 1, bytes.size(), stdout) == bytes.size();
-    if (!written || std::fflush(stdout) != 0) throw Refusal{"standard output", kIOErr};
+    if (!written || std::fflush(stdout) != 0) throw Refusal("standard output", "write", kIOErr);
 }
 
 std::string ReadWholeFile(const std::string& file) {
     const OwnedPath path(file);
     File_t* open = nullptr;
-    Check(FMOpen(&open, path.get(), kFOpenRead, kFDenyWrite), file);
+    Check(FMOpen(&open, path.get(), kFOpenRead, kFDenyWrite), file, "open");
     uint64 size = 0;
     MgErr err = FGetEOF64(open, &size);
     if (!err && size > std::numeric_limits<uint32>::max()) err = kMemFullErr;
@@ -166,7 +166,7 @@ std::string ReadWholeFile(const std::string& file) {
         err = FMRead(open, static_cast<uint32>(size), nullptr, &bytes[0]);
     }
     FMClose(open);
-    Check(err, file);
+    Check(err, file, "read");
     return bytes;
 }
 

@@ -14,14 +14,18 @@ struct UsageError {
     std::string message;
 };
 
-// What the library refused: exit 1 with "tessel: SUBJECT: <meaning of the code> (<code>)".
+// What the library refused: exit 1 with "tessel: SUBJECT: OPERATION: <cause> (<code>)". The cause is what the system
+// said, or what the code means.
 struct Refusal {
-    std::string subject;
+    Refusal(const std::string& itsSubject, const char* itsOperation, MgErr itsCode)
+        : subject(itsSubject), operation(itsOperation), code(itsCode), cause(FErrorText(itsCode)) {}
+    std::string subject, operation;
     MgErr code;
+    std::string cause;
 };
 
-inline void Check(MgErr err, const std::string& subject) {
-    if (err) throw Refusal{subject, err};
+inline void Check(MgErr err, const std::string& subject, const char* operation) {
+    if (err) throw Refusal(subject, operation, err);
 }
 
 // Arguments of a command: options by name, and what is left in order.

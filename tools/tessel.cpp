@@ -45,8 +45,8 @@ int main(int count, char** words) {
         std::fprintf(stderr, "tessel: %s\nTry `tessel --help`.\n", error.message.c_str());
         return kWrongUsage;
     } catch (const tool::Refusal& refusal) {
-        std::fprintf(stderr, "tessel: %s: %s (%d)\n", refusal.subject.c_str(), MgErrMeaning(refusal.code),
-                     refusal.code);
+        std::fprintf(stderr, "tessel: %s: %s: %s (%d)\n", refusal.subject.c_str(), refusal.operation.c_str(),
+                     refusal.cause.c_str(), refusal.code);
         return kRefused;
     } catch (const std::exception& error) {
         std::fprintf(stderr, "tessel: %s\n", error.what());

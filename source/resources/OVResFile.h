@@ -84,7 +84,7 @@ private:
 
     // loading
     uint64 DataStart() const { return base_ + map_.Head()->header.dataOffset; }
-    MgErr DataLengthAt(const ResourceEntry& entry, uint32* length);
+    MgErr DataLengthAt(const ResourceEntry& entry, uint32* length, uint64* size);
     MgErr LoadData(const ResourceEntry& entry, std::unique_ptr<ResourceData>* data);
     MgErr Load(ResType type, ResourceEntry* entry, OVResource** resource);
     OVResource* LoadedAt(const ResourceEntry& entry) const;

@@ -116,7 +116,8 @@ private:
         entry->held = loaded ? loaded->data_.get() : nullptr;
         if (entry->changed && loaded && !entry->held) return kResNotFoundErr;  // its data were taken away
         if (!entry->changed || !entry->held) {
-            if (const MgErr err = file_.DataLengthAt(reference, &entry->diskLength)) return err;
+            uint64 size = 0;
+            if (const MgErr err = file_.DataLengthAt(reference, &entry->diskLength, &size)) return err;
         }
         entry->length = entry->held ? entry->held->GetSize() : entry->diskLength;
         return kNoErr;

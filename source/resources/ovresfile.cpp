@@ -171,24 +171,26 @@ void OVResFile::Dispose() {
 
 // ---- loading --------------------------------------------------------------------------------------------------------
 
-// The length word of an entry, which must lie in the data section with all it counts.
-MgErr OVResFile::DataLengthAt(const ResourceEntry& entry, uint32* length) {
+// The length word of an entry, which must lie in the data section with all it counts. What the file does not have any
+// more is not taken from what was read ahead; `size` is what it has.
+MgErr OVResFile::DataLengthAt(const ResourceEntry& entry, uint32* length, uint64* size) {
     const uint64 dataLength = map_.Head()->header.dataLength;
     const uint64 start = entry.data;
     if (start + 4 > dataLength || !io_) return kEOFErr;
+    if (const MgErr err = io_->Size(size)) return err;
+    if (DataStart() + start + 4 > *size) return kNotResFileErr;
     uint32 word = 0;
-    if (io_->Read(DataStart() + start, &word, 4)) return kNotResFileErr;
+    if (const MgErr err = io_->Read(DataStart() + start, &word, 4)) return err == kEOFErr ? kNotResFileErr : err;
     *length = ToBig32(word);
     return start + 4 + *length > dataLength ? kEOFErr : kNoErr;
 }
 
 MgErr OVResFile::LoadData(const ResourceEntry& entry, std::unique_ptr<ResourceData>* data) {
     uint32 length = 0;
-    if (const MgErr err = DataLengthAt(entry, &length)) return err;
+    uint64 size = 0;
+    if (const MgErr err = DataLengthAt(entry, &length, &size)) return err;
     // Nor may a data section that the source does not have.
     const uint64 start = DataStart() + entry.data + 4;
-    uint64 size = 0;
-    if (const MgErr err = io_->Size(&size)) return err;
     if (start > size || length > size - start) return kEOFErr;
 
     if (const uint8* place = io_->InPlace(start)) {

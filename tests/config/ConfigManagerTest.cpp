@@ -180,6 +180,16 @@ TEST(ConfigManager, TakesTheSectionOfTheEdition) {
     EXPECT_EQ(kNoErr, nameless->Remove(kConfigI32, "a", false));
 }
 
+template <class Body>
+std::string Raised(Body body) {
+    try {
+        body();
+        return "nothing";
+    } catch (const OVExcept& e) {
+        return std::to_string(e.Code()) + ' ' + e.Detail();
+    }
+}
+
 TEST(ConfigManager, ManagersOfOtherFiles) {
     StartedConfig started;
     started.drive.Put("other.ini", "[App]\nn=5\n");
@@ -192,25 +202,14 @@ TEST(ConfigManager, ManagersOfOtherFiles) {
     EXPECT_EQ(kUnsupportedErr, CfgGetDefaultFrom(&wide, kConfigI32, Key("n"), &n));
     EXPECT_EQ(kArgErr, CfgGetDefaultFrom(nullptr, kConfigI32, Key("n"), &n));
     ConfigManager* manager = nullptr;
-    for (PathRef* path : {&none, &relative}) {
+    const std::string notValid = "1 Not a Valid path to a preference file.";
+    for (PathRef* path : {&none, &relative, &volume}) {
         EXPECT_EQ(kArgErr, ConstructCfgAccess(path, &manager));
-        try {
-            ConstructCfgAccessPathRef(*path, &manager);
-            ADD_FAILURE();
-        } catch (const OVExcept& e) {
-            EXPECT_EQ(kArgErr, e.Code());
-            EXPECT_STREQ("Not a Valid path to a preference file.", e.Detail());
-        }
+        EXPECT_EQ(notValid, Raised([&] { ConstructCfgAccessPathRef(*path, &manager); }));
     }
     EXPECT_EQ(kArgErr, ConstructCfgAccess(&other, nullptr));
     EXPECT_EQ(kArgErr, ConstructCfgAccessCStr(nullptr, &manager));
-    try {
-        ConstructCfgAccessCStr("\\\\", &manager);
-        ADD_FAILURE();
-    } catch (const OVExcept& e) {
-        EXPECT_EQ(kArgErr, e.Code());
-        EXPECT_STREQ("Error constructing Config Manager", e.Detail());
-    }
+    EXPECT_EQ("1 Error constructing Config Manager", Raised([&] { ConstructCfgAccessCStr("\\\\", &manager); }));
     ASSERT_EQ(kNoErr, ConstructCfgAccess(&other, &manager));
     EXPECT_EQ(2, manager->AddRef());
     EXPECT_EQ(1, manager->RemoveRef());
@@ -241,7 +240,7 @@ TEST(ConfigManager, SaysWhyThereIsNoValue) {
     ConfigManager* held = GetMainCfgAccess();
     held->AddRef();
     EXPECT_EQ(kNoErr, CfgGetDefault(kConfigI32, Key("n"), &value));
-    started.library.reset();
+    UninitTesselAppSupport();
     EXPECT_EQ(nullptr, GetMainCfgAccess());
     Path path = nullptr;
     LStrHandle text = nullptr;
@@ -249,9 +248,11 @@ TEST(ConfigManager, SaysWhyThereIsNoValue) {
                       CfgRemove(kConfigI32, Key("n")), CfgGetPrefFilePath(&path), CfgGetHostPrefsSection(&text),
                       CfgGetDefaultFrom(nullptr, kConfigI32, Key("n"), &value)})
         EXPECT_EQ(kGenericErr, err);
-    started.library = std::make_unique<StartedLibrary>();
-    EXPECT_EQ(kNoErr, held->GetDefault(kConfigI32, "n", &value)) << "it lives on";
-    held->RemoveRef();
+    EXPECT_EQ(kGenericErr, held->GetDefault(kConfigI32, "n", &value)) << "there are no types";
+    EXPECT_EQ("App", Section(*held)) << "it lives on";
+    InitTesselAppSupport();
+    EXPECT_EQ(kNoErr, held->GetDefault(kConfigI32, "n", &value));
+    EXPECT_EQ(0, held->RemoveRef());
 }
 
 TEST(ConfigManager, MemoryShadowsTheFile) {

@@ -207,7 +207,7 @@ protected:
             const bool isLong = scenario.name == "move" || scenario.name == "add a value" ||
                                 scenario.name == "delete a value" || scenario.name == "make a folder" ||
                                 scenario.name == "make a key";
-            if (isLong && !every && !FaultsAtLength()) continue;
+            if ((isLong && !every && !FaultsAtLength()) || scenario.name == leftOut_) continue;
             const Apart apart(scenario.name == "move across");
             scenario.next = [this, name = scenario.name] { ChangeNeighbour(name); };
             scenario.undone = scenario.name != "move across" && scenario.name != "make a key";
@@ -222,6 +222,7 @@ protected:
 
     ReportRecorder reports_;
     StartedFiles started;
+    std::string leftOut_;
 };
 
 TEST_F(FileFaults, AKillLeavesWhatWasThereOrWhatWasToBe) {
@@ -239,6 +240,8 @@ TEST_F(FileFaults, AFailingCallLeavesWhatWasThereOrDoesTheWork) {
     for (const int error : {EIO, ENOSPC, EINTR, EMFILE, EACCES, ENOMEM, EROFS, 0}) {
         if (!FaultsAtLength() && error != EIO) continue;
         SCOPED_TRACE(error);
+        // Who may not use his own trash uses that of the file system, outside of the drive.
+        leftOut_ = error == EACCES || error == EROFS ? "recycle" : "";
         ForEachScenario([&](FaultRunner& runner) { return runner.FailingCalls(error, false); }, false);
         if (error == EINTR || !FaultsAtLength()) continue;  // a signal for ever is none
         ForEachScenario([&](FaultRunner& runner) { return runner.FailingCalls(error, true); }, false);

@@ -29,6 +29,7 @@ class CfgSettings;
 
 // ---- settings -------------------------------------------------------------------------------------------------------
 
+// One setting: a value of a configuration type under a key.
 class TESSEL_API CfgData : public TrackedObject {
 public:
     CfgData() = default;
@@ -36,13 +37,20 @@ public:
     CfgData(const CfgData&) = delete;
     CfgData& operator=(const CfgData&) = delete;
 
-    virtual CStr Name() const = 0;     // the key; null for a setting that is not kept
-    virtual int32 Type() const = 0;    // its configuration type
-    virtual void* Value() = 0;         // as the type's procedures take it
-    virtual void* DefaultValue() = 0;  // null when there is none
+    // The key; null for a setting that is not kept.
+    virtual CStr Name() const = 0;
+    // Its configuration type.
+    virtual int32 Type() const = 0;
+    // The value as the type's procedures take it.
+    virtual void* Value() = 0;
+    // The default in the same form; null when there is none.
+    virtual void* DefaultValue() = 0;
+    // Whether it has a default.
     virtual bool HasDefault() const = 0;
-    virtual bool EqualsDefault() const = 0;  // false without one
-    virtual MgErr ResetToDefault() = 0;      // kArgErr without one
+    // Whether the value is the default; false without one.
+    virtual bool EqualsDefault() const = 0;
+    // Takes the default. kArgErr without one.
+    virtual MgErr ResetToDefault() = 0;
 
     // Whether CfgDataInit has taken the default, as there was nothing to read or it could not be read.
     bool IsDefaulted() const { return isDefaulted_; }
@@ -73,9 +81,12 @@ class CfgDataNoDefault_T : public CfgData {
     static_assert(!std::is_pointer_v<ValueType>, "a setting owns its value");
 
 public:
+    // A setting of that name and value.
     explicit CfgDataNoDefault_T(CStr name, ValueType value = ValueType()) : name_(name), value_(std::move(value)) {}
 
+    // The value.
     const ValueType& Get() const { return value_; }
+    // Gives it another value.
     void Set(ValueType value) { value_ = std::move(value); }
 
     CStr Name() const override { return name_; }
@@ -95,9 +106,11 @@ private:
 template <class ValueType, int32 kType>
 class CfgData_T : public CfgDataNoDefault_T<ValueType, kType> {
 public:
+    // A setting of that name, whose value is its default.
     CfgData_T(CStr name, ValueType defaultValue)
         : CfgDataNoDefault_T<ValueType, kType>(name, defaultValue), default_(std::move(defaultValue)) {}
 
+    // The default.
     const ValueType& GetDefault() const { return default_; }
 
     void* DefaultValue() override { return &default_; }
@@ -127,6 +140,7 @@ enum CfgDataValidationPolicy : int32 {
 class TESSEL_API CfgDataValidator {
 public:
     virtual ~CfgDataValidator();
+    // When settings are checked; `context` is the caller's.
     virtual CfgDataValidationPolicy Policy(void* context) = 0;
     // kNoErr when the setting may stay as it is; it may be changed. `readResult` is that of reading it; flags, context
     // and settings (null for a setting alone) are the caller's.

@@ -32,10 +32,14 @@ public:
     CfgSettings(const CfgSettings&) = delete;
     CfgSettings& operator=(const CfgSettings&) = delete;
 
+    // The name, with the qualifier.
     const std::string& Name() const { return name_; }
+    // How many settings it holds.
     int32 Count() const { return static_cast<int32>(entries_.size()); }
-    CfgData* At(int32 index) const;     // null for an index out of range
-    uint32 FlagsAt(int32 index) const;  // for its check; 0 for an index out of range
+    // A setting by its index from 0; null for an index out of range.
+    CfgData* At(int32 index) const;
+    // The flags of a setting for its check; 0 for an index out of range.
+    uint32 FlagsAt(int32 index) const;
 
     // At the end. The setting stays the caller's, and lives until it is released or the collection is destroyed.
     void Add(CfgData* data, uint32 flags = 0);
@@ -44,6 +48,7 @@ public:
 
     // Called before the settings are read: makes those that are not there yet. And after the last was released.
     virtual MgErr CreateData() { return kNoErr; }
+    // Destroys what CreateData made, after the last setting was released.
     virtual void DestroyData() {}
     // What checks them; null is the default one.
     virtual CfgDataValidator* Validator() { return nullptr; }
@@ -64,7 +69,9 @@ class CfgSettings_T : public CfgSettings {
 public:
     using CfgSettings::CfgSettings;
 
-    Data* operator->() const { return data_.get(); }  // null before they are made
+    // The settings; null before they are made.
+    Data* operator->() const { return data_.get(); }
+    // The settings; null before they are made.
     Data* Get() const { return data_.get(); }
 
     MgErr CreateData() override {
@@ -90,9 +97,12 @@ public:
     // The collection stays its owner's. kExistsErr: another one has its name; kGenericErr: there is no registry;
     // kMemFullErr; kArgErr for null. One that is registered already stays.
     static MgErr Register(CfgSettings* settings);
+    // Takes the collection out. Nothing for one that is not registered.
     static void Unregister(const CfgSettings* settings);
-    static CfgSettings* Find(CStr name);      // null when there is none
-    static std::vector<std::string> Names();  // in the order of their bytes
+    // The collection of that name; null when there is none.
+    static CfgSettings* Find(CStr name);
+    // The names, in the order of their bytes.
+    static std::vector<std::string> Names();
 };
 
 // Null manager: the main one. Null validator: the collection's own. All give kArgErr for null settings.
@@ -104,6 +114,7 @@ TESSEL_API MgErr CfgSettingsInit(CfgSettings* settings, ConfigManager* manager, 
 
 // Saves every setting, or one (kArgErr for an index out of range). The first failure.
 TESSEL_API MgErr CfgSettingsSave(CfgSettings* settings, ConfigManager* manager, CfgSavePolicy policy);
+// Saves one setting. kArgErr for an index out of range.
 TESSEL_API MgErr CfgSettingsSaveOneSetting(CfgSettings* settings, int32 index, ConfigManager* manager,
                                            CfgSavePolicy policy);
 

@@ -42,6 +42,7 @@ TESSEL_API MgErr CfgRemove(int32 type, ConstPStr key);
 
 // The path of the file, and the name of the section: made when they are null, the caller's.
 TESSEL_API MgErr CfgGetPrefFilePath(Path* path);
+// The name of the section in it, made when it is null; the caller's.
 TESSEL_API MgErr CfgGetHostPrefsSection(LStrHandle* section);
 
 // As CfgGetDefault, from the host's section of another preference file. kArgErr: the path is none of a file.
@@ -90,25 +91,31 @@ public:
 
     // The slots and their order are fixed.
     virtual ~ConfigManager();
-    virtual int32 AddRef();     // the number of references
-    virtual int32 RemoveRef();  // the number left
+    // One reference more; how many there are.
+    virtual int32 AddRef();
+    // One reference less; how many are left.
+    virtual int32 RemoveRef();
 
     // From memory, else from the file. As CfgGetDefault.
     virtual MgErr GetDefault(int32 type, const std::string& key, void* value);
+    // The same for a PStr key.
     virtual MgErr GetDefault(int32 type, ConstPStr key, void* value);
 
     // With `inMemory` into memory only; else into the file, and into memory too where the key is there, which is
     // reported.
     virtual MgErr Write(int32 type, const std::string& key, const void* value, bool inMemory);
+    // The same for a PStr key.
     virtual MgErr Write(int32 type, ConstPStr key, const void* value, bool inMemory);
 
     // With `inMemory` from memory only; else from the file, and from memory too, which is reported. A key that is not
     // there is no error.
     virtual MgErr Remove(int32 type, const std::string& key, bool inMemory);
+    // The same for a PStr key.
     virtual MgErr Remove(int32 type, ConstPStr key, bool inMemory);
 
     // Made when they are null; the caller's.
     virtual MgErr GetPrefFilePath(Path* path);
+    // The name of the section, made when it is null; the caller's.
     virtual MgErr GetHostPrefsSection(LStrHandle* section);
 
     // The section that is used from now on. Not while another thread uses the manager.
@@ -120,6 +127,7 @@ public:
 
     // As ConfigTypeFromString and ConfigTypeToString. One pair of double quotes belongs to the text here.
     virtual MgErr ValueFromString(int32 type, const std::string& text, void* value);
+    // The text of a value, as ConfigTypeToString.
     virtual MgErr ValueToString(int32 type, const void* value, std::string* text);
 
     // Whether the key is known. One that is not is reported.

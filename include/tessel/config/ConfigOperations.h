@@ -35,22 +35,29 @@ public:
     // The value in *value. kConfigKeyErr (20) when there is no such key; *value is left alone then, as on any failure.
     // kArgErr (1) for an empty name and a null output.
     virtual MgErr GetValue(const std::string& section, const std::string& key, std::string* value) = 0;
+    // The same in the store's own section.
     virtual MgErr GetValue(const std::string& key, std::string* value);
 
     // Makes the key, or replaces its value. kArgErr (1) for an empty name.
     virtual MgErr SetValue(const std::string& section, const std::string& key, const std::string& value) = 0;
+    // The same in the store's own section.
     virtual MgErr SetValue(const std::string& key, const std::string& value);
 
+    // Removes the key.
     virtual MgErr RemoveKey(const std::string& section, const std::string& key) = 0;
+    // The same in the store's own section.
     virtual MgErr RemoveKey(const std::string& key);
 
     // False for empty names too, and when the store cannot be read.
     virtual bool HasKey(const std::string& section, const std::string& key) = 0;
+    // The same in the store's own section.
     virtual bool HasKey(const std::string& key);
 
     // The list is emptied first. kArgErr (1) for a null list.
     virtual MgErr GetSectionNames(std::vector<std::string>* names) = 0;
+    // The keys of a section, as GetSectionNames.
     virtual MgErr GetKeyNames(const std::string& section, std::vector<std::string>* names) = 0;
+    // The same in the store's own section.
     virtual MgErr GetKeyNames(std::vector<std::string>* names);
 };
 

@@ -25,6 +25,7 @@ TESSEL_BEGIN_C
 // Makes the table, empty, and destroys it with what it holds: done by the start and the stop of the configuration.
 // kGenericErr when there is one already, or none; kMemFullErr. For the start-up thread.
 TESSEL_API MgErr InitConfigTypeRegistry(void);
+// Destroys the table with what it holds; as above.
 TESSEL_API MgErr UninitConfigTypeRegistry(void);
 
 // Adds a type. kGenericErr when it is registered (the first procedures stay) or there is no table; kMemFullErr.
