@@ -23,29 +23,29 @@ public:
     explicit PrefsFile(const std::string& name) : name_(name), path_(name), store_(*path_.get(), kNoSection) {}
 
     void MustExist() const {
-        if (FExists(path_.get()) != tessel::kCfgPathFile) throw Refusal{name_, kNotFoundErr};
+        if (FExists(path_.get()) != tessel::kCfgPathFile) throw Refusal(name_, "open", kNotFoundErr);
     }
     Words Sections() {
         Words names;
-        Check(store_.GetSectionNames(&names), name_);
+        Check(store_.GetSectionNames(&names), name_, "read");
         return names;
     }
     Words Keys(const std::string& section) {
         Words names;
-        Check(store_.GetKeyNames(section, &names), name_);
+        Check(store_.GetKeyNames(section, &names), name_, "read");
         return names;
     }
     std::string Get(const std::string& section, const std::string& key) {
         std::string value;
-        Check(store_.GetValue(section, key, &value), key);
+        Check(store_.GetValue(section, key, &value), name_ + ": " + key, "get");
         return value;
     }
     void Set(const std::string& section, const std::string& key, const std::string& value) {
-        Check(store_.SetValue(section, key, value), name_);
+        Check(store_.SetValue(section, key, value), name_, "set");
     }
     void Remove(const std::string& section, const std::string& key) {
         Get(section, key);  // one that is not there is refused
-        Check(store_.RemoveKey(section, key), name_);
+        Check(store_.RemoveKey(section, key), name_, "remove");
     }
 
 private:
@@ -59,9 +59,9 @@ std::string TypedText(const std::string& typeName, const std::string& text) {
     const auto type = static_cast<int32>(ParseFourCC(typeName, "--type"));
     ConfigValue value(type);
     const auto length = static_cast<int32>(text.size());
-    Check(ConfigTypeFromString(type, text.data(), length, value.Pointer()), "\"" + text + "\"");
+    Check(ConfigTypeFromString(type, text.data(), length, value.Pointer()), "\"" + text + "\"", "convert");
     LStrHandle written = nullptr;
-    Check(ConfigTypeToString(type, value.Pointer(), &written), "\"" + text + "\"");
+    Check(ConfigTypeToString(type, value.Pointer(), &written), "\"" + text + "\"", "convert");
     const std::string result(reinterpret_cast<const char*>((*written)->bytes), static_cast<size_t>((*written)->count));
     DSDisposeHandle(reinterpret_cast<UHandle>(written));
     return result;
@@ -210,7 +210,7 @@ int RunPrefs(const Words& words) {
     try {
         return verb->run(words[0], rest);
     } catch (const tessel::OVExcept& exception) {
-        throw Refusal{words[0], exception.Code()};
+        throw Refusal(words[0], verb->name, exception.Code());
     }
 }
 

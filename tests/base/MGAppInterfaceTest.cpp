@@ -1,6 +1,5 @@
+#include "support/Test.h"
 #include <tessel/base/MGAppInterface.h>
-
-#include <gtest/gtest.h>
 
 namespace {
 
@@ -19,26 +18,22 @@ private:
     uint32 base_;
 };
 
-void ExpectAnswers(MGAppInterfacePtr app, uint32 base) {
-    EXPECT_EQ(base + 3, MGGetAppAPIVersion(app));
-    EXPECT_EQ(base + 4, MGGetAppEditorVersion(app));
-    EXPECT_EQ(static_cast<int32>(base) + 11, MGGetIsTopLevel(app));
-    EXPECT_EQ(static_cast<int32>(base) + 12, MGGetIsBoundApp(app));
-    EXPECT_EQ(static_cast<int32>(base) + 13, MGGetIsRunTime(app));
-    EXPECT_EQ(static_cast<int32>(base) + 14, MGGetIsFullFeatureRunTime(app));
+std::vector<uint32> Answers(MGAppInterfacePtr app) {
+    const int32 flags[] = {MGGetIsTopLevel(app), MGGetIsBoundApp(app), MGGetIsRunTime(app),
+                           MGGetIsFullFeatureRunTime(app)};
+    std::vector<uint32> answers{MGGetAppAPIVersion(app), MGGetAppEditorVersion(app)};
+    answers.insert(answers.end(), std::begin(flags), std::end(flags));
+    return answers;
 }
 
 TEST(MGAppInterface, TheGivenObjectElseTheInstalledOneElseZero) {
-    EXPECT_EQ(nullptr, MGApp());
-    EXPECT_EQ(0, MGGetIsRunTime(nullptr));
+    EXPECT_EACH(MGApp() == nullptr, Answers(nullptr) == std::vector<uint32>(6, 0));
     NumberedApp installed(100), given(200);
-    ExpectAnswers(&given, 200);
+    const std::vector<uint32> of200{203, 204, 211, 212, 213, 214}, of100{103, 104, 111, 112, 113, 114};
+    EXPECT_EQ(of200, Answers(&given));
     MGAppInterfaceSet(&installed);
-    EXPECT_EQ(&installed, MGApp());
-    ExpectAnswers(nullptr, 100);
-    ExpectAnswers(&given, 200);
+    EXPECT_EACH(MGApp() == &installed, Answers(nullptr) == of100, Answers(&given) == of200);
     MGAppInterfaceSet(nullptr);
-    EXPECT_EQ(0u, MGGetAppAPIVersion(nullptr));
 }
 
 // The library calls by slot, and a host built elsewhere counts on it.

@@ -1,9 +1,8 @@
+#include "support/Test.h"
 #include <tessel/base/MGModule.h>
 
 #include <climits>
 #include <ctime>
-#include <gtest/gtest.h>
-#include <string>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -28,8 +27,7 @@ TEST(MGModule, HandlesAreKeptAsGiven) {
     EXPECT_EQ(0u, MGModuleGetInstance());
     MGModuleSetInstance(~MGModuleHandle{0});
     MGModuleSetModule(7);
-    EXPECT_EQ(~MGModuleHandle{0}, MGModuleGetInstance());
-    EXPECT_EQ(7u, MGModuleGetModule());
+    EXPECT_EACH(~MGModuleHandle{0} == MGModuleGetInstance(), MGModuleGetModule() == 7u);
     MGModuleSetInstance(0);
     MGModuleSetModule(0);
 }
@@ -37,16 +35,13 @@ TEST(MGModule, HandlesAreKeptAsGiven) {
 TEST(MGModule, PathIsTakenApart) {
     const std::string name = ProgramName();
     char text[kModuleTextSize];
-    EXPECT_EQ(static_cast<int32>(name.size()), MSWinGetModulePath(0, text, sizeof text));
-    EXPECT_EQ(name, text);
+    EXPECT_EACH(static_cast<int32>(name.size()) == MSWinGetModulePath(0, text, sizeof text), name == text);
     const size_t backslash = name.rfind('\\');
     MSWinGetModuleLocation(0, text);
     EXPECT_EQ(name.substr(0, backslash), text);
     MSWinGetModuleFileName(0, text);
-    EXPECT_EQ(name.substr(backslash + 1), text);
-    EXPECT_EQ(3, MSWinGetModulePath(0, text, 4));
-    EXPECT_STREQ("C:\\", text);
-    EXPECT_EQ(0, MSWinGetModulePath(0, nullptr, 10));
+    EXPECT_EACH(name.substr(backslash + 1) == text, MSWinGetModulePath(0, text, 4) == 3, text == "C:\\",
+                MSWinGetModulePath(0, nullptr, 10) == 0);
 }
 
 TEST(MGModule, ModDateIsTheFilesInUtc) {
@@ -62,9 +57,8 @@ TEST(MGModule, ModDateIsTheFilesInUtc) {
 TEST(MGModule, UnknownModuleIsToldToTheDebugger) {
     char text[kModuleTextSize] = "old";
     testing::internal::CaptureStderr();
-    EXPECT_EQ(0, MSWinGetModulePath(1, text, sizeof text));
-    EXPECT_EQ("failed to get module filename\n", testing::internal::GetCapturedStderr());
-    EXPECT_STREQ("", text);
+    EXPECT_EACH(MSWinGetModulePath(1, text, sizeof text) == 0,
+                testing::internal::GetCapturedStderr() == "failed to get module filename\n", text == "");
     testing::internal::CaptureStderr();
     MSWinGetModuleLocation(1, text);
     MSWinGetModuleFileName(1, text);

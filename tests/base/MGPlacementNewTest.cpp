@@ -1,10 +1,9 @@
+#include "support/Test.h"
 #include <tessel/base/MGPlacementNew.h>
 
-#include <gtest/gtest.h>
 #include <new>
-#include <string>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 std::string theEnds;
@@ -30,4 +29,4 @@ TEST(MGPlacementNew, ObjectsEndNewestFirstAndOnce) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,16 +1,13 @@
+#include "support/Test.h"
 #include <tessel/base/MgErr.h>
-
-#include <gtest/gtest.h>
 
 namespace {
 
 TEST(MgErr, MeaningsFollowTheCodes) {
-    EXPECT_STREQ("success", MgErrMeaning(kNoErr));
-    EXPECT_STREQ("not a resource file, or resource file not open", MgErrMeaning(13));
-    EXPECT_STREQ("resource file format version newer than this library reads", MgErrMeaning(122));
-    EXPECT_STREQ("registry value is not of a string type", MgErrMeaning(4011));
-    EXPECT_STREQ("unknown error", MgErrMeaning(12));
-    EXPECT_STREQ("unknown error", MgErrMeaning(-1));
+    EXPECT_EACH(MgErrMeaning(kNoErr) == "success", MgErrMeaning(13) == "not a resource file, or resource file not open",
+                MgErrMeaning(122) == "resource file format version newer than this library reads",
+                MgErrMeaning(4011) == "registry value is not of a string type", MgErrMeaning(12) == "unknown error",
+                MgErrMeaning(-1) == "unknown error");
 }
 
 }  // namespace

@@ -1,26 +1,19 @@
 #include "base/ReadMostlyTable.h"
+#include "support/Test.h"
 
 #include <array>
-#include <atomic>
-#include <cstdlib>
-#include <gtest/gtest.h>
-#include <random>
 #include <set>
-#include <thread>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 struct Item {
-    uint32 hash = 0;
-    uint32 content = 0;
+    uint32 hash = 0, content = 0;
 };
 
 template <uint32 kHashes>
 struct ItemKeys {
-    static constexpr uint32 kFirstSlots = 8;
-    static constexpr uint32 kSlotsPerUsed = 2;
-    static constexpr uint32 kMostHashes = kHashes;
+    static constexpr uint32 kFirstSlots = 8, kSlotsPerUsed = 2, kMostHashes = kHashes;
     static constexpr bool kRemoves = kHashes == 1;
     static uint32 Hashes(const Item* item) { return kHashes - item->hash % kHashes; }
     static uint32 Hash(const Item* item, uint32 n) { return (item->hash + n) * 0x0C000000u; }
@@ -113,8 +106,7 @@ TEST(ReadMostlyTable, IsReadWhileItIsChanged) {
         for (std::thread& reader : readers) reader = std::thread(read);
         for (uint32 i = 0; i < items.kItems / 2; ++i) {
             const uint32 guest = items.kItems / 2 + i;
-            EXPECT_TRUE(items.Add(guest));
-            EXPECT_TRUE(items.Add(i));
+            EXPECT_EACH(items.Add(guest), items.Add(i));
             there.store(i + 1, std::memory_order_release);
             items.Remove(guest);
             if (i % 8 == 7) std::this_thread::yield();
@@ -125,4 +117,4 @@ TEST(ReadMostlyTable, IsReadWhileItIsChanged) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -45,20 +45,20 @@ class Prefs(unittest.TestCase):
         self.assertEqual(before.replace(b"zoom=1.500000\r\n", b""), self.file.read_bytes())
 
     def test_refusals_say_why(self):
-        missing = (1, f"tessel: {self.file}: not found (7)\n")
+        missing = (1, f"tessel: {self.file}: open: there is no such file or folder (7)\n")
         for verb in ["list"], ["check"], ["get", "k"], ["remove", "k"]:
             self.tessel(*verb, expect=missing)
         self.file.write_bytes(b"k=maybe\n")
-        no_key = (1, "tessel: x: configuration key not found (20)\n")
+        no_key = (1, f"tessel: {self.file}: x: get: configuration key not found (20)\n")
         self.tessel("get", "x", expect=no_key)
         self.tessel("remove", "x", expect=no_key)
         self.tessel("get", "k", "--type", "Bool",
-                    expect=(1, 'tessel: "maybe": text cannot be converted to the configuration type (21)\n'))
-        self.tessel("set", "k", "1", "--type", "Nine", expect=(1, 'tessel: "1": unknown configuration type (19)\n'))
+                    expect=(1, 'tessel: "maybe": convert: text cannot be converted to the configuration type (21)\n'))
+        self.tessel("set", "k", "1", "--type", "Nine", expect=(1, 'tessel: "1": convert: unknown configuration type (19)\n'))
         self.assertEqual(b"k=maybe\n", self.file.read_bytes(), "what has no section stays without one")
         self.file.write_bytes(b"\xff\xfek")
         for words in ["list"], ["check"], ["set", "k", "1"]:
-            self.tessel(*words, expect=(1, f"tessel: {self.file}: unsupported format or operation (53)\n"))
+            self.tessel(*words, expect=(1, f"tessel: {self.file}: {'set' if len(words) > 1 else 'read'}: unsupported format or operation (53)\n"))
         self.assertEqual(b"\xff\xfek", self.file.read_bytes())
         for words in [], ["grow"], ["get"], ["set", "k"]:
             run = subprocess.run([*COMMAND, "prefs", str(self.file), *words], capture_output=True, timeout=120)

@@ -1,24 +1,14 @@
 #include "diagnostics/AllocTracking.h"
 #include "diagnostics/TrackerHeap.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include "support/TextDumper.h"
 #include <tessel/diagnostics/AllocTracker.h>
 #include <tessel/diagnostics/DebugStream.h>
 
-#include <algorithm>
-#include <cstdlib>
-#include <gtest/gtest.h>
 #include <map>
-#include <memory>
-#include <random>
-#include <thread>
-#include <vector>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using test::ReportRecorder;
-using test::TextDumper;
 
 const void* At(uintptr_t address) {
     return reinterpret_cast<const void*>(address);
@@ -45,25 +35,18 @@ TEST_F(AllocTrackerTest, CountsWhatLivesAndWhatIsNotReported) {
     tracker.RemoveRecord(At(99));
     tracker.RemoveRecord(nullptr);
     tracker.AddRecord(nullptr, 1, "f.cpp", 1);
-    EXPECT_EQ(4, tracker.CountLive());
-    EXPECT_EQ(4, tracker.CountUnreported());
+    EXPECT_EACH(tracker.CountLive() == 4, tracker.CountUnreported() == 4);
     tracker.MarkAllReported();
-    EXPECT_EQ(4, tracker.CountLive());
-    EXPECT_EQ(0, tracker.CountUnreported());
+    EXPECT_EACH(tracker.CountLive() == 4, tracker.CountUnreported() == 0);
     tracker.Register(At(7));
     EXPECT_EQ(1, tracker.CountUnreported());
     tracker.RemoveRecord(At(16));
     EXPECT_EQ(1, tracker.CountUnreported()) << "one that was reported is gone";
     tracker.Unregister(At(7));
-    EXPECT_EQ(0, tracker.CountUnreported());
-    EXPECT_EQ(3, tracker.Count());
-    EXPECT_TRUE(tracker.IsTracked(At(32)));
-    EXPECT_FALSE(tracker.IsTracked(At(48)));
+    EXPECT_EACH(tracker.CountUnreported() == 0, tracker.Count() == 3, tracker.IsTracked(At(32)),
+                !tracker.IsTracked(At(48)));
     const auto totals = tracker.GetTotals();
-    EXPECT_EQ(6u, totals.made);
-    EXPECT_EQ(500u, totals.bytesMade);
-    EXPECT_EQ(3u, totals.live);
-    EXPECT_EQ(300u, totals.bytesLive);
+    EXPECT_EACH(totals.made == 6u, totals.bytesMade == 500u, totals.live == 3u, totals.bytesLive == 300u);
 }
 
 TEST_F(AllocTrackerTest, ReportHasOneBlockARecordInTheOrderOfAddresses) {
@@ -134,9 +117,7 @@ TEST_F(AllocTrackerTest, RecordsTheCallsThatMadeTheObject) {
     const auto stack = StackOf(tracker, 0x10);
     ASSERT_GE(stack.size(), 5u);
     EXPECT_TRUE(IsIn(stack[0], &Make)) << "begins where AddRecord is called";
-    EXPECT_EQ(stack[2], stack[3]);
-    EXPECT_EQ(stack[3], stack[4]);
-    EXPECT_EQ(16u, StackOf(tracker, 0x20).size());
+    EXPECT_EACH(stack[2] == stack[3], stack[3] == stack[4], StackOf(tracker, 0x20).size() == 16u);
     EXPECT_NE(stack, StackOf(tracker, 0x30)) << "made by another call of the test";
 
     tracker.SetSkip(4);
@@ -145,8 +126,7 @@ TEST_F(AllocTrackerTest, RecordsTheCallsThatMadeTheObject) {
     tracker.SetSkip(40);
     MakeDeep(tracker, 0x50, 60);
     MakeDeep(tracker, 0x60, 1);
-    EXPECT_EQ(16u, StackOf(tracker, 0x50).size());
-    EXPECT_LE(StackOf(tracker, 0x60).size(), 16u);
+    EXPECT_EACH(StackOf(tracker, 0x50).size() == 16u, StackOf(tracker, 0x60).size() <= 16u);
 }
 
 // The same frames at the same places, reached by other calls, must not be taken for the walk remembered.
@@ -179,8 +159,8 @@ TEST_F(AllocTrackerTest, DuplicateIsReportedAndTheEarlierRecordStays) {
     EXPECT_EQ(1, tracker.CountLive());
     const auto texts = recorder.Texts(kDebugInfo);
     ASSERT_GE(texts.size(), 4u);
-    EXPECT_EQ("Duplicate pointer first returned in this context:\n", texts[0]);
-    EXPECT_EQ("----------------------\nFile first.cpp      ; Line 1     # ", texts[1]);
+    EXPECT_EACH(texts[0] == "Duplicate pointer first returned in this context:\n",
+                texts[1] == "----------------------\nFile first.cpp      ; Line 1     # ");
     tracker.RemoveRecord(At(0x10));
     EXPECT_EQ(0, tracker.CountLive());
 }
@@ -204,8 +184,7 @@ TEST_F(AllocTrackerTest, WhatADumperMakesIsNotTracked) {
     tracker.AddRecord(At(0x20), 1, "f.cpp", 1);
     BusyDumper dumper(tracker);
     tracker.DumpAll(&dumper);
-    EXPECT_EQ(0, tracker.CountLive());
-    EXPECT_NE(std::string::npos, dumper.text.find("Number of unfreed items: 2\n"));
+    EXPECT_EACH(tracker.CountLive() == 0, std::string::npos != dumper.text.find("Number of unfreed items: 2\n"));
     tracker.AddRecord(At(0x30), 1, "f.cpp", 1);
     EXPECT_EQ(1, tracker.CountLive());
 }
@@ -216,9 +195,7 @@ TEST_F(AllocTrackerTest, AfterShutdownNothingIsDone) {
     tracker.AddRecord(At(0x20), 1, "f.cpp", 1);
     TextDumper dumper;
     tracker.DumpAll(&dumper);
-    EXPECT_EQ("", dumper.text);
-    EXPECT_EQ(0, tracker.CountLive());
-    EXPECT_FALSE(tracker.IsTracked(At(0x10)));
+    EXPECT_EACH(dumper.text == "", tracker.CountLive() == 0, !tracker.IsTracked(At(0x10)));
 }
 
 TEST(AllocTracking, CanBeTurnedOff) {
@@ -258,10 +235,8 @@ TEST_F(AllocTrackerTest, AgreesWithAModel) {
         bytes += size;
         ASSERT_TRUE(tracker.IsTracked(At(address)));
     }
-    EXPECT_EQ(static_cast<int32>(model.size()), tracker.CountLive());
-    EXPECT_EQ(bytes, tracker.GetTotals().bytesLive);
-    EXPECT_EQ(mostLive, tracker.GetTotals().mostLive);
-    EXPECT_EQ(mostBytes, tracker.GetTotals().mostBytesLive);
+    EXPECT_EACH(static_cast<int32>(model.size()) == tracker.CountLive(), bytes == tracker.GetTotals().bytesLive,
+                mostLive == tracker.GetTotals().mostLive, mostBytes == tracker.GetTotals().mostBytesLive);
 }
 
 TEST_F(AllocTrackerTest, TellsHowMuchEachLineHolds) {
@@ -274,9 +249,7 @@ TEST_F(AllocTrackerTest, TellsHowMuchEachLineHolds) {
     tracker.RemoveRecord(At(0x50));
     tracker.MarkAllReported();
     AllocTracker::Site sites[3] = {};
-    EXPECT_EQ(3, tracker.GetSites(sites, 2));
-    EXPECT_EQ(nullptr, sites[2].file);
-    EXPECT_EQ(3, tracker.GetSites(sites, 3));
+    EXPECT_EACH(tracker.GetSites(sites, 2) == 3, sites[2].file == nullptr, tracker.GetSites(sites, 3) == 3);
     std::string text;
     for (const auto& site : sites)
         text += std::string(site.file) + ':' + std::to_string(site.line) + ' ' + std::to_string(site.live) + ' ' +
@@ -299,15 +272,13 @@ TEST_F(AllocTrackerTest, ThreadsMakeAndReleaseTogether) {
     for (auto& thread : threads) thread.join();
     EXPECT_EQ(static_cast<int32>(kThreads), tracker.CountLive());
     const auto totals = tracker.GetTotals();
-    EXPECT_EQ(kThreads * kEach, totals.made);
-    EXPECT_EQ(kThreads * kEach, totals.bytesMade);
+    EXPECT_EACH(kThreads * kEach == totals.made, kThreads * kEach == totals.bytesMade);
     TextDumper after;
     tracker.AddRecord(At(8), 1, "f.cpp", 1);
     tracker.DumpOne(At(8), &after);
     EXPECT_NE(std::string::npos, after.text.find(' ' + std::to_string(kThreads * kEach + 1) + " "))
         << "no number was lost";
-    EXPECT_GE(totals.mostLive, kEach);
-    EXPECT_LE(totals.mostLive, totals.made);
+    EXPECT_EACH(totals.mostLive >= kEach, totals.mostLive <= totals.made);
     EXPECT_EQ(totals.mostLive, totals.mostBytesLive) << "each is one byte";
 }
 
@@ -345,8 +316,7 @@ protected:
             tracker->AddRecord(At(1), 1, "f.cpp", 1);
             TextDumper dumper;
             tracker->DumpAll(&dumper);
-            EXPECT_EQ("", dumper.text);
-            EXPECT_EQ(0, tracker->CountLive());
+            EXPECT_EACH(dumper.text == "", tracker->CountLive() == 0);
         }
         DestroyAllocTracker(tracker);
         return recorder.Texts();
@@ -373,8 +343,8 @@ TEST_F(AllocTrackerFailures, OutOfMemoryWhileDumping) {
     theAllocationsLeft = 0;
     TextDumper dumper;
     tracker->DumpAll(&dumper);
-    EXPECT_EQ("", dumper.text);
-    EXPECT_EQ(std::vector<std::string>{"memdebug deactivated. Internal out of memory.\n"}, recorder.Texts());
+    EXPECT_EACH(dumper.text == "",
+                std::vector<std::string>{"memdebug deactivated. Internal out of memory.\n"} == recorder.Texts());
     DestroyAllocTracker(tracker);
 }
 
@@ -394,4 +364,4 @@ TEST_F(AllocTrackerFailures, AnAllocatorThatGivesOrTakesWronglyTurnsItOff) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

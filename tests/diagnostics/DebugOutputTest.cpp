@@ -1,18 +1,14 @@
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include <tessel/diagnostics/DebugOutput.h>
 #include <tessel/diagnostics/DebugStream.h>
 
-#include <algorithm>
-#include <cstdlib>
-#include <gtest/gtest.h>
 #include <sys/mman.h>
 #include <sys/resource.h>
 #include <unistd.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
-using test::ReportRecorder;
 using testing::ExitedWithCode;
 
 TEST(DebugOutput, DefaultBehaviourCountsAndShowsSeriousReports) {
@@ -25,11 +21,8 @@ TEST(DebugOutput, DefaultBehaviourCountsAndShowsSeriousReports) {
     const std::string shown = testing::internal::GetCapturedStderr();
     EXPECT_EQ(0u, shown.find("ERR 2a: f.cpp(12): boom\nERR abcdef01: (1): xxx"));
     EXPECT_EQ(1023u - 19u, static_cast<size_t>(std::count(shown.begin(), shown.end(), 'x'))) << "cut at 1023 bytes";
-    EXPECT_EQ(0, DebugOutputGetNumEvents(1));
-    EXPECT_EQ(1, DebugOutputGetNumEvents(2));
-    EXPECT_EQ(2, DebugOutputGetNumEvents(3));
-    EXPECT_EQ(0, DebugOutputGetNumEvents(5));
-    EXPECT_EQ(0, DebugOutputGetNumEvents(-1));
+    EXPECT_EACH(DebugOutputGetNumEvents(1) == 0, DebugOutputGetNumEvents(2) == 1, DebugOutputGetNumEvents(3) == 2,
+                DebugOutputGetNumEvents(5) == 0, DebugOutputGetNumEvents(-1) == 0);
     DebugOutputIncrementEventCount(1);
     DebugOutputIncrementEventCount(99);
     EXPECT_EQ(1, DebugOutputGetNumEvents(1));
@@ -71,8 +64,7 @@ TEST(DebugOutput, AHandlerTakesEverything) {
     ReportRecorder recorder;
     DebugOutputCallHandler("f.cpp", 12, "id", kDebugFatal, 7, "still here");
     ASSERT_EQ(1u, recorder.Count());
-    EXPECT_EQ("still here", recorder.Texts()[0]);
-    EXPECT_EQ(0, DebugOutputGetNumEvents(kDebugFatal));
+    EXPECT_EACH(recorder.Texts()[0] == "still here", DebugOutputGetNumEvents(kDebugFatal) == 0);
 }
 
 int theHandlerCalls = 0;
@@ -86,18 +78,16 @@ TEST(DebugOutput, AHandlerThatReportsDoesNotRecurseForEver) {
     });
     TESSEL_REPORT(kDebugInfo, 5u) << "first";
     DebugOutputSetHandler(nullptr);
-    EXPECT_GE(theHandlerCalls, 2);
-    EXPECT_LE(theHandlerCalls, 16);
+    EXPECT_EACH(theHandlerCalls >= 2, theHandlerCalls <= 16);
     EXPECT_EQ(1, DebugOutputGetNumEvents(kDebugInfo)) << "the innermost has the default behaviour";
 }
 
 TEST(DebugOutput, StopHereReportsAndReturnsZero) {
     ReportRecorder recorder;
     testing::internal::CaptureStderr();
-    EXPECT_EQ(0, StopHere("look"));
-    EXPECT_EQ(0, StopHere(nullptr));
-    EXPECT_EQ(0u, testing::internal::GetCapturedStderr().find("look"));
-    EXPECT_EQ((std::vector<std::string>{"StopHere: look", "StopHere: "}), recorder.Texts(kDebugInfo));
+    EXPECT_EACH(StopHere("look") == 0, StopHere(nullptr) == 0,
+                testing::internal::GetCapturedStderr().find("look") == 0u,
+                (std::vector<std::string>{"StopHere: look", "StopHere: "}) == recorder.Texts(kDebugInfo));
 }
 
 TEST(DebugOutput, VerifySingleFormatSpecifier) {
@@ -112,10 +102,10 @@ TEST(DumpSomeMemory, ShowsWholeLines) {
     DumpSomeMemory(bytes, 20);
     const auto lines = recorder.Texts(kDebugTrace);
     ASSERT_EQ(2u, lines.size());
-    EXPECT_EQ("41 42 43 44 45 46 47 48 49 4A 4B 4C 4D 4E 4F 50   ABCDEFGHIJKLMNOP",
-              lines[0].substr(lines[0].find("  ") + 2));
-    EXPECT_EQ("01 7F 80 20 7E 51 52 53 54 55 56 57 58 59 5A 00   ... ~QRSTUVWXYZ.",
-              lines[1].substr(lines[1].find("  ") + 2));
+    EXPECT_EACH(lines[0].substr(lines[0].find("  ") + 2) ==
+                    "41 42 43 44 45 46 47 48 49 4A 4B 4C 4D 4E 4F 50   ABCDEFGHIJKLMNOP",
+                lines[1].substr(lines[1].find("  ") + 2) ==
+                    "01 7F 80 20 7E 51 52 53 54 55 56 57 58 59 5A 00   ... ~QRSTUVWXYZ.");
     char address[32];
     std::snprintf(address, sizeof address, "%08llX",
                   static_cast<unsigned long long>(reinterpret_cast<uintptr_t>(bytes) + 16));
@@ -145,4 +135,4 @@ TEST(DumpSomeMemory, BytesThatCannotBeReadAreMarked) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,17 +1,11 @@
 #include "diagnostics/Service.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include <tessel/diagnostics/DebugStream.h>
 
-#include <cstring>
-#include <gtest/gtest.h>
 #include <limits>
-#include <memory>
-#include <vector>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using test::ReportRecorder;
 
 template <class... Values>
 std::string Reported(const Values&... values) {
@@ -29,22 +23,19 @@ TEST(DebugStream, ReportCarriesItsPlace) {
     TESSEL_REPORT(kDebugError, 0xCAFE0001u) << "boom " << 1;
     const int line = __LINE__ - 1;
     const test::Report report = recorder.Reports().at(0);
-    EXPECT_EQ(kDebugError, report.level);
-    EXPECT_EQ(0xCAFE0001u, report.siteCode);
-    EXPECT_EQ("boom 1", report.text);
-    EXPECT_EQ("tests/diagnostics/DebugStreamTest.cpp", report.file);
-    EXPECT_EQ(line, report.line);
-    EXPECT_EQ("TestBody", report.identifier);
+    EXPECT_EACH(report.level == kDebugError, report.siteCode == 0xCAFE0001u, report.text == "boom 1",
+                report.file == "tests/diagnostics/DebugStreamTest.cpp", line == report.line,
+                report.identifier == "TestBody");
 }
 
 TEST(DebugStream, NumbersAreWrittenInFull) {
-    EXPECT_EQ("-32768 32767 65535 255",
-              Reported(int16(-32768), ' ', int16(32767), ' ', uint16(65535), ' ', uint8(255)));
-    EXPECT_EQ("-2147483648 4294967295 0", Reported(int32(-2147483647 - 1), ' ', uint32(0xFFFFFFFFu), ' ', 0));
-    EXPECT_EQ("-9223372036854775808 18446744073709551615",
-              Reported(std::numeric_limits<int64>::min(), ' ', std::numeric_limits<uint64>::max()));
-    EXPECT_EQ("0.500000 -1.666667 inf", Reported(0.5f, ' ', -5.0 / 3, ' ', std::numeric_limits<double>::infinity()));
-    EXPECT_EQ("(1.000000, -2.500000)(0.250000, 3.000000)", Reported(cmplx64{1, -2.5f}, cmplx128{0.25, 3}));
+    EXPECT_EACH(
+        Reported(int16(-32768), ' ', int16(32767), ' ', uint16(65535), ' ', uint8(255)) == "-32768 32767 65535 255",
+        Reported(int32(-2147483647 - 1), ' ', uint32(0xFFFFFFFFu), ' ', 0) == "-2147483648 4294967295 0",
+        Reported(std::numeric_limits<int64>::min(), ' ', std::numeric_limits<uint64>::max()) ==
+            "-9223372036854775808 18446744073709551615",
+        Reported(0.5f, ' ', -5.0 / 3, ' ', std::numeric_limits<double>::infinity()) == "0.500000 -1.666667 inf",
+        Reported(cmplx64{1, -2.5f}, cmplx128{0.25, 3}) == "(1.000000, -2.500000)(0.250000, 3.000000)");
     EXPECT_EQ(255u, Reported(-1.7e308).size()) << "309 digits before the point are cut";
 }
 
@@ -56,24 +47,23 @@ TEST(DebugStream, TextsAreWrittenAndNullIsNothing) {
     LStrHandle handle = &text;
     LStrPtr emptyMaster = nullptr;
     LStrHandle emptyHandle = &emptyMaster;
-    EXPECT_EQ("abcabcabc", Reported(text, handle, static_cast<const LStrHandle*>(&handle)));
-    EXPECT_EQ("<>", Reported('<', static_cast<LStrPtr>(nullptr), LStrHandle(nullptr), emptyHandle,
-                             static_cast<const LStrHandle*>(nullptr), static_cast<CStr>(nullptr), '>'));
-    EXPECT_EQ("view", Reported(std::string_view("viewed", 4)));
+    EXPECT_EACH(Reported(text, handle, static_cast<const LStrHandle*>(&handle)) == "abcabcabc",
+                Reported('<', static_cast<LStrPtr>(nullptr), LStrHandle(nullptr), emptyHandle,
+                         static_cast<const LStrHandle*>(nullptr), static_cast<CStr>(nullptr), '>') == "<>",
+                Reported(std::string_view("viewed", 4)) == "view");
 }
 
 TEST(DebugStream, FormattingHelpers) {
     const uint8 pascal[] = {2, 'h', 'i', 'x'};
-    EXPECT_EQ("hi|c", Reported(DbgFmtPStr(pascal), '|', DbgFmtCStr("c"), DbgFmtCStr(nullptr), DbgFmtPStr(nullptr)));
-    EXPECT_EQ("0x0000002a 0xffffffff 0x0badcafe",
-              Reported(DbgFmtPtr(42), ' ', DbgFmtPtr(-1), ' ', DbgFmtHex(0x0BADCAFEu)));
-    EXPECT_EQ("TEX ", Reported(DbgFmtQuadChar(TESSEL_FOURCC('T', 'E', 'X', 1))));
-    EXPECT_EQ(" \x80~ ", Reported(DbgFmtQuadChar(TESSEL_FOURCC(127, 0x80, '~', 31))));
-    EXPECT_EQ("0xab12", Reported(DbgFmtSysThreadID(0xAB12)));
-    EXPECT_EQ("00042", Reported(DbgFmtType<int>(42, "%05d")));
-    EXPECT_EQ("50%", Reported(DbgFmtType<int>(50, "%d%%")));
-    EXPECT_EQ("__DbgFmtType: Bad Format__", Reported(DbgFmtType<int>(1, "%d%d")));
-    EXPECT_EQ(std::string(31, '7'), Reported(DbgFmtNum(std::string(40, '7').c_str())));
+    EXPECT_EACH(
+        Reported(DbgFmtPStr(pascal), '|', DbgFmtCStr("c"), DbgFmtCStr(nullptr), DbgFmtPStr(nullptr)) == "hi|c",
+        Reported(DbgFmtPtr(42), ' ', DbgFmtPtr(-1), ' ', DbgFmtHex(0x0BADCAFEu)) == "0x0000002a 0xffffffff 0x0badcafe",
+        Reported(DbgFmtQuadChar(TESSEL_FOURCC('T', 'E', 'X', 1))) == "TEX ",
+        Reported(DbgFmtQuadChar(TESSEL_FOURCC(127, 0x80, '~', 31))) == " \x80~ ",
+        Reported(DbgFmtSysThreadID(0xAB12)) == "0xab12", Reported(DbgFmtType<int>(42, "%05d")) == "00042",
+        Reported(DbgFmtType<int>(50, "%d%%")) == "50%",
+        Reported(DbgFmtType<int>(1, "%d%d")) == "__DbgFmtType: Bad Format__",
+        std::string(31, '7') == Reported(DbgFmtNum(std::string(40, '7').c_str())));
     // An address has the width of a pointer and no prefix.
     char expected[32];
     std::snprintf(expected, sizeof expected, "%0*llX", int(2 * sizeof(void*)),
@@ -120,4 +110,4 @@ TEST_F(DebugStreamPool, TheSeventeenthStreamAtOnceHasABufferOfItsOwn) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,12 +1,9 @@
+#include "support/Test.h"
 #include <tessel/diagnostics/StackChain.h>
 
 #include <exception>
-#include <gtest/gtest.h>
-#include <string>
-#include <thread>
-#include <vector>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 struct Frame {
@@ -34,9 +31,8 @@ TEST(StackChain, FollowsTheFramesAndSkips) {
     for (int i = 0; i < 6; ++i)
         frames[i] = {i < 5 ? &frames[i + 1] : nullptr, Address(0x100u + static_cast<unsigned>(i))};
     EXPECT_EQ((Addresses{0x99, 0x101, 0x102, 0x103}), Walk(frames, Address(0x99), 0)) << "no more than it holds";
-    EXPECT_EQ((Addresses{0x102, 0x103, 0x104, 0x105}), Walk(frames, Address(0x99), 2));
-    EXPECT_EQ((Addresses{0x105}), Walk(frames, Address(0x99), 5));
-    EXPECT_EQ(Addresses{}, Walk(frames, Address(0x99), 6));
+    EXPECT_EACH(Walk(frames, Address(0x99), 2) == (Addresses{0x102, 0x103, 0x104, 0x105}),
+                Walk(frames, Address(0x99), 5) == (Addresses{0x105}), Walk(frames, Address(0x99), 6) == Addresses{});
 }
 
 TEST(StackChain, EndsAtAFrameThatIsNone) {
@@ -49,8 +45,7 @@ TEST(StackChain, EndsAtAFrameThatIsNone) {
         return Walk(frames, Address(0x99), 0);
     };
     const Addresses upToTheBadOne{0x99, 0x101};
-    EXPECT_EQ((Addresses{0x99, 0x101, 0x102}), walkWith(&frames[2]));
-    EXPECT_EQ(upToTheBadOne, walkWith(nullptr));
+    EXPECT_EACH(walkWith(&frames[2]) == (Addresses{0x99, 0x101, 0x102}), upToTheBadOne == walkWith(nullptr));
     EXPECT_EQ(upToTheBadOne, walkWith(Address(1))) << "garbage";
     EXPECT_EQ(upToTheBadOne, walkWith(Address(~uintptr_t{0}))) << "beyond the stack";
     EXPECT_EQ(upToTheBadOne, walkWith(reinterpret_cast<const char*>(&frames[2]) + 1)) << "not aligned";
@@ -59,8 +54,7 @@ TEST(StackChain, EndsAtAFrameThatIsNone) {
         << "below the stack that is in use";
     static const Frame elsewhere{nullptr, Address(0x5)};
     EXPECT_EQ(upToTheBadOne, walkWith(&elsewhere)) << "not on the stack";
-    EXPECT_EQ((Addresses{0x99}), Walk(&elsewhere, Address(0x99), 0));
-    EXPECT_EQ(Addresses{}, Walk(frames, nullptr, 0));
+    EXPECT_EACH(Walk(&elsewhere, Address(0x99), 0) == (Addresses{0x99}), Walk(frames, nullptr, 0) == Addresses{});
 }
 
 __attribute__((noinline)) void RecordHere(StackChainFS<16>& chain, int32 skip) {
@@ -87,16 +81,13 @@ TEST(StackChain, RecordsTheCallsOfEveryThread) {
 TEST(FrameDecoder, NamesAFunctionOfAModule) {
     const auto start = reinterpret_cast<uintptr_t>(&std::terminate);
     const FrameDecoder decoder(Address(start + 1));
-    EXPECT_EQ(Address(start + 1), decoder.Address());
-    EXPECT_STREQ("libstdc++.so.6", decoder.Module());
-    EXPECT_STREQ("std::terminate()", decoder.Symbol());
-    EXPECT_STREQ("libstdc++.so.6 std::terminate()", decoder.Name());
-    EXPECT_EQ(1u, decoder.Offset());
+    EXPECT_EACH(Address(start + 1) == decoder.Address(), decoder.Module() == "libstdc++.so.6",
+                decoder.Symbol() == "std::terminate()", decoder.Name() == "libstdc++.so.6 std::terminate()",
+                decoder.Offset() == 1u);
 
     const FrameDecoder nowhere(Address(16));
-    EXPECT_STREQ("<unknown> <unknown>", nowhere.Name());
-    EXPECT_EQ(0u, nowhere.Offset());
+    EXPECT_EACH(nowhere.Name() == "<unknown> <unknown>", nowhere.Offset() == 0u);
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

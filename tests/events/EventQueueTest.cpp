@@ -3,14 +3,13 @@
 #include "memory/Heap.h"
 #include "support/FailingAllocator.h"
 #include "support/HandClock.h"
+#include "support/Test.h"
 
 #include <deque>
-#include <random>
 
 namespace tessel::test {
 namespace {
 
-using testing::ElementsAre;
 using Policy = MGEventQueue::DuplicatePostedEventPolicy;
 
 std::atomic<int> live{0};
@@ -78,18 +77,18 @@ TEST_F(EventQueueTest, TellsItsStatesAndClasses) {
     }
     EXPECT_THAT(ids, ElementsAre("04c7fa68-5a10-49d3-962c-fe1b5547f529", "44800ca1-9918-46e4-b56a-3a6477bd4713",
                                  "01cc1dc9-3c53-4c57-9339-dc06ad470d92", "4e4e9d55-2f55-42db-ae86-3d9af30bf513"));
-    EXPECT_EQ(static_cast<MGEventTarget*>(target), target->QueryClass(MGUnknown::ClassID()));
-    EXPECT_EQ(nullptr, target->QueryClass(MGEvent::ClassID()));
-    EXPECT_EQ(1u, target->Release());
+    EXPECT_EACH(static_cast<MGEventTarget*>(target) == target->QueryClass(MGUnknown::ClassID()),
+                target->QueryClass(MGEvent::ClassID()) == nullptr, target->Release() == 1u);
 
     MGEventQueue* queue = CreateMGEventQueue(nullptr, 2);
     auto* kept = new TestEvent(0, 7);
     EXPECT_EQ(67, queue->PostEvent(target, kept, false, nullptr));  // not running
     EXPECT_FALSE(queue->SetAcceptingEvents(true) || queue->IsAcceptingEvents());
     queue->Init();
-    EXPECT_EQ(1, queue->PostEvent(nullptr, kept, false, nullptr) | queue->PostEvent(target, nullptr, false, nullptr));
-    EXPECT_EQ(0, queue->PostEvent(target, kept, false, nullptr));
-    EXPECT_EQ(0, queue->PostEvent(target, new TestEvent(3), false, nullptr));
+    EXPECT_EACH(
+        (queue->PostEvent(nullptr, kept, false, nullptr) | queue->PostEvent(target, nullptr, false, nullptr)) == 1,
+        queue->PostEvent(target, kept, false, nullptr) == 0,
+        queue->PostEvent(target, new TestEvent(3), false, nullptr) == 0);
     char expected[256];
     std::snprintf(expected, sizeof expected,
                   "-->> BEGIN EVENT QUEUE DUMP FOR QUEUE '0x%08llx' <<--\nElements in queue: 2\nMax size:2\n"
@@ -102,9 +101,8 @@ TEST_F(EventQueueTest, TellsItsStatesAndClasses) {
     EXPECT_THAT(reports.Texts(), ElementsAre(expected, "0<invalid MGUnknown object>"));
     reports.Clear();
 
-    EXPECT_TRUE(queue->SetAcceptingEvents(false));
-    EXPECT_TRUE(queue->HasDispatchableEvent());
-    EXPECT_EQ(0u, queue->ProcessEvents(0, nullptr, 0));
+    EXPECT_EACH(queue->SetAcceptingEvents(false), queue->HasDispatchableEvent(),
+                queue->ProcessEvents(0, nullptr, 0) == 0u);
     EXPECT_EQ(2, queue->PostEvent(target, new TestEvent(0), false, nullptr));  // full as well as closed
     EXPECT_FALSE(queue->SetAcceptingEvents(true));
     EXPECT_EQ(1, queue->PostEvent(target, new TestEvent(0), false, nullptr));  // a duplicate, though full
@@ -218,8 +216,7 @@ TEST_F(EventQueueTest, DoesAsTheRulesSay) {
         ASSERT_TRUE(counters.delivered == model.counters.delivered && counters.purged == model.counters.purged &&
                     counters.dropped == model.counters.dropped);
     }
-    EXPECT_GT(model.counters.delivered, 10000u);
-    EXPECT_EQ(QueueModel::kMax, queue->GetMaxSize());
+    EXPECT_EACH(model.counters.delivered > 10000u, QueueModel::kMax == queue->GetMaxSize());
     End(queue);
     targets[1]->Release();
 }
@@ -241,8 +238,7 @@ TEST_F(EventQueueTest, HandlesWhatWasQueuedWhenItBegan) {
         HandClock& hand;
     } slow(clock);
     for (int serial : {4, 5, 6}) queue->PostEvent(target, new TestEvent(0, serial), true, nullptr);
-    EXPECT_EQ(2u, queue->ProcessEvents(0, &slow, 8));
-    EXPECT_EQ(2u, queue->GetNumEvents());
+    EXPECT_EACH(queue->ProcessEvents(0, &slow, 8) == 2u, queue->GetNumEvents() == 2u);
     End(queue);
 }
 
@@ -276,8 +272,8 @@ TEST_F(EventQueueTest, ManyPostersKeepTheirOrder) {
     EXPECT_TRUE(drain->inOrder);
     EXPECT_THAT(drain->next, testing::Each(each));
     const auto counters = queue->GetCounters();
-    EXPECT_TRUE(counters.delivered == 8u * static_cast<unsigned>(each) && counters.purged + counters.dropped == 0);
-    EXPECT_EQ(0u, queue->GetNumEvents());
+    EXPECT_EACH(counters.delivered == 8u * static_cast<unsigned>(each), counters.purged + counters.dropped == 0,
+                queue->GetNumEvents() == 0u);
     EXPECT_LT(heap::TotalAllocated() - before, 1001u * 256);  // the places of a full queue
     RecordProperty("full", std::to_string(full));
     End(queue);
@@ -294,8 +290,7 @@ TEST_F(EventQueueTest, SurvivesEveryAllocationThatFails) {
             EXPECT_EQ(kNoErr, queue->Init());
             int lost = 0;  // places that were used before need no memory: so post many
             for (int i = 0; i < 200; ++i) lost += queue->PostEvent(target, new TestEvent(0), true, nullptr) == 2;
-            EXPECT_EQ(200u, queue->GetNumEvents() + static_cast<unsigned>(lost));
-            EXPECT_LE(lost, 1);
+            EXPECT_EACH(queue->GetNumEvents() + static_cast<unsigned>(lost) == 200u, lost <= 1);
             refused += lost;
             End(queue);
         } else {

@@ -1,6 +1,5 @@
 // The library with its occurrences, started for as long as it lives. Leftovers and leaks are failures.
-#ifndef TESSEL_TESTS_EVENTS_EVENTSTESTSUPPORT_H
-#define TESSEL_TESTS_EVENTS_EVENTSTESTSUPPORT_H
+#pragma once
 
 #include "events/OccurrenceLocks.h"
 #include "support/ReportRecorder.h"
@@ -60,4 +59,3 @@ inline void* Name(const char* text) {
 
 }  // namespace tessel::test
 
-#endif

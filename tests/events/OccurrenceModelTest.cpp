@@ -1,10 +1,9 @@
 // Random operations on the occurrences of one thread, beside a model of the rules.
 #include "EventsTestSupport.h"
 #include "events/TimeList.h"
+#include "support/Test.h"
 
 #include <deque>
-#include <functional>
-#include <random>
 
 namespace tessel::test {
 namespace {
@@ -19,8 +18,7 @@ struct ModelOccurrence {
 
 struct ModelHandler {
     OccurHdlr refnum = 0;  // 0: freed
-    bool strict = false, threadSafe = false, armsAgain = false;
-    bool armed = false, fired = false, timedOut = false;
+    bool strict = false, threadSafe = false, armsAgain = false, armed = false, fired = false, timedOut = false;
     int occurrence = kNone;
     uint32 seen = 2;
 };
@@ -201,8 +199,8 @@ protected:
         if (operation < 5) return Set(o);
         if (operation == 5) return Note(o);
         if (operation < 9) {
-            EXPECT_EQ(!model.fired[0].empty() || !model.noted.empty(), QuickCheckGroupHandlersFired(0));
-            EXPECT_EQ(kNoErr, ChkOccurrences());
+            EXPECT_EACH((!model.fired[0].empty() || !model.noted.empty()) == QuickCheckGroupHandlersFired(0),
+                        ChkOccurrences() == kNoErr);
             return model.Run(0);
         }
         if (model.handlers[h].refnum) OnHandler(operation % 8, h, o);

@@ -6,21 +6,17 @@
 #include "platform/posix/SystemCalls.h"
 #include "support/FailingAllocator.h"
 #include "support/HandClock.h"
+#include "support/Test.h"
 
 #include <array>
 #include <chrono>
 #include <mutex>
 #include <optional>
-#include <random>
 #include <signal.h>
 #include <sys/time.h>
 
 namespace tessel::test {
 namespace {
-
-using testing::ElementsAre;
-using testing::IsEmpty;
-using Texts = std::vector<std::string>;
 
 class OccurrenceTest : public EventsTest {
 protected:
@@ -40,9 +36,7 @@ protected:
 TEST_F(OccurrenceTest, RefusesWhatIsNoRefnum) {
     const Occurrence gone = AllocOccur();
     const OccurHdlr handler = AllocOccurHdlr(0, Log::Note, Name("h")), freed = AllocOccurHdlr(gone, Log::Note, nullptr);
-    EXPECT_TRUE(ValidOccurrence(gone));
-    EXPECT_EQ(kNoErr, DeallocOccur(gone));
-    EXPECT_EQ(kNoErr, DeallocOccurHdlr(freed));
+    EXPECT_EACH(ValidOccurrence(gone), DeallocOccur(gone) == kNoErr, DeallocOccurHdlr(freed) == kNoErr);
     for (uint32 bad : {Occurrence{0}, gone, handler ^ 0x00100000u}) {
         EXPECT_FALSE(ValidOccurrence(bad));
         for (auto* operation : {DeallocOccur, Occur, CancelOccurAtTime}) EXPECT_EQ(1, operation(bad));
@@ -51,15 +45,11 @@ TEST_F(OccurrenceTest, RefusesWhatIsNoRefnum) {
     }
     for (OccurHdlr bad : {OccurHdlr{0}, freed}) {
         for (auto* operation : {DeallocOccurHdlr, CancelOnOccur, FireOccurHdlr}) EXPECT_EQ(1, operation(bad));
-        EXPECT_EQ(1, OnOccurrence(bad, false));
-        EXPECT_EQ(1, OnOccurrenceWithTimeout(bad, false, 5));
-        EXPECT_EQ(1, BindOccurHdlr(bad, gone, Log::Note, nullptr));
-        EXPECT_FALSE(HandlerTimedOut(bad));
+        EXPECT_EACH(OnOccurrence(bad, false) == 1, OnOccurrenceWithTimeout(bad, false, 5) == 1,
+                    BindOccurHdlr(bad, gone, Log::Note, nullptr) == 1, !HandlerTimedOut(bad));
     }
-    EXPECT_EQ(69, OnOccurrence(handler, false));
-    EXPECT_TRUE(HandlerTimedOut(handler));
-    EXPECT_EQ(1, CancelOnOccur(handler));
-    EXPECT_EQ(kNoErr, DeallocOccurHdlr(handler));
+    EXPECT_EACH(OnOccurrence(handler, false) == 69, HandlerTimedOut(handler), CancelOnOccur(handler) == 1,
+                DeallocOccurHdlr(handler) == kNoErr);
     EXPECT_THAT(Log::Take(), ElementsAre("h"));
 }
 
@@ -95,8 +85,7 @@ TEST_F(OccurrenceTest, ReportsNullCallbacksAndDamagedLists) {
                             "bogus handler list in BindOccurHdlr()"));
     EXPECT_THAT(Log::Take(), ElementsAre("h"));  // each insertion went ahead
     record.fired = 1;
-    EXPECT_EQ(kNoErr, CancelOnOccur(h));
-    EXPECT_TRUE(reports.Has(kDebugInfo, "Handler marked as FIRED not on fired list!!"));
+    EXPECT_EACH(CancelOnOccur(h) == kNoErr, reports.Has(kDebugInfo, "Handler marked as FIRED not on fired list!!"));
 
     TimeList::Entry nobodys(12345);
     {
@@ -121,13 +110,10 @@ TEST_F(OccurrenceTest, ThreadsCheckTheirGroup) {
     int one = 1, hundred = 100;
     const Occurrence o = AllocOccur();
     const OccurHdlr h = AllocOccurHdlr(o, Log::Note, Name("joined"));
-    for (int32 bad : {-1, 2048}) {
-        EXPECT_EQ(1, SetOccThreadGroup(bad, 0));
-        EXPECT_EQ(1, SetOccThreadGroup(0, bad));
-        EXPECT_EQ(1, SetOccThreadGroupProc(bad, tell, &one));
-        EXPECT_EQ(kNoErr, ChkThGroupOccurrences(bad));
-        EXPECT_FALSE(QuickCheckGroupHandlersFired(bad));
-    }
+    for (int32 bad : {-1, 2048})
+        EXPECT_EACH(SetOccThreadGroup(bad, 0) == 1, SetOccThreadGroup(0, bad) == 1,
+                    SetOccThreadGroupProc(bad, tell, &one) == 1, ChkThGroupOccurrences(bad) == kNoErr,
+                    !QuickCheckGroupHandlersFired(bad));
     EXPECT_EQ(kNoErr, SetOccThreadGroupProc(0, tell, &one));
     int32 index = 0;
     for (bool joins : {true, false}) {  // the second thread has the place of the first, and a group of its own
@@ -138,14 +124,12 @@ TEST_F(OccurrenceTest, ThreadsCheckTheirGroup) {
                 index = self->index;
                 EXPECT_EQ(kNoErr, SetOccThreadGroup(index, 0));
             }
-            EXPECT_EQ(index, self->index);
-            EXPECT_EQ(kNoErr, SetOccThreadGroupProc(index, tell, joins ? &one : &hundred));
+            EXPECT_EACH(index == self->index, SetOccThreadGroupProc(index, tell, joins ? &one : &hundred) == kNoErr);
             OnOccurrence(h, true);
             ThThreadDestroy(self);
         }).join();
         Occur(o);
-        EXPECT_EQ(joins, QuickCheckGroupHandlersFired(0));
-        EXPECT_EQ(!joins, QuickCheckGroupHandlersFired(index));
+        EXPECT_EACH(joins == QuickCheckGroupHandlersFired(0), !joins == QuickCheckGroupHandlersFired(index));
         ChkOccurrences();
         EXPECT_EQ(joins ? Texts{"joined"} : Texts{}, Log::Take());
     }
@@ -287,10 +271,8 @@ TEST_F(OccurrenceTest, StartsAsNewAfterEveryStop) {
     DeallocOccur(again);
 
     OccurrenceManagerService()->Uninit();
-    EXPECT_EQ(0u, AllocOccur() | AllocOccurHdlr(0, never, nullptr));
-    EXPECT_EQ(kNoErr, InterruptSafeOccur(again));
-    EXPECT_EQ(kNoErr, ChkOccurrences());
-    EXPECT_EQ(nullptr, GetOccurrenceManagerAsyncArea());
+    EXPECT_EACH((AllocOccur() | AllocOccurHdlr(0, never, nullptr)) == 0u, InterruptSafeOccur(again) == kNoErr,
+                ChkOccurrences() == kNoErr, GetOccurrenceManagerAsyncArea() == nullptr);
     OccurrenceManagerService()->Init();
 }
 
@@ -317,8 +299,7 @@ TEST_F(OccurrenceTest, SurvivesEveryAllocationThatFails) {
         failed = failing.HasFailed();
         EXPECT_EQ(before, heap::TotalAllocated()) << n;
     }
-    EXPECT_GT(refused, 8);
-    EXPECT_EQ(0u, reports.CountAt(kDebugWarning));
+    EXPECT_EACH(refused > 8, reports.CountAt(kDebugWarning) == 0u);
     OccurrenceManagerService()->Init();
 }
 
@@ -357,8 +338,7 @@ TEST_F(OccurrenceTest, TheAreaTakesAsManyAsItHasSlots) {
     for (Noted& each : noted) each.Alloc();
     SetResetCountDownRegCallbackProc([] { ++warnings; });
     for (int i = 0; i < 1023; ++i) EXPECT_EQ(kNoErr, (++noted[i].posted, InterruptSafeOccur(noted[i].occurrence)));
-    EXPECT_EQ(10, warnings);
-    EXPECT_EQ(70, InterruptSafeOccur(noted[1023].occurrence));
+    EXPECT_EACH(warnings == 10, InterruptSafeOccur(noted[1023].occurrence) == 70);
     for (int i : {0, 500, 1022}) EXPECT_EQ(kNoErr, InterruptSafeOccur(noted[i].occurrence));
     EXPECT_EQ(11, warnings);
     SetResetCountDownRegCallbackProc(nullptr);
@@ -401,14 +381,11 @@ TEST_F(OccurrenceTest, NothingIsLostThatManyThreadsPost) {
     std::vector<Noted> noted(64);
     for (Noted& each : noted) each.Alloc();
     std::atomic<int> posting{8};
-    std::vector<std::thread> posters;
-    for (size_t i = 0; i < 8; ++i)
-        posters.emplace_back([&, i] {
-            for (size_t n = 0; n < 5000; ++n) noted[n % 8 * 8 + i].Post();
-            --posting;
-        });
-    while (posting > 0) ChkOccurrences();
-    for (std::thread& poster : posters) poster.join();
+    InThreads(9, [&](int thread) {
+        while (thread == 8 && posting > 0) ChkOccurrences();
+        for (size_t n = 0; thread < 8 && n < 5000; ++n) noted[n % 8 * 8 + static_cast<size_t>(thread)].Post();
+        if (thread < 8) --posting;
+    });
     ChkOccurrences();
     for (Noted& each : noted) each.ExpectNothingLost();
 }
@@ -437,45 +414,20 @@ void DoAnything(std::mt19937& random) {
         ++slot.arms;
         how(slot.handler, random() % 4 == 0);
     };
-    switch (random() % 16) {
-        case 0:
-            DeallocOccur(occurrence.exchange(AllocOccur()));
-            break;
-        case 1:
-            DeallocOccurHdlr(slot.handler.exchange(alloc(occurrence, CountCall, &slot)));
-            break;
-        case 2:
-            BindOccurHdlr(slot.handler, occurrence, CountCall, &slot);
-            break;
-        case 3:
-            CancelOnOccur(slot.handler);
-            break;
-        case 4:
-            FireOccurHdlr(slot.handler);
-            break;
-        case 5:
-            OccurAtTime(occurrence, MilliSecs() + random() % 3);
-            break;
-        case 6:
-            CancelOccurAtTime(occurrence);
-            break;
-        case 7:
-            InterruptSafeOccur(occurrence);
-            break;
-        case 8:
-            arm([](OccurHdlr h, bool reset) { return OnOccurrenceWithTimeout(h, reset, reset ? 1 : 5); });
-            break;
-        case 9:
-        case 10:
-            arm(OnOccurrence);
-            break;
-        case 11:
-        case 12:
-            ChkThGroupOccurrences(static_cast<int32>(random() % 10));
-            break;
-        default:
-            Occur(occurrence);
-    }
+    const std::function<void()> operations[] = {
+        [&] { DeallocOccur(occurrence.exchange(AllocOccur())); },
+        [&] { DeallocOccurHdlr(slot.handler.exchange(alloc(occurrence, CountCall, &slot))); },
+        [&] { BindOccurHdlr(slot.handler, occurrence, CountCall, &slot); },
+        [&] { CancelOnOccur(slot.handler); },
+        [&] { FireOccurHdlr(slot.handler); },
+        [&] { OccurAtTime(occurrence, MilliSecs() + random() % 3); },
+        [&] { CancelOccurAtTime(occurrence); },
+        [&] { InterruptSafeOccur(occurrence); },
+        [&] { arm([](OccurHdlr h, bool reset) { return OnOccurrenceWithTimeout(h, reset, reset ? 1 : 5); }); },
+        [&] { arm(OnOccurrence); },
+        [&] { ChkThGroupOccurrences(static_cast<int32>(random() % 10)); },
+        [&] { Occur(occurrence); }};
+    operations[std::array{0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 9, 10, 10, 11, 11, 11}[random() % 16]]();
 }
 
 TEST_F(OccurrenceTest, ManyThreadsDoAnythingAtOnce) {
@@ -484,19 +436,16 @@ TEST_F(OccurrenceTest, ManyThreadsDoAnythingAtOnce) {
     for (auto& occurrence : occurrences) occurrence = AllocOccur();
     for (Slot& slot : slots) slot.handler = AllocOccurHdlr(0, CountCall, &slot);
     std::atomic<uint64> operations{0};
-    std::vector<std::thread> threads;
-    for (unsigned seed = 0; seed < 8; ++seed)
-        threads.emplace_back([&, seed] {
-            std::mt19937 random(seed);
-            ThThread self = nullptr;
-            ThPseudoThreadCreate(&self);
-            do {
-                for (int i = 0; i < 1000; ++i) DoAnything(random);
-                operations += 1000;
-            } while (std::chrono::steady_clock::now() < end);
-            ThThreadDestroy(self);
-        });
-    for (std::thread& thread : threads) thread.join();
+    InThreads(8, [&](int seed) {
+        std::mt19937 random(static_cast<unsigned>(seed));
+        ThThread self = nullptr;
+        ThPseudoThreadCreate(&self);
+        do {
+            for (int i = 0; i < 1000; ++i) DoAnything(random);
+            operations += 1000;
+        } while (std::chrono::steady_clock::now() < end);
+        ThThreadDestroy(self);
+    });
     for (int32 group = 0; group < 16; ++group) ChkThGroupOccurrences(group);
     RecordProperty("operations", std::to_string(operations));
     for (Slot& slot : slots) {

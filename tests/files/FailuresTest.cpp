@@ -1,4 +1,4 @@
-// What copies and moves keep, and what failures say and leave behind.
+// What copies and moves keep, and what failures say. What they leave behind is looked at in tests/faults.
 #include "platform/Module.h"
 #include "platform/posix/SystemCalls.h"
 #include "support/FailingPlatform.h"
@@ -163,67 +163,6 @@ TEST_F(FailuresTest, MovingIntoKeepsWhatTheTargetIs) {
         EXPECT_TRUE(fs::is_symlink(Native("link")) && !fs::exists(Native("from")));
         EXPECT_EQ(linked ? "new content" : "", started.drive.Get("other"));
         fs::remove(Native("link"));
-    }
-}
-
-// Each call of the kernel fails once: what was there stays, or all is done; nothing else is left, but for an unnamed or
-// private file that could not be removed.
-TEST_F(FailuresTest, EveryFailureLeavesOldOrNew) {
-    const struct {
-        const char* name;
-        MgErr (*act)(FailuresTest&);
-        std::string done;
-        bool across;
-    } kActs[] = {
-        {"copy", [](FailuresTest& t) { return FCopy(t.At("a"), t.At("b")); }, "a=new;b=new;t=old;", false},
-        {"move", [](FailuresTest& t) { return FMove(t.At("a"), t.At("b")); }, "b=new;t=old;", false},
-        {"into", [](FailuresTest& t) { return FMoveInto(t.At("a"), t.At("t")); }, "t=new;", false},
-    };
-    int failures = 0;
-    for (const auto& act : kActs) {
-        for (const char* call :
-             {"open", "openat", "read", "write", "copy_file_range", "fsync", "statx", "fchmod", "fchown", "futimens",
-              "linkat", "renameat2", "unlinkat", "lseek", "ftruncate", "opendir", "readdir"}) {
-            for (int n = 1, more = 1; more; ++n) {
-                SCOPED_TRACE(testing::Message() << act.name << ": " << call << ' ' << n);
-                for (const auto& entry : fs::directory_iterator(started.drive.Native())) fs::remove_all(entry.path());
-                started.drive.Put("a", "new");
-                started.drive.Put("t", "old");
-                const std::string before = Everything();
-                MgErr err;
-                {
-                    const FailingPlatform failing(call, n, EIO);
-                    err = act.act(*this);
-                    more = failing.Calls() >= n;
-                }
-                failures += err != kNoErr;
-                if (call[0] == 'u') fs::remove(Native(".tessel-0.tmp"));  // the next writer's to remove
-                const std::string after = Everything();
-                const bool sourceStayed = act.name[0] == 'i' && after == "a=new;t=new;";  // its removal is not told
-                EXPECT_TRUE(after == (err ? before : act.done) || sourceStayed) << err << ' ' << after;
-            }
-        }
-    }
-    EXPECT_GT(failures, 40);
-}
-
-TEST_F(FailuresTest, AMoveThatFailsKeepsItsSource) {
-    for (const char* call : {"read", "write", "fsync", "linkat", "unlink", "fchmod"}) {
-        for (int n = 1, more = 1; more; ++n) {
-            SCOPED_TRACE(testing::Message() << call << ' ' << n);
-            for (const auto& entry : fs::directory_iterator(started.drive.Native())) fs::remove_all(entry.path());
-            started.drive.Put("a", "content");
-            MgErr err;
-            {
-                const Apart apart;
-                const FailingPlatform failing(call, n, EIO);
-                err = FMove(At("a"), At("b"));
-                more = failing.Calls() >= n;
-            }
-            const std::string after = Everything();
-            EXPECT_TRUE(after == "a=content;" || after == "b=content;") << after;
-            EXPECT_TRUE(err || after == "b=content;") << after;
-        }
     }
 }
 

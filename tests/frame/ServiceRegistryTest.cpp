@@ -1,17 +1,10 @@
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include <tessel/frame/ServiceRegistry.h>
 
-#include <gtest/gtest.h>
-#include <memory>
 #include <new>
-#include <string>
-#include <vector>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using test::ReportRecorder;
-using Texts = std::vector<std::string>;
 
 std::string theLog;  // "+A -A": A was started, then stopped
 
@@ -34,8 +27,7 @@ public:
     void Needs(IServiceObject* service) { needs_.push_back(service); }
 
     static constexpr MgErr kThrows = -99;
-    MgErr initResult = kNoErr;
-    MgErr uninitResult = kNoErr;
+    MgErr initResult = kNoErr, uninitResult = kNoErr;
 
 private:
     const char* name_;
@@ -62,9 +54,8 @@ protected:
 TEST_F(ServiceRegistryTest, EmptyAndNull) {
     EXPECT_EQ(nullptr, CreateServiceRegistry(nullptr));
     const Registry registry = MakeRegistry({});
-    EXPECT_EQ(kNoErr, registry->UninitServices());
-    EXPECT_EQ(kNoErr, registry->InitServices());
-    EXPECT_EQ(kNoErr, registry->UninitServices());
+    EXPECT_EACH(registry->UninitServices() == kNoErr, registry->InitServices() == kNoErr,
+                registry->UninitServices() == kNoErr);
 }
 
 TEST_F(ServiceRegistryTest, StartsDependenciesFirstAndStopsInReverse) {
@@ -73,40 +64,31 @@ TEST_F(ServiceRegistryTest, StartsDependenciesFirstAndStopsInReverse) {
     for (const auto& order : orders) {
         theLog.clear();
         const Registry registry = MakeRegistry(order);
-        EXPECT_EQ(kNoErr, registry->InitServices());
-        EXPECT_EQ(kNoErr, registry->UninitServices());
-        EXPECT_EQ("+C +B +A -A -B -C ", theLog);
+        EXPECT_EACH(registry->InitServices() == kNoErr, registry->UninitServices() == kNoErr,
+                    theLog == "+C +B +A -A -B -C ");
         EXPECT_EQ(kNoErr, registry->InitServices()) << "may be started again";
-        EXPECT_EQ(kNoErr, registry->UninitServices());
-        EXPECT_EQ("+C +B +A -A -B -C +C +B +A -A -B -C ", theLog);
+        EXPECT_EACH(registry->UninitServices() == kNoErr, theLog == "+C +B +A -A -B -C +C +B +A -A -B -C ");
     }
     EXPECT_EQ(Texts{}, recorder.Texts());
 }
 
-TEST_F(ServiceRegistryTest, OfThoseReadyTheFirstRegisteredGoesFirst) {
+TEST_F(ServiceRegistryTest, OfThoseReadyTheFirstRegisteredGoesFirstAndOnce) {
     Service d("D"), e("E", {&d, &d});
-    const Registry registry = MakeRegistry({&e, &a, &d, &free, &b, &c});
-    EXPECT_EQ(kNoErr, registry->InitServices());
-    EXPECT_EQ("+D +E +F +C +B +A ", theLog);
+    const Registry registry = MakeRegistry({&e, &a, &d, &free, &b, &c, &c});
+    EXPECT_EQ(Texts{"ServiceRegistry: A service has already been registered that has the name \"C\"."},
+              recorder.Texts(kDebugFatal));
+    EXPECT_EACH(registry->InitServices() == kNoErr, theLog == "+D +E +F +C +B +A ");
     registry->UninitServices();
 }
 
 TEST_F(ServiceRegistryTest, RegistrationIsRefusedWhileStarted) {
     const Registry registry = MakeRegistry({&c, &b});
-    EXPECT_EQ(kArgErr, registry->AddService(nullptr));
-    EXPECT_EQ(kArgErr, registry->AddService(&c));
-    EXPECT_EQ(kArgErr, registry->RemoveService(nullptr));
-    EXPECT_EQ(kArgErr, registry->RemoveService(&a));
-    EXPECT_EQ(kNoErr, registry->InitServices());
-    EXPECT_EQ(kGenericErr, registry->AddService(&a));
-    EXPECT_EQ(kGenericErr, registry->RemoveService(&b));
-    EXPECT_EQ(kGenericErr, registry->InitServices());
-    EXPECT_EQ(kNoErr, registry->UninitServices());
-    EXPECT_EQ(kNoErr, registry->AddService(&a));
-    EXPECT_TRUE(registry->HasService(&a));
-    EXPECT_EQ(kNoErr, registry->RemoveService(&a));
-    EXPECT_FALSE(registry->HasService(&a));
-    EXPECT_EQ(Texts{}, recorder.Texts());
+    EXPECT_EACH(registry->AddService(nullptr) == kArgErr, registry->AddService(&c) == kArgErr,
+                registry->RemoveService(nullptr) == kArgErr, registry->RemoveService(&a) == kArgErr,
+                registry->InitServices() == kNoErr, registry->AddService(&a) == kGenericErr,
+                registry->RemoveService(&b) == kGenericErr, registry->InitServices() == kGenericErr,
+                registry->UninitServices() == kNoErr, registry->AddService(&a) == kNoErr, registry->HasService(&a),
+                registry->RemoveService(&a) == kNoErr, !registry->HasService(&a), recorder.Texts() == Texts{});
 }
 
 // A service that uses its registry whenever it is called.
@@ -121,10 +103,8 @@ public:
 
 private:
     void Meddle() {
-        EXPECT_EQ(kGenericErr, registry->AddService(&other_));
-        EXPECT_EQ(kGenericErr, registry->RemoveService(this));
-        EXPECT_EQ(kGenericErr, registry->InitServices());
-        EXPECT_EQ(kGenericErr, registry->UninitServices());
+        EXPECT_EACH(registry->AddService(&other_) == kGenericErr, registry->RemoveService(this) == kGenericErr,
+                    registry->InitServices() == kGenericErr, registry->UninitServices() == kGenericErr);
         ++calls;
     }
     Service other_{"O"};
@@ -134,38 +114,24 @@ TEST_F(ServiceRegistryTest, AServiceCannotChangeARegistryThatIsStartingIt) {
     Meddler meddler;
     const Registry registry = MakeRegistry({&meddler, &free});
     meddler.registry = registry.get();
-    EXPECT_EQ(kNoErr, registry->InitServices());
-    EXPECT_EQ(kNoErr, registry->UninitServices());
-    EXPECT_EQ("+M +F -F -M ", theLog);
-    EXPECT_EQ(3, meddler.calls);
-}
-
-TEST_F(ServiceRegistryTest, AServiceThatStandsTwiceIsHeldOnce) {
-    const Registry registry = MakeRegistry({&c, &c});
-    EXPECT_EQ(Texts{"ServiceRegistry: A service has already been registered that has the name \"C\"."},
-              recorder.Texts(kDebugFatal));
-    registry->InitServices();
-    registry->UninitServices();
-    EXPECT_EQ("+C -C ", theLog);
+    EXPECT_EACH(registry->InitServices() == kNoErr, registry->UninitServices() == kNoErr, theLog == "+M +F -F -M ",
+                meddler.calls == 3);
 }
 
 TEST_F(ServiceRegistryTest, ADependencyMayRunInAnotherRegistry) {
-    const Registry lower = MakeRegistry({&c});
-    const Registry upper = MakeRegistry({&free, &b});
+    const Registry lower = MakeRegistry({&c}), upper = MakeRegistry({&free, &b});
     const Texts missing = {"ServiceRegistry: Service \"B\" has a dependency \"C\" that does not exist!"};
-    EXPECT_EQ(kNoErr, upper->InitServices());
-    EXPECT_EQ(missing, recorder.Texts(kDebugFatal));
+    EXPECT_EACH(upper->InitServices() == kNoErr, missing == recorder.Texts(kDebugFatal));
     EXPECT_EQ("", theLog) << "nothing is started";
 
     lower->InitServices();
-    EXPECT_EQ(kNoErr, upper->InitServices());
-    EXPECT_EQ("+C +F +B ", theLog);
+    EXPECT_EACH(upper->InitServices() == kNoErr, theLog == "+C +F +B ");
     upper->UninitServices();
 
     const Registry other = MakeRegistry({&c});
     c.initResult = Service::kThrows;
-    EXPECT_EQ(kMemFullErr, other->InitServices());
-    EXPECT_TRUE(recorder.Has(kDebugInfo, "ServiceRegistry: Service C init failed with error 2"));
+    EXPECT_EACH(other->InitServices() == kMemFullErr,
+                recorder.Has(kDebugInfo, "ServiceRegistry: Service C init failed with error 2"));
     c.initResult = kNoErr;
     other->InitServices();
     other->UninitServices();
@@ -176,42 +142,33 @@ TEST_F(ServiceRegistryTest, ADependencyMayRunInAnotherRegistry) {
     lower->UninitServices();
     recorder.Clear();
     theLog.clear();
-    EXPECT_EQ(kNoErr, upper->InitServices());
-    EXPECT_EQ(missing, recorder.Texts(kDebugFatal));
-    EXPECT_EQ("", theLog);
+    EXPECT_EACH(upper->InitServices() == kNoErr, missing == recorder.Texts(kDebugFatal), theLog == "");
 }
 
 TEST_F(ServiceRegistryTest, ACycleDropsTheRegistrationsButStartsTheOthers) {
     c.Needs(&a);
     const Registry registry = MakeRegistry({&a, &b, &c, &free});
-    EXPECT_EQ(kNoErr, registry->InitServices());
-    EXPECT_EQ(Texts{"ServiceRegistry: Service dependencies form a cycle."}, recorder.Texts(kDebugFatal));
+    EXPECT_EACH(registry->InitServices() == kNoErr,
+                recorder.Texts(kDebugFatal) == Texts{"ServiceRegistry: Service dependencies form a cycle."});
     for (Service* service : {&a, &b, &c, &free}) EXPECT_FALSE(registry->HasService(service));
-    EXPECT_EQ(kNoErr, registry->UninitServices());
-    EXPECT_EQ("+F -F ", theLog);
+    EXPECT_EACH(registry->UninitServices() == kNoErr, theLog == "+F -F ");
 }
 
-TEST_F(ServiceRegistryTest, AFailedStartStaysHalfWay) {
-    Service s1("1"), s2("2"), s3("3"), s4("4");
-    s3.initResult = 77;
-    const Registry registry = MakeRegistry({&s1, &s2, &s3, &s4});
-    EXPECT_EQ(77, registry->InitServices());
-    EXPECT_EQ(Texts{"ServiceRegistry: Service 3 init failed with error 77"}, recorder.Texts(kDebugInfo));
-    EXPECT_EQ(kGenericErr, registry->AddService(&a));
-    EXPECT_EQ(kNoErr, registry->UninitServices());
-    EXPECT_EQ("+1 +2 +3 -2 -1 ", theLog);
-}
-
-TEST_F(ServiceRegistryTest, AFailedStopCanBeTriedAgain) {
+TEST_F(ServiceRegistryTest, AFailedStartStaysHalfWayAndAFailedStopCanBeTriedAgain) {
+    b.initResult = 77;
+    const Registry registry = MakeRegistry({&a, &b, &c, &free});
+    EXPECT_EACH(registry->InitServices() == 77, registry->AddService(&free) == kGenericErr,
+                registry->UninitServices() == kNoErr, theLog == "+C +B -C ");
+    b.initResult = kNoErr;
     b.uninitResult = 9;
-    const Registry registry = MakeRegistry({&a, &b, &c});
-    registry->InitServices();
-    EXPECT_EQ(9, registry->UninitServices());
-    EXPECT_EQ(Texts{"ServiceRegistry: Service B uninit failed with error 9"}, recorder.Texts(kDebugInfo));
-    EXPECT_EQ(kGenericErr, registry->AddService(&free));
+    theLog.clear();
+    EXPECT_EACH(registry->InitServices() == kNoErr, registry->UninitServices() == 9,
+                registry->AddService(&free) == kGenericErr);
     b.uninitResult = kNoErr;
-    EXPECT_EQ(kNoErr, registry->UninitServices());
-    EXPECT_EQ("+C +B +A -A -B -B -C ", theLog);
+    EXPECT_EACH(registry->UninitServices() == kNoErr, theLog == "+C +B +A +F -F -A -B -B -C ");
+    EXPECT_EQ((Texts{"ServiceRegistry: Service B init failed with error 77",
+                     "ServiceRegistry: Service B uninit failed with error 9"}),
+              recorder.Texts(kDebugInfo));
 }
 
 TEST_F(ServiceRegistryTest, DependencyListRefusesNullTooManyAndOutOfRange) {
@@ -219,18 +176,15 @@ TEST_F(ServiceRegistryTest, DependencyListRefusesNullTooManyAndOutOfRange) {
     list.AddDependency(nullptr);
     EXPECT_EQ(Texts{"Cannot add null service dependency to dependency list."}, recorder.Texts(kDebugWarning));
     list.AddDependency(&a);
-    EXPECT_EQ(nullptr, list.GetAt(1));
-    EXPECT_EQ(nullptr, list.GetAt(-1));
-    EXPECT_EQ((Texts{"Service dependency index 1 not in range 0..1", "Service dependency index -1 not in range 0..1"}),
-              recorder.Texts(kDebugFatal));
+    EXPECT_EACH(list.GetAt(1) == nullptr, list.GetAt(-1) == nullptr,
+                recorder.Texts(kDebugFatal) == (Texts{"Service dependency index 1 not in range 0..1",
+                                                      "Service dependency index -1 not in range 0..1"}));
     recorder.Clear();
     for (int i = 1; i < 1024; ++i) list.AddDependency(&b);
     EXPECT_EQ(0u, recorder.Count());
     list.AddDependency(&c);
-    EXPECT_EQ(Texts{"Too many service dependencies (1024)."}, recorder.Texts(kDebugFatal));
-    EXPECT_EQ(1024, list.GetCount());
-    EXPECT_EQ(&a, list.GetAt(0));
-    EXPECT_EQ(&b, list.GetAt(1023));
+    EXPECT_EACH(recorder.Texts(kDebugFatal) == Texts{"Too many service dependencies (1024)."}, list.GetCount() == 1024,
+                &a == list.GetAt(0), &b == list.GetAt(1023));
 }
 
 // ---- the reference-counted base -------------------------------------------------------------------------------------
@@ -258,18 +212,12 @@ protected:
 TEST(RefcountedServiceObject, TheFirstUseStartsAndTheLastEnds) {
     theLog.clear();
     Counted* const service = Counted::Object();
-    EXPECT_EQ(service, Counted::Object());
-    EXPECT_EQ(kGenericErr, service->Status());
-    EXPECT_EQ(kNoErr, service->Init());
-    EXPECT_EQ(kNoErr, service->Init());
-    EXPECT_EQ(kNoErr, service->Uninit());
-    EXPECT_EQ("start ", theLog);
-    EXPECT_EQ(5, service->Uninit());
-    EXPECT_EQ("start stop ~ ", theLog);
+    EXPECT_EACH(service == Counted::Object(), service->Status() == kGenericErr, service->Init() == kNoErr,
+                service->Init() == kNoErr, service->Uninit() == kNoErr, theLog == "start ", service->Uninit() == 5,
+                theLog == "start stop ~ ");
 
     Counted::startResult = 7;
-    EXPECT_EQ(kGenericErr, Counted::Object()->Status());
-    EXPECT_EQ(7, Counted::Object()->Init());
+    EXPECT_EACH(Counted::Object()->Status() == kGenericErr, Counted::Object()->Init() == 7);
     EXPECT_EQ(7, Counted::Object()->Init()) << "a failed start keeps its error";
     EXPECT_EQ(2, Counted::Object()->UseCount());
     Counted::Object()->Uninit();
@@ -277,4 +225,4 @@ TEST(RefcountedServiceObject, TheFirstUseStartsAndTheLastEnds) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,25 +1,19 @@
 // What the services read from the preference file: the debugger of the heap, the priorities, the hard waits.
 #include "frame/CoreServices.h"
-#include "support/ReportRecorder.h"
 #include "support/ScratchDrive.h"
 #include "support/StartedLibrary.h"
+#include "support/Test.h"
 #include <tessel/base/MGAppInterface.h>
 #include <tessel/config/HardWaitBehavior.h>
 #include <tessel/threads/ThThread.h>
 #include <tessel/utilities/UserCommandLine.h>
 
-#include <atomic>
-#include <gmock/gmock.h>
-#include <memory>
 #include <optional>
 #include <stdlib.h>
 #include <sys/resource.h>
-#include <thread>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using testing::ElementsAre;
 
 struct Application : MGAppInterface {
     Application() { MGAppInterfaceSet(this); }
@@ -92,19 +86,14 @@ TEST_F(Settings, HardWaitsChooseTheLevelOfTheOccurrenceThread) {
     for (const auto& row : rows) {
         SCOPED_TRACE(row.line);
         Start("[App]\r\n" + low + row.line);
-        EXPECT_EQ(1, AssimilateStartUpThread());
-        EXPECT_EQ(kNoErr, ThSetThreadPrioritySetProc(note));
+        EXPECT_EACH(AssimilateStartUpThread() == 1, ThSetThreadPrioritySetProc(note) == kNoErr);
         levelOfTheOccurrenceThread = -1;
-        EXPECT_EQ(0, GetHardWaitTimeCritical());
-        EXPECT_EQ(kNoErr, HardWaitBehaviorService()->Init());
-        EXPECT_EQ(row.value, GetHardWaitTimeCritical());
-        EXPECT_EQ(kNoErr, OccurrenceManagerService()->Init());
+        EXPECT_EACH(GetHardWaitTimeCritical() == 0, HardWaitBehaviorService()->Init() == kNoErr,
+                    row.value == GetHardWaitTimeCritical(), OccurrenceManagerService()->Init() == kNoErr);
         while (levelOfTheOccurrenceThread < 0) std::this_thread::yield();
-        EXPECT_EQ(row.level, levelOfTheOccurrenceThread);
-        EXPECT_EQ(kNoErr, OccurrenceManagerService()->Uninit());
-        EXPECT_EQ(kNoErr, HardWaitBehaviorService()->Uninit());
-        EXPECT_EQ(0, GetHardWaitTimeCritical());
-        EXPECT_EQ(kNoErr, ThClearThreadPrioritySetProc(note));
+        EXPECT_EACH(row.level == levelOfTheOccurrenceThread, OccurrenceManagerService()->Uninit() == kNoErr,
+                    HardWaitBehaviorService()->Uninit() == kNoErr, GetHardWaitTimeCritical() == 0,
+                    ThClearThreadPrioritySetProc(note) == kNoErr);
         library.reset();
         EXPECT_EQ("[App]\r\n" + low + row.saved, drive.Get("prefs.ini"));
     }
@@ -112,4 +101,4 @@ TEST_F(Settings, HardWaitsChooseTheLevelOfTheOccurrenceThread) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -2,69 +2,37 @@
 // allocations.
 #include "memory/Heap.h"
 #include "support/FailingAllocator.h"
+#include "support/Test.h"
 #include <tessel/diagnostics/DebugOutput.h>
 #include <tessel/frame/TesselInit.h>
 #include <tessel/memory/MemoryManager.h>
 
-#include <atomic>
-#include <cstdlib>
-#include <gtest/gtest.h>
 #include <new>
 
 namespace {
 
 std::atomic<int> theLiveBlocks{0};
 
-void* Allocate(size_t size) {
-    if (!tessel::test::FailingAllocator::May(size)) return nullptr;
+}  // namespace
+
+// The others call these.
+void* operator new(size_t size) {
+    void* block = tessel::test::FailingAllocator::May(size) ? std::malloc(size != 0 ? size : 1) : nullptr;
+    if (!block) throw std::bad_alloc();
     ++theLiveBlocks;
-    return std::malloc(size != 0 ? size : 1);
+    return block;
 }
 
-void Release(void* block) {
+void operator delete(void* block) noexcept {
     theLiveBlocks -= block != nullptr;
     std::free(block);
 }
 
-void* AllocateOrThrow(size_t size) {
-    if (void* block = Allocate(size)) return block;
-    throw std::bad_alloc();
-}
-
-}  // namespace
-
-void* operator new(size_t size) {
-    return AllocateOrThrow(size);
-}
-void* operator new[](size_t size) {
-    return AllocateOrThrow(size);
-}
-void* operator new(size_t size, const std::nothrow_t&) noexcept {
-    return Allocate(size);
-}
-void* operator new[](size_t size, const std::nothrow_t&) noexcept {
-    return Allocate(size);
-}
-void operator delete(void* block) noexcept {
-    Release(block);
-}
-void operator delete[](void* block) noexcept {
-    Release(block);
-}
 void operator delete(void* block, size_t) noexcept {
-    Release(block);
-}
-void operator delete[](void* block, size_t) noexcept {
-    Release(block);
-}
-void operator delete(void* block, const std::nothrow_t&) noexcept {
-    Release(block);
-}
-void operator delete[](void* block, const std::nothrow_t&) noexcept {
-    Release(block);
+    operator delete(block);
 }
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 MgErr StartAndStop() {
@@ -86,23 +54,20 @@ TEST(TesselStart, SurvivesEveryAllocationThatFails) {
     const uint64 before = heap::TotalAllocated();
     const int blocksBefore = theLiveBlocks;
     int refused = 0, n = 0;
-    for (bool failed = true; failed && !HasFailure();) {
+    for (bool failed = true; failed && !HasFailure(); ++n) {
         MgErr err;
         {
-            test::FailingAllocator failing(++n);
+            test::FailingAllocator failing(n + 1);
             err = StartAndStop();
             failed = failing.HasFailed();
         }
-        EXPECT_TRUE(err == kNoErr || (err == kMemFullErr && failed)) << n << ": " << err;
-        EXPECT_EQ(before, heap::TotalAllocated()) << n;
-        EXPECT_EQ(kNoErr, StartAndStop()) << "with memory it starts again";
-        EXPECT_EQ(blocksBefore, theLiveBlocks) << n;
+        EXPECT_EACH((err == kNoErr || (err == kMemFullErr && failed)), heap::TotalAllocated() == before,
+                    StartAndStop() == kNoErr, blocksBefore == theLiveBlocks);  // with memory it starts again
         refused += err != kNoErr;
     }
     DebugOutputSetHandler(nullptr);
-    EXPECT_GT(refused, 20);
-    EXPECT_GT(n, refused) << "what runs out after the start is not the start's failure";
+    EXPECT_EACH(refused > 20, n > refused);  // what runs out after the start is not the start's failure
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,23 +1,18 @@
 #include "frame/CoreServices.h"
-#include "support/ReportRecorder.h"
 #include "support/StartedLibrary.h"
+#include "support/Test.h"
 #include <tessel/frame/TesselInit.h>
 #include <tessel/memory/MemoryManager.h>
 
-#include <algorithm>
 #include <array>
 #include <filesystem>
 #include <fstream>
-#include <gtest/gtest.h>
 #include <map>
 #include <sstream>
 #include <stdlib.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using test::ReportRecorder;
-using Texts = std::vector<std::string>;
 
 std::string ReadFile(const std::filesystem::path& path) {
     std::ostringstream text;
@@ -37,7 +32,6 @@ protected:
         unsetenv("TMPDIR");
         std::filesystem::remove_all(folder);
     }
-    bool HasLeakFile(const char* name) const { return std::filesystem::exists(folder / name); }
 
     std::filesystem::path folder;
     ReportRecorder recorder;
@@ -48,15 +42,13 @@ TEST_F(TesselInitTest, StartsAndStopsCleanlyAgainAndAgain) {
         recorder.Clear();
         {
             test::StartedLibrary library;
-            EXPECT_EQ(kGenericErr, InitTesselBase());
-            EXPECT_EQ(kNoErr, InitTesselAppSupport());
+            EXPECT_EACH(InitTesselBase() == kGenericErr, InitTesselAppSupport() == kNoErr);
             UHandle handle = DSNewHandle(64);
             ASSERT_NE(nullptr, handle);
             EXPECT_EQ(kNoErr, DSDisposeHandle(handle));
         }
-        EXPECT_EQ(Texts{}, recorder.Texts(kDebugWarning));
-        EXPECT_EQ(Texts{}, recorder.Texts(kDebugError));
-        EXPECT_EQ(Texts{}, recorder.Texts(kDebugFatal));
+        EXPECT_EACH(recorder.Texts(kDebugWarning) == Texts{}, recorder.Texts(kDebugError) == Texts{},
+                    recorder.Texts(kDebugFatal) == Texts{});
         // Each tracker is summed up when its service stops, in the reverse order of the start.
         Texts totals = recorder.Texts(kDebugInfo);
         std::erase_if(totals, [](const std::string& text) { return !text.starts_with("Total "); });
@@ -67,33 +59,22 @@ TEST_F(TesselInitTest, StartsAndStopsCleanlyAgainAndAgain) {
     EXPECT_TRUE(std::filesystem::is_empty(folder));
 }
 
-TEST_F(TesselInitTest, OutOfTurnNothingHappens) {
-    EXPECT_EQ(kNoErr, InitTesselAppSupport());
-    EXPECT_EQ(kNoErr, UninitTesselAppSupport());
-    EXPECT_EQ(kNoErr, UninitTesselBase());
-    EXPECT_EQ(0u, recorder.Count());
-}
-
-TEST_F(TesselInitTest, TheBaseStopsWhatStandsOnIt) {
-    for (int round = 0; round < 2; ++round) {
-        EXPECT_EQ(kNoErr, InitTesselBase());
-        EXPECT_EQ(kNoErr, InitTesselAppSupport());
-        EXPECT_EQ(kNoErr, UninitTesselBase());
-        EXPECT_EQ(kNoErr, UninitTesselAppSupport()) << "nothing is left to stop";
-    }
+TEST_F(TesselInitTest, OutOfTurnNothingHappensAndTheBaseStopsWhatStandsOnIt) {
+    EXPECT_EACH(InitTesselAppSupport() == kNoErr, UninitTesselAppSupport() == kNoErr, UninitTesselBase() == kNoErr,
+                recorder.Count() == 0);
+    for (int round = 0; round < 2; ++round)
+        EXPECT_EACH(InitTesselBase() == kNoErr, InitTesselAppSupport() == kNoErr, UninitTesselBase() == kNoErr,
+                    UninitTesselAppSupport() == kNoErr);  // nothing is left to stop
     EXPECT_EQ(0u, recorder.CountAt(kDebugError));
 }
 
 TEST_F(TesselInitTest, SettingsThatAreNotUnderstoodAreReported) {
-    for (const auto& [variable, good, bad] :
-         std::vector<std::array<const char*, 3>>{{"OVGuardBytes", "off", "on"},
-                                                 {"OVGuardBytes_Ptr", "alloc", "Check"},
-                                                 {"OVHandleCheck", "resize", "3"},
-                                                 {"OV_ALLOC_TRACKER", "", "OFF"},
-                                                 {"OV_USE_MALLOC", "0", "yes"},
-                                                 {"TESSEL_DRIVES", "C=/;;t=/tmp", "C=/;TT=/tmp"},
-                                                 {"TESSEL_UNC", "/srv", "srv"},
-                                                 {"TESSEL_CODEPAGE", "cp932", "klingon"}}) {
+    const std::array<const char*, 3> settings[] = {
+        {"OVGuardBytes", "off", "on"},    {"OVGuardBytes_Ptr", "alloc", "Check"},
+        {"OVHandleCheck", "resize", "3"}, {"OV_ALLOC_TRACKER", "", "OFF"},
+        {"OV_USE_MALLOC", "0", "yes"},    {"TESSEL_DRIVES", "C=/;;t=/tmp", "C=/;TT=/tmp"},
+        {"TESSEL_UNC", "/srv", "srv"},    {"TESSEL_CODEPAGE", "cp932", "klingon"}};
+    for (const auto& [variable, good, bad] : settings) {
         for (const char* value : {good, bad}) {
             recorder.Clear();
             setenv(variable, value, 1);
@@ -114,18 +95,11 @@ TEST_F(TesselInitTest, AHandleLeftBehindIsReported) {
         (*handle)[3] = 1;
     }
     EXPECT_TRUE(recorder.Has(kDebugError, "We got 1 more Handle Leaks than we see from a basic launch and quit.\n"));
-    const Texts infos = recorder.Texts(kDebugInfo);
-    const bool pointed = std::any_of(infos.begin(), infos.end(), [](const std::string& text) {
-        return text.ends_with("\\ovHandleLeaks.txt(1) : 1 Handle Leaks (0 expected)") && text.starts_with("C:\\");
-    });
-    EXPECT_TRUE(pointed);
-    const std::string report = ReadFile(folder / "ovHandleLeaks.txt");
-    EXPECT_NE(std::string::npos, report.find("** List of currently allocated Handle Leaks          **\n")) << report;
-    EXPECT_NE(std::string::npos, report.find("Master Pointer: 0x"));
-    EXPECT_NE(std::string::npos, report.find("Memory Contents: xxx." + std::string(250, 'x') + '\n'));
-    EXPECT_NE(std::string::npos, report.find(" - frame_tests "));
-    EXPECT_NE(std::string::npos, report.find("\nNumber of unfreed items: 1\n\n1 Handle Leaks\n"));
-    EXPECT_FALSE(HasLeakFile("ovPointerLeaks.txt"));
+    EXPECT_THAT(recorder.Texts(kDebugInfo),
+                Contains(AllOf(StartsWith("C:\\"), EndsWith("\\ovHandleLeaks.txt(1) : 1 Handle Leaks (0 expected)"))));
+    EXPECT_THAT(ReadFile(folder / "ovHandleLeaks.txt"),
+                AllOf(HasSubstr("Memory Contents: xxx." + std::string(250, 'x') + '\n'), HasSubstr(" - frame_tests ")));
+    EXPECT_FALSE(std::filesystem::exists(folder / "ovPointerLeaks.txt"));
 }
 
 // The names and what each names as its dependencies, in the order it adds them.
@@ -149,39 +123,13 @@ TEST(CoreServices, NamesAndDependencies) {
         {ConfigManagerService, "ConfigManager: ThMutex PathManager FileManager MemoryManager"},
         {ThThreadService, "ThThread: ThMutex ThEvent ConfigManager ConfigCoreTypes"},
         {HardWaitBehaviorService, "HardWaitBehavior: ConfigManager ConfigCoreTypes"},
-        {OccurrenceManagerService, "OccurrenceManager: HardWaitBehavior ThMutex ThThread"},
-    };
+        {OccurrenceManagerService, "OccurrenceManager: HardWaitBehavior ThMutex ThThread"}};
     for (const auto& [accessor, text] : expected) {
         Names names;
         accessor()->GetDependencies(names);
-        EXPECT_EQ(text, accessor()->GetName() + std::string(":") + names.text);
-        EXPECT_EQ(accessor(), accessor());
+        EXPECT_EACH(text == accessor()->GetName() + std::string(":") + names.text, accessor() == accessor());
     }
-}
-
-// A host's service that records what runs at its own start.
-TEST(CoreServices, AHostsRegistryMayDependOnThem) {
-    struct Host final : RefcountedServiceObject_T<Host> {
-        const char* GetName() override { return "Host"; }
-        void GetDependencies(IServiceDependencyList& list) override { list.AddDependency(MemoryManagerService()); }
-        MgErr DoInit() override {
-            handle = DSNewHandle(8);
-            return handle ? kNoErr : kMemFullErr;
-        }
-        MgErr DoUninit() override { return DSDisposeHandle(handle); }
-        UHandle handle = nullptr;
-    };
-    ReportRecorder recorder;
-    IServiceObject* const services[] = {Host::Object(), nullptr};
-    IServiceRegistry* const registry = CreateServiceRegistry(services);
-    {
-        test::StartedLibrary library;
-        EXPECT_EQ(kNoErr, registry->InitServices());
-        EXPECT_EQ(kNoErr, registry->UninitServices());
-    }
-    registry->Release();
-    EXPECT_EQ(0u, recorder.CountAt(kDebugError) + recorder.CountAt(kDebugFatal));
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

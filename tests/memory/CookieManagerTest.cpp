@@ -1,19 +1,10 @@
 #include "support/StartedMemory.h"
+#include "support/Test.h"
 #include <tessel/memory/CookieManager.h>
 #include <tessel/memory/MemoryManager.h>
 
-#include <atomic>
-#include <cstring>
-#include <gmock/gmock.h>
-#include <thread>
-#include <vector>
-
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::ElementsAreArray;
-using ::testing::EndsWith;
 
 struct Cookies : ::testing::Test {
     test::StartedMemory memory;
@@ -43,41 +34,29 @@ TEST_F(Cookies, AreRefusedOnceTheyAreStale) {
     ASSERT_NE(nullptr, jar);
     void* info = Info(0x1234);
     MagicCookie first = MCNewCookie(jar, &info), second = MCNewCookie(jar, &info);
-    EXPECT_EQ(0u, IndexOf(first));
-    EXPECT_EQ(1u, IndexOf(second));
-    EXPECT_EQ(GenerationOf(first) % 4095 + 1, GenerationOf(second));
+    EXPECT_EACH(IndexOf(first) == 0u, IndexOf(second) == 1u, GenerationOf(first) % 4095 + 1 == GenerationOf(second));
     void* out = nullptr;
-    EXPECT_EQ(kNoErr, MCDisposeCookie(jar, first, &out));
-    EXPECT_EQ(info, out);
+    EXPECT_EACH(MCDisposeCookie(jar, first, &out) == kNoErr, info == out);
     void* other = Info(0x5678);
     MagicCookie third = MCNewCookie(jar, &other);
     EXPECT_EQ(0u, IndexOf(third));
 
     void* untouched = Info(1);
     void** place = &untouched;
-    for (MagicCookie stale : {first, 0u, IndexOf(second), third + 100, third ^ 0x00100000}) {
-        EXPECT_FALSE(MCIsACookie(jar, stale));
-        EXPECT_EQ(kArgErr, MCGetCookieInfo(jar, stale, &untouched));
-        EXPECT_EQ(kArgErr, MCSetCookieInfo(jar, stale, &info));
-        EXPECT_EQ(kArgErr, MCDisposeCookie(jar, stale, &untouched));
-        EXPECT_EQ(kArgErr, MCGetCookieInfoPtr(jar, stale, reinterpret_cast<void**>(&place)));
-        EXPECT_EQ(nullptr, place);
-    }
-    EXPECT_EQ(Info(1), untouched);
-    EXPECT_EQ(kNoErr, MCGetCookieInfoPtr(jar, third, reinterpret_cast<void**>(&place)));
-    EXPECT_EQ(other, *place);
-    EXPECT_EQ(third, MCGetCookieForInfo(jar, &other));
-    EXPECT_EQ(kNoErr, MCSetCookieInfo(jar, third, &info));
+    for (MagicCookie stale : {first, 0u, IndexOf(second), third + 100, third ^ 0x00100000})
+        EXPECT_EACH(!MCIsACookie(jar, stale), MCGetCookieInfo(jar, stale, &untouched) == kArgErr,
+                    MCSetCookieInfo(jar, stale, &info) == kArgErr, MCDisposeCookie(jar, stale, &untouched) == kArgErr,
+                    MCGetCookieInfoPtr(jar, stale, reinterpret_cast<void**>(&place)) == kArgErr, place == nullptr);
+    EXPECT_EACH(Info(1) == untouched, MCGetCookieInfoPtr(jar, third, reinterpret_cast<void**>(&place)) == kNoErr,
+                other == *place, third == MCGetCookieForInfo(jar, &other),
+                MCSetCookieInfo(jar, third, &info) == kNoErr);
     EXPECT_EQ(third, MCGetCookieForInfo(jar, &info));  // the lower index
     EXPECT_EQ(0u, MCGetCookieForInfo(jar, &other));
-    EXPECT_EQ(0u, MCNewCookie(nullptr, &info));
-    EXPECT_EQ(kArgErr, MCJarSize(nullptr, nullptr));
-    EXPECT_EQ(kArgErr, MCDisposeCookie(nullptr, third, nullptr));
-    EXPECT_EQ(kArgErr, MCSetCookieInfo(nullptr, third, &info));
-    EXPECT_EQ(0u, MCGetCookieForInfo(nullptr, &info) + MCGetCookieForInfo(jar, nullptr));
-    EXPECT_EQ(kNoErr, MCDisposeJar(jar));
-    EXPECT_EQ(kNoErr, MCDisposeJar(nullptr));
-    EXPECT_TRUE(memory.reports.Has(kDebugInfo, "Disposing jar with 2 cookies remaining"));
+    EXPECT_EACH(MCNewCookie(nullptr, &info) == 0u, MCJarSize(nullptr, nullptr) == kArgErr,
+                MCDisposeCookie(nullptr, third, nullptr) == kArgErr, MCSetCookieInfo(nullptr, third, &info) == kArgErr,
+                MCGetCookieForInfo(nullptr, &info) + MCGetCookieForInfo(jar, nullptr) == 0u,
+                MCDisposeJar(jar) == kNoErr, MCDisposeJar(nullptr) == kNoErr,
+                memory.reports.Has(kDebugInfo, "Disposing jar with 2 cookies remaining"));
 }
 
 // Indices over several pouches and arrays, and generations around their end.
@@ -98,8 +77,7 @@ TEST_F(Cookies, AreListedByIndex) {
         char info[5];
         EXPECT_EQ(kNoErr, MCGetCookieInfo(jar, cookies[i], info));
         std::memcpy(&n, info, 4);
-        EXPECT_EQ(i, n);
-        EXPECT_EQ(kNoErr, MCDisposeCookie(jar, cookies[i], nullptr));
+        EXPECT_EACH(i == n, MCDisposeCookie(jar, cookies[i], nullptr) == kNoErr);
     }
     cookies[64] = 0;  // the last freed is the first reused
     cookies[69999] = MCNewCookie(jar, "abcd");
@@ -108,14 +86,12 @@ TEST_F(Cookies, AreListedByIndex) {
     cookies.erase(cookies.begin() + 5);
     EXPECT_THAT(ListOf(jar), ElementsAreArray(cookies));
     int32 count = 0;
-    EXPECT_EQ(kNoErr, MCJarSize(jar, &count));
-    EXPECT_EQ(69999, count);
+    EXPECT_EACH(MCJarSize(jar, &count) == kNoErr, count == 69999);
     MCDisposeJar(jar);
 }
 
 TEST_F(Cookies, JarsReportTheirSize) {
-    constexpr uint32 kPointer = sizeof(void*);
-    constexpr uint32 kRecord = kPointer == 4 ? 36 : 48, kEntry = kPointer == 4 ? 16 : 24;
+    constexpr uint32 kPointer = sizeof(void*), kRecord = kPointer == 4 ? 36 : 48, kEntry = kPointer == 4 ? 16 : 24;
     uint32 size = kRecord + (16 + 32 + 32) * kPointer + 64 * kEntry;
     EXPECT_EQ(kPointer == 4 ? 1380u : 2224u, size);
     for (uint32 n : {1u, 2u}) {
@@ -139,50 +115,38 @@ TEST_F(Cookies, CarryRights) {
     int target = 0;
     CookieJar<int*> jar;
     int* out = &target;
-    EXPECT_EQ(0, jar.AcquireCookieRights(0x100000, &out));
-    EXPECT_EQ(nullptr, out);
+    EXPECT_EACH(jar.AcquireCookieRights(0x100000, &out) == 0, out == nullptr);
     int32 narrow[2] = {5, 6};  // without a jar nobody knows how long an info is
-    EXPECT_EQ(0, jar.BaseCookieJar::AcquireCookieRights(0x100000, narrow));
-    EXPECT_EQ(6, narrow[1]);
+    EXPECT_EACH(jar.BaseCookieJar::AcquireCookieRights(0x100000, narrow) == 0, narrow[1] == 6);
     ASSERT_EQ(kNoErr, jar.Init(1));
     MagicCookie cookie = jar.NewCookie(&target);
-    EXPECT_EQ(1, jar.AcquireCookieRights(cookie, &out));
-    EXPECT_EQ(&target, out);
+    EXPECT_EACH(jar.AcquireCookieRights(cookie, &out) == 1, &target == out);
     constexpr int32 kMostRights = 1048575;
     for (int32 rights = 2; rights < kMostRights; ++rights) ASSERT_EQ(1, jar.AcquireCookieRights(cookie, nullptr));
     EXPECT_EQ(0, jar.AcquireCookieRights(cookie, nullptr));
     for (int32 rights = kMostRights; rights > 0; --rights) ASSERT_EQ(rights, jar.ReleaseCookieRights(cookie));
-    EXPECT_EQ(0, jar.AcquireCookieRights(cookie, &out));
-    EXPECT_EQ(nullptr, out);
-    EXPECT_EQ(0, jar.ReleaseCookieRights(cookie));
-    EXPECT_FALSE(jar.IsACookie(cookie));
+    EXPECT_EACH(jar.AcquireCookieRights(cookie, &out) == 0, out == nullptr, jar.ReleaseCookieRights(cookie) == 0,
+                !jar.IsACookie(cookie));
     int32 count = -1;
-    EXPECT_EQ(kNoErr, jar.GetNumCookies(&count));
-    EXPECT_EQ(0, count);
-    EXPECT_EQ(kNoErr, jar.Uninit());
-    EXPECT_FALSE(jar.IsAValidJar());
+    EXPECT_EACH(jar.GetNumCookies(&count) == kNoErr, count == 0, jar.Uninit() == kNoErr, !jar.IsAValidJar());
 
     ASSERT_EQ(kNoErr, jar.Init());  // without rights
     cookie = jar.NewCookie(&target);
-    EXPECT_EQ(0, jar.AcquireCookieRights(cookie, &out));
-    EXPECT_EQ(0, jar.ReleaseCookieRights(cookie));
-    EXPECT_TRUE(jar.IsACookie(cookie));
+    EXPECT_EACH(jar.AcquireCookieRights(cookie, &out) == 0, jar.ReleaseCookieRights(cookie) == 0,
+                jar.IsACookie(cookie));
     jar.Uninit();
 }
 
 TEST_F(Cookies, FillLists) {
     CookieList list;
-    EXPECT_EQ(kArgErr, list.SetCount(-1));
-    EXPECT_EQ(kArgErr, list.SetCookie(0, 5));
-    EXPECT_EQ(kNoErr, list.SetCount(2));
-    EXPECT_EQ(kNoErr, list.SetCookie(1, 7));
-    EXPECT_EQ(kNoErr, list.SetCount(3));
+    EXPECT_EACH(list.SetCount(-1) == kArgErr, list.SetCookie(0, 5) == kArgErr, list.SetCount(2) == kNoErr,
+                list.SetCookie(1, 7) == kNoErr, list.SetCount(3) == kNoErr, list.SetCookie(2, 9) == kNoErr,
+                list.SetCount(2) == kNoErr, list.SetCount(3) == kNoErr);
     EXPECT_THAT(
         (std::vector{list.GetCookie(0), list.GetCookie(1), list.GetCookie(2), list.GetCookie(3), list.GetCookie(-1)}),
         ElementsAre(0, 7, 0, 0, 0));
     CookieJar<int*> jar;
-    EXPECT_EQ(kNoErr, jar.GetCookieList(&list));
-    EXPECT_EQ(0, list.GetCount());
+    EXPECT_EACH(jar.GetCookieList(&list) == kNoErr, list.GetCount() == 0);
     ASSERT_EQ(kNoErr, jar.Init());
     MagicCookie first = jar.NewCookie(nullptr), second = jar.NewCookie(nullptr);
     EXPECT_EQ(kNoErr, jar.GetCookieList(&list));
@@ -190,8 +154,7 @@ TEST_F(Cookies, FillLists) {
         (std::vector{list.GetCount(), static_cast<int32>(list.GetCookie(0)), static_cast<int32>(list.GetCookie(1))}),
         ElementsAre(2, static_cast<int32>(first), static_cast<int32>(second)));
     jar.Uninit();
-    EXPECT_EQ(kNoErr, jar.GetCookieList(&list));
-    EXPECT_EQ(0u, list.GetCookie(0));
+    EXPECT_EACH(jar.GetCookieList(&list) == kNoErr, list.GetCookie(0) == 0u);
 }
 
 // A cookie lives until its maker ends it, however many take rights in the one that had its slot before.
@@ -205,15 +168,15 @@ TEST_F(Cookies, AreNotEndedByThoseWhoComeTooLate) {
         while (!done)
             if (MagicCookie cookie = offered; jar.AcquireCookieRights(cookie, nullptr)) jar.ReleaseCookieRights(cookie);
     };
-    std::vector<std::thread> threads;
-    for (int i = 0; i < kLate; ++i) threads.emplace_back(comeLate);
     int lost = 0;
-    for (int i = 0; i < kRounds; ++i) {
-        offered = jar.NewCookie(nullptr);
-        lost += jar.DisposeCookie(offered) != kNoErr;
-    }
-    done = true;
-    for (std::thread& thread : threads) thread.join();
+    InThreads(kLate + 1, [&](int thread) {
+        if (thread > 0) return comeLate();
+        for (int i = 0; i < kRounds; ++i) {
+            offered = jar.NewCookie(nullptr);
+            lost += jar.DisposeCookie(offered) != kNoErr;
+        }
+        done = true;
+    });
     EXPECT_EQ(0, lost);
     jar.Uninit();
 }
@@ -247,11 +210,8 @@ TEST_F(Cookies, AreSafeBetweenThreads) {
             release(cookie);
         }
     };
-    std::vector<std::thread> threads;
-    for (int i = 0; i < kThreads; ++i) threads.emplace_back(work, i);
-    for (std::thread& thread : threads) thread.join();
-    EXPECT_EQ(0, wrong);
-    EXPECT_EQ(kThreads * kRounds, ended);
+    InThreads(kThreads, work);
+    EXPECT_EACH(wrong == 0, kThreads * kRounds == ended);
     int32 left = -1;
     jar.GetNumCookies(&left);
     EXPECT_EQ(0, left);
@@ -259,4 +219,4 @@ TEST_F(Cookies, AreSafeBetweenThreads) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,16 +1,10 @@
 #include "support/StartedMemory.h"
+#include "support/Test.h"
 #include <tessel/memory/HObjList.h>
 #include <tessel/memory/MemoryManager.h>
 
-#include <gmock/gmock.h>
-#include <random>
-#include <vector>
-
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::ElementsAreArray;
 
 struct ObjList : ::testing::Test {
     test::StartedMemory memory;
@@ -85,22 +79,18 @@ TEST_F(ObjList, GrowsAndShrinksBySixteenBytes) {
     DSSetHSzClr(list, 60);
     HObjListSwap(list, 0, 3);
     EXPECT_THAT(Values(), ElementsAre(0, 0, 7, 5));
-    EXPECT_EQ(5u, HObjListDelete(list, 3));
-    EXPECT_EQ(48u, DSGetHandleSize(list));
-    EXPECT_EQ(7u, HObjListDelete(list, 99));
-    EXPECT_EQ(32u, DSGetHandleSize(list));
+    EXPECT_EACH(HObjListDelete(list, 3) == 5u, DSGetHandleSize(list) == 48u, HObjListDelete(list, 99) == 7u,
+                DSGetHandleSize(list) == 32u);
     HCompactObjList(list);
-    EXPECT_EQ(16u, DSGetHandleSize(list));
-    EXPECT_EQ(0u, HObjListDelete(list, 0));
+    EXPECT_EACH(DSGetHandleSize(list) == 16u, HObjListDelete(list, 0) == 0u);
 }
 
 TEST_F(ObjList, ReportsWhatIsWrong) {
     HObjListInsert(list, 1, 0);
     HObjListSwap(list, 0, 1);
     HObjListSwap(list, -1, 0);
-    EXPECT_EQ(0, HObjListBringToFront(list, 2));
-    EXPECT_EQ(kArgErr, HObjListInsert(nullptr, 1, 0));
-    EXPECT_EQ(-1, HObjListSearch(nullptr, 1));
+    EXPECT_EACH(HObjListBringToFront(list, 2) == 0, HObjListInsert(nullptr, 1, 0) == kArgErr,
+                HObjListSearch(nullptr, 1) == -1);
     constexpr char kRange[] = "HObjListSwap: pos out of range";
     EXPECT_THAT(memory.reports.Texts(),
                 ElementsAre(kRange, kRange, "HObjListBringToFront: object not found!!!", "", ""));
@@ -108,4 +98,4 @@ TEST_F(ObjList, ReportsWhatIsWrong) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,17 +1,12 @@
 #include "diagnostics/AllocTracking.h"
 #include "memory/Heap.h"
 #include "support/StartedMemory.h"
+#include "support/Test.h"
+#include <tessel/base/MGPlacementNew.h>
 #include <tessel/memory/MemoryManager.h>
 
-#include <gmock/gmock.h>
-#include <random>
-#include <string>
-
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 
 struct Tracking {
     explicit Tracking(bool on) { SetAllocTracking(on); }
@@ -51,8 +46,7 @@ TEST_P(Handles, AreAlignedByTheirSize) {
         ASSERT_TRUE(h && *h) << c.size;
         EXPECT_EQ(c.size, DSGetHandleSize(h));
         EXPECT_TRUE(IsAligned(h, c.alignment, c.offset)) << c.size;
-        EXPECT_EQ(std::string(c.size, '\0'), Content(h));
-        EXPECT_EQ(kNoErr, DSDisposeHandle(h));
+        EXPECT_EACH(std::string(c.size, '\0') == Content(h), DSDisposeHandle(h) == kNoErr);
     }
 }
 
@@ -92,9 +86,7 @@ TEST_P(Handles, KeepTheirBytesAndAlignmentThroughResizes) {
             size_t kept = std::min<size_t>(model.size(), size);
             std::string now = Content(h);
             ASSERT_EQ(model.substr(0, kept), now.substr(0, kept));
-            if (clear) {
-                ASSERT_EQ(std::string(size - kept, '\0'), now.substr(kept));
-            }
+            ASSERT_TRUE(!clear || now.substr(kept) == std::string(size - kept, '\0'));
             for (size_t at = kept; at < size; ++at) (*h)[at] = static_cast<uint8>(random());
             model = Content(h);
         }
@@ -110,8 +102,7 @@ TEST_P(Handles, MoveOnlyWhenTheyMust) {
     EXPECT_EQ(kNoErr, DSSetHandleSize(h, 17));  // nothing changes
     EXPECT_EQ(kNoErr, DSSetHandleSize(h, 18));  // the same heap size
     EXPECT_EQ(data, *h);
-    EXPECT_EQ(kMemFullErr, DSSetHandleSize(h, 0xFFFFFFFF));
-    EXPECT_EQ(18u, DSGetHandleSize(h));
+    EXPECT_EACH(DSSetHandleSize(h, 0xFFFFFFFF) == kMemFullErr, DSGetHandleSize(h) == 18u);
     DSReadCounters(counters);
     EXPECT_THAT(counters, ElementsAre(0, 0, 3, 0));
 
@@ -129,12 +120,10 @@ TEST_P(Handles, MoveOnlyWhenTheyMust) {
     uint32 moves = counters[3];
     for (uint32 size : {105u, 104u, 3000u}) {
         data = *h;
-        EXPECT_EQ(kNoErr, DSSetHandleSize(h, size));
-        EXPECT_NE(data, *h);
+        EXPECT_EACH(DSSetHandleSize(h, size) == kNoErr, data != *h);
     }
     data = *h;
-    EXPECT_EQ(kNoErr, DSSetHandleSize(h, 3000));
-    EXPECT_EQ(data, *h);
+    EXPECT_EACH(DSSetHandleSize(h, 3000) == kNoErr, data == *h);
     SetStressHandles(false);
     DSReadCounters(counters);
     EXPECT_EQ(moves, counters[3]);
@@ -145,10 +134,8 @@ TEST_P(Handles, MoveOnlyWhenTheyMust) {
 TEST_P(Handles, AreRecognised) {
     const uint64 before = heap::TotalAllocated();
     UHandle first = DSNewHandle(1), second = DSNewHandle(2);
-    EXPECT_EQ(1, IsDSHandle(first));
-    EXPECT_EQ(kNoErr, DSDisposeHandle(first));
-    EXPECT_EQ(kNoErr, DSDisposeHandle(second));
-    EXPECT_EQ(before, heap::TotalAllocated());
+    EXPECT_EACH(IsDSHandle(first) == 1, DSDisposeHandle(first) == kNoErr, DSDisposeHandle(second) == kNoErr,
+                before == heap::TotalAllocated());
     EXPECT_EQ(0, IsDSHandle(first));  // a free slot
     EXPECT_EQ(kHandleErr, DSCheckHandle(first));
     EXPECT_EQ(second, DSNewHandle(5));  // last freed, first reused
@@ -157,25 +144,20 @@ TEST_P(Handles, AreRecognised) {
     UPtr looksAlive = *first;
     UHandle odd = reinterpret_cast<UHandle>(reinterpret_cast<uintptr_t>(first) + 1);
     for (UHandle none : {static_cast<UHandle>(nullptr), &looksAlive, odd, reinterpret_cast<UHandle>(16)}) {
-        EXPECT_EQ(0, IsDSHandle(none));
-        EXPECT_EQ(kHandleErr, DSCheckHandle(none));
-        EXPECT_EQ(0u, DSGetHandleSize(none));
-        EXPECT_EQ(kHandleErr, DSSetHandleSize(none, 3));
-        EXPECT_EQ(kHandleErr, AZHLock(none));
+        EXPECT_EACH(IsDSHandle(none) == 0, DSCheckHandle(none) == kHandleErr, DSGetHandleSize(none) == 0u,
+                    DSSetHandleSize(none, 3) == kHandleErr, AZHLock(none) == kHandleErr);
         AZHPurge(none);
         EXPECT_EQ(none ? kHandleErr : kNoErr, DSDisposeHandle(none));
     }
     EXPECT_EQ(8u, memory.reports.CountAt(kDebugFatal));  // size query and resize of each
     EXPECT_TRUE(memory.reports.Has(kDebugWarning, "Memory error 3 in DSSetHandleSize"));
-    EXPECT_TRUE(memory.reports.Has(kDebugWarning, "Memory error 3 in DSDisposeHandle"));
-    EXPECT_TRUE(memory.reports.Has(kDebugWarning, "Memory error 3 in AZHLock"));
-    EXPECT_TRUE(memory.reports.Has(kDebugWarning, "Memory error 3 in AZHPurge"));
-    EXPECT_EQ(kNoErr, AZHUnlock(first));
-    EXPECT_EQ(0, AZHGetState(first));
+    EXPECT_EACH(memory.reports.Has(kDebugWarning, "Memory error 3 in DSDisposeHandle"),
+                memory.reports.Has(kDebugWarning, "Memory error 3 in AZHLock"),
+                memory.reports.Has(kDebugWarning, "Memory error 3 in AZHPurge"), AZHUnlock(first) == kNoErr,
+                AZHGetState(first) == 0);
 
     DSSetHandleChecking(1);  // a size query now believes what looks alive, a resize does not
-    EXPECT_EQ(5u, DSGetHandleSize(&looksAlive));
-    EXPECT_EQ(kHandleErr, DSSetHandleSize(&looksAlive, 6));
+    EXPECT_EACH(DSGetHandleSize(&looksAlive) == 5u, DSSetHandleSize(&looksAlive, 6) == kHandleErr);
     DSSetHandleChecking(0);
     EXPECT_EQ(kNoErr, DSSetHandleSize(&looksAlive, 5));
     DSSetHandleChecking(7);
@@ -186,62 +168,37 @@ TEST_P(Handles, AreRecognised) {
 
 TEST_P(Handles, AreMadeResizedAndDroppedThroughTheirAddress) {
     UHandle h = nullptr;
-    EXPECT_EQ(kNoErr, DataSetHandleSizeOrNewHandle(&h, 0));
-    EXPECT_EQ(nullptr, h);
-    EXPECT_EQ(kNoErr, DataSetHSzOrNewHClr(&h, 3));
-    EXPECT_EQ(std::string(3, '\0'), Content(h));
-    EXPECT_EQ(kNoErr, DSSetHSzOrNewHClr(&h, 5));
-    EXPECT_EQ(std::string(5, '\0'), Content(h));
-    EXPECT_EQ(kNoErr, DataSetHandleSizeOrNewHandle(&h, 0));
-    EXPECT_EQ(nullptr, h);
-    EXPECT_EQ(kNoErr, DSSetHandleSizeOrNewHandle(&h, 0));
-    EXPECT_EQ("", Content(h));
-    EXPECT_EQ(kNoErr, DSSetHandleFromPtrNULLMeansEmpty(&h, "abc", 3));
-    EXPECT_EQ("abc", Content(h));
-    EXPECT_EQ(kNoErr, DSSetHandleFromPtrNULLMeansEmpty(&h, "abc", 0));
-    EXPECT_EQ(nullptr, h);
-    EXPECT_EQ(kNoErr, DSSetHandleFromPtr(&h, "", 0));
-    EXPECT_EQ(kNoErr, DSDisposeHandleAndNull(&h));
-    EXPECT_EQ(nullptr, h);
-    EXPECT_EQ(kNoErr, DSDisposeHandleAndNull(&h));
-    EXPECT_EQ(kNoErr, DSDisposeHandleAndNull(nullptr));
-    EXPECT_EQ(kArgErr, DSDisposePtr(nullptr));
+    EXPECT_EACH(
+        DataSetHandleSizeOrNewHandle(&h, 0) == kNoErr, h == nullptr, DataSetHSzOrNewHClr(&h, 3) == kNoErr,
+        std::string(3, '\0') == Content(h), DSSetHSzOrNewHClr(&h, 5) == kNoErr, std::string(5, '\0') == Content(h),
+        DataSetHandleSizeOrNewHandle(&h, 0) == kNoErr, h == nullptr, DSSetHandleSizeOrNewHandle(&h, 0) == kNoErr,
+        Content(h) == "", DSSetHandleFromPtrNULLMeansEmpty(&h, "abc", 3) == kNoErr, Content(h) == "abc",
+        DSSetHandleFromPtrNULLMeansEmpty(&h, "abc", 0) == kNoErr, h == nullptr, DSSetHandleFromPtr(&h, "", 0) == kNoErr,
+        DSDisposeHandleAndNull(&h) == kNoErr, h == nullptr, DSDisposeHandleAndNull(&h) == kNoErr,
+        DSDisposeHandleAndNull(nullptr) == kNoErr, DSDisposePtr(nullptr) == kArgErr);
     EXPECT_THAT(memory.reports.Texts(), ElementsAre("Memory error 1 in DSDisposePtr"));
 }
 
 TEST_P(Handles, AreCopiedAndAppended) {
     UHandle source = Make("source"), copy = nullptr;
-    EXPECT_EQ(kNoErr, DSCopyHandle(&copy, source));
-    EXPECT_EQ("source", Content(copy));
-    EXPECT_EQ(kNoErr, DSPtrToXHand("xy", copy, 2));
-    EXPECT_EQ("xy", Content(copy));
-    EXPECT_EQ(kNoErr, DSCopyHandle(&copy, source));
-    EXPECT_EQ(kNoErr, DSPtrAndHand(" and", copy, 4));
-    EXPECT_EQ(kNoErr, DSHandAndHand(source, copy));
-    EXPECT_EQ("source andsource", Content(copy));
-    EXPECT_EQ(kNoErr, DSHandAndHand(source, source));
-    EXPECT_EQ("sourcesource", Content(source));
-    EXPECT_EQ(kArgErr, DSPtrAndHand(nullptr, source, 1));
-    EXPECT_EQ(kArgErr, DSPtrToXHand(nullptr, source, 1));
-    EXPECT_EQ(kArgErr, DSSetHandleFromPtr(&source, nullptr, 1));
-    EXPECT_EQ("sourcesource", Content(source));
+    EXPECT_EACH(DSCopyHandle(&copy, source) == kNoErr, Content(copy) == "source", DSPtrToXHand("xy", copy, 2) == kNoErr,
+                Content(copy) == "xy", DSCopyHandle(&copy, source) == kNoErr, DSPtrAndHand(" and", copy, 4) == kNoErr,
+                DSHandAndHand(source, copy) == kNoErr, Content(copy) == "source andsource",
+                DSHandAndHand(source, source) == kNoErr, Content(source) == "sourcesource",
+                DSPtrAndHand(nullptr, source, 1) == kArgErr, DSPtrToXHand(nullptr, source, 1) == kArgErr,
+                DSSetHandleFromPtr(&source, nullptr, 1) == kArgErr, Content(source) == "sourcesource");
     UHandle other = source;
-    EXPECT_EQ(kNoErr, DSHandToHand(&other));
-    EXPECT_NE(source, other);
-    EXPECT_EQ("sourcesource", Content(other));
-    EXPECT_EQ(kNoErr, DSSwapHandles(copy, other));
-    EXPECT_EQ("source andsource", Content(other));
-    EXPECT_EQ(other, DSRecoverHandle(*other));
+    EXPECT_EACH(DSHandToHand(&other) == kNoErr, source != other, Content(other) == "sourcesource",
+                DSSwapHandles(copy, other) == kNoErr, Content(other) == "source andsource",
+                other == DSRecoverHandle(*other));
     EXPECT_THAT(memory.reports.Texts(), IsEmpty());
 
-    EXPECT_EQ(kNoErr, DSCopyHandle(&copy, copy));
-    EXPECT_TRUE(memory.reports.Has(kDebugWarning, "Should call DSHandToHand. This is a no-op"));
-    EXPECT_EQ(nullptr, DSRecoverHandle(*other + 1));
-    EXPECT_TRUE(memory.reports.Has(kDebugFatal, "Pointer passed to BRecoverHandle not linked to master pointer!"));
-    EXPECT_EQ(kNoErr, DSSwapHandles(copy, copy));
-    EXPECT_EQ(2u, memory.reports.CountAt(kDebugFatal));
-    EXPECT_EQ(kNoErr, DSCopyHandle(&copy, nullptr));
-    EXPECT_EQ(nullptr, copy);
+    EXPECT_EACH(DSCopyHandle(&copy, copy) == kNoErr,
+                memory.reports.Has(kDebugWarning, "Should call DSHandToHand. This is a no-op"),
+                DSRecoverHandle(*other + 1) == nullptr,
+                memory.reports.Has(kDebugFatal, "Pointer passed to BRecoverHandle not linked to master pointer!"),
+                DSSwapHandles(copy, copy) == kNoErr, memory.reports.CountAt(kDebugFatal) == 2u,
+                DSCopyHandle(&copy, nullptr) == kNoErr, copy == nullptr);
     DSDisposeHandle(source);
     DSDisposeHandle(other);
 }
@@ -263,8 +220,7 @@ TEST_P(Handles, AreTracedAndTellWhenMemoryIsFull) {
     DSSetHandleSize(h, 12);
     DSSetHandleSize(h, 12);
     DSSetHandleSize(h, 0xFFFFFFFE);
-    EXPECT_EQ(kMemFullErr, DSPtrAndHand("", h, 0xFFFFFFFD));
-    EXPECT_EQ(nullptr, DSNewHandle(0xFFFFFFFF));
+    EXPECT_EACH(DSPtrAndHand("", h, 0xFFFFFFFD) == kMemFullErr, DSNewHandle(0xFFFFFFFF) == nullptr);
     DSDisposeHandle(h);
     SetMemEventTraceProc(nullptr);
     CallSetMemFullProc(5);
@@ -279,9 +235,16 @@ TEST_P(Handles, AreRecoveredAtTheStop) {
     Make("twelve bytes");
     DSDisposeHandle(Make("gone"));
     Make("abc");
+    int ended = 0;
+    struct Singleton {
+        int& count;
+        ~Singleton() { ++count; }
+    };
+    alignas(Singleton) char place[sizeof(Singleton)];
+    MGPlacementNewRegisterDeletor(new MGPlacementDelete<Singleton>(new (place) Singleton{ended}));
     EXPECT_TRUE(GetMemoryManagerInitialized());
     memory.Stop();
-    EXPECT_FALSE(GetMemoryManagerInitialized());
+    EXPECT_EACH(!GetMemoryManagerInitialized(), ended == 1);
     EXPECT_THAT(memory.reports.Texts(),
                 ::testing::Contains(::testing::EndsWith("2 Handle Leaks (0 expected)")).Times(GetParam()));
     EXPECT_TRUE(memory.reports.Has(kDebugInfo, "Recovered 2 Handles for 15 bytes."));
@@ -289,4 +252,4 @@ TEST_P(Handles, AreRecoveredAtTheStop) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -4,16 +4,11 @@
 #include "memory/MasterPointers.h"
 #include "memory/MemorySettings.h"
 #include "support/StartedMemory.h"
+#include "support/Test.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/memory/TrackedMallocFree.h>
 
-#include <algorithm>
-#include <cstdlib>
-#include <cstring>
-#include <gmock/gmock.h>
 #include <map>
-#include <string>
-#include <vector>
 
 namespace tessel {
 
@@ -69,8 +64,7 @@ TEST(MemorySettings, ComeFromTheEnvironment) {
         Environment environment(c.variables);
         EXPECT_THAT(c.options, ElementsAre(Option(GuardKind::kHandle), Option(GuardKind::kPointer),
                                            Option(GuardKind::kNewDelete)));
-        EXPECT_EQ(c.checking, memorySettings.checking.load());
-        EXPECT_EQ(c.allWritten, ConfigGuardBytes(1));
+        EXPECT_EACH(c.checking == memorySettings.checking.load(), c.allWritten == ConfigGuardBytes(1));
         for (GuardKind kind : {GuardKind::kHandle, GuardKind::kPointer, GuardKind::kNewDelete})
             EXPECT_EQ((c.options[static_cast<size_t>(kind)] & 3) == 3, ChecksGuards(kind));
         ConfigGuardBytes(0);
@@ -147,13 +141,10 @@ TEST(GuardBytes, ShowWhatWasOverwritten) {
             data[c.at] = static_cast<uint8>(c.byte);
             if (c.at2) data[c.at2] = static_cast<uint8>(c.byte);
             if (data == p) {
-                EXPECT_EQ(kHandleErr, DSCheckPtr(p));
-                EXPECT_EQ(0, DSCheckPtrGuardBytes(p));
-                EXPECT_EQ(kHandleErr, DSDisposePtr(p));
+                EXPECT_EACH(DSCheckPtr(p) == kHandleErr, DSCheckPtrGuardBytes(p) == 0, DSDisposePtr(p) == kHandleErr);
             } else {
-                EXPECT_EQ(kHandleErr, DSSetHandleSize(h, 40));
-                EXPECT_EQ(0, DSCheckHandleGuardBytes(h));
-                EXPECT_EQ(kHandleErr, DSDisposeHandle(h));
+                EXPECT_EACH(DSSetHandleSize(h, 40) == kHandleErr, DSCheckHandleGuardBytes(h) == 0,
+                            DSDisposeHandle(h) == kHandleErr);
             }
             EXPECT_THAT(failures, ElementsAre(c.failure, c.failure, c.failure)) << c.at;
             data[c.at] = static_cast<uint8>(c.intact);
@@ -164,13 +155,11 @@ TEST(GuardBytes, ShowWhatWasOverwritten) {
 
     for (uint32 size : {40u, 3u, 2000u, 1500u, 0u, 1048576u, 24u}) {  // the pattern moves with the end
         ASSERT_EQ(kNoErr, DSSetHandleSize(h, size));
-        EXPECT_EQ(kNoErr, DSCheckHandle(h));
-        EXPECT_EQ(0, std::memcmp(*h + size, "ORV13MEM", 8));
+        EXPECT_EACH(DSCheckHandle(h) == kNoErr, std::memcmp(*h + size, "ORV13MEM", 8) == 0);
     }
     SetGuardByteCheckFailedProc(standard);
     memory.reports.Clear();
-    EXPECT_EQ(0, DSCheckHandleGuardBytes(nullptr));
-    EXPECT_EQ(0, DSCheckPtrGuardBytes(nullptr));
+    EXPECT_EACH(DSCheckHandleGuardBytes(nullptr) == 0, DSCheckPtrGuardBytes(nullptr) == 0);
     (*h)[24] = 0;
     EXPECT_EQ(kHandleErr, DSCheckHandle(h));
     (*h)[24] = 'O';
@@ -183,8 +172,7 @@ TEST(GuardBytes, ShowWhatWasOverwritten) {
                             StartsWith("Memory corruption detected:  buffer underrun at pointer 0x")));
     EXPECT_EQ(nullptr, DSRecoverHandle(p));  // no handle's header lies in front of it
     EXPECT_EQ(kNoErr, DSDisposeHandle(h));
-    EXPECT_EQ(0, DSCheckHandleGuardBytes(h));
-    EXPECT_EQ(kNoErr, DSDisposePtr(p));
+    EXPECT_EACH(DSCheckHandleGuardBytes(h) == 0, DSDisposePtr(p) == kNoErr);
 
     UHandle ruined = DSNewHandle(16);
     DSSetHandleSize(DSNewHandle(5), 7);
@@ -194,8 +182,8 @@ TEST(GuardBytes, ShowWhatWasOverwritten) {
     SetDetour(kHandlesTracked, false);
     memory.Stop();
     std::free(block);  // the library left it alone
-    EXPECT_TRUE(memory.reports.Has(kDebugError, "The heap is corrupt"));
-    EXPECT_TRUE(memory.reports.Has(kDebugInfo, "Recovered 1 Handles for 7 bytes."));
+    EXPECT_EACH(memory.reports.Has(kDebugError, "The heap is corrupt"),
+                memory.reports.Has(kDebugInfo, "Recovered 1 Handles for 7 bytes."));
 }
 
 uint32 Total() {
@@ -227,8 +215,7 @@ TEST(MemoryStatistics, AreExact) {
                             "Allocated to OV: totAllocSize " + std::to_string(Total()), "Total: totPhysSize 0"));
     DSDisposePtr(p);
     DSDisposeHandle(h);
-    EXPECT_EQ(before, Total());
-    EXPECT_EQ(0, DSMaxMem());
+    EXPECT_EACH(before == Total(), DSMaxMem() == 0);
 }
 
 TEST(MasterPointers, GrowByOneBlockAtATime) {
@@ -242,9 +229,8 @@ TEST(MasterPointers, GrowByOneBlockAtATime) {
     };
     EXPECT_EQ(0u, grow(kFirst));
     uint32 block = grow(kFirst + 1);
-    EXPECT_GE(block, sizeof(MasterPointerBlock));
-    EXPECT_EQ(block, grow(kFirst + kBlock));
-    EXPECT_EQ(2 * block, grow(kFirst + kBlock + 1));
+    EXPECT_EACH(block >= sizeof(MasterPointerBlock), block == grow(kFirst + kBlock),
+                2 * block == grow(kFirst + kBlock + 1));
     for (UHandle h : handles) EXPECT_EQ(1, IsDSHandle(h));
     while (!handles.empty()) {
         EXPECT_EQ(kNoErr, DSDisposeHandle(handles.back()));
@@ -256,8 +242,7 @@ TEST(MasterPointers, GrowByOneBlockAtATime) {
 TEST(MemoryChecks, FindPlantedDamage) {
     test::StartedMemory memory;
     UHandle used = DSNewHandle(8);
-    EXPECT_FALSE(MemCheckHeaps());
-    EXPECT_EQ(0u, memory.reports.CountAt(kDebugFatal));
+    EXPECT_EACH(!MemCheckHeaps(), memory.reports.CountAt(kDebugFatal) == 0u);
 
     MasterPointersTest::BlockCount() -= 1;
     EXPECT_EQ(kCorruptErr, DSHeapCheck(0));
@@ -297,8 +282,7 @@ TEST(MemoryChecks, FindDamagedBlocks) {
         std::memcpy(saved, header, 8);
         memory.reports.Clear();
         std::memset(header, 0xEE, 4);
-        EXPECT_EQ(kNoErr, DSMemStatsSlow(words));
-        EXPECT_FALSE(heap::Check());
+        EXPECT_EACH(DSMemStatsSlow(words) == kNoErr, !heap::Check());
         std::memcpy(header, saved, 8);
         EXPECT_THAT(memory.reports.Texts(kDebugError), ElementsAre("The heap is corrupt", "The heap is corrupt"));
         EXPECT_TRUE(heap::Check());

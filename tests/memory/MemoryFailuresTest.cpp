@@ -4,6 +4,7 @@
 #include "support/FailingAllocator.h"
 #include "support/ScratchDrive.h"
 #include "support/StartedMemory.h"
+#include "support/Test.h"
 #include <tessel/memory/CookieManager.h>
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/memory/MemoryUtil.h>
@@ -12,16 +13,7 @@
 #include <tessel/sync/ThEvent.h>
 #include <tessel/sync/ThMutex.h>
 
-#include <algorithm>
-#include <atomic>
-#include <cstdlib>
-#include <cstring>
-#include <functional>
-#include <gmock/gmock.h>
 #include <malloc.h>
-#include <memory>
-#include <thread>
-#include <vector>
 
 namespace tessel {
 
@@ -62,12 +54,11 @@ TEST(MemoryFull, LeavesHandlesAsTheyWere) {
             uint32 old = DSGetHandleSize(h);
             MgErr err = DSSetHSzClr(h, size);
             EXPECT_TRUE(err == kNoErr || err == kMemFullErr);
-            EXPECT_EQ(err == kNoErr ? size : old, DSGetHandleSize(h));
-            EXPECT_EQ(0, std::memcmp(*h, "xxxxxxxxxxxxxxxxxxxx", 20));
+            EXPECT_EACH((err == kNoErr ? size : old) == DSGetHandleSize(h),
+                        std::memcmp(*h, "xxxxxxxxxxxxxxxxxxxx", 20) == 0);
         }
         MgErr err = DSCopyHandle(&copy, h);
-        EXPECT_EQ(copy ? kNoErr : kMemFullErr, err);
-        EXPECT_EQ(1, IsDSHandle(h));
+        EXPECT_EACH((copy ? kNoErr : kMemFullErr) == err, IsDSHandle(h) == 1);
         DSDisposeHandle(copy);
         DSDisposeHandle(h);
     });
@@ -84,8 +75,7 @@ TEST(MemoryFull, LeavesJarsAsTheyWere) {
             uintptr_t info = 0;
             if (cookie == 0) continue;
             ++made;
-            EXPECT_EQ(kNoErr, MCGetCookieInfo(jar, cookie, &info));
-            EXPECT_EQ(i, info);
+            EXPECT_EACH(MCGetCookieInfo(jar, cookie, &info) == kNoErr, i == info);
         }
         EXPECT_GE(made, 299);
         MCJarSize(jar, &count);
@@ -112,8 +102,7 @@ TEST(MemoryFull, IsToldWithoutTheLockOfTheJar) {
         inFullJar.pop_back();
     });
     test::FailingAllocator failing(1);
-    EXPECT_EQ(0u, MCNewCookie(fullJar, nullptr));
-    EXPECT_EQ(63u, inFullJar.size());
+    EXPECT_EACH(MCNewCookie(fullJar, nullptr) == 0u, inFullJar.size() == 63u);
     MCDisposeJar(fullJar);
 }
 
@@ -136,27 +125,10 @@ TEST(MemoryFull, IsToldByTrackedAllocation) {
     EXPECT_GT(runs, 3);
 }
 
-uint32 wantedAtStart;
-
-TEST(MemoryFull, PreventsTheStart) {
-    uint64 before = heap::TotalAllocated();
-    SetMemFullProc([](uint32 size) { wantedAtStart = size; });
-    for (int n = 1; n <= 5; ++n) {
-        wantedAtStart = 0;
-        test::FailingAllocator failing(n);
-        EXPECT_EQ(kMemFullErr, MemoryManagerStart());
-        EXPECT_EQ(10001 * sizeof(void*), wantedAtStart);  // a block of master pointers
-        EXPECT_FALSE(GetMemoryManagerInitialized());
-        EXPECT_EQ(before, heap::TotalAllocated());
-    }
-    SetMemFullProc(nullptr);
-}
-
 TEST(TrackedAllocation, IsReportedWhenItLeaks) {
     test::StartedMemory memory;
     EXPECT_THROW(TrackedNew(SIZE_MAX - 100), std::bad_alloc);
-    EXPECT_EQ(nullptr, TrackedMalloc(SIZE_MAX));
-    EXPECT_EQ(nullptr, TrackedNewNoThrow(SIZE_MAX / 2));
+    EXPECT_EACH(TrackedMalloc(SIZE_MAX) == nullptr, TrackedNewNoThrow(SIZE_MAX / 2) == nullptr);
     void* none = TrackedNew(0);
     void* other = TrackedNew(0);
     EXPECT_TRUE(none && other && none != other);
@@ -276,10 +248,10 @@ TEST(LeakReports, BeginWithTheCallerOfTheLibrary) {
     for (size_t i = 0; i < 4; ++i) DSDisposePtr(blocks[i]);
     memory.Stop();
     unsetenv("TMPDIR");
-    EXPECT_EQ(std::vector<bool>(handles.size(), true), StacksThatBeginThere(drive.Get("ovHandleLeaks.txt")));
-    EXPECT_EQ(std::vector<bool>(4, true), StacksThatBeginThere(drive.Get("ovPointerLeaks.txt")));
-    EXPECT_EQ(std::vector<bool>(3, true), StacksThatBeginThere(drive.Get("ovnewdelleaks.txt")));
-    EXPECT_EQ(std::vector<bool>(2, true), StacksThatBeginThere(drive.Get("ovMutexLeaks.txt")));
+    EXPECT_EACH(std::vector<bool>(handles.size(), true) == StacksThatBeginThere(drive.Get("ovHandleLeaks.txt")),
+                std::vector<bool>(4, true) == StacksThatBeginThere(drive.Get("ovPointerLeaks.txt")),
+                std::vector<bool>(3, true) == StacksThatBeginThere(drive.Get("ovnewdelleaks.txt")),
+                std::vector<bool>(2, true) == StacksThatBeginThere(drive.Get("ovMutexLeaks.txt")));
     const std::vector<bool> forEvents = StacksThatBeginThere(drive.Get("ovEventLeaks.txt"));
     EXPECT_EQ(2, std::count(forEvents.begin(), forEvents.end(), true)) << "the others are those of the mutexes";
     for (size_t i = 4; i < blocks.size(); ++i) TrackedFree(blocks[i]);
@@ -388,19 +360,15 @@ TEST(MemoryThreads, DoNotDisturbEachOther) {
     const uint32 zeros[4] = {};
     DSSetCounters(zeros);
     std::atomic<int> wrong{0};
-    std::vector<std::thread> threads;
-    for (uint32 i = 0; i < kThreads; ++i) threads.emplace_back([&, i] { wrong += Worker(i, jar).Run(rounds); });
-    for (std::thread& thread : threads) thread.join();
+    test::InThreads(kThreads, [&](int thread) { wrong += Worker(static_cast<uint32>(thread), jar).Run(rounds); });
     EXPECT_EQ(0, wrong);
     int32 cookies = -1;
-    EXPECT_EQ(kNoErr, MCJarSize(jar, &cookies));
-    EXPECT_EQ(0, cookies);
+    EXPECT_EACH(MCJarSize(jar, &cookies) == kNoErr, cookies == 0);
     uint32 counters[4];
     DSReadCounters(counters);
     // Each handle is resized once, and each round fills a slot or empties one; then the rest is emptied.
-    EXPECT_EQ(counters[0], counters[2]);
-    EXPECT_GE(counters[0], kThreads * rounds / 2);
-    EXPECT_LE(counters[0], kThreads * rounds / 2 + kThreads * 40);
+    EXPECT_EACH(counters[0] == counters[2], counters[0] >= kThreads * rounds / 2,
+                counters[0] <= kThreads * rounds / 2 + kThreads * 40);
     EXPECT_GE(counters[1], counters[0]);  // and those of the checks and the jar
     MCDisposeJar(jar);
     EXPECT_EQ(before, heap::TotalAllocated());
@@ -421,13 +389,9 @@ TEST(StaleHandle, IsRefusedByEveryOperationAndItsTracesAreFound) {
     EXPECT_EQ(kNoErr, DSDisposeHandle(stale));
     for (UHandle bad : {stale, static_cast<UHandle>(foreign)}) {
         UHandle copy = nullptr;
-        EXPECT_EQ(kHandleErr, DSDisposeHandle(bad));
-        EXPECT_EQ(kHandleErr, DSSetHandleSize(bad, 20));
-        EXPECT_EQ(kHandleErr, DSCopyHandle(&copy, bad));
-        EXPECT_EQ(nullptr, copy);
-        EXPECT_EQ(kHandleErr, DSPtrAndHand("x", bad, 1));
-        EXPECT_EQ(kHandleErr, DSHandAndHand(bad, bad));
-        EXPECT_EQ(0u, DSGetHandleSize(bad));
+        EXPECT_EACH(DSDisposeHandle(bad) == kHandleErr, DSSetHandleSize(bad, 20) == kHandleErr,
+                    DSCopyHandle(&copy, bad) == kHandleErr, copy == nullptr, DSPtrAndHand("x", bad, 1) == kHandleErr,
+                    DSHandAndHand(bad, bad) == kHandleErr, DSGetHandleSize(bad) == 0u);
     }
     memory.reports.Clear();
     // A write through the stale handle goes into a free master pointer.
@@ -459,10 +423,8 @@ TEST(MemoryUtil, MovesComparesAndSwaps) {
     ClearMem(text, 0);
     EXPECT_EQ(3, checks);
     SwapBlock(text + 1, text + 10, 9);
-    EXPECT_STREQ("2abcdefghi345345678", text);
-    EXPECT_EQ('3' - 'a', BlockCmp("xx3y", "xxaz", 4));
-    EXPECT_EQ(0x80 - 0x7F, BlockCmp("\x80", "\x7F", 1));
-    EXPECT_EQ(0, BlockCmp("xx3y", "xxaz", 2));
+    EXPECT_EACH(text == "2abcdefghi345345678", '3' - 'a' == BlockCmp("xx3y", "xxaz", 4),
+                0x80 - 0x7F == BlockCmp("\x80", "\x7F", 1), BlockCmp("xx3y", "xxaz", 2) == 0);
 }
 
 }  // namespace

@@ -1,6 +1,6 @@
 // The table of types, conversions, rounding and constants.
 #include "numerics/Extended.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include <tessel/numerics/FloatingPointConstants.h>
 #include <tessel/numerics/NumericSupport.h>
 #include <tessel/numerics/RealMath.h>
@@ -8,66 +8,45 @@
 
 #include <cfenv>
 #include <cmath>
-#include <cstring>
-#include <gtest/gtest.h>
 #include <limits>
-#include <random>
 #include <tuple>
-#include <vector>
 
 namespace {
 
-using tessel::Extended;
-using tessel::FromExtended;
-using tessel::ToExtended;
-using tessel::test::ReportRecorder;
+using namespace tessel;
+using namespace tessel::test;
 
 constexpr double kNaN = std::numeric_limits<double>::quiet_NaN();
 
 TEST(NumericSupport, SizesAndClasses) {
     const int32 sizes[] = {0, 1, 2, 4, 8, 1, 2, 4, 8, 4, 8, 10, 8, 16, 20, 0};
     const int32 classes[] = {64, 0, 0, 0, 0, 1, 1, 1, 1, 2, 2, 2, 3, 3, 3, 64};
-    for (int16 code = 0; code < 16; ++code) {
-        EXPECT_EQ(NumSize(code), sizes[code]);
-        EXPECT_EQ(NumClass(static_cast<int16>(code + 16)), classes[code]);
-    }
+    for (int16 code = 0; code < 16; ++code)
+        EXPECT_EACH(NumSize(code) == sizes[code], NumClass(static_cast<int16>(code + 16)) == classes[code]);
 }
 
 TEST(NumericSupport, ExtendedSizeIsSettable) {
     const cmplxExt packed = {FromExtended(1.5L), FromExtended(-2.5L)};
-    EXPECT_EQ(SetFxSize(12), 10);
-    EXPECT_EQ(NumSize(11), 12);
-    EXPECT_EQ(NumSize(14), 24);
+    EXPECT_EACH(SetFxSize(12) == 10, NumSize(11) == 12, NumSize(14) == 24);
     uint8 padded[24] = {};
     const cmplx128 z = {1.5, -2.5};
     ConvertNum(kNumComplexDouble, &z, kNumComplexExtended, padded);
-    EXPECT_EQ(std::memcmp(padded, &packed.re, 10), 0);
-    EXPECT_EQ(std::memcmp(padded + 12, &packed.im, 10), 0);
-    EXPECT_EQ(SetFxSize(128), 12);
-    EXPECT_EQ(NumSize(14), 256);
-    EXPECT_EQ(SetFxSize(10), 128);
+    EXPECT_EACH(std::memcmp(padded, &packed.re, 10) == 0, std::memcmp(padded + 12, &packed.im, 10) == 0,
+                SetFxSize(128) == 12, NumSize(14) == 256, SetFxSize(10) == 128);
 }
 
 TEST(NumericSupport, SmallHelpers) {
-    EXPECT_EQ(Min(-3, 2), -3);
-    EXPECT_EQ(Max(-3, 2), 2);
-    EXPECT_EQ(Abs(-7), 7);
-    EXPECT_EQ(Abs(INT32_MIN), INT32_MIN);
-    EXPECT_EQ(Mod(-7, 3), 2);
-    EXPECT_EQ(Mod(7, -3), 1);
-    EXPECT_EQ(Mod(-6, 3), 0);
-    EXPECT_EQ(Mod(INT32_MIN, -1), 0);
-    EXPECT_EQ(Mod(-1, INT32_MIN), INT32_MAX);
-    EXPECT_EQ(Pin(5, 10, 0), 10);
-    EXPECT_EQ(Pin(15, 0, 10), 10);
-    EXPECT_EQ(Pin(-15, 0, 10), 0);
-    EXPECT_EQ(Pin(5, 0, 10), 5);
+    EXPECT_EACH(Min(-3, 2) == -3, Max(-3, 2) == 2, Abs(-7) == 7, Abs(INT32_MIN) == INT32_MIN, Mod(-7, 3) == 2,
+                Mod(7, -3) == 1, Mod(-6, 3) == 0, Mod(INT32_MIN, -1) == 0, Mod(-1, INT32_MIN) == INT32_MAX,
+                Pin(5, 10, 0) == 10, Pin(15, 0, 10) == 10, Pin(-15, 0, 10) == 0, Pin(5, 0, 10) == 5);
 }
 
 TEST(RoundingUtil, ToAnIncrementHalvesAwayFromZero) {
-    const int32 cases[][3] = {
-        {7, 5, 5}, {8, 5, 10}, {-8, 5, -10}, {5, 10, 10}, {-5, 10, -10}, {4, 1, 4}, {INT32_MAX, 10, INT32_MIN + 2}};
-    for (const auto& c : cases) EXPECT_EQ(RndToInc(c[0], c[1]), c[2]) << c[0] << " to " << c[1];
+    EXPECT_EACH(RndToInc(7, 5) == 5, RndToInc(8, 5) == 10, RndToInc(-8, 5) == -10, RndToInc(5, 10) == 10,
+                RndToInc(-5, 10) == -10, RndToInc(4, 1) == 4, RndToInc(INT32_MAX, 10) == INT32_MIN + 2);
+    EXPECT_EACH(UInt64ToFloat64(0) == 0.0, UInt64ToFloat64(0x8000000000000400) == 0x1p63,  // a tie
+                UInt64ToFloat64(0x8000000000000401) == 0x1.0000000000001p63,
+                UInt64ToFloat64(0x8000000000000C00) == 0x1.0000000000002p63);
 }
 
 // ---- between integers -----------------------------------------------------------------------------------------------
@@ -111,8 +90,7 @@ Int Nearest(Extended x) {
     const auto minimum = static_cast<Extended>(std::numeric_limits<Int>::min());
     if (std::isnan(x) || x > maximum) return std::numeric_limits<Int>::max();
     if (x < minimum) return std::numeric_limits<Int>::min();
-    const Extended below = std::floor(x);
-    const Extended distance = x - below;
+    const Extended below = std::floor(x), distance = x - below;
     const bool up = distance > 0.5L || (distance == 0.5L && std::fmod(below, 2.0L) != 0);
     return static_cast<Int>(up ? below + 1 : below);
 }
@@ -136,10 +114,9 @@ TEST(ConvertNum, DoublesSaturateAndRoundHalvesToEven) {
         values.push_back(std::nextafter(limit, 0));
     }
     std::mt19937_64 random(31);
-    for (int i = 0; i < 20000; ++i) {
+    for (int i = 0; i < 20000; ++i)
         values.push_back(
             std::ldexp(static_cast<double>(static_cast<int64>(random())), -static_cast<int>(random() % 70)));
-    }
     std::vector<std::pair<int, double>> cases;  // whatever direction the host rounds in
     for (const double x : values) {
         for (const int direction : {FE_TONEAREST, FE_UPWARD, FE_DOWNWARD, FE_TOWARDZERO})
@@ -147,49 +124,22 @@ TEST(ConvertNum, DoublesSaturateAndRoundHalvesToEven) {
     }
     for (const auto& [direction, x] : cases) {
         std::fesetround(direction);
-        ExpectNearest<int8>(x, Float64ToInt8, kNumInt8);
-        ExpectNearest<int16>(x, Float64ToInt16, kNumInt16);
-        ExpectNearest<int32>(x, Float64ToInt32, kNumInt32);
-        ExpectNearest<int64>(x, Float64ToInt64, kNumInt64);
-        ExpectNearest<uint8>(x, Float64ToUInt8, kNumUInt8);
-        ExpectNearest<uint16>(x, Float64ToUInt16, kNumUInt16);
-        ExpectNearest<uint32>(x, Float64ToUInt32, kNumUInt32);
-        ExpectNearest<uint64>(x, Float64ToUInt64, kNumUInt64);
-        EXPECT_EQ(RndToNearest(x), Nearest<int32>(x)) << x;
-        EXPECT_EQ(RndToNearestI64(x), Nearest<int64>(x)) << x;
-        EXPECT_EQ(RndToNearestU32(x), Nearest<uint32>(x)) << x;
-        EXPECT_EQ(RndToNearestU64(x), Nearest<uint64>(x)) << x;
+        ExpectNearest(x, Float64ToInt8, kNumInt8);
+        ExpectNearest(x, Float64ToInt16, kNumInt16);
+        ExpectNearest(x, Float64ToInt32, kNumInt32);
+        ExpectNearest(x, Float64ToInt64, kNumInt64);
+        ExpectNearest(x, Float64ToUInt8, kNumUInt8);
+        ExpectNearest(x, Float64ToUInt16, kNumUInt16);
+        ExpectNearest(x, Float64ToUInt32, kNumUInt32);
+        ExpectNearest(x, Float64ToUInt64, kNumUInt64);
+        EXPECT_EACH(RndToNearest(x) == Nearest<int32>(x), RndToNearestI64(x) == Nearest<int64>(x),
+                    RndToNearestU32(x) == Nearest<uint32>(x), RndToNearestU64(x) == Nearest<uint64>(x));
         double rounded = 0;
         RTfRoundD(&x, &rounded);
         const bool isSmall = std::fabs(x) < 0x1p62;
         EXPECT_EQ(isSmall ? rounded : 0, isSmall ? static_cast<double>(Nearest<int64>(x)) : 0) << x;
     }
     std::fesetround(FE_TONEAREST);
-}
-
-TEST(ConvertNum, ExtendedValuesNearTheLimits) {
-    const struct {
-        Extended value;
-        int64 asInt64;
-        uint64 asUInt64;
-    } cases[] = {
-        {9223372036854775807.0L, INT64_MAX, 9223372036854775807u},
-        {9223372036854775807.0L + 0.5L, INT64_MAX, 9223372036854775808u},
-        {18446744073709551615.0L, INT64_MAX, UINT64_MAX},
-        {18446744073709551616.0L, INT64_MAX, UINT64_MAX},
-        {4611686018427387904.5L, 4611686018427387904, 4611686018427387904u},
-        {-9223372036854775808.0L, INT64_MIN, 0},
-        {-0.75L, -1, 0},
-    };
-    for (const auto& c : cases) {
-        const floatExt x = FromExtended(c.value);
-        int64 asInt64 = 0;
-        uint64 asUInt64 = 0;
-        ConvertNum(kNumExtended, &x, kNumInt64, &asInt64);
-        ConvertNum(kNumExtended, &x, kNumUInt64, &asUInt64);
-        EXPECT_EQ(asInt64, c.asInt64) << c.value;
-        EXPECT_EQ(asUInt64, c.asUInt64) << c.value;
-    }
 }
 
 // ---- the rest -------------------------------------------------------------------------------------------------------
@@ -202,18 +152,32 @@ To Converted(int16 from, const From& value, int16 to) {
 }
 
 TEST(ConvertNum, RealsAndComplexValues) {
-    EXPECT_EQ((Converted<uint8, int32>(kNumInt32, 300, kNumUInt8)), 44);
-    EXPECT_EQ((Converted<uint8>(kNumDouble, 300.0, kNumUInt8)), 255);
-    EXPECT_EQ((Converted<float>(kNumDouble, 0.1, kNumSingle)), 0.1f);
-    EXPECT_EQ((Converted<float>(kNumDouble, 1e300, kNumSingle)), INFINITY);
-    EXPECT_EQ((Converted<double>(kNumUInt64, ~uint64{0}, kNumDouble)), 0x1p64);
-    EXPECT_EQ((Converted<double>(kNumInt64, int64{9007199254740993}, kNumDouble)), 9007199254740992.0);
-    EXPECT_EQ(ToExtended(Converted<floatExt>(kNumInt64, INT64_MIN, kNumExtended)), -0x1p63L);
+    const struct {
+        Extended value;
+        int64 asInt64;
+        uint64 asUInt64;
+    } limits[] = {{9223372036854775807.0L, INT64_MAX, 9223372036854775807u},
+                  {9223372036854775807.0L + 0.5L, INT64_MAX, 9223372036854775808u},
+                  {18446744073709551615.0L, INT64_MAX, UINT64_MAX},
+                  {18446744073709551616.0L, INT64_MAX, UINT64_MAX},
+                  {4611686018427387904.5L, 4611686018427387904, 4611686018427387904u},
+                  {-9223372036854775808.0L, INT64_MIN, 0},
+                  {-0.75L, -1, 0}};
+    for (const auto& c : limits) {
+        const floatExt x = FromExtended(c.value);
+        EXPECT_EACH((Converted<int64>(kNumExtended, x, kNumInt64)) == c.asInt64,
+                    (Converted<uint64>(kNumExtended, x, kNumUInt64)) == c.asUInt64);
+    }
+    EXPECT_EACH((Converted<uint8, int32>(kNumInt32, 300, kNumUInt8)) == 44,
+                (Converted<uint8>(kNumDouble, 300.0, kNumUInt8)) == 255,
+                (Converted<float>(kNumDouble, 0.1, kNumSingle)) == 0.1f,
+                (Converted<float>(kNumDouble, 1e300, kNumSingle)) == INFINITY,
+                (Converted<double>(kNumUInt64, ~uint64{0}, kNumDouble)) == 0x1p64,
+                (Converted<double>(kNumInt64, int64{9007199254740993}, kNumDouble)) == 9007199254740992.0,
+                ToExtended(Converted<floatExt>(kNumInt64, INT64_MIN, kNumExtended)) == -0x1p63L);
     const auto z = Converted<cmplx64>(kNumComplexDouble, cmplx128{0.1, -2}, kNumComplexSingle);
-    EXPECT_EQ(z.re, 0.1f);
-    EXPECT_EQ(z.im, -2.0f);
-    EXPECT_EQ((Converted<cmplx128>(kNumInt8, int8{-3}, kNumComplexDouble).im), 0);
-    EXPECT_EQ((Converted<int16>(kNumComplexSingle, cmplx64{-7.5f, 3}, kNumInt16)), -8);
+    EXPECT_EACH(z.re == 0.1f, z.im == -2.0f, (Converted<cmplx128>(kNumInt8, int8{-3}, kNumComplexDouble).im) == 0,
+                (Converted<int16>(kNumComplexSingle, cmplx64{-7.5f, 3}, kNumInt16)) == -8);
     EXPECT_EQ((Converted<int16>(static_cast<int16>(kNumInt32 + 16), int32{5}, kNumInt16)), 5) << "only four bits count";
 }
 
@@ -225,58 +189,36 @@ TEST(ConvertNum, BadArgumentsAreReportedAndStoreNothing) {
     ConvertNum(15, &value, kNumInt32, &value);
     ConvertNum(kNumInt32, nullptr, kNumInt32, &value);
     ConvertNum(kNumInt32, &value, kNumInt32, nullptr);
-    const std::string codes = "ConvertNum called with non-numeric";
-    const std::string data = "ConvertNum called with Empty Data";
-    EXPECT_EQ(reports.Texts(4), (std::vector<std::string>{codes, codes, codes, codes, codes, data, data}));
-    EXPECT_EQ(value, 7);
-}
-
-TEST(RoundingUtil, UInt64ToFloat64RoundsToNearest) {
-    EXPECT_EQ(UInt64ToFloat64(0), 0.0);
-    EXPECT_EQ(UInt64ToFloat64(0x8000000000000400), 0x1p63) << "a tie goes to the even neighbour";
-    EXPECT_EQ(UInt64ToFloat64(0x8000000000000401), 0x1.0000000000001p63);
-    EXPECT_EQ(UInt64ToFloat64(0x8000000000000C00), 0x1.0000000000002p63);
+    const std::string codes = "ConvertNum called with non-numeric", data = "ConvertNum called with Empty Data";
+    EXPECT_EACH(reports.Texts(4) == (std::vector<std::string>{codes, codes, codes, codes, codes, data, data}),
+                value == 7);
 }
 
 TEST(FloatingPointConstants, BytesOfSpecialAndWidenedValues) {
-    const struct {
-        const floatExt* value;
-        uint64 mantissa;
-        uint16 signExponent;
-    } cases[] = {
-        {EOne(), 0x8000000000000000, 0x3FFF},        {EZero(), 0, 0},
-        {EInfinity(), 0x8000000000000000, 0x7FFF},   {ENegInfinity(), 0x8000000000000000, 0xFFFF},
-        {ENaN(), 0xFFFFFFFFFFFFFFFF, 0x7FFF},        {ETwoPi(), 0xC90FDAA22168C000, 0x4001},
-        {EEpsilon(), 0x8000000000000000, 0x3FCB},    {EEpsilonExt(), 0x8000000000000000, 0x3FC0},
-        {EEpsilonSgl(), 0x8000000000000000, 0x3FE8},
+    const auto is = [](const floatExt* value, uint16 signExponent, uint64 mantissa) {
+        return value->mantissa == mantissa && value->signExponent == signExponent;
     };
-    for (const auto& c : cases) {
-        EXPECT_EQ(c.value->mantissa, c.mantissa);
-        EXPECT_EQ(c.value->signExponent, c.signExponent);
-    }
+    EXPECT_EACH(is(EOne(), 0x3FFF, 0x8000000000000000), is(EZero(), 0, 0), is(EInfinity(), 0x7FFF, 0x8000000000000000),
+                is(ENegInfinity(), 0xFFFF, 0x8000000000000000), is(ENaN(), 0x7FFF, 0xFFFFFFFFFFFFFFFF),
+                is(ETwoPi(), 0x4001, 0xC90FDAA22168C000), is(EEpsilon(), 0x3FCB, 0x8000000000000000),
+                is(EEpsilonExt(), 0x3FC0, 0x8000000000000000), is(EEpsilonSgl(), 0x3FE8, 0x8000000000000000));
     const auto bits = [](auto x) {
         uint64 result = 0;
         std::memcpy(&result, &x, sizeof x);
         return result;
     };
-    EXPECT_EQ(bits(SInfinity()), 0x7F800000u);
-    EXPECT_EQ(bits(SNegInfinity()), 0xFF800000u);
-    EXPECT_EQ(bits(DInfinity()), 0x7FF0000000000000u);
-    EXPECT_EQ(bits(DNegInfinity()), 0xFFF0000000000000u);
-    EXPECT_EQ(bits(DNaN()), ~uint64{0});
+    EXPECT_EACH(bits(SInfinity()) == 0x7F800000u, bits(SNegInfinity()) == 0xFF800000u,
+                bits(DInfinity()) == 0x7FF0000000000000u, bits(DNegInfinity()) == 0xFFF0000000000000u,
+                bits(DNaN()) == ~uint64{0});
 }
 
 TEST(FloatingPointConstants, Values) {
-    const std::tuple<const floatExt*, double> cases[] = {
-        {ERecipPi(), 1 / M_PI},      {EE(), M_E},
-        {ERecipE(), std::exp(-1.0)}, {Eln10(), M_LN10},
-        {EPlanck(), 6.6260693e-34},  {EElemChg(), 1.60217653e-19},
-        {ESpeedLt(), 299792458.0},   {EGravity(), 6.6742e-11},
-        {EAvgdro(), 6.0221415e23},   {ERydbrg(), 10973731.568525},
-        {EMlrGas(), 8.314472},       {ELnOfTwo(), M_LN2},
-        {ELogOfE(), M_LOG10E},       {ELnOfPi(), std::log(M_PI)},
-    };
-    for (const auto& [value, expected] : cases) EXPECT_EQ(ToExtended(*value), expected);
+    const auto value = [](const floatExt* constant) { return static_cast<double>(ToExtended(*constant)); };
+    EXPECT_EACH(value(ERecipPi()) == 1 / M_PI, value(EE()) == M_E, value(ERecipE()) == std::exp(-1.0),
+                value(Eln10()) == M_LN10, value(EPlanck()) == 6.6260693e-34, value(EElemChg()) == 1.60217653e-19,
+                value(ESpeedLt()) == 299792458.0, value(EGravity()) == 6.6742e-11, value(EAvgdro()) == 6.0221415e23,
+                value(ERydbrg()) == 10973731.568525, value(EMlrGas()) == 8.314472, value(ELnOfTwo()) == M_LN2,
+                value(ELogOfE()) == M_LOG10E, value(ELnOfPi()) == std::log(M_PI));
 }
 
 }  // namespace

@@ -2,14 +2,12 @@
 #include "paths/PathRefAccess.h"
 #include "paths/PathTestSupport.h"
 #include "support/HandClock.h"
+#include "support/Test.h"
 #include <tessel/paths/PathCachedItem.h>
 
-#include <thread>
-
-namespace tessel {
+namespace tessel::test {
 namespace {
 
-using namespace test;
 using Item = PathRef::CachedItem;
 
 // Counts those that live.
@@ -47,21 +45,13 @@ TEST_F(PathCache, ItemsBelongToTheElement) {
     {
         const PathRef path = Abs({"C", "x"});
         auto* item = New(1);
-        EXPECT_EQ(kNoErr, path.Cache("key", item));
-        EXPECT_TRUE(static_cast<CountedItem*>(item)->attached);
-        EXPECT_EQ(1, Found(Abs({"C", "x"}), "key"));
-        EXPECT_EQ(-1, Found(Abs({"C", "X"}), "key"));
-        EXPECT_EQ(-1, Found(path, "other"));
-        EXPECT_EQ(nullptr, path.GetCachedProxy("key", "CachedBool", PathRef::kSearchHere));
-        EXPECT_NE(nullptr, path.GetCachedProxy("key", "CachedItem", PathRef::kSearchHere));
-        EXPECT_EQ(kNoErr, path.Cache("key", New(2)));
-        EXPECT_EQ(2, Found(path, "key"));
-        EXPECT_EQ(1, living_);
-        EXPECT_EQ(kNoErr, path.Cache("gone", New(3)));
-        EXPECT_EQ(kNoErr, path.Cache("gone", nullptr));
-        EXPECT_EQ(-1, Found(path, "gone"));
-        EXPECT_EQ(kArgErr, PathRef().Cache("key", New(4)));
-        EXPECT_EQ(1, living_);
+        EXPECT_EACH(path.Cache("key", item) == kNoErr, static_cast<CountedItem*>(item)->attached,
+                    Found(Abs({"C", "x"}), "key") == 1, Found(Abs({"C", "X"}), "key") == -1, Found(path, "other") == -1,
+                    path.GetCachedProxy("key", "CachedBool", PathRef::kSearchHere) == nullptr,
+                    path.GetCachedProxy("key", "CachedItem", PathRef::kSearchHere) != nullptr,
+                    path.Cache("key", New(2)) == kNoErr, Found(path, "key") == 2, living_ == 1,
+                    path.Cache("gone", New(3)) == kNoErr, path.Cache("gone", nullptr) == kNoErr,
+                    Found(path, "gone") == -1, PathRef().Cache("key", New(4)) == kArgErr, living_ == 1);
     }
     EXPECT_EQ(0, living_);  // with the last path there
 }
@@ -71,13 +61,10 @@ TEST_F(PathCache, SearchDirections) {
     a.Cache("up", New(1));
     abc.Cache("down", New(2));
     PathItemElement* at = nullptr;
-    EXPECT_EQ(1, Found(abc, "up", PathRef::kSearchUp, &at));
-    EXPECT_EQ(PathRefAccess::Element(a), at);
-    EXPECT_EQ(-1, Found(abc, "up", PathRef::kSearchHere, &at));
-    EXPECT_EQ(nullptr, at);
-    EXPECT_EQ(2, Found(Abs({}), "down", PathRef::kSearchDown, &at));
-    EXPECT_EQ(PathRefAccess::Element(abc), at);
-    EXPECT_EQ(-1, Found(a, "down", PathRef::kSearchUp));
+    EXPECT_EACH(Found(abc, "up", PathRef::kSearchUp, &at) == 1, PathRefAccess::Element(a) == at,
+                Found(abc, "up", PathRef::kSearchHere, &at) == -1, at == nullptr,
+                Found(Abs({}), "down", PathRef::kSearchDown, &at) == 2, PathRefAccess::Element(abc) == at,
+                Found(a, "down", PathRef::kSearchUp) == -1);
 }
 
 TEST_F(PathCache, ExpiryAndFlushing) {
@@ -88,17 +75,11 @@ TEST_F(PathCache, ExpiryAndFlushing) {
     clock_.Advance(299);
     EXPECT_EQ(2, Found(path, "short"));
     clock_.Advance(1);
-    EXPECT_EQ(-1, Found(path, "short"));
-    EXPECT_EQ(3, living_);
-    EXPECT_EQ(2 * sizeof(PathRef::CachedInt32), path.FlushCache());
-    EXPECT_EQ(1, living_);
-    EXPECT_EQ(-1, Found(path, "file"));
-    EXPECT_EQ(3, Found(path, "long"));
-    EXPECT_EQ(0u, FShrinkPath(&path));
+    EXPECT_EACH(Found(path, "short") == -1, living_ == 3, 2 * sizeof(PathRef::CachedInt32) == path.FlushCache(),
+                living_ == 1, Found(path, "file") == -1, Found(path, "long") == 3, FShrinkPath(&path) == 0u);
     PathRef::CachedBool item(10, Item::kIndependent, true);
     clock_.Advance(25);
-    EXPECT_TRUE(item.Expired());
-    EXPECT_EQ(15u, item.Rotten());
+    EXPECT_EACH(item.Expired(), item.Rotten() == 15u);
     item.ResetBool(10, false);
     EXPECT_FALSE(item.Expired() || item.Get() || item.Invalidate());
     EXPECT_EQ(0u, item.Rotten());
@@ -130,8 +111,7 @@ TEST_F(PathCache, ItemsAreAskedWithoutALock) {
     for (const char* key : {"replaced", "replaced", "flushed"}) path.Cache(key, new WaitingItem(calls));
     for (const auto direction : {PathRef::kSearchHere, PathRef::kSearchUp, PathRef::kSearchDown})
         EXPECT_NE(nullptr, path.GetCachedProxy("flushed", "CachedItem", direction));
-    EXPECT_EQ(10u, path.FlushCache());
-    EXPECT_EQ(63u, calls);
+    EXPECT_EACH(path.FlushCache() == 10u, calls == 63u);
     Abs({"C", "y"}).Cache("key", new WaitingItem(calls = 0));
     EXPECT_EQ(33u, calls);
 }
@@ -156,8 +136,8 @@ TEST_F(PathCache, TextsAreRemembered) {
     const PathRef::CacheLock lock;
     const Item* item = path.GetCachedProxy("internal_display", "CachedPathString", PathRef::kSearchHere);
     ASSERT_NE(nullptr, item);
-    EXPECT_EQ("C:\\x", static_cast<const PathRef::CachedPathString*>(item)->Get());
-    EXPECT_EQ(nullptr, path.GetCachedProxy("internal_unix", "CachedItem", PathRef::kSearchHere));
+    EXPECT_EACH(static_cast<const PathRef::CachedPathString*>(item)->Get() == "C:\\x",
+                path.GetCachedProxy("internal_unix", "CachedItem", PathRef::kSearchHere) == nullptr);
 }
 
 // ---- start and stop -------------------------------------------------------------------------------------------------
@@ -165,17 +145,15 @@ TEST_F(PathCache, TextsAreRemembered) {
 TEST_F(PathCache, LeakedPathsAreReported) {
     Path leaked = nullptr;
     Abs({"C", "left"}).ConvertToPath(&leaked);
-    EXPECT_EQ(kNoErr, PathManagerStop());
-    EXPECT_TRUE(reports_.Has(3, "We got 1 more Path Leaks than we see from a basic launch and quit.\n"));
-    EXPECT_TRUE(reports_.Has(2, "Possible path leak, unable to purge elements of base #0"));
-    EXPECT_TRUE(reports_.Has(2, "Killing a storage buffer with 3 live object(s)"));
-    EXPECT_TRUE(reports_.Has(2, "name= left"));
+    EXPECT_EACH(PathManagerStop() == kNoErr,
+                reports_.Has(3, "We got 1 more Path Leaks than we see from a basic launch and quit.\n"),
+                reports_.Has(2, "Possible path leak, unable to purge elements of base #0"),
+                reports_.Has(2, "Killing a storage buffer with 3 live object(s)"), reports_.Has(2, "name= left"));
     reports_.Clear();
-    EXPECT_EQ(nullptr, PathRefAccess::Element(PathRef::NotAPath()));
-    EXPECT_TRUE(reports_.Has(2, "Call to GetNotAPath before PathRef::Init() or after PathRef::Uninit()?"));
+    EXPECT_EACH(PathRefAccess::Element(PathRef::NotAPath()) == nullptr,
+                reports_.Has(2, "Call to GetNotAPath before PathRef::Init() or after PathRef::Uninit()?"));
     // A path that outlives a restart is no good, and does no harm.
-    EXPECT_EQ(kNoErr, PathManagerStart());
-    EXPECT_FALSE(FIsAPathOrNotAPath(leaked));
+    EXPECT_EACH(PathManagerStart() == kNoErr, !FIsAPathOrNotAPath(leaked));
     const PathRef again = Abs({"C", "left"});
     EXPECT_NE(PathRefAccess::Element(*leaked), PathRefAccess::Element(again));
     FDestroyPath(&leaked);
@@ -186,9 +164,8 @@ TEST_F(PathCache, CachedPathsAreNoLeaks) {
         path.Cache("me", new PathRef::CachedPath(1000, Item::kIndependent, path));  // keeps its own element
     };
     cache(Abs({"C", "x", "y"}));
-    EXPECT_EQ(kNoErr, PathManagerStop());
-    EXPECT_EQ(0u, reports_.CountAt(2) + reports_.CountAt(3));
-    EXPECT_EQ(kNoErr, PathManagerStart());
+    EXPECT_EACH(PathManagerStop() == kNoErr, reports_.CountAt(2) + reports_.CountAt(3) == 0u,
+                PathManagerStart() == kNoErr);
 }
 
 TEST_F(PathCache, GarbageCollection) {
@@ -201,11 +178,9 @@ TEST_F(PathCache, GarbageCollection) {
     }
     EXPECT_EQ(0u, PathRef::GarbageCollect(PathRef::kCountOnly));
     const uint32 bytes = PathRef::GarbageCollect(PathRef::kFreeUnusedAndReport);
-    EXPECT_GE(bytes, 3 * 512 * sizeof(PathItemElement));
-    EXPECT_TRUE(reports_.Has(2, "Leaked Path Element: 1 refs to kept"));
-    EXPECT_TRUE(reports_.Has(0, "Path Garbage Collect: " + std::to_string(bytes) + " bytes reclaimed"));
-    EXPECT_TRUE(kept.IsSane(false));
-    EXPECT_EQ("rel:new", Show(Rel({"new"})));
+    EXPECT_EACH(bytes >= 3 * 512 * sizeof(PathItemElement), reports_.Has(2, "Leaked Path Element: 1 refs to kept"),
+                reports_.Has(0, "Path Garbage Collect: " + std::to_string(bytes) + " bytes reclaimed"),
+                kept.IsSane(false), Show(Rel({"new"})) == "rel:new");
 }
 
 TEST_F(PathCache, DebugModeShowsTheText) {
@@ -222,4 +197,4 @@ TEST_F(PathCache, DebugModeShowsTheText) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,13 +1,13 @@
 // The flattened form, byte by byte, and what is damaged.
 #include "paths/PathTestSupport.h"
 #include "platform/CodePage.h"
+#include "support/Test.h"
 #include <tessel/streams/BinDataReader.h>
 #include <tessel/streams/BinDataWriter.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
-using namespace test;
 using std::string_literals::operator""s;
 
 class PathFlatten : public PathTest {
@@ -34,51 +34,43 @@ protected:
 };
 
 TEST_F(PathFlatten, BytesOfBothFormats) {
-    const std::pair<PathRef, std::string> rows[] = {
-        {Abs({"C", "dir"}), "PTH0\0\0\0\12\0\0\0\2\1C\3dir"s},
-        {Rel({"..", "a"}), "PTH0\0\0\0\7\0\1\0\2\0\1a"s},
-        {Unc({"s"}), "PTH0\0\0\0\6\0\3\0\1\1s"s},
-        {PathRef(), "PTH0\0\0\0\4\0\2\0\0"s},
-        {Abs({}), "PTH0\0\0\0\4\0\0\0\0"s},
-        {Abs({"C", "\xC3\xA9"}), "PTH1\0\0\0\13abs \0\1C\0\2\xC3\xA9"s},
-        {Rel({"..", "\xC3\xA9"}), "PTH1\0\0\0\12rel \0\0\0\2\xC3\xA9"s},
-    };
-    for (const auto& [path, bytes] : rows) {
-        EXPECT_EQ(bytes, Flattened(path));
-        EXPECT_EQ(Show(path), Unflattened(bytes));
-        EXPECT_EQ(bytes.size(), path.FlattenedSize(bytes[3] == '0' ? PathRef::kPTH0 : PathRef::kPTH1));
-    }
+    const std::pair<PathRef, std::string> rows[] = {{Abs({"C", "dir"}), "PTH0\0\0\0\12\0\0\0\2\1C\3dir"s},
+                                                    {Rel({"..", "a"}), "PTH0\0\0\0\7\0\1\0\2\0\1a"s},
+                                                    {Unc({"s"}), "PTH0\0\0\0\6\0\3\0\1\1s"s},
+                                                    {PathRef(), "PTH0\0\0\0\4\0\2\0\0"s},
+                                                    {Abs({}), "PTH0\0\0\0\4\0\0\0\0"s},
+                                                    {Abs({"C", "\xC3\xA9"}), "PTH1\0\0\0\13abs \0\1C\0\2\xC3\xA9"s},
+                                                    {Rel({"..", "\xC3\xA9"}), "PTH1\0\0\0\12rel \0\0\0\2\xC3\xA9"s}};
+    for (const auto& [path, bytes] : rows)
+        EXPECT_EACH(bytes == Flattened(path), Show(path) == Unflattened(bytes),
+                    bytes.size() == path.FlattenedSize(bytes[3] == '0' ? PathRef::kPTH0 : PathRef::kPTH1));
     char block[64];
     StaticOutputBuf buffer(block, sizeof block);
     uint32 size;
-    EXPECT_EQ(kNoErr, Unc({"s"}).Flatten(&buffer, PathRef::kPTH1, &size, LittleEndianizer()));
-    EXPECT_EQ("PTH1\7\0\0\0unc \1\0s"s, std::string(block, size));
-    EXPECT_EQ("unc:s", Unflattened("PTH1\7\0\0\0unc \1\0s"s, LittleEndianizer()));
-    EXPECT_EQ(kUnsupportedErr,
-              Abs({}).Flatten(&buffer, static_cast<PathRef::FlattenFormat>(2), &size, BigEndianizer()));
+    EXPECT_EACH(
+        Unc({"s"}).Flatten(&buffer, PathRef::kPTH1, &size, LittleEndianizer()) == kNoErr,
+        std::string(block, size) == "PTH1\7\0\0\0unc \1\0s"s,
+        Unflattened("PTH1\7\0\0\0unc \1\0s"s, LittleEndianizer()) == "unc:s",
+        Abs({}).Flatten(&buffer, static_cast<PathRef::FlattenFormat>(2), &size, BigEndianizer()) == kUnsupportedErr);
 }
 
 TEST_F(PathFlatten, TheNullPathIsNoPath) {
     const std::string null = "PTH0\0\0\0\0\0\0\0\0"s;
     std::string bytes(12, '#');
-    EXPECT_EQ(12, FFlattenPath(nullptr, reinterpret_cast<uint8*>(bytes.data())));
-    EXPECT_EQ(null, bytes);
-    EXPECT_EQ(null, Flattened(PathRef(PathRef::kNullPath)));
+    EXPECT_EACH(FFlattenPath(nullptr, reinterpret_cast<uint8*>(bytes.data())) == 12, null == bytes,
+                null == Flattened(PathRef(PathRef::kNullPath)));
     Path path = nullptr;
-    EXPECT_EQ(12, FUnFlattenPath(reinterpret_cast<const uint8*>(null.data()), &path));
-    EXPECT_EQ(nullptr, path);
+    EXPECT_EACH(FUnFlattenPath(reinterpret_cast<const uint8*>(null.data()), &path) == 12, path == nullptr);
     path = FEmptyPath(nullptr);
-    EXPECT_EQ(0, FUnFlattenPath(reinterpret_cast<const uint8*>(null.data()), &path));
-    EXPECT_EQ("abs:", Show(path));
+    EXPECT_EACH(FUnFlattenPath(reinterpret_cast<const uint8*>(null.data()), &path) == 0, Show(path) == "abs:");
     FDestroyPath(&path);
 }
 
 TEST_F(PathFlatten, LongNamesAndTheSettingChooseTheFormat) {
     EXPECT_EQ('0', Flattened(Abs({std::string(255, 'n').c_str()}))[3]);
     const PathRef longName = Abs({std::string(256, 'n').c_str()});
-    EXPECT_EQ('1', Flattened(longName)[3]);
-    EXPECT_EQ(Show(longName), Unflattened(Flattened(longName)));
-    EXPECT_EQ(kArgErr, CodeOf([&] { longName.FlattenedSize(PathRef::kPTH0); }));
+    EXPECT_EACH(Flattened(longName)[3] == '1', Show(longName) == Unflattened(Flattened(longName)),
+                CodeOf([&] { longName.FlattenedSize(PathRef::kPTH0); }) == kArgErr);
     PathRef::Setting("utf8");
     EXPECT_EQ('1', Flattened(Abs({"C"}))[3]);
     PathRef::Setting("sysenc");
@@ -94,8 +86,7 @@ TEST_F(PathFlatten, NamesAreUtf8WhateverTheCodePage) {
     };
     for (const auto& [codePage, name, bytes] : rows) {
         ASSERT_TRUE(platform::SetCodePage(codePage));
-        EXPECT_EQ(bytes, Flattened(Abs({name})));
-        EXPECT_EQ("abs:"s + name, Unflattened(bytes));
+        EXPECT_EACH(bytes == Flattened(Abs({name})), "abs:"s + name == Unflattened(bytes));
     }
 }
 
@@ -124,12 +115,9 @@ TEST_F(PathFlatten, DamagedBytes) {
     for (const auto& [bytes, result] : rows) EXPECT_EQ(result, Unflattened(bytes)) << ::testing::PrintToString(bytes);
     Path path = FEmptyPath(nullptr);
     const auto* cut = reinterpret_cast<const uint8*>("PTH0\0\0\0\6\0\1\0\1\1C");
-    EXPECT_EQ(14, FUnFlattenPath2(cut, &path, 14));
-    EXPECT_EQ("rel:C", Show(path));
-    EXPECT_EQ(14, FUnFlattenPath2(cut, &path, 13));
-    EXPECT_EQ(1, FUnFlattenPath2(nullptr, &path, 0));
-    EXPECT_EQ("rel:C", Show(path));
-    EXPECT_EQ(kArgErr, CodeOf([] { PathRef(static_cast<InputBuf*>(nullptr), BigEndianizer()); }));
+    EXPECT_EACH(FUnFlattenPath2(cut, &path, 14) == 14, Show(path) == "rel:C", FUnFlattenPath2(cut, &path, 13) == 14,
+                FUnFlattenPath2(nullptr, &path, 0) == 1, Show(path) == "rel:C",
+                CodeOf([] { PathRef(static_cast<InputBuf*>(nullptr), BigEndianizer()); }) == kArgErr);
     FDestroyPath(&path);
 }
 
@@ -137,24 +125,20 @@ TEST_F(PathFlatten, PathsInStreams) {
     HandleOutputBuf out;
     BinDataWriter writer(&out, LittleEndianizer());
     PathRef path = Rel({"x"});
-    EXPECT_EQ(14u, writer.WritePath(&path));
-    EXPECT_EQ(12u, writer.WritePath(nullptr));
+    EXPECT_EACH(writer.WritePath(&path) == 14u, writer.WritePath(nullptr) == 12u);
     UHandle handle = out.GetHandle(0);
     MemInputBuf in(*handle, 26);
     BinDataReader reader(&in, LittleEndianizer());
     Path read = reader.ReadPath();
     EXPECT_EQ("rel:x", Show(read));
     FDestroyPath(&read);
-    EXPECT_EQ(nullptr, reader.ReadPath());
-    EXPECT_EQ(kNoErr, reader.GetError());
-    EXPECT_EQ(nullptr, reader.ReadPath());
-    EXPECT_EQ(kCorruptErr, reader.GetError());
+    EXPECT_EACH(reader.ReadPath() == nullptr, reader.GetError() == kNoErr, reader.ReadPath() == nullptr,
+                reader.GetError() == kCorruptErr);
     char block[13];
     StaticOutputBuf tooSmall(block, sizeof block);
     BinDataWriter failing(&tooSmall, LittleEndianizer());
-    EXPECT_EQ(0u, failing.WritePath(&path));
-    EXPECT_EQ(kCorruptErr, failing.GetError());
+    EXPECT_EACH(failing.WritePath(&path) == 0u, failing.GetError() == kCorruptErr);
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,19 +1,15 @@
 // The flat interface: what it accepts, and what it answers for null and for bad paths.
 #include "paths/PathTestSupport.h"
+#include "support/Test.h"
 #include <tessel/memory/MemoryManager.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using namespace test;
 
 class PathManagerFlat : public PathTest {
 protected:
     static constexpr ConstPStr kEnd = nullptr;
-    PathRef abs_ = Abs({"C", "dir"});
-    PathRef rel_ = Rel({"..", "x"});
-    PathRef none_;
-    PathRef null_{PathRef::kNullPath};
+    PathRef abs_ = Abs({"C", "dir"}), rel_ = Rel({"..", "x"}), none_, null_{PathRef::kNullPath};
     PathRef bareUnc_{PathRef::kUNC};
 };
 
@@ -22,23 +18,15 @@ TEST_F(PathManagerFlat, Making) {
     EXPECT_EQ("unc:s/x", Show(path));
     EXPECT_EQ(path, FMakePath(path, 0x10000 + kPathRelative, PStrOf(".."), kEnd));  // 16 bits count
     EXPECT_EQ("rel:^", Show(path));
-    EXPECT_EQ(nullptr, FMakePath(nullptr, 4, PStrOf("x"), kEnd));
-    EXPECT_EQ(nullptr, FMakePath(&bareUnc_, 0, PStrOf("x"), kEnd));
-    EXPECT_EQ(nullptr, FMakePath(nullptr, kPathNotAPath, PStrOf("x"), kEnd));
-    EXPECT_EQ(path, FMakePath(path, kPathNotAPath, kEnd));
-    EXPECT_EQ("not", Show(path));
-    EXPECT_EQ("abs:", Show(FEmptyPath(path)));
-    EXPECT_EQ("not", Show(FNotAPath(path)));
-    EXPECT_EQ(kArgErr, FAppendName(path, PStrOf("x")));
-    EXPECT_EQ(kArgErr, FAppendName(&abs_, PStrOf("")));
-    EXPECT_EQ(kArgErr, FAppendName(&abs_, nullptr));
-    EXPECT_EQ("rel:^", Show(FAppendName(&rel_, PStrOf("")), rel_));
+    EXPECT_EACH(
+        FMakePath(nullptr, 4, PStrOf("x"), kEnd) == nullptr, FMakePath(&bareUnc_, 0, PStrOf("x"), kEnd) == nullptr,
+        FMakePath(nullptr, kPathNotAPath, PStrOf("x"), kEnd) == nullptr, path == FMakePath(path, kPathNotAPath, kEnd),
+        Show(path) == "not", Show(FEmptyPath(path)) == "abs:", Show(FNotAPath(path)) == "not",
+        FAppendName(path, PStrOf("x")) == kArgErr, FAppendName(&abs_, PStrOf("")) == kArgErr,
+        FAppendName(&abs_, nullptr) == kArgErr, Show(FAppendName(&rel_, PStrOf("")), rel_) == "rel:^");
     Path copy = path;
-    EXPECT_EQ(kNoErr, FPathCpy(path, &abs_));
-    EXPECT_EQ(kNoErr, FPathToPath(&copy));
-    EXPECT_NE(path, copy);
-    EXPECT_EQ("abs:C/dir", Show(copy));
-    EXPECT_EQ(kArgErr, FPathCpy(path, nullptr));
+    EXPECT_EACH(FPathCpy(path, &abs_) == kNoErr, FPathToPath(&copy) == kNoErr, path != copy, Show(copy) == "abs:C/dir",
+                FPathCpy(path, nullptr) == kArgErr);
     FDestroyPath(&path);
     EXPECT_EQ(nullptr, path);
     FDestroyPath(&path);
@@ -66,30 +54,21 @@ TEST_F(PathManagerFlat, Inspecting) {
                                                 static_cast<int32>(PathSize(path) / sizeof(PathRef))}))
             << Show(path);
     }
-    EXPECT_EQ(kPathUNC, PathType(&bareUnc_));
-    EXPECT_TRUE(FIsAPathOfType(&bareUnc_, kPathUNC));
-    EXPECT_FALSE(FIsAPathOfType(&abs_, 4));
+    EXPECT_EACH(PathType(&bareUnc_) == kPathUNC, FIsAPathOfType(&bareUnc_, kPathUNC), !FIsAPathOfType(&abs_, 4));
 }
 
 TEST_F(PathManagerFlat, NamesAreCopiedWhole) {
     Str255 name;
     const auto read = [&](MgErr err) { return err ? "error " + std::to_string(err) : TextOf(name); };
-    EXPECT_EQ("dir", read(FNamePtr(&abs_, name)));
-    EXPECT_EQ("", read(FPathComponent(&rel_, 0, name)));
-    EXPECT_EQ(name, PathCopyElt(&abs_, -2, name));
-    EXPECT_EQ("C", TextOf(name));
-    EXPECT_EQ(nullptr, PathCopyElt(&abs_, -3, name));
-    EXPECT_EQ(0, name[0]);
-    EXPECT_EQ(nullptr, PathCopyName(&none_, name));
+    EXPECT_EACH(read(FNamePtr(&abs_, name)) == "dir", read(FPathComponent(&rel_, 0, name)) == "",
+                name == PathCopyElt(&abs_, -2, name), TextOf(name) == "C", PathCopyElt(&abs_, -3, name) == nullptr,
+                name[0] == 0, PathCopyName(&none_, name) == nullptr);
     PathRef tooLong = Rel({std::string(256, 'x').c_str()});
     EXPECT_EQ(kArgErr, FNamePtr(&tooLong, name));
     UHandle handle = DSNewHandle(0);
-    EXPECT_EQ(kNoErr, FName(&abs_, handle));
-    EXPECT_EQ(4u, DSGetHandleSize(handle));
-    EXPECT_EQ("dir", TextOf(*handle));
+    EXPECT_EACH(FName(&abs_, handle) == kNoErr, DSGetHandleSize(handle) == 4u, TextOf(*handle) == "dir");
     DSDisposeHandle(handle);
-    EXPECT_EQ(kNoErr, PathReplaceElt(&abs_, PStrOf("D"), 0));
-    EXPECT_EQ("abs:D/dir", Show(&abs_));
+    EXPECT_EACH(PathReplaceElt(&abs_, PStrOf("D"), 0) == kNoErr, Show(&abs_) == "abs:D/dir");
     for (auto [file, extension] : {std::pair{"a.tar.gz", ".gz"}, {"noext", ""}, {".profile", ""}, {"x.", "."}}) {
         char out[16] = "#";
         FGetFileExtension(file, out);
@@ -98,20 +77,16 @@ TEST_F(PathManagerFlat, NamesAreCopiedWhole) {
 }
 
 TEST_F(PathManagerFlat, Types) {
-    EXPECT_EQ("rel:C/dir", Show(FSetPathType(&abs_, kPathRelative), abs_));
-    EXPECT_EQ("unc:C/dir", Show(FSetPathType(&abs_, kPathUNC), abs_));
-    EXPECT_EQ(kArgErr, FSetPathType(&abs_, kPathNotAPath));
-    EXPECT_EQ(kArgErr, FSetPathType(&abs_, 4));
-    EXPECT_EQ(kArgErr, FSetPathType(&none_, kPathAbsolute));
+    EXPECT_EACH(Show(FSetPathType(&abs_, kPathRelative), abs_) == "rel:C/dir",
+                Show(FSetPathType(&abs_, kPathUNC), abs_) == "unc:C/dir", FSetPathType(&abs_, kPathNotAPath) == kArgErr,
+                FSetPathType(&abs_, 4) == kArgErr, FSetPathType(&none_, kPathAbsolute) == kArgErr);
     PathRef slashes = Abs({"\\\\srv\\share", "x"});
-    EXPECT_EQ("unc:\\\\srv\\share/x", Show(FNormalizePath(&slashes), slashes));
-    EXPECT_EQ(kArgErr, FNormalizePath(nullptr));
-    EXPECT_EQ(0u, reports_.Count());
+    EXPECT_EACH(Show(FNormalizePath(&slashes), slashes) == "unc:\\\\srv\\share/x", FNormalizePath(nullptr) == kArgErr,
+                reports_.Count() == 0u);
 }
 
 TEST_F(PathManagerFlat, Comparing) {
-    PathRef ab = Abs({"a", "b"}), AB = Abs({"A", "B"}), ac = Abs({"a", "c"}), xb = Abs({"x", "q", "b"});
-    PathRef bare = Abs({});
+    PathRef ab = Abs({"a", "b"}), AB = Abs({"A", "B"}), ac = Abs({"a", "c"}), xb = Abs({"x", "q", "b"}), bare = Abs({});
     const struct {
         Path a, b;
         std::vector<int32> equalExactLexicalCmpTail;
@@ -124,11 +99,9 @@ TEST_F(PathManagerFlat, Comparing) {
         EXPECT_EQ(expected, (std::vector<int32>{FPathEqual(a, b), FPathCmpExact(a, b), FPathCmpLexical(a, b),
                                                 FPathCmp(a, b), FPathMatchingTailCount(a, b)}))
             << Show(a) << " " << Show(b);
-    EXPECT_TRUE(FileNameEqual(PStrOf("Name"), PStrOf("nAME")));
-    EXPECT_FALSE(FileNameEqual(PStrOf("Name"), PStrOf("Names")));
-    EXPECT_TRUE(FileNameNEqual(PStrOf("Name1"), PStrOf("nAME2"), 4));
-    EXPECT_FALSE(FileNameNEqual(PStrOf("Na"), PStrOf("nAME2"), 4));
-    EXPECT_TRUE(FileNameCStrEqual("Name", "nAME"));
+    EXPECT_EACH(FileNameEqual(PStrOf("Name"), PStrOf("nAME")), !FileNameEqual(PStrOf("Name"), PStrOf("Names")),
+                FileNameNEqual(PStrOf("Name1"), PStrOf("nAME2"), 4), !FileNameNEqual(PStrOf("Na"), PStrOf("nAME2"), 4),
+                FileNameCStrEqual("Name", "nAME"));
 }
 
 TEST_F(PathManagerFlat, Combining) {
@@ -146,14 +119,11 @@ TEST_F(PathManagerFlat, Combining) {
         PathRef base(row.base), rel(row.rel), result;
         EXPECT_EQ(row.result, Show(FAddPath(&base, &rel, &result), result)) << Show(base) << Show(rel);
     }
-    EXPECT_EQ(kArgErr, FAddPath(&abs_, &rel_, nullptr));
-    EXPECT_EQ("abs:C/x", Show(FAddPath(&abs_, &rel_, &abs_), abs_));
+    EXPECT_EACH(FAddPath(&abs_, &rel_, nullptr) == kArgErr, Show(FAddPath(&abs_, &rel_, &abs_), abs_) == "abs:C/x");
     PathRef other = Abs({"c", "y"}), result, unc = Unc({"s"}), otherUnc = Unc({"t"});
-    EXPECT_EQ("rel:^/y", Show(FRelPath(&abs_, &other, &result), result));
-    EXPECT_EQ("abs:C", Show(FVolName(&abs_, &result), result));
-    EXPECT_EQ("abs:C", Show(FCommonPath(&abs_, &other), abs_));
-    EXPECT_EQ("abs:", Show(FCommonPath(&unc, &otherUnc), unc));
-    EXPECT_EQ(kArgErr, FCommonPath(nullptr, &unc));
+    EXPECT_EACH(Show(FRelPath(&abs_, &other, &result), result) == "rel:^/y",
+                Show(FVolName(&abs_, &result), result) == "abs:C", Show(FCommonPath(&abs_, &other), abs_) == "abs:C",
+                Show(FCommonPath(&unc, &otherUnc), unc) == "abs:", FCommonPath(nullptr, &unc) == kArgErr);
 }
 
 TEST_F(PathManagerFlat, TheTextsOfTheHostAreTwoPairs) {
@@ -161,8 +131,7 @@ TEST_F(PathManagerFlat, TheTextsOfTheHostAreTwoPairs) {
     FSetPathTooLongString(PStrOf("flat"));
     Str255 text;
     FGetPathTooLongString(text);
-    EXPECT_EQ("flat", TextOf(text));
-    EXPECT_EQ("class", PathRef::GetPathTooLongString());
+    EXPECT_EACH(TextOf(text) == "flat", PathRef::GetPathTooLongString() == "class");
     FGetNotAPathString(text);
     EXPECT_EQ("", TextOf(text));
     FSetPathTooLongString(PStrOf(""));
@@ -170,4 +139,4 @@ TEST_F(PathManagerFlat, TheTextsOfTheHostAreTwoPairs) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

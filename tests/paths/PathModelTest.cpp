@@ -2,68 +2,52 @@
 #include "paths/PathLock.h"
 #include "paths/PathRefAccess.h"
 #include "paths/PathTestSupport.h"
+#include "support/Test.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathCachedItem.h>
 
-#include <thread>
-
-namespace tessel {
+namespace tessel::test {
 namespace {
 
-using namespace test;
 using PathModel = PathTest;
 using Item = PathRef::CachedItem;
 
 TEST_F(PathModel, AppendingStepsUpWhereItCan) {
-    const struct {
-        PathRef path;
-        const char* shown;
-    } rows[] = {{Rel({"a", "..", "b"}), "rel:b"},
-                {Rel({".."}), "rel:^"},
-                {Rel({"..", "..", "a"}), "rel:^/^/a"},
-                {Rel({"..", "..", "a", ""}), "rel:^/^"},
-                {Rel({"a", ".", "b", ""}), "rel:a"},
-                {Abs({"C", ".."}), "abs:"},
-                {Abs({"C", "x"}).Append(Rel({"..", "..", "D"})), "abs:D"},
-                {Rel({"a"}).Append(Rel({"..", "..", "b"})), "rel:^/b"}};
-    for (const auto& row : rows) EXPECT_EQ(row.shown, Show(row.path));
-    EXPECT_EQ(2, Rel({"..", "..", "a"}).CountUpDir());
-    EXPECT_EQ(kArgErr, CodeOf([] { PathRef(PathRef::kNullPath).Append("a"); }));
-    EXPECT_EQ(kArgErr, CodeOf([] { PathRef().Append(".."); }));
-    EXPECT_EQ(kArgErr, CodeOf([] { Abs({"C"}).Append(Abs({"C"})); }));
-    EXPECT_EQ(kArgErr, CodeOf([] { Abs({"C"}).Append(PathRef()); }));
+    EXPECT_EACH(Show(Rel({"a", "..", "b"})) == "rel:b", Show(Rel({".."})) == "rel:^",
+                Show(Rel({"..", "..", "a"})) == "rel:^/^/a", Show(Rel({"..", "..", "a", ""})) == "rel:^/^",
+                Show(Rel({"a", ".", "b", ""})) == "rel:a",
+                Show(Abs({"C", ".."})) == "abs:", Show(Abs({"C", "x"}).Append(Rel({"..", "..", "D"}))) == "abs:D",
+                Show(Rel({"a"}).Append(Rel({"..", "..", "b"}))) == "rel:^/b");
+    EXPECT_EACH(
+        Rel({"..", "..", "a"}).CountUpDir() == 2, CodeOf([] { PathRef(PathRef::kNullPath).Append("a"); }) == kArgErr,
+        CodeOf([] { PathRef().Append(".."); }) == kArgErr, CodeOf([] { Abs({"C"}).Append(Abs({"C"})); }) == kArgErr,
+        CodeOf([] { Abs({"C"}).Append(PathRef()); }) == kArgErr);
 }
 
 TEST_F(PathModel, TheSameNamesAreTheSameElement) {
-    const PathRef a = Abs({"C", "dir", "file"});
-    const PathRef b = Abs({"C", "dir", "file"});
-    const PathRef otherCase = Abs({"C", "Dir", "file"});
-    EXPECT_EQ(PathRefAccess::Element(a), PathRefAccess::Element(b));
-    EXPECT_NE(PathRefAccess::Element(a), PathRefAccess::Element(otherCase));
-    EXPECT_TRUE(a.Equals(otherCase, PathRef::kIgnoreCase));
-    EXPECT_FALSE(a.Equals(otherCase, PathRef::kExact));
-    EXPECT_FALSE(a.Equals(Rel({"C", "dir", "file"}), PathRef::kExact));
+    const PathRef a = Abs({"C", "dir", "file"}), b = Abs({"C", "dir", "file"}), otherCase = Abs({"C", "Dir", "file"});
+    EXPECT_EACH(PathRefAccess::Element(a) == PathRefAccess::Element(b),
+                PathRefAccess::Element(a) != PathRefAccess::Element(otherCase),
+                a.Equals(otherCase, PathRef::kIgnoreCase), !a.Equals(otherCase, PathRef::kExact),
+                !a.Equals(Rel({"C", "dir", "file"}), PathRef::kExact));
     // "ab" and "bR" have the same hash.
     EXPECT_NE(PathRefAccess::Element(Rel({"ab"})), PathRefAccess::Element(Rel({"bR"})));
     const PathRef first = Rel({"ab"}), second = Rel({"bR"});
-    EXPECT_EQ("rel:ab", Show(first));
-    EXPECT_EQ("rel:bR", Show(second));
-    EXPECT_EQ(PathRefAccess::Element(second), PathRefAccess::Element(Rel({"bR"})));
+    EXPECT_EACH(Show(first) == "rel:ab", Show(second) == "rel:bR",
+                PathRefAccess::Element(second) == PathRefAccess::Element(Rel({"bR"})));
 }
 
 TEST_F(PathModel, NamesByIndex) {
     PathRef path = Abs({"C", "dir", "file"});
     EXPECT_EQ((std::vector<std::string>{"C", "file", "C", "file"}),
               (std::vector<std::string>{path.ItemAt(0), path.ItemAt(-1), path.ItemAt(-3), path.Name()}));
-    for (int32 bad : {3, -4, INT32_MAX, INT32_MIN}) {
-        EXPECT_EQ(kArgErr, CodeOf([&] { path.ItemAt(bad); }));
-        EXPECT_EQ(kArgErr, CodeOf([&] { path.Replace(bad, "x"); }));
-    }
+    for (int32 bad : {3, -4, INT32_MAX, INT32_MIN})
+        EXPECT_EACH(CodeOf([&] { path.ItemAt(bad); }) == kArgErr, CodeOf([&] { path.Replace(bad, "x"); }) == kArgErr);
     path.Replace(-2, "other");
     EXPECT_EQ("abs:C/other/file", Show(path));
     path.Replace(0, "D");
-    EXPECT_EQ("abs:D/other/file", Show(path));
-    EXPECT_EQ(kArgErr, CodeOf([&] { path.Replace(0, static_cast<const char*>(nullptr)); }));
+    EXPECT_EACH(Show(path) == "abs:D/other/file",
+                CodeOf([&] { path.Replace(0, static_cast<const char*>(nullptr)); }) == kArgErr);
     const PathRef& same = path;
     path = same;
     EXPECT_EQ("abs:D/other/file", Show(path));
@@ -71,63 +55,46 @@ TEST_F(PathModel, NamesByIndex) {
 
 TEST_F(PathModel, Comparison) {
     const PathRef notAPath;
-    const struct {
-        PathRef a, b;
-        int32 exact, ignoringCase;
-    } rows[] = {
-        {Abs({"a"}), Abs({"a"}), 0, 0},
-        {Abs({"a", "c", "x"}), Abs({"a", "b"}), 2, 2},
-        {Abs({"a"}), Abs({"a", "b"}), -2, -2},
-        {Abs({"a", "b"}), Abs({"a"}), 2, 2},
-        {Unc({"s"}), Abs({"s"}), -1, -1},
-        {Rel({"s"}), Abs({"s"}), 1, -1},
-        {PathRef(PathRef::kNullPath), Rel({}), 1, -1},
-        {notAPath, Abs({}), 1, 1},
-        {Abs({}), notAPath, -1, -1},
-        {notAPath, notAPath, 0, 0},
+    const auto compared = [](const PathRef& a, const PathRef& b) {
+        return std::pair(a.Compare(b, PathRef::kExact), a.Compare(b, PathRef::kIgnoreCase));
     };
-    for (const auto& row : rows) {
-        EXPECT_EQ(row.exact, row.a.Compare(row.b, PathRef::kExact)) << Show(row.a) << " " << Show(row.b);
-        EXPECT_EQ(row.ignoringCase, row.a.Compare(row.b, PathRef::kIgnoreCase)) << Show(row.a) << " " << Show(row.b);
-    }
-    EXPECT_EQ(1, Rel({}).Compare(Unc({"s"}), PathRef::kIgnoreCase3));
-    EXPECT_TRUE(PathRef::NameEquals("a", "A", static_cast<PathRef::ComparePolicy>(9)));
-    EXPECT_TRUE(reports_.Has(2, "Unexpected PathRef::ComparePolicy"));
-    EXPECT_EQ(-1, PathRef::NameCompare("B", "a", PathRef::kExact));
-    EXPECT_EQ(1, PathRef::NameCompare("B", "a", PathRef::kIgnoreCase));
+    const auto both = [](int32 exact, int32 ignoringCase) { return std::pair(exact, ignoringCase); };
+    EXPECT_EACH(
+        compared(Abs({"a"}), Abs({"a"})) == both(0, 0), compared(Abs({"a", "c", "x"}), Abs({"a", "b"})) == both(2, 2),
+        compared(Abs({"a"}), Abs({"a", "b"})) == both(-2, -2), compared(Abs({"a", "b"}), Abs({"a"})) == both(2, 2),
+        compared(Unc({"s"}), Abs({"s"})) == both(-1, -1), compared(Rel({"s"}), Abs({"s"})) == both(1, -1),
+        compared(PathRef(PathRef::kNullPath), Rel({})) == both(1, -1), compared(notAPath, Abs({})) == both(1, 1),
+        compared(Abs({}), notAPath) == both(-1, -1), compared(notAPath, notAPath) == both(0, 0));
+    EXPECT_EACH(Rel({}).Compare(Unc({"s"}), PathRef::kIgnoreCase3) == 1,
+                PathRef::NameEquals("a", "A", static_cast<PathRef::ComparePolicy>(9)),
+                reports_.Has(2, "Unexpected PathRef::ComparePolicy"),
+                PathRef::NameCompare("B", "a", PathRef::kExact) == -1,
+                PathRef::NameCompare("B", "a", PathRef::kIgnoreCase) == 1);
 }
 
 TEST_F(PathModel, Relations) {
     const PathRef abc = Abs({"a", "b", "c"});
-    EXPECT_EQ("rel:^/^/d", Show(abc.GetRelativePathFromThisToThat(Abs({"A", "d"}), PathRef::kIgnoreCase)));
-    EXPECT_EQ("rel:", Show(abc.GetRelativePathFromThisToThat(abc, PathRef::kExact)));
-    EXPECT_EQ("not", Show(abc.GetRelativePathFromThisToThat(Rel({"a"}), PathRef::kExact)));
-    EXPECT_EQ(kArgErr, CodeOf([&] { abc.GetRelativePathFromThisToThat(PathRef(), PathRef::kExact); }));
-    EXPECT_EQ("abs:a", Show(abc.GetInCommonWith(Abs({"a", "B", "c"}), PathRef::kExact)));
-    EXPECT_EQ("abs:a/b/c", Show(abc.GetInCommonWith(Abs({"a", "B", "c", "d"}), PathRef::kIgnoreCase)));
-    EXPECT_EQ("not", Show(abc.GetInCommonWith(Rel({"a"}), PathRef::kExact)));
-    EXPECT_EQ("abs:a/b", Show(abc.GetParentDirectory()));
-    EXPECT_EQ("not", Show(Abs({}).GetParentDirectory()));
-    EXPECT_EQ("rel:^", Show(Rel({"..", ".."}).GetParentDirectory()));
-    EXPECT_EQ("abs:a", Show(abc.Volume()));
-    EXPECT_EQ(kArgErr, CodeOf([] { Abs({}).Volume(); }));
-    EXPECT_TRUE(abc.StartsWith(Abs({"A"}), PathRef::kIgnoreCase));
-    EXPECT_FALSE(abc.StartsWith(Abs({"A"}), PathRef::kExact));
-    EXPECT_FALSE(abc.StartsWith(Rel({"a"}), PathRef::kExact));
-    EXPECT_TRUE(Abs({"a"}).IsParentDirectoryOf(abc, PathRef::kExact));
-    EXPECT_FALSE(abc.IsParentDirectoryOf(abc, PathRef::kExact));
+    EXPECT_EACH(Show(abc.GetRelativePathFromThisToThat(Abs({"A", "d"}), PathRef::kIgnoreCase)) == "rel:^/^/d",
+                Show(abc.GetRelativePathFromThisToThat(abc, PathRef::kExact)) == "rel:",
+                Show(abc.GetRelativePathFromThisToThat(Rel({"a"}), PathRef::kExact)) == "not",
+                CodeOf([&] { abc.GetRelativePathFromThisToThat(PathRef(), PathRef::kExact); }) == kArgErr,
+                Show(abc.GetInCommonWith(Abs({"a", "B", "c"}), PathRef::kExact)) == "abs:a",
+                Show(abc.GetInCommonWith(Abs({"a", "B", "c", "d"}), PathRef::kIgnoreCase)) == "abs:a/b/c",
+                Show(abc.GetInCommonWith(Rel({"a"}), PathRef::kExact)) == "not",
+                Show(abc.GetParentDirectory()) == "abs:a/b", Show(Abs({}).GetParentDirectory()) == "not",
+                Show(Rel({"..", ".."}).GetParentDirectory()) == "rel:^", Show(abc.Volume()) == "abs:a",
+                CodeOf([] { Abs({}).Volume(); }) == kArgErr, abc.StartsWith(Abs({"A"}), PathRef::kIgnoreCase),
+                !abc.StartsWith(Abs({"A"}), PathRef::kExact), !abc.StartsWith(Rel({"a"}), PathRef::kExact),
+                Abs({"a"}).IsParentDirectoryOf(abc, PathRef::kExact), !abc.IsParentDirectoryOf(abc, PathRef::kExact));
 }
 
 TEST_F(PathModel, Rebase) {
     PathRef path = Abs({"a", "b", "c"});
-    EXPECT_FALSE(path.Rebase(Abs({"b"}), Unc({"s"}), PathRef::kExact));
-    EXPECT_FALSE(path.Rebase(Abs({}), Unc({"s"}), PathRef::kExact));
-    EXPECT_EQ("abs:a/b/c", Show(path));
-    EXPECT_TRUE(path.Rebase(Abs({"A"}), Unc({"s", "t"}), PathRef::kIgnoreCase));
-    EXPECT_EQ("unc:s/t/b/c", Show(path));
+    EXPECT_EACH(!path.Rebase(Abs({"b"}), Unc({"s"}), PathRef::kExact),
+                !path.Rebase(Abs({}), Unc({"s"}), PathRef::kExact), Show(path) == "abs:a/b/c",
+                path.Rebase(Abs({"A"}), Unc({"s", "t"}), PathRef::kIgnoreCase), Show(path) == "unc:s/t/b/c");
     path = Rel({"..", "..", "c"});  // what steps up behind a name removes it
-    EXPECT_TRUE(path.Rebase(Rel({".."}), Abs({"C", "x", "y"}), PathRef::kExact));
-    EXPECT_EQ("abs:C/x/c", Show(path));
+    EXPECT_EACH(path.Rebase(Rel({".."}), Abs({"C", "x", "y"}), PathRef::kExact), Show(path) == "abs:C/x/c");
     path = Rel({"..", "..", "c"});
     path.Replace(0, "x");
     EXPECT_EQ("rel:c", Show(path));
@@ -162,29 +129,24 @@ TEST_F(PathModel, Splitting) {
     for (const auto& row : rows) {
         const PathRef path = Abs({"a", "b", "c", "b"});
         PathRef head, tail;
-        EXPECT_EQ(row.split, path.SplitOn(AtName(row.name, row.action), &head, &tail, row.direction));
-        EXPECT_EQ(row.head, Show(head));
-        EXPECT_EQ(row.tail, Show(tail));
+        EXPECT_EACH(row.split == path.SplitOn(AtName(row.name, row.action), &head, &tail, row.direction),
+                    row.head == Show(head), row.tail == Show(tail));
     }
-    EXPECT_EQ(1u, reports_.Count());
-    EXPECT_TRUE(reports_.Has(2, "Illegal action"));
+    EXPECT_EACH(reports_.Count() == 1u, reports_.Has(2, "Illegal action"));
     PathRef path = Abs({"a", "b"});
-    EXPECT_TRUE(path.SplitOn(AtName("b", 3), nullptr, &path, PathRef::kFromFirst));
-    EXPECT_EQ("rel:b", Show(path));
+    EXPECT_EACH(path.SplitOn(AtName("b", 3), nullptr, &path, PathRef::kFromFirst), Show(path) == "rel:b");
 }
 
 TEST_F(PathModel, Extensions) {
     PathRef path = Abs({"C", "archive.tar.gz"});
-    EXPECT_EQ("gz", path.GetExtension());
-    EXPECT_EQ("gz", path.Extension());
+    EXPECT_EACH(path.GetExtension() == "gz", path.Extension() == "gz");
     path.RemoveExtension();
     EXPECT_EQ("abs:C/archive.tar", Show(path));
     path = Rel({"readme"});
     EXPECT_EQ("", path.GetExtension());
     path.RemoveExtension();
     path.AppendExtension("txt");
-    EXPECT_EQ("rel:readme.txt", Show(path));
-    EXPECT_EQ(kArgErr, CodeOf([] { Abs({}).GetExtension(); }));
+    EXPECT_EACH(Show(path) == "rel:readme.txt", CodeOf([] { Abs({}).GetExtension(); }) == kArgErr);
 
     const _FMFileType kText = TESSEL_FOURCC('T', 'E', 'X', 'T'), kData = TESSEL_FOURCC('D', 'A', 'T', 'A');
     const auto list = [](std::initializer_list<PathRef::ExtensionEntry> entries) {
@@ -195,48 +157,38 @@ TEST_F(PathModel, Extensions) {
         return (const PathRef::ExtensionList**)handle;
     };
     PathRef::SetExtensionList(list({{kText, "txt"}}), list({{kData, "dat"}, {kData, "txt"}}));
-    EXPECT_EQ(kText, PathRef::NameGetExtensionType("a.TXT"));
-    EXPECT_EQ(kData, PathRef::NameGetExtensionType("a.b.dat"));
-    EXPECT_EQ(0u, PathRef::NameGetExtensionType("dat"));
-    EXPECT_TRUE(PathRef::NameHasExtension("x.Dat", kData));
-    EXPECT_FALSE(PathRef::NameHasExtension("x.dat", kText));
+    EXPECT_EACH(PathRef::NameGetExtensionType("a.TXT") == kText, PathRef::NameGetExtensionType("a.b.dat") == kData,
+                PathRef::NameGetExtensionType("dat") == 0u, PathRef::NameHasExtension("x.Dat", kData),
+                !PathRef::NameHasExtension("x.dat", kText));
     path = Rel({"x"});
     path.AppendExtension(kData);
-    EXPECT_EQ("rel:x.dat", Show(path));
-    EXPECT_EQ(kArgErr, CodeOf([&] { path.AppendExtension(TESSEL_FOURCC('N', 'O', 'N', 'E')); }));
+    EXPECT_EACH(Show(path) == "rel:x.dat",
+                CodeOf([&] { path.AppendExtension(TESSEL_FOURCC('N', 'O', 'N', 'E')); }) == kArgErr);
     PathRef::SetExtensionList(list({}), nullptr);
-    EXPECT_TRUE(reports_.Has(2, "The extension lists should only be set once"));
-    EXPECT_EQ(0u, PathRef::NameGetExtensionType("a.txt"));
+    EXPECT_EACH(reports_.Has(2, "The extension lists should only be set once"),
+                PathRef::NameGetExtensionType("a.txt") == 0u);
 }
 
 TEST_F(PathModel, StandardLocations) {
     const PathRef temp = Abs({"C", "tmp"});
-    EXPECT_EQ(kNoErr, temp.AssignToName("os_temp"));
-    EXPECT_EQ(kArgErr, Abs({"D"}).AssignToName("os_temp"));
-    EXPECT_EQ("abs:C/tmp", Show(PathRef("os_temp")));
-    EXPECT_EQ(kArgErr, CodeOf([] { PathRef("os_nowhere"); }));
+    EXPECT_EACH(temp.AssignToName("os_temp") == kNoErr, Abs({"D"}).AssignToName("os_temp") == kArgErr,
+                Show(PathRef("os_temp")) == "abs:C/tmp", CodeOf([] { PathRef("os_nowhere"); }) == kArgErr);
 }
 
 TEST_F(PathModel, Sanity) {
     const PathRef path = Unc({"s", "x"});
-    EXPECT_TRUE(path.IsSane(false));
-    EXPECT_TRUE(PathRef().IsSane(false));
-    EXPECT_FALSE(Unc({}).IsValid());
-    EXPECT_FALSE(Unc({}).IsSane(false));
-    EXPECT_EQ((std::vector<std::string>{"PathRef is not valid"}), reports_.Texts());
+    EXPECT_EACH(path.IsSane(false), PathRef().IsSane(false), !Unc({}).IsValid(), !Unc({}).IsSane(false),
+                (std::vector<std::string>{"PathRef is not valid"}) == reports_.Texts());
     PathRef wild;
     alignas(PathItemElement) static char noElement[sizeof(PathItemElement)];
     auto* element = reinterpret_cast<PathItemElement*>(noElement);
     std::memcpy(static_cast<void*>(&wild), &element, sizeof element);
-    EXPECT_FALSE(wild.IsSane(true));
-    EXPECT_TRUE(reports_.Has(3, "mPathElement not in storage"));
+    EXPECT_EACH(!wild.IsSane(true), reports_.Has(3, "mPathElement not in storage"));
     std::memset(static_cast<void*>(&wild), 0, sizeof wild);
     PathRef deep = Rel({});
     while (deep.ItemCount() < 511) deep.Append("x");
-    EXPECT_TRUE(deep.IsSane(false));
-    EXPECT_EQ(0u, reports_.CountAt(2));
-    EXPECT_TRUE(deep.Append("x").IsSane(false));
-    EXPECT_EQ(2, reports_.Reports().back().level);
+    EXPECT_EACH(deep.IsSane(false), reports_.CountAt(2) == 0u, deep.Append("x").IsSane(false),
+                reports_.Reports().back().level == 2);
 }
 
 // Eight threads make, copy and drop the same few paths, and cache on one: an element is made once, and ends with its
@@ -275,4 +227,4 @@ TEST_F(PathModel, ThreadsShareElements) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,12 +1,11 @@
 // What the strings do with paths: "%z", and lists compared as file names.
 #include "paths/PathTestSupport.h"
+#include "support/Test.h"
 #include <tessel/strings/CPStrList.h>
 #include <tessel/strings/StringFmtPrint.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using namespace test;
 
 class PathPrinting : public PathTest {
 protected:
@@ -20,8 +19,7 @@ protected:
 
 TEST_F(PathPrinting, PrintsDisplayText) {
     const PathRef path = Abs({"C", "dir", "file.txt"});
-    EXPECT_EQ("[C:\\dir\\file.txt]", Printed(&path));
-    EXPECT_EQ("[NULL]", Printed(nullptr));
+    EXPECT_EACH(Printed(&path) == "[C:\\dir\\file.txt]", Printed(nullptr) == "[NULL]");
 
     const std::string name(248, 'n');
     const PathRef fits = Abs({"C", name.c_str(), "x"});  // C:\ name \x: 253 bytes are too long
@@ -33,18 +31,12 @@ TEST_F(PathPrinting, PrintsDisplayText) {
 }
 
 TEST_F(PathPrinting, ListsCompareAsFileNames) {
-    CPStrList a;
-    CPStrList b;
+    CPStrList a, b;
     for (const char* name : {"Dir", "FILE"}) EXPECT_EQ(kNoErr, a.Insert(PStrOf(name), -1));
     for (const char* name : {"dir", "file"}) EXPECT_EQ(kNoErr, b.Insert(PStrOf(name), -1));
-    EXPECT_TRUE(a.EqualFS(b));
-    EXPECT_FALSE(a.Equal(b));
-    EXPECT_EQ(kNoErr, b.Insert(PStrOf("more"), -1));
-    EXPECT_FALSE(a.EqualFS(b));
-    EXPECT_TRUE(a.EqualNEltsFS(b, 2));
-    EXPECT_FALSE(a.EqualNEltsFS(b, 3));
-    EXPECT_TRUE(a.EqualNEltsFS(CPStrList(), 0));
+    EXPECT_EACH(a.EqualFS(b), !a.Equal(b), b.Insert(PStrOf("more"), -1) == kNoErr, !a.EqualFS(b), a.EqualNEltsFS(b, 2),
+                !a.EqualNEltsFS(b, 3), a.EqualNEltsFS(CPStrList(), 0));
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

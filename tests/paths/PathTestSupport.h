@@ -1,6 +1,5 @@
 // Paths from names, and names from paths, for the tests.
-#ifndef TESSEL_TESTS_PATHS_PATHTESTSUPPORT_H
-#define TESSEL_TESTS_PATHS_PATHTESTSUPPORT_H
+#pragma once
 
 #include "support/ReportRecorder.h"
 #include "support/StartedPaths.h"
@@ -85,4 +84,3 @@ protected:
 
 }  // namespace tessel::test
 
-#endif

@@ -1,14 +1,16 @@
 // Paths as text, text as paths, and names for the system.
 #include "paths/PathTestSupport.h"
 #include "platform/CodePage.h"
+#include "support/Test.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/paths/PathAbbreviation.h>
 #include <tessel/paths/PathTextFormat.h>
 
-namespace tessel {
-namespace {
+#include <fstream>
+#include <sstream>
 
-using namespace test;
+namespace tessel::test {
+namespace {
 
 class PathText : public PathTest {
 protected:
@@ -38,72 +40,37 @@ TEST_F(PathText, Written) {
                 {Unc({"\\\\srv\\share", "x"}), "\\\\srv\\share\\x", "\\\\srv\\share/x", "//srv/share/x"}};
     for (const auto& row : rows) {
         for (int again = 0; again < 2; ++again) {  // the second time from the cache
-            EXPECT_EQ(row.display, Written(row.path, PathRef::StringDisplay()));
-            EXPECT_EQ(row.display, Written(row.path, PathRef::StringDOS()));
-            EXPECT_EQ(row.unixText, Written(row.path, PathRef::StringUnix()));
-            EXPECT_EQ(row.independent, Written(row.path, PathRef::StringPlatformIndependent()));
-            EXPECT_EQ(row.independent, Written(row.path, "pathref_platformagnostic"));
+            EXPECT_EACH(row.display == Written(row.path, PathRef::StringDisplay()),
+                        row.display == Written(row.path, PathRef::StringDOS()),
+                        row.unixText == Written(row.path, PathRef::StringUnix()),
+                        row.independent == Written(row.path, PathRef::StringPlatformIndependent()),
+                        row.independent == Written(row.path, "pathref_platformagnostic"));
         }
         PathRef copy(row.path);
         EXPECT_EQ(row.display, copy.ToString("pathref_display"));
     }
-    EXPECT_EQ("C:\\x", Written(Abs({"C", "x"}), PathRef::StringCommandLine()));
-    EXPECT_EQ("1", Written(Abs({}), PathRef::StringCommandLine()));
-    EXPECT_EQ("53", Written(Abs({}), "pathref_Display"));
+    EXPECT_EACH(Written(Abs({"C", "x"}), PathRef::StringCommandLine()) == "C:\\x",
+                Written(Abs({}), PathRef::StringCommandLine()) == "1", Written(Abs({}), "pathref_Display") == "53");
     PathRef::SetNotAPathString("<none>");
     EXPECT_EQ("<none>", Written(PathRef(), PathRef::StringUnix()));
     std::string text;
-    EXPECT_EQ(kArgErr, PathRef(PathRef::kNullPath).ConvertToString(&text, PathRef::StringUnix()));
-    EXPECT_EQ("<none>", text);
+    EXPECT_EACH(PathRef(PathRef::kNullPath).ConvertToString(&text, PathRef::StringUnix()) == kArgErr, text == "<none>");
     PathRef::SetNotAPathString("");
 }
 
 TEST_F(PathText, Read) {
-    const struct {
-        const char *format, *text, *shown;
-    } rows[] = {{"display", "C:\\", "abs:C"},
-                {"display", "C:\\dir\\..\\file", "abs:C/file"},
-                {"display", "C:dir", "abs:C/dir"},
-                {"display", "C::dir\\x", "abs:C/dir/x"},
-                {"display", "name:", "abs:name"},
-                {"display", "Disk:a:b", "abs:Disk/a:b"},
-                {"display", "\\dir\\\\x\\", "abs:C/dir/x"},
-                {"display", "\\", "abs:C"},
-                {"display", "\\a:b", "abs:C/a:b"},
-                {"display", ":a", "1"},
-                {"display", "", "abs:"},
-                {"display", ".", "rel:"},
-                {"display", "a\\.\\b\\", "rel:a/b"},
-                {"display", "..\\..\\a", "rel:^/^/a"},
-                {"display", "a\\b:c", "rel:a/b:c"},
-                {"display", "\\\\srv\\share\\x", "unc:\\\\srv\\share/x"},
-                {"display", "\\\\srv\\share", "unc:\\\\srv\\share"},
-                {"display", "\\\\srv", "unc:\\\\srv\\"},
-                {"display", "\\\\srv\\share\\..", "1"},
-                {"unix", "/usr//lib/./../bin", "abs:usr/bin"},
-                {"unix", "../a", "rel:^/a"},
-                {"unix", "//srv/share/x", "abs:srv/share/x"},
-                {"unix", "", "abs:"},
-                {"platformindependent", "/", "rel:"},
-                {"platformindependent", "", "abs:"},
-                {"platformindependent", "/C/x", "abs:C/x"},
-                {"platformindependent", "//srv/share/x", "unc:\\\\srv\\share/x"},
-                {"platformindependent", "//s/x", "unc:\\\\s\\x"},
-                {"platformindependent", "//s/", "abs:s"},
-                {"platformindependent", "//srv", "abs:srv"},
-                {"platformindependent", "//srv/", "unc:\\\\srv\\"},
-                {"platformagnostic", "/usr/bin", "abs:usr/bin"},
-                {"platformagnostic", "C:\\x", "abs:C/x"},
-                {"platformagnostic", "Disk:folder:file", "abs:Disk/folder/file"},
-                {"platformagnostic", ":folder:file", "rel:folder/file"},
-                {"platformagnostic", "Disk:a:b::c:d", "abs:Disk/a/c/d"},
-                {"platformagnostic", "a\\b", "rel:a/b"},
-                {"platformagnostic", "name", "rel:name"},
-                {"nothing", "a", "53"}};
-    for (const auto& [format, text, shown] : rows)
-        EXPECT_EQ(shown, Read(text, ("pathref_" + std::string(format)).c_str())) << format << " " << text;
-    EXPECT_EQ(1, PathRef("a/b", PathRef::StringDisplay()).ItemCount());
-    EXPECT_EQ(2, PathRef("a/b", PathRef::StringPlatformAgnostic()).ItemCount());
+    std::ifstream file("data/path_texts.txt");
+    int rows = 0;
+    for (std::string line, format, text, shown; std::getline(file, line);) {
+        std::istringstream fields(line);
+        if (line[0] == '#') continue;
+        for (std::string* field : {&format, &text, &shown}) std::getline(fields, *field, '|');
+        EXPECT_EQ(shown, Read(text, ("pathref_" + format).c_str())) << format << " " << text;
+        ++rows;
+    }
+    EXPECT_EQ(39, rows);
+    EXPECT_EACH(PathRef("a/b", PathRef::StringDisplay()).ItemCount() == 1,
+                PathRef("a/b", PathRef::StringPlatformAgnostic()).ItemCount() == 2);
     const auto detail = [](const char* text, const char* format) {
         try {
             return Show(PathRef(text, format));
@@ -111,8 +78,8 @@ TEST_F(PathText, Read) {
             return std::string(e.Detail());
         }
     };
-    EXPECT_EQ("Empty command line strings cannot be converted to Path", detail("", PathRef::StringCommandLine()));
-    EXPECT_EQ("PathRef from string constructor: unknown format \"C:\\x\"", detail("pathref_unix", "C:\\x"));
+    EXPECT_EACH(detail("", PathRef::StringCommandLine()) == "Empty command line strings cannot be converted to Path",
+                detail("pathref_unix", "C:\\x") == "PathRef from string constructor: unknown format \"C:\\x\"");
 }
 
 // 0x5C is the second byte of many characters in the Japanese code page, and a backslash alone.
@@ -125,17 +92,15 @@ TEST_F(PathText, CharactersWithABackslashByte) {
               Written(Unc({("\\\\" + hyou + "\\s").c_str()}), PathRef::StringPlatformIndependent()));
     PathRef path = Abs({"C", hyou.c_str(), "x"});
     char name[kMaxDOSPathName];
-    EXPECT_EQ(kNoErr, MakeDOSPathName(&path, name, 1));
-    EXPECT_EQ("C:\\" + hyou + "\\x", name);
+    EXPECT_EACH(MakeDOSPathName(&path, name, 1) == kNoErr, "C:\\" + hyou + "\\x" == name);
     LStrHandle text = nullptr;
-    EXPECT_EQ(kNoErr, FPathToStringRTF(&path, &text));
-    EXPECT_EQ("C:\\\\" + hyou + "\\\\x",
-              std::string(reinterpret_cast<char*>((*text)->bytes), static_cast<size_t>((*text)->count)));
+    EXPECT_EACH(FPathToStringRTF(&path, &text) == kNoErr,
+                "C:\\\\" + hyou + "\\\\x" ==
+                    std::string(reinterpret_cast<char*>((*text)->bytes), static_cast<size_t>((*text)->count)));
     DSDisposeHandle(reinterpret_cast<UHandle>(text));
-    EXPECT_TRUE(PathRef::NameWildCardMatch(hyou + ".txt", "?.txt"));
-    EXPECT_TRUE(PathRef::NameWildCardMatch(hyou + ".txt", "*.txt"));
-    EXPECT_TRUE(PathRef::CharCountMeasurementStyle(1).StringIsTooLong(hyou + hyou));
-    EXPECT_FALSE(PathRef::CharCountMeasurementStyle(2).StringIsTooLong(hyou + hyou));
+    EXPECT_EACH(PathRef::NameWildCardMatch(hyou + ".txt", "?.txt"), PathRef::NameWildCardMatch(hyou + ".txt", "*.txt"),
+                PathRef::CharCountMeasurementStyle(1).StringIsTooLong(hyou + hyou),
+                !PathRef::CharCountMeasurementStyle(2).StringIsTooLong(hyou + hyou));
 }
 
 TEST_F(PathText, FlatReading) {
@@ -143,21 +108,17 @@ TEST_F(PathText, FlatReading) {
     const auto read = [&](MgErr err) { return Show(err, *path); };
     EXPECT_EQ("abs:C/ab", read(FTextToPath("C:\\ab!!", 5, &path)));
     const Path same = path;
-    EXPECT_EQ("rel:x", read(FFileSystemCStrToPath("x", &path)));
-    EXPECT_EQ(same, path);
-    EXPECT_EQ(kArgErr, FTextToPath("\\\\s\\t\\..", 8, &path));
-    EXPECT_EQ("rel:x", Show(path));
-    EXPECT_EQ("abs:", read(FTextToPath(nullptr, 5, &path)));
-    EXPECT_EQ(kArgErr, FTextToPath("a", 1, nullptr));
-    EXPECT_EQ(kArgErr, FTextToPath("a", -1, &path));
-    EXPECT_EQ("abs:C/y", read(ConvertPlatformIndependentTextToPath(&path, "/C/y")));
-    EXPECT_EQ("abs:", read(FStringToPath(nullptr, &path)));
-    EXPECT_EQ(0u, reports_.Count());
-    EXPECT_EQ(kArgErr, FFileSystemCStrToPath(nullptr, &path));
-    EXPECT_EQ("abs:", read(ConvertPlatformIndependentTextToPath(&path, nullptr)));
-    EXPECT_EQ((std::vector<std::string>{"FFileSystemCStrToPath: don't pass NULL for text",
-                                        "ConvertPlatformIndependentTextToPathNew: NULL text passed in"}),
-              reports_.Texts(2));
+    EXPECT_EACH(read(FFileSystemCStrToPath("x", &path)) == "rel:x", same == path,
+                FTextToPath("\\\\s\\t\\..", 8, &path) == kArgErr, Show(path) == "rel:x",
+                read(FTextToPath(nullptr, 5, &path)) == "abs:", FTextToPath("a", 1, nullptr) == kArgErr,
+                FTextToPath("a", -1, &path) == kArgErr,
+                read(ConvertPlatformIndependentTextToPath(&path, "/C/y")) == "abs:C/y",
+                read(FStringToPath(nullptr, &path)) == "abs:", reports_.Count() == 0u,
+                FFileSystemCStrToPath(nullptr, &path) == kArgErr,
+                read(ConvertPlatformIndependentTextToPath(&path, nullptr)) == "abs:",
+                (std::vector<std::string>{"FFileSystemCStrToPath: don't pass NULL for text",
+                                          "ConvertPlatformIndependentTextToPathNew: NULL text passed in"}) ==
+                    reports_.Texts(2));
     FDestroyPath(&path);
 }
 
@@ -170,27 +131,22 @@ TEST_F(PathText, FlatWriting) {
         EXPECT_LE(LStrSize((*text)->count), size);
         return std::string(reinterpret_cast<char*>((*text)->bytes), size - LStrSize(0));
     };
-    EXPECT_EQ(std::string("C:\\dir\0", 7), bytes(FPathToDSString(&path, &text)));
-    EXPECT_EQ(6, (*text)->count);
-    EXPECT_EQ(std::string("/C/dir\0", 7), bytes(FPathToUnixString(&path, &text)));
-    EXPECT_EQ("/C/dir", bytes(ConvertPathToPlatformIndependentText(&path, &text)));
-    EXPECT_EQ("C:\\\\dir", bytes(FPathToStringRTF(&path, &text)));
-    EXPECT_EQ(std::string("\0", 1), bytes(FPathToAZString(nullptr, &text)));
-    EXPECT_EQ(kArgErr, FPathToFileSystemDSString(nullptr, &text));
-    EXPECT_EQ(kNotFoundErr, FPathToURL(&path, &text));
+    EXPECT_EACH(bytes(FPathToDSString(&path, &text)) == std::string("C:\\dir\0", 7), (*text)->count == 6,
+                bytes(FPathToUnixString(&path, &text)) == std::string("/C/dir\0", 7),
+                bytes(ConvertPathToPlatformIndependentText(&path, &text)) == "/C/dir",
+                bytes(FPathToStringRTF(&path, &text)) == "C:\\\\dir",
+                bytes(FPathToAZString(nullptr, &text)) == std::string("\0", 1),
+                FPathToFileSystemDSString(nullptr, &text) == kArgErr, FPathToURL(&path, &text) == kNotFoundErr);
     DSDisposeHandle(reinterpret_cast<UHandle>(text));
 
     alignas(LStr) char room[16];
     LStrPtr counted = reinterpret_cast<LStrPtr>(room);
     counted->count = -1;
-    EXPECT_EQ(kNoErr, FPathToText(&path, counted));
-    EXPECT_EQ(6, counted->count);
-    EXPECT_EQ(kNoErr, FPathToText(&path, counted));
-    EXPECT_EQ(0, std::memcmp(counted->bytes, "C:\\dir", 6));
+    EXPECT_EACH(FPathToText(&path, counted) == kNoErr, counted->count == 6, FPathToText(&path, counted) == kNoErr,
+                std::memcmp(counted->bytes, "C:\\dir", 6) == 0);
 
     UHandle cString = PathToCString(&path);
-    EXPECT_EQ(7u, DSGetHandleSize(cString));
-    EXPECT_STREQ("C:\\dir", reinterpret_cast<char*>(*cString));
+    EXPECT_EACH(DSGetHandleSize(cString) == 7u, reinterpret_cast<char*>(*cString) == "C:\\dir");
     DSDisposeHandle(cString);
     for (size_t length : {260, 261}) {
         PathRef longPath = Rel({std::string(length, 'x').c_str()});
@@ -208,10 +164,8 @@ TEST_F(PathText, NamesForTheSystem) {
         const MgErr err = MakeDOSPathName(&path, name, 0);
         return err ? std::to_string(err) : std::string(name);
     };
-    EXPECT_EQ("C:\\", made(Abs({"C"})));
-    EXPECT_EQ("c:\\dir\\a b.x", made(Abs({"c", "dir", "a b.x"})));
-    EXPECT_EQ("\\\\s\\t\\", made(Unc({"\\\\s\\t"})));
-    EXPECT_EQ("\\\\s\\t\\x", made(Unc({"\\\\s\\t", "x"})));
+    EXPECT_EACH(made(Abs({"C"})) == "C:\\", made(Abs({"c", "dir", "a b.x"})) == "c:\\dir\\a b.x",
+                made(Unc({"\\\\s\\t"})) == "\\\\s\\t\\", made(Unc({"\\\\s\\t", "x"})) == "\\\\s\\t\\x");
     for (const PathRef& path : {Abs({}), Abs({"CC"}), Abs({"1"}), Rel({"C"}), PathRef(), Abs({"C", "con"}),
                                 Abs({"C", "lpt9", "x"}), Abs({"C", "a?b"}), Abs({"C", "x."}), Abs({".."})})
         EXPECT_EQ("1", made(path)) << Show(path);
@@ -221,26 +175,20 @@ TEST_F(PathText, NamesForTheSystem) {
           std::string("\\\\s\\..\\x"), std::string("\\\\s\\h?\\x")})
         EXPECT_EQ("1", made(PathRef(text, PathRef::StringDisplay())));
     const auto ofLength = [](size_t length) { return Abs({"C", std::string(length - 3, 'x').c_str()}); };
-    EXPECT_EQ(259u, made(ofLength(259)).size());
-    EXPECT_EQ("1", made(ofLength(260)));
-    EXPECT_EQ(kArgErr, MakeDOSPathName(nullptr, nullptr, 0));
+    EXPECT_EACH(made(ofLength(259)).size() == 259u, made(ofLength(260)) == "1",
+                MakeDOSPathName(nullptr, nullptr, 0) == kArgErr);
 }
 
 TEST_F(PathText, NamesThatFilesCannotHave) {
-    const struct {
-        const char* name;
-        int32 flags;
-        const char* bad;
-    } rows[] = {
-        {"good.txt", 0, ""}, {"", 2, ""},     {"name.", 32, ""}, {"COM1", 8, ""}, {"lpt0", 8, ""},
-        {"COM10", 0, ""},    {"COMX", 0, ""}, {"cLoCk$", 8, ""}, {"a:b", 4, ":"}, {"a\"*/:<>?\\|b", 4, "\"*/:<>?\\|"},
-        {"a|.", 36, "|"}};
-    for (const auto& row : rows) {
+    const auto check = [](const char* name) {
         char bad[256] = "#";
-        EXPECT_EQ(row.flags, FileNameChk(PStrOf(row.name), 0, 0, bad)) << row.name;
-        EXPECT_STREQ(row.bad, bad);
-        EXPECT_EQ(row.flags & 2, FileNameChk(PStrOf(row.name), 0, 1, nullptr));
-    }
+        const int32 flags = FileNameChk(PStrOf(name), 0, 0, bad);
+        EXPECT_EQ(flags & 2, FileNameChk(PStrOf(name), 0, 1, nullptr));
+        return std::to_string(flags) + bad;
+    };
+    EXPECT_EACH(check("good.txt") == "0", check("") == "2", check("name.") == "32", check("COM1") == "8",
+                check("lpt0") == "8", check("COM10") == "0", check("COMX") == "0", check("cLoCk$") == "8",
+                check("a:b") == "4:", check("a\"*/:<>?\\|b") == "4\"*/:<>?\\|", check("a|.") == "36|");
 }
 
 TEST_F(PathText, Patterns) {
@@ -270,13 +218,10 @@ TEST_F(PathText, Patterns) {
     // Many stars on a long name: the work stays bounded.
     EXPECT_FALSE(PathRef::NameWildCardMatch(std::string(2000, 'a'), "*a*a*a*a*a*a*a*a*a*a*a*a*b"));
     int32 position = 0;
-    EXPECT_TRUE(FMFindWildCardMatchCh("ab*c?", &position, 5, 'x'));
-    EXPECT_EQ(2, position);
+    EXPECT_EACH(FMFindWildCardMatchCh("ab*c?", &position, 5, 'x'), position == 2);
     position = 3;
-    EXPECT_TRUE(FMFindWildCardMatchCh("ab*c?", &position, 5, 'c'));
-    EXPECT_EQ(3, position);
-    EXPECT_FALSE(FFindMatchCh("ab*c?", &position, 4));
-    EXPECT_TRUE(FFindMatchCh("abc`", &(position = 0), 4));
+    EXPECT_EACH(FMFindWildCardMatchCh("ab*c?", &position, 5, 'c'), position == 3, !FFindMatchCh("ab*c?", &position, 4),
+                FFindMatchCh("abc`", &(position = 0), 4));
 }
 
 TEST_F(PathText, AbbreviatedToFit) {
@@ -295,20 +240,18 @@ TEST_F(PathText, AbbreviatedToFit) {
                 {{Abs({"C", "dir", "sub", "name"}), Abs({"C", "name"})}, 6, {"name", "name"}}};
     for (const auto& row : rows) {
         std::vector<std::string> texts;
-        EXPECT_EQ(kNoErr,
-                  PathRef::ToAbbreviatedDisplayStrings(row.paths, &texts, PathRef::TrimFromFrontAbbreviationStyle(),
-                                                       PathRef::CharCountMeasurementStyle(row.maximum)));
-        EXPECT_EQ(row.texts, texts);
+        EXPECT_EACH(PathRef::ToAbbreviatedDisplayStrings(row.paths, &texts, PathRef::TrimFromFrontAbbreviationStyle(),
+                                                         PathRef::CharCountMeasurementStyle(row.maximum)) == kNoErr,
+                    row.texts == texts);
     }
     PathRef::TrimFromFrontAbbreviationStyle forced;
     forced.SetForceFullPathStrings(true);
     std::vector<std::string> texts;
     const PathRef::CharCountMeasurementStyle wide(100);
-    EXPECT_EQ(kNoErr, PathRef::ToAbbreviatedDisplayStrings({Abs({"C", "x"})}, &texts, forced, wide));
-    EXPECT_EQ("C:\\x", texts.at(0));
-    EXPECT_EQ(kArgErr, PathRef::ToAbbreviatedDisplayStrings({}, nullptr, forced, wide));
-    EXPECT_EQ(kArgErr, PathRef::ToAbbreviatedDisplayStrings({PathRef(PathRef::kNullPath)}, &texts, forced, wide));
+    EXPECT_EACH(PathRef::ToAbbreviatedDisplayStrings({Abs({"C", "x"})}, &texts, forced, wide) == kNoErr,
+                texts.at(0) == "C:\\x", PathRef::ToAbbreviatedDisplayStrings({}, nullptr, forced, wide) == kArgErr,
+                PathRef::ToAbbreviatedDisplayStrings({PathRef(PathRef::kNullPath)}, &texts, forced, wide) == kArgErr);
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -3,14 +3,13 @@
 #include "platform/posix/SystemCalls.h"
 #include "support/FailingPlatform.h"
 #include "support/HandClock.h"
+#include "support/Test.h"
 
-#include <atomic>
+#include <bit>
 #include <cerrno>
 #include <chrono>
-#include <gtest/gtest.h>
 #include <signal.h>
 #include <sys/time.h>
-#include <thread>
 
 namespace tessel::platform {
 namespace {
@@ -48,14 +47,12 @@ TEST(Event, TimeOutsAreNeverEarlyNorLost) {
                   Event first, second;
                   Event* both[] = {&first, &second};
                   int index = 0;
-                  EXPECT_EQ(kTimedOut, Event::WaitAny(both, 2, 20, index));
-                  EXPECT_EQ(-1, index);
+                  EXPECT_EACH(Event::WaitAny(both, 2, 20, index) == kTimedOut, index == -1);
               }),
               20.0);
     EXPECT_GE(MillisecondsOf([] {
                   FailingPlatform failing("futex", 1, EINTR, 3);
-                  EXPECT_EQ(kTimedOut, Event().Wait(20));
-                  EXPECT_GE(failing.Calls(), 4);
+                  EXPECT_EACH(Event().Wait(20) == kTimedOut, failing.Calls() >= 4);
               }),
               20.0);
     const SystemCalls original = systemCalls;
@@ -69,8 +66,7 @@ TEST(Event, AHostThatCannotWaitIsToldOf) {
     Event* both[] = {&first, &second};
     int index = 0;
     FailingPlatform failing("futex", 1, ENOSYS, 2);
-    EXPECT_EQ(EventWait::kFailed, first.Wait(-1));
-    EXPECT_EQ(EventWait::kFailed, Event::WaitAny(both, 2, -1, index));
+    EXPECT_EACH(EventWait::kFailed == first.Wait(-1), EventWait::kFailed == Event::WaitAny(both, 2, -1, index));
 }
 
 TEST(Event, WaitAnyTakesTheFirstSignaled) {
@@ -86,16 +82,47 @@ TEST(Event, WaitAnyTakesTheFirstSignaled) {
     EXPECT_EQ(EventWait::kTimedOut, first.Wait(0));
 }
 
+// Each waits for an event that all share and for its own; whoever leaves must take nobody else off the list.
+TEST(Event, AnyOfTheWaitersMayLeave) {
+    constexpr int kWaiters = 6;
+    std::mt19937 random(1);
+    for (int round = 0; round < 50; ++round) {
+        Event shared, own[kWaiters];
+        std::atomic<int> waiting{0}, left{0}, wrong{0}, byShared{0};
+        const unsigned leaving = random() % (1u << kWaiters);
+        test::InThreads(kWaiters + 1, [&](int thread) {
+            if (thread < kWaiters) {
+                Event* both[] = {&shared, &own[thread]};
+                int index = -1;
+                ++waiting;
+                wrong += Event::WaitAny(both, 2, 60000, index) != EventWait::kTaken;
+                byShared += index == 0;
+                ++left;
+                return;
+            }
+            while (waiting < kWaiters) std::this_thread::yield();
+            for (int i = 0; i < kWaiters; ++i)
+                if (leaving >> i & 1) own[i].Set();
+            while (left < std::popcount(leaving)) std::this_thread::yield();
+            for (int gone = left; gone < kWaiters; ++gone) {
+                shared.Set();
+                while (left == gone) std::this_thread::yield();
+            }
+        });
+        EXPECT_EACH(wrong == 0, byShared == kWaiters - std::popcount(leaving));
+    }
+}
+
 TEST(Clock, IsReadFromTheHost) {
     HandClock clock(5'000'000'123'456);  // far beyond 2^32 milliseconds
     std::uint32_t start = TickMilliseconds();
-    EXPECT_EQ(static_cast<std::uint32_t>(5'000'000'123'456), start);
-    EXPECT_EQ(std::uint64_t{5'000'000'123'456}, HighResolutionCount() / (HighResolutionFrequency() / 1000));
+    EXPECT_EACH(static_cast<std::uint32_t>(5'000'000'123'456) == start,
+                std::uint64_t{5'000'000'123'456} == HighResolutionCount() / (HighResolutionFrequency() / 1000));
     clock.Advance(7);
     EXPECT_EQ(start + 7, TickMilliseconds());
     SleepMilliseconds(1500);
-    EXPECT_EQ(start + 1507, TickMilliseconds());
-    EXPECT_EQ(116'444'736'000'000'000 + 5'000'000'124'963 * 10'000, SystemFileTime());
+    EXPECT_EACH(start + 1507 == TickMilliseconds(),
+                116'444'736'000'000'000 + 5'000'000'124'963 * 10'000 == SystemFileTime());
 }
 
 TEST(Clock, SleepsGoOnAfterSignals) {
@@ -107,8 +134,8 @@ TEST(Clock, SleepsGoOnAfterSignals) {
     sigaction(SIGALRM, &action, &before);
     const itimerval everyMillisecond = {{0, 1000}, {0, 1000}};
     setitimer(ITIMER_REAL, &everyMillisecond, nullptr);
-    EXPECT_GE(MillisecondsOf([] { SleepMilliseconds(30); }), 30.0);
-    EXPECT_GE(MillisecondsOf([] { Event().Wait(30); }), 30.0);
+    EXPECT_EACH(MillisecondsOf([] { SleepMilliseconds(30); }) >= 30.0,
+                MillisecondsOf([] { Event().Wait(30); }) >= 30.0);
     const itimerval never = {};
     setitimer(ITIMER_REAL, &never, nullptr);
     EXPECT_GT(signals, 0);

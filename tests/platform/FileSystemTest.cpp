@@ -4,12 +4,10 @@
 #include "platform/LastError.h"
 #include "support/FailingPlatform.h"
 #include "support/ScratchDrive.h"
+#include "support/Test.h"
 
 #include <cerrno>
-#include <cstdlib>
 #include <filesystem>
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -25,60 +23,33 @@ TEST(DriveTable, TextsOfNames) {
     setenv("TESSEL_DRIVES", "C=/;t=/mnt/x/;bad;Q=relative;Z=/mnt", 1);
     setenv("TESSEL_UNC", "/net", 1);
     ReloadDrives();
-    struct Row {
-        const char* name;
-        const char* native;
-        ErrorNumber error;
-    };
-    const Row rows[] = {
-        {"C:\\", "/", 0},
-        {"C:\\dir\\file.txt", "/dir/file.txt", 0},
-        {"c:/dir/", "/dir", 0},
-        {"T:\\", "/mnt/x", 0},
-        {"T:\\a\\b", "/mnt/x/a/b", 0},
-        {"T:a", "/mnt/x/a", 0},  // the current folder lies elsewhere
-        {"\\\\server\\share\\a", "/net/server/share/a", 0},
-        {"dir\\a", "dir/a", 0},
-        // no name leads out of its drive or its share
-        {"T:\\..\\..\\etc\\.\\a\\..\\..\\.b", "/mnt/x/.b", 0},
-        {"T:..\\a", "/mnt/x/a", 0},
-        {"T:/a//../..", "/mnt/x", 0},
-        {"T:\\...\\..a", "/mnt/x/.../..a", 0},
-        {"\\\\server\\share\\..\\..\\a", "/net/server/share/a", 0},
-        {"\\\\..\\share", nullptr, kErrorNetworkPathNotFound},
-        {"\\\\server\\..\\a", nullptr, kErrorNetworkPathNotFound},
-        {"..\\a", "../a", 0},
-        {"Q:\\a", nullptr, kErrorPathNotFound},
-        {"", nullptr, kErrorInvalidName},
-        {"\\\\", nullptr, kErrorNetworkPathNotFound},
-    };
-    for (const Row& row : rows) {
-        SCOPED_TRACE(row.name);
-        std::string native;
+    const auto native = [](const char* name) {
+        std::string text;
         SetLastError(0);
-        EXPECT_EQ(row.native != nullptr, NameToNativeText(row.name, native));
-        EXPECT_EQ(row.error, LastError());
-        EXPECT_EQ(row.native ? row.native : "", native);
-    }
-    const std::pair<const char*, const char*> back[] = {
-        {"/mnt/x/a/b", "T:\\a\\b"}, {"/mnt/x", "T:\\"},
-        {"/mnt/xy", "Z:\\xy"},      {"/net/server/share", "\\\\server\\share"},
-        {"/net", "C:\\net"},        {"/", "C:\\"},
-        {"/a\\b/", "C:\\a?b"}};
-    for (const auto& [native, name] : back) {
+        return NameToNativeText(name, text) ? text : "error " + std::to_string(LastError());
+    };
+    EXPECT_EACH(native("C:\\") == "/", native("C:\\dir\\file.txt") == "/dir/file.txt", native("c:/dir/") == "/dir",
+                native("T:\\") == "/mnt/x", native("T:\\a\\b") == "/mnt/x/a/b", native("T:a") == "/mnt/x/a",
+                native("\\\\server\\share\\a") == "/net/server/share/a", native("dir\\a") == "dir/a",
+                native("..\\a") == "../a", native("Q:\\a") == "error 3", native("") == "error 123",
+                native("\\\\") == "error 53");
+    // No name leads out of its drive or its share.
+    EXPECT_EACH(native("T:\\..\\..\\etc\\.\\a\\..\\..\\.b") == "/mnt/x/.b", native("T:..\\a") == "/mnt/x/a",
+                native("T:/a//../..") == "/mnt/x", native("T:\\...\\..a") == "/mnt/x/.../..a",
+                native("\\\\server\\share\\..\\..\\a") == "/net/server/share/a", native("\\\\..\\share") == "error 53",
+                native("\\\\server\\..\\a") == "error 53");
+    const auto name = [](const char* text) {
         std::string result;
-        EXPECT_TRUE(NativeToName(native, result));
-        EXPECT_EQ(name, result);
-    }
+        return NativeToName(text, result) ? result : "error " + std::to_string(LastError());
+    };
+    EXPECT_EACH(name("/mnt/x/a/b") == "T:\\a\\b", name("/mnt/x") == "T:\\", name("/mnt/xy") == "Z:\\xy",
+                name("/net/server/share") == "\\\\server\\share", name("/net") == "C:\\net", name("/") == "C:\\",
+                name("/a\\b/") == "C:\\a?b");
     unsetenv("TESSEL_UNC");
     setenv("TESSEL_DRIVES", "T=/mnt/x", 1);
     ReloadDrives();
-    std::string text;
-    EXPECT_FALSE(NameToNativeText("\\\\server\\share", text));
-    EXPECT_EQ(kErrorNetworkPathNotFound, LastError());
-    EXPECT_FALSE(NativeToName("/home", text));
-    EXPECT_EQ(kErrorPathNotFound, LastError());
-    EXPECT_FALSE(NativeToName("home", text));
+    EXPECT_EACH(native("\\\\server\\share") == "error 53", name("/home") == "error 3",
+                name("home").substr(0, 5) == "error");
 }
 
 TEST(DriveTable, NamesMatchWithoutRegardToCase) {
@@ -94,18 +65,13 @@ TEST(DriveTable, NamesMatchWithoutRegardToCase) {
                                                         {"größe/none/File.TXT", "Größe/none/File.TXT"}};
     for (const auto& [name, expected] : rows) {
         std::string native;
-        EXPECT_TRUE(NameToNative(drive.Name(name), native));
-        EXPECT_EQ(drive.Native(expected), native);
+        EXPECT_EACH(NameToNative(drive.Name(name), native), drive.Native(expected) == native);
     }
     std::string real;
-    EXPECT_TRUE(ItemRealName(drive.Name("größe").c_str(), real));
-    EXPECT_EQ("Größe", real);
-    EXPECT_TRUE(ItemRealName("T:\\", real));
-    EXPECT_EQ("", real);
-    EXPECT_TRUE(ItemRealPath(drive.Name("größe/sub/file.txt").c_str(), real));
-    EXPECT_EQ("T:\\Größe\\Sub\\File.TXT", real);
-    EXPECT_FALSE(ItemRealPath(drive.Name("größe/none").c_str(), real));
-    EXPECT_EQ(kErrorFileNotFound, LastError());
+    EXPECT_EACH(ItemRealName(drive.Name("größe").c_str(), real), real == "Größe", ItemRealName("T:\\", real),
+                real == "", ItemRealPath(drive.Name("größe/sub/file.txt").c_str(), real),
+                real == "T:\\Größe\\Sub\\File.TXT", !ItemRealPath(drive.Name("größe/none").c_str(), real),
+                LastError() == kErrorFileNotFound);
 }
 
 TEST(DriveTable, NamesAreInTheCodePage) {
@@ -118,8 +84,7 @@ TEST(DriveTable, NamesAreInTheCodePage) {
     ASSERT_EQ(1u, entries.size());
     EXPECT_EQ("\x83\x5C.txt", entries[0].name);
     std::string real;
-    EXPECT_TRUE(ItemRealName("T:\\\x83\x5C.TXT", real));
-    EXPECT_EQ("\x83\x5C.txt", real);
+    EXPECT_EACH(ItemRealName("T:\\\x83\x5C.TXT", real), real == "\x83\x5C.txt");
     SetCodePage(kCodePageUtf8);
 }
 
@@ -139,40 +104,31 @@ TEST(FileSystem, InfoTellsKindModeAndSize) {
     chmod(drive.Native(".hidden").c_str(), 0444);
     ItemInfo info;
     ASSERT_TRUE(ItemGetInfo(drive.Name(".HIDDEN").c_str(), info));
-    EXPECT_TRUE(!info.folder && info.readOnly && info.hidden);
-    EXPECT_EQ(5, info.size);
-    EXPECT_EQ(0444u, info.mode);
+    EXPECT_EACH(!info.folder, info.readOnly, info.hidden, info.size == 5, info.mode == 0444u);
     ASSERT_TRUE(ItemGetInfo(drive.Name("folder").c_str(), info));
     EXPECT_TRUE(info.folder && !info.readOnly && !info.hidden);
 
     EXPECT_TRUE(ItemSetReadOnly(drive.Name(".hidden").c_str(), false));
     ASSERT_TRUE(ItemGetInfo(drive.Name(".hidden").c_str(), info));
-    EXPECT_EQ(0444u | (0222u & ~PermissionMask()), info.mode);
-    EXPECT_TRUE(ItemSetMode(drive.Name(".hidden").c_str(), 0640));
+    EXPECT_EACH((0444u | (0222u & ~PermissionMask())) == info.mode, ItemSetMode(drive.Name(".hidden").c_str(), 0640));
     ASSERT_TRUE(ItemGetInfo(drive.Name(".hidden").c_str(), info));
     EXPECT_EQ(0640u, info.mode);
 
-    EXPECT_FALSE(ItemGetInfo(drive.Name("none").c_str(), info));
-    EXPECT_EQ(kErrorFileNotFound, LastError());
-    EXPECT_FALSE(ItemGetInfo(drive.Name("none/a").c_str(), info));
-    EXPECT_EQ(kErrorPathNotFound, LastError());
-    EXPECT_FALSE(ItemGetInfo(drive.Name(".hidden/a").c_str(), info));
-    EXPECT_EQ(kErrorPathNotFound, LastError());
+    EXPECT_EACH(!ItemGetInfo(drive.Name("none").c_str(), info), LastError() == kErrorFileNotFound,
+                !ItemGetInfo(drive.Name("none/a").c_str(), info), LastError() == kErrorPathNotFound,
+                !ItemGetInfo(drive.Name(".hidden/a").c_str(), info), LastError() == kErrorPathNotFound);
 }
 
 TEST(FileSystem, PermissionMaskIsTheProcesss) {
     mode_t before = umask(027);
-    EXPECT_EQ(027u, PermissionMask());
-    EXPECT_EQ(027u, umask(before));
+    EXPECT_EACH(PermissionMask() == 027u, umask(before) == 027u);
 }
 
 TEST(FileSystem, FoldersAreMadeListedAndRemoved) {
     ScratchDrive drive;
-    EXPECT_FALSE(FolderCreate(drive.Name("a/b").c_str()));
-    EXPECT_EQ(kErrorPathNotFound, LastError());
-    EXPECT_TRUE(FolderCreate(drive.Name("a").c_str()));
-    EXPECT_FALSE(FolderCreate(drive.Name("A").c_str()));
-    EXPECT_EQ(kErrorAlreadyExists, LastError());
+    EXPECT_EACH(!FolderCreate(drive.Name("a/b").c_str()), LastError() == kErrorPathNotFound,
+                FolderCreate(drive.Name("a").c_str()), !FolderCreate(drive.Name("A").c_str()),
+                LastError() == kErrorAlreadyExists);
     drive.Put("a/file", "x");
     EXPECT_TRUE(FolderCreate(drive.Name("a/b").c_str()));
     std::vector<FolderEntry> entries;
@@ -180,22 +136,15 @@ TEST(FileSystem, FoldersAreMadeListedAndRemoved) {
     EXPECT_THAT(entries,
                 ::testing::UnorderedElementsAre(::testing::FieldsAre("file", false), ::testing::FieldsAre("b", true)));
     std::int64_t count = 0;
-    EXPECT_TRUE(FolderCount(drive.Name("a").c_str(), count));
-    EXPECT_EQ(2, count);
-    EXPECT_FALSE(FolderList(drive.Name("a/file").c_str(), entries));
-    EXPECT_EQ(kErrorNotAFolder, LastError());
-    EXPECT_FALSE(FolderRemove(drive.Name("a").c_str()));
-    EXPECT_EQ(kErrorFolderNotEmpty, LastError());
-    EXPECT_FALSE(FolderRemove(drive.Name("a/file").c_str()));
-    EXPECT_EQ(kErrorNotAFolder, LastError());
-    EXPECT_FALSE(FileDelete(drive.Name("a/b").c_str()));
-    EXPECT_EQ(kErrorAccessDenied, LastError());
+    EXPECT_EACH(FolderCount(drive.Name("a").c_str(), count), count == 2,
+                !FolderList(drive.Name("a/file").c_str(), entries), LastError() == kErrorNotAFolder,
+                !FolderRemove(drive.Name("a").c_str()), LastError() == kErrorFolderNotEmpty,
+                !FolderRemove(drive.Name("a/file").c_str()), LastError() == kErrorNotAFolder,
+                !FileDelete(drive.Name("a/b").c_str()), LastError() == kErrorAccessDenied);
     fs::create_directory_symlink(drive.Native("a/b"), drive.Native("link"));
-    EXPECT_TRUE(FolderRemove(drive.Name("LINK").c_str()));
-    EXPECT_TRUE(FolderRemove(drive.Name("a/b").c_str()));
-    EXPECT_TRUE(FileDelete(drive.Name("a/FILE").c_str()));
-    EXPECT_TRUE(FolderRemove(drive.Name("a").c_str()));
-    EXPECT_TRUE(fs::is_empty(drive.Native()));
+    EXPECT_EACH(FolderRemove(drive.Name("LINK").c_str()), FolderRemove(drive.Name("a/b").c_str()),
+                FileDelete(drive.Name("a/FILE").c_str()), FolderRemove(drive.Name("a").c_str()),
+                fs::is_empty(drive.Native()));
 }
 
 TEST(FileSystem, RenamingNeverReplaces) {
@@ -204,21 +153,15 @@ TEST(FileSystem, RenamingNeverReplaces) {
         drive.Put("a", "from");
         drive.Put("b", "to");
         FailingPlatform failing("renameat2", 1, EINVAL, plainRename ? 1 : 0);
-        EXPECT_FALSE(ItemRename(drive.Name("a").c_str(), drive.Name("B").c_str()));
-        EXPECT_EQ(kErrorAlreadyExists, LastError());
-        EXPECT_EQ("to", drive.Get("b"));
-        EXPECT_TRUE(FileDelete(drive.Name("b").c_str()));
-        EXPECT_TRUE(ItemRename(drive.Name("A").c_str(), drive.Name("b").c_str()));
-        EXPECT_EQ("from", drive.Get("b"));
-        EXPECT_EQ(ItemKind::kNone, ItemExists(drive.Name("a").c_str()));
+        EXPECT_EACH(!ItemRename(drive.Name("a").c_str(), drive.Name("B").c_str()), LastError() == kErrorAlreadyExists,
+                    drive.Get("b") == "to", FileDelete(drive.Name("b").c_str()),
+                    ItemRename(drive.Name("A").c_str(), drive.Name("b").c_str()), drive.Get("b") == "from",
+                    ItemKind::kNone == ItemExists(drive.Name("a").c_str()));
     }
-    EXPECT_TRUE(ItemRename(drive.Name("b").c_str(), drive.Name("B").c_str()));
-    EXPECT_TRUE(fs::exists(drive.Native("B")));
-    EXPECT_FALSE(fs::exists(drive.Native("b")));
-    EXPECT_FALSE(ItemRename(drive.Name("none").c_str(), drive.Name("c").c_str()));
-    EXPECT_EQ(kErrorFileNotFound, LastError());
-    EXPECT_FALSE(ItemRename(drive.Name("B").c_str(), drive.Name("none/c").c_str()));
-    EXPECT_EQ(kErrorPathNotFound, LastError());
+    EXPECT_EACH(ItemRename(drive.Name("b").c_str(), drive.Name("B").c_str()), fs::exists(drive.Native("B")),
+                !fs::exists(drive.Native("b")), !ItemRename(drive.Name("none").c_str(), drive.Name("c").c_str()),
+                LastError() == kErrorFileNotFound, !ItemRename(drive.Name("B").c_str(), drive.Name("none/c").c_str()),
+                LastError() == kErrorPathNotFound);
 }
 
 TEST(FileSystem, MovingToAnotherFileSystemCopiesFilesOnly) {
@@ -227,12 +170,10 @@ TEST(FileSystem, MovingToAnotherFileSystemCopiesFilesOnly) {
     chmod(drive.Native("a").c_str(), 0640);
     fs::create_directory(drive.Native("folder"));
     FailingPlatform failing("renameat2", 1, EXDEV, 2);
-    EXPECT_TRUE(ItemRename(drive.Name("a").c_str(), drive.Name("b").c_str()));
-    EXPECT_EQ("content", drive.Get("b"));
-    EXPECT_EQ(0640u, static_cast<unsigned>(fs::status(drive.Native("b")).permissions()));
-    EXPECT_FALSE(fs::exists(drive.Native("a")));
-    EXPECT_FALSE(ItemRename(drive.Name("folder").c_str(), drive.Name("other").c_str()));
-    EXPECT_EQ(kErrorNotSameDevice, LastError());
+    EXPECT_EACH(ItemRename(drive.Name("a").c_str(), drive.Name("b").c_str()), drive.Get("b") == "content",
+                static_cast<unsigned>(fs::status(drive.Native("b")).permissions()) == 0640u,
+                !fs::exists(drive.Native("a")), !ItemRename(drive.Name("folder").c_str(), drive.Name("other").c_str()),
+                LastError() == kErrorNotSameDevice);
 }
 
 TEST(FileSystem, CopiesAreWholeOrNotThere) {
@@ -241,17 +182,14 @@ TEST(FileSystem, CopiesAreWholeOrNotThere) {
     drive.Put("a", content);
     for (int error : {0, ENOSYS}) {  // ENOSYS: a kernel that does not copy
         FailingPlatform failing("copy_file_range", 1, error, error ? 1 : 0);
-        EXPECT_TRUE(FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()));
-        EXPECT_EQ(content, drive.Get("b"));
-        EXPECT_EQ(fs::last_write_time(drive.Native("a")), fs::last_write_time(drive.Native("b")));
-        EXPECT_FALSE(FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()));
-        EXPECT_EQ(kErrorFileExists, LastError());
+        EXPECT_EACH(FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()), content == drive.Get("b"),
+                    fs::last_write_time(drive.Native("a")) == fs::last_write_time(drive.Native("b")),
+                    !FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()), LastError() == kErrorFileExists);
         fs::remove(drive.Native("b"));
     }
     for (const char* call : {"copy_file_range", "fchmod", "fsync", "linkat"}) {
         FailingPlatform failing(call, 1, ENOSPC);
-        EXPECT_FALSE(FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()));
-        EXPECT_EQ(kErrorDiskFull, LastError());
+        EXPECT_EACH(!FileCopy(drive.Name("a").c_str(), drive.Name("b").c_str()), LastError() == kErrorDiskFull);
         EXPECT_FALSE(fs::exists(drive.Native("b"))) << call;
     }
 }
@@ -263,27 +201,21 @@ TEST(FileSystem, CurrentAndTemporaryFolders) {
     drive.Put("Sub/a", "");
     EXPECT_TRUE(SetCurrentFolder(drive.Name("sub").c_str()));
     std::string name;
-    EXPECT_TRUE(CurrentFolder(name));
-    EXPECT_EQ("T:\\Sub", name);
-    EXPECT_EQ(ItemKind::kFile, ItemExists("A"));
-    EXPECT_EQ(ItemKind::kFile, ItemExists("T:a"));
-    EXPECT_EQ(ItemKind::kFolder, ItemExists("\\SUB"));
-    EXPECT_TRUE(ItemRealPath("A", name));
-    EXPECT_EQ("T:\\Sub\\a", name);
+    EXPECT_EACH(CurrentFolder(name), name == "T:\\Sub", ItemKind::kFile == ItemExists("A"),
+                ItemKind::kFile == ItemExists("T:a"), ItemKind::kFolder == ItemExists("\\SUB"), ItemRealPath("A", name),
+                name == "T:\\Sub\\a");
     fs::current_path(before);
 
     const char* saved = std::getenv("TMPDIR");
     std::string savedText = saved ? saved : "";
     setenv("TMPDIR", drive.Native("Sub").c_str(), 1);
-    EXPECT_TRUE(TemporaryFolder(name));
-    EXPECT_EQ("T:\\Sub\\", name);
+    EXPECT_EACH(TemporaryFolder(name), name == "T:\\Sub\\");
     saved ? setenv("TMPDIR", savedText.c_str(), 1) : unsetenv("TMPDIR");
 
     VolumeSpace space;
     ASSERT_TRUE(VolumeGetSpace("T:\\", space));
     fs::space_info expected = fs::space(drive.Native());
-    EXPECT_EQ(expected.capacity, space.totalBytes);
-    EXPECT_EQ(0u, space.totalBytes % space.sectorBytes);
+    EXPECT_EACH(expected.capacity == space.totalBytes, space.totalBytes % space.sectorBytes == 0u);
 }
 
 }  // namespace

@@ -3,14 +3,11 @@
 #include "platform/LastError.h"
 #include "support/FailingPlatform.h"
 #include "support/ScratchDrive.h"
+#include "support/Test.h"
 
-#include <atomic>
 #include <cerrno>
-#include <gtest/gtest.h>
-#include <string>
 #include <sys/stat.h>
 #include <sys/wait.h>
-#include <thread>
 #include <unistd.h>
 
 namespace tessel::platform {
@@ -37,10 +34,9 @@ FileHandle Open(const std::string& name, std::uint32_t access = kRead | kWrite, 
 TEST(File, DispositionsDecideWhatIsMade) {
     ScratchDrive drive;
     std::string name = drive.Name("a.txt");
-    EXPECT_EQ(kNoFile, Open(name));
-    EXPECT_EQ(kErrorFileNotFound, LastError());
-    EXPECT_EQ(kNoFile, Open(drive.Name("none/a.txt"), kWrite, 0, Disposition::kCreateAlways));
-    EXPECT_EQ(kErrorPathNotFound, LastError());
+    EXPECT_EACH(Open(name) == kNoFile, LastError() == kErrorFileNotFound,
+                Open(drive.Name("none/a.txt"), kWrite, 0, Disposition::kCreateAlways) == kNoFile,
+                LastError() == kErrorPathNotFound);
 
     FileHandle file = Open(name, kWrite, 0, Disposition::kCreateNew);
     ASSERT_NE(kNoFile, file);
@@ -55,13 +51,10 @@ TEST(File, DispositionsDecideWhatIsMade) {
         FileClose(file);
         EXPECT_EQ("", drive.Get("a.txt"));
     }
-    EXPECT_EQ(kNoFile, Open(name, kRead, 0, Disposition::kTruncateExisting));
-    EXPECT_EQ(kErrorInvalidParameter, LastError());
+    EXPECT_EACH(Open(name, kRead, 0, Disposition::kTruncateExisting) == kNoFile, LastError() == kErrorInvalidParameter);
     ASSERT_TRUE(FolderCreate(drive.Name("folder").c_str()));
-    for (std::uint32_t access : {kRead, kWrite, kRead | kWrite}) {
-        EXPECT_EQ(kNoFile, Open(drive.Name("folder"), access));
-        EXPECT_EQ(kErrorAccessDenied, LastError());
-    }
+    for (std::uint32_t access : {kRead, kWrite, kRead | kWrite})
+        EXPECT_EACH(Open(drive.Name("folder"), access) == kNoFile, LastError() == kErrorAccessDenied);
 }
 
 TEST(File, AccessIsThatOfTheHandle) {
@@ -70,16 +63,12 @@ TEST(File, AccessIsThatOfTheHandle) {
     char buffer[4];
     std::size_t actual = 99;
     FileHandle reader = Open(drive.Name("a"), kRead);
-    EXPECT_FALSE(FileWrite(reader, "x", 1, actual));
-    EXPECT_EQ(kErrorAccessDenied, LastError());
-    EXPECT_EQ(0u, actual);
-    EXPECT_FALSE(FileSetSize(reader, 0));
+    EXPECT_EACH(!FileWrite(reader, "x", 1, actual), LastError() == kErrorAccessDenied, actual == 0u,
+                !FileSetSize(reader, 0));
     FileHandle writer = Open(drive.Name("a"), kWrite);
     SetLastError(0);
-    EXPECT_FALSE(FileRead(writer, buffer, 3, actual));
-    EXPECT_EQ(kErrorAccessDenied, LastError());
-    EXPECT_TRUE(FileRead(reader, buffer, 4, actual));
-    EXPECT_EQ("abc", std::string(buffer, actual));
+    EXPECT_EACH(!FileRead(writer, buffer, 3, actual), LastError() == kErrorAccessDenied,
+                FileRead(reader, buffer, 4, actual), std::string(buffer, actual) == "abc");
     FileClose(reader);
     FileClose(writer);
 }
@@ -89,20 +78,11 @@ TEST(File, PositionAndSize) {
     drive.Put("a", "0123456789");
     FileHandle file = Open(drive.Name("a"));
     std::int64_t value = 0;
-    EXPECT_TRUE(FileSeek(file, -3, SeekFrom::kEnd));
-    EXPECT_TRUE(FileTell(file, value));
-    EXPECT_EQ(7, value);
-    EXPECT_FALSE(FileSeek(file, -8, SeekFrom::kCurrent));
-    EXPECT_EQ(kErrorNegativeSeek, LastError());
-    EXPECT_TRUE(FileTell(file, value));
-    EXPECT_EQ(7, value);
-    EXPECT_TRUE(FileSeek(file, std::int64_t{5} << 32, SeekFrom::kStart));
-    EXPECT_TRUE(FileTell(file, value));
-    EXPECT_EQ(std::int64_t{5} << 32, value);
-    EXPECT_TRUE(FileSetSize(file, 4));
-    EXPECT_TRUE(FileSize(file, value));
-    EXPECT_EQ(4, value);
-    EXPECT_TRUE(FileFlush(file));
+    EXPECT_EACH(FileSeek(file, -3, SeekFrom::kEnd), FileTell(file, value), value == 7,
+                !FileSeek(file, -8, SeekFrom::kCurrent), LastError() == kErrorNegativeSeek, FileTell(file, value),
+                value == 7, FileSeek(file, std::int64_t{5} << 32, SeekFrom::kStart), FileTell(file, value),
+                (std::int64_t{5} << 32) == value, FileSetSize(file, 4), FileSize(file, value), value == 4,
+                FileFlush(file));
     FileClose(file);
 }
 
@@ -116,15 +96,12 @@ TEST(File, TransfersGoOnAfterInterruptions) {
         ASSERT_TRUE(FileSetSize(file, 0) && FileSeek(file, 0, SeekFrom::kStart));
         {
             FailingPlatform failing("write", 1, error, 5);
-            EXPECT_TRUE(FileWrite(file, "0123456789", 10, actual));
-            EXPECT_EQ(6, failing.Calls());
+            EXPECT_EACH(FileWrite(file, "0123456789", 10, actual), failing.Calls() == 6);
         }
-        EXPECT_EQ(10u, actual);
-        EXPECT_EQ("0123456789", drive.Get("a"));
+        EXPECT_EACH(actual == 10u, drive.Get("a") == "0123456789");
         ASSERT_TRUE(FileSeek(file, 2, SeekFrom::kStart));
         FailingPlatform failing("read", 1, error, 3);
-        EXPECT_TRUE(FileRead(file, buffer, sizeof buffer, actual));
-        EXPECT_EQ("23456789", std::string(buffer, actual));
+        EXPECT_EACH(FileRead(file, buffer, sizeof buffer, actual), std::string(buffer, actual) == "23456789");
     }
     FileClose(file);
 }
@@ -136,14 +113,11 @@ TEST(File, FailuresTellWhatWasDone) {
     std::size_t actual = 0;
     {
         FailingPlatform failing("write", 1, ENOSPC);
-        EXPECT_FALSE(FileWrite(file, "abc", 3, actual));
-        EXPECT_EQ(kErrorDiskFull, LastError());
-        EXPECT_EQ(0u, actual);
+        EXPECT_EACH(!FileWrite(file, "abc", 3, actual), LastError() == kErrorDiskFull, actual == 0u);
     }
     {
         FailingPlatform failing("fsync", 1, EIO);
-        EXPECT_FALSE(FileFlush(file));
-        EXPECT_EQ(kErrorIODevice, LastError());
+        EXPECT_EACH(!FileFlush(file), LastError() == kErrorIODevice);
     }
     {
         FailingPlatform failing("close", 1, EINTR);
@@ -154,8 +128,7 @@ TEST(File, FailuresTellWhatWasDone) {
                                  {ETXTBSY, kErrorSharingViolation},
                                  {EROFS, kErrorAccessDenied}}) {
         FailingPlatform failing("open", 1, error, 2);
-        EXPECT_EQ(kNoFile, Open(drive.Name("a")));
-        EXPECT_EQ(number, LastError());
+        EXPECT_EACH(Open(drive.Name("a")) == kNoFile, number == LastError());
     }
 }
 
@@ -179,16 +152,14 @@ TEST(File, ShareModesHoldWithinAndBetweenProcesses) {
                         return 0;
                     };
                     SCOPED_TRACE(::testing::Message() << access << deny << access2 << deny2);
-                    EXPECT_EQ(expected ? 0 : 32, attempt());
-                    EXPECT_EQ(expected ? 0 : 32, InAnotherProcess(attempt));
+                    EXPECT_EACH((expected ? 0 : 32) == attempt(), (expected ? 0 : 32) == InAnotherProcess(attempt));
                 }
             }
             FileClose(first);
         }
     }
     FileHandle after = Open(name, kRead | kWrite, kRead | kWrite);
-    EXPECT_NE(kNoFile, after);
-    EXPECT_EQ(kNoFile, Open(name, kWrite, 0, Disposition::kCreateAlways));
+    EXPECT_EACH(after != kNoFile, Open(name, kWrite, 0, Disposition::kCreateAlways) == kNoFile);
     FileClose(after);
     EXPECT_EQ("content", drive.Get("a"));  // the refused opening did not empty it
 }
@@ -211,8 +182,7 @@ TEST(File, NeverDoTwoExclusiveOpenersWin) {
     std::thread other(contend);
     contend();
     other.join();
-    EXPECT_EQ(0, together);
-    EXPECT_GT(wins, 0);
+    EXPECT_EACH(together == 0, wins > 0);
 }
 
 TEST(File, WithoutLocksNothingIsDenied) {
@@ -221,8 +191,7 @@ TEST(File, WithoutLocksNothingIsDenied) {
     FailingPlatform failing("lock", 1, ENOLCK, 1000);
     FileHandle first = Open(drive.Name("a"), kRead | kWrite, kRead | kWrite);
     FileHandle second = Open(drive.Name("a"), kRead | kWrite, kRead | kWrite);
-    EXPECT_NE(kNoFile, first);
-    EXPECT_NE(kNoFile, second);
+    EXPECT_EACH(first != kNoFile, second != kNoFile);
     FileClose(first);
     FileClose(second);
 }
@@ -241,15 +210,10 @@ TEST(File, RangeLocksAreExclusiveForReadersToo) {
                     return FileLock(file, offset, count) ? 0 : static_cast<int>(LastError());
                 });
             };
-            EXPECT_EQ(33, attempt(5, 10));
-            EXPECT_EQ(33, attempt(0, 3));
-            EXPECT_EQ(0, attempt(6, 10));
-            EXPECT_EQ(0, attempt(3, 0));
+            EXPECT_EACH(attempt(5, 10) == 33, attempt(0, 3) == 33, attempt(6, 10) == 0, attempt(3, 0) == 0);
         }
-        EXPECT_TRUE(FileUnlock(holder, 2, 4));
-        EXPECT_FALSE(FileUnlock(holder, 2, 4));
-        EXPECT_EQ(kErrorNotLocked, LastError());
-        EXPECT_TRUE(FileLock(holder, 2, 4));
+        EXPECT_EACH(FileUnlock(holder, 2, 4), !FileUnlock(holder, 2, 4), LastError() == kErrorNotLocked,
+                    FileLock(holder, 2, 4));
         FileClose(holder);
         EXPECT_EQ(0, InAnotherProcess([&] { return FileLock(Open(name), 0, 100) ? 0 : 1; }));
     }
@@ -268,8 +232,7 @@ TEST(File, TimesAreKept) {
     ASSERT_EQ(0, stat(drive.Native("a").c_str(), &status));
     EXPECT_EQ(978307200, status.st_mtime);  // 2001-01-01 00:00:00 UTC
     EXPECT_EQ(123456700, status.st_mtim.tv_nsec);
-    EXPECT_EQ(modified, byHandle.modified);
-    EXPECT_EQ(modified, byName.modified);
+    EXPECT_EACH(modified == byHandle.modified, modified == byName.modified);
     EXPECT_EQ(byName.created, byHandle.created);  // what was set, where the file system keeps attributes
 }
 

@@ -7,20 +7,14 @@
 #include "platform/Thread.h"
 #include "platform/posix/Errors.h"
 #include "support/FailingPlatform.h"
+#include "support/Test.h"
 
-#include <atomic>
-#include <cstdlib>
-#include <cstring>
 #include <errno.h>
 #include <fstream>
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
 #include <iterator>
 #include <sys/mman.h>
 #include <sys/ptrace.h>
-#include <sys/resource.h>
 #include <sys/wait.h>
-#include <thread>
 #include <unistd.h>
 
 namespace tessel::test {
@@ -64,14 +58,12 @@ TEST(MemoryRead, StopsAtWhatCannotBeRead) {
     std::string buffer(3 * page, 0);
     for (bool kernelReads : {true, false}) {
         FailingPlatform failing("process_vm_readv", 1, EPERM, kernelReads ? 0 : 100);
-        EXPECT_EQ(2 * page, ReadMemory(pages, buffer.data(), 3 * page));
-        EXPECT_EQ(std::string(2 * page, 'x'), buffer.substr(0, 2 * page));
-        EXPECT_EQ(5u, ReadMemory(pages + 2 * page - 5, buffer.data(), 10));
-        EXPECT_EQ(0u, ReadMemory(pages + 2 * page, buffer.data(), 10));
-        EXPECT_EQ(0u, ReadMemory(nullptr, buffer.data(), 10));
-        EXPECT_EQ(0u, ReadMemory(reinterpret_cast<void*>(~std::uintptr_t{0} - 4), buffer.data(), 10));
-        EXPECT_EQ(3u, ReadMemory("abc", buffer.data(), 3));
-        EXPECT_EQ("abc", buffer.substr(0, 3));
+        EXPECT_EACH(2 * page == ReadMemory(pages, buffer.data(), 3 * page),
+                    std::string(2 * page, 'x') == buffer.substr(0, 2 * page),
+                    ReadMemory(pages + 2 * page - 5, buffer.data(), 10) == 5u,
+                    ReadMemory(pages + 2 * page, buffer.data(), 10) == 0u, ReadMemory(nullptr, buffer.data(), 10) == 0u,
+                    ReadMemory(reinterpret_cast<void*>(~std::uintptr_t{0} - 4), buffer.data(), 10) == 0u,
+                    ReadMemory("abc", buffer.data(), 3) == 3u, buffer.substr(0, 3) == "abc");
     }
     munmap(pages, 3 * page);
 }
@@ -88,15 +80,14 @@ TEST(MemoryRead, AForkedChildReadsItself) {
     }
     int status = 0;
     waitpid(child, &status, 0);
-    EXPECT_EQ(2, WEXITSTATUS(status));
-    EXPECT_EQ(1, seen);
+    EXPECT_EACH(WEXITSTATUS(status) == 2, seen == 1);
 }
 
 TEST(Process, EnvironmentIsExpanded) {
     setenv("TESSEL_TEST_A", "alpha", 1);
-    EXPECT_EQ("alpha/alpha", EnvironmentExpand("%TESSEL_TEST_A%/%TESSEL_TEST_A%"));
-    EXPECT_EQ("100% %TESSEL_TEST_NONE%alpha", EnvironmentExpand("100% %TESSEL_TEST_NONE%%TESSEL_TEST_A%"));
-    EXPECT_EQ("%%TESSEL_TEST_A", EnvironmentExpand("%%TESSEL_TEST_A"));
+    EXPECT_EACH(EnvironmentExpand("%TESSEL_TEST_A%/%TESSEL_TEST_A%") == "alpha/alpha",
+                EnvironmentExpand("100% %TESSEL_TEST_NONE%%TESSEL_TEST_A%") == "100% %TESSEL_TEST_NONE%alpha",
+                EnvironmentExpand("%%TESSEL_TEST_A") == "%%TESSEL_TEST_A");
     unsetenv("TESSEL_TEST_A");
     EXPECT_EQ(nullptr, EnvironmentGet("TESSEL_TEST_A"));
 }
@@ -136,12 +127,9 @@ TEST(Module, AddressesHaveNames) {
     AddressEntry entry;
     const char* landmark = reinterpret_cast<const char*>(&test::Landmark);
     ASSERT_TRUE(DescribeAddress(landmark + 1, entry));
-    EXPECT_EQ("tessel::test::Landmark(int)", entry.symbol);
-    EXPECT_EQ("platform_tests", entry.module);
-    EXPECT_EQ(1u, entry.offset);
+    EXPECT_EACH(entry.symbol == "tessel::test::Landmark(int)", entry.module == "platform_tests", entry.offset == 1u);
     ASSERT_TRUE(DescribeAddress(reinterpret_cast<const void*>(&std::terminate), entry));
-    EXPECT_EQ("std::terminate()", entry.symbol);
-    EXPECT_FALSE(DescribeAddress(nullptr, entry));
+    EXPECT_EACH(entry.symbol == "std::terminate()", !DescribeAddress(nullptr, entry));
 }
 
 TEST(Module, ModulesHaveFiles) {
@@ -149,9 +137,7 @@ TEST(Module, ModulesHaveFiles) {
     ASSERT_TRUE(ModuleFileName(kExecutable, executable));
     EXPECT_THAT(executable, ::testing::AllOf(::testing::StartsWith("C:\\"), ::testing::EndsWith("\\platform_tests")));
     ASSERT_TRUE(ModuleFileName(OwnModule(), own));  // the library's objects are part of this program
-    EXPECT_EQ(executable, own);
-    EXPECT_FALSE(ModuleFileName(12345, own));
-    EXPECT_EQ(kErrorModuleNotFound, LastError());
+    EXPECT_EACH(executable == own, !ModuleFileName(12345, own), LastError() == kErrorModuleNotFound);
 }
 
 TEST(Module, LibrariesAreLoadedByName) {
@@ -159,26 +145,23 @@ TEST(Module, LibrariesAreLoadedByName) {
     ASSERT_NE(nullptr, library);
     auto cosine = reinterpret_cast<double (*)(double)>(LibrarySymbol(library, "cos"));
     ASSERT_NE(nullptr, cosine);
-    EXPECT_EQ(1.0, cosine(0.0));
-    EXPECT_EQ(nullptr, LibrarySymbol(library, "TesselNoSuchThing"));
-    EXPECT_EQ(kErrorProcedureNotFound, LastError());
-    EXPECT_TRUE(LibraryUnload(library));
-    EXPECT_EQ(nullptr, LibraryLoad("tessel-no-such-library.so"));
-    EXPECT_EQ(kErrorModuleNotFound, LastError());
+    EXPECT_EACH(cosine(0.0) == 1.0, LibrarySymbol(library, "TesselNoSuchThing") == nullptr,
+                LastError() == kErrorProcedureNotFound, LibraryUnload(library),
+                LibraryLoad("tessel-no-such-library.so") == nullptr, LastError() == kErrorModuleNotFound);
 }
 
 TEST(System, FactsAgreeWithTheHost) {
     SystemVersion version = GetSystemVersion();
-    EXPECT_EQ("Linux", version.family);
-    EXPECT_EQ(0u, version.version.find(std::to_string(version.major) + "." + std::to_string(version.minor)));
-    EXPECT_FALSE(version.name.empty());
+    EXPECT_EACH(version.family == "Linux",
+                version.version.find(std::to_string(version.major) + "." + std::to_string(version.minor)) == 0u,
+                !version.name.empty());
     ProcessorFacts facts = GetProcessorFacts();
     EXPECT_EQ(NumberOfProcessors(), facts.logical);
     EXPECT_NE(0u, facts.features & kCompareExchange8);  // of every processor this builds for
     unsigned char first[16] = {}, second[16] = {};
     FailingPlatform failing("getrandom", 1, EINTR);
-    EXPECT_TRUE(RandomBytes(first, sizeof first) && RandomBytes(second, sizeof second));
-    EXPECT_NE(0, std::memcmp(first, second, sizeof first));
+    EXPECT_EACH(RandomBytes(first, sizeof first), RandomBytes(second, sizeof second),
+                std::memcmp(first, second, sizeof first) != 0);
 }
 
 struct Worker {
@@ -201,24 +184,12 @@ TEST(Thread, RunsAndReturnsItsCode) {
     ASSERT_NE(nullptr, thread);
     bool running = false;
     std::int32_t code = 0;
-    EXPECT_TRUE(ThreadRunning(thread, running));
-    EXPECT_TRUE(running);
-    EXPECT_TRUE(ThreadExitCode(thread, code));
-    EXPECT_EQ(259, code);
-    EXPECT_FALSE(ThreadJoin(thread, 5));
-    EXPECT_EQ(kErrorTimedOut, LastError());
+    EXPECT_EACH(ThreadRunning(thread, running), running, ThreadExitCode(thread, code), code == 259,
+                !ThreadJoin(thread, 5), LastError() == kErrorTimedOut);
     worker.stop = true;
-    EXPECT_TRUE(ThreadJoin(thread, -1));
-    EXPECT_TRUE(ThreadJoin(thread, 0));
-    EXPECT_EQ(id, worker.id);
-    EXPECT_NE(id, CurrentThreadId());
-    EXPECT_TRUE(ThreadRunning(thread, running));
-    EXPECT_FALSE(running);
-    EXPECT_TRUE(ThreadExitCode(thread, code));
-    EXPECT_EQ(17, code);
-    EXPECT_TRUE(ThreadClose(thread));
-    EXPECT_FALSE(ThreadRunning(nullptr, running));
-    EXPECT_EQ(kErrorInvalidHandle, LastError());
+    EXPECT_EACH(ThreadJoin(thread, -1), ThreadJoin(thread, 0), id == worker.id, id != CurrentThreadId(),
+                ThreadRunning(thread, running), !running, ThreadExitCode(thread, code), code == 17, ThreadClose(thread),
+                !ThreadRunning(nullptr, running), LastError() == kErrorInvalidHandle);
 }
 
 TEST(Thread, HandlesMayGoBeforeTheThread) {
@@ -229,61 +200,10 @@ TEST(Thread, HandlesMayGoBeforeTheThread) {
     worker.stop = true;
     ThreadHandle self = ThreadOpenCurrent();
     bool running = false;
-    EXPECT_TRUE(ThreadRunning(self, running));
-    EXPECT_TRUE(running);
+    EXPECT_EACH(ThreadRunning(self, running), running);
     EXPECT_FALSE(ThreadEnd(self, 0));  // not started here
     EXPECT_EQ(kErrorAccessDenied, LastError());
     EXPECT_TRUE(ThreadClose(self));
-}
-
-TEST(Thread, EndsByForceWhereverItIs) {
-#if defined(__SANITIZE_THREAD__)
-    GTEST_SKIP() << "the thread sanitizer waits for the bookkeeping of a thread that ends without any";
-#endif
-    Worker worker;  // never told to stop: without force this thread would run for ever
-    ThreadId id = 0;
-    ThreadHandle thread = ThreadStart(
-        [](void* argument) -> std::int32_t {
-            Worker& state = *static_cast<Worker*>(argument);
-            state.started = true;
-            for (unsigned spins = 0; !state.stop.load(std::memory_order_relaxed);) spins = spins + 1;
-            return 1;
-        },
-        &worker, id);
-    while (!worker.started) YieldThread();
-    EXPECT_TRUE(ThreadEnd(thread, 77));
-    std::int32_t code = 0;
-    EXPECT_TRUE(ThreadExitCode(thread, code));
-    EXPECT_EQ(77, code);
-    EXPECT_TRUE(ThreadEnd(thread, 78));  // already over: nothing happens
-    EXPECT_TRUE(ThreadExitCode(thread, code));
-    EXPECT_EQ(77, code);
-    EXPECT_TRUE(ThreadClose(thread));
-}
-
-TEST(Thread, PrioritiesAreTheHosts) {
-    if (::getpriority(PRIO_PROCESS, 0) != 0) GTEST_SKIP() << "the process itself does not have the priority 0";
-    std::thread([] {  // a lowered priority cannot always be raised again
-        ThreadHandle self = ThreadOpenCurrent();
-        std::int32_t priority = 99;
-        EXPECT_TRUE(ThreadGetPriority(self, priority));
-        EXPECT_EQ(0, priority);
-        for (std::int32_t lower : {-1, -2, -15}) {
-            EXPECT_TRUE(ThreadSetPriority(self, lower));
-            EXPECT_TRUE(ThreadGetPriority(self, priority));
-            EXPECT_EQ(lower, priority);
-        }
-        EXPECT_FALSE(ThreadSetPriority(self, 7));
-        EXPECT_EQ(kErrorInvalidParameter, LastError());
-        if (ThreadSetPriority(self, 15)) {
-            EXPECT_TRUE(ThreadGetPriority(self, priority));
-            EXPECT_EQ(15, priority);
-        } else {
-            EXPECT_EQ(kErrorAccessDenied, LastError());
-        }
-        ThreadClose(self);
-    })
-        .join();
 }
 
 TEST(Thread, StackAndSlotsAreItsOwn) {
@@ -298,13 +218,9 @@ TEST(Thread, StackAndSlotsAreItsOwn) {
         EXPECT_EQ(nullptr, LocalGet(key));
         StackBounds bounds = CurrentStackBounds();
         std::uintptr_t frame = reinterpret_cast<std::uintptr_t>(__builtin_frame_address(0));
-        EXPECT_TRUE(bounds.low < frame && frame < bounds.high);
-        EXPECT_NE(mine.high, bounds.high);
-        EXPECT_TRUE(LocalSet(key, &there));
+        EXPECT_EACH(bounds.low < frame, frame < bounds.high, mine.high != bounds.high, LocalSet(key, &there));
     }).join();
-    EXPECT_EQ(&here, LocalGet(key));
-    EXPECT_TRUE(LocalKeyFree(key));
-    EXPECT_FALSE(LocalSet(kNoLocalKey, &here));
+    EXPECT_EACH(&here == LocalGet(key), LocalKeyFree(key), !LocalSet(kNoLocalKey, &here));
 }
 
 }  // namespace

@@ -4,10 +4,10 @@
 #include "platform/Replacement.h"
 #include "support/FailingPlatform.h"
 #include "support/ScratchDrive.h"
+#include "support/Test.h"
 
 #include <cerrno>
 #include <filesystem>
-#include <gtest/gtest.h>
 #include <set>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -30,15 +30,13 @@ protected:
         SetLastError(0);
         const bool done = replacement.Begin(request) &&
                           FileWrite(replacement.File(), bytes.data(), bytes.size(), put) && replacement.Finish();
-        EXPECT_EQ(done, replacement.Failure() == ReplaceFailure::kNone);
-        EXPECT_EQ(done, replacement.HasName());
+        EXPECT_EACH(done == (replacement.Failure() == ReplaceFailure::kNone), done == replacement.HasName());
         return replacement.Failure();
     }
     std::set<std::string> Names() const {
         std::set<std::string> names;
-        for (const auto& entry : std::filesystem::directory_iterator(drive.Native())) {
+        for (const auto& entry : std::filesystem::directory_iterator(drive.Native()))
             names.insert(entry.path().filename());
-        }
         return names;
     }
     unsigned ModeOf(const char* inside) const {
@@ -66,20 +64,16 @@ TEST_F(ReplacementTest, KeepsWhatBelongsToTheFileWithAndWithoutUnnamedFiles) {
             const FailingPlatform failing("openat", named ? 10 : 1000, EOPNOTSUPP);
             EXPECT_EQ(ReplaceFailure::kNone, Replace({}, "new", "LINK"));
         }
-        EXPECT_EQ("new", drive.Get("f"));
-        EXPECT_TRUE(std::filesystem::is_symlink(drive.Native("link")));
-        EXPECT_EQ(0640u, ModeOf("f"));
+        EXPECT_EACH(drive.Get("f") == "new", std::filesystem::is_symlink(drive.Native("link")), ModeOf("f") == 0640u);
         char colour[5] = {};
-        EXPECT_EQ(4, getxattr(native.c_str(), "user.colour", colour, 4));
-        EXPECT_STREQ("blue", colour);
-        EXPECT_EQ(-1, getxattr(native.c_str(), "user.tessel.temporary", colour, 0));
+        EXPECT_EACH(getxattr(native.c_str(), "user.colour", colour, 4) == 4, colour == "blue",
+                    getxattr(native.c_str(), "user.tessel.temporary", colour, 0) == -1);
         ASSERT_TRUE(ItemGetInfo(drive.Name("f").c_str(), after));
-        EXPECT_EQ(before.created, after.created);
-        EXPECT_EQ((Names_{"f", "link"}), Names());
-        EXPECT_EQ(ReplaceFailure::kCannotRename, Replace({.mustNotExist = true}, "x"));
-        EXPECT_EQ(kErrorFileExists, LastError());
-        EXPECT_EQ(ReplaceFailure::kNone, Replace({.mustNotExist = true}, "x", "fresh"));
-        EXPECT_EQ(0666u & ~PermissionMask(), ModeOf("fresh"));
+        EXPECT_EACH(before.created == after.created, Names() == (Names_{"f", "link"}),
+                    ReplaceFailure::kCannotRename == Replace({.mustNotExist = true}, "x"),
+                    LastError() == kErrorFileExists,
+                    ReplaceFailure::kNone == Replace({.mustNotExist = true}, "x", "fresh"),
+                    (0666u & ~PermissionMask()) == ModeOf("fresh"));
         std::filesystem::remove(drive.Native("fresh"));
         std::filesystem::remove(drive.Native("link"));
     }
@@ -91,14 +85,12 @@ TEST_F(ReplacementTest, SaysHowFarItCameAndLeavesNothing) {
         int n, error;
         ReplaceFailure failure;
         ErrorNumber number;
-    } kTable[] = {
-        {"openat", 10, EROFS, ReplaceFailure::kCannotMake, kErrorAccessDenied},
-        {"fchown", 1, EPERM, ReplaceFailure::kCannotMake, kErrorAccessDenied},
-        {"fsync", 1, EROFS, ReplaceFailure::kCannotFlush, kErrorAccessDenied},
-        {"fsync", 2, EIO, ReplaceFailure::kCannotFlush, kErrorIODevice},
-        {"fchmod", 2, EIO, ReplaceFailure::kCannotFlush, kErrorIODevice},
-        {"renameat2", 1, EACCES, ReplaceFailure::kCannotRename, kErrorAccessDenied},
-    };
+    } kTable[] = {{"openat", 10, EROFS, ReplaceFailure::kCannotMake, kErrorAccessDenied},
+                  {"fchown", 1, EPERM, ReplaceFailure::kCannotMake, kErrorAccessDenied},
+                  {"fsync", 1, EROFS, ReplaceFailure::kCannotFlush, kErrorAccessDenied},
+                  {"fsync", 2, EIO, ReplaceFailure::kCannotFlush, kErrorIODevice},
+                  {"fchmod", 2, EIO, ReplaceFailure::kCannotFlush, kErrorIODevice},
+                  {"renameat2", 1, EACCES, ReplaceFailure::kCannotRename, kErrorAccessDenied}};
     for (const auto& row : kTable) {
         SCOPED_TRACE(std::string(row.call) + std::to_string(row.n));
         drive.Put("f", "old");
@@ -106,10 +98,8 @@ TEST_F(ReplacementTest, SaysHowFarItCameAndLeavesNothing) {
         if (!root && std::string(row.call) == "fchown") continue;  // only root makes files that are another's
         ASSERT_EQ(0, chown(drive.Native("f").c_str(), root ? 1 : geteuid(), getegid()));
         const FailingPlatform failing(row.call, row.n, row.error);
-        EXPECT_EQ(row.failure, Replace({}, "new"));
-        EXPECT_EQ(row.number, LastError());
-        EXPECT_EQ("old", drive.Get("f"));
-        EXPECT_EQ((Names_{"f"}), Names());
+        EXPECT_EACH(row.failure == Replace({}, "new"), row.number == LastError(), drive.Get("f") == "old",
+                    Names() == (Names_{"f"}));
     }
 }
 
@@ -121,10 +111,8 @@ TEST_F(ReplacementTest, TheNameMustLeadToTheFileToTheEnd) {
     ASSERT_TRUE(replacement.Begin({.name = name.c_str(), .opened = file, .deny = kWrite}));
     std::filesystem::rename(drive.Native("f"), drive.Native("away"));
     drive.Put("f", "another's");
-    EXPECT_FALSE(replacement.Finish());
-    EXPECT_EQ(ReplaceFailure::kCannotRename, replacement.Failure());
-    EXPECT_EQ(kErrorFileNotFound, LastError());
-    EXPECT_EQ("another's", drive.Get("f"));
+    EXPECT_EACH(!replacement.Finish(), ReplaceFailure::kCannotRename == replacement.Failure(),
+                LastError() == kErrorFileNotFound, drive.Get("f") == "another's");
     std::filesystem::rename(drive.Native("away"), drive.Native("f"));
 
     // The marks are on the new file when it takes the name, and stay with its handle.
@@ -133,15 +121,13 @@ TEST_F(ReplacementTest, TheNameMustLeadToTheFileToTheEnd) {
     ASSERT_TRUE(second.Finish());
     const FileHandle fresh = second.Release();
     FileClose(file);
-    EXPECT_EQ(kNoFile, FileOpen(name.c_str(), kWrite, 0, Disposition::kOpenExisting));
-    EXPECT_EQ(kErrorSharingViolation, LastError());
+    EXPECT_EACH(FileOpen(name.c_str(), kWrite, 0, Disposition::kOpenExisting) == kNoFile,
+                LastError() == kErrorSharingViolation);
     FileClose(fresh);
     std::filesystem::create_hard_link(drive.Native("f"), drive.Native("g"));
-    EXPECT_EQ(ReplaceFailure::kCannotMake, Replace({}, "new"));
-    EXPECT_EQ(kErrorTooManyLinks, LastError());
-    EXPECT_EQ(ReplaceFailure::kNone, Replace({.breaksLinks = true}, "new"));
-    EXPECT_EQ("new", drive.Get("f"));
-    EXPECT_EQ("", drive.Get("g"));
+    EXPECT_EACH(ReplaceFailure::kCannotMake == Replace({}, "new"), LastError() == kErrorTooManyLinks,
+                ReplaceFailure::kNone == Replace({.breaksLinks = true}, "new"), drive.Get("f") == "new",
+                drive.Get("g") == "");
 }
 
 TEST_F(ReplacementTest, ClearsWhatTheDeadLeftAndNothingElse) {
@@ -159,21 +145,19 @@ TEST_F(ReplacementTest, ClearsWhatTheDeadLeftAndNothingElse) {
     ASSERT_EQ(child, waitpid(child, &status, 0));
     ASSERT_EQ(0, status);
     ASSERT_EQ((Names_{"f", "ini$$0.TMP", "ini$$1.TMP"}), Names());
-    EXPECT_EQ(0600u, ModeOf("ini$$1.TMP"));
-    EXPECT_EQ(ReplaceFailure::kCannotMake, Replace({.pattern = kPattern, .limit = 1}, "new"));
+    EXPECT_EACH(ModeOf("ini$$1.TMP") == 0600u,
+                ReplaceFailure::kCannotMake == Replace({.pattern = kPattern, .limit = 1}, "new"));
     {
         const FailingPlatform named("openat", 10, EOPNOTSUPP);
         const std::string name = drive.Name("f");
         Replacement living;
         ASSERT_TRUE(living.Begin({.name = name.c_str(), .pattern = kPattern}));
         ASSERT_EQ((Names_{"f", "ini$$0.TMP", "ini$$1.TMP"}), Names());  // the dead writer's went, this is another
-        EXPECT_EQ(ReplaceFailure::kNone, Replace({.pattern = kPattern}, "new"));
-        EXPECT_EQ((Names_{"f", "ini$$0.TMP", "ini$$1.TMP"}), Names());
-        EXPECT_FALSE(living.Finish());
+        EXPECT_EACH(ReplaceFailure::kNone == Replace({.pattern = kPattern}, "new"),
+                    Names() == (Names_{"f", "ini$$0.TMP", "ini$$1.TMP"}), !living.Finish());
     }
-    EXPECT_EQ((Names_{"f", "ini$$0.TMP"}), Names());
-    EXPECT_EQ("a stranger's", drive.Get("ini$$0.TMP"));
-    EXPECT_EQ("new", drive.Get("f"));
+    EXPECT_EACH(Names() == (Names_{"f", "ini$$0.TMP"}), drive.Get("ini$$0.TMP") == "a stranger's",
+                drive.Get("f") == "new");
 }
 
 }  // namespace

@@ -2,12 +2,10 @@
 #include "platform/Shell.h"
 #include "support/FailingPlatform.h"
 #include "support/ScratchDrive.h"
+#include "support/Test.h"
 
 #include <cerrno>
-#include <cstdlib>
 #include <filesystem>
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
 #include <map>
 #include <set>
 #include <sys/stat.h>
@@ -44,43 +42,38 @@ protected:
 };
 
 TEST_F(Shell, FoldersComeFromTheUsersSettings) {
-    EXPECT_EQ("T:\\home", Folder(ShellFolder::kProfile));
-    EXPECT_EQ("error 2", Folder(ShellFolder::kDocuments));
-    EXPECT_EQ("T:\\home\\Documents", Folder(ShellFolder::kDocuments, true));
-    EXPECT_EQ("T:\\home\\Documents", Folder(ShellFolder::kDocuments));
+    EXPECT_EACH(Folder(ShellFolder::kProfile) == "T:\\home", Folder(ShellFolder::kDocuments) == "error 2",
+                Folder(ShellFolder::kDocuments, true) == "T:\\home\\Documents",
+                Folder(ShellFolder::kDocuments) == "T:\\home\\Documents");
     drive_.Put("home/.config/user-dirs.dirs",
                "# made by hand\nXDG_DESKTOP_DIR=\"$HOME/Bureau/\"\n  XDG_DOCUMENTS_DIR=\"relative\"\n"
                "XDG_PUBLICSHARE_DIR=\"" +
                    drive_.Native("public") + "\"\nXDG_DESKTOP_DIRX=\"$HOME/x\"\n");
-    EXPECT_EQ("T:\\home\\Bureau", Folder(ShellFolder::kDesktop, true));
-    EXPECT_EQ("T:\\home\\Documents", Folder(ShellFolder::kDocuments));
-    EXPECT_EQ("T:\\public", Folder(ShellFolder::kCommonDocuments, true));
-    EXPECT_EQ("T:\\home\\.local\\share", Folder(ShellFolder::kLocalAppData, true));
+    EXPECT_EACH(Folder(ShellFolder::kDesktop, true) == "T:\\home\\Bureau",
+                Folder(ShellFolder::kDocuments) == "T:\\home\\Documents",
+                Folder(ShellFolder::kCommonDocuments, true) == "T:\\public",
+                Folder(ShellFolder::kLocalAppData, true) == "T:\\home\\.local\\share");
     Set("XDG_DATA_HOME", drive_.Native("data"));
     EXPECT_EQ("T:\\data", Folder(ShellFolder::kLocalAppData, true));
     Set("XDG_DATA_DIRS", drive_.Native("home") + ":/nowhere");
-    EXPECT_EQ("T:\\home", Folder(ShellFolder::kCommonAppData));
-    EXPECT_EQ("C:\\", Folder(ShellFolder::kWindows));
+    EXPECT_EACH(Folder(ShellFolder::kCommonAppData) == "T:\\home", Folder(ShellFolder::kWindows) == "C:\\");
 }
 
 TEST_F(Shell, TrashKeepsItemsAndWhereTheyCameFrom) {
     for (const char* content : {"first", "second"}) {
         drive_.Put("A file.txt", content);
-        EXPECT_TRUE(ShellTrash(drive_.Name("a FILE.txt").c_str()));
-        EXPECT_FALSE(fs::exists(drive_.Native("A file.txt")));
+        EXPECT_EACH(ShellTrash(drive_.Name("a FILE.txt").c_str()), !fs::exists(drive_.Native("A file.txt")));
     }
     const std::string trash = "home/.local/share/Trash/";
-    EXPECT_EQ("first", drive_.Get(trash + "files/A file.txt"));
-    EXPECT_EQ("second", drive_.Get(trash + "files/A file.txt.2"));
+    EXPECT_EACH(drive_.Get(trash + "files/A file.txt") == "first",
+                drive_.Get(trash + "files/A file.txt.2") == "second");
     std::string path = drive_.Native() + "/A%20file.txt";
     EXPECT_THAT(
         drive_.Get(trash + "info/A file.txt.2.trashinfo"),
         ::testing::MatchesRegex("\\[Trash Info\\]\nPath=" + path + "\nDeletionDate=....-..-..T..:..:..\nX-Tessel=1\n"));
     fs::create_directories(drive_.Native("folder/sub"));
-    EXPECT_TRUE(ShellTrash(drive_.Name("folder").c_str()));
-    EXPECT_TRUE(fs::exists(drive_.Native(trash + "files/folder/sub")));
-    EXPECT_FALSE(ShellTrash(drive_.Name("none").c_str()));
-    EXPECT_EQ(kErrorFileNotFound, LastError());
+    EXPECT_EACH(ShellTrash(drive_.Name("folder").c_str()), fs::exists(drive_.Native(trash + "files/folder/sub")),
+                !ShellTrash(drive_.Name("none").c_str()), LastError() == kErrorFileNotFound);
 }
 
 TEST_F(Shell, TrashOfOthersAndWhatTheyLeftThere) {
@@ -91,11 +84,9 @@ TEST_F(Shell, TrashOfOthersAndWhatTheyLeftThere) {
     drive_.Put("item", "kept");
     {
         test::FailingPlatform failing("mkdir", 2, EROFS, 100);  // none elsewhere either
-        EXPECT_FALSE(ShellTrash(drive_.Name("item").c_str()));
-        EXPECT_EQ(kErrorAccessDenied, LastError());
+        EXPECT_EACH(!ShellTrash(drive_.Name("item").c_str()), LastError() == kErrorAccessDenied);
     }
-    EXPECT_EQ("kept", drive_.Get("item"));
-    EXPECT_TRUE(fs::is_empty(drive_.Native("elsewhere")));
+    EXPECT_EACH(drive_.Get("item") == "kept", fs::is_empty(drive_.Native("elsewhere")));
 
     fs::remove(drive_.Native("home/.local/share/Trash"));
     for (const char* folder : {"files", "info"}) fs::create_directories(drive_.Native(trash + folder));
@@ -109,33 +100,6 @@ TEST_F(Shell, TrashOfOthersAndWhatTheyLeftThere) {
     EXPECT_EQ((std::set<std::string>{"item.trashinfo", "theirs.trashinfo"}), infos);
     drive_.Put(std::string(250, 'n'), "long");
     EXPECT_TRUE(ShellTrash(drive_.Name(std::string(250, 'n')).c_str()));
-}
-
-// After every failure the item is where it was and nothing is said of it, or both are in the trash.
-TEST_F(Shell, TrashingIsWholeOrNotAtAll) {
-    const std::string trash = "home/.local/share/Trash/";
-    drive_.Put("first", "");
-    ASSERT_TRUE(ShellTrash(drive_.Name("first").c_str()));
-    int failures = 0;
-    for (const char* call : {"open", "openat", "write", "fsync", "renameat2", "statx", "unlink", "flock", "opendir"}) {
-        for (int n = 1, calls = 1; n <= calls; ++n) {
-            SCOPED_TRACE(testing::Message() << call << ' ' << n);
-            drive_.Put("item", "x");
-            bool moved;
-            {
-                test::FailingPlatform failing(call, n, EIO);
-                moved = ShellTrash(drive_.Name("item").c_str());
-                calls = failing.Calls() < n ? 0 : n + 1;
-            }
-            failures += !moved;
-            EXPECT_EQ(moved, !fs::exists(drive_.Native("item")));
-            EXPECT_EQ(moved, fs::exists(drive_.Native(trash + "files/item")));
-            EXPECT_EQ(moved, fs::exists(drive_.Native(trash + "info/item.trashinfo")));
-            fs::remove(drive_.Native(trash + "files/item"));
-            fs::remove(drive_.Native(trash + "info/item.trashinfo"));
-        }
-    }
-    EXPECT_GT(failures, 15);
 }
 
 std::string Bytes(std::uint64_t value, int size) {
@@ -170,26 +134,23 @@ TEST_F(Shell, ShortcutsTellTheirTarget) {
     std::string environment =
         Bytes(788, 4) + Bytes(0xA0000001, 4) + std::string("%TESSEL_LNK%\\x") + std::string(766, '\0') + Bytes(0, 4);
     setenv("TESSEL_LNK", "C:\\env", 1);
-    const std::pair<std::string, std::string> rows[] = {
-        {Header(3) + idList + local, "C:\\folder\\a.txt"}, {Header(2) + wide, "C:\\\xC3\xA9"},
-        {Header(2) + network, "\\\\server\\share\\b\\c"},  {Header(4 | 8 | 0x80) + relative, "T:\\..\\b.txt"},
-        {Header(0x200) + environment, "C:\\env\\x"},
-    };
+    const std::pair<std::string, std::string> rows[] = {{Header(3) + idList + local, "C:\\folder\\a.txt"},
+                                                        {Header(2) + wide, "C:\\\xC3\xA9"},
+                                                        {Header(2) + network, "\\\\server\\share\\b\\c"},
+                                                        {Header(4 | 8 | 0x80) + relative, "T:\\..\\b.txt"},
+                                                        {Header(0x200) + environment, "C:\\env\\x"}};
     std::string target;
     for (const auto& [bytes, expected] : rows) {
         drive_.Put("a.lnk", bytes);
-        EXPECT_TRUE(ShellReadShortcut(drive_.Name("A.LNK").c_str(), target));
-        EXPECT_EQ(expected, target);
+        EXPECT_EACH(ShellReadShortcut(drive_.Name("A.LNK").c_str(), target), expected == target);
         for (std::size_t cut = 0; cut < bytes.size(); ++cut) ParseShortcut(bytes.substr(0, cut), "T:\\", target);
     }
     unsetenv("TESSEL_LNK");
     for (const std::string& bad : {std::string("no shortcut"), std::string(), Header(0), Header(3) + idList,
                                    Header(2) + std::string(28, '\xFF')}) {
-        EXPECT_FALSE(ParseShortcut(bad, "T:\\", target));
-        EXPECT_EQ(kErrorFileInvalid, LastError());
+        EXPECT_EACH(!ParseShortcut(bad, "T:\\", target), LastError() == kErrorFileInvalid);
     }
-    EXPECT_FALSE(ShellReadShortcut(drive_.Name("none.lnk").c_str(), target));
-    EXPECT_EQ(kErrorFileNotFound, LastError());
+    EXPECT_EACH(!ShellReadShortcut(drive_.Name("none.lnk").c_str(), target), LastError() == kErrorFileNotFound);
 }
 
 }  // namespace

@@ -1,15 +1,10 @@
-#include "support/ReportRecorder.h"
 #include "support/StartedPaths.h"
+#include "support/Test.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/streams/BinDataReader.h>
 #include <tessel/streams/BinDataWriter.h>
 
-#include <cstring>
-#include <functional>
-#include <gtest/gtest.h>
-#include <string>
-
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 using std::string_literals::operator""s;
@@ -28,8 +23,7 @@ protected:
         EXPECT_EQ(size, buffer.GetBytesWritten());
         PreflightOutputBuf counter;
         BinDataWriter counting(&counter, order);
-        EXPECT_EQ(size, write(counting));
-        EXPECT_EQ(size, counter.GetBytesWritten());
+        EXPECT_EACH(size == write(counting), size == counter.GetBytesWritten());
         return std::string(block, size);
     }
     // Whether all of the bytes, and no more, are read as what is expected.
@@ -85,8 +79,7 @@ TEST_F(BinData, ValuesInTheOrderOfTheStream) {
          [&](R& r) { return r.ReadBytes(nullptr, 2), r.Skip(1), r.ReadBytes(two, 2), std::string(two, 2) == "45"; },
          "12345", "12345"},
         {[](W& w) { return w.WriteU8(7) + w.Align(4) + w.Align(4); },
-         [](R& r) { return r.ReadU8() == 7 && (r.Align(4), true); }, "\7\0\0\0"s, "\7\0\0\0"s},
-    };
+         [](R& r) { return r.ReadU8() == 7 && (r.Align(4), true); }, "\7\0\0\0"s, "\7\0\0\0"s}};
     for (const auto& row : rows) {
         for (const auto& [order, bytes] : {std::pair{BigEndianizer(), row.big}, {LittleEndianizer(), row.little}}) {
             EXPECT_EQ(bytes, Written(order, row.write));
@@ -94,8 +87,7 @@ TEST_F(BinData, ValuesInTheOrderOfTheStream) {
         }
     }
     const std::string native = Written(NativeEndianizer(), [&](W& w) { return w.WriteFX(pi); });
-    EXPECT_EQ(10u, native.size());
-    EXPECT_TRUE(Read(NativeEndianizer(), native, readsPi));
+    EXPECT_EACH(native.size() == 10u, Read(NativeEndianizer(), native, readsPi));
 }
 
 TEST_F(BinData, PStrsArePadded) {
@@ -116,9 +108,7 @@ TEST_F(BinData, PStrsArePadded) {
 TEST_F(BinData, TheFirstErrorStays) {
     MemInputBuf in("\x01\x02\x03", 3);
     BinDataReader reader(&in, BigEndianizer());
-    EXPECT_EQ(0, reader.ReadI32());
-    EXPECT_EQ(kCorruptErr, reader.GetError());
-    EXPECT_EQ(0, reader.ReadU8());
+    EXPECT_EACH(reader.ReadI32() == 0, reader.GetError() == kCorruptErr, reader.ReadU8() == 0);
     char bytes[3] = {9, 9, 9};
     reader.ReadBytes(bytes, 2);
     EXPECT_EQ("\0\0\x9"s, std::string(bytes, 3));
@@ -133,11 +123,10 @@ TEST_F(BinData, TheFirstErrorStays) {
     {
         StaticOutputBuf out(bytes, 1);
         BinDataWriter writer(&out, BigEndianizer());
-        EXPECT_EQ(0u, writer.WriteI16(1));
+        EXPECT_EACH(writer.WriteI8(1) == 1u, writer.Align(4) == 0u, writer.GetError() == kCorruptErr,
+                    writer.WriteI16(1) == 0u, writer.Align(4) == 0u);
         PreflightOutputBuf other;
-        EXPECT_EQ(&out, writer.SetBuffer(&other));
-        EXPECT_EQ(0u, writer.WriteI8(1));
-        EXPECT_EQ(kCorruptErr, writer.GetError());
+        EXPECT_EACH(&out == writer.SetBuffer(&other), writer.WriteI8(1) == 0u, writer.GetError() == kCorruptErr);
     }
     EXPECT_TRUE(reports_.Has(0, "BinDataWriter finished with 74 error"));
 }
@@ -168,4 +157,4 @@ TEST_F(BinData, CountsOfStringsAreChecked) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,15 +1,11 @@
-#include "support/ReportRecorder.h"
+#include "memory/Heap.h"
 #include "support/StartedPaths.h"
+#include "support/Test.h"
 #include <tessel/memory/MemoryManager.h>
 #include <tessel/streams/InputBuf.h>
 #include <tessel/streams/OutputBuf.h>
 
-#include <cstring>
-#include <gtest/gtest.h>
-#include <memory>
-#include <string>
-
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 class Buffers : public ::testing::Test {
@@ -29,47 +25,38 @@ protected:
 TEST_F(Buffers, AMemoryBlockIsHandedOutPieceByPiece) {
     const char data[] = "abcdef";
     MemInputBuf buffer(data, 6);
-    EXPECT_EQ(nullptr, buffer.GetDataPointer(0, err_));
-    EXPECT_EQ(kNoErr, err_);
+    EXPECT_EACH(buffer.GetDataPointer(0, err_) == nullptr, err_ == kNoErr);
     uint32 available = 0;
-    EXPECT_EQ(data, buffer.GetDataPointer(4, err_, &available, 1));
-    EXPECT_EQ(4u, available);
-    EXPECT_EQ(0u, buffer.GetBytesRead());
-    EXPECT_EQ(data, buffer.GetDataPointer(4, err_));
-    EXPECT_EQ(data + 4, buffer.GetDataPointer(9, err_, &available));
-    EXPECT_EQ(2u, available);
-    EXPECT_EQ(6u, buffer.GetBytesRead());
-    EXPECT_EQ(nullptr, buffer.GetDataPointer(1, err_, &available));
-    EXPECT_EQ(0u, available);
-    EXPECT_EQ(kNoErr, err_);
-    EXPECT_EQ(6u, buffer.GetSize());
+    EXPECT_EACH(data == buffer.GetDataPointer(4, err_, &available, 1), available == 4u, buffer.GetBytesRead() == 0u,
+                data == buffer.GetDataPointer(4, err_), data + 4 == buffer.GetDataPointer(9, err_, &available),
+                available == 2u, buffer.GetBytesRead() == 6u, buffer.GetDataPointer(1, err_, &available) == nullptr,
+                available == 0u, err_ == kNoErr, buffer.GetSize() == 6u);
 }
 
 TEST_F(Buffers, ReadingPastTheEndStaysAnError) {
     {
         MemInputBuf buffer("abc", 3);
-        EXPECT_EQ(nullptr, buffer.GetDataPointer(4, err_));
-        EXPECT_EQ(kCorruptErr, err_);
-        EXPECT_EQ(nullptr, buffer.GetDataPointer(1, err_));
-        EXPECT_EQ(kCorruptErr, err_);
-        EXPECT_EQ(0u, buffer.GetSize());
+        EXPECT_EACH(buffer.GetDataPointer(4, err_) == nullptr, err_ == kCorruptErr,
+                    buffer.GetDataPointer(1, err_) == nullptr, err_ == kCorruptErr, buffer.GetSize() == 0u);
     }
-    EXPECT_TRUE(reports_.Has(0, "MemInputBuf finished with 74 error"));
-    EXPECT_EQ(0u, MemInputBuf(nullptr, 5).GetSize());
+    EXPECT_EACH(reports_.Has(0, "MemInputBuf finished with 74 error"), MemInputBuf(nullptr, 5).GetSize() == 0u);
 }
 
 TEST_F(Buffers, AStringHandleIsTakenOver) {
     LStrHandle text = Text("hello");
     LStrInputBuf buffer(text);
-    EXPECT_EQ(nullptr, text);
-    EXPECT_EQ(5u, buffer.GetSize());
-    EXPECT_EQ(0, std::memcmp(buffer.GetDataPointer(5, err_), "hello", 5));
+    EXPECT_EACH(text == nullptr, buffer.GetSize() == 5u, std::memcmp(buffer.GetDataPointer(5, err_), "hello", 5) == 0);
     LStrHandle back = buffer.ReleaseOwnership();
-    EXPECT_EQ(nullptr, buffer.GetDataPointer(1, err_));
-    EXPECT_EQ(kArgErr, err_);
-    (*back)->count = 1000;  // more than the handle holds
-    LStrInputBuf damaged(back);
-    EXPECT_EQ(5u, damaged.GetSize());
+    EXPECT_EACH(buffer.GetDataPointer(1, err_) == nullptr, err_ == kArgErr);
+    for (const auto& [count, size] : {std::pair{1000, 5u}, {-1, 0u}, {0, 0u}, {1, 1u}}) {  // 1000: more than it holds
+        (*back)->count = count;
+        LStrInputBuf damaged(back);
+        EXPECT_EQ(size, damaged.GetSize());
+        back = damaged.ReleaseOwnership();
+    }
+    DSDisposeHandle(reinterpret_cast<UHandle>(back));
+    LStrHandle bare = reinterpret_cast<LStrHandle>(DSNewHClr(LStrSize(0)));
+    EXPECT_EACH(std::unique_ptr<InputBuf>(CreateLStrInputBuf(bare))->GetSize() == 0u);
     LStrInputBuf empty(text);
     empty.GetDataPointer(0, err_);
     EXPECT_EQ(kArgErr, err_);
@@ -80,30 +67,22 @@ TEST_F(Buffers, AFixedBlockIsNotWrittenBeyond) {
     {
         StaticOutputBuf buffer(block, 3);
         std::memcpy(buffer.GetDataPointer(3, err_), "abc", 3);
-        EXPECT_EQ(nullptr, buffer.GetDataPointer(0, err_));
-        EXPECT_EQ(kNoErr, err_);
-        EXPECT_EQ(nullptr, buffer.GetDataPointer(1, err_));
-        EXPECT_EQ(kCorruptErr, err_);
-        EXPECT_EQ(3u, buffer.GetBytesWritten());
+        EXPECT_EACH(buffer.GetDataPointer(0, err_) == nullptr, err_ == kNoErr,
+                    buffer.GetDataPointer(1, err_) == nullptr, err_ == kCorruptErr, buffer.GetBytesWritten() == 3u);
     }
-    EXPECT_STREQ("abc##", block);
-    EXPECT_TRUE(reports_.Has(0, "StaticOutputBuf finished with 74 error"));
+    EXPECT_EACH(block == "abc##", reports_.Has(0, "StaticOutputBuf finished with 74 error"));
 }
 
 TEST_F(Buffers, AHandleGrowsByAQuarterWithinBounds) {
     HandleOutputBuf buffer(16);
     std::memset(buffer.GetDataPointer(100, err_), 'x', 100);
-    EXPECT_EQ(100u, buffer.GetBytesWritten());
     UHandle handle = buffer.GetHandle(0);
-    EXPECT_EQ(100u, DSGetHandleSize(handle));
+    EXPECT_EACH(buffer.GetBytesWritten() == 100u, DSGetHandleSize(handle) == 100u);
     buffer.GetDataPointer(30000, err_);  // grows: 4096 more at most
     EXPECT_EQ(30100u + 4096u, DSGetHandleSize(handle));
     handle = buffer.GetHandle(1);
-    EXPECT_EQ(30100u, DSGetHandleSize(handle));
-    EXPECT_EQ('x', (*handle)[99]);
-    EXPECT_EQ(nullptr, buffer.GetHandle(1));
-    EXPECT_EQ(nullptr, buffer.GetDataPointer(1, err_));
-    EXPECT_EQ(kArgErr, err_);
+    EXPECT_EACH(DSGetHandleSize(handle) == 30100u, (*handle)[99] == 'x', buffer.GetHandle(1) == nullptr,
+                buffer.GetDataPointer(1, err_) == nullptr, err_ == kArgErr);
     DSDisposeHandle(handle);
 }
 
@@ -113,19 +92,31 @@ TEST_F(Buffers, AStringHandleGrowsBehindItsCount) {
     std::memcpy(buffer.GetDataPointer(3, err_), "abc", 3);
     std::memset(buffer.GetDataPointer(2, err_), '!', 2);
     EXPECT_LE(9u, DSGetHandleSize(reinterpret_cast<UHandle>(room)));
+    EXPECT_EQ(room, buffer.GetHandle(0));
+    buffer.GetDataPointer(0, err_);
+    std::memset(buffer.GetDataPointer(100, err_), '?', 100);  // grows anew
+    EXPECT_LE(109u, DSGetHandleSize(reinterpret_cast<UHandle>(room)));
     LStrHandle text = buffer.GetHandle(1);
-    EXPECT_EQ(5, (*text)->count);
-    EXPECT_EQ(9u, DSGetHandleSize(reinterpret_cast<UHandle>(text)));
-    EXPECT_EQ(0, std::memcmp((*text)->bytes, "abc!!", 5));
+    EXPECT_EACH((*text)->count == 105, DSGetHandleSize(reinterpret_cast<UHandle>(text)) == 109u,
+                std::memcmp((*text)->bytes, "abc!!", 5) == 0);
     LStrOutputBuf resized(text, 1000);
     EXPECT_EQ(1004u, DSGetHandleSize(reinterpret_cast<UHandle>(text)));
 }
 
 TEST_F(Buffers, FactoriesMakeObjectsThatTheLibraryFrees) {
     LStrHandle text = Text("x");
-    EXPECT_EQ(2u, std::unique_ptr<InputBuf>(CreateMemInputBuf("ab", 2))->GetSize());
-    EXPECT_EQ(1u, std::unique_ptr<InputBuf>(CreateLStrInputBuf(text))->GetSize());
+    EXPECT_EACH(std::unique_ptr<InputBuf>(CreateMemInputBuf("ab", 2))->GetSize() == 2u,
+                std::unique_ptr<InputBuf>(CreateLStrInputBuf(text))->GetSize() == 1u);
     char block[4];
+    const auto taken = [](auto make) {
+        const uint64 before = heap::TotalAllocated();
+        auto* made = make();
+        const uint64 bytes = heap::TotalAllocated() - before;
+        delete made;
+        return bytes;
+    };
+    const uint64 plain = taken([] { return new HandleOutputBuf(4000); });
+    EXPECT_EACH(plain >= 4000u, plain == taken([] { return new LStrOutputBuf(3996); }));
     for (OutputBuf* made : std::initializer_list<OutputBuf*>{CreatePreflightOutputBuf(),
                                                              CreateStaticOutputBuf(block, 4), CreateLStrOutputBuf(4)}) {
         const std::unique_ptr<OutputBuf> output(made);
@@ -135,4 +126,4 @@ TEST_F(Buffers, FactoriesMakeObjectsThatTheLibraryFrees) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

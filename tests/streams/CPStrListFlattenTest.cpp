@@ -1,13 +1,11 @@
 #include "support/StartedPaths.h"
+#include "support/Test.h"
 #include <tessel/streams/BinDataReader.h>
 #include <tessel/streams/BinDataWriter.h>
 #include <tessel/strings/CPStrList.h>
 #include <tessel/strings/StringPStr.h>
 
-#include <gtest/gtest.h>
-#include <string>
-
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 class CPStrListFlatten : public testing::Test {
@@ -35,27 +33,23 @@ TEST_F(CPStrListFlatten, BytesOfBothOrders) {
     EXPECT_EQ("\0\0\0\0"s, Flattened(list, BigEndianizer()));
     for (const char* text : {"\2ab", "\0", "\1c"})
         EXPECT_EQ(kNoErr, list.Insert(reinterpret_cast<ConstPStr>(text), -1));
-    EXPECT_EQ("\0\0\0\3\2ab\0\1c"s, Flattened(list, BigEndianizer()));
-    EXPECT_EQ("\3\0\0\0\2ab\0\1c"s, Flattened(list, LittleEndianizer()));
+    EXPECT_EACH(Flattened(list, BigEndianizer()) == "\0\0\0\3\2ab\0\1c"s,
+                Flattened(list, LittleEndianizer()) == "\3\0\0\0\2ab\0\1c"s);
 
     CPStrList read;
-    EXPECT_EQ(kNoErr, read.Insert(reinterpret_cast<ConstPStr>("\3old"), 0));
-    EXPECT_EQ(kNoErr, UnFlatten(read, "\0\0\0\3\2ab\0\1c"s, BigEndianizer()));
-    EXPECT_TRUE(read.Equal(list));
-    EXPECT_EQ(kNoErr, UnFlatten(read, "\0\0\0\0"s, BigEndianizer()));
-    EXPECT_EQ(0, read.Count());
+    EXPECT_EACH(read.Insert(reinterpret_cast<ConstPStr>("\3old"), 0) == kNoErr,
+                UnFlatten(read, "\0\0\0\3\2ab\0\1c"s, BigEndianizer()) == kNoErr, read.Equal(list),
+                UnFlatten(read, "\0\0\0\0"s, BigEndianizer()) == kNoErr, read.Count() == 0);
 }
 
 TEST_F(CPStrListFlatten, StopsAtTheFirstError) {
     CPStrList list;
-    EXPECT_EQ(kCorruptErr, UnFlatten(list, "\0\0"s, BigEndianizer()));
-    EXPECT_EQ(0, list.Count());
-    EXPECT_EQ(kCorruptErr, UnFlatten(list, "\x7F\0\0\2\2ab\5c"s, BigEndianizer()));
-    EXPECT_EQ(1, list.Count());
-    EXPECT_TRUE(PStrEqual(list[0], reinterpret_cast<ConstPStr>("\2ab")));
+    EXPECT_EACH(UnFlatten(list, "\0\0"s, BigEndianizer()) == kCorruptErr, list.Count() == 0,
+                UnFlatten(list, "\x7F\0\0\2\2ab\5c"s, BigEndianizer()) == kCorruptErr, list.Count() == 1,
+                PStrEqual(list[0], reinterpret_cast<ConstPStr>("\2ab")));
     EXPECT_EQ(kNoErr, UnFlatten(list, "\xFF\xFF\xFF\xFF"s, BigEndianizer()));  // a count below 0
     EXPECT_EQ(0, list.Count());
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,46 +1,39 @@
+#include "support/Test.h"
 #include <tessel/streams/Endianizer.h>
 
 #include <array>
-#include <cstring>
-#include <gtest/gtest.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 using Bytes16 = std::array<uint8, 16>;
 
 TEST(ByteOrder, HelpersWorkInPlaceAtAnyAddress) {
     uint8 bytes[9] = {0xEE, 1, 2, 3, 4, 5, 6, 7, 8};
-    RevBQ(bytes + 1);
-    EXPECT_EQ(0, std::memcmp(bytes, "\xEE\x08\x07\x06\x05\x04\x03\x02\x01", 9));
-    uint32 halves = 0x11223344;
-    SwapWL(&halves);
-    EXPECT_EQ(0x33441122u, halves);
-    RevBL(&halves);
-    EXPECT_EQ(0x22114433u, halves);
+    uint32 halves = 0x11223344, reversed = 0x33441122;
     uint16 word = 0x1122;
+    RevBQ(bytes + 1);
+    SwapWL(&halves);
+    RevBL(&reversed);
     SwapBW(&word);
-    EXPECT_EQ(0x2211u, word);
+    EXPECT_EACH(std::memcmp(bytes, "\xEE\x08\x07\x06\x05\x04\x03\x02\x01", 9) == 0, halves == 0x33441122u,
+                reversed == 0x22114433u, word == 0x2211u);
 }
 
 TEST(Endianizer, IntegersInBothOrders) {
     const uint8 stream[16] = {0x81, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16};
-    EXPECT_EQ(int16(0x8102), BigEndianizer()->ToNative16(stream));
-    EXPECT_EQ(int16(0x0281), LittleEndianizer()->ToNative16(stream));
-    EXPECT_EQ(int32(0x81020304), BigEndianizer()->ToNative32(stream));
-    EXPECT_EQ(int32(0x04030281), NativeEndianizer()->ToNative32(stream));
+    EXPECT_EACH(int16(0x8102) == BigEndianizer()->ToNative16(stream),
+                int16(0x0281) == LittleEndianizer()->ToNative16(stream),
+                int32(0x81020304) == BigEndianizer()->ToNative32(stream),
+                int32(0x04030281) == NativeEndianizer()->ToNative32(stream));
     uint64 value;
+    uint8 all[16], back[16];
     BigEndianizer()->CopyToNative64(stream, &value);
-    EXPECT_EQ(0x8102030405060708u, value);
-    uint8 all[16];
     BigEndianizer()->CopyToNative128(stream, all);
-    for (int i = 0; i < 16; ++i) EXPECT_EQ(stream[15 - i], all[i]);
-    uint8 back[16];
     BigEndianizer()->FromNative128(all, back);
-    EXPECT_EQ(0, std::memcmp(stream, back, 16));
-    EXPECT_EQ(1, BigEndianizer()->IsSwapping());
-    EXPECT_EQ(0, LittleEndianizer()->IsSwapping());
-    EXPECT_EQ(0, NativeEndianizer()->IsSwapping());
+    EXPECT_EACH(value == 0x8102030405060708u, std::equal(all, all + 16, std::rbegin(stream)));
+    EXPECT_EACH(std::memcmp(stream, back, 16) == 0, BigEndianizer()->IsSwapping() == 1,
+                LittleEndianizer()->IsSwapping() == 0, NativeEndianizer()->IsSwapping() == 0);
 }
 
 floatExt Extended(uint16 signExponent, uint64 mantissa) {
@@ -62,17 +55,15 @@ TEST(Endianizer, ExtendedRealsInTheStandardForm) {
         little.fill(0xAA);
         BigEndianizer()->FromNativeFX(value, big.data());
         LittleEndianizer()->FromNativeFX(value, little.data());
-        EXPECT_EQ(bytes, big);
-        EXPECT_TRUE(std::equal(big.begin(), big.end(), little.rbegin()));
+        EXPECT_EACH(bytes == big, std::equal(big.begin(), big.end(), little.rbegin()));
         big[15] = 77;  // the last six bytes are not looked at
         const floatExt fromBig = BigEndianizer()->ToNativeFX(big.data());
         const floatExt fromLittle = LittleEndianizer()->ToNativeFX(little.data());
-        EXPECT_EQ(0, std::memcmp(&value, &fromBig, sizeof fromBig));
-        EXPECT_EQ(0, std::memcmp(&value, &fromLittle, sizeof fromLittle));
+        EXPECT_EACH(std::memcmp(&value, &fromBig, sizeof fromBig) == 0,
+                    std::memcmp(&value, &fromLittle, sizeof fromLittle) == 0);
     }
-    EXPECT_EQ(16u, BigEndianizer()->StreamFXSize());
-    EXPECT_EQ(10u, NativeEndianizer()->StreamFXSize());
+    EXPECT_EACH(BigEndianizer()->StreamFXSize() == 16u, NativeEndianizer()->StreamFXSize() == 10u);
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,22 +1,18 @@
 // The list forms: CPStr, CLStr, _LStrArray and CPStrList.
 #include "strings/Support.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include <tessel/strings/CPStrList.h>
 #include <tessel/strings/StringCLStr.h>
 #include <tessel/strings/StringCPStr.h>
 #include <tessel/strings/StringLStrArray.h>
 #include <tessel/strings/StringPStr.h>
 
-#include <algorithm>
-#include <cstring>
-#include <random>
-
 using namespace tessel;
 using namespace tessel::test;
 
 namespace {
 
-using Texts = std::vector<std::string>;
+using tessel::test::Texts;
 
 template <class T>
 std::string BlockOf(T** handle) {
@@ -48,18 +44,12 @@ Texts Elements(CPStrHandle list) {
 
 TEST(StringCPStr, LaysElementsEndToEnd) {
     CPStrHandle list = NewCPStr({"ab", "", "c"});
-    EXPECT_EQ(Bytes({3, 0, 0, 0, 2, 'a', 'b', 0, 1, 'c'}), BlockOf(list));
-    EXPECT_EQ(10u, CPStrSize(*list));
-    EXPECT_EQ("c", TextOf(CPStrIndex(list, 99)));
-    EXPECT_EQ("ab", TextOf(CPStrIndex(list, -1)));
-    EXPECT_EQ(kNoErr, CPStrClear(list));
-    EXPECT_EQ(Bytes({0, 0, 0, 0}), BlockOf(list));
-    EXPECT_EQ(kArgErr, CPStrRemove(list, 0));
-    EXPECT_EQ(kArgErr, CPStrReplace(list, P("x"), 0));
-    EXPECT_EQ(kNoErr, CPStrSetToNEmptyStrings(&list, 3));
-    EXPECT_EQ(Bytes({3, 0, 0, 0, 0, 0, 0}), BlockOf(list));
-    EXPECT_EQ(kArgErr, CPStrClear(nullptr));
-    EXPECT_EQ(kArgErr, CPStrSetToNEmptyStrings(nullptr, 1));
+    EXPECT_EACH(Bytes({3, 0, 0, 0, 2, 'a', 'b', 0, 1, 'c'}) == BlockOf(list), CPStrSize(*list) == 10u,
+                TextOf(CPStrIndex(list, 99)) == "c", TextOf(CPStrIndex(list, -1)) == "ab", CPStrClear(list) == kNoErr,
+                Bytes({0, 0, 0, 0}) == BlockOf(list), CPStrRemove(list, 0) == kArgErr,
+                CPStrReplace(list, P("x"), 0) == kArgErr, CPStrSetToNEmptyStrings(&list, 3) == kNoErr,
+                Bytes({3, 0, 0, 0, 0, 0, 0}) == BlockOf(list), CPStrClear(nullptr) == kArgErr,
+                CPStrSetToNEmptyStrings(nullptr, 1) == kArgErr);
     Dispose(list);
 }
 
@@ -86,28 +76,21 @@ TEST(StringCPStr, EditsLikeAVector) {
     }
     // Its own element as the one to insert.
     ASSERT_EQ(kNoErr, CPStrInsert(list, CPStrIndex(list, 1), 0));
-    EXPECT_EQ(model[1], TextOf(CPStrIndex(list, 0)));
-    EXPECT_EQ(CPStrSize(*list), DSGetHandleSize(reinterpret_cast<UHandle>(list)));
+    EXPECT_EACH(model[1] == TextOf(CPStrIndex(list, 0)),
+                CPStrSize(*list) == DSGetHandleSize(reinterpret_cast<UHandle>(list)));
 
     ReportRecorder reports;
-    EXPECT_EQ(kGenericErr, CPStrInsert(nullptr, P("x"), 0));
-    EXPECT_EQ(kGenericErr, CPStrInsert(list, nullptr, 0));
-    EXPECT_EQ(2u, reports.CountAt(kDebugError));
-    EXPECT_TRUE(reports.Has(kDebugError, "Bad inputs to CPStrInsertEfficient"));
+    EXPECT_EACH(CPStrInsert(nullptr, P("x"), 0) == kGenericErr, CPStrInsert(list, nullptr, 0) == kGenericErr,
+                reports.CountAt(kDebugError) == 2u, reports.Has(kDebugError, "Bad inputs to CPStrInsertEfficient"));
     Dispose(list);
 }
 
 TEST(StringCPStr, ComparesAndSearches) {
-    CPStrHandle a = NewCPStr({"one", "Two"});
-    CPStrHandle b = NewCPStr({"one", "two", "three"});
-    EXPECT_EQ('T' - 't', CPStrCmp(*a, *b));
-    EXPECT_FALSE(CPStrEqual(*a, *b));
-    EXPECT_EQ(kNoErr, CPStrReplace(a, P("two"), 1));
-    EXPECT_EQ(-1, CPStrCmp(*a, *b));
-    EXPECT_EQ(kNoErr, CPStrRemove(b, 2));
-    EXPECT_TRUE(CPStrEqual(*a, *b));
-    EXPECT_EQ(1, CPStrSearch(a, P("TWO"), PStrCaseCmp));
-    EXPECT_EQ(-1, CPStrSearch(a, P("TWO"), PStrCmp));
+    CPStrHandle a = NewCPStr({"one", "Two"}), b = NewCPStr({"one", "two", "three"});
+    EXPECT_EACH('T' - 't' == CPStrCmp(*a, *b), !CPStrEqual(*a, *b), CPStrReplace(a, P("two"), 1) == kNoErr,
+                CPStrCmp(*a, *b) == -1, CPStrRemove(b, 2) == kNoErr, CPStrEqual(*a, *b),
+                CPStrSearch(a, P("TWO"), PStrCaseCmp) == 1, CPStrSearch(a, P("TWO"), PStrCmp) == -1,
+                CPStrSearch(nullptr, P("x"), PStrCmp) == -1, CPStrSearch(a, P("x"), nullptr) == -1);
     Dispose(a);
     Dispose(b);
 
@@ -119,8 +102,8 @@ TEST(StringCPStr, ComparesAndSearches) {
     ReportRecorder reports;
     **resource = 3;  // more than there are
     StrPoundToCPStr(resource, reinterpret_cast<CPStrPtr>(room));
-    EXPECT_EQ(2, reinterpret_cast<CPStrPtr>(room)->count);
-    EXPECT_TRUE(reports.Has(kDebugError, "String list of 3 ends after 2"));
+    EXPECT_EACH(reinterpret_cast<CPStrPtr>(room)->count == 2,
+                reports.Has(kDebugError, "String list of 3 ends after 2"));
     DSDisposeHandle(resource);
 }
 
@@ -131,21 +114,16 @@ CLStrHandle NewCLStr() {
 
 TEST(StringCLStr, PadsElements) {
     CLStrHandle list = NewCLStr();
-    EXPECT_EQ(kNoErr, CLStrInsert(list, *L("hello"), 7, true));
-    EXPECT_EQ(Bytes({1, 0, 0, 0, 5, 0, 0, 0, 'h', 'e', 'l', 'l', 'o', 0, 0, 0}), BlockOf(list));
-    EXPECT_EQ(kNoErr, CLStrInsert(list, *L("four"), -3, true));
-    EXPECT_EQ(Bytes({2, 0, 0, 0, 4, 0, 0, 0, 'f', 'o', 'u', 'r', 5, 0, 0, 0, 'h', 'e', 'l', 'l', 'o', 0, 0, 0}),
-              BlockOf(list));
-    EXPECT_EQ("hello", TextOf(CLStrIndex(*list, 9)));
-    EXPECT_EQ("four", TextOf(CLStrIndex(*list, -9)));
+    EXPECT_EACH(CLStrInsert(list, *L("hello"), 7, true) == kNoErr,
+                Bytes({1, 0, 0, 0, 5, 0, 0, 0, 'h', 'e', 'l', 'l', 'o', 0, 0, 0}) == BlockOf(list),
+                CLStrInsert(list, *L("four"), -3, true) == kNoErr,
+                Bytes({2, 0, 0, 0, 4, 0, 0, 0, 'f', 'o', 'u', 'r', 5, 0, 0, 0, 'h', 'e', 'l', 'l', 'o', 0, 0, 0}) ==
+                    BlockOf(list),
+                TextOf(CLStrIndex(*list, 9)) == "hello", TextOf(CLStrIndex(*list, -9)) == "four");
     EXPECT_EQ(kNoErr, CLStrInsert(list, CLStrIndex(*list, 1), 0, true));  // its own element
     EXPECT_EQ("hello", TextOf(CLStrIndex(*list, 0)));
-    EXPECT_EQ(kNoErr, CLStrRemove(list, 0));
-    EXPECT_EQ(kNoErr, CLStrRemove(list, 0));
-    EXPECT_EQ(16u, CLStrSize(*list));
-    EXPECT_EQ(kNoErr, CLStrRemove(list, 0));
-    EXPECT_EQ(kArgErr, CLStrRemove(list, 0));
-    EXPECT_EQ(4u, CLStrSize(*list));
+    EXPECT_EACH(CLStrRemove(list, 0) == kNoErr, CLStrRemove(list, 0) == kNoErr, CLStrSize(*list) == 16u,
+                CLStrRemove(list, 0) == kNoErr, CLStrRemove(list, 0) == kArgErr, CLStrSize(*list) == 4u);
     Dispose(list);
 }
 
@@ -153,20 +131,14 @@ TEST(StringCLStr, KeepsASortedList) {
     CLStrHandle list = NewCLStr();
     int32 index = -1;
     bool inserted = false;
-    for (CStr text : {"m", "c", "x", "d"}) {
-        EXPECT_EQ(kNoErr, CLStrInsertSort(list, *L(text), false, &index, &inserted, false));
-        EXPECT_TRUE(inserted);
-        EXPECT_EQ(text, TextOf(CLStrIndex(*list, index)));
-    }
+    for (CStr text : {"m", "c", "x", "d"})
+        EXPECT_EACH(CLStrInsertSort(list, *L(text), false, &index, &inserted, false) == kNoErr, inserted,
+                    text == TextOf(CLStrIndex(*list, index)));
     Texts texts;
     for (int32 i = 0; i < (*list)->count; ++i) texts.push_back(TextOf(CLStrIndex(*list, i)));
-    EXPECT_EQ((Texts{"c", "d", "m", "x"}), texts);
-    EXPECT_EQ(kNoErr, CLStrInsertSort(list, *L("m"), false, &index, &inserted, true));
-    EXPECT_FALSE(inserted);
-    EXPECT_EQ(2, index);
-    EXPECT_EQ(kNoErr, CLStrInsertSort(list, *L("m"), true, &index, &inserted, true));
-    EXPECT_TRUE(inserted);
-    EXPECT_EQ(5, (*list)->count);
+    EXPECT_EACH(texts == (Texts{"c", "d", "m", "x"}),
+                CLStrInsertSort(list, *L("m"), false, &index, &inserted, true) == kNoErr, !inserted, index == 2,
+                CLStrInsertSort(list, *L("m"), true, &index, &inserted, true) == kNoErr, inserted, (*list)->count == 5);
     Dispose(list);
 }
 
@@ -176,8 +148,7 @@ TEST(StringCLStr, ConvertsTheByteOrder) {
     UHandle list = nullptr;
     ASSERT_EQ(kNoErr, DSSetHandleFromPtr(&list, stored.data(), 16));
     StdToCLStr(reinterpret_cast<CLStrHandle>(list));
-    EXPECT_EQ(Bytes({2, 0, 0, 0, 1, 0, 0, 0, 'a', 0, 0, 0, 0, 0, 0, 0}), BlockOf(list));
-    EXPECT_EQ(0u, reports.Count());
+    EXPECT_EACH(Bytes({2, 0, 0, 0, 1, 0, 0, 0, 'a', 0, 0, 0, 0, 0, 0, 0}) == BlockOf(list), reports.Count() == 0u);
     for (uint32 size : {0u, 3u, 6u, 9u, 11u, 12u}) {  // the last holds one element of two
         ASSERT_EQ(kNoErr, DSSetHandleFromPtr(&list, stored.data(), size));
         reports.Clear();
@@ -187,12 +158,11 @@ TEST(StringCLStr, ConvertsTheByteOrder) {
     EXPECT_EQ(1, (*reinterpret_cast<CLStrHandle>(list))->count);
     DSDisposeHandle(list);
 
-    EXPECT_EQ(nullptr, CLStrIndex(nullptr, 0));
-    EXPECT_EQ(kGenericErr, CLStrInsert(nullptr, nullptr, 0, true));
-    EXPECT_EQ(kGenericErr, CLStrInsertSort(nullptr, nullptr, true, nullptr, nullptr, true));
-    EXPECT_TRUE(reports.Has(kDebugFatal, "invalid buffer passed to CLStrIndex"));
-    EXPECT_TRUE(reports.Has(kDebugFatal, "Invalid dest buffer or insert buffer passed to CLStrInsert"));
-    EXPECT_TRUE(reports.Has(kDebugFatal, "Invalid dest buffer or insert buffer passed to CLStrInsertSort"));
+    EXPECT_EACH(CLStrIndex(nullptr, 0) == nullptr, CLStrInsert(nullptr, nullptr, 0, true) == kGenericErr,
+                CLStrInsertSort(nullptr, nullptr, true, nullptr, nullptr, true) == kGenericErr,
+                reports.Has(kDebugFatal, "invalid buffer passed to CLStrIndex"),
+                reports.Has(kDebugFatal, "Invalid dest buffer or insert buffer passed to CLStrInsert"),
+                reports.Has(kDebugFatal, "Invalid dest buffer or insert buffer passed to CLStrInsertSort"));
 }
 
 TEST(StringLStrArray, ConvertsToAndFromAList) {
@@ -200,9 +170,8 @@ TEST(StringLStrArray, ConvertsToAndFromAList) {
     LStrArrayHandle array = nullptr;
     ASSERT_EQ(kNoErr, tessel::CPStrPtrToLStrArray(*list, &array));
     ASSERT_EQ(3, (*array)->elementCount);
-    EXPECT_EQ(LStrArraySize(3), DSGetHandleSize(reinterpret_cast<UHandle>(array)));
-    EXPECT_EQ(nullptr, (*array)->element[1]);
-    EXPECT_EQ("three", TextOf(*(*array)->element[2]));
+    EXPECT_EACH(LStrArraySize(3) == DSGetHandleSize(reinterpret_cast<UHandle>(array)), (*array)->element[1] == nullptr,
+                TextOf(*(*array)->element[2]) == "three");
 
     ASSERT_EQ(kNoErr, ReallocLStrArrayHandle(&array, 5));
     EXPECT_EQ(nullptr, (*array)->element[4]);
@@ -211,54 +180,33 @@ TEST(StringLStrArray, ConvertsToAndFromAList) {
     ASSERT_EQ(kNoErr, tessel::LStrArrayToCPStrHandle(array, &back));
     EXPECT_EQ((Texts{"one", "", "three", std::string(255, 'x'), ""}), Elements(back));
     ASSERT_EQ(kNoErr, LStrArrayToCPStrHandle(array, 1, &back));
-    EXPECT_EQ(Bytes({1, 0, 0, 0, 3, 'o', 'n', 'e'}), BlockOf(back));
-    EXPECT_EQ(kArgErr, LStrArrayToCPStrHandle(array, 6, &back));
-    EXPECT_EQ(kNoErr, LStrArrayToCPStrHandle(nullptr, 3, &back));
-    EXPECT_EQ(nullptr, back);
+    EXPECT_EACH(Bytes({1, 0, 0, 0, 3, 'o', 'n', 'e'}) == BlockOf(back),
+                LStrArrayToCPStrHandle(array, 6, &back) == kArgErr, LStrArrayToCPStrHandle(nullptr, 3, &back) == kNoErr,
+                back == nullptr);
 
     ASSERT_EQ(kNoErr, CPStrPtrToLStrArray(*list, 2, &array));  // the old array is released
-    EXPECT_EQ(2, (*array)->elementCount);
-    EXPECT_EQ(kArgErr, CPStrPtrToLStrArray(*list, 4, &array));
-    EXPECT_EQ(kNoErr, tessel::CPStrPtrToLStrArray(nullptr, &array));
-    EXPECT_EQ(nullptr, array);
-    EXPECT_EQ(kArgErr, ReallocLStrArrayHandle(nullptr, 1));
+    EXPECT_EACH((*array)->elementCount == 2, CPStrPtrToLStrArray(*list, 4, &array) == kArgErr,
+                tessel::CPStrPtrToLStrArray(nullptr, &array) == kNoErr, array == nullptr,
+                ReallocLStrArrayHandle(nullptr, 1) == kArgErr);
     ReportRecorder reports;
-    EXPECT_EQ(kGenericErr, CPStrPtrToLStrArray(*list, 2, nullptr));
-    EXPECT_TRUE(reports.Has(kDebugError, "Null not allowed"));
+    EXPECT_EACH(CPStrPtrToLStrArray(*list, 2, nullptr) == kGenericErr, reports.Has(kDebugError, "Null not allowed"));
     Dispose(list);
 }
 
 TEST(CPStrList, OwnsItsElements) {
     CPStrList list;
-    EXPECT_EQ(nullptr, list[0]);
-    EXPECT_EQ(kArgErr, list.Insert(nullptr, 0));
-    EXPECT_EQ(nullptr, list.Handle());
-    EXPECT_EQ(kNoErr, list.Insert(P("b"), -1));
-    EXPECT_EQ(kNoErr, list.Insert(P("c"), -1));
-    EXPECT_EQ(kNoErr, list.Insert(P("a"), 0));
-    EXPECT_EQ((Texts{"a", "b", "c"}), Elements(list.Handle()));
-    EXPECT_EQ(kNoErr, list.Delete(1));
-    EXPECT_EQ("c", TextOf(list[5]));
+    EXPECT_EACH(list[0] == nullptr, list.Insert(nullptr, 0) == kArgErr, list.Handle() == nullptr,
+                list.Insert(P("b"), -1) == kNoErr, list.Insert(P("c"), -1) == kNoErr, list.Insert(P("a"), 0) == kNoErr,
+                Elements(list.Handle()) == (Texts{"a", "b", "c"}), list.Delete(1) == kNoErr, TextOf(list[5]) == "c");
 
     CPStrList copy(*list.Handle());
-    EXPECT_EQ(0, copy.Compare(list));
-    EXPECT_TRUE(copy.Equal(list));
-    EXPECT_EQ(kNoErr, copy.Copy(copy));
-    EXPECT_EQ(kNoErr, CPStrReplace(copy.Handle(), P("C"), 1));
-    EXPECT_EQ('C' - 'c', copy.Compare(list));
-    EXPECT_EQ(0, copy.CompareNC(list));
-    EXPECT_EQ(0, copy.CompareFS(list));
-    EXPECT_FALSE(copy.Equal(list));
-    EXPECT_TRUE(copy.EqualNC(list));
-    EXPECT_EQ(kNoErr, copy.Insert(P("more"), -1));
-    EXPECT_EQ(1, copy.CompareNC(list));
-    EXPECT_FALSE(copy.EqualNC(list));
-    EXPECT_EQ(kNoErr, copy.Copy(static_cast<const CPStr*>(nullptr)));
-    EXPECT_EQ(0, copy.Count());
+    EXPECT_EACH(copy.Compare(list) == 0, copy.Equal(list), copy.Copy(copy) == kNoErr,
+                CPStrReplace(copy.Handle(), P("C"), 1) == kNoErr, 'C' - 'c' == copy.Compare(list),
+                copy.CompareNC(list) == 0, copy.CompareFS(list) == 0, !copy.Equal(list), copy.EqualNC(list),
+                copy.Insert(P("more"), -1) == kNoErr, copy.CompareNC(list) == 1, !copy.EqualNC(list),
+                copy.Copy(static_cast<const CPStr*>(nullptr)) == kNoErr, copy.Count() == 0);
     CPStrList none;
-    EXPECT_TRUE(copy.Equal(none));
-    EXPECT_EQ(kNoErr, none.ForceAllocate());
-    EXPECT_EQ(Bytes({0, 0, 0, 0}), BlockOf(none.Handle()));
+    EXPECT_EACH(copy.Equal(none), none.ForceAllocate() == kNoErr, Bytes({0, 0, 0, 0}) == BlockOf(none.Handle()));
 }
 
 }  // namespace

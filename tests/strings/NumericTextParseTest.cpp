@@ -1,28 +1,16 @@
 // Text to numbers.
+#include "support/Test.h"
 #include <tessel/numerics/FloatingPointConstants.h>
 #include <tessel/numerics/FloatingPointRegisters.h>
 #include <tessel/strings/NumericText.h>
 
+#include <bit>
 #include <cerrno>
 #include <cinttypes>
 #include <cmath>
 #include <cstdio>
-#include <cstdlib>
-#include <cstring>
-#include <gtest/gtest.h>
-#include <random>
-#include <string>
-#include <string_view>
-#include <vector>
 
 namespace {
-
-// The digits of a record as an integer.
-int64 DigitsOf(const PackedDecimal& record) {
-    int64 digits = 0;
-    for (int i = 8; i >= 0; --i) digits = 100 * digits + (record.mantissa[i] >> 4) * 10 + (record.mantissa[i] & 15);
-    return digits;
-}
 
 double ValueOf(const PackedDecimal& record) {
     double value = 0;
@@ -31,68 +19,30 @@ double ValueOf(const PackedDecimal& record) {
     return value;
 }
 
-TEST(NumericTextParse, RealsIntoRecords) {
-    const struct {
-        std::string_view text;
-        bool whole;
-        int64 digits;
-        int exponent;
-        int count;
-        bool negative = false;
-    } cases[] = {
-        {"-12.5e3", true, 125, 2, 3, true},
-        {"12abc", false, 12, 0, 2},
-        {"  12", false, 12, 0, 2},
-        {"12  ", true, 12, 0, 2},
-        {"1 234", false, 1, 0, 1},  // a digit after a space ends the number
-        {"1 e3", true, 1, 3, 1},
-        {"1.5 3", true, 15, -1, 2},
-        {"0.00125", true, 125, -5, 3},
-        {"1e12345", true, 1, 1234, 1},
-        {"007", true, 7, 0, 1},
-        {"+ 3", true, 3, 0, 1},
-        {"++3", false, 0, 0, 1},
-        {"-0", true, 0, 0, 1, true},
-        {"", true, 0, 0, 1},
-        {"abc", false, 0, 0, 1},
-        {"3e", true, 3, 0, 1},
-        {"3e+", true, 3, 0, 1},
-        {"3e- 2", true, 3, -2, 1},
-        {"3e-2x", false, 3, -2, 1},
-        {"3;5", true, 35, -1, 2},  // the decimal point given
-        {"3,5", false, 3, 0, 1},
-        {"123456789012345678901", true, 123456789012345678, 3, 18},
-        {"0.000123456789012345678901", true, 123456789012345678, -21, 18},
-        {std::string_view("5\0"
-                          "7",
-                          3),
-         true, 5, 0, 1},  // a zero byte ends the text
-    };
-    for (const auto& c : cases) {
-        PackedDecimal record;
-        EXPECT_EQ(StringToPacked(c.text.data(), static_cast<int32>(c.text.size()), &record, ';'), c.whole) << c.text;
-        EXPECT_EQ(DigitsOf(record), c.digits) << c.text;
-        EXPECT_EQ(record.exponent, c.exponent) << c.text;
-        EXPECT_EQ(record.mdigits, c.count) << c.text;
-        EXPECT_EQ(record.sign, c.negative ? 0x80 : 0) << c.text;
-    }
+// What a text is read as: its digits, the exponent and how many there are; a mark where not all of it is a number.
+std::string Read(std::string_view text) {
+    PackedDecimal record;
+    const bool whole = StringToPacked(text.data(), static_cast<int32>(text.size()), &record, ';');
+    int64 digits = 0;
+    for (int i = 8; i >= 0; --i) digits = 100 * digits + (record.mantissa[i] >> 4) * 10 + (record.mantissa[i] & 15);
+    return (record.sign == 0x80 ? "-" : "") + std::to_string(digits) + "e" + std::to_string(record.exponent) + ":" +
+           std::to_string(record.mdigits) + (whole ? "" : "?");
 }
 
-TEST(NumericTextParse, SpecialValues) {
-    const struct {
-        std::string_view text;
-        bool whole;
-        int exponent;
-        bool negative = false;
-    } cases[] = {{"inf", true, 32767},    {"-Inf", true, 32767, true}, {"infinity", false, 32767},
-                 {"NaN", true, 32766},    {"-nan", true, 32766, true}, {"in", false, 0},
-                 {"x inf", false, 32767}, {"+nano", false, 32766}};
-    for (const auto& c : cases) {
-        PackedDecimal record;
-        EXPECT_EQ(StringToPacked(c.text.data(), static_cast<int32>(c.text.size()), &record, '.'), c.whole) << c.text;
-        EXPECT_EQ(record.exponent, c.exponent) << c.text;
-        EXPECT_EQ(record.sign, c.negative ? 0x80 : 0) << c.text;
-    }
+TEST(NumericTextParse, RealsIntoRecords) {
+    EXPECT_EACH(Read("-12;5e3") == "-125e2:3", Read("12abc") == "12e0:2?", Read("  12") == "12e0:2?",
+                Read("12  ") == "12e0:2", Read("1 234") == "1e0:1?", Read("1 e3") == "1e3:1",
+                Read("1;5 3") == "15e-1:2", Read("0;00125") == "125e-5:3", Read("1e12345") == "1e1234:1",
+                Read("007") == "7e0:1", Read("+ 3") == "3e0:1", Read("++3") == "0e0:1?", Read("-0") == "-0e0:1",
+                Read("") == "0e0:1", Read("abc") == "0e0:1?");
+    EXPECT_EACH(Read("3e") == "3e0:1", Read("3e+") == "3e0:1", Read("3e- 2") == "3e-2:1", Read("3e-2x") == "3e-2:1?",
+                Read("3;5") == "35e-1:2", Read("3,5") == "3e0:1?",
+                Read("123456789012345678901") == "123456789012345678e3:18",
+                Read("0;000123456789012345678901") == "123456789012345678e-21:18",
+                Read({"5\0007", 3}) == "5e0:1");  // a zero byte ends the text
+    EXPECT_EACH(Read("inf") == "0e32767:1", Read("-Inf") == "-0e32767:1", Read("infinity") == "0e32767:1?",
+                Read("NaN") == "0e32766:1", Read("-nan") == "-0e32766:1", Read("in") == "0e0:1?",
+                Read("x inf") == "0e32767:1?", Read("+nano") == "0e32766:1?");
 }
 
 // Eighteen digits or fewer: nothing is cut, so the value is strtod's.
@@ -124,9 +74,7 @@ TEST(NumericTextParse, RandomRealsAgreeWithStrtod) {
 TEST(NumericTextParse, SeventeenDigitsComeBackAsTheSameDouble) {
     std::mt19937_64 random(22);
     for (int i = 0; i < 50000; ++i) {
-        const uint64 bits = random();
-        double value = 0;
-        std::memcpy(&value, &bits, sizeof value);
+        const auto value = std::bit_cast<double>(uint64{random()});
         if (!std::isfinite(value)) continue;
         char text[64];
         const int16 format = 17;
@@ -139,75 +87,59 @@ TEST(NumericTextParse, SeventeenDigitsComeBackAsTheSameDouble) {
 
 // ---- integers -------------------------------------------------------------------------------------------------------
 
-struct IntegerCase {
-    std::string_view text;
-    int16 type;
-    int32 radix;
-    int64 value;
-    size_t read;
-    bool noSign = false;
+class StringSource final : public tessel::CharacterSource {
+public:
+    explicit StringSource(std::string_view text) : text_(text) {}
+    uint8 Current() const override { return static_cast<uint8>(text_.at(at_)); }  // throws beyond the text
+    void Advance() override { ++at_; }
+    void StepBack(int32 count) override { at_ -= static_cast<size_t>(count); }
+    size_t At() const { return at_; }
+
+private:
+    std::string_view text_;
+    size_t at_ = 0;
 };
 
-constexpr IntegerCase kIntegerCases[] = {
-    {"300", kNumInt8, 10, 127, 3},
-    {"-300", kNumInt8, 10, -128, 4},
-    {"FF", kNumInt8, 16, 255, 2},
-    {"1FF", kNumInt8, 16, 127, 3},
-    {"1FFFF", kNumUInt16, 16, 0xFFFF, 5},
-    {"   ", kNumInt32, 10, 0, 0},
-    {"  +x", kNumInt32, 10, 0, 0},
-    {"99999999999", kNumInt32, 10, 2147483647, 11},
-    {"-99999999999", kNumInt32, 10, -2147483648LL, 12},
-    {"-2147483648", kNumInt32, 10, -2147483648LL, 11},
-    {"ffffffff", kNumInt32, 16, -1, 8},
-    {"1ffffffff", kNumInt32, 16, 0x7FFFFFFF, 9},
-    {"-1", kNumInt16, 16, -1, 2},
-    {"-F", kNumUInt8, 16, -15, 2},
-    {"-5", kNumUInt8, 10, 0, 2},
-    {"-5", kNumUInt8, 10, 0, 0, true},
-    {"  42 ", kNumUInt8, 10, 42, 4},
-    {"1289", kNumInt32, 8, 10, 2},
-    {"zZ/", kNumInt32, 36, 35 * 36 + 35, 2},
-    {"12", kNumInt32, 1, 0, 0},
-};
-
-TEST(NumericTextParse, IntegersOfUpTo32Bits) {
-    for (const IntegerCase& c : kIntegerCases) {
-        const char* cursor = c.text.data();
-        const auto length = static_cast<int32>(c.text.size());
-        EXPECT_EQ(StringToNum32(&cursor, length, c.type, c.radix, c.noSign), c.value) << c.text;
-        EXPECT_EQ(static_cast<size_t>(cursor - c.text.data()), c.read) << c.text;
-    }
-    const char* cursor = "4294967299";
-    EXPECT_EQ(static_cast<uint32>(StringToNum32(&cursor, 10, kNumUInt32, 10, false)), 4294967295u);
-    cursor = "123456";
-    EXPECT_EQ(StringToNum32(&cursor, 3, kNumInt32, 10, false), 123) << "no further than the length";
+// Whether so much of a text is read as a value, from memory and from a source.
+bool Reads(std::string_view text, int16 type, int32 radix, int64 value, size_t read, bool noSign = false) {
+    const char* cursor = text.data();
+    const auto length = static_cast<int32>(text.size());
+    StringSource source(text);
+    return StringToNum32(&cursor, length, type, radix, noSign) == value && cursor == text.data() + read &&
+           tessel::StringToNumL(source, length, type, radix, noSign) == value && source.At() == read;
 }
 
-TEST(NumericTextParse, IntegersOf64Bits) {
-    const struct {
-        std::string_view text;
-        int16 type;
-        int32 radix;
-        uint64 value;
-    } cases[] = {
-        {"99999999999999999999", kNumInt64, 10, 0x7FFFFFFFFFFFFFFF},
-        {"-99999999999999999999", kNumInt64, 10, 0x8000000000000000},
-        {"18446744073709551615", kNumUInt64, 10, 0xFFFFFFFFFFFFFFFF},
-        {"18446744073709551616", kNumUInt64, 10, 0xFFFFFFFFFFFFFFFF},
-        {"FFFFFFFFFFFFFFFE", kNumInt64, 16, 0xFFFFFFFFFFFFFFFE},
-        {"1FFFFFFFFFFFFFFFE", kNumInt64, 16, 0x7FFFFFFFFFFFFFFF},
-        {"FFFFFFFF", kNumUInt32, 16, 0xFFFFFFFF},
-        {"-7", kNumInt8, 10, static_cast<uint64>(-7)},
-        {"-F", kNumUInt8, 16, static_cast<uint64>(-15)},
-        {"-1FFFF", kNumUInt16, 16, static_cast<uint64>(-0xFFFF)},
-    };
-    for (const auto& c : cases) {
-        const char* cursor = c.text.data();
-        const int64 value = StringToNum64(&cursor, static_cast<int32>(c.text.size()), c.type, c.radix, false);
-        EXPECT_EQ(static_cast<uint64>(value), c.value) << c.text;
-        EXPECT_EQ(cursor, c.text.data() + c.text.size());
-    }
+// The same of a whole text and 64 bits.
+bool ReadsAll(std::string_view text, int16 type, int32 radix, uint64 value) {
+    const char* cursor = text.data();
+    const auto length = static_cast<int32>(text.size());
+    StringSource source(text);
+    return static_cast<uint64>(StringToNum64(&cursor, length, type, radix, false)) == value &&
+           cursor == text.data() + text.size() &&
+           static_cast<uint64>(tessel::StringToNumQ(source, length, type, radix, false)) == value;
+}
+
+TEST(NumericTextParse, Integers) {
+    EXPECT_EACH(Reads("300", kNumInt8, 10, 127, 3), Reads("-300", kNumInt8, 10, -128, 4),
+                Reads("FF", kNumInt8, 16, 255, 2), Reads("1FF", kNumInt8, 16, 127, 3),
+                Reads("1FFFF", kNumUInt16, 16, 0xFFFF, 5), Reads("   ", kNumInt32, 10, 0, 0),
+                Reads("  +x", kNumInt32, 10, 0, 0), Reads("99999999999", kNumInt32, 10, 2147483647, 11),
+                Reads("-99999999999", kNumInt32, 10, -2147483648LL, 12),
+                Reads("-2147483648", kNumInt32, 10, -2147483648LL, 11), Reads("ffffffff", kNumInt32, 16, -1, 8),
+                Reads("1ffffffff", kNumInt32, 16, 0x7FFFFFFF, 9));
+    EXPECT_EACH(Reads("-1", kNumInt16, 16, -1, 2), Reads("-F", kNumUInt8, 16, -15, 2), Reads("-5", kNumUInt8, 10, 0, 2),
+                Reads("-5", kNumUInt8, 10, 0, 0, true), Reads("  42 ", kNumUInt8, 10, 42, 4),
+                Reads("1289", kNumInt32, 8, 10, 2), Reads("zZ/", kNumInt32, 36, 35 * 36 + 35, 2),
+                Reads("12", kNumInt32, 1, 0, 0), Reads("4294967299", kNumUInt32, 10, -1, 10),
+                Reads(std::string_view("123456", 3), kNumInt32, 10, 123, 3));
+    EXPECT_EACH(ReadsAll("99999999999999999999", kNumInt64, 10, 0x7FFFFFFFFFFFFFFF),
+                ReadsAll("-99999999999999999999", kNumInt64, 10, 0x8000000000000000),
+                ReadsAll("18446744073709551615", kNumUInt64, 10, 0xFFFFFFFFFFFFFFFF),
+                ReadsAll("18446744073709551616", kNumUInt64, 10, 0xFFFFFFFFFFFFFFFF),
+                ReadsAll("FFFFFFFFFFFFFFFE", kNumInt64, 16, 0xFFFFFFFFFFFFFFFE),
+                ReadsAll("1FFFFFFFFFFFFFFFE", kNumInt64, 16, 0x7FFFFFFFFFFFFFFF),
+                ReadsAll("FFFFFFFF", kNumUInt32, 16, 0xFFFFFFFF), ReadsAll("-7", kNumInt8, 10, ~uint64{6}),
+                ReadsAll("-F", kNumUInt8, 16, ~uint64{14}), ReadsAll("-1FFFF", kNumUInt16, 16, ~uint64{0xFFFE}));
 }
 
 TEST(NumericTextParse, RandomIntegersAgreeWithStrtoll) {
@@ -232,43 +164,17 @@ TEST(NumericTextParse, RandomIntegersAgreeWithStrtoll) {
     }
 }
 
-class StringSource final : public tessel::CharacterSource {
-public:
-    explicit StringSource(std::string_view text) : text_(text) {}
-    uint8 Current() const override { return static_cast<uint8>(text_.at(at_)); }  // throws beyond the text
-    void Advance() override { ++at_; }
-    void StepBack(int32 count) override { at_ -= static_cast<size_t>(count); }
-    size_t At() const { return at_; }
-
-private:
-    std::string_view text_;
-    size_t at_ = 0;
-};
-
-TEST(NumericTextParse, SourcesParseAsMemoryDoes) {
-    for (const IntegerCase& c : kIntegerCases) {
-        const auto length = static_cast<int32>(c.text.size());
-        StringSource source(c.text);
-        EXPECT_EQ(tessel::StringToNumL(source, length, c.type, c.radix, c.noSign), c.value) << c.text;
-        EXPECT_EQ(source.At(), c.read) << c.text;
-    }
-    StringSource source("-99999999999999999999");
-    EXPECT_EQ(tessel::StringToNumQ(source, 21, kNumInt64, 10, false), INT64_MIN);
-}
-
 TEST(NumericTextParse, ClassifiesReals) {
-    const struct {
-        double value;
-        int32 kind;
-    } cases[] = {{1.5, kFloatFinite}, {INFINITY, kFloatInfinity}, {-INFINITY, kFloatNegInfinity}, {-NAN, kFloatNaN}};
-    for (const auto& c : cases) {
-        const auto single = static_cast<float>(c.value);
-        EXPECT_EQ(ClassifyFloatNumber(&c.value, kNumDouble), c.kind);
-        EXPECT_EQ(ClassifyFloatNumber(&single, kNumSingle), c.kind);
-        EXPECT_EQ(ClassifyFloatNumber(&c.value, kNumComplexDouble), kFloatFinite) << "other types are finite";
+    const double values[] = {1.5, INFINITY, -INFINITY, -NAN};
+    const int32 kinds[] = {kFloatFinite, kFloatInfinity, kFloatNegInfinity, kFloatNaN};
+    for (int i = 0; i < 4; ++i) {
+        const auto single = static_cast<float>(values[i]);
+        EXPECT_EACH(ClassifyFloatNumber(&values[i], kNumDouble) == kinds[i],
+                    ClassifyFloatNumber(&single, kNumSingle) == kinds[i],
+                    ClassifyFloatNumber(&values[i], kNumComplexDouble) == kFloatFinite);  // other types are finite
     }
-    EXPECT_EQ(ClassifyFloatNumber(ENaN(), kNumExtended), kFloatNaN);
-    EXPECT_EQ(ClassifyFloatNumber(ENegInfinity(), kNumExtended), kFloatNegInfinity);
+    EXPECT_EACH(ClassifyFloatNumber(ENaN(), kNumExtended) == kFloatNaN,
+                ClassifyFloatNumber(ENegInfinity(), kNumExtended) == kFloatNegInfinity);
 }
 
 }  // namespace

@@ -1,6 +1,6 @@
 // Numbers to text.
 #include "numerics/Extended.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include <tessel/numerics/NumericSupport.h>
 #include <tessel/strings/NumericText.h>
 
@@ -8,18 +8,12 @@
 #include <cinttypes>
 #include <cmath>
 #include <cstdio>
-#include <cstring>
-#include <gtest/gtest.h>
 #include <limits>
-#include <random>
-#include <string>
-#include <tuple>
 #include <type_traits>
-#include <vector>
 
 namespace {
 
-using tessel::test::ReportRecorder;
+using namespace tessel::test;
 
 template <class T>
 constexpr int16 kCode = std::is_class_v<T>         ? kNumComplexDouble
@@ -50,32 +44,24 @@ std::string IntText(T value, int32 radix, bool isSigned, int32 size = kSize) {
 // ---- integer formats ------------------------------------------------------------------------------------------------
 
 TEST(NumericTextRender, IntegersInEveryRadix) {
-    EXPECT_EQ(IntText<int32>(-255, 16, true), "FFFFFF01");
-    EXPECT_EQ(IntText<int32>(-255, 10, true), "-255");
-    EXPECT_EQ(IntText<int32>(-255, 10, false), "4294967041");
-    EXPECT_EQ(IntText<int64>(std::numeric_limits<int64>::min(), 10, true), "-9223372036854775808");
-    EXPECT_EQ(IntText<uint64>(~uint64{0}, 2, false), std::string(64, '1'));
-    EXPECT_EQ(IntText<int16>(-1, 8, true), "177777");
-    EXPECT_EQ(IntText<int32>(5, 7, true), "") << "a radix without digits";
-    EXPECT_EQ(Text<int8>(-1, kFormatHex), "FF");
-    EXPECT_EQ(Text<uint16>(0x1234, kFormatHex), "1234");
-    EXPECT_EQ(Text<int64>(-2, kFormatHex), "FFFFFFFFFFFFFFFE");
-    EXPECT_EQ(Text<uint8>(200, kFormatDecimal), "200") << "unsigned types stay unsigned";
-    EXPECT_EQ(Text<int8>(-56, kFormatUnsigned), "200");
-    EXPECT_EQ(Text<int32>(8, kFormatOctal), "10");
-    EXPECT_EQ(Text<int32>(5, kFormatBinary), "101");
+    EXPECT_EACH(IntText<int32>(-255, 16, true) == "FFFFFF01", IntText<int32>(-255, 10, true) == "-255",
+                IntText<int32>(-255, 10, false) == "4294967041",
+                IntText<int64>(std::numeric_limits<int64>::min(), 10, true) == "-9223372036854775808",
+                IntText<uint64>(~uint64{0}, 2, false) == std::string(64, '1'), IntText<int16>(-1, 8, true) == "177777");
+    EXPECT_EACH(IntText<int32>(5, 7, true) == "", Text<int8>(-1, kFormatHex) == "FF",
+                Text<uint16>(0x1234, kFormatHex) == "1234", Text<int64>(-2, kFormatHex) == "FFFFFFFFFFFFFFFE");
+    EXPECT_EACH(Text<uint8>(200, kFormatDecimal) == "200", Text<int8>(-56, kFormatUnsigned) == "200",
+                Text<int32>(8, kFormatOctal) == "10", Text<int32>(5, kFormatBinary) == "101");
 }
 
 TEST(NumericTextRender, RealsInIntegerFormats) {
-    EXPECT_EQ(Text(2.5, kFormatDecimal), "2");
-    EXPECT_EQ(Text(1e10, kFormatDecimal), "2147483647");
-    EXPECT_EQ(Text(-1.0, kFormatUnsigned), "0");
-    EXPECT_EQ(Text(-1.0, kFormatHex), "FFFFFFFFFFFFFFFF");
-    EXPECT_EQ(Text(1e19, kFormatHex), "8AC7230489E80000");
+    EXPECT_EACH(Text(2.5, kFormatDecimal) == "2", Text(1e10, kFormatDecimal) == "2147483647",
+                Text(-1.0, kFormatUnsigned) == "0", Text(-1.0, kFormatHex) == "FFFFFFFFFFFFFFFF",
+                Text(1e19, kFormatHex) == "8AC7230489E80000");
     ReportRecorder reports;
-    EXPECT_EQ(Text(cmplx128{255, 3}, kFormatHex), "FF");
-    EXPECT_TRUE(reports.Has(3, "Complex number can't be shown in bin/hex/oct"));
-    EXPECT_EQ(Text(cmplx128{-7, 3}, kFormatDecimal), "-7");
+    EXPECT_EACH(Text(cmplx128{255, 3}, kFormatHex) == "FF",
+                reports.Has(3, "Complex number can't be shown in bin/hex/oct"),
+                Text(cmplx128{-7, 3}, kFormatDecimal) == "-7");
 }
 
 TEST(NumericTextRender, RandomIntegersAgreeWithToChars) {
@@ -83,9 +69,9 @@ TEST(NumericTextRender, RandomIntegersAgreeWithToChars) {
     for (int i = 0; i < 20000; ++i) {
         const uint64 bits = random() >> (random() % 64);
         const auto number = static_cast<int64>(random() % 2 == 0 ? bits : 0 - bits);
-        EXPECT_EQ(Text(number, kFormatDecimal), std::to_string(number));
-        EXPECT_EQ(Text(static_cast<int32>(number), kFormatDecimal), std::to_string(static_cast<int32>(number)));
-        EXPECT_EQ(Text(bits, kFormatUnsigned), std::to_string(bits));
+        EXPECT_EACH(Text(number, kFormatDecimal) == std::to_string(number),
+                    Text(static_cast<int32>(number), kFormatDecimal) == std::to_string(static_cast<int32>(number)),
+                    Text(bits, kFormatUnsigned) == std::to_string(bits));
         char hex[32];
         std::snprintf(hex, sizeof hex, "%" PRIX64, bits);
         EXPECT_EQ(Text(bits, kFormatHex), hex);
@@ -96,48 +82,28 @@ TEST(NumericTextRender, IntegersThatDoNotFitAreCutAtTheFront) {
     const std::string cut =
         "Incomplete conversion in NumToStr: buffer provided was not large enough to represent the number in base ";
     ReportRecorder reports;
-    EXPECT_EQ(IntText<int32>(12345, 10, true, 4), "345");
-    EXPECT_TRUE(reports.Has(2, cut + "10."));
-    EXPECT_EQ(IntText<int32>(-1, 16, true, 6), "FFFFF");
-    EXPECT_TRUE(reports.Has(2, cut + "16."));
+    EXPECT_EACH(IntText<int32>(12345, 10, true, 4) == "345", reports.Has(2, cut + "10."),
+                IntText<int32>(-1, 16, true, 6) == "FFFFF", reports.Has(2, cut + "16."));
     reports.Clear();
-    EXPECT_EQ(IntText<int32>(-123, 10, true, 4), "123");
-    EXPECT_EQ(reports.Texts(), std::vector<std::string>{"Unable to include sign in NumToStr: buffer too small."});
-    EXPECT_EQ(IntText<int32>(-123, 10, true, 5), "-123");
+    EXPECT_EACH(IntText<int32>(-123, 10, true, 4) == "123",
+                reports.Texts() == std::vector<std::string>{"Unable to include sign in NumToStr: buffer too small."},
+                IntText<int32>(-123, 10, true, 5) == "-123");
     reports.Clear();
-    EXPECT_EQ(IntText<int32>(7, 10, true, 1), "");
-    EXPECT_TRUE(reports.Has(2, "NumToStr requires at least 2 bytes in the input buffer."));
+    EXPECT_EACH(IntText<int32>(7, 10, true, 1) == "",
+                reports.Has(2, "NumToStr requires at least 2 bytes in the input buffer."));
 }
 
 // ---- reals ----------------------------------------------------------------------------------------------------------
 
 TEST(NumericTextRender, RealsFixedAndExponential) {
-    const std::vector<std::tuple<double, int, const char*>> cases{
-        {1234.5678, -2, "1234.57"},
-        {1234.5678, 7, "1.234568E+3"},
-        {1234.5678, 1, "1E+3"},
-        {0.5, 0, "0"},
-        {1.5, 0, "2"},
-        {9.996, -2, "10.00"},
-        {9.996, 3, "1.00E+1"},
-        {0.007, -2, "0.01"},
-        {0.004, -2, "0.00"},
-        {-0.004, -2, "-0.00"},
-        {-0.0, 3, "-0.00E+0"},
-        {0.0, -3, "0.000"},
-        {1e21, 0, "1000000000000000000000"},
-        {123456789012345678901.0, -1, "123456789012345684000.0"},  // 18 digits are exact
-        {1e308, -2, "1.00E+308"},
-        {0.1, 20, "1.0000000000000001000E-1"},  // 17 digits, then zeros
-        {5e-324, 4, "4.941E-324"},
-        {1.0, -63,
-         "1."
-         "000000000000000000000000000000000000000000000000000000000000000"},
-        {INFINITY, -2, "Inf"},
-        {-INFINITY, 5, "-Inf"},
-        {-NAN, 5, "NaN"},
-    };
-    for (const auto& [value, format, text] : cases) EXPECT_EQ(Text(value, static_cast<int16>(format)), text);
+    EXPECT_EACH(Text(1234.5678, -2) == "1234.57", Text(1234.5678, 7) == "1.234568E+3", Text(1234.5678, 1) == "1E+3",
+                Text(0.5, 0) == "0", Text(1.5, 0) == "2", Text(9.996, -2) == "10.00", Text(9.996, 3) == "1.00E+1",
+                Text(0.007, -2) == "0.01", Text(0.004, -2) == "0.00", Text(-0.004, -2) == "-0.00",
+                Text(-0.0, 3) == "-0.00E+0", Text(0.0, -3) == "0.000", Text(1e21, 0) == "1000000000000000000000",
+                Text(INFINITY, -2) == "Inf", Text(-INFINITY, 5) == "-Inf", Text(-NAN, 5) == "NaN");
+    EXPECT_EACH(Text(123456789012345678901.0, -1) == "123456789012345684000.0",               // 18 digits are exact
+                Text(1e308, -2) == "1.00E+308", Text(0.1, 20) == "1.0000000000000001000E-1",  // 17 digits, then zeros
+                Text(5e-324, 4) == "4.941E-324", Text(1.0, -63) == "1." + std::string(63, '0'));
     EXPECT_EQ(Text(0.1f, 9), "1.00000001E-1") << "a single is rendered as what it is";
     EXPECT_EQ(Text<int32>(1234, -2), "1234.00");
     const floatExt huge = tessel::FromExtended(1.5e4900L);
@@ -148,12 +114,10 @@ TEST(NumericTextRender, RealsFixedAndExponential) {
 }
 
 TEST(NumericTextRender, WideIntegersInRealFormatsAreExact) {
-    EXPECT_EQ(Text<int64>(9007199254740993, -1), "9007199254740993.0");
-    EXPECT_EQ(Text<int64>(std::numeric_limits<int64>::min(), 20), "-9.2233720368547758080E+18");
-    EXPECT_EQ(Text<uint64>(12345, 3), "1.23E+4");
-    EXPECT_EQ(Text<uint64>(12350, 3), "1.24E+4") << "halves go up here";
-    EXPECT_EQ(Text<uint64>(99995, 4), "1.000E+5");
-    EXPECT_EQ(Text<int64>(7, 1), "7E+0");
+    EXPECT_EACH(Text<int64>(9007199254740993, -1) == "9007199254740993.0",
+                Text<int64>(std::numeric_limits<int64>::min(), 20) == "-9.2233720368547758080E+18",
+                Text<uint64>(12345, 3) == "1.23E+4");
+    EXPECT_EACH(Text<uint64>(12350, 3) == "1.24E+4", Text<uint64>(99995, 4) == "1.000E+5", Text<int64>(7, 1) == "7E+0");
 }
 
 // The described way scales in extended precision before it rounds; where that meets a tie the exact value does not,
@@ -197,80 +161,55 @@ TEST(NumericTextRender, RandomDoublesAgreeWithPrintf) {
 // ---- engineering and SI notation ------------------------------------------------------------------------------------
 
 TEST(NumericTextRender, EngineeringAndSI) {
-    const std::vector<std::tuple<double, int, const char*>> cases{
-        {0.000123, 133, "123.00E-6"}, {0.000123, 102, "123.00u"}, {1e30, 102, "1.00E+30"},  {1234.5, 101, "1.2k"},
-        {999.96, 101, "1.0k"},        {9.996, 102, "10.00"},      {99.96, 132, "100.0E+0"}, {-47e3, 100, "-47k"},
-        {1e-24, 100, "1y"},           {2.5e24, 101, "2.5Y"},      {1e-27, 100, "1E-27"},    {0.0, 102, "0.00"},
-        {INFINITY, 102, "Inf"},       {-INFINITY, 133, "-Inf"},   {3e-9, 131, "3E-9"},
-    };
-    for (const auto& [value, format, text] : cases) EXPECT_EQ(Text(value, static_cast<int16>(format)), text);
-    EXPECT_EQ(Text<int64>(12345678, 102), "12.35M");
-    EXPECT_EQ(Text(1.0, 130), "1." + std::string(30, '0'));
+    EXPECT_EACH(Text(0.000123, 133) == "123.00E-6", Text(0.000123, 102) == "123.00u", Text(1e30, 102) == "1.00E+30",
+                Text(1234.5, 101) == "1.2k", Text(999.96, 101) == "1.0k", Text(9.996, 102) == "10.00",
+                Text(99.96, 132) == "100.0E+0", Text(-47e3, 100) == "-47k", Text(1e-24, 100) == "1y",
+                Text(2.5e24, 101) == "2.5Y", Text(1e-27, 100) == "1E-27", Text(0.0, 102) == "0.00",
+                Text(INFINITY, 102) == "Inf", Text(-INFINITY, 133) == "-Inf", Text(3e-9, 131) == "3E-9");
+    EXPECT_EACH(Text<int64>(12345678, 102) == "12.35M", Text(1.0, 130) == "1." + std::string(30, '0'));
 }
 
 TEST(NumericTextRender, SharedExponentTakesTheSuffix) {
     int32 slot = 0;
-    EXPECT_EQ(Text(12346.0, 102, kSize, &slot), "12.35");
-    EXPECT_EQ(slot, 3);
-    slot = 0;
-    EXPECT_EQ(Text(1e30, 133, kSize, &slot), "1.00E+30") << "too far for a slot";
-    EXPECT_EQ(slot, 0);
-    slot = kNoSharedExponent;
-    EXPECT_EQ(Text(12346.0, 102, kSize, &slot), "12.35E+3") << "as if there were no slot, and no SI prefix";
-    const struct {
-        cmplx128 value;
-        int32 unit;
-        CStr text;
-        int32 exponent;
-    } kComplex[] = {{{1500, 2500}, 0, "1.50 +2.50 i", 3},
-                    {{1500, 2.5}, 0, "1.50 +2.50E+0 i", 3},
-                    {{1.5, -2.5}, 6, "1.50 -2.50 i", 6}};
-    for (const auto& c : kComplex) {
-        slot = c.unit;
-        EXPECT_EQ(Text(c.value, 133, kSize, &slot), c.text);
-        EXPECT_EQ(slot, c.exponent) << c.text;
-    }
+    const auto text = [&](auto value, int16 format, int32 unit) {
+        return slot = unit, Text(value, format, kSize, &slot);
+    };
+    EXPECT_EACH(text(12346.0, 102, 0) == "12.35", slot == 3, text(1e30, 133, 0) == "1.00E+30", slot == 0,  // too far
+                text(12346.0, 102, kNoSharedExponent) == "12.35E+3",  // as if there were no slot, and no SI prefix
+                text(cmplx128{1500, 2500}, 133, 0) == "1.50 +2.50 i", slot == 3,
+                text(cmplx128{1500, 2.5}, 133, 0) == "1.50 +2.50E+0 i", slot == 3,
+                text(cmplx128{1.5, -2.5}, 133, 6) == "1.50 -2.50 i", slot == 6);
 }
 
 // ---- complex values and odd codes -----------------------------------------------------------------------------------
 
 TEST(NumericTextRender, ComplexValues) {
-    EXPECT_EQ(Text(cmplx128{1.5, -2.25}, -2), "1.50 -2.25 i");
-    EXPECT_EQ(Text(cmplx128{1.5, 2.25}, -2), "1.50 +2.25 i");
-    EXPECT_EQ(Text(cmplx128{0, NAN}, -1), "0.0 +NaN i");
-    EXPECT_EQ(Text(cmplx128{0, -INFINITY}, -1), "0.0 -Inf i");
-    EXPECT_EQ(Text(cmplx128{3, 4}, -102), "5.00 arg 0.93");
-    EXPECT_EQ(Text(cmplx128{-0.0, 0}, -102), "0.00 arg 0.00");
-    EXPECT_EQ(Text(cmplx128{3000, 0.004}, 101), "3.0k +4.0m i");
-    char buffer[16];
+    EXPECT_EACH(Text(cmplx128{1.5, -2.25}, -2) == "1.50 -2.25 i", Text(cmplx128{1.5, 2.25}, -2) == "1.50 +2.25 i",
+                Text(cmplx128{0, NAN}, -1) == "0.0 +NaN i", Text(cmplx128{0, -INFINITY}, -1) == "0.0 -Inf i",
+                Text(cmplx128{3, 4}, -102) == "5.00 arg 0.93", Text(cmplx128{-0.0, 0}, -102) == "0.00 arg 0.00",
+                Text(cmplx128{3000, 0.004}, 101) == "3.0k +4.0m i");
+    char complex[16], real[16];
     const int16 format = 64;
-    NumToAnyString(nullptr, kNumComplexSingle, &format, buffer, sizeof buffer, '.', nullptr);
-    EXPECT_STREQ(buffer, "0 + 0i");
-    NumToAnyString(nullptr, kNumDouble, &format, buffer, sizeof buffer, '.', nullptr);
-    EXPECT_STREQ(buffer, "0");
+    NumToAnyString(nullptr, kNumComplexSingle, &format, complex, sizeof complex, '.', nullptr);
+    NumToAnyString(nullptr, kNumDouble, &format, real, sizeof real, '.', nullptr);
+    EXPECT_EACH(complex == "0 + 0i", real == "0");
 }
 
 TEST(NumericTextRender, CodesOutsideTheTable) {
     ReportRecorder reports;
-    EXPECT_EQ(Text(1.5, 69), "1.5" + std::string(67, '0') + "E+0");
-    EXPECT_TRUE(reports.Has(2, "Bad k_code: 69"));
-    EXPECT_EQ(Text(1.5, -64), "1.5" + std::string(62, '0'));
-    EXPECT_TRUE(reports.Has(2, "Bad k_code: -64"));
-    EXPECT_EQ(Text(1.5, 250), "");
+    EXPECT_EACH(Text(1.5, 69) == "1.5" + std::string(67, '0') + "E+0", reports.Has(2, "Bad k_code: 69"),
+                Text(1.5, -64) == "1.5" + std::string(62, '0'), reports.Has(2, "Bad k_code: -64"),
+                Text(1.5, 250) == "");
     for (const int16 code : {299, 600}) EXPECT_EQ(Text(cmplx128{1, 2}, code), "1.000000 +2.000000 i");
-    EXPECT_TRUE(reports.Has(2, "Wrong k-code in SetFormat function 299"));
-    EXPECT_TRUE(reports.Has(2, "Wrong output k-code in SetFormat function:600"));
+    EXPECT_EACH(reports.Has(2, "Wrong k-code in SetFormat function 299"),
+                reports.Has(2, "Wrong output k-code in SetFormat function:600"));
 }
 
 TEST(NumericTextRender, TextThatDoesNotFit) {
     ReportRecorder reports;
-    EXPECT_EQ(Text(123456.0, -2, 10), "1.2E+5") << "exponential when the fixed form is too wide";
-    EXPECT_EQ(Text(3.0, 9, 10), "3.0E+0") << "digits are held to the buffer";
-    EXPECT_EQ(reports.Count(), 0u);
-    EXPECT_EQ(Text<int64>(1234567, -2, 6), "12345");
-    EXPECT_TRUE(reports.Has(4, "buffer overflow"));
-    EXPECT_EQ(Text(1.25e-9, 135, 8), "1.2500");
-    EXPECT_TRUE(reports.Has(4, "buffer overflow imminent"));
+    EXPECT_EACH(Text(123456.0, -2, 10) == "1.2E+5", Text(3.0, 9, 10) == "3.0E+0", reports.Count() == 0u,
+                Text<int64>(1234567, -2, 6) == "12345", reports.Has(4, "buffer overflow"),
+                Text(1.25e-9, 135, 8) == "1.2500", reports.Has(4, "buffer overflow imminent"));
 }
 
 // ---- decimal records ------------------------------------------------------------------------------------------------
@@ -282,18 +221,13 @@ std::string Packed(const PackedDecimal& record, int16 format) {
 }
 
 TEST(NumericTextRender, Records) {
-    PackedDecimal record{{0x78, 0x56, 0x34, 0x12}, 0x80, -3, 7};
-    EXPECT_EQ(Packed(record, -2), "-12345.67");
-    EXPECT_EQ(Packed(record, -5), "-12345.67800");
-    EXPECT_EQ(Packed(record, 5), "-1.2345E+4");
-    record.mdigits = 8;
-    EXPECT_EQ(Packed(record, 5), "-1.2345E+4") << "a leading zero nibble counts for nothing";
-    record.exponent = -10;
-    EXPECT_EQ(Packed(record, -4), "-0.0012");
-    record.exponent = 2;
-    EXPECT_EQ(Packed(record, -1), "-1234567800.0");
-    record.exponent = -4930;
-    EXPECT_EQ(Packed(record, 3), "-0.00E+0") << "too small to show";
+    const auto packed = [](int16 exponent, int32 format, int16 digits = 7) {
+        return Packed({{0x78, 0x56, 0x34, 0x12}, 0x80, exponent, digits}, static_cast<int16>(format));
+    };
+    EXPECT_EACH(packed(-3, -2) == "-12345.67", packed(-3, -5) == "-12345.67800", packed(-3, 5) == "-1.2345E+4",
+                packed(-3, 5, 8) == "-1.2345E+4", packed(-10, -4, 8) == "-0.0012", packed(2, -1, 8) == "-1234567800.0",
+                packed(-4930, 3, 8) == "-0.00E+0");  // too small to show
+    const PackedDecimal record{};
     EXPECT_EQ(PackedToString(&record, 3, nullptr, 0, '.'), 0);
 }
 
@@ -312,11 +246,8 @@ TEST(NumericTextRender, CorruptRecordsAreReported) {
 }
 
 TEST(NumericTextRender, SpecialTextsCanBeReplaced) {
-    CStr nan = NumSetNaNText("nada");
-    CStr inf = NumSetInfText("inf");
-    EXPECT_EQ(Text(NAN, -2), "nada");
-    EXPECT_EQ(Text(-INFINITY, 102), "-inf");
-    EXPECT_STREQ(NumSetNaNText(nan), "nada");
+    CStr nan = NumSetNaNText("nada"), inf = NumSetInfText("inf");
+    EXPECT_EACH(Text(NAN, -2) == "nada", Text(-INFINITY, 102) == "-inf", NumSetNaNText(nan) == "nada");
     NumSetInfText(inf);
     EXPECT_EQ(Text(NAN, -2), "NaN");
 }

@@ -1,9 +1,7 @@
 #include "strings/Support.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include <tessel/strings/StringCStr.h>
 
-#include <cstring>
-#include <random>
 #include <strings.h>
 
 using namespace tessel::test;
@@ -12,10 +10,8 @@ namespace {
 
 TEST(StringCStr, ComparesByTheFirstDifference) {
     const struct {
-        CStr a;
-        CStr b;
-        int32 exact;
-        int32 noCase;
+        CStr a, b;
+        int32 exact, noCase;
     } kCases[] = {
         {"abc", "abc", 0, 0},
         {"abc", "abd", -1, -1},
@@ -29,14 +25,10 @@ TEST(StringCStr, ComparesByTheFirstDifference) {
     for (const auto& c : kCases) {
         EXPECT_EQ(c.exact, StrCmp(c.a, c.b)) << c.a << " " << c.b;
         EXPECT_EQ(c.noCase, StrCaseCmp(c.a, c.b)) << c.a << " " << c.b;
-        EXPECT_EQ(c.exact == 0, StrEqual(c.a, c.b));
-        EXPECT_EQ(c.noCase, StrNCaseCmp(c.a, c.b, 100));
+        EXPECT_EACH((c.exact == 0) == StrEqual(c.a, c.b), c.noCase == StrNCaseCmp(c.a, c.b, 100));
     }
-    EXPECT_EQ(0, StrNCmp("abcX", "abcY", 3));
-    EXPECT_EQ(-1, StrNCmp("abcX", "abcY", 4));
-    EXPECT_TRUE(StrNEqual("a", "b", 0));
-    EXPECT_TRUE(StrNCaseEqual("abcX", "ABCy", 3));
-    EXPECT_FALSE(StrNCaseEqual("abcX", "ABCy", 4));
+    EXPECT_EACH(StrNCmp("abcX", "abcY", 3) == 0, StrNCmp("abcX", "abcY", 4) == -1, StrNEqual("a", "b", 0),
+                StrNCaseEqual("abcX", "ABCy", 3), !StrNCaseEqual("abcX", "ABCy", 4));
 }
 
 TEST(StringCStr, OrdersWithoutCaseAsTheSystemDoes) {
@@ -55,17 +47,13 @@ TEST(StringCStr, OrdersWithoutCaseAsTheSystemDoes) {
 
 TEST(StringCStr, CopiesAndPads) {
     char text[8] = "1234567";
-    EXPECT_EQ(text, StrNCpy(text, "ab", 4));
-    EXPECT_EQ(0, std::memcmp(text,
-                             "ab\0\0"
-                             "567",
-                             8));
+    EXPECT_EACH(text == StrNCpy(text, "ab", 4), std::string(text, 8) == std::string("ab\0\0"
+                                                                                    "567\0",
+                                                                                    8));
     StrNCpy(text, "xyz", 2);
     EXPECT_STREQ("xy", text);
     StrNCpy(text, "q", 0);
-    EXPECT_STREQ("xy", text);
-    EXPECT_EQ(5, StrCat(text, "cde"));
-    EXPECT_STREQ("xycde", text);
+    EXPECT_EACH(text == "xy", StrCat(text, "cde") == 5, text == "xycde");
     StrCpy(text, text + 1);
     EXPECT_STREQ("ycde", text);
     StrCpy(text, nullptr);
@@ -74,30 +62,19 @@ TEST(StringCStr, CopiesAndPads) {
 
 TEST(StringCStr, Searches) {
     CStr text = "a,b,c";
-    EXPECT_EQ(text + 1, StrChr(text, ','));
-    EXPECT_EQ(text + 3, StrRChr(text, ','));
-    EXPECT_EQ(nullptr, StrChr(text, 'x'));
-    EXPECT_EQ(nullptr, StrChr(text, 0));
-    EXPECT_EQ(nullptr, StrRChr(text, 0));
+    EXPECT_EACH(text + 1 == StrChr(text, ','), text + 3 == StrRChr(text, ','), StrChr(text, 'x') == nullptr,
+                StrChr(text, 0) == nullptr, StrRChr(text, 0) == nullptr);
 
-    EXPECT_TRUE(StrIStr("the Quick \tBr own fox", "quickbrown"));
-    EXPECT_TRUE(StrIStr(" a", ""));
-    EXPECT_FALSE(StrIStr("", ""));
-    EXPECT_FALSE(StrIStr("quick", "quick b"));
-    EXPECT_FALSE(StrIStr("qui", "quick"));
+    EXPECT_EACH(StrIStr("the Quick \tBr own fox", "quickbrown"), StrIStr(" a", ""), !StrIStr("", ""),
+                !StrIStr("quick", "quick b"), !StrIStr("qui", "quick"));
 }
 
 TEST(StringCStr, MapsCaseWithTheCodePage) {
-    EXPECT_EQ('a', ToLower('A'));
-    EXPECT_EQ(0x141, ToLower(0x141));
-    EXPECT_EQ(-30, ToUpper(-30));
+    EXPECT_EACH(ToLower('A') == 'a', ToLower(0x141) == 0x141, ToUpper(-30) == -30);
     EXPECT_EQ(0xE4, ToUpper(0xE4));  // begins a character in UTF-8
     {
         const CodePage page(1252);
-        EXPECT_EQ(0xC4, ToUpper(0xE4));
-        EXPECT_TRUE(IsLower(0xE4));
-        EXPECT_FALSE(IsUpper(0xE4));
-        EXPECT_EQ(0, StrCaseCmp("\xC4rger", "\xE4RGER"));
+        EXPECT_EACH(ToUpper(0xE4) == 0xC4, IsLower(0xE4), !IsUpper(0xE4), StrCaseCmp("\xC4rger", "\xE4RGER") == 0);
         char text[] = "gr\xFC\xDFn";
         StrToUpper(text, 4);
         EXPECT_STREQ("GR\xDC\xDFn", text);
@@ -115,22 +92,15 @@ TEST(StringCStr, StepsOverWholeCharacters) {
     {
         const CodePage page(932);
         CStr text = "a\x83\x5Cz";
-        EXPECT_EQ(1, StrNextChar(text, 0));
-        EXPECT_EQ(3, StrNextChar(text, 1));
-        EXPECT_EQ(4, StrNextChar(text, 3));
+        EXPECT_EACH(StrNextChar(text, 0) == 1, StrNextChar(text, 1) == 3, StrNextChar(text, 3) == 4);
         EXPECT_EQ(5, StrNextChar(text, 4));  // at the terminator
         EXPECT_EQ(1, StrPrevChar(text, 3));
         EXPECT_EQ(0, StrPrevChar(text, 1));
     }
     CStr utf8 = "\xE2\x82\xAC\xF0\x9F\x98\x80z";
-    EXPECT_EQ(3, StrNextChar(utf8, 0));
-    EXPECT_EQ(7, StrNextChar(utf8, 3));
-    EXPECT_EQ(3, StrPrevChar(utf8, 7));
-    EXPECT_EQ(0, StrPrevChar(utf8, 0));
-    EXPECT_EQ(0, StrPrevChar(nullptr, 3));
-    EXPECT_EQ(0u, reports.Count());
-    EXPECT_EQ(0, StrPrevChar(utf8, -1));
-    EXPECT_TRUE(reports.Has(kDebugWarning, "Negative index into string in StrPrevChar"));
+    EXPECT_EACH(StrNextChar(utf8, 0) == 3, StrNextChar(utf8, 3) == 7, StrPrevChar(utf8, 7) == 3,
+                StrPrevChar(utf8, 0) == 0, StrPrevChar(nullptr, 3) == 0, reports.Count() == 0u,
+                StrPrevChar(utf8, -1) == 0, reports.Has(kDebugWarning, "Negative index into string in StrPrevChar"));
 }
 
 TEST(StringCStr, ClassifiesPlainAscii) {

@@ -1,5 +1,5 @@
 #include "strings/Support.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include <tessel/base/NumericTypes.h>
 #include <tessel/numerics/NumericSupport.h>
 #include <tessel/strings/NumericText.h>
@@ -7,9 +7,7 @@
 #include <tessel/strings/StringFmtPrint.h>
 
 #include <cstdio>
-#include <cstring>
 #include <limits>
-#include <random>
 
 using namespace tessel;
 using namespace tessel::test;
@@ -33,52 +31,51 @@ std::string F(CStr format, ...) {
 }
 
 TEST(StringFmtPrint, PrintsIntegers) {
-    EXPECT_EQ("  -42|-42  |-0042", F("%5d|%-5d|%05d", -42, -42, -42));
-    EXPECT_EQ("-2147483648 4294967295 -9223372036854775808 18446744073709551615",
-              F("%d %u %lld %llu", INT32_MIN, -1, static_cast<long long>(INT64_MIN), -1LL));
-    EXPECT_EQ("FF 101 10 0 FFFFFFFFFFFFFFFE", F("%x %b %o %x %llx", 255, 5, 8, 0, -2LL));
-    EXPECT_EQ("7 8 9", F("%ld %Id %i", 7, 8, 9));
-    EXPECT_EQ("0x000000FF|0xFFFFFFFF|0x0000000A", F("%a|%-12a|%2a", 255, -1, 10));
+    EXPECT_EACH(F("%5d|%-5d|%05d", -42, -42, -42) == "  -42|-42  |-0042",
+                F("%d %u %lld %llu", INT32_MIN, -1, static_cast<long long>(INT64_MIN), -1LL) ==
+                    "-2147483648 4294967295 -9223372036854775808 18446744073709551615",
+                F("%x %b %o %x %llx", 255, 5, 8, 0, -2LL) == "FF 101 10 0 FFFFFFFFFFFFFFFE",
+                F("%ld %Id %i", 7, 8, 9) == "7 8 9",
+                F("%a|%-12a|%2a", 255, -1, 10) == "0x000000FF|0xFFFFFFFF|0x0000000A");
     EXPECT_EQ("12 ", F("%-03.9d", 12));  // no precision for integers
     EXPECT_EQ("11111111111111111111111111111111", F("%b", -1));
     EXPECT_EQ(64u, F("%llb", -1LL).size());
 }
 
 TEST(StringFmtPrint, PrintsTexts) {
-    EXPECT_EQ("abc|   abc|abc   |00abc", F("%.3s|%6.3s|%-6.3s|%05s", "abcdef", "abcdef", "abcdef", "abc"));
-    EXPECT_EQ("[][  ][]", F("[%s][%2s][%.0s]", nullptr, nullptr, "x"));
+    EXPECT_EACH(F("%.3s|%6.3s|%-6.3s|%05s", "abcdef", "abcdef", "abcdef", "abc") == "abc|   abc|abc   |00abc",
+                F("[%s][%2s][%.0s]", nullptr, nullptr, "x") == "[][  ][]");
     const char unterminated[] = {'a', 'b', 'c'};
-    EXPECT_EQ("abc", F("%.3s", unterminated));
-    EXPECT_EQ("ab|  ab|a",
-              F("%p|%4p|%.1p", static_cast<PStr>(P("ab")), static_cast<PStr>(P("ab")), static_cast<PStr>(P("ab"))));
+    EXPECT_EACH(F("%.3s", unterminated) == "abc",
+                F("%p|%4p|%.1p", static_cast<PStr>(P("ab")), static_cast<PStr>(P("ab")), static_cast<PStr>(P("ab"))) ==
+                    "ab|  ab|a");
     L text("hello");
-    EXPECT_EQ("hello|hello|hell| hello", F("%P|%lp|%.4H|%6H", *text, *text, *&text, *&text));
-    EXPECT_EQ("|     ", F("%H|%5H", nullptr, nullptr));
+    EXPECT_EACH(F("%P|%lp|%.4H|%6H", *text, *text, *&text, *&text) == "hello|hello|hell| hello",
+                F("%H|%5H", nullptr, nullptr) == "|     ");
     const FmtBytes bytes = {"a\0b", 3};
     EXPECT_EQ(std::string("a\0b..", 5), F("%h..", &bytes));
     const std::string large(1000, 'x');
-    EXPECT_EQ(large + "!", F("%s!", large.c_str()));
-    EXPECT_EQ("A  DCBA BA A%", F("%c  %4c %2c %5c%", 'A', 0x41424344, 0x41424142, 'A'));
-    EXPECT_EQ("  DC", F("%4.2c", 0x41424344));
+    EXPECT_EACH(large + "!" == F("%s!", large.c_str()),
+                F("%c  %4c %2c %5c%", 'A', 0x41424344, 0x41424142, 'A') == "A  DCBA BA A%",
+                F("%4.2c", 0x41424344) == "  DC");
 }
 
 TEST(StringFmtPrint, PrintsPointsAndRectangles) {
     const int16 rectangle[] = {1, 2, 3, 4};
-    EXPECT_EQ("(2,1) hv(2,1) (-1,-32768)", F("%q %Q %q", 0x00020001, 0x00020001, static_cast<int32>(0xFFFF8000)));
-    EXPECT_EQ("(1, 2, 3, 4) tlbr(1, 2, 3, 4)", F("%r %R", rectangle, rectangle));
+    EXPECT_EACH(F("%q %Q %q", 0x00020001, 0x00020001, static_cast<int32>(0xFFFF8000)) == "(2,1) hv(2,1) (-1,-32768)",
+                F("%r %R", rectangle, rectangle) == "(1, 2, 3, 4) tlbr(1, 2, 3, 4)");
 }
 
 TEST(StringFmtPrint, PrintsReals) {
-    EXPECT_EQ("3,25 3.25 3;2", F("%,;%.2f %;%.2f %\\3B;%.1f", 3.25, 3.25, 3.2));
-    EXPECT_EQ("0.500000 -1.50 1E+3", F("%f %.2f %.0e", 0.5, -1.5, 1000.0));
+    EXPECT_EACH(F("%,;%.2f %;%.2f %\\3B;%.1f", 3.25, 3.25, 3.2) == "3,25 3.25 3;2",
+                F("%f %.2f %.0e", 0.5, -1.5, 1000.0) == "0.500000 -1.50 1E+3");
     EXPECT_EQ("1.000000E+30", F("%f", 1e30));             // 30 is beyond the 18 of no width
     EXPECT_EQ("1.00000000000000E+30", F("%20f", 1e30));   // and beyond 19; 15 digits
     EXPECT_EQ("1000000000000000000.0", F("%.1f", 1e18));  // 18 is not
     EXPECT_EQ("1.0E-19", F("%.1f", 1e-19));
-    EXPECT_EQ("1.234568E+3 1.234568E+3 1.234568E+3", F("%e %g %G", 1234.5678, 1234.5678, 1234.5678));
-    EXPECT_EQ("1.2346E+3", F("%10.4E", 1234.5678).substr(1));
-    EXPECT_EQ("  1.235E+3|1.235E+3  ", F("%10.3e|%-10.3e", 1234.5678, 1234.5678));
-    EXPECT_EQ("-003.5", F("%06.1F", -3.5));
+    EXPECT_EACH(F("%e %g %G", 1234.5678, 1234.5678, 1234.5678) == "1.234568E+3 1.234568E+3 1.234568E+3",
+                F("%10.4E", 1234.5678).substr(1) == "1.2346E+3",
+                F("%10.3e|%-10.3e", 1234.5678, 1234.5678) == "  1.235E+3|1.235E+3  ", F("%06.1F", -3.5) == "-003.5");
     const double infinity = std::numeric_limits<double>::infinity();
     EXPECT_EQ("NaN Inf -Inf", F("%f %f %e", std::numeric_limits<double>::quiet_NaN(), infinity, -infinity));
 }
@@ -89,10 +86,9 @@ TEST(StringFmtPrint, PrintsNumbersOfNamedTypes) {
     const int64 large = INT64_MIN;
     const float single = 1.5;
     const cmplx128 complex = {1.5, -2};
-    EXPECT_EQ("-1 FF 0x000000FF 255", F("%{iB}d %{iB}x %{iB}a %{uB}u", &small, &small, &small, &small));
-    EXPECT_EQ("1234 -9223372036854775808 -9223372036854775808", F("%{uW}x %{iQd %{iQ}d", &word, &large, &large));
-    EXPECT_EQ("1.50|  1.5", F("%.2{fS}f|%5.1{fS}f", &single, &single));
-    EXPECT_EQ("1.5 -2.0 i", F("%.1{cD}f", &complex));
+    EXPECT_EACH(F("%{iB}d %{iB}x %{iB}a %{uB}u", &small, &small, &small, &small) == "-1 FF 0x000000FF 255",
+                F("%{uW}x %{iQd %{iQ}d", &word, &large, &large) == "1234 -9223372036854775808 -9223372036854775808",
+                F("%.2{fS}f|%5.1{fS}f", &single, &single) == "1.50|  1.5", F("%.1{cD}f", &complex) == "1.5 -2.0 i");
     EXPECT_EQ("-1 1.5", F("%{*}d %.1{*}f", kNumInt8 + 16, &small, kNumSingle, &single));  // the low four bits count
     const uint8 size = SetFxSize(16);  // the library's own values stay as large as they are
     EXPECT_EQ("1.5 1.5 -2.0 i", F("%.1{fS}f %.1{cD}f", &single, &complex));
@@ -101,10 +97,9 @@ TEST(StringFmtPrint, PrintsNumbersOfNamedTypes) {
 
 TEST(StringFmtPrint, TakesPositionalParameters) {
     ReportRecorder reports;
-    EXPECT_EQ("2 1", F("%2$d %1$d", 1, 2));
-    EXPECT_EQ("  b|a    |b", F("%2$3s|%1$-5s|%2$s", "a", "b"));
-    EXPECT_EQ("x 7 -1 0.5 DCBA (2,1) 7",
-              F("%3$s %1$d %2$lld %4$.1f %5$4c %6$q %1$u", 7, -1LL, "x", 0.5, 0x41424344, 0x00020001));
+    EXPECT_EACH(F("%2$d %1$d", 1, 2) == "2 1", F("%2$3s|%1$-5s|%2$s", "a", "b") == "  b|a    |b",
+                F("%3$s %1$d %2$lld %4$.1f %5$4c %6$q %1$u", 7, -1LL, "x", 0.5, 0x41424344, 0x00020001) ==
+                    "x 7 -1 0.5 DCBA (2,1) 7");
     EXPECT_EQ("0.5,0,5", F("%1$.1f%,;,%1$.1f", 0.5));  // the second pass starts anew
     EXPECT_EQ("10987654321", F("%10$d%9$d%8$d%7$d%6$d%5$d%4$d%3$d%2$d%1$d", 1, 2, 3, 4, 5, 6, 7, 8, 9, 10));
     char four[4];
@@ -149,16 +144,12 @@ TEST(StringFmtPrint, StopsAtWhatItDoesNotKnow) {
 }
 
 TEST(StringFmtPrint, InterpretsEscapesOfTheFormat) {
-    EXPECT_EQ("a\r\nA\tB\\ %", F("a\\n\\41\\tB\\\\ \\%"));
-    EXPECT_EQ("line\n", F("line\n"));
-    EXPECT_EQ("100%", F("100%"));
-    EXPECT_EQ("100% \\", F("100%% \\"));
+    EXPECT_EACH(F("a\\n\\41\\tB\\\\ \\%") == "a\r\nA\tB\\ %", F("line\n") == "line\n", F("100%") == "100%",
+                F("100%% \\") == "100% \\");
     char text[3] = {'x', 'x', 'x'};
-    EXPECT_EQ(2, SNPrintf(text, 2, "a\\n"));
-    EXPECT_STREQ("a", text);
+    EXPECT_EACH(SNPrintf(text, 2, "a\\n") == 2, text == "a");
     char out[10];
-    EXPECT_EQ(4, SPrintfp(out, P(std::string_view("a\0b%d", 5)), 7));
-    EXPECT_EQ(0, std::memcmp("a\0b7", out, 5));
+    EXPECT_EACH(SPrintfp(out, P(std::string_view("a\0b%d", 5)), 7) == 4, std::memcmp("a\0b7", out, 5) == 0);
 }
 
 TEST(StringFmtPrint, CopiesDoubleByteCharactersWhole) {
@@ -193,8 +184,7 @@ TEST(StringFmtPrint, AgreesWithTheCLibrary) {
         const long long value = pick(2) ? bits : -bits;
         const int last = static_cast<int>(value);
         const char* text = kTexts[pick(4)];
-        char expected[200];
-        char actual[200];
+        char expected[200], actual[200];
         const auto size = static_cast<int32>(1 + pick(120));
         const auto check = [&](auto argument) {
             const int full = std::snprintf(expected, static_cast<size_t>(size), theirs.c_str(), argument, last);
@@ -228,37 +218,26 @@ TEST(StringFmtPrint, WritesNothingPastItsSize) {
         EXPECT_EQ(expected, room) << size;
     }
     char four[4];
-    EXPECT_EQ(4, SNPrintf(four, 4, "%d", 123456));
-    EXPECT_STREQ("123", four);
-    EXPECT_EQ(6, SNPrintf(nullptr, 0, "%d", 123456));
-    EXPECT_EQ(4, SNPrintf(four, 4, "%99999999999999d", 1));
-    EXPECT_STREQ("   ", four);
-    EXPECT_EQ(INT32_MAX, SNPrintf(nullptr, 0, "%99999999999999d and more", 1));
+    EXPECT_EACH(SNPrintf(four, 4, "%d", 123456) == 4, four == "123", SNPrintf(nullptr, 0, "%d", 123456) == 6,
+                SNPrintf(four, 4, "%99999999999999d", 1) == 4, four == "   ",
+                SNPrintf(nullptr, 0, "%99999999999999d and more", 1) == INT32_MAX);
 }
 
 TEST(StringFmtPrint, FillsPStrsAndHandles) {
     P p;
-    EXPECT_EQ(255, PPrintf(p, "%s", std::string(300, 'y').c_str()));
-    EXPECT_EQ(std::string(255, 'y'), p.Text());
-    EXPECT_EQ(3, PPrintfp(p, P("%03d"), 7));
-    EXPECT_EQ("007", p.Text());
+    EXPECT_EACH(PPrintf(p, "%s", std::string(300, 'y').c_str()) == 255, std::string(255, 'y') == p.Text(),
+                PPrintfp(p, P("%03d"), 7) == 3, p.Text() == "007");
     char c[8];
-    EXPECT_EQ(2, SPrintf(c, "%d", 42));
-    EXPECT_STREQ("42", c);
+    EXPECT_EACH(SPrintf(c, "%d", 42) == 2, c == "42");
 
     L text("x");
-    EXPECT_EQ(kNoErr, LStrPrintf(text, "%d %s", 42, "things"));
-    EXPECT_EQ("42 things", text.Text());
-    EXPECT_EQ(13u, text.Size());
-    EXPECT_EQ(kNoErr, LStrPrintf(text, ""));
-    EXPECT_EQ(4u, text.Size());
-    EXPECT_EQ(kArgErr, LStrPrintf(nullptr, "x"));
+    EXPECT_EACH(LStrPrintf(text, "%d %s", 42, "things") == kNoErr, text.Text() == "42 things", text.Size() == 13u,
+                LStrPrintf(text, "") == kNoErr, text.Size() == 4u, LStrPrintf(nullptr, "x") == kArgErr);
 
     const std::string long300(300, 'n');
     CStr nan = NumSetNaNText(long300.c_str());
     ReportRecorder reports;
-    EXPECT_EQ(long300.substr(45), F("%f", static_cast<double>(NAN)));
-    EXPECT_TRUE(reports.Has(kDebugFatal, "buffer overflow"));
+    EXPECT_EACH(long300.substr(45) == F("%f", static_cast<double>(NAN)), reports.Has(kDebugFatal, "buffer overflow"));
     NumSetNaNText(nan);
 }
 
@@ -266,8 +245,7 @@ std::string growing;
 
 TEST(StringFmtPrint, PrintsATextIntoItself) {
     L text("abc");
-    EXPECT_EQ(kNoErr, LStrPrintf(text, "<%H>", LStrHandle(text)));
-    EXPECT_EQ("<abc>", text.Text());
+    EXPECT_EACH(LStrPrintf(text, "<%H>", LStrHandle(text)) == kNoErr, text.Text() == "<abc>");
     EXPECT_EQ(kNoErr, LStrPrintf(text, "%-600H|%P", LStrHandle(text), *text));  // too long to be kept aside at first
     EXPECT_EQ("<abc>" + std::string(595, ' ') + "|<abc>", text.Text());
 

@@ -1,12 +1,9 @@
 #include "support/ScratchDrive.h"
+#include "support/Test.h"
 #include <tessel/diagnostics/FileLoc.h>
 #include <tessel/strings/StringOutput.h>
 
-#include <gtest/gtest.h>
-#include <memory>
-#include <string>
-
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 // Gathers what is printed; a print may print again, as a report raised meanwhile would.
@@ -31,12 +28,8 @@ private:
 
 TEST(StringOutput, CountsPrintsAndDropsTheNestedOnes) {
     Gathering output(true);
-    EXPECT_EQ(1, output.PrintData("%d;%s ", 7, "x"));
-    EXPECT_EQ(0, output.nestedResult);
-    EXPECT_EQ(2, output.PrintData("second "));
-    EXPECT_EQ(1, output.nestedResult);
-    EXPECT_EQ("7;x second ", output.text);
-    EXPECT_EQ(2, output.PrintData(nullptr));
+    EXPECT_EACH(output.PrintData("%d;%s ", 7, "x") == 1, output.nestedResult == 0, output.PrintData("second ") == 2,
+                output.nestedResult == 1, output.text == "7;x second ", output.PrintData(nullptr) == 2);
     Gathering small;
     small.PrintData("%s", std::string(100, 'a').c_str());
     EXPECT_EQ(std::string(31, 'a'), small.text);
@@ -51,11 +44,10 @@ TEST(StringOutput, ForkPassesEverythingToBoth) {
         EXPECT_EQ(2, fork.PrintData("%d %s ", 5, "both"));
         fork.Flush();
     }
-    EXPECT_EQ("open1 5 both flush ", first.text);
-    EXPECT_EQ("earlier open1 5 both flush ", second.text);
-    EXPECT_EQ(2, StringOutputFork(&first, nullptr, false).PrintData("x"));
-    EXPECT_EQ(3, StringOutputFork(nullptr, &second, false).PrintData("x"));
-    EXPECT_EQ(0, StringOutputFork(nullptr, nullptr, true).PrintData("x"));
+    EXPECT_EACH(first.text == "open1 5 both flush ", second.text == "earlier open1 5 both flush ",
+                StringOutputFork(&first, nullptr, false).PrintData("x") == 2,
+                StringOutputFork(nullptr, &second, false).PrintData("x") == 3,
+                StringOutputFork(nullptr, nullptr, true).PrintData("x") == 0);
     // Owned outputs end with it; a leak checker would tell.
     StringOutputFork owner(new Gathering, new Gathering, true);
     EXPECT_EQ(1, owner.PrintData("x"));
@@ -70,8 +62,8 @@ TEST(StringOutput, ConsoleAndDebuggerChannel) {
     console->PrintData("to the console %d\n", 1);
     debugger->PrintData("to the debugger %d\n", 2);
     debugger->PrintData("%s", longText.c_str());
-    EXPECT_EQ("to the console 1\n", testing::internal::GetCapturedStdout());
-    EXPECT_EQ("to the debugger 2\n" + std::string(2047, 'y'), testing::internal::GetCapturedStderr());
+    EXPECT_EACH(testing::internal::GetCapturedStdout() == "to the console 1\n",
+                "to the debugger 2\n" + std::string(2047, 'y') == testing::internal::GetCapturedStderr());
 }
 
 TEST(StringOutput, FileModes) {
@@ -85,10 +77,8 @@ TEST(StringOutput, FileModes) {
         output->Flush();
         return drive.Get("out.txt");
     };
-    EXPECT_EQ("one ", print(0, "one "));
-    EXPECT_EQ("one two ", print(1, "two "));
-    EXPECT_EQ("one two three ", print(7, "three "));
-    EXPECT_EQ("four", print(0, "four"));
+    EXPECT_EACH(print(0, "one ") == "one ", print(1, "two ") == "one two ", print(7, "three ") == "one two three ",
+                print(0, "four") == "four");
 }
 
 TEST(StringOutput, FileThatCannotBeOpenedPrintsNothing) {
@@ -100,4 +90,4 @@ TEST(StringOutput, FileThatCannotBeOpenedPrintsNothing) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

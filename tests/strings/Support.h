@@ -1,6 +1,5 @@
 // Texts in the library's forms, for the tests of this folder.
-#ifndef TESSEL_TESTS_STRINGS_SUPPORT_H
-#define TESSEL_TESTS_STRINGS_SUPPORT_H
+#pragma once
 
 #include "platform/CodePage.h"
 #include <tessel/memory/MemoryManager.h>
@@ -72,4 +71,3 @@ inline int Sign(int32 order) {
 
 }  // namespace tessel::test
 
-#endif

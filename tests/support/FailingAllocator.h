@@ -1,7 +1,6 @@
 // Makes the n-th allocation (from 1) of the library's heap fail while the object lives; with n = 0 none. The memory of
 // the trackers counts too. One object at a time.
-#ifndef TESSEL_TESTS_SUPPORT_FAILINGALLOCATOR_H
-#define TESSEL_TESTS_SUPPORT_FAILINGALLOCATOR_H
+#pragma once
 
 #include <cstddef>
 
@@ -23,4 +22,3 @@ public:
 
 }  // namespace tessel::test
 
-#endif

@@ -1,6 +1,5 @@
 // Makes calls of the kernel fail, while the object lives. One object at a time.
-#ifndef TESSEL_TESTS_SUPPORT_FAILINGPLATFORM_H
-#define TESSEL_TESTS_SUPPORT_FAILINGPLATFORM_H
+#pragma once
 
 #include <cstddef>
 
@@ -23,4 +22,3 @@ public:
 
 }  // namespace tessel::test
 
-#endif

@@ -1,6 +1,5 @@
 // Clocks that stand still and are moved by hand, while the object lives. One at a time. Sleeping moves them.
-#ifndef TESSEL_TESTS_SUPPORT_HANDCLOCK_H
-#define TESSEL_TESTS_SUPPORT_HANDCLOCK_H
+#pragma once
 
 #include <cstdint>
 
@@ -19,4 +18,3 @@ public:
 
 }  // namespace tessel::test
 
-#endif

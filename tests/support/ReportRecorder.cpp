@@ -6,6 +6,7 @@
 namespace tessel::test {
 namespace {
 
+constexpr int32 kAnyLevel = -1;
 std::atomic<ReportRecorder*> theRecorder{nullptr};
 
 }  // namespace
@@ -32,15 +33,13 @@ std::vector<Report> ReportRecorder::Reports() const {
 }
 
 std::vector<std::string> ReportRecorder::Texts() const {
-    std::vector<std::string> texts;
-    for (const Report& report : Reports()) texts.push_back(report.text);
-    return texts;
+    return Texts(kAnyLevel);
 }
 
 std::vector<std::string> ReportRecorder::Texts(int32 level) const {
     std::vector<std::string> texts;
     for (const Report& report : Reports())
-        if (report.level == level) texts.push_back(report.text);
+        if (level == kAnyLevel || report.level == level) texts.push_back(report.text);
     return texts;
 }
 
@@ -50,8 +49,7 @@ bool ReportRecorder::Has(int32 level, const std::string& text) const {
 }
 
 size_t ReportRecorder::Count() const {
-    std::lock_guard lock(mutex_);
-    return reports_.size();
+    return Reports().size();
 }
 
 size_t ReportRecorder::CountAt(int32 level) const {

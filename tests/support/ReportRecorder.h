@@ -1,6 +1,5 @@
 // Takes the reports made while it lives, in place of the handler that was installed.
-#ifndef TESSEL_TESTS_SUPPORT_REPORTRECORDER_H
-#define TESSEL_TESTS_SUPPORT_REPORTRECORDER_H
+#pragma once
 
 #include <tessel/diagnostics/DebugOutput.h>
 
@@ -46,4 +45,3 @@ private:
 
 }  // namespace tessel::test
 
-#endif

@@ -1,6 +1,5 @@
 // A temporary folder mounted as drive T: while the object lives, and removed with all it holds. One at a time.
-#ifndef TESSEL_TESTS_SUPPORT_SCRATCHDRIVE_H
-#define TESSEL_TESTS_SUPPORT_SCRATCHDRIVE_H
+#pragma once
 
 #include <string>
 #include <string_view>
@@ -31,4 +30,3 @@ private:
 
 }  // namespace tessel::test
 
-#endif

@@ -1,6 +1,5 @@
 // The library as far as files and resource files need it, with a scratch drive T:. Leaks are failures.
-#ifndef TESSEL_TESTS_SUPPORT_STARTEDFILES_H
-#define TESSEL_TESTS_SUPPORT_STARTEDFILES_H
+#pragma once
 
 #include "files/Service.h"
 #include "resources/Service.h"
@@ -36,4 +35,3 @@ public:
 
 }  // namespace tessel::test
 
-#endif

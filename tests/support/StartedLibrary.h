@@ -1,17 +1,24 @@
 // The library, started for as long as it lives.
-#ifndef TESSEL_TESTS_SUPPORT_STARTEDLIBRARY_H
-#define TESSEL_TESTS_SUPPORT_STARTEDLIBRARY_H
+#pragma once
+
+#include <tessel/frame/TesselInit.h>
+
+#include <gtest/gtest.h>
 
 namespace tessel::test {
 
 class StartedLibrary {
 public:
-    StartedLibrary();  // fails the test when the library does not start
-    ~StartedLibrary();
+    StartedLibrary() {
+        EXPECT_EQ(kNoErr, InitTesselBase());
+        EXPECT_EQ(kNoErr, InitTesselAppSupport());
+    }
+    ~StartedLibrary() {
+        UninitTesselAppSupport();
+        UninitTesselBase();
+    }
     StartedLibrary(const StartedLibrary&) = delete;
     StartedLibrary& operator=(const StartedLibrary&) = delete;
 };
 
 }  // namespace tessel::test
-
-#endif

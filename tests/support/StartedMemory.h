@@ -1,20 +1,33 @@
 // Events, mutexes and the memory manager, started while the object lives. Reports are recorded, those of the stop too.
-#ifndef TESSEL_TESTS_SUPPORT_STARTEDMEMORY_H
-#define TESSEL_TESTS_SUPPORT_STARTEDMEMORY_H
+#pragma once
 
+#include "memory/Service.h"
 #include "support/ReportRecorder.h"
+#include "sync/Service.h"
+
+#include <gtest/gtest.h>
 
 namespace tessel::test {
 
 class StartedMemory {
 public:
-    StartedMemory();
-    ~StartedMemory();
+    StartedMemory() {
+        for (auto start :
+             {ThEventStart, ThMutexStart, ProtectedAtomicOperationsStart, MemoryManagerStart, TrackedMallocFreeStart})
+            EXPECT_EQ(kNoErr, start());
+    }
+    ~StartedMemory() { Stop(); }
     StartedMemory(const StartedMemory&) = delete;
     StartedMemory& operator=(const StartedMemory&) = delete;
 
     // Stops before the end, to look at the reports of the stop.
-    void Stop();
+    void Stop() {
+        if (!started_) return;
+        started_ = false;
+        for (auto stop :
+             {TrackedMallocFreeStop, MemoryManagerStop, ProtectedAtomicOperationsStop, ThMutexStop, ThEventStop})
+            EXPECT_EQ(kNoErr, stop());
+    }
 
     ReportRecorder reports;
 
@@ -23,5 +36,3 @@ private:
 };
 
 }  // namespace tessel::test
-
-#endif

@@ -1,6 +1,5 @@
 // What paths and streams need, started for as long as it lives. Leaks are failures.
-#ifndef TESSEL_TESTS_SUPPORT_STARTEDPATHS_H
-#define TESSEL_TESTS_SUPPORT_STARTEDPATHS_H
+#pragma once
 
 #include "memory/Service.h"
 #include "paths/Service.h"
@@ -31,4 +30,3 @@ public:
 
 }  // namespace tessel::test
 
-#endif

@@ -1,6 +1,5 @@
 // A dumper that gathers what is written.
-#ifndef TESSEL_TESTS_SUPPORT_TEXTDUMPER_H
-#define TESSEL_TESTS_SUPPORT_TEXTDUMPER_H
+#pragma once
 
 #include <tessel/diagnostics/AllocTracker.h>
 
@@ -34,4 +33,3 @@ private:
 
 }  // namespace tessel::test
 
-#endif

@@ -1,6 +1,6 @@
 #include "platform/Thread.h"
 #include "support/HandClock.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include "support/malloc/FailingMalloc.h"
 #include "sync/ProtectedAtomicOperations.h"
 #include "sync/Service.h"
@@ -14,19 +14,8 @@
 #include <tessel/sync/ThSleep.h>
 #include <tessel/time/Millisecs.h>
 
-#include <atomic>
-#include <cstdlib>
-#include <gmock/gmock.h>
-#include <thread>
-#include <utility>
-#include <vector>
-
-namespace tessel {
+namespace tessel::test {
 namespace {
-
-using ::testing::Contains;
-using ::testing::ElementsAre;
-using ::testing::EndsWith;
 
 struct Sync : ::testing::Test {
     test::ReportRecorder reports;
@@ -43,23 +32,11 @@ struct Sync : ::testing::Test {
     }
 };
 
-template <class Work>
-void InThreads(int count, Work work) {
-    std::vector<std::thread> threads;
-    for (int i = 0; i < count; ++i) threads.emplace_back(work, i);
-    for (std::thread& thread : threads) thread.join();
-}
-
 TEST_F(Sync, SignalsCountAsOneUntilTheyAreTaken) {
     ThEvent event = NewEvent(true);
-    EXPECT_EQ(kThEventVerifier, event->verifier);
-    EXPECT_EQ(1, ThEventReset(event));
-    EXPECT_EQ(0, ThEventReset(event));
-    EXPECT_EQ(0, ThEventSignal(event));
-    EXPECT_EQ(0, ThEventSignal(event));
-    EXPECT_EQ(kNoErr, ThEventWaitWithTimeout(event, 0));
-    EXPECT_EQ(kTimeOutErr, ThEventWaitWithTimeout(event, 0));
-    EXPECT_EQ(kTimeOutErr, ThEventWaitWithTimeout(event, 20));
+    EXPECT_EACH(event->verifier == kThEventVerifier, ThEventReset(event) == 1, ThEventReset(event) == 0,
+                ThEventSignal(event) == 0, ThEventSignal(event) == 0, ThEventWaitWithTimeout(event, 0) == kNoErr,
+                ThEventWaitWithTimeout(event, 0) == kTimeOutErr, ThEventWaitWithTimeout(event, 20) == kTimeOutErr);
     ThEventDestroy(event);
 }
 
@@ -94,10 +71,8 @@ TEST_F(Sync, EverySignalReleasesOneOfManyThreads) {
         }
     };
     InThreads(kMakers + kTakers, [&](int thread) { thread < kMakers ? make() : take(thread - kMakers); });
-    EXPECT_EQ(each * kTakers, made);
-    EXPECT_EQ(made * (made + 1) / 2, sum);
-    EXPECT_EQ(kNoErr, ThEventWaitWithTimeout(empty, 0));
-    EXPECT_EQ(kTimeOutErr, ThEventWaitWithTimeout(full, 0));
+    EXPECT_EACH(each * kTakers == made, made * (made + 1) / 2 == sum, ThEventWaitWithTimeout(empty, 0) == kNoErr,
+                ThEventWaitWithTimeout(full, 0) == kTimeOutErr);
     for (ThEvent event : {empty, full, never}) ThEventDestroy(event);
 }
 
@@ -155,8 +130,7 @@ TEST_F(Sync, WaitsForSeveralThings) {
         EXPECT_EQ(0, ThEventMsgWaitMultiple(first, nullptr, -1, true));
     }).join();
     while (ThEventMessageArrived(ended) == kNoErr) std::this_thread::yield();  // until the host has let go of it
-    EXPECT_EQ(kArgErr, ThEventMessageArrived(ended));
-    EXPECT_EQ(0, ThEventMsgWaitMultiple(first, nullptr, 0, false));
+    EXPECT_EACH(ThEventMessageArrived(ended) == kArgErr, ThEventMsgWaitMultiple(first, nullptr, 0, false) == 0);
     EXPECT_EQ(0, ThEventMsgWaitMultiple(first, nullptr, -1, true));  // the message, or it would wait for ever
     std::thread signaler([&] { ThEventSignal(first); });
     EXPECT_EQ(1, ThEventMsgWaitMultiple(first, second, -1, true));
@@ -164,24 +138,20 @@ TEST_F(Sync, WaitsForSeveralThings) {
 
     int calls = 0;
     auto pump = [](void* argument) -> MgErr { return ++*static_cast<int*>(argument) + 40; };
-    EXPECT_EQ(kMemFullErr, ThEventWaitAndPump(first, pump, 10, &calls));
-    EXPECT_EQ(42, ThEventWaitAndPump(nullptr, pump, 10, &calls));
+    EXPECT_EACH(ThEventWaitAndPump(first, pump, 10, &calls) == kMemFullErr,
+                ThEventWaitAndPump(nullptr, pump, 10, &calls) == 42);
     ThEventDestroy(first);
     ThEventDestroy(second);
 }
 
 TEST_F(Sync, BadEventsAreReported) {
     THEVENTREC bad{0, nullptr, nullptr};
-    EXPECT_EQ(0, ThEventSignal(&bad));
-    EXPECT_EQ(0, ThEventReset(&bad));
-    EXPECT_EQ(kArgErr, ThEventWait(&bad));
-    EXPECT_EQ(1, ThEventMsgWaitMultiple(&bad, nullptr, 0, false));
+    EXPECT_EACH(ThEventSignal(&bad) == 0, ThEventReset(&bad) == 0, ThEventWait(&bad) == kArgErr,
+                ThEventMsgWaitMultiple(&bad, nullptr, 0, false) == 1);
     ThEventDestroy(&bad);
     EXPECT_THAT(reports.Texts(kDebugFatal), ElementsAre("Bad verifier in event.", "", "", "", ""));
-    EXPECT_EQ(0, ThEventSignal(nullptr));
-    EXPECT_EQ(0, ThEventReset(nullptr));
-    EXPECT_EQ(kArgErr, ThEventWait(nullptr));
-    EXPECT_EQ(1, ThEventMsgWaitMultiple(nullptr, nullptr, 0, false));
+    EXPECT_EACH(ThEventSignal(nullptr) == 0, ThEventReset(nullptr) == 0, ThEventWait(nullptr) == kArgErr,
+                ThEventMsgWaitMultiple(nullptr, nullptr, 0, false) == 1);
     ThEventDestroy(nullptr);
     EXPECT_THAT(reports.Texts(kDebugError), ElementsAre("Bad ThEvent in ThEventDestroy()"));
     THMUTEXREC badMutex{-1, nullptr, 0};
@@ -225,11 +195,9 @@ TEST_F(Sync, WhatThePlatformSaysIsReported) {
     DestroyPlatformEvent(event->platformEvent);
     ForeignEvent* foreign = new ForeignEvent;
     event->platformEvent = foreign;
-    EXPECT_EQ(kArgErr, ThEventWait(event));
-    EXPECT_EQ(1u, reports.CountAt(kDebugFatal));
+    EXPECT_EACH(ThEventWait(event) == kArgErr, reports.CountAt(kDebugFatal) == 1u);
     foreign->result = PlatformEvent::kRetry;
-    EXPECT_EQ(kArgErr, ThEventWait(event));
-    EXPECT_EQ(1u, reports.CountAt(kDebugWarning));
+    EXPECT_EACH(ThEventWait(event) == kArgErr, reports.CountAt(kDebugWarning) == 1u);
     ThEventDestroy(event);
     EXPECT_THAT(reports.Texts(),
                 ElementsAre("Wait on event failed", "We were not supposed to retry here",
@@ -242,8 +210,7 @@ TEST_F(Sync, WithoutMemoryNothingIsMade) {
         ThEvent event = nullptr;
         ThMutex mutex = nullptr;
         const MgErr eventErr = ThEventCreate(&event, 0, true), mutexErr = ThMutexCreate(&mutex, nullptr);
-        EXPECT_EQ(event ? kNoErr : kMemFullErr, eventErr);
-        EXPECT_EQ(mutex ? kNoErr : kMemFullErr, mutexErr);
+        EXPECT_EACH((event ? kNoErr : kMemFullErr) == eventErr, (mutex ? kNoErr : kMemFullErr) == mutexErr);
         if (event) ThEventDestroy(event);
         ThMutexDestroy(mutex);
     });
@@ -261,9 +228,7 @@ TEST_F(Sync, MutexesExclude) {
             if (i % 5000 == thread) std::this_thread::yield();
         }
     });
-    EXPECT_EQ(kThreads * kRounds, count);
-    EXPECT_EQ(-1, mutex->count);
-    EXPECT_EQ(kThMutexVerifier, mutex->verifier);
+    EXPECT_EACH(kThreads * kRounds == count, mutex->count == -1, mutex->verifier == kThMutexVerifier);
     ThMutexDestroy(mutex);
 }
 
@@ -280,14 +245,12 @@ TEST_F(Sync, ASleeperIsHandedTheMutex) {
     EXPECT_FALSE(reached);
     ThMutexRelease(mutex);
     waiter.join();
-    EXPECT_TRUE(reached);
-    EXPECT_EQ(-1, mutex->count);
+    EXPECT_EACH(reached, mutex->count == -1);
     ThMutexDestroy(mutex);
 }
 
 TEST_F(Sync, TrackersReportWhatIsLeft) {
-    EXPECT_EQ(kNoErr, ThEventStart());
-    EXPECT_EQ(kNoErr, ThMutexStart());
+    EXPECT_EACH(ThEventStart() == kNoErr, ThMutexStart() == kNoErr);
     ThMutex one = NewMutex(), two = NewMutex();
     ThEventDestroy(NewEvent());
     EXPECT_EQ(kNoErr, ThMutexStop());
@@ -300,24 +263,17 @@ TEST_F(Sync, TrackersReportWhatIsLeft) {
 
 TEST(Atomics, ReturnWhatTheyShould) {
     int32 word = 0x7FFFFFFF;
-    EXPECT_EQ(INT32_MIN, _ThAtomicInc(&word));
-    EXPECT_EQ(0x7FFFFFFF, _ThAtomicDec(&word));
-    EXPECT_EQ(0x7FFFFFFF, ThAtomicSwap(&word, 5));
-    EXPECT_EQ(0, ThSwapIfSame(&word, 6, 4));
-    EXPECT_EQ(5, word);
-    EXPECT_EQ(1, ThSwapIfSame(&word, 6, 5));
-    EXPECT_EQ(6, word);
+    EXPECT_EACH(_ThAtomicInc(&word) == INT32_MIN, _ThAtomicDec(&word) == 0x7FFFFFFF,
+                ThAtomicSwap(&word, 5) == 0x7FFFFFFF, ThSwapIfSame(&word, 6, 4) == 0, word == 5,
+                ThSwapIfSame(&word, 6, 5) == 1, word == 6);
     void* pointer = &word;
-    EXPECT_EQ(&word, ThAtomicSwapPtr(&pointer, nullptr));
-    EXPECT_EQ(0, ThSwapIfSamePtr(&pointer, &word, &word));
-    EXPECT_EQ(1, ThSwapIfSamePtr(&pointer, &word, nullptr));
-    EXPECT_EQ(&word, pointer);
+    EXPECT_EACH(&word == ThAtomicSwapPtr(&pointer, nullptr), ThSwapIfSamePtr(&pointer, &word, &word) == 0,
+                ThSwapIfSamePtr(&pointer, &word, nullptr) == 1, &word == pointer);
 }
 
 // Writers store words whose halves agree; no reader may see two halves of different writes.
 TEST_F(Sync, EightBytesGoAtOnce) {
-    EXPECT_EQ(kNoErr, ProtectedAtomicOperationsStart());
-    EXPECT_TRUE(AtomicsInHardware());
+    EXPECT_EACH(ProtectedAtomicOperationsStart() == kNoErr, AtomicsInHardware());
     for (bool hardware : {true, false}) {
         SetAtomicsInHardware(hardware);
         ThMutex mutex = NewMutex();
@@ -334,8 +290,7 @@ TEST_F(Sync, EightBytesGoAtOnce) {
         EXPECT_EQ(0, torn);
         uint64 own = 1, last = shared;
         Th8ByteAtomicWrtRd(&own, &shared, 0, nullptr);
-        EXPECT_EQ(last, own);
-        EXPECT_EQ(last, shared);
+        EXPECT_EACH(last == own, last == shared);
         ThMutexDestroy(mutex);
     }
     ProtectedAtomicOperationsStart();
@@ -344,9 +299,7 @@ TEST_F(Sync, EightBytesGoAtOnce) {
 TEST(Sleeping, EndsJustBeforeTheDeadline) {
     test::HandClock clock(5000);
     uint32 now = MilliSecs();
-    EXPECT_EQ(now, ThWaitTill(now, now));
-    EXPECT_EQ(now, ThWaitTill(now - 5, now));
-    EXPECT_EQ(now + 1, ThWaitTill(now + 1, now));
+    EXPECT_EACH(now == ThWaitTill(now, now), now == ThWaitTill(now - 5, now), now + 1 == ThWaitTill(now + 1, now));
     now = MilliSecs();
     EXPECT_EQ(now + 99, ThWaitTill(now + 100, now));
     ThSleep(7);
@@ -364,8 +317,7 @@ TEST(LocalStorage, KeepsAValueForEachThread) {
         ThLocalStorageSetValue(key, &thread);
         EXPECT_EQ(&thread, ThLocalStorageGetValue(key));
     });
-    EXPECT_EQ(&key, ThLocalStorageGetValue(key));
-    EXPECT_EQ(nullptr, ThLocalStorageGetValue(other));
+    EXPECT_EACH(&key == ThLocalStorageGetValue(key), ThLocalStorageGetValue(other) == nullptr);
     ThLocalStorageFreeKey(key);
     ThLocalStorageFreeKey(other);
 }
@@ -373,14 +325,12 @@ TEST(LocalStorage, KeepsAValueForEachThread) {
 TEST(PlatformObjects, WorkByThemselves) {
     PlatformEvent* event = CreatePlatformEvent(true);
     ASSERT_NE(nullptr, event);
-    EXPECT_EQ(0, event->Wait(0));
-    EXPECT_EQ(1, event->Wait(0));
+    EXPECT_EACH(event->Wait(0) == 0, event->Wait(0) == 1);
     uint32 count = 5;
     _HRTime total{1, 1};
     event->GetLatencyStats(&count, &total, nullptr, nullptr, nullptr);
-    EXPECT_EQ(0u, count + total.high + total.low);
-    EXPECT_EQ(kNoErr, DestroyPlatformEvent(event));
-    EXPECT_EQ(kNoErr, DestroyPlatformEvent(nullptr));
+    EXPECT_EACH(count + total.high + total.low == 0u, DestroyPlatformEvent(event) == kNoErr,
+                DestroyPlatformEvent(nullptr) == kNoErr);
     PlatformMutex* mutex = CreatePlatformMutex();
     ASSERT_NE(nullptr, mutex);
     int sum = 0;
@@ -391,9 +341,8 @@ TEST(PlatformObjects, WorkByThemselves) {
             mutex->Unlock();
         }
     });
-    EXPECT_EQ(20000, sum);
-    EXPECT_EQ(kNoErr, DestroyPlatformMutex(mutex));
+    EXPECT_EACH(sum == 20000, DestroyPlatformMutex(mutex) == kNoErr, DestroyPlatformMutex(nullptr) == kNoErr);
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,15 +1,14 @@
 #include "platform/System.h"
 #include "platform/Thread.h"
 #include "support/FailingPlatform.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include <tessel/system/CPUInformation.h>
 #include <tessel/system/OpSystemInfo.h>
 #include <tessel/system/PlatformInformation.h>
 
 #include <errno.h>
-#include <gmock/gmock.h>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 constexpr bool k64Bit = sizeof(void*) == 8;
@@ -24,34 +23,27 @@ std::string TextOf(const T& value) {
 TEST(OpSystemInfo, TellsOfThisHost) {
     OpSystemInfo* info = OSInfo();
     ASSERT_EQ(info, OSInfo());
-    EXPECT_EQ(k64Bit ? 19 : 8, info->GetTargetID());
-    EXPECT_EQ("Linux", info->GetFamilyName());
+    EXPECT_EACH((k64Bit ? 19 : 8) == info->GetTargetID(), info->GetFamilyName() == "Linux");
     platform::SystemVersion host = platform::GetSystemVersion();
-    EXPECT_GE(info->GetMajorVersion(), 2u);
-    EXPECT_EQ(std::to_string(host.major) + '.' + std::to_string(host.minor), info->GetVersionText());
-    EXPECT_EQ(host.patch, info->GetBuildNumber());
-    EXPECT_FALSE(info->GetName().empty());
-    EXPECT_EQ(info->GetName(), TextOf(static_cast<const OpSystemInfo*>(info)));
-    EXPECT_EQ("", TextOf(static_cast<const OpSystemInfo*>(nullptr)));
+    EXPECT_EACH(info->GetMajorVersion() >= 2u,
+                std::to_string(host.major) + '.' + std::to_string(host.minor) == info->GetVersionText(),
+                host.patch == info->GetBuildNumber(), !info->GetName().empty(),
+                info->GetName() == TextOf(static_cast<const OpSystemInfo*>(info)),
+                TextOf(static_cast<const OpSystemInfo*>(nullptr)) == "");
 }
 
 TEST(OpSystemInfo, HasFeatureFlags) {
     const OpSystemFeatureFlags& flags = OSInfo()->GetFeatureFlags();
-    EXPECT_EQ(k64Bit, (flags & OpSystemFeatureFlags::k64Bit()).IsNonZero());
-    EXPECT_FALSE((flags & OpSystemFeatureFlags::kIsNTOS()).IsNonZero());
-    EXPECT_TRUE(OpSystemFeatureFlags::kIsNTOS().IsNonZero());
-    EXPECT_FALSE((OpSystemFeatureFlags::kIsNTOS() & OpSystemFeatureFlags::kFirstBit()).IsNonZero());
-    EXPECT_FALSE(OpSystemFeatureFlags::kNone().IsNonZero());
+    EXPECT_EACH(k64Bit == (flags & OpSystemFeatureFlags::k64Bit()).IsNonZero(),
+                !(flags & OpSystemFeatureFlags::kIsNTOS()).IsNonZero(), OpSystemFeatureFlags::kIsNTOS().IsNonZero(),
+                !(OpSystemFeatureFlags::kIsNTOS() & OpSystemFeatureFlags::kFirstBit()).IsNonZero(),
+                !OpSystemFeatureFlags::kNone().IsNonZero());
 }
 
 TEST(Names, FollowTheIdentifiers) {
-    EXPECT_STREQ("invalid OS target", GetOSNameFromID(0));
-    EXPECT_STREQ("Linux", GetOSNameFromID(8));
-    EXPECT_STREQ("VxWorks", GetOSNameFromID(14));
-    EXPECT_STREQ("Linux x64", GetOSNameFromID(19));
-    EXPECT_STREQ("InvalidCPU", GetCPUArchName(0));
-    EXPECT_STREQ("ARM", GetCPUArchName(8));
-    EXPECT_STREQ("PIC", GetCPUArchName(10));
+    EXPECT_EACH(GetOSNameFromID(0) == "invalid OS target", GetOSNameFromID(8) == "Linux",
+                GetOSNameFromID(14) == "VxWorks", GetOSNameFromID(19) == "Linux x64", GetCPUArchName(0) == "InvalidCPU",
+                GetCPUArchName(8) == "ARM", GetCPUArchName(10) == "PIC");
     for (int32 none : {-1, 20}) EXPECT_STREQ("<unknown value>", GetOSNameFromID(none));
     for (int32 none : {-1, 11}) EXPECT_STREQ("<unknown value>", GetCPUArchName(none));
 }
@@ -60,30 +52,26 @@ TEST(CPUInformation, TellsOfThisHost) {
     InitCPUInformation();
     CPUInformation* info = CPUInfo();
     ASSERT_NE(nullptr, info);
-    EXPECT_EQ(info, CPUInfo());
-    EXPECT_EQ(info, PlatformInfo()->GetCPUInfo());
-    EXPECT_EQ(OSInfo(), PlatformInfo()->GetOSInfo());
-    EXPECT_EQ(k64Bit ? 9 : 3, info->GetArch());
-    EXPECT_EQ(k64Bit ? "x64" : "X86", info->GetArchName());
-    EXPECT_EQ(platform::NumberOfProcessors(), info->GetNumLogicalCPUs());
-    EXPECT_GE(info->GetNumHardwareThreads(), info->GetNumCores());
-    EXPECT_GE(info->GetNumPackages(), 1u);
+    EXPECT_EACH(info == CPUInfo(), info == PlatformInfo()->GetCPUInfo(), OSInfo() == PlatformInfo()->GetOSInfo(),
+                (k64Bit ? 9 : 3) == info->GetArch(), (k64Bit ? "x64" : "X86") == info->GetArchName(),
+                platform::NumberOfProcessors() == info->GetNumLogicalCPUs(),
+                info->GetNumHardwareThreads() >= info->GetNumCores(), info->GetNumPackages() >= 1u);
     ASSERT_NE(nullptr, info->GetMachineDescription());
     ASSERT_NE(nullptr, info->GetFeatures(kCPUFeatureSelector));
-    EXPECT_NE(0u, info->GetFeatures(kCPUFeatureSelector)->GetFlags() & CPUFeatures::kCompareExchange8);
-    EXPECT_EQ(nullptr, info->GetFeatures(0));
-    EXPECT_EQ("CPUArch: " + info->GetArchName() + ", NumLogicalCPUs: " + std::to_string(info->GetNumLogicalCPUs()),
-              TextOf(static_cast<const CPUInformation*>(info)));
-    EXPECT_EQ("Invalid CPUInformation", TextOf(static_cast<const CPUInformation*>(nullptr)));
+    EXPECT_EACH((info->GetFeatures(kCPUFeatureSelector)->GetFlags() & CPUFeatures::kCompareExchange8) != 0u,
+                info->GetFeatures(0) == nullptr,
+                "CPUArch: " + info->GetArchName() + ", NumLogicalCPUs: " + std::to_string(info->GetNumLogicalCPUs()) ==
+                    TextOf(static_cast<const CPUInformation*>(info)),
+                TextOf(static_cast<const CPUInformation*>(nullptr)) == "Invalid CPUInformation");
     UninitCPUInformation();
     test::ReportRecorder reports;
     test::FailingPlatform failing("openat", 1, EACCES);
     info = PlatformInfo()->GetCPUInfo();  // built anew
-    EXPECT_EQ(platform::NumberOfProcessors(), info->GetNumLogicalCPUs());
-    EXPECT_EQ(2u, info->GetNumCores() + info->GetNumPackages());
+    EXPECT_EACH(platform::NumberOfProcessors() == info->GetNumLogicalCPUs(),
+                info->GetNumCores() + info->GetNumPackages() == 2u);
     EXPECT_THAT(reports.Texts(kDebugWarning), ::testing::ElementsAre("cannot read /proc/cpuinfo, error 5"));
     UninitCPUInformation();
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

@@ -1,24 +1,17 @@
 #include "platform/posix/SystemCalls.h"
-#include "support/ReportRecorder.h"
 #include "support/ScratchDrive.h"
 #include "support/StartedLibrary.h"
+#include "support/Test.h"
 #include "threads/Service.h"
 #include <tessel/sync/ThEvent.h>
 #include <tessel/threads/ThThread.h>
 
-#include <atomic>
-#include <cstdlib>
 #include <errno.h>
 #include <filesystem>
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
 #include <pthread.h>
-#include <string>
 #include <sys/resource.h>
 #include <sys/syscall.h>
-#include <thread>
 #include <unistd.h>
-#include <vector>
 
 namespace {
 
@@ -63,6 +56,15 @@ void AwaitThreads(size_t most) {
     while (ThreadsOfProcess() > most) std::this_thread::yield();
 }
 
+TEST(ThThreadPriorities, AreTheUsualOnesUntilTheStart) {
+    int32 p[5];
+    uint8 distinct[5];
+    ThThreadGetNativePriorityInfo(&p[0], &p[1], &p[2], &p[3], &p[4]);
+    ThThreadGetPrioInfo(distinct);
+    EXPECT_THAT(p, ElementsAre(-15, 0, 1, 2, 15));
+    EXPECT_THAT(distinct, ElementsAre(1, 1, 1, 1, 1));
+}
+
 // ---- identity and the table -----------------------------------------------------------------------------------------
 
 TEST_F(ThThreadTest, KnowsItsThreads) {
@@ -82,16 +84,12 @@ TEST_F(ThThreadTest, KnowsItsThreads) {
             return AwaitEvent(mine.go);
         },
         &seen);
-    EXPECT_EQ(ThThreadGetIndex(nullptr), 0);
-    EXPECT_TRUE(IsStartUpThread());
-    EXPECT_TRUE(ThThreadActive(thread));
+    EXPECT_EACH(ThThreadGetIndex(nullptr) == 0, IsStartUpThread(), ThThreadActive(thread));
     int a = 0, b = 0;
     void* valueA = nullptr;
     ThSetThInfo(thread, &a, &b);
-    EXPECT_EQ(ThGetThInfo(thread, &valueA), &b);
-    EXPECT_EQ(valueA, &a);
-    EXPECT_EQ(ThGetThInfo(nullptr, &valueA), nullptr);
-    EXPECT_EQ(valueA, nullptr);
+    EXPECT_EACH(ThGetThInfo(thread, &valueA) == &b, valueA == &a, ThGetThInfo(nullptr, &valueA) == nullptr,
+                valueA == nullptr);
     ThPlatformThread* handle = nullptr;
     uint32* id = nullptr;
     ThGetPlatformThread(thread, &handle, &id);
@@ -108,16 +106,13 @@ TEST_F(ThThreadTest, KnowsItsThreads) {
 
 TEST_F(ThThreadTest, HasNoIdentityBeforeTheStartUpThread) {
     Restart(nullptr);
-    EXPECT_EQ(ThThreadGetId(), nullptr);
-    EXPECT_EQ(ThThreadGetIndex(nullptr), 2048);
+    EXPECT_EACH(ThThreadGetId() == nullptr, ThThreadGetIndex(nullptr) == 2048);
     EXPECT_THAT(reports_.Texts(kDebugError), ElementsAre("bad ThThread in ThThreadGetIndex()"));
     EXPECT_EQ(AssimilateStartUpThread(), 1);
     std::thread([] {
         ThThread adopted = nullptr;
-        EXPECT_EQ(ThThreadGetId(), nullptr);
-        EXPECT_EQ(ThPseudoThreadCreate(&adopted), kNoErr);
-        EXPECT_EQ(ThThreadGetId(), adopted);
-        EXPECT_TRUE(adopted->adopted == 1 && ThThreadActive(adopted));
+        EXPECT_EACH(ThThreadGetId() == nullptr, ThPseudoThreadCreate(&adopted) == kNoErr, ThThreadGetId() == adopted,
+                    adopted->adopted == 1, ThThreadActive(adopted));
         ThThreadDestroy(adopted);
         EXPECT_EQ(ThThreadGetId(), nullptr);
     }).join();
@@ -136,8 +131,8 @@ TEST_F(ThThreadTest, RefusesOneMoreThanTheTableHolds) {
                       },
                       nullptr, nullptr),
                   kMemFullErr);
-        EXPECT_EQ(ThPseudoThreadCreate(&adopted), kMemFullErr);
-        EXPECT_TRUE(started == nullptr && adopted == nullptr && ThThreadGetId() == records.back());
+        EXPECT_EACH(ThPseudoThreadCreate(&adopted) == kMemFullErr, started == nullptr, adopted == nullptr,
+                    ThThreadGetId() == records.back());
         const int32 freed = ThThreadGetIndex(records[100]);
         ThThreadDestroy(records[100]);  // not the calling thread's current record
         EXPECT_THAT(reports_.Texts(), ElementsAre("Thread Array full!!", "Thread Array full!!",
@@ -153,28 +148,22 @@ TEST_F(ThThreadTest, RefusesOneMoreThanTheTableHolds) {
 TEST_F(ThThreadTest, GivesEachOfManyThreadsAPlaceOfItsOwn) {
     static std::atomic<int> users[kMaxThThreads], collisions, ended;
     collisions = ended = 0;
-    std::vector<std::thread> creators;
-    for (int i = 0; i < 4; ++i) {
-        creators.emplace_back([this] {
-            for (int round = 0; round < 100; ++round) {
-                ThThread thread = StartThread([](void*) -> int32 {
-                    std::atomic<int>& mine = users[ThThreadGetIndex(nullptr)];
-                    if (mine++ != 0) ++collisions;
-                    --mine;
-                    return ++ended;
-                });
-                ThThread hasty =
-                    StartThread([](void*) -> int32 { return ThThreadGetIndex(nullptr) != 0 ? ++ended : 0; });
-                for (int spin = 0; spin < round % 5 * 100; ++spin) ThThreadActive(hasty);
-                ThThreadDestroy(hasty);                                    // while it begins, runs or ends
-                while (ThThreadActive(thread)) std::this_thread::yield();  // its place is taken as long as it uses it
-                ThThreadDestroy(thread);
-            }
-        });
-    }
-    for (std::thread& creator : creators) creator.join();
-    EXPECT_EQ(ended, 4 * 100 * 2);
-    EXPECT_EQ(collisions, 0);
+    tessel::test::InThreads(4, [this](int) {
+        for (int round = 0; round < 100; ++round) {
+            ThThread thread = StartThread([](void*) -> int32 {
+                std::atomic<int>& mine = users[ThThreadGetIndex(nullptr)];
+                if (mine++ != 0) ++collisions;
+                --mine;
+                return ++ended;
+            });
+            ThThread hasty = StartThread([](void*) -> int32 { return ThThreadGetIndex(nullptr) != 0 ? ++ended : 0; });
+            for (int spin = 0; spin < round % 5 * 100; ++spin) ThThreadActive(hasty);
+            ThThreadDestroy(hasty);                                    // while it begins, runs or ends
+            while (ThThreadActive(thread)) std::this_thread::yield();  // its place is taken as long as it uses it
+            ThThreadDestroy(thread);
+        }
+    });
+    EXPECT_EACH(ended == 4 * 100 * 2, collisions == 0);
     EXPECT_THAT(reports_.Texts(), IsEmpty());
 }
 
@@ -184,10 +173,8 @@ TEST_F(ThThreadTest, ReportsBadRecordsAndThreadsThatAreLeft) {
     THTHREADREC bad{};
     ThThreadDestroy(nullptr);
     ThThreadDestroy(&bad);
-    EXPECT_EQ(ThThreadGetIndex(&bad), 2048);
-    EXPECT_EQ(ThThreadGetPriority(&bad), kThPriorityNormal);
-    EXPECT_EQ(ThThreadSetPriority(&bad, 1), kNoErr);
-    EXPECT_FALSE(ThThreadActive(&bad));
+    EXPECT_EACH(ThThreadGetIndex(&bad) == 2048, ThThreadGetPriority(&bad) == kThPriorityNormal,
+                ThThreadSetPriority(&bad, 1) == kNoErr, !ThThreadActive(&bad));
     EXPECT_THAT(
         reports_.Texts(kDebugError),
         ElementsAre("threadp does not have correct verifier in ThThreadDestroy", "bad ThThread in ThThreadGetIndex()",
@@ -348,9 +335,8 @@ TEST_F(ThThreadTest, SetsPrioritiesAndTellsTheHost) {
     };
     ThThreadPrioritySetProc other = [](ThThread, ThPlatformThread, uint32, int32) {};
     Restart(Lowered);  // everybody may lower a priority
-    EXPECT_EQ(ThSetThreadPrioritySetProc(nullptr), kArgErr);
-    EXPECT_EQ(ThSetThreadPrioritySetProc(note), kNoErr);
-    EXPECT_EQ(ThSetThreadPrioritySetProc(other), kArgErr);
+    EXPECT_EACH(ThSetThreadPrioritySetProc(nullptr) == kArgErr, ThSetThreadPrioritySetProc(note) == kNoErr,
+                ThSetThreadPrioritySetProc(other) == kArgErr);
     ThEvent go = nullptr;
     ThEventCreate(&go, 0, false);
     thread = StartThread(AwaitEvent, go);
@@ -358,11 +344,9 @@ TEST_F(ThThreadTest, SetsPrioritiesAndTellsTheHost) {
 
     EXPECT_EQ(ThThreadGetPriority(thread), kThPriorityVeryHigh);  // 0, as it was started
     for (int32 level : {3, 2, 5, -1, 0}) EXPECT_EQ(ThThreadSetPriority(thread, level), kNoErr);
-    EXPECT_EQ(ThThreadSetPriority(nullptr, 1), kNoErr);
-    EXPECT_EQ(ThThreadGetPriority(thread), kThPriorityBackground);
+    EXPECT_EACH(ThThreadSetPriority(nullptr, 1) == kNoErr, ThThreadGetPriority(thread) == kThPriorityBackground);
     EXPECT_THAT(levelsSet, ElementsAre(3, 2, 1, 0));
-    EXPECT_EQ(ThClearThreadPrioritySetProc(other), kArgErr);
-    EXPECT_EQ(ThClearThreadPrioritySetProc(note), kNoErr);
+    EXPECT_EACH(ThClearThreadPrioritySetProc(other) == kArgErr, ThClearThreadPrioritySetProc(note) == kNoErr);
     EXPECT_THAT(reports_.Texts(),
                 ElementsAre("bad argument to ThThreadSetPriority()", "", "bad argument to ThThreadSetPriority()",
                             "Someone is attempting to clear the ThreadPrioritySetProc but didn't set it!"));
@@ -425,11 +409,10 @@ TEST_F(ThThreadTest, TellsOfTheThreadAndTheMachine) {
     ThGetThreadTime(&before);
     do ThGetThreadTime(&after);
     while (HRTimeCompare(&after, &before) == 0);
-    EXPECT_EQ(HRTimeCompare(&after, &before), 1);
-    EXPECT_EQ(ThNumberOfProcessors(), static_cast<int32>(std::thread::hardware_concurrency()));
-    EXPECT_EQ(ThThreadStackLeft(), 2147483647);
-    EXPECT_EQ(stack_overflow_exception_filter(0xC00000FDu), 1);
-    EXPECT_EQ(stack_overflow_exception_filter(0xC0000005u), 0);
+    EXPECT_EACH(HRTimeCompare(&after, &before) == 1,
+                ThNumberOfProcessors() == static_cast<int32>(std::thread::hardware_concurrency()),
+                ThThreadStackLeft() == 2147483647, stack_overflow_exception_filter(0xC00000FDu) == 1,
+                stack_overflow_exception_filter(0xC0000005u) == 0);
 }
 
 }  // namespace

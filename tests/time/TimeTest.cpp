@@ -1,23 +1,20 @@
 #include "support/HandClock.h"
+#include "support/Test.h"
 #include "time/ClockMode.h"
 #include <tessel/time/BMTime.h>
 #include <tessel/time/HRTime.h>
 #include <tessel/time/Millisecs.h>
 
 #include <cmath>
-#include <gtest/gtest.h>
 #include <limits>
-#include <random>
 
-namespace tessel {
+namespace tessel::test {
 namespace {
 
 constexpr uint64 kEpoch = 95616288000000000;
 
 TEST(Millisecs, CompareAcrossTheWrap) {
-    EXPECT_EQ(10, MillisecCmp(5, 0xFFFFFFFB));
-    EXPECT_EQ(-10, MillisecCmp(0xFFFFFFFB, 5));
-    EXPECT_EQ(0, MillisecCmp(7, 7));
+    EXPECT_EACH(MillisecCmp(5, 0xFFFFFFFB) == 10, MillisecCmp(0xFFFFFFFB, 5) == -10, MillisecCmp(7, 7) == 0);
     test::HandClock clock((int64{1} << 32) - 3);
     EXPECT_EQ(0xFFFFFFFDu, MilliSecs());
     clock.Advance(8);
@@ -29,40 +26,26 @@ TEST(HRTime, CountsInTwoWords) {
     HRTimeSubtract(&carry, &one, &t);
     EXPECT_EQ(0, HRTimeCompare(&most, &t));
     HRTimeAdd(&t, &one, &t);
-    EXPECT_EQ(0, HRTimeCompare(&carry, &t));
-    EXPECT_EQ(1, HRTimeCompare(&large, &five));
-    EXPECT_EQ(-1, HRTimeCompare(&five, &most));
+    EXPECT_EACH(HRTimeCompare(&carry, &t) == 0, HRTimeCompare(&large, &five) == 1, HRTimeCompare(&five, &most) == -1);
     HRTimeZero(&t);
     HRTimeSubtract(&t, &one, &t);
     EXPECT_EQ(0xFFFFFFFFu, t.high & t.low);
 }
 
 TEST(HRTime, DependsOnTheMode) {
-    EXPECT_EQ(1.0, SecondsOf({0, 10000000}, ClockMode::kProcessTime));
-    EXPECT_EQ(1.0, SecondsOf({0, 1000}, ClockMode::kTick));
-    EXPECT_EQ(4294967.296, SecondsOf({1, 0}, ClockMode::kTick));
-    struct Case {
-        double seconds;
-        ClockMode mode;
-        uint32 high, low;
+    EXPECT_EACH(SecondsOf({0, 10000000}, ClockMode::kProcessTime) == 1.0, SecondsOf({0, 1000}, ClockMode::kTick) == 1.0,
+                SecondsOf({1, 0}, ClockMode::kTick) == 4294967.296);
+    const auto count = [](double seconds, ClockMode mode) {
+        const _HRTime t = TimeOf(seconds, mode);
+        return uint64{t.high} << 32 | t.low;
     };
-    const Case cases[] = {{1.5, ClockMode::kProcessTime, 0, 15000000},
-                          {1.5, ClockMode::kTick, 0, 1500},
-                          {1e6, ClockMode::kProcessTime, 2328, 1316134912},
-                          {-0.001, ClockMode::kTick, 0, 0xFFFFFFFF},
-                          {1e300, ClockMode::kTick, 0, 0}};
-    for (const Case& c : cases) {
-        _HRTime t = TimeOf(c.seconds, c.mode);
-        EXPECT_EQ(c.high, t.high) << c.seconds;
-        if (c.seconds < 1e200) {
-            EXPECT_EQ(c.low, t.low) << c.seconds;
-        }
-    }
+    EXPECT_EACH(count(1.5, ClockMode::kProcessTime) == 15000000u, count(1.5, ClockMode::kTick) == 1500u,
+                count(1e6, ClockMode::kProcessTime) == 10000000000000u, count(-0.001, ClockMode::kTick) == 0xFFFFFFFFu,
+                (count(1e300, ClockMode::kTick) >> 32) == 0u, CurrentClockMode() == ClockMode::kTick);
     _HRTime before = ReadClock(ClockMode::kProcessTime);
     for (volatile int work = 0; work < 1000000;) work = work + 1;
     _HRTime after = ReadClock(ClockMode::kProcessTime);
-    EXPECT_GE(HRTimeCompare(&after, &before), 0);
-    EXPECT_LT(SecondsOf(after, ClockMode::kProcessTime), 1e6);
+    EXPECT_EACH(HRTimeCompare(&after, &before) >= 0, SecondsOf(after, ClockMode::kProcessTime) < 1e6);
 }
 
 TEST(HRTime, CountsTheWrapsOfTheTick) {
@@ -107,20 +90,14 @@ TEST(ATime128, HoldsSecondsAndFraction) {
     t.IncrementLSB();
     EXPECT_EQ(ATime128(6, 0), t);
     ATime128 half(-1, uint64{1} << 63);
-    EXPECT_EQ(-1.0, half.getSeconds());
-    EXPECT_EQ(0.5, half.getFraction());
-    EXPECT_EQ(-0.5, half.ToDouble());
-    EXPECT_LT(ATime128(0, UINT64_MAX).getFraction(), 1.0);
-    EXPECT_EQ(0x1p-64, ATime128(0, 1).getFraction());
+    EXPECT_EACH(half.getSeconds() == -1.0, half.getFraction() == 0.5, half.ToDouble() == -0.5,
+                ATime128(0, UINT64_MAX).getFraction() < 1.0, ATime128(0, 1).getFraction() == 0x1p-64);
     t.SetInt64Seconds(0x0102030405060708);
     t.SetUInt64Fraction(0x1112131415161718);
     uint32 words[4];
     t.Get(&words[0], &words[1], &words[2], &words[3]);
     t.Get(nullptr, nullptr, nullptr, nullptr);
-    EXPECT_EQ(0x01020304u, words[0]);
-    EXPECT_EQ(0x05060708u, words[1]);
-    EXPECT_EQ(0x11121314u, words[2]);
-    EXPECT_EQ(0x15161718u, words[3]);
+    EXPECT_THAT(words, ElementsAre(0x01020304u, 0x05060708u, 0x11121314u, 0x15161718u));
 }
 
 TEST(ATime128, ConvertsDoublesExactly) {
@@ -141,16 +118,15 @@ TEST(ATime128, ConvertsDoublesExactly) {
     for (double huge : {kInfinity, 1e300, 9.3e18, std::nan("")}) EXPECT_EQ(largest, ATime128(huge));
     for (double huge : {-kInfinity, -1e300, -9.3e18, std::copysign(std::nan(""), -1.0)})
         EXPECT_EQ(smallest, ATime128(huge));
-    EXPECT_EQ(smallest, ATime128(-9223372036854775808.0));
-    EXPECT_EQ(-9223372036854775808.0, smallest.ToDouble());
-    EXPECT_EQ(ATime128(), ATime128(5e-324));
+    EXPECT_EACH(smallest == ATime128(-9223372036854775808.0), smallest.ToDouble() == -9223372036854775808.0,
+                ATime128() == ATime128(5e-324));
 }
 
 TEST(ATime128, MultipliesAndRounds) {
     // 2.75 x -3.5 by hand, and a product that rounds: 2^-33 x 3 x 2^-32 = 1.5 x 2^-64, half up.
-    EXPECT_EQ(ATime128(-9.625), ATime128(2.75) * ATime128(-3.5));
-    EXPECT_EQ(ATime128(0, 2), ATime128(0, uint64{1} << 31) * ATime128(0, uint64{3} << 32));
-    EXPECT_EQ(-ATime128(0, 2), ATime128(0, uint64{1} << 31) * -ATime128(0, uint64{3} << 32));
+    EXPECT_EACH(ATime128(-9.625) == ATime128(2.75) * ATime128(-3.5),
+                ATime128(0, 2) == ATime128(0, uint64{1} << 31) * ATime128(0, uint64{3} << 32),
+                -ATime128(0, 2) == ATime128(0, uint64{1} << 31) * -ATime128(0, uint64{3} << 32));
 }
 
 #ifdef __SIZEOF_INT128__
@@ -190,8 +166,7 @@ TEST(ATime128, CalculatesAsExactIntegers) {
         wrong += Exact(a) + Exact(b) != Exact(a + b) || Exact(a) - Exact(b) != Exact(a - b) || -Exact(a) != Exact(-a) ||
                  Exact(a) + 1 != Exact(next) || ExactProduct(a, b) != Exact(a * b);
         // A double keeps 53 bits: what it stands for is at most one bit of those away, and goes back unchanged.
-        const UInt128 size = a.GetInt64Seconds() < 0 ? -Exact(a) : Exact(a);
-        const UInt128 kept = Exact(ATime128(std::fabs(value)));
+        const UInt128 size = a.GetInt64Seconds() < 0 ? -Exact(a) : Exact(a), kept = Exact(ATime128(std::fabs(value)));
         wrong += (kept > size ? kept - size : size - kept) > size >> 52 || ATime128(value).ToDouble() != value;
     }
     EXPECT_EQ(0, wrong);
@@ -199,8 +174,8 @@ TEST(ATime128, CalculatesAsExactIntegers) {
 #endif
 
 TEST(ATime128, ConvertsFileTimes) {
-    EXPECT_EQ(kEpoch, CountOf(FILETIMEFromATime128(ATime128())));
-    EXPECT_EQ(ATime128(), ATime128FromFILETIME(FileTimeOf(kEpoch)));
+    EXPECT_EACH(CountOf(FILETIMEFromATime128(ATime128())) == kEpoch,
+                ATime128() == ATime128FromFILETIME(FileTimeOf(kEpoch)));
     EXPECT_EQ(kEpoch - 1, CountOf(FILETIMEFromATime128(-ATime128(0, 1))));  // rounded down
     // 2000-01-01 00:00:00 UTC lies 125911584000000000 x 100 ns after 1601, 3029529600 s after 1904.
     EXPECT_EQ(ATime128(3029529600, 0), ATime128FromFILETIME(FileTimeOf(125911584000000000)));
@@ -219,4 +194,4 @@ TEST(ATime128, ConvertsFileTimes) {
 }
 
 }  // namespace
-}  // namespace tessel
+}  // namespace tessel::test

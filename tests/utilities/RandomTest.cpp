@@ -1,19 +1,15 @@
 #include "support/FailingPlatform.h"
 #include "support/HandClock.h"
-#include "support/ReportRecorder.h"
+#include "support/Test.h"
 #include "support/malloc/FailingMalloc.h"
 #include <tessel/diagnostics/DebugStream.h>
 #include <tessel/utilities/OVGuid.h>
 #include <tessel/utilities/RandomGen.h>
 
-#include <algorithm>
-#include <cstring>
 #include <errno.h>
-#include <gtest/gtest.h>
 #include <set>
-#include <string>
-#include <thread>
-#include <vector>
+
+using namespace tessel::test;
 
 namespace {
 
@@ -36,9 +32,8 @@ std::vector<double> Stream(const int32 seeds[3], size_t count) {
 TEST(RandomGen, GivesItsExactStream) {
     int32 seeds[3] = {1, 1, 1};
     std::vector<double> numbers = Stream(seeds, 1000);
-    EXPECT_EQ(numbers[0], 0x1.15655e1ad3ad5p-6);
-    EXPECT_EQ(numbers[99], 0x1.bcd5d3749b954p-1);
-    EXPECT_EQ(numbers[999], 0x1.e32e7fc1ca464p-1);
+    EXPECT_EACH(numbers[0] == 0x1.15655e1ad3ad5p-6, numbers[99] == 0x1.bcd5d3749b954p-1,
+                numbers[999] == 0x1.e32e7fc1ca464p-1);
     uint64 checksum = 0;
     for (double each : numbers) {
         uint64 bits;
@@ -56,13 +51,9 @@ TEST(RandomGen, ThreadsShareOneSeededStream) {
     RandomGen(&drawn[0]);
     EXPECT_EQ(drawn[0], 0);  // not seeded
     SeededGenerator generator;
-    std::vector<std::thread> threads;
-    for (size_t t = 0; t < kThreads; ++t) {
-        threads.emplace_back([&drawn, t] {
-            for (size_t i = 0; i < kEach; ++i) RandomGen(&drawn[t * kEach + i]);
-        });
-    }
-    for (std::thread& thread : threads) thread.join();
+    InThreads(kThreads, [&](int thread) {
+        for (size_t i = 0; i < kEach; ++i) RandomGen(&drawn[static_cast<size_t>(thread) * kEach + i]);
+    });
     std::vector<double> expected = Stream(generator.seeds, drawn.size() + 1);
     int32 state[3];
     RandomGenInitState(state);
@@ -92,11 +83,9 @@ TEST(OVGuid, TurnsIntoTextAndBack) {
     OVGuidType guid{};
     EXPECT_EQ(OVGuidToCStr(&kSample, text), kNoErr);
     EXPECT_STREQ(text, kSampleText);
-    EXPECT_EQ(OVGuidToCStr(NullOVGuid(), text), kNoErr);
-    EXPECT_STREQ(text, "00000000-0000-0000-0000-000000000000");
-    EXPECT_EQ(OVGuidFromCStr("00112233-4455-6677-8899-AABBCCddeeFF", &guid), kNoErr);
-    EXPECT_TRUE(OVGuidsEqual(&guid, &kSample));
-    EXPECT_FALSE(OVGuidsEqual(&guid, NullOVGuid()));
+    EXPECT_EACH(OVGuidToCStr(NullOVGuid(), text) == kNoErr, text == "00000000-0000-0000-0000-000000000000",
+                OVGuidFromCStr("00112233-4455-6677-8899-AABBCCddeeFF", &guid) == kNoErr, OVGuidsEqual(&guid, &kSample),
+                !OVGuidsEqual(&guid, NullOVGuid()));
     const char* bad[] = {"",
                          "00112233-4455-6677-8899-aabbccddeef",
                          "00112233-4455-6677-8899-aabbccddeeff0",
@@ -110,11 +99,9 @@ TEST(OVGuid, TurnsIntoTextAndBack) {
         EXPECT_EQ(OVGuidFromCStr(each, &guid), kGuidErr) << each;
         EXPECT_TRUE(OVGuidsEqual(&guid, &kSample)) << each;
     }
-    EXPECT_EQ(OVGuidFromCStr(nullptr, nullptr), kArgErr);
-    EXPECT_EQ(OVGuidFromCStr("nothing is done", nullptr), kNoErr);
-    EXPECT_EQ(OVGuidToCStr(&kSample, nullptr), kNoErr);
-    EXPECT_EQ(OVGuidToCStr(nullptr, text), kGuidErr);
-    EXPECT_STREQ(text, "");
+    EXPECT_EACH(OVGuidsEqual(nullptr, nullptr), !OVGuidsEqual(&guid, nullptr), !OVGuidsEqual(nullptr, &guid),
+                OVGuidFromCStr(nullptr, nullptr) == kArgErr, OVGuidFromCStr("nothing is done", nullptr) == kNoErr,
+                OVGuidToCStr(&kSample, nullptr) == kNoErr, OVGuidToCStr(nullptr, text) == kGuidErr, text == "");
     tessel::test::ReportRecorder reports;
     TESSEL_REPORT(kDebugInfo, 0x11223344u) << kSample;
     EXPECT_EQ(reports.Texts(), std::vector<std::string>{kSampleText});

@@ -1,14 +1,8 @@
+#include "support/Test.h"
 #include <tessel/utilities/SortSearch.h>
 
-#include <algorithm>
 #include <climits>
 #include <cmath>
-#include <cstring>
-#include <gtest/gtest.h>
-#include <random>
-#include <string>
-#include <utility>
-#include <vector>
 
 namespace {
 
@@ -94,8 +88,7 @@ TEST(QSort, EndsWithinTheArrayWhateverTheComparisonAnswers) {
             bench.answer = liar;
             bench.Sort();
             std::vector<Record> after = bench.All();
-            EXPECT_TRUE(std::is_permutation(after.begin(), after.end(), before.begin()));
-            EXPECT_TRUE(bench.IsIntact());
+            EXPECT_EACH(std::is_permutation(after.begin(), after.end(), before.begin()), bench.IsIntact());
         }
     }
 }
@@ -177,9 +170,8 @@ TEST(QSort, TakesTheStepsDescribed) {
     const int16 low = INT16_MIN, high = INT16_MAX;
     EXPECT_EQ(CompareInt16s(&low, &high), -65535);
     const uintptr_t least = 0, most = UINTPTR_MAX;
-    EXPECT_EQ(CompareUIntPtrTs(&least, &most), -1);
-    EXPECT_EQ(CompareUIntPtrTs(&most, &least), 1);
-    EXPECT_EQ(CompareUIntPtrTs(&most, &most), 0);
+    EXPECT_EACH(CompareUIntPtrTs(&least, &most) == -1, CompareUIntPtrTs(&most, &least) == 1,
+                CompareUIntPtrTs(&most, &most) == 0);
 }
 
 // Chooses its answers as it goes (McIlroy's adversary): a record has no value yet until it must have one.
@@ -221,8 +213,7 @@ TEST(BinSearch, FindsOrTellsWhereToInsert) {
         return static_cast<int32>(*static_cast<const int*>(key)) - *static_cast<const char*>(record);
     };
     const int key = 'e';
-    EXPECT_EQ(BinSearchEx("bdf", 3, 1, &key, compare, &asked), -3);
-    EXPECT_EQ(asked, "df");
+    EXPECT_EACH(BinSearchEx("bdf", 3, 1, &key, compare, &asked) == -3, asked == "df");
 }
 
 }  // namespace

@@ -1,9 +1,6 @@
+#include "support/Test.h"
 #include "support/malloc/FailingMalloc.h"
 #include <tessel/utilities/UserCommandLine.h>
-
-#include <gtest/gtest.h>
-#include <string>
-#include <vector>
 
 namespace {
 
@@ -30,51 +27,43 @@ private:
     std::vector<char*> args_;
 };
 
+std::string Joined(const Words& words) {
+    std::string text;
+    for (const std::string& word : words) text += word + '|';
+    return text;
+}
+
+// The application's words of a command line, the user's, and the preferences.
+std::string Split(Words words, bool ignore = false) {
+    Host host(words);
+    SetIgnoreCommandLine(ignore);
+    EXPECT_EACH(host.Init() == kNoErr, Get(GetRawCommandLine) == words);
+    return Joined(Get(GetAppCommandLine)) + "; " + Joined(Get(GetUserCommandLine)) + "; " +
+           (GetPrefsPath() ? GetPrefsPath() : "null");
+}
+
 TEST(UserCommandLine, IsSplitAtTheFirstSeparator) {
-    const struct {
-        Words all;
-        bool ignore;
-        Words app, user;
-        const char* prefs;
-    } cases[] = {
-        {{"prog", "-x", "--", "-y", "z"}, false, {"prog", "-x"}, {"prog", "-y", "z"}, nullptr},
-        {{"prog", "-pref"}, false, {"prog", "-pref"}, {"prog"}, nullptr},
-        {{"prog", "--", "a", "--", "b"}, false, {"prog"}, {"prog", "a", "--", "b"}, nullptr},
-        {{"--", "a"}, false, {}, {"--", "a"}, nullptr},
-        {{"prog", "---", "-- "}, false, {"prog", "---", "-- "}, {"prog"}, nullptr},
-        {{"prog", "-x", "--", "z"}, true, {}, {"prog", "-x", "--", "z"}, nullptr},
-        {{"prog", "-pref", "a", "-pref", "b"}, false, {"prog", "-pref", "a", "-pref", "b"}, {"prog"}, "b"},
-        {{"prog", "-pref", "a", "-pref"}, false, {"prog", "-pref", "a", "-pref"}, {"prog"}, "a"},
-        {{"prog", "--", "-pref", "a"}, false, {"prog"}, {"prog", "-pref", "a"}, nullptr},
-    };
-    for (const auto& each : cases) {
-        Host host(each.all);
-        SetIgnoreCommandLine(each.ignore);
-        EXPECT_EQ(host.Init(), kNoErr);
-        EXPECT_EQ(Get(GetRawCommandLine), each.all);
-        EXPECT_EQ(Get(GetAppCommandLine), each.app);
-        EXPECT_EQ(Get(GetUserCommandLine), each.user);
-        EXPECT_STREQ(GetPrefsPath(), each.prefs);
-    }
+    EXPECT_EACH(Split({"prog", "-x", "--", "-y", "z"}) == "prog|-x|; prog|-y|z|; null",
+                Split({"prog", "-pref"}) == "prog|-pref|; prog|; null",
+                Split({"prog", "--", "a", "--", "b"}) == "prog|; prog|a|--|b|; null",
+                Split({"--", "a"}) == "; --|a|; null", Split({"prog", "---", "-- "}) == "prog|---|-- |; prog|; null",
+                Split({"prog", "-x", "--", "z"}, true) == "; prog|-x|--|z|; null",
+                Split({"prog", "-pref", "a", "-pref", "b"}) == "prog|-pref|a|-pref|b|; prog|; b",
+                Split({"prog", "-pref", "a", "-pref"}) == "prog|-pref|a|-pref|; prog|; a",
+                Split({"prog", "--", "-pref", "a"}) == "prog|; prog|-pref|a|; null");
 }
 
 TEST(UserCommandLine, RefusesNoneAndASecondOne) {
     EXPECT_EQ(InitUserCommandLine(0, nullptr), kArgErr);
     Host first({"one", "-pref", "a.ini", "--", "a"}), second({"two", "--", "b"});
-    EXPECT_EQ(first.Init(), kNoErr);
-    EXPECT_EQ(second.Init(), kArgErr);
-    EXPECT_EQ(Get(GetAppCommandLine), (Words{"two", "--", "b"}));
-    EXPECT_EQ(Get(GetUserCommandLine), (Words{"one", "a"}));
-    EXPECT_EQ(SetPrefsPath("own.ini"), kNoErr);
-    EXPECT_EQ(SetPrefsPath(GetPrefsPath()), kNoErr);
+    EXPECT_EACH(first.Init() == kNoErr, second.Init() == kArgErr, Get(GetAppCommandLine) == (Words{"two", "--", "b"}),
+                Get(GetUserCommandLine) == (Words{"one", "a"}), SetPrefsPath("own.ini") == kNoErr,
+                SetPrefsPath(GetPrefsPath()) == kNoErr);
     SetIgnoreCommandLine(1);
     UninitUserCommandLine();
-    EXPECT_TRUE(Get(GetRawCommandLine).empty() && Get(GetUserCommandLine).empty());
-    EXPECT_EQ(second.Init(), kNoErr);
-    EXPECT_EQ(Get(GetUserCommandLine), (Words{"two", "b"}));
-    EXPECT_STREQ(GetPrefsPath(), "own.ini");
-    EXPECT_EQ(SetPrefsPath(nullptr), kNoErr);
-    EXPECT_EQ(GetPrefsPath(), nullptr);
+    EXPECT_EACH(Get(GetRawCommandLine).empty(), Get(GetUserCommandLine).empty(), second.Init() == kNoErr,
+                Get(GetUserCommandLine) == (Words{"two", "b"}), GetPrefsPath() == "own.ini",
+                SetPrefsPath(nullptr) == kNoErr, GetPrefsPath() == nullptr);
 }
 
 TEST(UserCommandLine, WithoutMemoryNothingIsKept) {
@@ -110,31 +99,20 @@ TEST(UserCommandLine, KnowsTheLibrarysOwnArguments) {
 }
 
 TEST(UserCommandLine, IsMadeFromOneLine) {
-    const struct {
-        const char* line;
-        Words words;
-    } cases[] = {
-        {" a \"b c\" d", {"a", "b c", "d"}},
-        {nullptr, {}},
-        {"", {}},
-        {" \t \t", {}},
-        {"\ta\t\tb ", {"a", "b"}},
-        {"\"", {""}},
-        {"\"\"\"\"", {"", ""}},
-        {"x \"y z", {"x", "y z"}},
-        {"\"a\"b\"c d\"", {"a", "b\"c", "d\""}},
-        {"-n=\"a b\"", {"-n=\"a", "b\""}},
-    };
-    for (const auto& each : cases) {
+    const auto words = [](const char* line) {
         std::string first = "prog";
         int32 count = 0;
         char** args = nullptr;
-        NewCommandLineArgsFromSingleLine(each.line, first.data(), &count, &args);
-        ASSERT_EQ(count, static_cast<int32>(each.words.size()) + 1) << (each.line ? each.line : "null");
+        NewCommandLineArgsFromSingleLine(line, first.data(), &count, &args);
         EXPECT_EQ(args[0], first.data());
-        EXPECT_EQ(Words(args + 1, args + count), each.words);
+        const std::string text = Joined(Words(args + 1, args + count));
         DeleteCommandLineArgsFromSingleLine(count, args);
-    }
+        return text;
+    };
+    EXPECT_EACH(words(" a \"b c\" d") == "a|b c|d|", words(nullptr) == "", words("") == "", words(" \t \t") == "",
+                words("\ta\t\tb ") == "a|b|", words("\"") == "|", words("\"\"\"\"") == "||",
+                words("x \"y z") == "x|y z|", words("\"a\"b\"c d\"") == "a|b\"c|d\"|",
+                words("-n=\"a b\"") == "-n=\"a|b\"|");
     DeleteCommandLineArgsFromSingleLine(0, nullptr);
 }
 

@@ -1,7 +1,6 @@
 // Makes the n-th allocation (from 1) by malloc or operator new fail while the object lives; with n = 0 none. Of the
 // calling thread. For programs linked with --wrap=malloc.
-#ifndef TESSEL_TESTS_SUPPORT_MALLOC_FAILINGMALLOC_H
-#define TESSEL_TESTS_SUPPORT_MALLOC_FAILINGMALLOC_H
+#pragma once
 
 namespace tessel::test {
 
@@ -29,4 +28,3 @@ int WithEachAllocationFailing(Body body) {
 
 }  // namespace tessel::test
 
-#endif
