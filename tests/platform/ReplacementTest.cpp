@@ -50,8 +50,14 @@ protected:
 };
 
 TEST_F(ReplacementTest, KeepsWhatBelongsToTheFileWithAndWithoutUnnamedFiles) {
-    for (const bool named : {false, true}) {
-        SCOPED_TRACE(named);
+    // The third file that is opened: after the folder and the old file, and eight leftovers looked for. The third name that is
+    // looked at as a link: after the link and the file.
+    const struct {
+        const char* call;
+        int n, error;
+    } kHosts[] = {{"openat", 1000, EIO}, {"openat", 10, EOPNOTSUPP}, {"readlink", 3, ENOENT}};
+    for (const auto& host : kHosts) {
+        SCOPED_TRACE(host.call);
         drive.Put("f", "old");
         const std::string native = drive.Native("f");
         ASSERT_EQ(0, chmod(native.c_str(), 0640));
@@ -60,8 +66,7 @@ TEST_F(ReplacementTest, KeepsWhatBelongsToTheFileWithAndWithoutUnnamedFiles) {
         ItemInfo before, after;
         ASSERT_TRUE(ItemGetInfo(drive.Name("f").c_str(), before));
         {
-            // The third file that is opened: after the folder and the old file, and eight leftovers looked for.
-            const FailingPlatform failing("openat", named ? 10 : 1000, EOPNOTSUPP);
+            const FailingPlatform failing(host.call, host.n, host.error);
             EXPECT_EQ(ReplaceFailure::kNone, Replace({}, "new", "LINK"));
         }
         EXPECT_EACH(drive.Get("f") == "new", std::filesystem::is_symlink(drive.Native("link")), ModeOf("f") == 0640u);

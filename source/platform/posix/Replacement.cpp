@@ -108,6 +108,10 @@ bool CopyCreated(int from, int to, const struct statx& status) {
     return systemCalls.fsetxattr(to, kCreatedAttribute, bytes, sizeof bytes, 0) == 0 || errno != ENOSPC;
 }
 
+std::string NameByDescriptor(int descriptor) {
+    return "/proc/self/fd/" + std::to_string(descriptor);
+}
+
 bool Flush(int descriptor) {
     return Retry([&] { return systemCalls.fsync(descriptor); }) == 0;
 }
@@ -143,6 +147,7 @@ struct Replacement::Work {
     bool RemoveLeftover(const std::string& name) const;
     void RemoveLeftovers() const;
     bool MakeFile();
+    bool CanBeNamed() const;
     bool MakeNamed();
     bool HoldNamed(const std::string& name);
     void SetMark(int descriptor, bool on) const;
@@ -287,14 +292,21 @@ bool Replacement::Work::MakeFile() {
     const bool plain = target < 0 && request.like == kNoFile && request.mode < 0;
     mode = request.mode;
     file = OpenAtRetrying(folder, ".", O_TMPFILE | O_RDWR, plain ? 0666 : 0600);
-    if (file >= 0) {
+    if (file >= 0 && CanBeNamed()) {
         MarkBytes(file, F_WRLCK, kWriterMark, 1);
         return true;
     }
     const bool unknown = errno == EOPNOTSUPP || errno == EISDIR || errno == EINVAL || errno == ENOENT;
-    if (!unknown) return Fail(ReplaceFailure::kCannotMake, errno);
+    if (file < 0 && !unknown) return Fail(ReplaceFailure::kCannotMake, errno);
+    if (file >= 0) systemCalls.close(file);
     if (plain) mode = static_cast<int>(0666u & ~PermissionMask());
     return MakeNamed();
+}
+
+// Where /proc is missing an unnamed file stays one.
+bool Replacement::Work::CanBeNamed() const {
+    char end;
+    return systemCalls.readlink(NameByDescriptor(file).c_str(), &end, 1) == 1;
 }
 
 bool Replacement::Work::MakeNamed() {
@@ -355,11 +367,8 @@ bool Replacement::Work::Seal() {
 // ---- taking the name ------------------------------------------------------------------------------------------------
 
 bool Replacement::Work::LinkAs(const std::string& name) const {
-    char self[40];
-    std::snprintf(self, sizeof self, "/proc/self/fd/%d", file);
-    if (systemCalls.linkat(AT_FDCWD, self, folder, name.c_str(), AT_SYMLINK_FOLLOW) == 0) return true;
-    // Without /proc newer kernels, and those who may search everything, link by the descriptor alone.
-    return errno == ENOENT && systemCalls.linkat(file, "", folder, name.c_str(), AT_EMPTY_PATH) == 0;
+    const std::string self = NameByDescriptor(file);
+    return systemCalls.linkat(AT_FDCWD, self.c_str(), folder, name.c_str(), AT_SYMLINK_FOLLOW) == 0;
 }
 
 bool Replacement::Work::LinkPrivately() {
