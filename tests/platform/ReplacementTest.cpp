@@ -50,8 +50,8 @@ protected:
 };
 
 TEST_F(ReplacementTest, KeepsWhatBelongsToTheFileWithAndWithoutUnnamedFiles) {
-    // The third file that is opened: after the folder and the old file, and eight leftovers looked for. The third name that is
-    // looked at as a link: after the link and the file.
+    // The file that is opened after the folder, the old file and eight leftovers; the name that is looked at as a link
+    // after the link and the file.
     const struct {
         const char* call;
         int n, error;
