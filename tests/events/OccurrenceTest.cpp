@@ -6,7 +6,6 @@
 #include "platform/posix/SystemCalls.h"
 #include "support/FailingAllocator.h"
 #include "support/HandClock.h"
-#include "support/Test.h"
 
 #include <array>
 #include <chrono>
