@@ -161,9 +161,8 @@ TEST(CfgSettings, ACollectionIsReadSavedAndReleased) {
                 started.File() == "[App]\r\nStep=6\r\nName=\"x;y\"\r\n", grid.Get() == nullptr, grid.Count() == 0,
                 !CfgSettingsRegistry::Find("Grid main"));
     // Again, after its settings were destroyed.
-    EXPECT_EACH(CfgSettingsInit(&grid, nullptr, nullptr, nullptr) == kNoErr, grid->name.Get() == "x;y");
-    EXPECT_THAT(CfgSettingsRegistry::Names(), ElementsAre("Grid main"));
-    EXPECT_EACH(CfgRemove(kConfigI32, Key("Step")) == kNoErr,
+    EXPECT_EACH(CfgSettingsInit(&grid, nullptr, nullptr, nullptr) == kNoErr, grid->name.Get() == "x;y",
+                (Texts{"Grid main"}) == CfgSettingsRegistry::Names(), CfgRemove(kConfigI32, Key("Step")) == kNoErr,
                 CfgSettingsUninit(&grid, kCfgSaveNever, nullptr) == kNoErr,
                 CfgSettingsInit(&grid, nullptr, nullptr, nullptr) == kConfigKeyErr);
     EXPECT_THAT(CfgSettingsRegistry::Names(), IsEmpty()) << "one setting has no value";

@@ -97,8 +97,7 @@ TEST(ConfigManager, EveryTypeIsReadBackByASecondProcess) {
     if (child == 0) ::_exit(ReadBackWrongly("T:\\prefs.ini"));
     int status = -1;
     ASSERT_EQ(child, ::waitpid(child, &status, 0));
-    EXPECT_EQ(0, status);
-    EXPECT_THAT(started.reports.Texts(kDebugWarning), IsEmpty());
+    EXPECT_EACH(status == 0, started.reports.Texts(kDebugWarning).empty());
 }
 
 // ---- which file, which section --------------------------------------------------------------------------------------
@@ -219,9 +218,9 @@ TEST(ConfigManager, SaysWhyThereIsNoValue) {
     for (const auto& row : rows) EXPECT_EQ(row.err, CfgGetDefault(row.type, Key(row.key), &value)) << row.key;
     EXPECT_EACH(value == 77, CfgGetDefault(kConfigI32, Key("n"), nullptr) == kArgErr,
                 CfgWrite(kConfigI32, Key("n"), nullptr) == kArgErr, CfgWrite(kConfigI32, Key(" "), &value) == kArgErr,
-                CfgWrite(0x20323334, Key("n"), &value) == kConfigTypeErr, CfgRemove(kConfigI32, nullptr) == kArgErr);
-    EXPECT_THAT(started.reports.Texts(kDebugWarning),
-                ElementsAre("Unknown config type '\xF7\xFF\xFF\xFF'.", "Unknown config type '432 '."));
+                CfgWrite(0x20323334, Key("n"), &value) == kConfigTypeErr, CfgRemove(kConfigI32, nullptr) == kArgErr,
+                (Texts{"Unknown config type '\xF7\xFF\xFF\xFF'.", "Unknown config type '432 '."}) ==
+                    started.reports.Texts(kDebugWarning));
 
     ConfigManager* held = GetMainCfgAccess();
     held->AddRef();
@@ -255,10 +254,10 @@ TEST(ConfigManager, MemoryShadowsTheFile) {
                 main.Remove(kConfigI32, "n", true) == kNoErr);
     EXPECT_EQ(kNoErr, main.Remove(kConfigI32, "n", true)) << "not there is no error";
     EXPECT_EACH(I32("n") == 11, main.Remove(kConfigI32, Key("key"), false) == kNoErr, I32("key") == -1,
-                started.File() == "[App]\r\nn=11\r\n", CfgRemove(kConfigI32, Key("key")) == kNoErr);
-    EXPECT_THAT(started.reports.Texts(kDebugWarning),
-                ElementsAre("In Memory Config Token (n) is now asked to persist in file! Not recommended.",
-                            "In Memory Config Token (key) is now asked to be removed from file! Not recommended."));
+                started.File() == "[App]\r\nn=11\r\n", CfgRemove(kConfigI32, Key("key")) == kNoErr,
+                (Texts{"In Memory Config Token (n) is now asked to persist in file! Not recommended.",
+                       "In Memory Config Token (key) is now asked to be removed from file! Not recommended."}) ==
+                    started.reports.Texts(kDebugWarning));
 }
 
 TEST(ConfigManager, ListsWhatIsInMemory) {
@@ -290,10 +289,9 @@ TEST(ConfigManager, ReportsKeysThatTheApplicationDoesNotKnow) {
     EXPECT_EACH(main.SetKnownTokens(nullptr, 1) == kArgErr, main.SetKnownTokens(known, 2) == kNoErr, I32("n") == 1);
     EXPECT_EQ(2, I32("m")) << "it is read all the same";
     EXPECT_EACH(CfgRemove(kConfigI32, Key("m")) == kNoErr, !main.ValidateTokenName("x"),
-                main.SetKnownTokens(nullptr, 0) == kNoErr, main.ValidateTokenName("x"));
-    EXPECT_THAT(started.reports.Texts(kDebugWarning),
-                ElementsAre("If tokens is NULL, tokenCount must be zero", "Unknown INI token: m",
-                            "Unknown INI token: m", "Unknown INI token: x"));
+                main.SetKnownTokens(nullptr, 0) == kNoErr, main.ValidateTokenName("x"),
+                (Texts{"If tokens is NULL, tokenCount must be zero", "Unknown INI token: m", "Unknown INI token: m",
+                       "Unknown INI token: x"}) == started.reports.Texts(kDebugWarning));
 }
 
 // Each operation with its n-th allocation failing, until it has all it wants.
@@ -383,9 +381,9 @@ TEST(ConfigManager, EnumerationsAreNamesOfAStringList) {
     colour = 1;
     EXPECT_EACH(CfgWrite(kColour, Key("a"), &colour) == kNoErr, started.File() == "[App]\r\na=red\r\nb=blue\r\n");
     colour = 3;
-    EXPECT_EQ(kResNotFoundErr, CfgWrite(kColour, Key("a"), &colour));
-    EXPECT_THAT(started.reports.Texts(kDebugWarning),
-                ElementsAre("Failed to find correct value for enumeration string."));
+    EXPECT_EACH(
+        CfgWrite(kColour, Key("a"), &colour) == kResNotFoundErr,
+        (Texts{"Failed to find correct value for enumeration string."}) == started.reports.Texts(kDebugWarning));
     const RsrcFile file = started.application.resources;
     EXPECT_EACH(ConfigParseGetPStrRsrcIndex(file, &colour, "Red", 3, 128, false) == kConfigKeyErr, colour == -1,
                 ConfigParseGetPStrRsrcIndex(file, &colour, "", 0, 128, false) == kArgErr,

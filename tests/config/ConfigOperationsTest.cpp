@@ -98,10 +98,8 @@ TEST_F(PreferenceFile, AnswersWhenThereIsNothing) {
     std::string value = "kept";
     Texts names{"gone"};
     EXPECT_EACH(store->GetValue("k", &value) == kConfigKeyErr, !store->HasKey("k"), store->RemoveKey("k") == kNoErr,
-                store->GetSectionNames(&names) == kNoErr);
-    EXPECT_THAT(names, IsEmpty());
-    EXPECT_EQ(kNoErr, store->GetKeyNames(&names));
-    EXPECT_THAT(Folder(), IsEmpty());
+                store->GetSectionNames(&names) == kNoErr, names.empty(), store->GetKeyNames(&names) == kNoErr,
+                Folder().empty());
     Put(kOld);
     const struct {
         std::string section, key;
@@ -195,8 +193,7 @@ TEST_F(PreferenceFile, IsLeftAloneWhenItCannotBeRead) {
     clock.Advance(1000);
     const ReportRecorder reports;
     const FailingPlatform unknown("statx", 1, EIO, 2);
-    EXPECT_EQ("old", Value(*store, "k"));
-    EXPECT_THAT(reports.Texts(kDebugWarning), ElementsAre("Warning, unexpected result."));
+    EXPECT_EACH(Value(*store, "k") == "old", (Texts{"Warning, unexpected result."}) == reports.Texts(kDebugWarning));
 }
 
 TEST_F(PreferenceFile, KeysWithoutASectionGetTheNameOfTheCurrentOne) {
@@ -208,8 +205,8 @@ TEST_F(PreferenceFile, KeysWithoutASectionGetTheNameOfTheCurrentOne) {
     {
         const ReportRecorder reports;
         const FailingPlatform full("write", 1, ENOSPC);
-        EXPECT_EQ("too", Value(*store, "l"));
-        EXPECT_THAT(reports.Texts(kDebugWarning), ElementsAre("Cannot rewrite preference file T:\\f.ini, error 9"));
+        EXPECT_EACH(Value(*store, "l") == "too",
+                    (Texts{"Cannot rewrite preference file T:\\f.ini, error 9"}) == reports.Texts(kDebugWarning));
     }
     EXPECT_EACH(File() == "k=old\nl=too\n", store->RemoveKey("l") == kNoErr, File() == kOld);
 }
@@ -431,12 +428,9 @@ TEST(MemoryMapConfigOperationsTest, KeepsUnderComposedKeys) {
     for (const auto& set : sets)
         EXPECT_EQ(*set.key ? kNoErr : kArgErr, store.SetValue(set.section, set.key, set.value));
     Texts names;
-    EXPECT_EQ(kNoErr, store.GetSectionNames(&names));
-    EXPECT_THAT(names, ElementsAre("a", "s", "s", "t", "t", "\xC3\xA4"));
-    EXPECT_EQ(kNoErr, store.GetKeyNames(&names));
-    EXPECT_THAT(names, ElementsAre("plain"));
-    EXPECT_EQ(kNoErr, store.GetKeyNames("t", &names));
-    EXPECT_THAT(names, ElementsAre("x.y", "z"));
+    EXPECT_EACH(store.GetSectionNames(&names) == kNoErr, (Texts{"a", "s", "s", "t", "t", "\xC3\xA4"}) == names,
+                store.GetKeyNames(&names) == kNoErr, (Texts{"plain"}) == names,
+                store.GetKeyNames("t", &names) == kNoErr, (Texts{"x.y", "z"}) == names);
     std::string value = "kept";
     EXPECT_EACH(store.GetValue("s", "A", &value) == kConfigKeyErr, store.GetValue("s", "", &value) == kArgErr,
                 value == "kept", store.GetValue("s", "a", nullptr) == kArgErr,

@@ -107,9 +107,9 @@ TEST_F(EventQueueTest, TellsItsStatesAndClasses) {
     EXPECT_EQ(1, queue->PostEvent(target, new TestEvent(0), false, nullptr));  // a duplicate, though full
     EXPECT_EQ(2, queue->PostEvent(target, new TestEvent(0), true, nullptr));
     queue->Destroy();
-    EXPECT_THAT(reports.Texts(kDebugError),
-                ElementsAre("Assertion failed: Attempting to destroy a queue that has not been uninitialized!"));
-    EXPECT_EQ(0u, PurgeEventsOfKind(nullptr, 1));
+    EXPECT_EACH((Texts{"Assertion failed: Attempting to destroy a queue that has not been uninitialized!"}) ==
+                    reports.Texts(kDebugError),
+                PurgeEventsOfKind(nullptr, 1) == 0u);
 }
 
 // The events of a queue as the rules have it, of two targets.

@@ -89,6 +89,7 @@ TEST_F(OccurrenceTest, ReportsNullCallbacksAndDamagedLists) {
     TimeList::Entry nobodys(12345);
     {
         OccurrenceLockHolder timed(gTimedHdlrMutex);
+        EXPECT_EQ(TESSEL_CHECK_LOCK_ORDER, OccurrenceLock::HeldRanks() != 0);
         timedHandlers.Insert(nobodys, MilliSecs(), MilliSecs(), TimeList::Among::kBeforeEquals);
     }
     OccurAtTime(o, MilliSecs() + 1000000);  // wakes the thread
