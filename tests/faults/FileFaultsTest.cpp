@@ -6,7 +6,10 @@
 #include "support/FaultScenario.h"
 #include "support/ReportRecorder.h"
 #include "support/StartedFiles.h"
+#include <tessel/base/OVExcept.h>
+#include <tessel/config/ConfigOperations.h>
 #include <tessel/files/FileManager.h>
+#include <tessel/paths/PathRef.h>
 
 #include <cerrno>
 #include <cstdlib>
@@ -114,6 +117,23 @@ protected:
                 }};
     }
 
+    // ---- preferences ----
+    MgErr Prefer(const char* name) const {
+        try {
+            return BMINIConfigOperations(PathRef(At(name)), "View").SetValue("key", before_);
+        } catch (const OVExcept& exception) {
+            return exception.Code();
+        }
+    }
+    FaultScenario Saving(const char* name, const std::string& before) {
+        return {name,
+                [=, this] {
+                    if (!before.empty()) Put("prefs.ini", before);
+                },
+                [this] { return Prefer("prefs.ini"); },
+                [this] { return IsThere("prefs.ini") ? started.drive.Get("prefs.ini") : "-"; }};
+    }
+
     // ---- the registry ----
     static MgErr WithRoot(const std::function<platform::ErrorNumber(RegistryKey*)>& work) {
         RegistryKey* root = nullptr;
@@ -167,6 +187,8 @@ protected:
 
     std::vector<FaultScenario> Scenarios() {
         std::vector<FaultScenario> all = {Copying(), Moving("move"), Moving("move across"), MovingInto(), Trashing()};
+        all.push_back(Saving("make preferences", ""));
+        all.push_back(Saving("save preferences", "; kept\n[View]\nkey=1\nother=" + before_ + "\n"));
         all.push_back(Making(
             "make a folder", [this] { return FNewDir(At("d"), 0); }, "d"));
         all.push_back(
@@ -194,8 +216,12 @@ protected:
     void ChangeNeighbour(const std::string& scenario) {
         if (IsThere("store")) WithRoot([](RegistryKey* root) { return Set(root, "Other", "x", "y"); });
         Put("neighbour", "");
-        if (scenario == "recycle") FRemoveToRecycle(At("neighbour"), 0);
-        if (scenario != "recycle") FWriteWholeFile(At("neighbour"), "", 0);
+        if (scenario == "recycle")
+            FRemoveToRecycle(At("neighbour"), 0);
+        else if (scenario.find("preferences") != std::string::npos)
+            Prefer("neighbour");
+        else
+            FWriteWholeFile(At("neighbour"), "", 0);
         for (const char* left : {"neighbour", "data/Trash/files/neighbour", "data/Trash/info/neighbour.trashinfo"})
             fs::remove(started.drive.Native(left));
     }

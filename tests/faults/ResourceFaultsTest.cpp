@@ -185,7 +185,7 @@ protected:
                 sum += count;
             }
         }
-        std::cout << sum << "\n";
+        std::cout << sum << std::endl;  // children that are killed would print it again
         return sum;
     }
 };

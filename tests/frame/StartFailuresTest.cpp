@@ -15,12 +15,16 @@ std::atomic<int> theLiveBlocks{0};
 
 }  // namespace
 
-// The others call these.
-void* operator new(size_t size) {
+// The forms for arrays call these, or are the sanitizer's in pairs.
+void* operator new(size_t size, const std::nothrow_t&) noexcept {
     void* block = tessel::test::FailingAllocator::May(size) ? std::malloc(size != 0 ? size : 1) : nullptr;
-    if (!block) throw std::bad_alloc();
-    ++theLiveBlocks;
+    theLiveBlocks += block != nullptr;
     return block;
+}
+
+void* operator new(size_t size) {
+    if (void* block = operator new(size, std::nothrow)) return block;
+    throw std::bad_alloc();
 }
 
 void operator delete(void* block) noexcept {
@@ -29,6 +33,10 @@ void operator delete(void* block) noexcept {
 }
 
 void operator delete(void* block, size_t) noexcept {
+    operator delete(block);
+}
+
+void operator delete(void* block, const std::nothrow_t&) noexcept {
     operator delete(block);
 }
 

@@ -211,7 +211,7 @@ bool IsOwn(const struct statx& status) {
 bool IsOfThisTime(const struct statx& status) {
     const statx_timestamp& time = status.stx_mtime;
     if (time.tv_sec != beginOfProcess.tv_sec) return time.tv_sec > beginOfProcess.tv_sec;
-    return time.tv_nsec > beginOfProcess.tv_nsec;
+    return std::int64_t{time.tv_nsec} > beginOfProcess.tv_nsec;
 }
 
 // Holds what has a name while it makes way for a new file, so that of two only one removes it, and the other does not
