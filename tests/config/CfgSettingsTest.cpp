@@ -4,9 +4,6 @@
 namespace tessel::test {
 namespace {
 
-using testing::ElementsAre;
-using testing::IsEmpty;
-
 // A policy, and a check that gives the result it was told to, and counts.
 struct Checker : CfgDataValidator {
     CfgDataValidationPolicy Policy(void* context) override {
@@ -52,20 +49,20 @@ TEST(CfgSettings, ReadsASettingAsThePolicySays) {
             checker.result = checkerWithout.result = result;
             WithDefault data(row.key, 9);
             WithoutDefault bare(row.key);
-            EXPECT_EQ(result ? row.failed : row.passed, CfgDataInit(&data, nullptr, &checker, 7, &checker, nullptr));
-            EXPECT_EQ(result ? row.valueFailed : row.valuePassed, data.Get());
-            EXPECT_EQ(result ? row.failedWithout : row.passedWithout,
-                      CfgDataInit(&bare, nullptr, &checkerWithout, 7, &checkerWithout, nullptr));
-            EXPECT_EQ(row.checked, checker.checks == 1);
-            EXPECT_EQ(row.checkedWithout, checkerWithout.checks == 1);
+            EXPECT_EACH(
+                (result ? row.failed : row.passed) == CfgDataInit(&data, nullptr, &checker, 7, &checker, nullptr),
+                (result ? row.valueFailed : row.valuePassed) == data.Get(),
+                (result ? row.failedWithout : row.passedWithout) ==
+                    CfgDataInit(&bare, nullptr, &checkerWithout, 7, &checkerWithout, nullptr),
+                row.checked == (checker.checks == 1), row.checkedWithout == (checkerWithout.checks == 1));
         }
     }
-    EXPECT_TRUE(started.reports.Has(
-        kDebugWarning, "cfgAlwaysUseDefaultValuePolicy cannot be used without providing a default value!"));
-    EXPECT_TRUE(started.reports.Has(kDebugWarning,
+    EXPECT_EACH(started.reports.Has(kDebugWarning,
+                                    "cfgAlwaysUseDefaultValuePolicy cannot be used without providing a default value!"),
+                started.reports.Has(kDebugWarning,
                                     "The setting \"bad\" cannot be read (text cannot be converted to the "
-                                    "configuration type); its default holds."));
-    EXPECT_EQ(kArgErr, CfgDataInit(nullptr, nullptr, nullptr, 0, nullptr, nullptr));
+                                    "configuration type); its default holds."),
+                CfgDataInit(nullptr, nullptr, nullptr, 0, nullptr, nullptr) == kArgErr);
 }
 
 TEST(CfgSettings, SavesASettingAsThePolicySays) {
@@ -119,11 +116,11 @@ TEST(CfgSettings, ChecksPathsForWhatIsOnDisk) {
         EXPECT_EQ(row.err > kArgErr, !data.Get().IsValid()) << row.key;
     }
     CfgData_T<PathRef, kConfigPath> fallsBack("none", good), hasBadDefault("file", bad);
-    EXPECT_EQ(kNoErr, CfgDataInit(&fallsBack, nullptr, &validator, kCfgPathFile | kTop, nullptr, nullptr));
-    EXPECT_TRUE(fallsBack.EqualsDefault() && fallsBack.Get().Equals(good, PathRef::kExact));
-    EXPECT_EQ(kNoErr, validator.Check(hasBadDefault, 0, kCfgPathMissing, nullptr, nullptr));
-    EXPECT_EQ(kNotFoundErr, validator.Check(hasBadDefault, 0, kCfgPathFile | kTop, nullptr, nullptr));
-    EXPECT_FALSE(hasBadDefault.GetDefault().IsValid());
+    EXPECT_EACH(CfgDataInit(&fallsBack, nullptr, &validator, kCfgPathFile | kTop, nullptr, nullptr) == kNoErr,
+                fallsBack.EqualsDefault(), fallsBack.Get().Equals(good, PathRef::kExact),
+                validator.Check(hasBadDefault, 0, kCfgPathMissing, nullptr, nullptr) == kNoErr,
+                validator.Check(hasBadDefault, 0, kCfgPathFile | kTop, nullptr, nullptr) == kNotFoundErr,
+                !hasBadDefault.GetDefault().IsValid());
     WithDefault number("n", 1);
     EXPECT_EQ(kArgErr, validator.Check(number, 0, kCfgPathAnything, nullptr, nullptr));
 }
@@ -144,34 +141,30 @@ struct GridData {
 TEST(CfgSettings, ACollectionIsReadSavedAndReleased) {
     StartedConfig started("[App]\nShow=maybe\nStep=4\n");
     CfgSettings_T<GridData> grid("Grid", "main"), twin("Grid main");
-    EXPECT_EQ(nullptr, grid.Get());
-    EXPECT_EQ(kConfigTextErr, CfgSettingsInit(&grid, nullptr, nullptr, nullptr));
-    EXPECT_TRUE(grid->show.Get() == 1 && grid->step.Get() == 4 && grid->name.Get() == "grid");
-    EXPECT_TRUE(grid->show.IsDefaulted() && !grid->step.IsDefaulted());
+    EXPECT_EACH(grid.Get() == nullptr, CfgSettingsInit(&grid, nullptr, nullptr, nullptr) == kConfigTextErr,
+                grid->show.Get() == 1, grid->step.Get() == 4, grid->name.Get() == "grid", grid->show.IsDefaulted(),
+                !grid->step.IsDefaulted());
     EXPECT_EQ(&grid, CfgSettingsRegistry::Find("Grid main")) << "every setting has a value";
-    EXPECT_EQ(3u, grid.FlagsAt(2));
-    EXPECT_EQ(0u, grid.FlagsAt(3));
+    EXPECT_EACH(grid.FlagsAt(2) == 3u, grid.FlagsAt(3) == 0u);
     CfgSettingsInit(&twin, nullptr, nullptr, nullptr);
     EXPECT_EQ(kExistsErr, CfgSettingsRegistry::Register(&twin));
 
     grid->step.Set(6);
     grid->name.Set("x;y");
-    EXPECT_EQ(kNoErr, CfgSettingsSave(&grid, nullptr, kCfgSaveNever));
-    EXPECT_EQ(kArgErr, CfgSettingsSaveOneSetting(&grid, 3, nullptr, kCfgSaveAlways));
-    EXPECT_EQ(kArgErr, CfgSettingsSaveOneSetting(&grid, -1, nullptr, kCfgSaveAlways));
-    EXPECT_EQ("[App]\nShow=maybe\nStep=4\n", started.File());
-    EXPECT_EQ(kNoErr, CfgSettingsSaveOneSetting(&grid, 1, nullptr, kCfgSaveOrRemoveDefault));
-    EXPECT_EQ("[App]\r\nShow=maybe\r\nStep=6\r\n", started.File());
-    EXPECT_EQ(kNoErr, CfgSettingsUninit(&grid, kCfgSaveOrRemoveDefault, nullptr));
-    EXPECT_EQ("[App]\r\nStep=6\r\nName=\"x;y\"\r\n", started.File());
-    EXPECT_TRUE(grid.Get() == nullptr && grid.Count() == 0 && !CfgSettingsRegistry::Find("Grid main"));
+    EXPECT_EACH(CfgSettingsSave(&grid, nullptr, kCfgSaveNever) == kNoErr,
+                CfgSettingsSaveOneSetting(&grid, 3, nullptr, kCfgSaveAlways) == kArgErr,
+                CfgSettingsSaveOneSetting(&grid, -1, nullptr, kCfgSaveAlways) == kArgErr,
+                started.File() == "[App]\nShow=maybe\nStep=4\n",
+                CfgSettingsSaveOneSetting(&grid, 1, nullptr, kCfgSaveOrRemoveDefault) == kNoErr,
+                started.File() == "[App]\r\nShow=maybe\r\nStep=6\r\n",
+                CfgSettingsUninit(&grid, kCfgSaveOrRemoveDefault, nullptr) == kNoErr,
+                started.File() == "[App]\r\nStep=6\r\nName=\"x;y\"\r\n", grid.Get() == nullptr, grid.Count() == 0,
+                !CfgSettingsRegistry::Find("Grid main"));
     // Again, after its settings were destroyed.
-    EXPECT_EQ(kNoErr, CfgSettingsInit(&grid, nullptr, nullptr, nullptr));
-    EXPECT_EQ("x;y", grid->name.Get());
-    EXPECT_THAT(CfgSettingsRegistry::Names(), ElementsAre("Grid main"));
-    EXPECT_EQ(kNoErr, CfgRemove(kConfigI32, Key("Step")));
-    EXPECT_EQ(kNoErr, CfgSettingsUninit(&grid, kCfgSaveNever, nullptr));
-    EXPECT_EQ(kConfigKeyErr, CfgSettingsInit(&grid, nullptr, nullptr, nullptr));
+    EXPECT_EACH(CfgSettingsInit(&grid, nullptr, nullptr, nullptr) == kNoErr, grid->name.Get() == "x;y",
+                (Texts{"Grid main"}) == CfgSettingsRegistry::Names(), CfgRemove(kConfigI32, Key("Step")) == kNoErr,
+                CfgSettingsUninit(&grid, kCfgSaveNever, nullptr) == kNoErr,
+                CfgSettingsInit(&grid, nullptr, nullptr, nullptr) == kConfigKeyErr);
     EXPECT_THAT(CfgSettingsRegistry::Names(), IsEmpty()) << "one setting has no value";
 }
 
@@ -184,9 +177,8 @@ TEST(CfgSettings, ACheckCanEndTheReading) {
     CfgSettings settings;
     settings.Add(&a, 7);
     settings.Add(&b, 7);
-    EXPECT_EQ(-1, CfgSettingsInit(&settings, nullptr, &checker, &checker));
-    EXPECT_EQ(1, checker.checks);
-    EXPECT_EQ(nullptr, CfgSettingsRegistry::Find(settings.Name().c_str()));
+    EXPECT_EACH(CfgSettingsInit(&settings, nullptr, &checker, &checker) == -1, checker.checks == 1,
+                CfgSettingsRegistry::Find(settings.Name().c_str()) == nullptr);
     const std::string first = settings.Name(), second = CfgSettings(nullptr, "q").Name();
     ASSERT_EQ(0u, first.find("<unnamed settings "));
     EXPECT_EQ("<unnamed settings " + std::to_string(std::stoi(first.substr(18)) + 1) + "> q", second);

@@ -4,15 +4,12 @@
 #include "support/FailingAllocator.h"
 
 #include <filesystem>
-#include <functional>
 #include <sys/wait.h>
 #include <unistd.h>
 
 namespace tessel::test {
 namespace {
 
-using testing::ElementsAre;
-using testing::IsEmpty;
 using tool::ConfigValue;
 
 int32 I32(const std::string& key, int32 otherwise = -1) {
@@ -83,16 +80,16 @@ TEST(ConfigManager, EveryTypeIsReadBackByASecondProcess) {
         ConfigValue value(row.type);
         ASSERT_EQ(kNoErr,
                   ConfigTypeFromString(row.type, row.text, static_cast<int32>(std::strlen(row.text)), value.Pointer()));
-        EXPECT_EQ(kNoErr, CfgWrite(row.type, Key(KeyOf(row.line)), value.Pointer()));
-        EXPECT_EQ(kNoErr, GetMainCfgAccess()->Write(row.type, "m" + KeyOf(row.line), value.Pointer(), true));
+        EXPECT_EACH(CfgWrite(row.type, Key(KeyOf(row.line)), value.Pointer()) == kNoErr,
+                    GetMainCfgAccess()->Write(row.type, "m" + KeyOf(row.line), value.Pointer(), true) == kNoErr);
         expected += row.line + std::string("\r\n");
         // The same from the manager that wrote it, and from its memory.
         for (const char* prefix : {"", "m"}) {
             ConfigValue again(row.type);
             std::string text;
-            EXPECT_EQ(kNoErr, CfgGetDefault(row.type, Key(prefix + KeyOf(row.line)), again.Pointer()));
-            EXPECT_EQ(kNoErr, GetMainCfgAccess()->ValueToString(row.type, again.Pointer(), &text));
-            EXPECT_EQ(row.line, KeyOf(row.line) + "=" + text);
+            EXPECT_EACH(CfgGetDefault(row.type, Key(prefix + KeyOf(row.line)), again.Pointer()) == kNoErr,
+                        GetMainCfgAccess()->ValueToString(row.type, again.Pointer(), &text) == kNoErr,
+                        row.line == KeyOf(row.line) + "=" + text);
         }
     }
     EXPECT_EQ(expected + "\r\n", started.File());
@@ -100,8 +97,7 @@ TEST(ConfigManager, EveryTypeIsReadBackByASecondProcess) {
     if (child == 0) ::_exit(ReadBackWrongly("T:\\prefs.ini"));
     int status = -1;
     ASSERT_EQ(child, ::waitpid(child, &status, 0));
-    EXPECT_EQ(0, status);
-    EXPECT_THAT(started.reports.Texts(kDebugWarning), IsEmpty());
+    EXPECT_EACH(status == 0, started.reports.Texts(kDebugWarning).empty());
 }
 
 // ---- which file, which section --------------------------------------------------------------------------------------
@@ -139,9 +135,8 @@ TEST(ConfigManager, StartsOnTheFileThatIsNamed) {
         SetPrefsPath(row.set);
         ReportRecorder reports;
         InitTesselAppSupport();
-        EXPECT_EQ(row.file, PrefFile());
-        EXPECT_EQ(byDefault, PrefFile(*OwnedManager(new ConfigManager(PathRef()))));
-        EXPECT_EQ(row.set && row.set[0] == '\\', reports.CountAt(kDebugWarning) == 1);
+        EXPECT_EACH(row.file == PrefFile(), byDefault == PrefFile(*OwnedManager(new ConfigManager(PathRef()))),
+                    (row.set && row.set[0] == '\\') == (reports.CountAt(kDebugWarning) == 1));
         int32 value = static_cast<int32>(row.file.size());
         EXPECT_EQ(kNoErr, CfgWrite(kConfigI32, Key("n"), &value));
         Path path = nullptr;
@@ -165,19 +160,16 @@ TEST(ConfigManager, TakesTheSectionOfTheEdition) {
         app.isBound = bound, app.isRunTime = runTime, app.isFullRunTime = full;
         OwnedManager manager = ManagerOf("T:\\prefs.ini");
         int32 read = 0;
-        EXPECT_EQ(kNoErr, manager->GetDefault(kConfigI32, "A", &read));
-        EXPECT_EQ(section, Section(*manager));
-        EXPECT_EQ(value, read);
-        EXPECT_EQ(kNoErr, manager->UpdateSectionHeader("other"));
-        EXPECT_EQ(kNoErr, manager->GetDefault(kConfigI32, " A ", &read));
-        EXPECT_EQ(6, read);
+        EXPECT_EACH(manager->GetDefault(kConfigI32, "A", &read) == kNoErr, section == Section(*manager), value == read,
+                    manager->UpdateSectionHeader("other") == kNoErr,
+                    manager->GetDefault(kConfigI32, " A ", &read) == kNoErr, read == 6);
     }
     MGAppInterfaceSet(nullptr);
     OwnedManager nameless = ManagerOf("T:\\prefs.ini");
     int32 value = 9;
-    EXPECT_EQ(kConfigKeyErr, nameless->GetDefault(kConfigI32, "a", &value));
-    EXPECT_EQ(kArgErr, nameless->Write(kConfigI32, "a", &value, false));
-    EXPECT_EQ(kNoErr, nameless->Remove(kConfigI32, "a", false));
+    EXPECT_EACH(nameless->GetDefault(kConfigI32, "a", &value) == kConfigKeyErr,
+                nameless->Write(kConfigI32, "a", &value, false) == kArgErr,
+                nameless->Remove(kConfigI32, "a", false) == kNoErr);
 }
 
 template <class Body>
@@ -197,23 +189,19 @@ TEST(ConfigManager, ManagersOfOtherFiles) {
     PathRef other("T:\\other.ini", PathRef::StringDisplay()), relative("other.ini", PathRef::StringDisplay());
     PathRef wide("T:\\wide.ini", PathRef::StringDisplay()), volume("T:\\", PathRef::StringDisplay()), none;
     int32 n = 0;
-    EXPECT_EQ(kNoErr, CfgGetDefaultFrom(&other, kConfigI32, Key("n"), &n));
-    EXPECT_EQ(5, n);
-    EXPECT_EQ(kUnsupportedErr, CfgGetDefaultFrom(&wide, kConfigI32, Key("n"), &n));
-    EXPECT_EQ(kArgErr, CfgGetDefaultFrom(nullptr, kConfigI32, Key("n"), &n));
+    EXPECT_EACH(CfgGetDefaultFrom(&other, kConfigI32, Key("n"), &n) == kNoErr, n == 5,
+                CfgGetDefaultFrom(&wide, kConfigI32, Key("n"), &n) == kUnsupportedErr,
+                CfgGetDefaultFrom(nullptr, kConfigI32, Key("n"), &n) == kArgErr);
     ConfigManager* manager = nullptr;
     const std::string notValid = "1 Not a Valid path to a preference file.";
     for (PathRef* path : {&none, &relative, &volume}) {
         EXPECT_EQ(kArgErr, ConstructCfgAccess(path, &manager));
         EXPECT_EQ(notValid, Raised([&] { ConstructCfgAccessPathRef(*path, &manager); }));
     }
-    EXPECT_EQ(kArgErr, ConstructCfgAccess(&other, nullptr));
-    EXPECT_EQ(kArgErr, ConstructCfgAccessCStr(nullptr, &manager));
+    EXPECT_EACH(ConstructCfgAccess(&other, nullptr) == kArgErr, ConstructCfgAccessCStr(nullptr, &manager) == kArgErr);
     EXPECT_EQ("1 Error constructing Config Manager", Raised([&] { ConstructCfgAccessCStr("\\\\", &manager); }));
     ASSERT_EQ(kNoErr, ConstructCfgAccess(&other, &manager));
-    EXPECT_EQ(2, manager->AddRef());
-    EXPECT_EQ(1, manager->RemoveRef());
-    EXPECT_EQ(0, manager->RemoveRef());
+    EXPECT_EACH(manager->AddRef() == 2, manager->RemoveRef() == 1, manager->RemoveRef() == 0);
 }
 
 // ---- reading, writing, removing -------------------------------------------------------------------------------------
@@ -228,14 +216,11 @@ TEST(ConfigManager, SaysWhyThereIsNoValue) {
     } rows[] = {{kConfigI32, "none", kConfigKeyErr},   {-9, "none", kConfigKeyErr}, {-9, "n", kConfigTypeErr},
                 {kConfigBool, "word", kConfigTextErr}, {kConfigI32, "", kArgErr},   {kConfigI32, " \t", kArgErr}};
     for (const auto& row : rows) EXPECT_EQ(row.err, CfgGetDefault(row.type, Key(row.key), &value)) << row.key;
-    EXPECT_EQ(77, value);
-    EXPECT_EQ(kArgErr, CfgGetDefault(kConfigI32, Key("n"), nullptr));
-    EXPECT_EQ(kArgErr, CfgWrite(kConfigI32, Key("n"), nullptr));
-    EXPECT_EQ(kArgErr, CfgWrite(kConfigI32, Key(" "), &value));
-    EXPECT_EQ(kConfigTypeErr, CfgWrite(0x20323334, Key("n"), &value));
-    EXPECT_EQ(kArgErr, CfgRemove(kConfigI32, nullptr));
-    EXPECT_THAT(started.reports.Texts(kDebugWarning),
-                ElementsAre("Unknown config type '\xF7\xFF\xFF\xFF'.", "Unknown config type '432 '."));
+    EXPECT_EACH(value == 77, CfgGetDefault(kConfigI32, Key("n"), nullptr) == kArgErr,
+                CfgWrite(kConfigI32, Key("n"), nullptr) == kArgErr, CfgWrite(kConfigI32, Key(" "), &value) == kArgErr,
+                CfgWrite(0x20323334, Key("n"), &value) == kConfigTypeErr, CfgRemove(kConfigI32, nullptr) == kArgErr,
+                (Texts{"Unknown config type '\xF7\xFF\xFF\xFF'.", "Unknown config type '432 '."}) ==
+                    started.reports.Texts(kDebugWarning));
 
     ConfigManager* held = GetMainCfgAccess();
     held->AddRef();
@@ -251,34 +236,28 @@ TEST(ConfigManager, SaysWhyThereIsNoValue) {
     EXPECT_EQ(kGenericErr, held->GetDefault(kConfigI32, "n", &value)) << "there are no types";
     EXPECT_EQ("App", Section(*held)) << "it lives on";
     InitTesselAppSupport();
-    EXPECT_EQ(kNoErr, held->GetDefault(kConfigI32, "n", &value));
-    EXPECT_EQ(0, held->RemoveRef());
+    EXPECT_EACH(held->GetDefault(kConfigI32, "n", &value) == kNoErr, held->RemoveRef() == 0);
 }
 
 TEST(ConfigManager, MemoryShadowsTheFile) {
     StartedConfig started("[App]\nn=1\nKey=2\n");
     ConfigManager& main = *GetMainCfgAccess();
     int32 value = 10;
-    EXPECT_EQ(kNoErr, main.Write(kConfigI32, " n ", &value, true));
-    EXPECT_EQ(kNoErr, main.Write(kConfigI32, Key("key"), &value, true));
-    EXPECT_EQ("[App]\nn=1\nKey=2\n", started.File());
-    EXPECT_EQ(10, I32("n"));
+    EXPECT_EACH(main.Write(kConfigI32, " n ", &value, true) == kNoErr,
+                main.Write(kConfigI32, Key("key"), &value, true) == kNoErr, started.File() == "[App]\nn=1\nKey=2\n",
+                I32("n") == 10);
     EXPECT_EQ(2, I32("KEY")) << "memory tells cases apart";
     EXPECT_THAT(started.reports.Texts(kDebugWarning), IsEmpty());
 
     value = 11;
-    EXPECT_EQ(kNoErr, CfgWrite(kConfigI32, Key("n"), &value));
-    EXPECT_EQ("[App]\r\nn=11\r\nKey=2\r\n", started.File());
-    EXPECT_EQ(kNoErr, main.Remove(kConfigI32, "n", true));
+    EXPECT_EACH(CfgWrite(kConfigI32, Key("n"), &value) == kNoErr, started.File() == "[App]\r\nn=11\r\nKey=2\r\n",
+                main.Remove(kConfigI32, "n", true) == kNoErr);
     EXPECT_EQ(kNoErr, main.Remove(kConfigI32, "n", true)) << "not there is no error";
-    EXPECT_EQ(11, I32("n"));
-    EXPECT_EQ(kNoErr, main.Remove(kConfigI32, Key("key"), false));
-    EXPECT_EQ(-1, I32("key"));
-    EXPECT_EQ("[App]\r\nn=11\r\n", started.File());
-    EXPECT_EQ(kNoErr, CfgRemove(kConfigI32, Key("key")));
-    EXPECT_THAT(started.reports.Texts(kDebugWarning),
-                ElementsAre("In Memory Config Token (n) is now asked to persist in file! Not recommended.",
-                            "In Memory Config Token (key) is now asked to be removed from file! Not recommended."));
+    EXPECT_EACH(I32("n") == 11, main.Remove(kConfigI32, Key("key"), false) == kNoErr, I32("key") == -1,
+                started.File() == "[App]\r\nn=11\r\n", CfgRemove(kConfigI32, Key("key")) == kNoErr,
+                (Texts{"In Memory Config Token (n) is now asked to persist in file! Not recommended.",
+                       "In Memory Config Token (key) is now asked to be removed from file! Not recommended."}) ==
+                    started.reports.Texts(kDebugWarning));
 }
 
 TEST(ConfigManager, ListsWhatIsInMemory) {
@@ -286,8 +265,7 @@ TEST(ConfigManager, ListsWhatIsInMemory) {
     ConfigManager& main = *GetMainCfgAccess();
     LStrArrayHandle keys = nullptr, values = nullptr;
     int32 count = -1;
-    EXPECT_EQ(kNoErr, main.GetInMemoryConfigList(&keys, &values, &count));
-    EXPECT_TRUE(count == 0 && !keys && !values);
+    EXPECT_EACH(main.GetInMemoryConfigList(&keys, &values, &count) == kNoErr, count == 0, !keys, !values);
     std::string text = "t";
     for (const char* key : {"b", "a.b", ".x", "B"}) {
         text += key;
@@ -308,17 +286,12 @@ TEST(ConfigManager, ReportsKeysThatTheApplicationDoesNotKnow) {
     StartedConfig started("[App]\nn=1\nm=2\n");
     ConfigManager& main = *GetMainCfgAccess();
     const ConfigManager::KnownToken known[] = {{"N"}, {"other"}};
-    EXPECT_EQ(kArgErr, main.SetKnownTokens(nullptr, 1));
-    EXPECT_EQ(kNoErr, main.SetKnownTokens(known, 2));
-    EXPECT_EQ(1, I32("n"));
+    EXPECT_EACH(main.SetKnownTokens(nullptr, 1) == kArgErr, main.SetKnownTokens(known, 2) == kNoErr, I32("n") == 1);
     EXPECT_EQ(2, I32("m")) << "it is read all the same";
-    EXPECT_EQ(kNoErr, CfgRemove(kConfigI32, Key("m")));
-    EXPECT_FALSE(main.ValidateTokenName("x"));
-    EXPECT_EQ(kNoErr, main.SetKnownTokens(nullptr, 0));
-    EXPECT_TRUE(main.ValidateTokenName("x"));
-    EXPECT_THAT(started.reports.Texts(kDebugWarning),
-                ElementsAre("If tokens is NULL, tokenCount must be zero", "Unknown INI token: m",
-                            "Unknown INI token: m", "Unknown INI token: x"));
+    EXPECT_EACH(CfgRemove(kConfigI32, Key("m")) == kNoErr, !main.ValidateTokenName("x"),
+                main.SetKnownTokens(nullptr, 0) == kNoErr, main.ValidateTokenName("x"),
+                (Texts{"If tokens is NULL, tokenCount must be zero", "Unknown INI token: m", "Unknown INI token: m",
+                       "Unknown INI token: x"}) == started.reports.Texts(kDebugWarning));
 }
 
 // Each operation with its n-th allocation failing, until it has all it wants.
@@ -350,8 +323,7 @@ TEST(ConfigManager, AnAllocationThatFailsIsSaid) {
         }
         EXPECT_GT(failures, 0) << &operation - operations;
     }
-    EXPECT_EQ(1, count);
-    EXPECT_EQ("[App]\r\nPStr=\"x\"\r\n", started.File());
+    EXPECT_EACH(count == 1, started.File() == "[App]\r\nPStr=\"x\"\r\n");
     ReallocLStrArrayHandle(&keys, 0);
     ReallocLStrArrayHandle(&texts, 0);
     DSDisposeHandle(reinterpret_cast<UHandle>(section));
@@ -369,21 +341,18 @@ TEST(ConfigManager, NamesPreferenceFiles) {
         char buffer[32];
         text.copy(buffer, sizeof buffer);
         buffer[text.size()] = 0;
-        EXPECT_EQ(kNoErr, GetConfigPath(buffer, buffer, 0));
-        EXPECT_EQ(name, buffer);
+        EXPECT_EACH(GetConfigPath(buffer, buffer, 0) == kNoErr, name == buffer);
     }
     StartedConfig started;
     ::setenv("TESSEL_REGISTRY", started.drive.Native("registry").c_str(), 1);
     char buffer[260] = "x";
-    EXPECT_EQ(kRegistryErr, CfgGetPathToPreviousVersion("Prod", "1.0", "app.exe", buffer));
-    EXPECT_STREQ("", buffer);
+    EXPECT_EACH(CfgGetPathToPreviousVersion("Prod", "1.0", "app.exe", buffer) == kRegistryErr, buffer == "");
     AutoRelease<IWinRegistryKey> key;
     GetLocalMachineRegistryKey(0)->CreateSubKey("SOFTWARE\\BRENMOOR\\Prod\\1.0", key.Out());
     EXPECT_EQ(2, CfgGetPathToPreviousVersion("Prod", "1.0", "app.exe", buffer));
     key->SetStringValue("Path", "C:\\old\\");
-    EXPECT_EQ(kNoErr, CfgGetPathToPreviousVersion("Prod", "1.0", "app.exe", buffer));
-    EXPECT_STREQ("C:\\old\\app.ini", buffer);
-    EXPECT_EQ(kArgErr, CfgGetPathToPreviousVersion("Prod", "1.0", std::string(252, 'x').c_str(), buffer));
+    EXPECT_EACH(CfgGetPathToPreviousVersion("Prod", "1.0", "app.exe", buffer) == kNoErr, buffer == "C:\\old\\app.ini",
+                CfgGetPathToPreviousVersion("Prod", "1.0", std::string(252, 'x').c_str(), buffer) == kArgErr);
     key->SetValue("Path", kRegistryTypeInt32, "abcd", 4);
     EXPECT_EQ(kRegistryTypeErr, CfgGetPathToPreviousVersion("Prod", "1.0", "app.exe", buffer));
     ::unsetenv("TESSEL_REGISTRY");
@@ -404,28 +373,24 @@ TEST(ConfigManager, EnumerationsAreNamesOfAStringList) {
     ConfigToTextProc toText = [](const void* value, LStrHandle* text) {
         return ConfigWriteEnumPStr(0, theColours, *static_cast<const int32*>(value), text);
     };
-    EXPECT_EQ(kNoErr, CfgEnumTypeInit(kColour, fromText, toText, 128, &theColours));
-    EXPECT_EQ(kGenericErr, CfgEnumTypeInit(kColour, fromText, toText, 129, &theColours));
+    EXPECT_EACH(CfgEnumTypeInit(kColour, fromText, toText, 128, &theColours) == kNoErr,
+                CfgEnumTypeInit(kColour, fromText, toText, 129, &theColours) == kGenericErr);
     int32 colour = 1;
-    EXPECT_EQ(kNoErr, CfgGetDefault(kColour, Key("a"), &colour));
-    EXPECT_EQ(2, colour);
-    EXPECT_EQ(kConfigKeyErr, CfgGetDefault(kColour, Key("b"), &colour));
+    EXPECT_EACH(CfgGetDefault(kColour, Key("a"), &colour) == kNoErr, colour == 2,
+                CfgGetDefault(kColour, Key("b"), &colour) == kConfigKeyErr);
     colour = 1;
-    EXPECT_EQ(kNoErr, CfgWrite(kColour, Key("a"), &colour));
-    EXPECT_EQ("[App]\r\na=red\r\nb=blue\r\n", started.File());
+    EXPECT_EACH(CfgWrite(kColour, Key("a"), &colour) == kNoErr, started.File() == "[App]\r\na=red\r\nb=blue\r\n");
     colour = 3;
-    EXPECT_EQ(kResNotFoundErr, CfgWrite(kColour, Key("a"), &colour));
-    EXPECT_THAT(started.reports.Texts(kDebugWarning),
-                ElementsAre("Failed to find correct value for enumeration string."));
+    EXPECT_EACH(
+        CfgWrite(kColour, Key("a"), &colour) == kResNotFoundErr,
+        (Texts{"Failed to find correct value for enumeration string."}) == started.reports.Texts(kDebugWarning));
     const RsrcFile file = started.application.resources;
-    EXPECT_EQ(kConfigKeyErr, ConfigParseGetPStrRsrcIndex(file, &colour, "Red", 3, 128, false));
-    EXPECT_EQ(-1, colour);
-    EXPECT_EQ(kArgErr, ConfigParseGetPStrRsrcIndex(file, &colour, "", 0, 128, false));
-    EXPECT_EQ(kResNotFoundErr, ConfigParseGetPStrRsrcIndex(file, &colour, "red", 3, 129, false));
-    EXPECT_EQ(kNotResFileErr, ConfigParseGetPStrRsrcIndex(file + 1, &colour, "red", 3, 128, false));
-    EXPECT_EQ(kNoErr, CfgEnumTypeUninit(kColour, &theColours));
-    EXPECT_EQ(0, theColours);
-    EXPECT_EQ(kConfigTypeErr, CfgGetDefault(kColour, Key("a"), &colour));
+    EXPECT_EACH(ConfigParseGetPStrRsrcIndex(file, &colour, "Red", 3, 128, false) == kConfigKeyErr, colour == -1,
+                ConfigParseGetPStrRsrcIndex(file, &colour, "", 0, 128, false) == kArgErr,
+                ConfigParseGetPStrRsrcIndex(file, &colour, "red", 3, 129, false) == kResNotFoundErr,
+                ConfigParseGetPStrRsrcIndex(file + 1, &colour, "red", 3, 128, false) == kNotResFileErr,
+                CfgEnumTypeUninit(kColour, &theColours) == kNoErr, theColours == 0,
+                CfgGetDefault(kColour, Key("a"), &colour) == kConfigTypeErr);
     RCloseFile(file);
 }
 

@@ -3,6 +3,7 @@
 #include "support/FailingPlatform.h"
 #include "support/HandClock.h"
 #include "support/StartedFiles.h"
+#include "support/Test.h"
 #include "support/malloc/FailingMalloc.h"
 #include <tessel/base/OVExcept.h>
 #include <tessel/config/ConfigOperations.h>
@@ -10,32 +11,19 @@
 #include <array>
 #include <chrono>
 #include <csignal>
-#include <cstdio>
-#include <cstdlib>
 #include <filesystem>
 #include <fstream>
-#include <gmock/gmock.h>
-#include <random>
 #include <set>
 #include <sys/stat.h>
 #include <sys/wait.h>
-#include <thread>
 #include <unistd.h>
 
 namespace tessel::test {
 namespace {
 
 using namespace std::string_literals;
-using testing::ElementsAre;
-using testing::IsEmpty;
-using Names = std::vector<std::string>;
 
 constexpr char kOld[] = "[a]\r\nk=old\r\n", kNew[] = "[a]\r\nk=new\r\n";
-
-int Amount(const char* variable, int otherwise) {
-    const char* text = std::getenv(variable);
-    return text ? std::atoi(text) : otherwise;
-}
 
 class PreferenceFile : public testing::Test {
 protected:
@@ -86,37 +74,32 @@ TEST_F(PreferenceFile, HoldsAndGivesTheWorkedFiles) {
         const auto before = started.drive.Get(row.file);
         auto store = Store(row.file);
         std::vector<std::array<std::string, 3>> holds;
-        Names sections, keys;
+        Texts sections, keys;
         EXPECT_EQ(kNoErr, store->GetSectionNames(&sections));
         for (const std::string& section : sections) {
             store->SetSectionName(section);
             EXPECT_EQ(kNoErr, store->GetKeyNames(&keys));
             for (const std::string& key : keys) holds.push_back({section, key, Value(*store, key)});
         }
-        EXPECT_EQ(row.holds, holds);
-        EXPECT_EQ(before, started.drive.Get(row.file));
+        EXPECT_EACH(row.holds == holds, before == started.drive.Get(row.file));
         for (const auto& [section, key, value] : row.then) EXPECT_EQ(kNoErr, store->SetValue(section, key, value));
         std::ifstream after(folder + row.file + ".after", std::ios::binary);
         const std::string expected{std::istreambuf_iterator<char>(after), {}};
         EXPECT_EQ(expected, started.drive.Get(row.file));
         // The same again, from memory and from the file.
-        EXPECT_EQ(kNoErr, store->SetValue(row.then[0][0], row.then[0][1], row.then[0][2]));
-        EXPECT_EQ(kNoErr, Store(row.file)->SetValue(row.then[0][0], row.then[0][1], row.then[0][2]));
-        EXPECT_EQ(expected, started.drive.Get(row.file));
+        EXPECT_EACH(store->SetValue(row.then[0][0], row.then[0][1], row.then[0][2]) == kNoErr,
+                    Store(row.file)->SetValue(row.then[0][0], row.then[0][1], row.then[0][2]) == kNoErr,
+                    expected == started.drive.Get(row.file));
     }
 }
 
 TEST_F(PreferenceFile, AnswersWhenThereIsNothing) {
     auto store = Store();
     std::string value = "kept";
-    Names names{"gone"};
-    EXPECT_EQ(kConfigKeyErr, store->GetValue("k", &value));
-    EXPECT_FALSE(store->HasKey("k"));
-    EXPECT_EQ(kNoErr, store->RemoveKey("k"));
-    EXPECT_EQ(kNoErr, store->GetSectionNames(&names));
-    EXPECT_THAT(names, IsEmpty());
-    EXPECT_EQ(kNoErr, store->GetKeyNames(&names));
-    EXPECT_THAT(Folder(), IsEmpty());
+    Texts names{"gone"};
+    EXPECT_EACH(store->GetValue("k", &value) == kConfigKeyErr, !store->HasKey("k"), store->RemoveKey("k") == kNoErr,
+                store->GetSectionNames(&names) == kNoErr, names.empty(), store->GetKeyNames(&names) == kNoErr,
+                Folder().empty());
     Put(kOld);
     const struct {
         std::string section, key;
@@ -128,29 +111,24 @@ TEST_F(PreferenceFile, AnswersWhenThereIsNothing) {
                 {"a", "l", kConfigKeyErr, kNoErr, kNoErr}};
     for (const auto& row : rows) {
         EXPECT_EQ(row.get, store->GetValue(row.section, row.key, &value)) << row.section << row.key;
-        EXPECT_FALSE(store->HasKey(row.section, row.key));
-        EXPECT_EQ(row.set, store->SetValue(row.section, row.key, "v"));
-        EXPECT_EQ(row.set == kNoErr, store->HasKey(row.section, row.key));
-        EXPECT_EQ(row.remove, store->RemoveKey(row.section, row.key));
-        EXPECT_FALSE(store->HasKey(row.section, row.key));
+        EXPECT_EACH(!store->HasKey(row.section, row.key), row.set == store->SetValue(row.section, row.key, "v"),
+                    (row.set == kNoErr) == store->HasKey(row.section, row.key),
+                    row.remove == store->RemoveKey(row.section, row.key), !store->HasKey(row.section, row.key));
     }
-    EXPECT_EQ("kept", value);
-    EXPECT_EQ("[a]\r\nk=old\r\n\r\n[b]\r\n\r\n", File());
-    EXPECT_EQ(kArgErr, store->GetValue("a", "k", nullptr));
-    EXPECT_EQ(kArgErr, store->GetSectionNames(nullptr));
-    EXPECT_EQ(kArgErr, store->GetKeyNames("a", nullptr));
+    EXPECT_EACH(value == "kept", File() == "[a]\r\nk=old\r\n\r\n[b]\r\n\r\n",
+                store->GetValue("a", "k", nullptr) == kArgErr, store->GetSectionNames(nullptr) == kArgErr,
+                store->GetKeyNames("a", nullptr) == kArgErr);
     EXPECT_THROW(BMINIConfigOperations(PathRef(), "a"), OVExcept);
 }
 
 TEST_F(PreferenceFile, MakesTheFoldersOnTheWay) {
-    EXPECT_EQ(kNoErr, Store("x/y/z.ini")->SetValue("k", "new"));
-    EXPECT_EQ(kNew + "\r\n"s, started.drive.Get("x/y/z.ini"));
+    EXPECT_EACH(Store("x/y/z.ini")->SetValue("k", "new") == kNoErr, kNew + "\r\n"s == started.drive.Get("x/y/z.ini"));
     auto store = Store("f.ini/g.ini");
     Put("a file");
     EXPECT_THROW(store->SetValue("k", "new"), OVExcept);
     std::filesystem::remove(started.drive.Native("f.ini"));
-    EXPECT_EQ(kNoErr, store->SetValue("l", "too"));
-    EXPECT_EQ("[a]\r\nk=new\r\nl=too\r\n\r\n", started.drive.Get("f.ini/g.ini"));
+    EXPECT_EACH(store->SetValue("l", "too") == kNoErr,
+                started.drive.Get("f.ini/g.ini") == "[a]\r\nk=new\r\nl=too\r\n\r\n");
 }
 
 TEST_F(PreferenceFile, IsReadAgainWhenItDiffers) {
@@ -162,8 +140,7 @@ TEST_F(PreferenceFile, IsReadAgainWhenItDiffers) {
         clock.Advance(999);
         const std::string before = Value(*store, "k");
         clock.Advance(1);
-        EXPECT_NE(before, expected);
-        EXPECT_EQ(expected, Value(*store, "k"));
+        EXPECT_EACH(before != expected, expected == Value(*store, "k"));
     };
     Put("[a]\nk=longer\n");
     aSecondLater("longer");
@@ -182,8 +159,7 @@ TEST_F(PreferenceFile, IsReadAgainWhenItDiffers) {
     EXPECT_EQ(kNoErr, store->SetValue("k", "own"));
     clock.Advance(1000);
     const FailingPlatform unread("read", 1, EIO, 1000);
-    EXPECT_EQ("own", Value(*store, "k"));
-    EXPECT_EQ(0, unread.Calls());
+    EXPECT_EACH(Value(*store, "k") == "own", unread.Calls() == 0);
 }
 
 TEST_F(PreferenceFile, IsLeftAloneWhenItCannotBeRead) {
@@ -202,16 +178,13 @@ TEST_F(PreferenceFile, IsLeftAloneWhenItCannotBeRead) {
         auto store = Store();
         Put(row.bytes);
         const auto refused = std::make_unique<FailingPlatform>(row.call, 1, row.error, 1000);
-        Names names;
+        Texts names;
         std::string value;
         EXPECT_EQ(row.err, store->GetValue("k", &value)) << row.call << row.err;
-        EXPECT_EQ(row.err, store->SetValue("k", "new"));
-        EXPECT_EQ(row.err, store->RemoveKey("k"));
-        EXPECT_EQ(row.err, store->GetSectionNames(&names));
-        EXPECT_EQ(row.err, store->GetKeyNames(&names));
-        EXPECT_FALSE(store->HasKey("k"));
-        EXPECT_EQ(row.bytes, File());
-        const Names told(row.err == kGenericErr ? 6 : 0, "Warning, function is not implemented on this platform.");
+        EXPECT_EACH(row.err == store->SetValue("k", "new"), row.err == store->RemoveKey("k"),
+                    row.err == store->GetSectionNames(&names), row.err == store->GetKeyNames(&names),
+                    !store->HasKey("k"), row.bytes == File());
+        const Texts told(row.err == kGenericErr ? 6 : 0, "Warning, function is not implemented on this platform.");
         EXPECT_EQ(told, reports.Texts());
     }
     Put(kOld);
@@ -220,26 +193,22 @@ TEST_F(PreferenceFile, IsLeftAloneWhenItCannotBeRead) {
     clock.Advance(1000);
     const ReportRecorder reports;
     const FailingPlatform unknown("statx", 1, EIO, 2);
-    EXPECT_EQ("old", Value(*store, "k"));
-    EXPECT_THAT(reports.Texts(kDebugWarning), ElementsAre("Warning, unexpected result."));
+    EXPECT_EACH(Value(*store, "k") == "old", (Texts{"Warning, unexpected result."}) == reports.Texts(kDebugWarning));
 }
 
 TEST_F(PreferenceFile, KeysWithoutASectionGetTheNameOfTheCurrentOne) {
     Put(";c\nk=old\n");
     auto store = Store();
-    EXPECT_EQ("old", Value(*store, "k"));
-    EXPECT_EQ("[a]\r\n;c\r\nk=old\r\n", File());
+    EXPECT_EACH(Value(*store, "k") == "old", File() == "[a]\r\n;c\r\nk=old\r\n");
     Put("k=old\nl=too\n");
     clock.Advance(1000);
     {
         const ReportRecorder reports;
         const FailingPlatform full("write", 1, ENOSPC);
-        EXPECT_EQ("too", Value(*store, "l"));
-        EXPECT_THAT(reports.Texts(kDebugWarning), ElementsAre("Cannot rewrite preference file T:\\f.ini, error 9"));
+        EXPECT_EACH(Value(*store, "l") == "too",
+                    (Texts{"Cannot rewrite preference file T:\\f.ini, error 9"}) == reports.Texts(kDebugWarning));
     }
-    EXPECT_EQ("k=old\nl=too\n", File());
-    EXPECT_EQ(kNoErr, store->RemoveKey("l"));
-    EXPECT_EQ(kOld, File());
+    EXPECT_EACH(File() == "k=old\nl=too\n", store->RemoveKey("l") == kNoErr, File() == kOld);
 }
 
 // ---- saving ---------------------------------------------------------------------------------------------------------
@@ -261,25 +230,19 @@ TEST_F(PreferenceFile, AFailedSaveSaysWhyAndGoesOutWithTheNext) {
             const FailingPlatform failing(row.call, row.n, row.error);
             EXPECT_EQ(row.err, store->SetValue("k", "new")) << row.call;
         }
-        EXPECT_EQ(kOld, File());
-        EXPECT_EQ(onlyFile, Folder());
-        EXPECT_EQ("new", Value(*store, "k"));
+        EXPECT_EACH(File() == kOld, onlyFile == Folder(), Value(*store, "k") == "new");
         clock.Advance(1000);
         EXPECT_EQ(kNoErr, store->RemoveKey("x"));  // nothing to save
-        EXPECT_EQ(kOld, File());
-        EXPECT_EQ(kNoErr, store->SetValue("l", "2"));
-        EXPECT_EQ(kNew + "l=2\r\n"s, File());
+        EXPECT_EACH(File() == kOld, store->SetValue("l", "2") == kNoErr, kNew + "l=2\r\n"s == File());
     }
     const auto links = started.drive.Native("link.ini");
     std::filesystem::create_symlink("f.ini", links);
     ASSERT_EQ(0, chmod(started.drive.Native("f.ini").c_str(), 0604));
-    EXPECT_EQ(kNoErr, Store("link.ini")->SetValue("k", "3"));
-    EXPECT_TRUE(std::filesystem::is_symlink(links));
-    EXPECT_EQ("[a]\r\nk=3\r\nl=2\r\n", File());
-    EXPECT_EQ(static_cast<std::filesystem::perms>(0604), std::filesystem::status(links).permissions());
+    EXPECT_EACH(Store("link.ini")->SetValue("k", "3") == kNoErr, std::filesystem::is_symlink(links),
+                File() == "[a]\r\nk=3\r\nl=2\r\n",
+                static_cast<std::filesystem::perms>(0604) == std::filesystem::status(links).permissions());
     for (int i = 0; i < 1000; ++i) started.drive.Put("ini$$" + std::to_string(i) + ".TMP", "not ours");
-    EXPECT_EQ(kIOErr, Store()->SetValue("k", "4"));
-    EXPECT_EQ(1002u, Folder().size());
+    EXPECT_EACH(Store()->SetValue("k", "4") == kIOErr, Folder().size() == 1002u);
 }
 
 // Whatever fails, and wherever the process ends, the file is one of the two, whole, and a later save goes through.
@@ -314,8 +277,7 @@ TEST_F(PreferenceFile, IsTheOldOrTheNewOneAfterEveryFault) {
             EXPECT_TRUE(WIFSIGNALED(status) ? WTERMSIG(status) == SIGKILL : WEXITSTATUS(status) != 1)
                 << n << " " << error;
             whole(n);
-            EXPECT_EQ(kNoErr, store->SetValue("k", "new"));
-            EXPECT_EQ(kNew, File());
+            EXPECT_EACH(store->SetValue("k", "new") == kNoErr, File() == kNew);
             EXPECT_EQ(onlyFile, Folder()) << n << " " << error;
             EXPECT_TRUE(n > 10 || reached);
         }
@@ -332,8 +294,7 @@ TEST_F(PreferenceFile, IsTheOldOrTheNewOneAfterEveryFault) {
         waitpid(child, nullptr, 0);
         whole("kill");
     }
-    EXPECT_EQ(kNoErr, Store()->SetValue("k", "new"));
-    EXPECT_EQ(onlyFile, Folder());
+    EXPECT_EACH(Store()->SetValue("k", "new") == kNoErr, onlyFile == Folder());
 }
 
 // What is in the order of the calls: all of the bytes are on the device before the name changes, and the name before
@@ -419,7 +380,7 @@ TEST_F(PreferenceFile, ProcessesReadWhatOneOfThemWrote) {
             clock.Advance(500);
             IniModel model;
             good = sets ? err == kNoErr : err == kConfigKeyErr || (err == kNoErr && intact(value));
-            good = good && model.Read(File()) && model.sections.size() == 1 && model.trailing == Names{";last"};
+            good = good && model.Read(File()) && model.sections.size() == 1 && model.trailing == Texts{";last"};
             if (!good) std::fprintf(stderr, "%d: error %d, %s\n%s\n", process, err, value.c_str(), File().c_str());
             if (!good) break;
             for (const auto& entry : model.sections.front().keys) good = good && intact(entry.value);
@@ -439,23 +400,18 @@ TEST_F(PreferenceFile, ThreadsShareAStore) {
     MemoryMapConfigOperations memory("a");
     for (ConfigOperationsInterface* store :
          {static_cast<ConfigOperationsInterface*>(file.get()), static_cast<ConfigOperationsInterface*>(&memory)}) {
-        std::vector<std::thread> threads;
-        for (int thread = 0; thread < 4; ++thread) {
-            threads.emplace_back([store, name = std::to_string(thread)] {
-                Names names;
-                for (int round = 0; round < 20; ++round) {
-                    EXPECT_EQ(kNoErr, store->SetValue(name, "k", name));
-                    store->SetSectionName(name);
-                    EXPECT_NE("", store->GetSectionName());
-                    EXPECT_EQ(1u, Value(*store, "k").size());
-                    EXPECT_EQ(kNoErr, store->GetSectionNames(&names));
-                    EXPECT_TRUE(store->HasKey(name, "k"));
-                }
-            });
-        }
-        for (std::thread& thread : threads) thread.join();
+        InThreads(4, [store](int thread) {
+            const std::string name = std::to_string(thread);
+            Texts names;
+            for (int round = 0; round < 20; ++round) {
+                EXPECT_EQ(kNoErr, store->SetValue(name, "k", name));
+                store->SetSectionName(name);
+                EXPECT_EACH(store->GetSectionName() != "", Value(*store, "k").size() == 1u,
+                            store->GetSectionNames(&names) == kNoErr, store->HasKey(name, "k"));
+            }
+        });
     }
-    Names names;
+    Texts names;
     EXPECT_EQ(kNoErr, Store()->GetSectionNames(&names));
     EXPECT_THAT(names, testing::UnorderedElementsAre("0", "1", "2", "3"));
 }
@@ -471,27 +427,17 @@ TEST(MemoryMapConfigOperationsTest, KeepsUnderComposedKeys) {
                 {"S", "", "no"},       {"t", "z", ""},  {"\xC3\xA4", "k", "6"}, {"a.b", "c", "7"}};
     for (const auto& set : sets)
         EXPECT_EQ(*set.key ? kNoErr : kArgErr, store.SetValue(set.section, set.key, set.value));
-    Names names;
-    EXPECT_EQ(kNoErr, store.GetSectionNames(&names));
-    EXPECT_THAT(names, ElementsAre("a", "s", "s", "t", "t", "\xC3\xA4"));
-    EXPECT_EQ(kNoErr, store.GetKeyNames(&names));
-    EXPECT_THAT(names, ElementsAre("plain"));
-    EXPECT_EQ(kNoErr, store.GetKeyNames("t", &names));
-    EXPECT_THAT(names, ElementsAre("x.y", "z"));
+    Texts names;
+    EXPECT_EACH(store.GetSectionNames(&names) == kNoErr, (Texts{"a", "s", "s", "t", "t", "\xC3\xA4"}) == names,
+                store.GetKeyNames(&names) == kNoErr, (Texts{"plain"}) == names,
+                store.GetKeyNames("t", &names) == kNoErr, (Texts{"x.y", "z"}) == names);
     std::string value = "kept";
-    EXPECT_EQ(kConfigKeyErr, store.GetValue("s", "A", &value));
-    EXPECT_EQ(kArgErr, store.GetValue("s", "", &value));
-    EXPECT_EQ("kept", value);
-    EXPECT_EQ(kArgErr, store.GetValue("s", "a", nullptr));
-    EXPECT_EQ(kArgErr, store.GetKeyNames("s", nullptr));
-    EXPECT_EQ(kArgErr, store.GetSectionNames(nullptr));
-    EXPECT_EQ(kNoErr, store.GetValue("s.b", &value));
-    EXPECT_EQ(" \"2\" ", value);
-    EXPECT_EQ(kNoErr, store.RemoveKey("s", "a"));
-    EXPECT_EQ(kConfigKeyErr, store.RemoveKey("s", "a"));
-    EXPECT_FALSE(store.HasKey("s", "a"));
-    EXPECT_FALSE(store.HasKey("s", ""));
-    EXPECT_TRUE(store.HasKey("t.x", "y"));
+    EXPECT_EACH(store.GetValue("s", "A", &value) == kConfigKeyErr, store.GetValue("s", "", &value) == kArgErr,
+                value == "kept", store.GetValue("s", "a", nullptr) == kArgErr,
+                store.GetKeyNames("s", nullptr) == kArgErr, store.GetSectionNames(nullptr) == kArgErr,
+                store.GetValue("s.b", &value) == kNoErr, value == " \"2\" ", store.RemoveKey("s", "a") == kNoErr,
+                store.RemoveKey("s", "a") == kConfigKeyErr, !store.HasKey("s", "a"), !store.HasKey("s", ""),
+                store.HasKey("t.x", "y"));
 }
 
 }  // namespace

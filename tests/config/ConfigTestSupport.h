@@ -2,14 +2,10 @@
 #ifndef TESSEL_TESTS_CONFIG_CONFIGTESTSUPPORT_H
 #define TESSEL_TESTS_CONFIG_CONFIGTESTSUPPORT_H
 
-#include "support/ReportRecorder.h"
 #include "support/ScratchDrive.h"
 #include "support/StartedLibrary.h"
+#include "support/Test.h"
 #include <tessel/tessel.h>
-
-#include <gmock/gmock.h>
-#include <memory>
-#include <string>
 
 namespace tessel::test {
 

@@ -4,11 +4,10 @@
 #include "config/Service.h"
 #include "support/FailingAllocator.h"
 #include "support/StartedPaths.h"
+#include "support/Test.h"
 
 #include <cmath>
-#include <cstdlib>
 #include <limits>
-#include <random>
 #include <sstream>
 
 namespace tessel::test {
@@ -17,14 +16,8 @@ namespace {
 using tool::ConfigValue;
 
 struct StartedTypes : StartedPaths {
-    StartedTypes() {
-        EXPECT_EQ(kNoErr, InitConfigTypeRegistry());
-        EXPECT_EQ(kNoErr, ConfigCoreTypesStart());
-    }
-    ~StartedTypes() {
-        EXPECT_EQ(kNoErr, ConfigCoreTypesStop());
-        EXPECT_EQ(kNoErr, UninitConfigTypeRegistry());
-    }
+    StartedTypes() { EXPECT_EACH(InitConfigTypeRegistry() == kNoErr, ConfigCoreTypesStart() == kNoErr); }
+    ~StartedTypes() { EXPECT_EACH(ConfigCoreTypesStop() == kNoErr, UninitConfigTypeRegistry() == kNoErr); }
 };
 
 MgErr Read(int32 type, const std::string& text, ConfigValue& value) {
@@ -89,8 +82,8 @@ TEST(ConfigTypes, ReadAndWriteTheirTexts) {
         LStrHandle text = nullptr;
         EXPECT_EQ(row.alias ? kNoErr : kConfigTypeErr, ConfigTypeToString(row.alias, kept.Pointer(), &text));
         DSDisposeHandle(reinterpret_cast<UHandle>(text));
-        EXPECT_EQ(kArgErr, ConfigTypeFromString(row.type, "1", 1, nullptr));
-        EXPECT_EQ(kArgErr, ConfigTypeToString(row.type, nullptr, &text));
+        EXPECT_EACH(ConfigTypeFromString(row.type, "1", 1, nullptr) == kArgErr,
+                    ConfigTypeToString(row.type, nullptr, &text) == kArgErr);
     }
 }
 
@@ -126,8 +119,8 @@ TEST(ConfigTypes, EscapedListsComeBackWhole) {
             for (unsigned n = random() % 6; n > 0; --n) texts.back() += "a\\;\" \x81"[random() % 6];
         }
         const std::string text = Written(kConfigENSV, value);
-        EXPECT_EQ(kNoErr, Read(kConfigENSV, text.substr(1, text.size() - 2), again));
-        EXPECT_EQ(texts, *static_cast<std::vector<std::string>*>(again.Pointer()));
+        EXPECT_EACH(Read(kConfigENSV, text.substr(1, text.size() - 2), again) == kNoErr,
+                    texts == *static_cast<std::vector<std::string>*>(again.Pointer()));
     }
 }
 
@@ -189,19 +182,15 @@ TEST(ConfigTypes, TheTableKeepsTheFirstOfAType) {
     ConfigToTextProc toText = [](const void*, LStrHandle*) -> MgErr { return kVersionErr; };
     int32 length = 0;
     LStrHandle text = nullptr;
-    EXPECT_EQ(kGenericErr, RegisterConfigType(kType, one, toText));
-    EXPECT_EQ(kGenericErr, ConfigTypeFromString(kType, "", 0, &length));
-    EXPECT_EQ(kGenericErr, UninitConfigTypeRegistry());
+    EXPECT_EACH(RegisterConfigType(kType, one, toText) == kGenericErr,
+                ConfigTypeFromString(kType, "", 0, &length) == kGenericErr, UninitConfigTypeRegistry() == kGenericErr);
     StartedTypes started;
-    EXPECT_EQ(kGenericErr, InitConfigTypeRegistry());
-    EXPECT_EQ(kConfigTypeErr, ConfigTypeFromString(kType, "", 0, &length));
-    EXPECT_EQ(kNoErr, RegisterConfigType(kType, one, toText));
-    EXPECT_EQ(kGenericErr, RegisterConfigType(kType, other, toText));
-    EXPECT_EQ(kNoErr, ConfigTypeFromString(kType, "abc", 2, &length));
-    EXPECT_EQ(2, length);
-    EXPECT_EQ(kVersionErr, ConfigTypeToString(kType, &length, &text));
-    EXPECT_EQ(kNoErr, UnregisterConfigType(kType));
-    EXPECT_EQ(kConfigTypeErr, UnregisterConfigType(kType));
+    EXPECT_EACH(InitConfigTypeRegistry() == kGenericErr, ConfigTypeFromString(kType, "", 0, &length) == kConfigTypeErr,
+                RegisterConfigType(kType, one, toText) == kNoErr,
+                RegisterConfigType(kType, other, toText) == kGenericErr,
+                ConfigTypeFromString(kType, "abc", 2, &length) == kNoErr, length == 2,
+                ConfigTypeToString(kType, &length, &text) == kVersionErr, UnregisterConfigType(kType) == kNoErr,
+                UnregisterConfigType(kType) == kConfigTypeErr);
 }
 
 }  // namespace

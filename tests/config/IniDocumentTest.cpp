@@ -1,17 +1,13 @@
 #include "../fuzz/IniModel.h"
 #include "config/IniDocument.h"
 #include "support/StartedMemory.h"
+#include "support/Test.h"
 #include "support/malloc/FailingMalloc.h"
-
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-#include <random>
 
 namespace tessel::test {
 namespace {
 
 using namespace std::string_literals;
-using testing::ElementsAre;
 
 struct Gathered final : IniDocument::Output {
     bool Write(const char* data, std::size_t size) override {
@@ -86,29 +82,23 @@ TEST_F(IniDocumentTest, FindsByNamesWithoutCaseAndWithoutSpaceAround) {
         EXPECT_EQ(nullptr, document.Find("abc \xC3\x84", key)) << key;
     }
     EXPECT_EQ(nullptr, document.Find("abc \xC3\xA4", "key one"));  // another letter here
-    EXPECT_EQ(kNoErr, document.Set("abc \xC3\x84", "new", "v"));
-    EXPECT_EQ(3, document.LineOf("abc \xC3\x84", "key one"));
-    EXPECT_EQ(-1, document.LineOf("abc \xC3\x84", "new"));
-    EXPECT_EQ(1, document.FirstUnparsableLine());
+    EXPECT_EACH(document.Set("abc \xC3\x84", "new", "v") == kNoErr, document.LineOf("abc \xC3\x84", "key one") == 3,
+                document.LineOf("abc \xC3\x84", "new") == -1, document.FirstUnparsableLine() == 1);
 }
 
 TEST_F(IniDocumentTest, ChangesShowWhereTheyBelong) {
     ASSERT_EQ(kNoErr, Read(document, ";1\n[a]\n;2\nb=c\n;3\nd=e\n;4\n[f]\n;5\ng=h\n;6"));
-    EXPECT_EQ(kConfigTypeErr, document.Set(" \t", "k", "v"));
-    EXPECT_EQ(kConfigTypeErr, document.Set("s", "\r\n", "v"));
-    EXPECT_EQ(kNoErr, document.Set(" new ", " k ", " \"v \" "));
-    EXPECT_EQ(kNoErr, document.Set("New", "l", "two\nlines\r\n"));
-    EXPECT_EQ(kNoErr, document.Set("next", "n", ""));
-    EXPECT_EQ(kNoErr, document.Set("(null)", "none", "0"));
+    EXPECT_EACH(document.Set(" \t", "k", "v") == kConfigTypeErr, document.Set("s", "\r\n", "v") == kConfigTypeErr,
+                document.Set(" new ", " k ", " \"v \" ") == kNoErr,
+                document.Set("New", "l", "two\nlines\r\n") == kNoErr, document.Set("next", "n", "") == kNoErr,
+                document.Set("(null)", "none", "0") == kNoErr);
     for (const char* name : {"b", "D", "missing"}) {
         bool removed = false;
-        EXPECT_EQ(kNoErr, document.Remove("a", name, removed));
-        EXPECT_EQ(name != "missing"s, removed);
+        EXPECT_EACH(document.Remove("a", name, removed) == kNoErr, (name != "missing"s) == removed);
     }
-    EXPECT_EQ(
+    EXPECT_EACH(
         "none=0\r\n;1\r\n[a]\r\n;2\r\n;3\r\n;4\r\n[f]\r\n;5\r\ng=h\r\n\r\n[new]\r\nk=\"v \"\r\nl=two\r\nlines\r\n"
-        "\r\n[next]\r\nn=\r\n\r\n;6\r\n",
-        Written(document));
+        "\r\n[next]\r\nn=\r\n\r\n;6\r\n" == Written(document));
     std::vector<std::string> names;
     document.ListSections(names);
     EXPECT_THAT(names, ElementsAre("(null)", "a", "f", "new", "next"));
@@ -183,9 +173,8 @@ TEST_F(IniDocumentTest, NamesASectionOnlyWhenItIsTheOnlyOne) {
                              {";\n", "App", ";\r\n"}};
     for (const auto& [read, name, written] : rows) {
         ASSERT_EQ(kNoErr, Read(document, read));
-        EXPECT_EQ(written[1] == 'A', document.NameOnlySection(name));
-        EXPECT_EQ(written, Written(document));
-        EXPECT_EQ(written[1] == 'A', document.Find("APP", "A") != nullptr);
+        EXPECT_EACH((written[1] == 'A') == document.NameOnlySection(name), written == Written(document),
+                    (written[1] == 'A') == (document.Find("APP", "A") != nullptr));
     }
 }
 

@@ -2,24 +2,11 @@
 #pragma once
 
 #include "events/OccurrenceLocks.h"
-#include "support/ReportRecorder.h"
 #include "support/StartedLibrary.h"
+#include "support/Test.h"
 #include <tessel/tessel.h>
 
-#include <atomic>
-#include <cstdlib>
-#include <gmock/gmock.h>
-#include <string>
-#include <thread>
-#include <vector>
-
 namespace tessel::test {
-
-// How long, or how much, a test runs: the value of an environment variable, or what suits every day.
-inline int Amount(const char* variable, int everyDay) {
-    const char* text = std::getenv(variable);
-    return text ? std::atoi(text) : everyDay;
-}
 
 class EventsTest : public testing::Test {
 protected:
@@ -58,4 +45,3 @@ inline void* Name(const char* text) {
 }
 
 }  // namespace tessel::test
-

@@ -1,7 +1,6 @@
 // Random operations on the occurrences of one thread, beside a model of the rules.
 #include "EventsTestSupport.h"
 #include "events/TimeList.h"
-#include "support/Test.h"
 
 #include <deque>
 

@@ -6,7 +6,6 @@
 #include "platform/posix/SystemCalls.h"
 #include "support/FailingAllocator.h"
 #include "support/HandClock.h"
-#include "support/Test.h"
 
 #include <array>
 #include <chrono>
@@ -90,6 +89,7 @@ TEST_F(OccurrenceTest, ReportsNullCallbacksAndDamagedLists) {
     TimeList::Entry nobodys(12345);
     {
         OccurrenceLockHolder timed(gTimedHdlrMutex);
+        EXPECT_EQ(TESSEL_CHECK_LOCK_ORDER, OccurrenceLock::HeldRanks() != 0);
         timedHandlers.Insert(nobodys, MilliSecs(), MilliSecs(), TimeList::Among::kBeforeEquals);
     }
     OccurAtTime(o, MilliSecs() + 1000000);  // wakes the thread

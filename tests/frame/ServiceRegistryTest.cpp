@@ -75,9 +75,9 @@ TEST_F(ServiceRegistryTest, StartsDependenciesFirstAndStopsInReverse) {
 TEST_F(ServiceRegistryTest, OfThoseReadyTheFirstRegisteredGoesFirstAndOnce) {
     Service d("D"), e("E", {&d, &d});
     const Registry registry = MakeRegistry({&e, &a, &d, &free, &b, &c, &c});
-    EXPECT_EQ(Texts{"ServiceRegistry: A service has already been registered that has the name \"C\"."},
-              recorder.Texts(kDebugFatal));
-    EXPECT_EACH(registry->InitServices() == kNoErr, theLog == "+D +E +F +C +B +A ");
+    EXPECT_EACH(Texts{"ServiceRegistry: A service has already been registered that has the name \"C\"."} ==
+                    recorder.Texts(kDebugFatal),
+                registry->InitServices() == kNoErr, theLog == "+D +E +F +C +B +A ");
     registry->UninitServices();
 }
 
@@ -165,10 +165,9 @@ TEST_F(ServiceRegistryTest, AFailedStartStaysHalfWayAndAFailedStopCanBeTriedAgai
     EXPECT_EACH(registry->InitServices() == kNoErr, registry->UninitServices() == 9,
                 registry->AddService(&free) == kGenericErr);
     b.uninitResult = kNoErr;
-    EXPECT_EACH(registry->UninitServices() == kNoErr, theLog == "+C +B +A +F -F -A -B -B -C ");
-    EXPECT_EQ((Texts{"ServiceRegistry: Service B init failed with error 77",
-                     "ServiceRegistry: Service B uninit failed with error 9"}),
-              recorder.Texts(kDebugInfo));
+    EXPECT_EACH(registry->UninitServices() == kNoErr, theLog == "+C +B +A +F -F -A -B -B -C ",
+                (Texts{"ServiceRegistry: Service B init failed with error 77",
+                       "ServiceRegistry: Service B uninit failed with error 9"}) == recorder.Texts(kDebugInfo));
 }
 
 TEST_F(ServiceRegistryTest, DependencyListRefusesNullTooManyAndOutOfRange) {

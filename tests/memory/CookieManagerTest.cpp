@@ -1,3 +1,4 @@
+#include "support/FailingAllocator.h"
 #include "support/StartedMemory.h"
 #include "support/Test.h"
 #include <tessel/memory/CookieManager.h>
@@ -153,7 +154,15 @@ TEST_F(Cookies, FillLists) {
     EXPECT_THAT(
         (std::vector{list.GetCount(), static_cast<int32>(list.GetCookie(0)), static_cast<int32>(list.GetCookie(1))}),
         ElementsAre(2, static_cast<int32>(first), static_cast<int32>(second)));
-    jar.Uninit();
+    for (int n : {1, 2}) {  // of the jar, of the list
+        CookieList none;
+        test::FailingAllocator failing(n);
+        EXPECT_EACH(jar.GetCookieList(&none) == kMemFullErr, none.GetCount() == 0, failing.HasFailed());
+    }
+    // A size that would wrap is refused, and leaves nothing.
+    EXPECT_EACH(jar.GetCookieList(nullptr) == kArgErr, list.SetCount(0x40000001) == kMemFullErr, list.GetCount() == 0,
+                list.GetCookie(0) == 0u, list.SetCount(1) == kNoErr, list.GetCookie(0) == 0u,
+                list.SetCount(0) == kNoErr, list.GetCount() == 0, jar.Uninit() == kNoErr);
     EXPECT_EACH(jar.GetCookieList(&list) == kNoErr, list.GetCookie(0) == 0u);
 }
 

@@ -42,11 +42,13 @@ TEST_P(Handles, AreAlignedByTheirSize) {
                           {1023, 8, 0},     {1024, 16, 8},      {1025, 16, 0},      {1028, 16, 4},     {1048572, 16, 4},
                           {1048575, 16, 0}, {1048576, 4096, 8}, {1048577, 4096, 0}, {1048580, 4096, 4}};
     for (const Case& c : cases) {
+        const uint64 before = heap::TotalAllocated();
         UHandle h = DSNewHClr(c.size);
         ASSERT_TRUE(h && *h) << c.size;
         EXPECT_EQ(c.size, DSGetHandleSize(h));
         EXPECT_TRUE(IsAligned(h, c.alignment, c.offset)) << c.size;
-        EXPECT_EACH(std::string(c.size, '\0') == Content(h), DSDisposeHandle(h) == kNoErr);
+        EXPECT_EACH(std::string(c.size, '\0') == Content(h), DSDisposeHandle(h) == kNoErr,
+                    heap::TotalAllocated() == before, DSDisposeHandle(h) == kHandleErr);
     }
 }
 

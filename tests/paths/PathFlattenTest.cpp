@@ -71,6 +71,9 @@ TEST_F(PathFlatten, LongNamesAndTheSettingChooseTheFormat) {
     const PathRef longName = Abs({std::string(256, 'n').c_str()});
     EXPECT_EACH(Flattened(longName)[3] == '1', Show(longName) == Unflattened(Flattened(longName)),
                 CodeOf([&] { longName.FlattenedSize(PathRef::kPTH0); }) == kArgErr);
+    const PathRef longest = Abs({std::string(0x7FFF, 'n').c_str()}), tooLong = Abs({std::string(0x8000, 'n').c_str()});
+    EXPECT_EACH(Show(longest) == Unflattened(Flattened(longest)),
+                CodeOf([&] { tooLong.FlattenedSize(PathRef::kPTH1); }) == kArgErr);
     PathRef::Setting("utf8");
     EXPECT_EQ('1', Flattened(Abs({"C"}))[3]);
     PathRef::Setting("sysenc");

@@ -176,8 +176,9 @@ TEST_F(PathModel, StandardLocations) {
 }
 
 TEST_F(PathModel, Sanity) {
-    const PathRef path = Unc({"s", "x"});
-    EXPECT_EACH(path.IsSane(false), PathRef().IsSane(false), !Unc({}).IsValid(), !Unc({}).IsSane(false),
+    const PathRef path = Unc({"s", "x"}), one = Abs({"aq"}), ofSameHash = Abs({"ba"});
+    EXPECT_EACH(path.IsSane(false), one.IsSane(false), ofSameHash.IsSane(false), PathRef().IsSane(false),
+                !Unc({}).IsValid(), !Unc({}).IsSane(false),
                 (std::vector<std::string>{"PathRef is not valid"}) == reports_.Texts());
     PathRef wild;
     alignas(PathItemElement) static char noElement[sizeof(PathItemElement)];

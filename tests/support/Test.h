@@ -37,6 +37,12 @@ void InThreads(int count, Work work) {
     for (std::thread& thread : threads) thread.join();
 }
 
+// How long, or how much, a test runs: the value of an environment variable, or what suits every day.
+inline int Amount(const char* variable, int everyDay) {
+    const char* text = std::getenv(variable);
+    return text ? std::atoi(text) : everyDay;
+}
+
 // Several conditions, checked in order: EXPECT_EACH(Open() == kNoErr, name == "a.txt", !IsLocked()). A failure tells
 // the condition and what its sides were. Integers of unlike signs compare as numbers, C strings by their characters
 // when one side is a literal. What binds more loosely than a comparison needs parentheses.
@@ -122,4 +128,3 @@ struct Start {
 
 }  // namespace each
 }  // namespace tessel::test
-

@@ -15,9 +15,8 @@
 
 namespace {
 
+using namespace tessel::test;
 using tessel::platform::systemCalls;
-using testing::ElementsAre;
-using testing::IsEmpty;
 
 class ThThreadTest : public testing::Test {
 protected:
@@ -106,9 +105,9 @@ TEST_F(ThThreadTest, KnowsItsThreads) {
 
 TEST_F(ThThreadTest, HasNoIdentityBeforeTheStartUpThread) {
     Restart(nullptr);
-    EXPECT_EACH(ThThreadGetId() == nullptr, ThThreadGetIndex(nullptr) == 2048);
-    EXPECT_THAT(reports_.Texts(kDebugError), ElementsAre("bad ThThread in ThThreadGetIndex()"));
-    EXPECT_EQ(AssimilateStartUpThread(), 1);
+    EXPECT_EACH(ThThreadGetId() == nullptr, ThThreadGetIndex(nullptr) == 2048,
+                (Texts{"bad ThThread in ThThreadGetIndex()"}) == reports_.Texts(kDebugError),
+                AssimilateStartUpThread() == 1);
     std::thread([] {
         ThThread adopted = nullptr;
         EXPECT_EACH(ThThreadGetId() == nullptr, ThPseudoThreadCreate(&adopted) == kNoErr, ThThreadGetId() == adopted,
@@ -163,8 +162,7 @@ TEST_F(ThThreadTest, GivesEachOfManyThreadsAPlaceOfItsOwn) {
             ThThreadDestroy(thread);
         }
     });
-    EXPECT_EACH(ended == 4 * 100 * 2, collisions == 0);
-    EXPECT_THAT(reports_.Texts(), IsEmpty());
+    EXPECT_EACH(ended == 4 * 100 * 2, collisions == 0, reports_.Texts().empty());
 }
 
 // ---- ending ---------------------------------------------------------------------------------------------------------
@@ -174,11 +172,10 @@ TEST_F(ThThreadTest, ReportsBadRecordsAndThreadsThatAreLeft) {
     ThThreadDestroy(nullptr);
     ThThreadDestroy(&bad);
     EXPECT_EACH(ThThreadGetIndex(&bad) == 2048, ThThreadGetPriority(&bad) == kThPriorityNormal,
-                ThThreadSetPriority(&bad, 1) == kNoErr, !ThThreadActive(&bad));
-    EXPECT_THAT(
-        reports_.Texts(kDebugError),
-        ElementsAre("threadp does not have correct verifier in ThThreadDestroy", "bad ThThread in ThThreadGetIndex()",
-                    "invalid ThThread passed to ThThreadGetPriority", "bad argument to ThThreadSetPriority()", ""));
+                ThThreadSetPriority(&bad, 1) == kNoErr, !ThThreadActive(&bad),
+                (Texts{"threadp does not have correct verifier in ThThreadDestroy",
+                       "bad ThThread in ThThreadGetIndex()", "invalid ThThread passed to ThThreadGetPriority",
+                       "bad argument to ThThreadSetPriority()", ""}) == reports_.Texts(kDebugError));
 
     tessel::test::ScratchDrive drive;
     ::setenv("TMPDIR", drive.Native().c_str(), 1);
@@ -346,10 +343,10 @@ TEST_F(ThThreadTest, SetsPrioritiesAndTellsTheHost) {
     for (int32 level : {3, 2, 5, -1, 0}) EXPECT_EQ(ThThreadSetPriority(thread, level), kNoErr);
     EXPECT_EACH(ThThreadSetPriority(nullptr, 1) == kNoErr, ThThreadGetPriority(thread) == kThPriorityBackground);
     EXPECT_THAT(levelsSet, ElementsAre(3, 2, 1, 0));
-    EXPECT_EACH(ThClearThreadPrioritySetProc(other) == kArgErr, ThClearThreadPrioritySetProc(note) == kNoErr);
-    EXPECT_THAT(reports_.Texts(),
-                ElementsAre("bad argument to ThThreadSetPriority()", "", "bad argument to ThThreadSetPriority()",
-                            "Someone is attempting to clear the ThreadPrioritySetProc but didn't set it!"));
+    EXPECT_EACH(
+        ThClearThreadPrioritySetProc(other) == kArgErr, ThClearThreadPrioritySetProc(note) == kNoErr,
+        (Texts{"bad argument to ThThreadSetPriority()", "", "bad argument to ThThreadSetPriority()",
+               "Someone is attempting to clear the ThreadPrioritySetProc but didn't set it!"}) == reports_.Texts());
     ThEventSignal(go);
     ThThreadDestroy(thread);
     ThEventDestroy(go);
@@ -359,8 +356,8 @@ TEST_F(ThThreadTest, ReportsWhatTheHostRefuses) {
     Restart([](CStr, int32& value) { return value = 7, true; });  // no priority of the host's
     ThThread thread = StartThread(nullptr);
     reports_.Clear();
-    EXPECT_EQ(ThThreadSetPriority(thread, kThPriorityHigh), kNoErr);
-    EXPECT_THAT(reports_.Texts(), ElementsAre("SetThreadPriority failed"));
+    EXPECT_EACH(ThThreadSetPriority(thread, kThPriorityHigh) == kNoErr,
+                (Texts{"SetThreadPriority failed"}) == reports_.Texts());
     ThThreadDestroy(thread);
 
     Restart(nullptr);
