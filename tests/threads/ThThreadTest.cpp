@@ -8,6 +8,7 @@
 
 #include <errno.h>
 #include <filesystem>
+#include <linux/futex.h>
 #include <pthread.h>
 #include <sys/resource.h>
 #include <sys/syscall.h>
@@ -192,6 +193,8 @@ TEST_F(ThThreadTest, ReportsBadRecordsAndThreadsThatAreLeft) {
 // A clock that leaps over every long wait.
 struct LeapOverLongWaits {
     static inline std::atomic<int64_t> leapt{0};  // seconds
+    static inline thread_local bool isWatched = false;
+    static inline std::atomic<bool> waits{false};  // the thread that is watched
     static inline tessel::platform::SystemCalls original;
 
     static int Clock(clockid_t clock, timespec* time) {
@@ -200,6 +203,8 @@ struct LeapOverLongWaits {
         return result;
     }
     static long Futex(uint32_t* word, int operation, uint32_t value, const timespec* timeout) {
+        const int kind = operation & FUTEX_CMD_MASK;
+        if (isWatched && (kind == FUTEX_WAIT || kind == FUTEX_WAIT_BITSET)) waits = true;
         if (!timeout || timeout->tv_sec < 5) return original.futex(word, operation, value, timeout);
         leapt += timeout->tv_sec + 1;
         errno = ETIMEDOUT;
@@ -220,19 +225,17 @@ TEST_F(ThThreadTest, EndsAThreadThatIgnoresItsStopByForce) {
     const size_t before = ThreadsOfProcess();
     LeapOverLongWaits leap;
     static thread_local int leftBehind = 0;
-    static std::atomic<bool> running;
-    running = false;
     ThEvent event = nullptr;
     ThEventCreate(&event, 0, false);
     ThThread thread = StartThread(
         [](void* waited) -> int32 {
-            running = true;
             leftBehind = 1;
+            LeapOverLongWaits::isWatched = true;
             ThEventMsgWaitMultiple(static_cast<ThEvent>(waited), nullptr, -1, true);
             return 0;
         },
         event);
-    while (!running) std::this_thread::yield();
+    while (!LeapOverLongWaits::waits) std::this_thread::yield();
     const std::string text = "Terminating thread " + std::to_string(thread->platformId);
     ThThreadDestroy(thread);
     EXPECT_GE(LeapOverLongWaits::leapt, 10);
